@@ -1,0 +1,21 @@
+# The one interface target that every target of the project links: language level, warnings, sanitizers.
+add_library(qvct_build_flags INTERFACE)
+target_compile_features(qvct_build_flags INTERFACE cxx_std_20)
+target_compile_options(qvct_build_flags INTERFACE -Wall -Wextra -Wpedantic -Wconversion -Wshadow)
+if(QVCT_WARNINGS_AS_ERRORS)
+  target_compile_options(qvct_build_flags INTERFACE -Werror)
+endif()
+if(QVCT_SANITIZERS)
+  set(sanitize "-fsanitize=${QVCT_SANITIZERS}")
+  target_compile_options(qvct_build_flags INTERFACE
+    ${sanitize} -fno-sanitize-recover=all -fno-omit-frame-pointer)
+  target_link_options(qvct_build_flags INTERFACE ${sanitize})
+endif()
+
+set(CMAKE_CXX_EXTENSIONS OFF)
+set(CMAKE_POSITION_INDEPENDENT_CODE ON)
+find_program(CCACHE ccache)
+if(CCACHE)
+  set(CMAKE_CXX_COMPILER_LAUNCHER "${CCACHE}")
+  set(CMAKE_C_COMPILER_LAUNCHER "${CCACHE}")
+endif()

@@ -1,0 +1,35 @@
+#pragma once
+
+#include "platform/Error.h"
+
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace qvct {
+
+/// Largest file that is read whole into memory: property lists, scripts, tables, presets.
+inline constexpr std::uint64_t kLargestWholeFile = 256ULL << 20;
+
+bool fileExists(const std::string& path);
+/// Whether it is a folder (links are followed).
+bool isDirectory(const std::string& path);
+bool isRegularFile(const std::string& path);
+
+/// The bytes of a regular file, or nothing and an error: no such file, a folder or device, over `limit`.
+std::optional<std::vector<std::uint8_t>> readFile(const std::string& path, Error* error = nullptr,
+                                                  std::uint64_t limit = kLargestWholeFile);
+/// The file as text, which must be UTF-8.
+std::optional<std::string> readTextFile(const std::string& path, Error* error = nullptr);
+
+/// Replaces the file at `path` (or makes it) so that at any instant, and after a crash at any instant, either
+/// the old or the new contents stand there, whole.
+///
+/// The bytes go to a new file in the same folder, which takes over the old one's mode and is flushed and
+/// renamed over it; then the folder is flushed. A link at `path` is followed, so that the link stays.
+/// On failure the old file stands untouched and the new one is removed.
+bool replaceFile(const std::string& path, std::string_view bytes, Error* error = nullptr);
+
+}  // namespace qvct

@@ -1,0 +1,20 @@
+#pragma once
+
+#include <functional>
+#include <string_view>
+
+namespace qvct {
+
+/// Receives one message of the framework, without a line break at its end.
+using LogHandler = std::function<void(std::string_view message)>;
+
+/// Writes one line to the log. Line breaks and control characters inside the message are escaped.
+///
+/// Messages go to the handler if one is set, else to standard error. Safe from every thread.
+void log(std::string_view message);
+
+/// Sends all further messages to `handler`; an empty one brings standard error back.
+/// Answers the handler that was set before, so that it can be restored.
+LogHandler setLogHandler(LogHandler handler);
+
+}  // namespace qvct

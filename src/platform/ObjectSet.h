@@ -1,0 +1,78 @@
+#pragma once
+
+#include <algorithm>
+#include <cstddef>
+#include <memory>
+#include <unordered_map>
+#include <utility>
+#include <vector>
+
+namespace qvct {
+
+/// A set of shared objects that compares them by `isEqual` and `hash` and keeps the order of insertion,
+/// so that whatever is made from it is the same in every run.
+///
+/// `T` is a class with `isEqual(const Object&)` and `hash()`. Null pointers are ignored.
+/// @cost  insert and lookup O(1) on average, removal O(size).
+template <typename T>
+class ObjectSet {
+  public:
+    using Pointer = std::shared_ptr<T>;
+
+    ObjectSet() = default;
+    ObjectSet(std::initializer_list<Pointer> objects) {
+        for (const Pointer& object : objects) insert(object);
+    }
+
+    /// Adds the object unless an equal one is there. Whether it was added.
+    bool insert(Pointer object) {
+        if (!object || contains(*object)) return false;
+        byHash_.emplace(object->hash(), object.get());
+        objects_.push_back(std::move(object));
+        return true;
+    }
+
+    /// Adds every object of `other` that is not there yet.
+    void insertAll(const ObjectSet& other) {
+        for (const Pointer& object : other) insert(object);
+    }
+
+    /// Removes the equal object. Whether there was one.
+    bool erase(const T& object) {
+        const T* member = find(object);
+        if (member == nullptr) return false;
+        const auto [first, last] = byHash_.equal_range(object.hash());
+        byHash_.erase(std::find_if(first, last, [member](const auto& e) { return e.second == member; }));
+        objects_.erase(std::find_if(objects_.begin(), objects_.end(),
+                                    [member](const Pointer& p) { return p.get() == member; }));
+        return true;
+    }
+
+    /// The member that equals `object`, or null.
+    const T* find(const T& object) const {
+        const auto [first, last] = byHash_.equal_range(object.hash());
+        const auto hit = std::find_if(first, last, [&](const auto& e) { return e.second->isEqual(object); });
+        return hit == last ? nullptr : hit->second;
+    }
+
+    bool contains(const T& object) const { return find(object) != nullptr; }
+    std::size_t size() const { return objects_.size(); }
+    bool empty() const { return objects_.empty(); }
+    /// The objects in the order of insertion.
+    const std::vector<Pointer>& ordered() const { return objects_; }
+    auto begin() const { return objects_.begin(); }
+    auto end() const { return objects_.end(); }
+
+    /// Same members, in whatever order.
+    bool operator==(const ObjectSet& other) const {
+        return size() == other.size() && std::all_of(begin(), end(), [&other](const Pointer& object) {
+                   return other.contains(*object);
+               });
+    }
+
+  private:
+    std::vector<Pointer> objects_;
+    std::unordered_multimap<std::size_t, const T*> byHash_;
+};
+
+}  // namespace qvct

@@ -1,0 +1,274 @@
+#include "platform/PropertyListGuard.h"
+
+#include "platform/PropertyListFile.h"
+
+#include <algorithm>
+#include <cstring>
+#include <limits>
+#include <string_view>
+#include <vector>
+
+#include <fmt/format.h>
+
+namespace qvct {
+namespace {
+
+constexpr std::size_t kHeaderSize = 8;
+constexpr std::size_t kTrailerSize = 32;
+/// Values may outnumber the file's bytes by this much (shared leaves are common, shared containers are not).
+constexpr std::uint64_t kExpansionSlack = 1U << 16;
+
+std::string_view textOf(std::span<const std::uint8_t> bytes) {
+    return {reinterpret_cast<const char*>(bytes.data()), bytes.size()};
+}
+
+/// What one object of a binary property list is, read without looking past the end.
+struct Object {
+    enum class Kind { leaf, array, dictionary } kind = Kind::leaf;
+    std::uint64_t count = 0;         // references of a container (keys and values of a dictionary)
+    std::size_t firstReference = 0;  // offset of a container's references
+    std::uint64_t payload = 0;       // bytes of a leaf
+};
+
+/// The object graph of a binary property list.
+class BinaryGraph {
+  public:
+    BinaryGraph(std::span<const std::uint8_t> bytes, Error* error) : bytes_(bytes), error_(error) {}
+
+    bool check() { return readTrailer() && walk(); }
+
+  private:
+    /// Totals of an object with all that it holds.
+    struct Totals {
+        std::uint64_t values = 0;
+        std::uint64_t payload = 0;
+        int depth = 0;
+    };
+    /// A container whose references are being walked.
+    struct Visit {
+        std::uint64_t index;
+        Object object;
+        std::uint64_t next = 0;
+        Totals totals{1, 0, 1};
+    };
+    enum class State : std::uint8_t { unseen, open, done };
+
+    bool refuse(ErrorCode code, std::size_t offset, std::string_view reason) {
+        return fail(error_, code, fmt::format("binary property list, byte {}: {}", offset, reason));
+    }
+
+    std::uint64_t bigEndian(std::size_t offset, std::size_t width) const {
+        std::uint64_t value = 0;
+        for (std::size_t i = 0; i < width; ++i) value = value << 8 | bytes_[offset + i];
+        return value;
+    }
+
+    bool readTrailer() {
+        if (bytes_.size() < kHeaderSize + kTrailerSize) return refuse(kErrorMalformed, 0, "is cut short");
+        const std::size_t trailer = bytes_.size() - kTrailerSize;
+        offsetWidth_ = bytes_[trailer + 6];
+        referenceWidth_ = bytes_[trailer + 7];
+        objectCount_ = bigEndian(trailer + 8, 8);
+        topObject_ = bigEndian(trailer + 16, 8);
+        const std::uint64_t table = bigEndian(trailer + 24, 8);
+        const bool widthsFit =
+            offsetWidth_ >= 1 && offsetWidth_ <= 8 && referenceWidth_ >= 1 && referenceWidth_ <= 8;
+        if (!widthsFit) return refuse(kErrorMalformed, trailer + 6, "impossible integer sizes");
+        if (table < kHeaderSize || table > trailer)
+            return refuse(kErrorMalformed, trailer + 24, "offset table outside");
+        if (objectCount_ == 0 || objectCount_ > (trailer - table) / offsetWidth_) {
+            return refuse(kErrorMalformed, trailer + 8, "more objects than bytes");
+        }
+        if (topObject_ >= objectCount_) return refuse(kErrorMalformed, trailer + 16, "top object outside");
+        table_ = static_cast<std::size_t>(table);
+        return true;
+    }
+
+    /// Reads the marker and length of an object; false when it does not lie inside the bytes.
+    bool readObject(std::uint64_t index, Object& object) {
+        const std::uint64_t offset =
+            bigEndian(table_ + static_cast<std::size_t>(index) * offsetWidth_, offsetWidth_);
+        if (offset < kHeaderSize || offset >= table_) {
+            return refuse(kErrorMalformed, table_,
+                          fmt::format("object {} at offset {} outside", index, offset));
+        }
+        auto at = static_cast<std::size_t>(offset);
+        const std::uint8_t marker = bytes_[at++];
+        std::uint64_t length = marker & 0x0fU;
+        const unsigned type = marker >> 4U;
+        const bool counted = type >= 0x4 && type != 0x8;
+        if (counted && length == 0x0f && !readLength(at, length)) return false;
+        return describe(type, length, at, object);
+    }
+
+    /// A length of 15 or more is an integer object of its own behind the marker.
+    bool readLength(std::size_t& at, std::uint64_t& length) {
+        const std::uint8_t marker = bytes_[at++];  // at is at most the start of the offset table
+        const std::size_t width = std::size_t{1} << (marker & 0x0fU);
+        if (marker >> 4U != 0x1 || width > 8 || width > table_ - std::min(at, table_)) {
+            return refuse(kErrorMalformed, at, "impossible length");
+        }
+        length = bigEndian(at, width);
+        at += width;
+        return true;
+    }
+
+    bool describe(unsigned type, std::uint64_t length, std::size_t at, Object& object) {
+        const std::uint64_t available = table_ - std::min(at, table_);
+        std::uint64_t unit = 1;
+        switch (type) {
+            case 0x0:
+                length = 0;
+                break;  // boolean and fill
+            case 0x1:
+            case 0x2:
+            case 0x3:
+                length = std::uint64_t{1} << length;
+                break;  // integer, real, date
+            case 0x4:
+            case 0x5:
+                break;  // data, ASCII
+            case 0x6:
+                unit = 2;
+                break;  // UTF-16
+            case 0x8:
+                length += 1;
+                break;  // UID
+            case 0xA:
+            case 0xC:
+                unit = referenceWidth_;
+                object.kind = Object::Kind::array;
+                break;
+            case 0xD:
+                unit = 2 * referenceWidth_;
+                object.kind = Object::Kind::dictionary;
+                break;
+            default:
+                return refuse(kErrorMalformed, at - 1, fmt::format("unknown marker {:#x}", type));
+        }
+        if (length > available / unit) return refuse(kErrorMalformed, at - 1, "object longer than the file");
+        object.firstReference = at;
+        object.count = object.kind == Object::Kind::dictionary ? 2 * length : length;
+        object.payload = object.kind == Object::Kind::leaf ? length * unit : 0;
+        const bool isUtf16 = type == 0x6;
+        if (isUtf16 && !isPairedUtf16(at, length))
+            return refuse(kErrorMalformed, at, "half a surrogate pair");
+        return true;
+    }
+
+    bool isPairedUtf16(std::size_t at, std::uint64_t units) const {
+        bool openPair = false;
+        for (std::uint64_t i = 0; i < units; ++i) {
+            const std::uint64_t kind = bigEndian(at + 2 * static_cast<std::size_t>(i), 2) & 0xFC00U;
+            const bool isSecondHalf = kind == 0xDC00;
+            if (openPair != isSecondHalf) return false;
+            openPair = kind == 0xD800;
+        }
+        return !openPair;
+    }
+
+    bool walk() {
+        states_.assign(static_cast<std::size_t>(objectCount_), State::unseen);
+        totals_.resize(static_cast<std::size_t>(objectCount_));
+        if (!enter(topObject_)) return false;
+        while (!open_.empty()) {
+            Visit& visit = open_.back();
+            if (visit.next == visit.object.count) {
+                close();
+            } else if (!step(visit)) {
+                return false;
+            }
+        }
+        return true;
+    }
+
+    bool step(Visit& visit) {
+        const std::size_t place =
+            visit.object.firstReference + static_cast<std::size_t>(visit.next) * referenceWidth_;
+        const std::uint64_t child = bigEndian(place, referenceWidth_);
+        if (child >= objectCount_) return refuse(kErrorMalformed, place, "reference outside");
+        const State state = states_[static_cast<std::size_t>(child)];
+        if (state == State::open) return refuse(kErrorMalformed, place, "a container holds itself");
+        if (state == State::unseen) return enter(child);
+        ++visit.next;
+        return add(visit, totals_[static_cast<std::size_t>(child)], place);
+    }
+
+    bool enter(std::uint64_t index) {
+        Object object;
+        if (!readObject(index, object)) return false;
+        if (object.kind == Object::Kind::leaf) {
+            states_[static_cast<std::size_t>(index)] = State::done;
+            totals_[static_cast<std::size_t>(index)] = {1, object.payload, 0};
+            return true;
+        }
+        states_[static_cast<std::size_t>(index)] = State::open;
+        if (open_.size() >= static_cast<std::size_t>(kDeepestPropertyList)) {
+            return refuse(kErrorTooLarge, object.firstReference, "nested too deeply");
+        }
+        open_.push_back(Visit{index, object});
+        return true;
+    }
+
+    void close() {
+        const Visit& visit = open_.back();
+        states_[static_cast<std::size_t>(visit.index)] = State::done;
+        totals_[static_cast<std::size_t>(visit.index)] = visit.totals;
+        open_.pop_back();
+    }
+
+    bool add(Visit& visit, const Totals& child, std::size_t place) {
+        visit.totals.values += child.values;
+        visit.totals.payload += child.payload;
+        visit.totals.depth = std::max(visit.totals.depth, child.depth + 1);
+        if (visit.totals.values > bytes_.size() + kExpansionSlack ||
+            visit.totals.payload > 4 * std::uint64_t{bytes_.size()} + kExpansionSlack) {
+            return refuse(kErrorTooLarge, place, "shared references expand without bound");
+        }
+        if (visit.totals.depth > kDeepestPropertyList)
+            return refuse(kErrorTooLarge, place, "nested too deeply");
+        return true;
+    }
+
+    std::span<const std::uint8_t> bytes_;
+    Error* error_;
+    std::size_t offsetWidth_ = 0;
+    std::size_t referenceWidth_ = 0;
+    std::uint64_t objectCount_ = 0;
+    std::uint64_t topObject_ = 0;
+    std::size_t table_ = 0;
+    std::vector<State> states_;
+    std::vector<Totals> totals_;
+    std::vector<Visit> open_;
+};
+
+}  // namespace
+
+bool isSafeBinaryPropertyList(std::span<const std::uint8_t> bytes, Error* error) {
+    return BinaryGraph(bytes, error).check();
+}
+
+bool isSafeXmlPropertyList(std::span<const std::uint8_t> bytes, Error* error) {
+    const std::string_view text = textOf(bytes);
+    int depth = 0;
+    for (std::size_t at = text.find('<'); at != std::string_view::npos; at = text.find('<', at + 1)) {
+        const char first = at + 1 < text.size() ? text[at + 1] : '\0';
+        if (first == '!' || first == '?') {
+            // Tags inside comments and character data are text: they may only make the count too high.
+            continue;
+        }
+        if (first == '/') {
+            depth = std::max(0, depth - 1);
+            continue;
+        }
+        const std::size_t close = text.find('>', at);
+        if (close == std::string_view::npos) break;
+        if (text[close - 1] != '/' && ++depth > kDeepestPropertyList) {
+            return fail(error, kErrorTooLarge,
+                        fmt::format("XML property list, byte {}: nested too deeply", at));
+        }
+    }
+    return true;
+}
+
+}  // namespace qvct

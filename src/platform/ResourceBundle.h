@@ -1,0 +1,24 @@
+#pragma once
+
+#include <optional>
+#include <string>
+#include <string_view>
+
+namespace qvct {
+
+/// Where resource files may lie that replace the compiled-in copies.
+///
+/// Looked into, in this order: the folder set here, the folder that the environment variable QVCT_RESOURCES
+/// names, the resource folder of the installation. Setting is for start-up, before the first look-up of
+/// another thread.
+class ResourceBundle {
+  public:
+    /// An empty path sets nothing again.
+    static void setDirectory(std::string path);
+    /// The folder set by `setDirectory` or the environment; empty when none is.
+    static std::string directory();
+    /// The path of the resource if a file of that name exists in one of the folders.
+    static std::optional<std::string> pathForResource(std::string_view name, std::string_view extension);
+};
+
+}  // namespace qvct

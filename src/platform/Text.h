@@ -1,0 +1,45 @@
+#pragma once
+
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace qvct {
+
+/// Text operations on UTF-8. Those that look at characters are Unicode-correct.
+
+bool isValidUtf8(std::string_view text);
+/// UTF-16 of the text; malformed bytes become U+FFFD.
+std::u16string utf16FromUtf8(std::string_view text);
+std::string utf8FromUtf16(std::u16string_view text);
+
+/// Order of two texts for people, in the order of the user's locale: negative, 0 or positive.
+int localizedCompare(std::string_view a, std::string_view b);
+/// Whether `text` holds `part`, without regard to case and diacritics. An empty part is never held.
+bool containsIgnoringCaseAndDiacritics(std::string_view text, std::string_view part);
+/// Full case folding: two texts that differ only in case fold to the same text.
+std::string foldCase(std::string_view text);
+std::string lowercase(std::string_view text);
+/// The user-perceived characters in reverse order.
+std::string reversedString(std::string_view text);
+/// Replaces each character that is neither alphanumeric nor listed in `kept` (ASCII) by `replacement`.
+std::string replaceNonAlphanumerics(std::string_view text, std::string_view kept,
+                                    std::string_view replacement);
+
+/// Without the blanks (and, if asked for, line breaks) at both ends.
+std::string_view trimBlanks(std::string_view text);
+std::string_view trimBlanksAndLineBreaks(std::string_view text);
+/// Without the punctuation characters at both ends.
+std::string_view trimPunctuation(std::string_view text);
+/// The parts between the separators; one more part than there are separators.
+std::vector<std::string> split(std::string_view text, std::string_view separator);
+std::string join(const std::vector<std::string>& parts, std::string_view separator);
+std::string replaceAll(std::string_view text, std::string_view from, std::string_view to);
+/// The number that the text begins with, blanks skipped and whatever the locale; 0 when there is none.
+double leadingNumber(std::string_view text);
+/// A text with one decimal digit (or whole, for 0 digits) as the user's locale writes numbers.
+std::string localizedDecimal(double value, int fractionDigits);
+/// The text with every byte that is not printable UTF-8 escaped, fit for one line of a message.
+std::string printable(std::string_view text);
+
+}  // namespace qvct

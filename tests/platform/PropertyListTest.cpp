@@ -1,0 +1,173 @@
+#include "platform/PropertyList.h"
+#include "platform/PropertyListFile.h"
+#include "support/Corpus.h"
+#include "support/TemporaryFolder.h"
+
+#include <chrono>
+#include <limits>
+
+#include <gtest/gtest.h>
+
+namespace qvct {
+namespace {
+
+using Dictionary = PropertyList::Dictionary;
+
+/// One value of every kind, with the numbers at which narrower types break.
+PropertyList everyKind() {
+    return Dictionary{
+        {"zebra", "first, though not by alphabet"},
+        {"umlaut \xc3\xa9 & <tag>", "\xe9\x9f\xb3 \xf0\x9f\xa5\x81 & < > \" '"},
+        {"empty", Dictionary{}},
+        {"array", PropertyList::Array{1, "two", PropertyList::Array{}, true, false}},
+        {"most negative", std::numeric_limits<std::int64_t>::min()},
+        {"minus one", -1},
+        {"most positive", std::numeric_limits<std::int64_t>::max()},
+        {"unsigned", std::numeric_limits<std::uint64_t>::max()},
+        {"half", 0.5},
+        {"tiny", 1e-300},
+        {"distant past", PropertyList::Date{-63114076800.0}},
+        {"distant future", PropertyList::Date{63113904000.0}},
+        {"data", PropertyList::Data{0, 255, 13, 10, 0}},
+        {"uid", PropertyList::Uid{70000}},
+    };
+}
+
+std::vector<std::string> keys(const PropertyList& value) {
+    std::vector<std::string> result;
+    for (const auto& entry : *value.dictionary()) result.push_back(entry.key);
+    return result;
+}
+
+TEST(PropertyList, EveryValueAndTheOrderSurviveBothEncodings) {
+    const PropertyList original = everyKind();
+    for (const auto format : {PropertyListFormat::xml, PropertyListFormat::binary}) {
+        const test::TemporaryFolder folder;
+        const std::string path = folder.path("all.plist");
+        Error error;
+        ASSERT_TRUE(writePropertyListFile(original, path, format, &error)) << error.message;
+        const auto read = readPropertyListFile(path, &error);
+        ASSERT_TRUE(read) << error.message;
+        EXPECT_EQ(keys(*read), keys(original));
+        for (const auto& entry : *original.dictionary()) {
+            const PropertyList* value = read->dictionary()->value(entry.key);
+            ASSERT_NE(value, nullptr) << entry.key;
+            EXPECT_EQ(*value, entry.value) << entry.key;
+        }
+    }
+}
+
+TEST(PropertyList, XmlIsWhatThePlatformsOwnReadersExpect) {
+    const std::string xml =
+        serializePropertyList(Dictionary{{"a", Dictionary{{"b", 1}}}}, PropertyListFormat::xml);
+    EXPECT_TRUE(xml.starts_with("<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<!DOCTYPE plist PUBLIC "))
+        << xml;
+    EXPECT_NE(xml.find("\n\t<key>a</key>\n\t<dict>\n\t\t<key>b</key>\n"), std::string::npos) << xml;
+}
+
+TEST(PropertyList, RefusesToCutATextAtANulCharacter) {
+    const std::string withNul("a\0b", 3);
+    for (const PropertyList& value : {PropertyList(withNul), PropertyList(Dictionary{{withNul, 1}})}) {
+        EXPECT_EQ(serializePropertyList(value, PropertyListFormat::binary), "");
+    }
+}
+
+TEST(PropertyList, NumbersCompareByValueAndBooleansStandApart) {
+    EXPECT_EQ(PropertyList(0), PropertyList(0.0));
+    EXPECT_FALSE(PropertyList(1) == PropertyList(true));
+    EXPECT_FALSE(PropertyList(1) == PropertyList("1"));
+    EXPECT_EQ(PropertyList(Dictionary{{"a", 1}, {"b", 2}}), PropertyList(Dictionary{{"b", 2}, {"a", 1}}));
+}
+
+TEST(PropertyList, ConvertsLikeTheExchangeFormatExpects) {
+    EXPECT_EQ(PropertyList(" 0.75x").doubleValue(), 0.75);
+    EXPECT_EQ(PropertyList("none").doubleValue(), 0.0);
+    EXPECT_FALSE(PropertyList(Dictionary{}).doubleValue());
+    EXPECT_EQ(PropertyList(1e300).integerValue(), std::numeric_limits<std::int64_t>::max());
+    EXPECT_EQ(PropertyList(-2.9).integerValue(), -2);
+    EXPECT_TRUE(PropertyList("yes").boolValue());
+    EXPECT_FALSE(PropertyList("0").boolValue());
+}
+
+/// A binary list of containers that each hold the next one `fanOut` times.
+std::string chainOfSharedArrays(std::size_t levels, std::size_t fanOut) {
+    std::string bytes("bplist00");
+    std::string offsets;
+    const auto addOffset = [&] {
+        offsets += static_cast<char>(bytes.size() >> 8U);
+        offsets += static_cast<char>(bytes.size());
+    };
+    for (std::size_t level = 0; level < levels; ++level) {
+        addOffset();
+        bytes += static_cast<char>(0xA0 + fanOut);
+        for (std::size_t i = 0; i < fanOut; ++i) {
+            bytes += static_cast<char>((level + 1) >> 8U);
+            bytes += static_cast<char>(level + 1);
+        }
+    }
+    addOffset();
+    bytes += '\x09';
+    std::string trailer(32, '\0');
+    trailer[6] = 2;
+    trailer[7] = 2;
+    trailer[14] = static_cast<char>((levels + 1) >> 8U);
+    trailer[15] = static_cast<char>(levels + 1);
+    trailer[30] = static_cast<char>(bytes.size() >> 8U);
+    trailer[31] = static_cast<char>(bytes.size());
+    return bytes + offsets + trailer;
+}
+
+std::string nestedXml(int depth) {
+    std::string xml = "<plist>";
+    for (int i = 0; i < depth; ++i) xml += "<array>";
+    for (int i = 0; i < depth; ++i) xml += "</array>";
+    return xml + "</plist>";
+}
+
+TEST(PropertyList, RefusesWhatWouldExhaustMemoryOrTheStack) {
+    struct {
+        const char* what;
+        std::string bytes;
+        bool accepted;
+    } const cases[] = {
+        {"shared array", chainOfSharedArrays(3, 2), true},
+        {"a kilobyte that expands to 15^60 values", chainOfSharedArrays(60, 14), false},
+        {"binary within the depth", chainOfSharedArrays(500, 1), true},
+        {"binary nested too deeply", chainOfSharedArrays(5000, 1), false},
+        {"XML within the depth", nestedXml(500), true},
+        {"XML nested too deeply", nestedXml(100000), false},
+    };
+    for (const auto& c : cases) {
+        Error error;
+        EXPECT_EQ(parsePropertyList(c.bytes, &error).has_value(), c.accepted)
+            << c.what << ": " << error.message;
+        EXPECT_EQ(error.message.empty(), c.accepted) << c.what;
+    }
+}
+
+TEST(PropertyList, RefusesAContainerThatHoldsItself) {
+    std::string bytes = chainOfSharedArrays(2, 1);
+    bytes[8 + 3 + 2] = '\0';  // the second array's only reference now names the first
+    EXPECT_FALSE(parsePropertyList(bytes));
+}
+
+TEST(PropertyList, ReadsTheValidCorpusAndSurvivesTheHostileOneInTime) {
+    const auto root = test::corpus("plists");
+    QVCT_SKIP_WITHOUT(root);
+    for (const std::string& file : test::filesBelow(root)) {
+        const auto start = std::chrono::steady_clock::now();
+        Error error;
+        const bool read = readPropertyListFile(file, &error).has_value();
+        EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(1)) << file;
+        EXPECT_EQ(read, error.message.empty()) << file;
+        if (file.find("cpython/valid_") != std::string::npos) {
+            EXPECT_TRUE(read) << error.message;
+        }
+        if (file.find("cpython/invalid_bin") != std::string::npos) {
+            EXPECT_FALSE(read) << file;
+        }
+    }
+}
+
+}  // namespace
+}  // namespace qvct
