@@ -17,6 +17,9 @@ class ResourceBundle {
     static void setDirectory(std::string path);
     /// The folder set by `setDirectory` or the environment; empty when none is.
     static std::string directory();
+    /// Takes one resource from a file of its own; nothing leaves it to the compiled-in copy.
+    static void setPathForResource(std::string_view name, std::string_view extension,
+                                   std::optional<std::string> path);
     /// The path of the resource if a file of that name exists in one of the folders.
     static std::optional<std::string> pathForResource(std::string_view name, std::string_view extension);
 };

@@ -1,5 +1,6 @@
 #include "platform/Text.h"
 
+#include <algorithm>
 #include <charconv>
 #include <memory>
 
@@ -115,6 +116,10 @@ bool isValidUtf8(std::string_view text) {
     return true;
 }
 
+bool isAscii(std::string_view text) {
+    return std::all_of(text.begin(), text.end(), [](char c) { return static_cast<unsigned char>(c) < 0x80; });
+}
+
 std::u16string utf16FromUtf8(std::string_view text) {
     const icu::UnicodeString converted = unicode(text);
     return {converted.getBuffer(), static_cast<std::size_t>(converted.length())};
@@ -224,6 +229,18 @@ std::string localizedDecimal(double value, int fractionDigits) {
                                .precision(Precision::fixedFraction(fractionDigits))
                                .grouping(UNUM_GROUPING_OFF);
     return utf8(formatter.formatDouble(value, status).toString(status));
+}
+
+std::size_t displayWidth(std::string_view text) {
+    std::size_t columns = 0;
+    const auto length = static_cast<int32_t>(text.size());
+    for (int32_t i = 0; i < length;) {
+        const UChar32 c = nextCharacter(text, i, length);
+        if (c >= 0 && (u_charType(c) == U_NON_SPACING_MARK || u_charType(c) == U_FORMAT_CHAR)) continue;
+        const int32_t width = c < 0 ? U_EA_NEUTRAL : u_getIntPropertyValue(c, UCHAR_EAST_ASIAN_WIDTH);
+        columns += width == U_EA_WIDE || width == U_EA_FULLWIDTH ? 2 : 1;
+    }
+    return columns;
 }
 
 std::string printable(std::string_view text) {

@@ -9,6 +9,7 @@ namespace qvct {
 /// Text operations on UTF-8. Those that look at characters are Unicode-correct.
 
 bool isValidUtf8(std::string_view text);
+bool isAscii(std::string_view text);
 /// UTF-16 of the text; malformed bytes become U+FFFD.
 std::u16string utf16FromUtf8(std::string_view text);
 std::string utf8FromUtf16(std::u16string_view text);
@@ -39,6 +40,8 @@ std::string replaceAll(std::string_view text, std::string_view from, std::string
 double leadingNumber(std::string_view text);
 /// A text with one decimal digit (or whole, for 0 digits) as the user's locale writes numbers.
 std::string localizedDecimal(double value, int fractionDigits);
+/// How many columns of a terminal the text takes.
+std::size_t displayWidth(std::string_view text);
 /// The text with every byte that is not printable UTF-8 escaped, fit for one line of a message.
 std::string printable(std::string_view text);
 

@@ -1,0 +1,145 @@
+#include "Commands.h"
+#include "autotagging/QVTaggingAggregator.h"
+#include "platform/PropertyListFile.h"
+#include "platform/QVContentTaggingTypes.h"
+#include "platform/Text.h"
+
+#include <algorithm>
+#include <array>
+#include <memory>
+
+#include <CLI/CLI.hpp>
+#include <fmt/format.h>
+
+namespace qvct::tool {
+namespace {
+
+struct Service {
+    std::string_view name;
+    std::uint64_t option;
+};
+
+constexpr std::array<Service, 1> kServices = {{{"keywords", QVCTAutoTaggingOptionFilenameKeywords}}};
+
+struct Options {
+    std::vector<std::string> paths;
+    std::vector<std::string> services;
+    std::string keywordsFile;
+};
+
+struct Item {
+    URL url;
+    std::vector<std::shared_ptr<TGRTTagging>> taggings;
+};
+
+std::string serviceNames() {
+    std::vector<std::string> names;
+    for (const Service& service : kServices) names.emplace_back(service.name);
+    return join(names, ", ");
+}
+
+/// The option bits of the services by name; all of them when none is named.
+std::uint64_t optionsForServices(const std::vector<std::string>& names, ToolContext& context) {
+    std::uint64_t bits = 0;
+    for (const std::string& name : names) {
+        const auto* hit = std::find_if(kServices.begin(), kServices.end(),
+                                       [&name](const Service& service) { return service.name == name; });
+        if (hit == kServices.end()) {
+            context.usageFailed(
+                fmt::format("no service \"{}\"; there are: {}", printable(name), serviceNames()));
+        } else {
+            bits |= hit->option;
+        }
+    }
+    if (!names.empty()) return bits;
+    for (const Service& service : kServices) bits |= service.option;
+    return bits;
+}
+
+QVTaggingAggregator::Settings keywordMapping(const std::string& file, ToolContext& context) {
+    if (file.empty()) return std::nullopt;
+    Error error;
+    auto mapping = readDictionaryFile(file, &error);
+    if (!mapping) context.itemFailed(fmt::format("{} (using the built-in keywords)", error.message));
+    return mapping;
+}
+
+Json jsonOfItem(const Item& item) {
+    Json json;
+    json["path"] = item.url.path();
+    json["type"] =
+        QVContentTaggingTypes::nameForFileType(QVContentTaggingTypes::fallBackFileTypeForURL(item.url));
+    json["taggings"] = Json::array();
+    for (const auto& tagging : item.taggings) json["taggings"].push_back(jsonOfTagging(*tagging));
+    return json;
+}
+
+/// One heading a folder, below it a line an item: its name and its tags.
+void printTable(const std::vector<Item>& items, const Terminal& terminal) {
+    constexpr std::size_t widestName = 40;
+    std::size_t width = 0;
+    for (const Item& item : items) width = std::max(width, displayWidth(item.url.lastPathComponent()));
+    width = std::min(width, widestName);
+    std::string folder;
+    for (const Item& item : items) {
+        const std::string itsFolder = item.url.URLByDeletingLastPathComponent().path();
+        if (itsFolder != folder) {
+            fmt::print("{}{}\n", folder.empty() ? "" : "\n",
+                       colored(terminal, Color::strong, printable(itsFolder)));
+            folder = itsFolder;
+        }
+        std::vector<Word> words;
+        for (const auto& tagging : item.taggings) {
+            words.push_back({textOfTagging(*tagging), tagging->level() ? Color::accent : Color::plain});
+        }
+        if (words.empty()) words.push_back({"no tags", Color::faint});
+        fmt::print("  {}  {}\n", padded(printable(item.url.lastPathComponent()), width),
+                   wrapped(terminal, words, width + 4));
+    }
+}
+
+void noteTotals(const std::vector<Item>& items, const ToolContext& context) {
+    std::size_t tags = 0;
+    std::size_t tagged = 0;
+    for (const Item& item : items) {
+        tags += item.taggings.size();
+        tagged += item.taggings.empty() ? 0 : 1;
+    }
+    context.note(fmt::format("{} items, {} of them tagged, {} tags", items.size(), tagged, tags));
+}
+
+void run(const Options& options, ToolContext& context) {
+    const std::uint64_t bits = optionsForServices(options.services, context);
+    const auto aggregator =
+        QVTaggingAggregator::initWithRules(std::nullopt, keywordMapping(options.keywordsFile, context));
+    const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
+    std::vector<Item> items;
+    for (const URL& url : context.contentItems(options.paths)) {
+        items.push_back({url, sortedTaggings(aggregator->taggingsWithContentsOfURL(url, *taxonomy, bits))});
+    }
+    if (context.format == Format::table) {
+        printTable(items, context.terminal());
+        return noteTotals(items, context);
+    }
+    Json json = Json::array();
+    for (const Item& item : items) json.push_back(jsonOfItem(item));
+    printJson(json, context.format);
+}
+
+}  // namespace
+
+void addAutotagCommand(CLI::App& app, ToolContext& context) {
+    const auto options = std::make_shared<Options>();
+    auto* command = app.add_subcommand("autotag", "Derives tags for files and for everything below folders");
+    command->add_option("paths", options->paths, "Files and folders")->required()->type_name("PATH");
+    command->add_option("--services", options->services, "Only these services: " + serviceNames())
+        ->delimiter(',');
+    command
+        ->add_option("--keywords", options->keywordsFile,
+                     "Property list of keywords to use instead of the built-in")
+        ->type_name("FILE");
+    command->footer("Example:\n  qvtag autotag --json Loops \"Patches/Warm Pad.patch\"");
+    command->callback([options, &context] { run(*options, context); });
+}
+
+}  // namespace qvct::tool

@@ -1,0 +1,16 @@
+#pragma once
+
+#include "ToolContext.h"
+
+namespace CLI {
+class App;
+}
+
+namespace qvct::tool {
+
+/// Each adds one command to the tool. A command reports what fails through the context and never throws.
+void addAutotagCommand(CLI::App& app, ToolContext& context);
+void addKeywordsCommand(CLI::App& app, ToolContext& context);
+void addTaxonomyCommand(CLI::App& app, ToolContext& context);
+
+}  // namespace qvct::tool

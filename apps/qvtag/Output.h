@@ -1,0 +1,53 @@
+#pragma once
+
+#include "taxonomy/TGRTTagging.h"
+
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include <nlohmann/json.hpp>
+
+namespace qvct::tool {
+
+using Json = nlohmann::ordered_json;
+
+/// Tables for people, one JSON document, or one JSON line an item.
+enum class Format { table, json, jsonLines };
+
+/// What standard output can show.
+struct Terminal {
+    bool hasColor = false;
+    /// Columns; 0 when lines need not be broken.
+    std::size_t width = 0;
+
+    static Terminal ofStandardOutput();
+};
+
+enum class Color { plain, strong, faint, accent };
+/// The text in a colour, where the terminal has any.
+std::string colored(const Terminal& terminal, Color color, std::string_view text);
+
+/// A JSON text that stays valid whatever bytes are in its strings.
+std::string jsonText(const Json& value, bool onOneLine);
+/// Prints the items: as an array, or one a line.
+void printJson(const Json& items, Format format);
+
+/// {"label","parent","category","level","auto","weightLevel"}, null where absent.
+Json jsonOfTagging(const TGRTTagging& tagging);
+/// Sorted by category, label and level, for output that is the same in every run.
+std::vector<std::shared_ptr<TGRTTagging>> sortedTaggings(const ObjectSet<TGRTTagging>& taggings);
+/// "House", or "Cold / Warm 100%" with a level.
+std::string textOfTagging(const TGRTTagging& tagging);
+
+/// Pads with blanks to that many columns of a terminal.
+std::string padded(std::string_view text, std::size_t columns);
+/// Joins words with two blanks, breaking lines before `width` columns; further lines are indented. No breaks
+/// for a width of 0. Words may hold colour.
+struct Word {
+    std::string text;
+    Color color = Color::plain;
+};
+std::string wrapped(const Terminal& terminal, const std::vector<Word>& words, std::size_t indent);
+
+}  // namespace qvct::tool

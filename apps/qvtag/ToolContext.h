@@ -1,0 +1,47 @@
+#pragma once
+
+#include "Output.h"
+#include "platform/Url.h"
+
+#include <cstddef>
+#include <memory>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace qvct::tool {
+
+/// What the commands share: the options before the command's name, where output goes, and what went wrong.
+class ToolContext {
+  public:
+    ToolContext();
+
+    // Set by the command line.
+    Format format = Format::table;
+    bool quiet = false;
+    std::string resourceDirectory;
+    std::string taxonomyFile;
+
+    /// Applies the options above before a command runs.
+    void prepare();
+    const Terminal& terminal() const { return terminal_; }
+
+    /// One line on standard error; the tool will say by its exit status that some items failed.
+    void itemFailed(std::string_view message);
+    /// The same for a wrong word on the command line, when the rest is done all the same.
+    void usageFailed(std::string_view message);
+    /// A line on standard error that is no failure; nothing when quiet.
+    void note(std::string_view message) const;
+    /// 0 done, 1 some items failed, 2 wrong usage.
+    int exitStatus() const { return exitStatus_; }
+
+    /// Every content item at or below the paths; what cannot be read is reported. Names that are not UTF-8
+    /// are reported and left out.
+    std::vector<URL> contentItems(const std::vector<std::string>& paths);
+
+  private:
+    Terminal terminal_;
+    int exitStatus_ = 0;
+};
+
+}  // namespace qvct::tool

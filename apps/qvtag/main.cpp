@@ -1,0 +1,56 @@
+#include "Commands.h"
+
+#include <exception>
+
+#include <CLI/CLI.hpp>
+#include <fmt/format.h>
+
+namespace {
+
+/// 0 done, 1 some items failed, 2 wrong usage.
+constexpr int kWrongUsage = 2;
+
+void addSharedOptions(CLI::App& app, qvct::tool::ToolContext& context) {
+    using qvct::tool::Format;
+    auto* json = app.add_flag_callback(
+        "--json", [&] { context.format = Format::json; }, "One JSON document");
+    app.add_flag_callback(
+           "--jsonl", [&] { context.format = Format::jsonLines; }, "One line of JSON for each item")
+        ->excludes(json);
+    app.add_flag("--quiet,-q", context.quiet, "No notes and progress; failures are still told");
+    app.add_option("--taxonomy", context.taxonomyFile, "Property list to use as the default taxonomy")
+        ->type_name("FILE");
+    app.add_option("--resources", context.resourceDirectory,
+                   "Folder whose files replace the built-in resources")
+        ->type_name("DIR");
+}
+
+int run(int argc, char** argv) {
+    qvct::tool::ToolContext context;
+    CLI::App app("Describes sounds with tags: reads, derives and searches them.", "qvtag");
+    app.set_version_flag("--version", QVCT_VERSION);
+    app.require_subcommand(1);
+    app.fallthrough();
+    addSharedOptions(app, context);
+    app.parse_complete_callback([&context] { context.prepare(); });
+    qvct::tool::addAutotagCommand(app, context);
+    qvct::tool::addKeywordsCommand(app, context);
+    qvct::tool::addTaxonomyCommand(app, context);
+    try {
+        app.parse(argc, argv);
+    } catch (const CLI::ParseError& error) {
+        return app.exit(error) == 0 ? 0 : kWrongUsage;
+    }
+    return context.exitStatus();
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+    try {
+        return run(argc, argv);
+    } catch (const std::exception& error) {
+        fmt::print(stderr, "qvtag: {}\n", error.what());
+        return 1;
+    }
+}

@@ -1,0 +1,37 @@
+#pragma once
+
+#include "platform/PropertyList.h"
+
+#include <algorithm>
+#include <string_view>
+#include <utility>
+#include <vector>
+
+namespace qvct {
+
+/// What tagging services produce: a "label" and, where the tag has a weight, a "level".
+using TagDictionary = PropertyList::Dictionary;
+
+inline constexpr std::string_view kTagDictionaryLabelKey = "label";
+inline constexpr std::string_view kTagDictionaryLevelKey = "level";
+
+/// Tag dictionaries, each once, in the order in which they were added. Two are the same only when all their
+/// keys and values are.
+class TagDictionarySet {
+  public:
+    void insert(TagDictionary dictionary) {
+        if (std::find(begin(), end(), dictionary) == end()) dictionaries_.push_back(std::move(dictionary));
+    }
+    void insertAll(const TagDictionarySet& other) {
+        for (const TagDictionary& dictionary : other) insert(dictionary);
+    }
+    std::size_t size() const { return dictionaries_.size(); }
+    bool empty() const { return dictionaries_.empty(); }
+    std::vector<TagDictionary>::const_iterator begin() const { return dictionaries_.begin(); }
+    std::vector<TagDictionary>::const_iterator end() const { return dictionaries_.end(); }
+
+  private:
+    std::vector<TagDictionary> dictionaries_;
+};
+
+}  // namespace qvct

@@ -1,0 +1,111 @@
+#include "formats/ContentWalk.h"
+
+#include "platform/QVContentTaggingTypes.h"
+#include "platform/Text.h"
+
+#include <algorithm>
+#include <array>
+#include <cerrno>
+#include <cstring>
+#include <memory>
+#include <utility>
+#include <vector>
+
+#include <dirent.h>
+#include <fmt/format.h>
+#include <sys/stat.h>
+
+namespace qvct {
+namespace {
+
+using Identity = std::pair<dev_t, ino_t>;
+
+bool isBundleName(const URL& url) {
+    const FileType type = QVContentTaggingTypes::fallBackFileTypeForURL(url);
+    return type == kFileTypePatch || type == kFileTypeProject;
+}
+
+bool isPreviewOfOtherContent(const URL& url) {
+    constexpr std::array<std::string_view, 4> endings = {".cst.caf", ".vcp.caf", ".pst.caf", ".sxv.caf"};
+    const std::string name = lowercase(url.lastPathComponent());
+    return std::any_of(endings.begin(), endings.end(),
+                       [&name](auto ending) { return name.ends_with(ending); });
+}
+
+struct FolderEntry {
+    std::string name;
+    unsigned char kind;  // as readdir tells it
+};
+
+class Walk {
+  public:
+    Walk(const std::function<void(const URL&)>& item, const std::function<void(const Error&)>& failed)
+        : item_(item), failed_(failed) {}
+
+    void start(const std::string& path) {
+        const URL url = URL::fileURLWithPath(path);
+        struct stat status {};
+        if (::stat(url.path().c_str(), &status) != 0) return fail(url);
+        if (!S_ISDIR(status.st_mode) || isBundleName(url)) return item_(url);
+        folder(url, {status.st_dev, status.st_ino});
+    }
+
+  private:
+    void fail(const URL& url) {
+        failed_({std::string(QVCTErrorDomain), kErrorUnreadable,
+                 fmt::format("{}: {}", printable(url.path()), std::strerror(errno))});
+    }
+
+    void folder(const URL& url, Identity identity) {
+        if (std::find(open_.begin(), open_.end(), identity) != open_.end()) return;
+        std::vector<FolderEntry> entries;
+        if (!list(url, entries)) return fail(url);
+        open_.push_back(identity);
+        for (const FolderEntry& entry : entries)
+            visit(url.URLByAppendingPathComponent(entry.name), entry.kind);
+        open_.pop_back();
+    }
+
+    static bool list(const URL& url, std::vector<FolderEntry>& entries) {
+        const std::unique_ptr<DIR, int (*)(DIR*)> directory(::opendir(url.path().c_str()), ::closedir);
+        if (!directory) return false;
+        while (const dirent* entry = ::readdir(directory.get())) {
+            const std::string_view name = entry->d_name;
+            if (!name.starts_with('.')) entries.push_back({std::string(name), entry->d_type});
+        }
+        std::sort(entries.begin(), entries.end(),
+                  [](const auto& a, const auto& b) { return a.name < b.name; });
+        return true;
+    }
+
+    void visit(const URL& url, unsigned char kind) {
+        if (kind == DT_REG && !isContentName(url)) return;
+        struct stat status {};
+        const bool isKnown = kind == DT_REG;
+        if (!isKnown && ::stat(url.path().c_str(), &status) != 0) {
+            if (isContentName(url)) fail(url);
+            return;
+        }
+        const bool isFolder = !isKnown && S_ISDIR(status.st_mode);
+        if (isFolder && !isBundleName(url)) return folder(url, {status.st_dev, status.st_ino});
+        if (isContentName(url) && isFolder == isBundleName(url)) item_(url);
+    }
+
+    const std::function<void(const URL&)>& item_;
+    const std::function<void(const Error&)>& failed_;
+    std::vector<Identity> open_;  // the folders from the start down to where we are
+};
+
+}  // namespace
+
+bool isContentName(const URL& url) {
+    return QVContentTaggingTypes::fallBackFileTypeForURL(url) != kFileTypeNone &&
+           !url.lastPathComponent().starts_with('.') && !isPreviewOfOtherContent(url);
+}
+
+void walkContent(const std::string& path, const std::function<void(const URL& item)>& item,
+                 const std::function<void(const Error& error)>& failed) {
+    Walk(item, failed).start(path);
+}
+
+}  // namespace qvct

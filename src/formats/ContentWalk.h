@@ -1,0 +1,24 @@
+#pragma once
+
+#include "platform/Error.h"
+#include "platform/Url.h"
+
+#include <functional>
+#include <string>
+
+namespace qvct {
+
+/// Whether a name is that of content: its extension is that of a file kind that the framework knows, it is
+/// not hidden, and it is not the recorded preview of another item.
+bool isContentName(const URL& url);
+
+/// Calls `item` for every content item at or below `path`, in the order of names.
+///
+/// Folders are walked; a bundle is an item, what lies inside it is not. Links are followed, but a folder that
+/// lies inside itself is entered once. A path that names a file itself is an item whatever its name.
+/// What cannot be read is reported to `failed`, and the walk goes on.
+/// @cost  One listing a folder; files are looked at only where the file system does not tell their kind.
+void walkContent(const std::string& path, const std::function<void(const URL& item)>& item,
+                 const std::function<void(const Error& error)>& failed);
+
+}  // namespace qvct

@@ -1,0 +1,15 @@
+#pragma once
+
+#include <string>
+#include <string_view>
+
+namespace qvct {
+
+/// Keys that hosts and the framework derive from tag labels alike.
+class QVTagIdentifierUtility {
+  public:
+    /// The key under which a pole of a bipolar label ("Bright / Dark") is translated.
+    static std::string localizationKeyForJingJangTagLabel(std::string_view label, bool lowerValue);
+};
+
+}  // namespace qvct

@@ -1,0 +1,87 @@
+#include "taxonomy/TGRTCategory.h"
+
+#include "taxonomy/TGRTTag.h"
+
+#include <algorithm>
+#include <utility>
+
+#include <fmt/format.h>
+
+namespace qvct {
+
+TGRTCategory::TGRTCategory(std::string identifier)
+    : identifier_(std::move(identifier)), hash_(stringHash(identifier_)) {}
+
+std::shared_ptr<TGRTCategory> TGRTCategory::initWithIdentifier(std::string identifier) {
+    return std::shared_ptr<TGRTCategory>(new TGRTCategory(std::move(identifier)));
+}
+
+void TGRTCategory::addTag(const std::shared_ptr<TGRTTag>& tag) {
+    if (!tag) return;
+    ++revision_;
+    const auto parent = tag->parent();
+    const bool isOfThisTree = !parent || parent->category().get() == this;
+    // A tag that equals another one is only found below its own parent, and one from elsewhere brings a tree
+    // along.
+    if (!tags_.insert(tag) || !isOfThisTree || !tag->children().empty()) {
+        treeChanged();
+        if (parent && parent->category()) parent->category()->treeChanged();
+        return;
+    }
+    const auto [entry, isNew] = byLabel_.try_emplace(tag->label(), tag.get());
+    if (!isNew) entry->second = nullptr;
+}
+
+void TGRTCategory::removeTag(const std::shared_ptr<TGRTTag>& tag) {
+    if (!tag) return;
+    tags_.erase(*tag);
+    treeChanged();
+}
+
+void TGRTCategory::treeChanged() {
+    onlyCreated_ = false;
+    byLabel_.clear();
+    ++revision_;
+}
+
+TGRTCategory::IndexAnswer TGRTCategory::tagsWithLabel(const LabelKey& label) const {
+    if (!onlyCreated_) return {};
+    const auto hit = byLabel_.find(label);
+    if (hit == byLabel_.end()) return {nullptr, true};
+    return {hit->second, hit->second != nullptr};
+}
+
+ObjectSet<TGRTTag> TGRTCategory::rootTags() const {
+    ObjectSet<TGRTTag> roots;
+    for (const auto& tag : tags_) {
+        if (!tag->parent()) roots.insert(tag);
+    }
+    return roots;
+}
+
+int TGRTCategory::compareTag(const TGRTTag& a, const TGRTTag& b) const {
+    const auto index = [this](const TGRTTag& tag) {
+        return std::find_if(tags_.begin(), tags_.end(),
+                            [&tag](const auto& member) { return member->isEqual(tag); });
+    };
+    return index(a) > index(b) ? 1 : -1;
+}
+
+PropertyList::Dictionary TGRTCategory::dictionary() const {
+    PropertyList::Dictionary result;
+    for (const auto& tag : rootTags()) result.set(tag->serializedLabel(), tag->dictionary());
+    return result;
+}
+
+bool TGRTCategory::isEqual(const Object& other) const {
+    return dynamic_cast<const TGRTCategory*>(&other) != nullptr && other.hash() == hash();
+}
+
+std::string TGRTCategory::description() const {
+    std::string tagLines = "\n";
+    for (const auto& tag : tags_) tagLines += tag->description() + "\n";
+    return fmt::format("<TGRTCategory {}> identifier: {} tags:{}", static_cast<const void*>(this),
+                       identifier_, tagLines);
+}
+
+}  // namespace qvct

@@ -1,0 +1,98 @@
+#pragma once
+
+#include "platform/Object.h"
+#include "platform/ObjectSet.h"
+#include "platform/PropertyList.h"
+
+#include <cstdint>
+#include <memory>
+#include <string>
+#include <string_view>
+#include <unordered_map>
+#include <vector>
+
+namespace qvct {
+
+class TGRTTag;
+
+/// What a host sees of a category.
+class QVContentTaggingCategory {
+  public:
+    virtual ~QVContentTaggingCategory() = default;
+    virtual std::string identifier() const = 0;
+    /// All tags, at every depth.
+    virtual const ObjectSet<TGRTTag>& tags() const = 0;
+    virtual ObjectSet<TGRTTag> rootTags() const = 0;
+};
+
+/// A named bucket of tags, such as "Genres".
+///
+/// Tags join it as they are created. It keeps an index of their labels, so that a search does not walk the
+/// tree.
+class TGRTCategory : public Object, public QVContentTaggingCategory {
+  public:
+    static std::shared_ptr<TGRTCategory> initWithIdentifier(std::string identifier);
+
+    std::string identifier() const override { return identifier_; }
+    /// Does not change hash and equality, which are those of the identifier at creation.
+    void setIdentifier(std::string identifier) { identifier_ = std::move(identifier); }
+
+    void addTag(const std::shared_ptr<TGRTTag>& tag);
+    void removeTag(const std::shared_ptr<TGRTTag>& tag);
+    bool doesContain(const TGRTTag& tag) const { return tags_.contains(tag); }
+    const ObjectSet<TGRTTag>& tags() const override { return tags_; }
+    /// All tags in the order in which they joined.
+    const std::vector<std::shared_ptr<TGRTTag>>& orderedTags() const { return tags_.ordered(); }
+    ObjectSet<TGRTTag> rootTags() const override;
+
+    /// 1 when `a` joined after `b`, else -1, even for the same tag. A tag that is not here sorts last.
+    int compareTag(const TGRTTag& a, const TGRTTag& b) const;
+    PropertyList::Dictionary dictionary() const;
+
+    bool isEqual(const Object& other) const override;
+    std::size_t hash() const override { return hash_; }
+    std::string description() const override;
+
+    /// A label with its hash, made once for a search in several categories.
+    struct LabelKey {
+        explicit LabelKey(std::string_view label) : text(label), hash(stringHash(label)) {}
+        std::string_view text;
+        std::size_t hash;
+    };
+    /// What the index knows of a label. `exact` says that no other tag of the tree can have it; a tree that
+    /// was changed by anything but creating tags has no exact answers, and is to be searched.
+    struct IndexAnswer {
+        TGRTTag* only = nullptr;
+        bool exact = false;
+    };
+    IndexAnswer tagsWithLabel(const LabelKey& label) const;
+    /// Counts changes, for whoever keeps something that he derived from the tags.
+    std::uint64_t revision() const { return revision_; }
+    /// Tells the index that the tree was changed by other means than creating tags.
+    void treeChanged();
+
+  private:
+    struct LabelHash {
+        using is_transparent = void;
+        std::size_t operator()(const LabelKey& key) const { return key.hash; }
+        std::size_t operator()(const std::string& label) const { return stringHash(label); }
+    };
+    struct LabelEqual {
+        using is_transparent = void;
+        bool operator()(const std::string& a, const std::string& b) const { return a == b; }
+        bool operator()(const LabelKey& key, const std::string& label) const { return key.text == label; }
+        bool operator()(const std::string& label, const LabelKey& key) const { return key.text == label; }
+    };
+
+    explicit TGRTCategory(std::string identifier);
+
+    std::string identifier_;
+    std::size_t hash_;
+    ObjectSet<TGRTTag> tags_;
+    /// The tag with each label; null where several have it.
+    std::unordered_map<std::string, TGRTTag*, LabelHash, LabelEqual> byLabel_;
+    bool onlyCreated_ = true;
+    std::uint64_t revision_ = 0;
+};
+
+}  // namespace qvct

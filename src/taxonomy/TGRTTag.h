@@ -1,0 +1,98 @@
+#pragma once
+
+#include "platform/Object.h"
+#include "platform/ObjectSet.h"
+#include "platform/PropertyList.h"
+#include "taxonomy/TGRTLevel.h"
+#include "taxonomy/TagNormalization.h"
+
+#include <cstdint>
+#include <memory>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace qvct {
+
+class TGRTCategory;
+
+/// What a host sees of a tag.
+class QVContentTaggingTag {
+  public:
+    virtual ~QVContentTaggingTag() = default;
+    virtual std::string label() const = 0;
+    /// The names of the value steps; empty for most tags.
+    virtual std::vector<std::string> enumeratedLabels() const = 0;
+    /// 1 bipolar; 2 a flag, a content pack or a content type; else 0.
+    virtual std::int64_t type() const = 0;
+};
+
+/// One descriptive label of a taxonomy: a node of its category's tree, with the kind of value it takes.
+///
+/// A tag is owned by its category and its parent; its own links upward are weak, so the taxonomy must be kept
+/// while its tags are used. Equality and hash are those of (label, parent's label, category) at creation.
+class TGRTTag : public Object, public QVContentTaggingTag, public std::enable_shared_from_this<TGRTTag> {
+  public:
+    /// A tag of a raw label, whose markers become its value type and steps. It joins the parent's children
+    /// and the category. Parent and category may be null.
+    static std::shared_ptr<TGRTTag> initWithLabel(std::string_view rawLabel,
+                                                  const std::shared_ptr<TGRTTag>& parentTag,
+                                                  const std::shared_ptr<TGRTCategory>& category);
+    /// A tag without label; the dictionary is not read.
+    static std::shared_ptr<TGRTTag> initWithDictionary(const PropertyList::Dictionary& dictionary);
+
+    std::string label() const override { return label_; }
+    void setLabel(std::string label);
+    TagValueType valueType() const { return valueType_; }
+    void setValueType(TagValueType valueType) { valueType_ = valueType; }
+    std::int64_t numberOfTagValueSteps() const { return numberOfTagValueSteps_; }
+    void setNumberOfTagValueSteps(std::int64_t steps) { numberOfTagValueSteps_ = steps; }
+    const std::vector<std::string>& valueStepLabels() const { return valueStepLabels_; }
+    std::vector<std::string> enumeratedLabels() const override { return valueStepLabels_; }
+
+    /// Null for a root tag, and once the parent is gone.
+    std::shared_ptr<TGRTTag> parent() const { return parent_.lock(); }
+    std::shared_ptr<TGRTCategory> category() const { return category_.lock(); }
+    /// The category's identifier; empty without category.
+    std::string categoryIdentifier() const;
+    const ObjectSet<TGRTTag>& children() const { return children_; }
+    /// Takes the child over from its current parent's children. The child's own link upward stays as it is.
+    void addChild(const std::shared_ptr<TGRTTag>& tag);
+    void removeChild(const std::shared_ptr<TGRTTag>& tag);
+
+    /// The parent first, then its ancestors.
+    std::vector<std::shared_ptr<TGRTTag>> ancestors() const;
+    /// The children, then the descendants of each in turn.
+    std::vector<std::shared_ptr<TGRTTag>> descendants() const;
+    std::shared_ptr<TGRTTag> rootTag();
+
+    /// The label with its marker written back. Bipolar poles come out as named steps in braces.
+    std::string serializedLabel() const;
+    /// The subtree below this tag as the taxonomy's property list holds it.
+    PropertyList::Dictionary dictionary() const;
+
+    /// Null for a plain tag: it has no level of its own.
+    std::shared_ptr<TGRTLevel> defaultLevel() const { return defaultLevelForValueType(valueType_); }
+    static std::shared_ptr<TGRTLevel> defaultLevelForValueType(std::int64_t valueType);
+    std::int64_t type() const override;
+    /// The identifier of the content pack that this tag stands for; nothing in other categories.
+    std::optional<std::string> packageIdentifier() const;
+
+    bool isEqual(const Object& other) const override;
+    std::size_t hash() const override { return hash_; }
+    std::string description() const override;
+
+  private:
+    TGRTTag() = default;
+
+    std::string label_;
+    TagValueType valueType_ = kTagValuePlain;
+    std::int64_t numberOfTagValueSteps_ = 0;
+    std::vector<std::string> valueStepLabels_;
+    ObjectSet<TGRTTag> children_;
+    std::weak_ptr<TGRTTag> parent_;
+    std::weak_ptr<TGRTCategory> category_;
+    std::size_t hash_ = 0;
+};
+
+}  // namespace qvct

@@ -1,0 +1,120 @@
+#include "taxonomy/TGRTTagging.h"
+
+#include "platform/TaggingTypes.h"
+#include "platform/Text.h"
+#include "taxonomy/TGRTTaxonomy.h"
+
+#include <algorithm>
+#include <array>
+#include <cmath>
+#include <tuple>
+#include <utility>
+
+#include <fmt/format.h>
+
+namespace qvct {
+namespace {
+
+std::string levelText(float weight) {
+    constexpr std::array levels = {kTaggingLevel1, kTaggingLevel2, kTaggingLevel3, kTaggingLevel4};
+    for (std::size_t i = 0; i < levels.size(); ++i) {
+        if (weight == levels[i]) return localizedDecimal(static_cast<double>(i + 1), 0);
+    }
+    return localizedDecimal(static_cast<double>(weight) * 4.0, 1);
+}
+
+/// The tagging that one entry of a tagging dictionary describes, or null.
+std::shared_ptr<TGRTTagging> taggingForEntry(const PropertyList& entry, std::string_view categoryIdentifier,
+                                             TGRTTaxonomy& taxonomy) {
+    const auto* fields = entry.dictionary();
+    const auto* name = fields == nullptr ? nullptr : fields->value(QVContentTaggingLabelKeyName);
+    const std::string* label = name == nullptr ? nullptr : name->string();
+    if (label == nullptr || label->empty()) return nullptr;
+    const auto* weight = fields->value(QVContentTaggingWeightKeyName);
+    const std::optional<double> number = weight == nullptr ? std::nullopt : weight->doubleValue();
+    auto tagging = TGRTTagging::initWithTag(taxonomy.findOrCreateTagWithLabel(*label, categoryIdentifier),
+                                            number ? TGRTLevel::levelWithWeight(*number) : nullptr);
+    const auto* automatic = fields->value(QVContentTaggingAutoTaggingKeyName);
+    if (tagging) tagging->setIsAutoTagging(automatic != nullptr && automatic->boolValue());
+    return tagging;
+}
+
+PropertyList::Dictionary entryForTagging(const TGRTTagging& tagging) {
+    PropertyList::Dictionary entry{{std::string(QVContentTaggingLabelKeyName), tagging.label()}};
+    if (tagging.level()) entry.set(QVContentTaggingWeightKeyName, tagging.level()->weight());
+    if (tagging.isAutoTagging()) entry.set(QVContentTaggingAutoTaggingKeyName, true);
+    return entry;
+}
+
+}  // namespace
+
+TGRTTagging::TGRTTagging(std::shared_ptr<TGRTTag> tag, std::shared_ptr<TGRTLevel> level)
+    : tag_(std::move(tag)),
+      level_(std::move(level)),
+      label_(tag_->label()),
+      category_(tag_->categoryIdentifier()),
+      hash_(stringHash(fmt::format("<TGRTTagging>N:{} L:{} C:{}", label_,
+                                   static_cast<std::int64_t>(level_ ? level_->hash() : 0), category_))) {
+    if (const auto parent = tag_->parent()) parentLabel_ = parent->label();
+}
+
+std::shared_ptr<TGRTTagging> TGRTTagging::initWithTag(std::shared_ptr<TGRTTag> tag,
+                                                      std::shared_ptr<TGRTLevel> level) {
+    if (!tag || tag->label().empty()) return nullptr;
+    return std::shared_ptr<TGRTTagging>(new TGRTTagging(std::move(tag), std::move(level)));
+}
+
+float TGRTTagging::weight() const {
+    const auto level = level_ ? level_ : tag_->defaultLevel();
+    return level ? static_cast<float>(level->weight()) : 1.0F;
+}
+
+std::int64_t TGRTTagging::weightLevel() const {
+    return std::lround(weight() * 10.0F);
+}
+
+std::string TGRTTagging::displayString() const {
+    return level_ ? fmt::format("{} ({})", label_, levelText(weight())) : tag_->label();
+}
+
+ObjectSet<TGRTTagging> TGRTTagging::taggingsWithTaggingDictionary(const PropertyList* dictionary,
+                                                                  TGRTTaxonomy& taxonomy) {
+    ObjectSet<TGRTTagging> taggings;
+    if (dictionary == nullptr || dictionary->dictionary() == nullptr) return taggings;
+    for (const auto& category : *dictionary->dictionary()) {
+        if (category.value.array() == nullptr) continue;
+        for (const PropertyList& entry : *category.value.array()) {
+            taggings.insert(taggingForEntry(entry, category.key, taxonomy));
+        }
+    }
+    return taggings;
+}
+
+ObjectSet<TGRTTagging> TGRTTagging::taggingsWithTaggingDictionary(const PropertyList* dictionary) {
+    return taggingsWithTaggingDictionary(dictionary, *TGRTTaxonomy::mutableDefaultTaxonomy());
+}
+
+PropertyList::Dictionary TGRTTagging::taggingDictionaryForTaggings(const ObjectSet<TGRTTagging>& taggings) {
+    std::vector<std::shared_ptr<TGRTTagging>> sorted(taggings.begin(), taggings.end());
+    std::stable_sort(sorted.begin(), sorted.end(), [](const auto& a, const auto& b) {
+        return std::tie(a->category_, a->label_) < std::tie(b->category_, b->label_);
+    });
+    PropertyList::Dictionary result;
+    for (const auto& tagging : sorted) {
+        if (result.value(tagging->category_) == nullptr)
+            result.append(tagging->category_, PropertyList::Array{});
+        result.value(tagging->category_)->array()->emplace_back(entryForTagging(*tagging));
+    }
+    return result;
+}
+
+bool TGRTTagging::isEqual(const Object& other) const {
+    return dynamic_cast<const TGRTTagging*>(&other) != nullptr && other.hash() == hash();
+}
+
+std::string TGRTTagging::description() const {
+    return fmt::format("<TGRTTagging {}> Name: {} Level: {} Category: {}", static_cast<const void*>(this),
+                       label_, level_ ? level_->description() : "(null)", category_);
+}
+
+}  // namespace qvct

@@ -1,0 +1,152 @@
+#pragma once
+
+#include "platform/Error.h"
+#include "platform/Object.h"
+#include "platform/ObjectSet.h"
+#include "platform/PropertyList.h"
+#include "platform/Url.h"
+#include "taxonomy/TGRTCategory.h"
+#include "taxonomy/TGRTTag.h"
+
+#include <cstdint>
+#include <map>
+#include <memory>
+#include <optional>
+#include <span>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace qvct {
+
+class TGRTTagging;
+
+/// Which resource a taxonomy is built from. Other numbers name none and give an empty taxonomy.
+enum TaxonomyType : std::int64_t {
+    kDefaultTaxonomy = 0,
+    kLegacyVorthalTaxonomy = -1,  ///< the retired vocabulary of synth presets
+    kLegacyLoopTaxonomy = -2      ///< the retired vocabulary of loops
+};
+
+/// What a host sees of a taxonomy.
+class QVContentTaggingTaxonomy {
+  public:
+    using Localization = std::map<std::string, std::string>;
+
+    virtual ~QVContentTaggingTaxonomy() = default;
+    virtual const ObjectSet<TGRTCategory>& categories() const = 0;
+    virtual Localization localizationDictionary() const = 0;
+    virtual std::string localizedStrings() const = 0;
+    virtual bool writeToURL(const URL& url, Error* error = nullptr) const = 0;
+    virtual std::string serializedTaxonomyData() const = 0;
+};
+
+/// The catalogue of all tags: categories, each with a tree of tags.
+///
+/// Looking up is safe from several threads as long as nobody adds; whoever adds tags to a taxonomy that
+/// others use must see to it that one works at a time. Cached taxonomies live as long as the cache or a
+/// caller keeps them; tags do not keep their taxonomy alive.
+///
+/// Labels are compared as they are, case included, and without markers ("Bright / Dark", not "Bright /
+/// Dark-+").
+class TGRTTaxonomy : public Object, public QVContentTaggingTaxonomy {
+  public:
+    using TagPointer = std::shared_ptr<TGRTTag>;
+    using CategoryPointer = std::shared_ptr<TGRTCategory>;
+    using OptionalLabel = std::optional<std::string_view>;
+
+    // Obtaining one.
+
+    /// Read-only, shared.
+    static std::shared_ptr<TGRTTaxonomy> defaultTaxonomy();
+    /// Writable and shared: whoever adds a tag adds it for everybody.
+    static std::shared_ptr<TGRTTaxonomy> mutableDefaultTaxonomy();
+    /// Writable, a new one each time.
+    static std::shared_ptr<TGRTTaxonomy> testingTaxonomy();
+    static std::shared_ptr<TGRTTaxonomy> legacyVorthalTaxonomy();
+    static std::shared_ptr<TGRTTaxonomy> legacyLoopTaxonomy();
+    /// From the resource file of the type where there is one, else from the compiled-in copy.
+    static std::shared_ptr<TGRTTaxonomy> newTaxonomyOfType(std::int64_t type, bool readonly, bool useCache);
+    static std::optional<URL> taxonomyURLForType(std::int64_t type);
+    static std::optional<PropertyList::Dictionary> taxonomyDictionaryForType(std::int64_t type);
+    /// An empty taxonomy, and an error, when the file cannot be read.
+    static std::shared_ptr<TGRTTaxonomy> taxonomyWithContentsOfURL(const URL& url, Error* error = nullptr);
+    /// Null, and an error, when the bytes are no property list; null alone when they are no dictionary.
+    static std::shared_ptr<TGRTTaxonomy> taxonomyWithData(std::span<const std::uint8_t> data,
+                                                          Error* error = nullptr);
+    static std::shared_ptr<TGRTTaxonomy> taxonomyWithDictionary(const PropertyList::Dictionary& dictionary);
+    static std::shared_ptr<TGRTTaxonomy> init();
+    /// Drops the cached taxonomies, as a host does when memory runs short.
+    static void evictCache();
+
+    // Building.
+
+    /// Creates the tags of a dictionary of labels, siblings in the order of the user's locale; all of them,
+    /// each before its children.
+    static std::vector<TagPointer> tagsFromDictionary(const PropertyList::Dictionary& dictionary,
+                                                      const TagPointer& parentTag,
+                                                      const CategoryPointer& category);
+    static std::vector<TagPointer> tagsFromArray(const PropertyList::Array& array,
+                                                 const TagPointer& parentTag,
+                                                 const CategoryPointer& category);
+    static std::vector<std::string> sortedTagLabelsFromArray(std::vector<std::string> labels);
+
+    bool readOnly() const { return readOnly_; }
+    void setReadOnly(bool readOnly) { readOnly_ = readOnly; }
+    const ObjectSet<TGRTCategory>& categories() const override { return categories_; }
+    /// Ignored when read-only.
+    void addCategory(const CategoryPointer& category);
+    CategoryPointer findOrCreateCategoryWithIdentifier(std::string_view identifier,
+                                                       bool overwriteReadonly = false);
+    /// The tag with that label in the category, wherever it hangs; else a new one below the parent label (a
+    /// root tag when no such parent is found). Null when it would have to be made in a read-only taxonomy.
+    TagPointer findOrCreateTagWithLabel(std::string_view label, std::string_view categoryIdentifier);
+    TagPointer findOrCreateTagWithLabel(std::string_view label, OptionalLabel parentLabel,
+                                        std::string_view categoryIdentifier, bool overwriteReadonly = false);
+    /// Adds the content pack even to a read-only taxonomy. Null for an empty identifier.
+    TagPointer findOrCreateSoundPackTagWithIdentifier(std::string_view identifier);
+
+    // Finding. @cost O(1) for a label that its category has once; a walk over the tree for others.
+
+    CategoryPointer findCategoryWithIdentifier(std::string_view identifier) const;
+    TagPointer findTagForLabel(std::string_view label) const;
+    TagPointer findTagForLabel(std::string_view label, std::string_view categoryIdentifier) const;
+    TagPointer findTagForLabel(std::string_view label, OptionalLabel parentLabel,
+                               std::string_view categoryIdentifier) const;
+    /// Depth first, in order; a tag with the label under another parent is passed over with its children.
+    static TagPointer findTagWithLabel(std::string_view label, OptionalLabel parentLabel,
+                                       const ObjectSet<TGRTTag>& tags);
+    bool doesContainTag(const TagPointer& tag) const;
+    std::vector<TagPointer> allTags() const;
+    ObjectSet<TGRTTag> tagsForTaggings(const std::vector<std::shared_ptr<TGRTTagging>>& taggings,
+                                       OptionalLabel categoryIdentifier,
+                                       bool includingAncestors = false) const;
+    void appendTagsOfTagging(const TGRTTagging& tagging, ObjectSet<TGRTTag>& set,
+                             bool includingAncestors) const;
+    /// Changes whenever a category or tag was added, moved or renamed.
+    std::uint64_t revision() const;
+
+    // Writing.
+
+    PropertyList::Dictionary dictionary() const;
+    bool writeToURL(const URL& url, Error* error = nullptr) const override;
+    /// The binary property list; empty on failure.
+    std::string serializedTaxonomyData() const override;
+    /// Keys and display strings for a host's translation. With the user default "fakeLocalization" most
+    /// strings are reversed, so that untranslated ones stand out.
+    Localization localizationDictionary() const override;
+    /// The same as the text of a strings table.
+    std::string localizedStrings() const override;
+    /// Rows, header first, from which a mapping of retired tags is filled in.
+    std::vector<std::string> mappingExport() const;
+    std::string mappingExportForTag(const TGRTTag& tag) const;
+    std::string description() const override;
+
+  private:
+    TGRTTaxonomy() = default;
+
+    ObjectSet<TGRTCategory> categories_;
+    bool readOnly_ = false;
+};
+
+}  // namespace qvct

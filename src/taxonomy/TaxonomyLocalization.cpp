@@ -1,0 +1,104 @@
+#include "platform/FileAccess.h"
+#include "platform/ResourceBundle.h"
+#include "platform/Text.h"
+#include "platform/UserDefaults.h"
+#include "resources/QVCTCompiledResources.h"
+#include "taxonomy/QVTagIdentifierUtility.h"
+#include "taxonomy/TGRTTaxonomy.h"
+
+#include <algorithm>
+#include <array>
+#include <utility>
+
+#include <fmt/format.h>
+
+namespace qvct {
+namespace {
+
+using Localization = TGRTTaxonomy::Localization;
+
+constexpr std::array<std::pair<const char*, const char*>, 12> kKeyNames = {{{"C", "Key: C"},
+                                                                            {"CSharp", "Key: C#"},
+                                                                            {"D", "Key: D"},
+                                                                            {"DSharp", "Key: D#"},
+                                                                            {"E", "Key: E"},
+                                                                            {"F", "Key: F"},
+                                                                            {"FSharp", "Key: F#"},
+                                                                            {"G", "Key: G"},
+                                                                            {"GSharp", "Key: G#"},
+                                                                            {"A", "Key: A"},
+                                                                            {"ASharp", "Key: A#"},
+                                                                            {"B", "Key: B"}}};
+
+constexpr std::array<std::pair<const char*, const char*>, 3> kAdjustments = {
+    {{"Generative Instrument Loop", "Drummer Loop"}, {"Non-rhythmic", "Non-Rhythmic"}, {" KeyType", ""}}};
+
+/// "identifier;name" of every content pack, from the resource folder or the compiled copy.
+std::vector<std::string> packDisplayNameLines() {
+    if (const auto path = ResourceBundle::pathForResource("PackDisplayNames", "csv")) {
+        if (const auto text = readTextFile(*path)) return split(replaceAll(*text, "\r\n", "\n"), "\n");
+    }
+    return QVCTCompiledResources::PackDisplayNames().value_or(std::vector<std::string>{});
+}
+
+void replaceIfPresent(Localization& strings, const std::string& key, std::string_view value) {
+    if (const auto entry = strings.find(key); entry != strings.end()) entry->second = value;
+}
+
+std::string shown(const std::string& text, bool reversed) {
+    return reversed ? reversedString(text) : text;
+}
+
+void addTag(Localization& strings, const TGRTTag& tag, bool reversed) {
+    const std::string label = tag.label();
+    strings[label] = shown(label, reversed);
+    for (std::size_t i = 0; i < tag.valueStepLabels().size(); ++i) {
+        strings[fmt::format("{}_{}", label, i)] = shown(tag.valueStepLabels()[i], reversed);
+    }
+    if (tag.valueType() != kTagValueBipolar) return;
+    // The poles have keys of their own, whether they came as steps or not; their names are never reversed.
+    const std::vector<std::string> poles = split(label, " / ");
+    strings[QVTagIdentifierUtility::localizationKeyForJingJangTagLabel(label, true)] = poles[0];
+    strings[QVTagIdentifierUtility::localizationKeyForJingJangTagLabel(label, false)] =
+        poles.size() > 1 ? poles[1] : poles[0];
+}
+
+}  // namespace
+
+std::string QVTagIdentifierUtility::localizationKeyForJingJangTagLabel(std::string_view label,
+                                                                       bool lowerValue) {
+    return fmt::format("{}_{}", label, lowerValue ? "lowerPole" : "upperPole");
+}
+
+Localization TGRTTaxonomy::localizationDictionary() const {
+    const bool reversed = UserDefaults::boolForKey("fakeLocalization");
+    Localization strings;
+    std::vector<TagPointer> tags = allTags();
+    std::stable_sort(tags.begin(), tags.end(),
+                     [](const auto& a, const auto& b) { return a->label() < b->label(); });
+    for (const auto& tag : tags) addTag(strings, *tag, reversed);
+    for (const auto& category : categories_) {
+        strings[category->identifier()] = shown(category->identifier(), reversed);
+    }
+    for (const std::string& line : packDisplayNameLines()) {
+        const std::size_t separator = line.find(';');
+        if (separator != std::string::npos) {
+            replaceIfPresent(strings, line.substr(0, separator),
+                             std::string_view(line).substr(separator + 1));
+        }
+    }
+    for (const auto& [key, name] : kKeyNames) replaceIfPresent(strings, key, name);
+    for (auto& [key, value] : strings) {
+        for (const auto& [from, to] : kAdjustments) value = replaceAll(value, from, to);
+    }
+    return strings;
+}
+
+std::string TGRTTaxonomy::localizedStrings() const {
+    std::string table;
+    for (const auto& [key, value] : localizationDictionary())
+        table += fmt::format("\"{}\" = \"{}\";\n\n", key, value);
+    return table;
+}
+
+}  // namespace qvct
