@@ -19,10 +19,6 @@ std::string_view withoutLastCharacter(std::string_view text) {
     return text;
 }
 
-bool isAsciiWordCharacter(char c) {
-    return (c >= '0' && c <= '9') || (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z') || c == '_';
-}
-
 /// UTF-8 of the characters whose full case folding holds an ASCII letter (Unicode's CaseFolding.txt).
 constexpr std::array<std::string_view, 19> kFoldIntoAscii = {
     "\xC3\x9F",      // sharp s: ss
@@ -71,10 +67,6 @@ std::string_view requiredLiteral(std::string_view keyword) {
     // A quantifier makes the character before it optional.
     const bool isQuantified = kQuantifiers.find(keyword[meta]) != std::string_view::npos;
     return isQuantified ? withoutLastCharacter(literal) : literal;
-}
-
-bool isAsciiWordBoundary(char before, char after) {
-    return isAsciiWordCharacter(before) != isAsciiWordCharacter(after);
 }
 
 bool foldsApartFromAscii(std::string_view text) {

@@ -16,8 +16,6 @@ bool isPlainKeyword(std::string_view keyword);
 /// A text that is part of every occurrence, so that without it there is none. Empty when nothing is certain.
 std::string_view requiredLiteral(std::string_view keyword);
 
-/// Whether a word begins or ends between these two ASCII characters; 0 stands for the end of the text.
-bool isAsciiWordBoundary(char before, char after);
 /// Whether every character of the text that is not ASCII stays so when case is folded: none is a long s, a
 /// Kelvin sign, a sharp s or a ligature, which an expression matches with plain letters.
 bool foldsApartFromAscii(std::string_view text);

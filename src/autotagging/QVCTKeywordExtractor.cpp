@@ -157,25 +157,21 @@ void QVCTKeywordExtractor::mark(std::uint32_t keyword, Mark mark) {
 }
 
 void QVCTKeywordExtractor::scanForCandidates(std::string_view text) {
-    // Folding moves characters about, so nothing is decided on the spot in a folded text.
-    const bool needsFolding = !isAscii(text) && (hasNonAsciiLiterals_ || !foldsApartFromAscii(text));
-    const std::string foldedText = needsFolding ? foldCase(text) : std::string();
-    const std::string_view scanned = needsFolding ? std::string_view(foldedText) : text;
-    const auto ascii = [](char c) { return static_cast<unsigned char>(c) < 0x80; };
-    scanner_.scan(scanned, [&](std::uint32_t index, std::size_t end) {
+    scanner_.scan(text, [&](std::uint32_t index, std::size_t end) {
         const Literal& literal = literals_[index];
-        const std::size_t start = end - literal.text.size();
-        const char before = start == 0 ? '\0' : scanned[start - 1];
-        const char after = end == scanned.size() ? '\0' : scanned[end];
         for (const std::uint32_t keyword : literal.expressions) mark(keyword, Mark::candidate);
-        if (literal.plain.empty()) return;
-        const bool isCertain = !needsFolding && ascii(before) && ascii(after);
-        if (isCertain &&
-            !(isAsciiWordBoundary(before, scanned[start]) && isAsciiWordBoundary(scanned[end - 1], after))) {
+        if (literal.plain.empty() || !isWordBoundary(text, end - literal.text.size()) ||
+            !isWordBoundary(text, end)) {
             return;
         }
-        for (const std::uint32_t keyword : literal.plain)
-            mark(keyword, isCertain ? Mark::found : Mark::candidate);
+        for (const std::uint32_t keyword : literal.plain) mark(keyword, Mark::found);
+    });
+    // Letters that only case folding makes equal to a keyword's show in the folded text, but folding moves
+    // characters about, so there nothing is decided on the spot.
+    if (isAscii(text) || (!hasNonAsciiLiterals_ && foldsApartFromAscii(text))) return;
+    scanner_.scan(foldCase(text), [this](std::uint32_t index, std::size_t /*end*/) {
+        for (const std::uint32_t keyword : literals_[index].expressions) mark(keyword, Mark::candidate);
+        for (const std::uint32_t keyword : literals_[index].plain) mark(keyword, Mark::candidate);
     });
 }
 

@@ -19,6 +19,9 @@ inline constexpr std::string_view kTagDictionaryLevelKey = "level";
 /// keys and values are.
 class TagDictionarySet {
   public:
+    using value_type = TagDictionary;
+    using const_iterator = std::vector<TagDictionary>::const_iterator;
+
     void insert(TagDictionary dictionary) {
         if (std::find(begin(), end(), dictionary) == end()) dictionaries_.push_back(std::move(dictionary));
     }
@@ -27,8 +30,8 @@ class TagDictionarySet {
     }
     std::size_t size() const { return dictionaries_.size(); }
     bool empty() const { return dictionaries_.empty(); }
-    std::vector<TagDictionary>::const_iterator begin() const { return dictionaries_.begin(); }
-    std::vector<TagDictionary>::const_iterator end() const { return dictionaries_.end(); }
+    const_iterator begin() const { return dictionaries_.begin(); }
+    const_iterator end() const { return dictionaries_.end(); }
 
   private:
     std::vector<TagDictionary> dictionaries_;

@@ -98,6 +98,24 @@ std::string_view trim(std::string_view text, IsTrimmed isTrimmed) {
     return text.substr(static_cast<std::size_t>(first), static_cast<std::size_t>(last - first));
 }
 
+bool isAsciiWordCharacter(char c) {
+    return (c >= '0' && c <= '9') || (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z') || c == '_';
+}
+
+/// ICU's "\w".
+bool isWordCharacter(UChar32 c) {
+    constexpr UChar32 zeroWidthNonJoiner = 0x200C;
+    constexpr UChar32 zeroWidthJoiner = 0x200D;
+    constexpr uint32_t wordCategories = U_GC_M_MASK | U_GC_ND_MASK | U_GC_PC_MASK;
+    return u_isUAlphabetic(c) || (U_GET_GC_MASK(c) & wordCategories) != 0 || c == zeroWidthNonJoiner ||
+           c == zeroWidthJoiner;
+}
+
+/// Whether the character is no word's beginning but goes with what stands before it.
+bool isCombining(UChar32 c) {
+    return u_hasBinaryProperty(c, UCHAR_GRAPHEME_EXTEND) != 0 || u_charType(c) == U_FORMAT_CHAR;
+}
+
 bool isBlank(UChar32 c) {
     return u_charType(c) == U_SPACE_SEPARATOR || c == '\t';
 }
@@ -177,6 +195,24 @@ std::string replaceNonAlphanumerics(std::string_view text, std::string_view kept
                          : replacement;
     }
     return result;
+}
+
+bool isWordBoundary(std::string_view text, std::size_t offset) {
+    const auto length = static_cast<int32_t>(text.size());
+    const auto start = static_cast<int32_t>(offset);
+    bool isWord = false;
+    if (start < length) {
+        int32_t next = start;
+        const UChar32 c = nextCharacter(text, next, length);
+        if (c >= 0x80 && isCombining(c)) return false;
+        isWord = c < 0x80 ? isAsciiWordCharacter(text[offset]) : isWordCharacter(c);
+    }
+    for (int32_t before = start; before > 0;) {
+        const UChar32 c = previousCharacter(text, 0, before);
+        if (c < 0x80) return isWord != (c >= 0 && isAsciiWordCharacter(static_cast<char>(c)));
+        if (!isCombining(c)) return isWord != isWordCharacter(c);
+    }
+    return isWord;
 }
 
 std::string_view trimBlanks(std::string_view text) {

@@ -27,6 +27,10 @@ std::string reversedString(std::string_view text);
 std::string replaceNonAlphanumerics(std::string_view text, std::string_view kept,
                                     std::string_view replacement);
 
+/// Whether a word begins or ends at that byte offset, exactly as "\b" of an ICU expression has it: between a
+/// letter, digit or connector and something else, combining marks being part of what they follow.
+bool isWordBoundary(std::string_view text, std::size_t offset);
+
 /// Without the blanks (and, if asked for, line breaks) at both ends.
 std::string_view trimBlanks(std::string_view text);
 std::string_view trimBlanksAndLineBreaks(std::string_view text);

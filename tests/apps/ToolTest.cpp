@@ -1,0 +1,185 @@
+#include "support/RunTool.h"
+
+#include <filesystem>
+#include <set>
+
+#include <gmock/gmock.h>
+#include <unistd.h>
+
+namespace qvct::test {
+namespace {
+
+using nlohmann::json;
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::IsEmpty;
+using testing::Not;
+
+std::vector<std::string> names(const json& items) {
+    std::vector<std::string> result;
+    for (const json& item : items)
+        result.push_back(std::filesystem::path(item["path"].get<std::string>()).filename());
+    return result;
+}
+
+std::set<std::string> labels(const json& item) {
+    std::set<std::string> result;
+    for (const json& tagging : item["taggings"]) result.insert(tagging["label"]);
+    return result;
+}
+
+TEST(Autotag, WalksFoldersButNotBundles) {
+    const TemporaryFolder folder;
+    for (const char* name :
+         {"b/Kick.wav", "a/Warm Pad.patch/inside.caf", "a/Bass.cst", "a/Bass.cst.plist", "a/Bass.cst.caf",
+          "a/notes.txt", "a/.hidden.wav", "a/._Kick.wav", "c/UPPER.AIFF", "d/file.patch"}) {
+        folder.write(name, "");
+    }
+    std::filesystem::create_directory_symlink(folder.path(), folder.path("b/circle"));
+    const ToolResult result = runTool({"autotag", "--json", folder.path()});
+    EXPECT_EQ(result.status, 0) << result.errors;
+    EXPECT_THAT(names(result.json()), ElementsAre("Bass.cst", "Warm Pad.patch", "Kick.wav", "UPPER.AIFF"));
+    EXPECT_THAT(labels(result.json()[2]), testing::IsSupersetOf({"Kick", "Drums"}));
+}
+
+TEST(Autotag, WritesOneStableRecordAnItem) {
+    const TemporaryFolder folder;
+    const std::string path = folder.write("Dark Kick.wav", "");
+    const json expected = json::parse(R"([
+        {"label":"Bright / Dark","parent":null,"category":"Sound Descriptors","level":1.0,"auto":true,"weightLevel":10},
+        {"label":"Drums","parent":null,"category":"Source","level":null,"auto":true,"weightLevel":10},
+        {"label":"Kick","parent":"Drums","category":"Source","level":null,"auto":true,"weightLevel":10}])");
+    const ToolResult lines = runTool({"--jsonl", "autotag", path, path});
+    EXPECT_EQ(std::count(lines.output.begin(), lines.output.end(), '\n'), 2);
+    const json first = json::parse(lines.output.substr(0, lines.output.find('\n')));
+    EXPECT_EQ(first["path"], path);
+    EXPECT_EQ(first["type"], "audio");
+    json withoutFolder = json::array();
+    for (const json& tagging : first["taggings"]) withoutFolder.push_back(tagging);
+    EXPECT_EQ(withoutFolder, expected);
+}
+
+TEST(Autotag, NamesWhatFailsAndDoesTheRest) {
+    const TemporaryFolder folder;
+    folder.write("Kick.wav", "");
+    folder.write("bad \xff\n.wav", "");
+    folder.write("list/DefaultTaxonomy.plist", "<plist><dict><key>categories</key>");
+    folder.write("list/DefaultKeywordMapping.plist",
+                 "<plist version=\"1.0\"><dict><key>(open</key><string>Kick</string></dict></plist>");
+    struct {
+        const char* what;
+        std::vector<std::string> arguments;
+        int status;
+        std::vector<std::string> messages;
+    } const cases[] = {
+        {"missing path",
+         {folder.path("none"), folder.path("Kick.wav")},
+         1,
+         {folder.path("none") + ": No such file"}},
+        {"name that is not UTF-8", {folder.path()}, 1, {"bad \\xff\\x0a.wav: the name is not UTF-8"}},
+        {"broken resources",
+         {"--resources", folder.path("list"), folder.path("Kick.wav")},
+         1,
+         {"DefaultTaxonomy.plist", "using the built-in one", "Error when evalating regex: (open"}},
+        {"missing resource folder",
+         {"--resources", "/none", folder.path("Kick.wav")},
+         1,
+         {"/none: no such resource folder"}},
+        {"unknown service",
+         {"--services", "keywords,magic", folder.path("Kick.wav")},
+         2,
+         {"no service \"magic\""}},
+        {"missing keywords",
+         {"--keywords", "/none.plist", folder.path("Kick.wav")},
+         1,
+         {"/none.plist: No such file"}},
+    };
+    for (const auto& c : cases) {
+        std::vector<std::string> arguments = {"autotag", "--json"};
+        arguments.insert(arguments.end(), c.arguments.begin(), c.arguments.end());
+        const ToolResult result = runTool(arguments);
+        EXPECT_EQ(result.status, c.status) << c.what << result.errors;
+        EXPECT_THAT(names(result.json()), ElementsAre("Kick.wav")) << c.what;
+        for (const std::string& message : c.messages)
+            EXPECT_THAT(result.errors, HasSubstr(message)) << c.what;
+        EXPECT_EQ(std::count(result.errors.begin(), result.errors.end(), '\n'),
+                  std::string_view(c.what) == "broken resources" ? 2 : 1)
+            << result.errors;
+    }
+}
+
+TEST(Autotag, CannotReadAFolderButGoesOn) {
+    const TemporaryFolder folder;
+    folder.write("a/Kick.wav", "");
+    folder.write("b/Snare.wav", "");
+    namespace fs = std::filesystem;
+    fs::permissions(folder.path(), fs::perms::others_read | fs::perms::others_exec, fs::perm_options::add);
+    fs::permissions(folder.path("a"), fs::perms::none);
+    // The superuser reads every folder, so he becomes nobody for this.
+    const ToolResult result = runTool({"autotag", "--json", folder.path()},
+                                      ::geteuid() == 0 ? "setpriv --reuid=65534 --clear-groups" : "");
+    fs::permissions(folder.path("a"), fs::perms::owner_all);
+    EXPECT_EQ(result.status, 1);
+    EXPECT_THAT(names(result.json()), ElementsAre("Snare.wav"));
+    EXPECT_THAT(result.errors, HasSubstr("/a: Permission denied"));
+}
+
+TEST(Keywords, CountsLabels) {
+    const ToolResult result = runTool({"keywords", "Drum Kit", "--json"});
+    EXPECT_EQ(result.json()["Drum Kit"], 2);  // as a key it yields others and itself, as a label itself
+    EXPECT_THAT(runTool({"keywords", "Warm Pad"}).output, HasSubstr("Cold / Warm (1.0)"));
+    EXPECT_EQ(runTool({"keywords", "\xff"}).status, 1);
+}
+
+TEST(Taxonomy, ShowsFindsSearchesAndExports) {
+    const json shown = runTool({"taxonomy", "show", "Rhythm", "--json"}).json();
+    EXPECT_EQ(shown[0]["category"], "Rhythm");
+    EXPECT_EQ(shown[0]["tags"].size(), 4U);
+    EXPECT_EQ(runTool({"taxonomy", "show", "--json"}).json().size(), 22U);
+
+    const json found = runTool({"taxonomy", "find", "Deep House", "--category", "Genres", "--json"}).json();
+    EXPECT_EQ(found["parent"], "House");
+    const ToolResult lost = runTool({"taxonomy", "find", "deep house"});
+    EXPECT_EQ(lost.status, 1);
+    EXPECT_THAT(lost.errors, HasSubstr("there are: Deep House"));
+    const ToolResult category = runTool({"taxonomy", "show", "Rhythm", "Nonsense"});
+    EXPECT_EQ(category.status, 1);
+    EXPECT_THAT(category.output, HasSubstr("Triplet"));
+    EXPECT_THAT(category.errors, HasSubstr("no category \"Nonsense\""));
+
+    EXPECT_THAT(runTool({"taxonomy", "search", "REGGAE", "--json"}).json(),
+                ElementsAre("Reggaeton", "Reggae & Ska", "Roots Reggae"));
+    EXPECT_THAT(runTool({"taxonomy", "export", "mapping"}).output, HasSubstr("\nRhythm;Triplet;;;;;;\n"));
+    EXPECT_THAT(runTool({"taxonomy", "export", "strings"}).output,
+                HasSubstr("\"CSharp\" = \"Key: C#\";\n\n"));
+}
+
+TEST(Taxonomy, AnExportedOneServesAsTheTaxonomyAgain) {
+    const TemporaryFolder folder;
+    const std::string path = folder.write("own.plist", runTool({"taxonomy", "export", "plist"}).output);
+    EXPECT_EQ(runTool({"--taxonomy", path, "taxonomy", "show", "--json"}).output,
+              runTool({"taxonomy", "show", "--json"}).output);
+    const ToolResult environment =
+        runTool({"taxonomy", "show", "--json"}, "QVCT_RESOURCES=" + folder.path("nowhere"));
+    EXPECT_EQ(environment.status, 1);
+}
+
+TEST(Usage, WrongWordsEndWithTwo) {
+    for (const std::vector<std::string>& arguments : {std::vector<std::string>{},
+                                                      {"nonsense"},
+                                                      {"autotag"},
+                                                      {"taxonomy", "export", "pdf"},
+                                                      {"autotag", "--nonsense", "x"}}) {
+        const ToolResult result = runTool(arguments);
+        EXPECT_EQ(result.status, 2);
+        EXPECT_THAT(result.output, IsEmpty());
+        EXPECT_THAT(result.errors, Not(IsEmpty()));
+    }
+    EXPECT_EQ(runTool({"--help"}).status, 0);
+    for (const char* command : {"autotag", "keywords", "taxonomy"}) {
+        EXPECT_THAT(runTool({command, "--help"}).output, HasSubstr("Example:\n  qvtag ")) << command;
+    }
+}
+
+}  // namespace
+}  // namespace qvct::test

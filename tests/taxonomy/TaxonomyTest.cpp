@@ -1,0 +1,284 @@
+#include "platform/PropertyListFile.h"
+#include "platform/ResourceBundle.h"
+#include "platform/TaggingTypes.h"
+#include "platform/UserDefaults.h"
+#include "support/TemporaryFolder.h"
+#include "taxonomy/TGRTTaxonomy.h"
+#include "taxonomy/TGRTTaxonomySearching.h"
+
+#include <cmath>
+#include <random>
+
+#include <gmock/gmock.h>
+
+namespace qvct {
+namespace {
+
+using testing::Contains;
+using testing::ElementsAre;
+using testing::IsEmpty;
+using Dictionary = PropertyList::Dictionary;
+using TagPointer = std::shared_ptr<TGRTTag>;
+
+std::shared_ptr<TGRTTaxonomy> taxonomyOf(Dictionary categories) {
+    return TGRTTaxonomy::taxonomyWithDictionary(Dictionary{{"categories", std::move(categories)}});
+}
+
+std::vector<std::string> labels(const auto& tags) {
+    std::vector<std::string> result;
+    for (const auto& tag : tags) result.push_back(tag->label());
+    return result;
+}
+
+TEST(Tag, BelongsToParentAndCategoryAndIsKnownByTheThreeLabels) {
+    const auto category = TGRTCategory::initWithIdentifier("Genres");
+    const auto house = TGRTTag::initWithLabel("House", nullptr, category);
+    const auto deep = TGRTTag::initWithLabel("Deep!", house, category);
+    const auto other =
+        TGRTTag::initWithLabel("Deep", TGRTTag::initWithLabel("Techno", nullptr, category), category);
+    EXPECT_THAT(labels(category->orderedTags()), ElementsAre("House", "Deep", "Techno", "Deep"));
+    EXPECT_FALSE(deep->isEqual(*other));
+    const auto elsewhere = TGRTCategory::initWithIdentifier("Genres");
+    EXPECT_TRUE(deep->isEqual(
+        *TGRTTag::initWithLabel("Deep", TGRTTag::initWithLabel("House", nullptr, elsewhere), elsewhere)));
+    deep->setLabel("Changed");
+    EXPECT_FALSE(deep->isEqual(*TGRTTag::initWithLabel("Changed", house, elsewhere)));
+    EXPECT_EQ(category->compareTag(*house, *house), -1);
+    EXPECT_EQ(category->compareTag(*deep, *house), 1);
+    EXPECT_EQ(category->compareTag(*TGRTTag::initWithLabel("not here", nullptr, nullptr), *deep), 1);
+}
+
+TEST(Tag, WritesItsMarkersSoThatTheyParseToTheSameTag) {
+    struct {
+        const char *raw, *serialized;
+        double defaultWeight;  // -1: none
+        int type;
+    } const cases[] = {
+        {"Bright / Dark-+", "Bright / Dark{Bright,Dark}", 0.0, 1},
+        {"Distortion[Light Distortion,Heavy Distortion]", "Distortion[Light Distortion,Heavy Distortion]",
+         1.0, 0},
+        {"Tempo$5", "Tempo$5", 1.0, 0},
+        {"Loudness%", "Loudness%", 1.0, 0},
+        {"Featured!", "Featured!", 1.0, 2},
+        {"Bass", "Bass", -1, 0},
+    };
+    for (const auto& c : cases) {
+        const auto tag = TGRTTag::initWithLabel(c.raw, nullptr, TGRTCategory::initWithIdentifier("Effects"));
+        EXPECT_EQ(tag->serializedLabel(), c.serialized);
+        const auto again = TGRTTag::initWithLabel(tag->serializedLabel(), nullptr, nullptr);
+        EXPECT_EQ(again->label(), tag->label());
+        EXPECT_EQ(again->valueType(), tag->valueType());
+        EXPECT_EQ(again->valueStepLabels(), tag->valueStepLabels());
+        EXPECT_EQ(tag->defaultLevel() ? tag->defaultLevel()->weight() : -1, c.defaultWeight) << c.raw;
+        EXPECT_EQ(tag->type(), c.type) << c.raw;
+    }
+}
+
+TEST(Tag, MakesPackageIdentifiersOfContentPacksOnly) {
+    const auto packs = TGRTCategory::initWithIdentifier(std::string(QVCategorySoundpackIdentifier));
+    const auto identifier = [&packs](const char* label) {
+        return TGRTTag::initWithLabel(label, nullptr, packs)->packageIdentifier();
+    };
+    EXPECT_EQ(identifier(" Essential Hip  Hop? "), "essential_hip_hop_");
+    EXPECT_EQ(identifier("\xc3\x84rger & 808s"), "\xc3\xa4rger_808s");
+    EXPECT_EQ(TGRTTag::initWithLabel("x", nullptr, nullptr)->packageIdentifier(), std::nullopt);
+}
+
+TEST(Level, ClampsTheWeightButNotItsIdentity) {
+    EXPECT_EQ(TGRTLevel::levelWithWeight(1.5)->weight(), 1.0);
+    EXPECT_EQ(TGRTLevel::levelWithWeight(-0.5)->weight(), 0.0);
+    EXPECT_FALSE(TGRTLevel::levelWithWeight(1.5)->isEqual(*TGRTLevel::levelWithWeight(1.0)));
+    EXPECT_TRUE(TGRTLevel::levelWithWeight(0.5)->isEqual(*TGRTLevel::levelWithWeight(0.5000001)));
+    EXPECT_EQ(TGRTLevel::levelWithWeight(std::nan(""))->weight(), 0.0);
+}
+
+TEST(Taxonomy, BuildsSubtreesInOrderWithSiblingsSorted) {
+    const auto taxonomy = taxonomyOf(Dictionary{{"Z", Dictionary{{"b", PropertyList::Array{"y", "X", 7}},
+                                                                 {"A", Dictionary{{"c", Dictionary{}}}},
+                                                                 {"d", "text"}}},
+                                                {"Empty", 3}});
+    const auto category = taxonomy->findCategoryWithIdentifier("Z");
+    EXPECT_THAT(labels(category->orderedTags()), ElementsAre("A", "c", "b", "X", "y", "d"));
+    EXPECT_THAT(labels(category->rootTags()), ElementsAre("A", "b", "d"));
+    EXPECT_TRUE(taxonomy->findCategoryWithIdentifier("Empty")->tags().empty());
+}
+
+TEST(Taxonomy, SurvivesBeingWrittenAndReadBack) {
+    const test::TemporaryFolder folder;
+    const URL url = URL::fileURLWithPath(folder.path("taxonomy.plist"));
+    const auto original = TGRTTaxonomy::defaultTaxonomy();
+    Error error;
+    ASSERT_TRUE(original->writeToURL(url, &error)) << error.message;
+    const auto read = TGRTTaxonomy::taxonomyWithContentsOfURL(url, &error);
+    EXPECT_EQ(read->categories(), original->categories());
+    const auto originalTags = original->allTags();
+    const auto readTags = read->allTags();
+    ASSERT_EQ(readTags.size(), originalTags.size());
+    for (std::size_t i = 0; i < readTags.size(); ++i) EXPECT_TRUE(readTags[i]->isEqual(*originalTags[i]));
+    const std::string binary = original->serializedTaxonomyData();
+    const auto fromData =
+        TGRTTaxonomy::taxonomyWithData({reinterpret_cast<const std::uint8_t*>(binary.data()), binary.size()});
+    EXPECT_EQ(fromData->allTags().size(), originalTags.size());
+}
+
+TEST(Taxonomy, SaysWhatCouldNotBeRead) {
+    Error error;
+    const auto empty =
+        TGRTTaxonomy::taxonomyWithContentsOfURL(URL::fileURLWithPath("/no/such.plist"), &error);
+    EXPECT_TRUE(empty->categories().empty());
+    EXPECT_THAT(error.message, testing::HasSubstr("/no/such.plist"));
+    const std::string noList = "<plist><string>x</string></plist>";
+    Error none;
+    EXPECT_EQ(TGRTTaxonomy::taxonomyWithData(
+                  {reinterpret_cast<const std::uint8_t*>(noList.data()), noList.size()}, &none),
+              nullptr);
+    EXPECT_EQ(none.message, "");
+}
+
+TEST(Taxonomy, SharesCachedInstancesUntilTheyAreEvicted) {
+    const auto first = TGRTTaxonomy::defaultTaxonomy();
+    EXPECT_EQ(TGRTTaxonomy::defaultTaxonomy(), first);
+    EXPECT_NE(TGRTTaxonomy::mutableDefaultTaxonomy(), first);
+    EXPECT_NE(TGRTTaxonomy::testingTaxonomy(), TGRTTaxonomy::testingTaxonomy());
+    TGRTTaxonomy::evictCache();
+    EXPECT_NE(TGRTTaxonomy::defaultTaxonomy(), first);
+    EXPECT_TRUE(TGRTTaxonomy::newTaxonomyOfType(7, false, false)->categories().empty());
+}
+
+TEST(Taxonomy, AResourceFileWinsOverTheCompiledCopy) {
+    const test::TemporaryFolder folder;
+    folder.write("DefaultTaxonomy.plist",
+                 serializePropertyList(
+                     Dictionary{{"categories", Dictionary{{"Own", Dictionary{{"Tag", Dictionary{}}}}}}},
+                     PropertyListFormat::xml));
+    ResourceBundle::setDirectory(folder.path());
+    const auto own = TGRTTaxonomy::testingTaxonomy();
+    ResourceBundle::setDirectory("");
+    EXPECT_THAT(labels(own->allTags()), ElementsAre("Tag"));
+    EXPECT_GT(TGRTTaxonomy::testingTaxonomy()->allTags().size(), 500U);
+}
+
+TEST(Taxonomy, ReadOnlyRefusesButForContentPacks) {
+    const auto taxonomy = TGRTTaxonomy::newTaxonomyOfType(kDefaultTaxonomy, true, false);
+    EXPECT_EQ(taxonomy->findOrCreateTagWithLabel("New", "House", "Genres"), nullptr);
+    EXPECT_EQ(taxonomy->findOrCreateCategoryWithIdentifier("New"), nullptr);
+    EXPECT_EQ(taxonomy->findOrCreateSoundPackTagWithIdentifier(""), nullptr);
+    const auto pack = taxonomy->findOrCreateSoundPackTagWithIdentifier("9999_new");
+    ASSERT_NE(pack, nullptr);
+    EXPECT_EQ(taxonomy->findTagForLabel("9999_new"), pack);
+    EXPECT_TRUE(taxonomy->doesContainTag(pack));
+}
+
+TEST(Taxonomy, FindsByParent) {
+    const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
+    EXPECT_NE(taxonomy->findTagForLabel("Deep House", "House", "Genres"), nullptr);
+    EXPECT_EQ(taxonomy->findTagForLabel("Deep House", "Techno", "Genres"), nullptr);
+    EXPECT_EQ(taxonomy->findTagForLabel("Deep House", "Source"), nullptr);
+    EXPECT_EQ(taxonomy->findTagForLabel("deep house"), nullptr);
+    EXPECT_EQ(taxonomy->findTagForLabel("Bright / Dark-+"), nullptr);
+}
+
+/// What the search over the tree answers, without any index.
+TagPointer searched(const TGRTTaxonomy& taxonomy, const std::string& label,
+                    TGRTTaxonomy::OptionalLabel parent, const std::string& category) {
+    const auto found = taxonomy.findCategoryWithIdentifier(category);
+    return found ? TGRTTaxonomy::findTagWithLabel(label, parent, found->tags()) : nullptr;
+}
+
+TEST(Taxonomy, TheIndexAnswersAsTheSearchWouldAfterAnyChange) {
+    std::mt19937 random(7);
+    const auto pick = [&random](std::size_t count) {
+        return std::uniform_int_distribution<std::size_t>(0, count - 1)(random);
+    };
+    const std::vector<std::string> names = {"a", "b", "c", "d", "e"};
+    for (int round = 0; round < 300; ++round) {
+        const auto taxonomy = TGRTTaxonomy::init();
+        std::vector<TagPointer> tags;
+        for (int step = 0; step < 14; ++step) {
+            const auto category = taxonomy->findOrCreateCategoryWithIdentifier(pick(4) == 0 ? "Y" : "X");
+            const std::size_t what = round < 150 ? 0 : pick(8);
+            if (what <= 4 || tags.empty()) {
+                tags.push_back(TGRTTag::initWithLabel(
+                    names[pick(5)], tags.empty() || pick(3) == 0 ? nullptr : tags[pick(tags.size())],
+                    category));
+            } else if (what == 5) {
+                tags[pick(tags.size())]->setLabel(names[pick(5)]);
+            } else if (what == 6) {
+                category->removeTag(tags[pick(tags.size())]);
+            } else {
+                const auto& parent = tags[pick(tags.size())];
+                parent->removeChild(tags[pick(tags.size())]);
+            }
+            for (const std::string& label : names) {
+                for (const char* home : {"X", "Y"}) {
+                    ASSERT_EQ(taxonomy->findTagForLabel(label, home),
+                              searched(*taxonomy, label, std::nullopt, home));
+                    for (const std::string& parent : names) {
+                        ASSERT_EQ(taxonomy->findTagForLabel(label, parent, home),
+                                  searched(*taxonomy, label, parent, home));
+                    }
+                }
+            }
+        }
+    }
+}
+
+TEST(Taxonomy, LocalizesPacksKeysAndPoles) {
+    const auto strings = TGRTTaxonomy::defaultTaxonomy()->localizationDictionary();
+    const std::pair<const char*, const char*> expected[] = {
+        {"Bass", "Bass"},
+        {"0022_ultimate808s", "Ultimate 808s"},
+        {"arx0006_demosong_1", "Demosong 1"},
+        {"CSharp", "Key: C#"},
+        {"Generative Instrument Loop", "Drummer Loop"},
+        {"Non-rhythmic", "Non-Rhythmic"},
+        {"Minor KeyType", "Minor"},
+        {"Genres", "Genres"},
+        {"Distortion_1", "Heavy Distortion"},
+        {"Bright / Dark_lowerPole", "Bright"},
+        {"Bright / Dark_upperPole", "Dark"},
+    };
+    for (const auto& [key, value] : expected) EXPECT_EQ(strings.at(key), value) << key;
+    UserDefaults::setBool(true, "fakeLocalization");
+    const auto reversed = TGRTTaxonomy::defaultTaxonomy()->localizationDictionary();
+    UserDefaults::setBool(false, "fakeLocalization");
+    EXPECT_EQ(reversed.at("Bass"), "ssaB");
+    EXPECT_EQ(reversed.at("Bright / Dark_upperPole"), "Dark");
+    EXPECT_EQ(reversed.at("Distortion_1"), "noitrotsiD yvaeH");
+}
+
+TEST(Taxonomy, ExportsRowsForAMapping) {
+    const auto rows = TGRTTaxonomy::legacyLoopTaxonomy()->mappingExport();
+    EXPECT_EQ(rows.size(), 139U);
+    EXPECT_THAT(rows[0],
+                testing::StartsWith("Type;Legacy Keyword;Legacy Keyword Sub;New Taxonomy Keyword 1;"));
+    EXPECT_THAT(rows, Contains("LoopDescriptors;Cheerful;;;;;;"));
+    EXPECT_THAT(rows, Contains("LoopInstrumentTypes;Bass;Electric Bass;;;;;"));
+}
+
+TEST(TaxonomySearching, FindsPartsWithoutRegardToCaseAndDiacritics) {
+    const auto taxonomy = TGRTTaxonomy::testingTaxonomy();
+    taxonomy->findOrCreateTagWithLabel("F\xc3\xaate d'\xc3\x89t\xc3\xa9", "Custom");
+    const auto searching = TGRTTaxonomySearching::initWithTaxonomy(taxonomy);
+    EXPECT_THAT(searching->findTagLabelsForString("house", false), Contains("Slap House"));
+    EXPECT_THAT(searching->findTagLabelsForString("house", true), IsEmpty());
+    EXPECT_THAT(searching->findTagLabelsForString("House", true), ElementsAre("House"));
+    EXPECT_THAT(searching->findTagLabelsForString("FETE D'ETE", false),
+                ElementsAre("F\xc3\xaate d'\xc3\x89t\xc3\xa9"));
+    EXPECT_THAT(searching->findTagLabelsForString("", false), IsEmpty());
+    EXPECT_THAT(labels(searching->findTagsForString("reggae")),
+                ElementsAre("Reggaeton", "Reggae & Ska", "Roots Reggae"));
+}
+
+TEST(ObjectSet, ForgetsTheRightOneOfTwoWithTheSameHash) {
+    ObjectSet<TGRTTag> set;
+    const auto a = TGRTTag::initWithLabel("a", nullptr, nullptr);
+    set.insert(a);
+    EXPECT_FALSE(set.insert(TGRTTag::initWithLabel("a", nullptr, nullptr)));
+    EXPECT_TRUE(set.erase(*TGRTTag::initWithLabel("a", nullptr, nullptr)));
+    EXPECT_FALSE(set.contains(*a));
+    EXPECT_TRUE(set.empty());
+}
+
+}  // namespace
+}  // namespace qvct
