@@ -65,13 +65,17 @@ double vibrato(const Voice& voice, double time) {
 }
 
 void addUnison(Signal& signal, const Voice& voice, double hertz, int rate, int side) {
+    Signal pitch(signal.size(), hertz);
+    if (voice.vibratoCents > 0) {
+        for (std::size_t i = 0; i < pitch.size(); ++i)
+            pitch[i] *= vibrato(voice, static_cast<double>(i) / rate);
+    }
     for (int i = 0; i < voice.unison; ++i) {
         const double spread = voice.unison == 1 ? 0 : 2.0 * i / (voice.unison - 1) - 1;
-        const double cents = voice.detuneCents * (spread + 0.3 * side);
+        const double detune = std::exp2(voice.detuneCents * (spread + 0.3 * side) / 1200);
         Oscillator oscillator(rate, 0.37 * i + (side > 0 ? 0.21 : 0.0));
         for (std::size_t k = 0; k < signal.size(); ++k) {
-            const double bent =
-                hertz * std::exp2(cents / 1200) * vibrato(voice, static_cast<double>(k) / rate);
+            const double bent = detune * pitch[k];
             signal[k] +=
                 (voice.wave == Wave::saw ? oscillator.saw(bent) : oscillator.square(bent)) / voice.unison;
         }
