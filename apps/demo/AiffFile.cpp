@@ -1,5 +1,6 @@
 #include "demo/AudioFiles.h"
 #include "demo/ByteWriter.h"
+#include "demo/MidiFile.h"
 #include "demo/Samples.h"
 
 namespace qvct::demo {
@@ -80,6 +81,7 @@ std::string aiffBytes(const Sound& sound) {
     const std::vector<Marker> markers = allMarkers(sound);
     if (!markers.empty()) putChunk(chunks, "MARK", markerBody(markers));
     if (sound.loop || sound.rootNote) putChunk(chunks, "INST", instrumentBody(sound));
+    if (!sound.notes.empty()) putChunk(chunks, "MIDI", midiBytes(sound.notes, sound.loop));
     putChunk(chunks, "SSND", samples.data());
 
     ByteWriter file = big();

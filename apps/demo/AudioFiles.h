@@ -8,12 +8,13 @@
 /// Short writers of the three audio containers, which know nothing of the library that reads them: what they
 /// write can serve as fixtures. Each fact of a Sound goes to the open chunk that other programs use for it.
 ///
-/// | fact    | WAV            | AIFF                     | CAF                                |
-/// |---------|----------------|--------------------------|------------------------------------|
-/// | name    | LIST INFO INAM | NAME                     | info "title"                       |
-/// | root    | acid, smpl     | INST                     | inst; info "key signature"         |
-/// | loop    | acid, smpl     | INST sustain loop, MARK  | info "tempo", "time signature"     |
-/// | markers | cue, LIST adtl | MARK                     | mark, strg                         |
+/// | fact    | WAV            | AIFF                 | CAF                            |
+/// |---------|----------------|----------------------|--------------------------------|
+/// | name    | LIST INFO INAM | NAME                 | info "title"                   |
+/// | root    | acid, smpl     | INST                 | inst; info "key signature"     |
+/// | loop    | acid, smpl     | INST sustain, MARK   | info "tempo", "time signature" |
+/// | markers | cue, LIST adtl | MARK                 | mark, strg                     |
+/// | notes   |                | MIDI                 | midi                           |
 namespace qvct::demo {
 
 /// The whole file, in memory. Throws std::invalid_argument for a sample width that is not 16, 24 or 32 bits.

@@ -1,5 +1,6 @@
 #include "demo/AudioFiles.h"
 #include "demo/ByteWriter.h"
+#include "demo/MidiFile.h"
 #include "demo/Samples.h"
 
 #include <array>
@@ -117,6 +118,7 @@ std::string cafBytes(const Sound& sound) {
         putChunk(file, "mark", markerBody(sound.markers));
         putChunk(file, "strg", stringsBody(sound.markers));
     }
+    if (!sound.notes.empty()) putChunk(file, "midi", midiBytes(sound.notes, sound.loop));
     putChunk(file, "data", samples.data());
     return file.data();
 }

@@ -10,6 +10,7 @@ namespace {
 /// A drum is a tone that falls in pitch, a burst or several of filtered noise, and a clang of square waves.
 struct DrumSound {
     double seconds = 0.3;
+    double level = 1;  // among the drums of a kit
     double tone = 0, fromHertz = 200, toHertz = 100, fall = 0.03, toneDecay = 0.1;
     double noise = 0, noiseDecay = 0.1, lowCut = 200, highCut = 12000;
     int bursts = 1;
@@ -23,32 +24,32 @@ const DrumSound& soundOf(Drum drum) {
     static const std::map<Drum, DrumSound> sounds = {
         {Drum::kick, {.seconds = 0.5, .tone = 1, .fromHertz = 210, .toHertz = 47, .fall = 0.035, .toneDecay = 0.16,
                       .noise = 0.1, .noiseDecay = 0.004, .lowCut = 1500}},
-        {Drum::snare, {.seconds = 0.3, .tone = 0.5, .fromHertz = 260, .toHertz = 185, .fall = 0.02,
+        {Drum::snare, {.seconds = 0.3, .level = 0.8, .tone = 0.5, .fromHertz = 260, .toHertz = 185, .fall = 0.02,
                        .toneDecay = 0.07, .noise = 0.7, .noiseDecay = 0.075, .lowCut = 900, .highCut = 9000}},
-        {Drum::clap, {.seconds = 0.35, .noise = 1, .noiseDecay = 0.07, .lowCut = 700, .highCut = 3800,
+        {Drum::clap, {.seconds = 0.35, .level = 0.7, .noise = 1, .noiseDecay = 0.07, .lowCut = 700, .highCut = 3800,
                       .bursts = 3}},
-        {Drum::rim, {.seconds = 0.1, .tone = 0.8, .fromHertz = 1750, .toHertz = 1650, .toneDecay = 0.012,
+        {Drum::rim, {.seconds = 0.1, .level = 0.4, .tone = 0.8, .fromHertz = 1750, .toHertz = 1650, .toneDecay = 0.012,
                      .noise = 0.3, .noiseDecay = 0.008, .lowCut = 1000}},
-        {Drum::closedHat, {.seconds = 0.09, .noise = 0.6, .noiseDecay = 0.02, .lowCut = 7500, .highCut = 16000,
+        {Drum::closedHat, {.seconds = 0.09, .level = 0.3, .noise = 0.6, .noiseDecay = 0.02, .lowCut = 7500, .highCut = 16000,
                            .clang = 0.35, .clangHertz = 540, .clangDecay = 0.018}},
-        {Drum::openHat, {.seconds = 0.45, .noise = 0.6, .noiseDecay = 0.14, .lowCut = 7000, .highCut = 16000,
+        {Drum::openHat, {.seconds = 0.45, .level = 0.35, .noise = 0.6, .noiseDecay = 0.14, .lowCut = 7000, .highCut = 16000,
                          .clang = 0.35, .clangHertz = 540, .clangDecay = 0.13}},
-        {Drum::ride, {.seconds = 0.7, .noise = 0.3, .noiseDecay = 0.2, .lowCut = 6000, .highCut = 14000,
+        {Drum::ride, {.seconds = 0.7, .level = 0.3, .noise = 0.3, .noiseDecay = 0.2, .lowCut = 6000, .highCut = 14000,
                       .clang = 0.4, .clangHertz = 830, .clangDecay = 0.28}},
-        {Drum::crash, {.seconds = 1.6, .noise = 0.9, .noiseDecay = 0.5, .lowCut = 4000, .highCut = 15000,
+        {Drum::crash, {.seconds = 1.6, .level = 0.6, .noise = 0.9, .noiseDecay = 0.5, .lowCut = 4000, .highCut = 15000,
                        .clang = 0.3, .clangHertz = 620, .clangDecay = 0.4}},
-        {Drum::lowTom, {.seconds = 0.5, .tone = 1, .fromHertz = 150, .toHertz = 92, .fall = 0.06,
+        {Drum::lowTom, {.seconds = 0.5, .level = 0.9, .tone = 1, .fromHertz = 150, .toHertz = 92, .fall = 0.06,
                         .toneDecay = 0.17, .noise = 0.1, .noiseDecay = 0.02, .highCut = 3000}},
-        {Drum::highTom, {.seconds = 0.4, .tone = 1, .fromHertz = 240, .toHertz = 150, .fall = 0.05,
+        {Drum::highTom, {.seconds = 0.4, .level = 0.8, .tone = 1, .fromHertz = 240, .toHertz = 150, .fall = 0.05,
                          .toneDecay = 0.13, .noise = 0.1, .noiseDecay = 0.02, .highCut = 4000}},
-        {Drum::cowbell, {.seconds = 0.35, .lowCut = 400, .clang = 1, .clangHertz = 560, .clangDecay = 0.09}},
-        {Drum::shaker, {.seconds = 0.12, .noise = 0.9, .noiseDecay = 0.03, .lowCut = 5000, .highCut = 12000,
+        {Drum::cowbell, {.seconds = 0.35, .level = 0.35, .lowCut = 400, .clang = 1, .clangHertz = 560, .clangDecay = 0.09}},
+        {Drum::shaker, {.seconds = 0.12, .level = 0.25, .noise = 0.9, .noiseDecay = 0.03, .lowCut = 5000, .highCut = 12000,
                         .bursts = 2}},
-        {Drum::tambourine, {.seconds = 0.3, .noise = 0.5, .noiseDecay = 0.06, .lowCut = 8000, .highCut = 17000,
+        {Drum::tambourine, {.seconds = 0.3, .level = 0.4, .noise = 0.5, .noiseDecay = 0.06, .lowCut = 8000, .highCut = 17000,
                             .bursts = 2, .clang = 0.5, .clangHertz = 2300, .clangDecay = 0.07}},
-        {Drum::bongo, {.seconds = 0.25, .tone = 1, .fromHertz = 420, .toHertz = 345, .fall = 0.015,
+        {Drum::bongo, {.seconds = 0.25, .level = 0.6, .tone = 1, .fromHertz = 420, .toHertz = 345, .fall = 0.015,
                        .toneDecay = 0.06, .noise = 0.15, .noiseDecay = 0.006}},
-        {Drum::conga, {.seconds = 0.4, .tone = 1, .fromHertz = 230, .toHertz = 190, .fall = 0.02,
+        {Drum::conga, {.seconds = 0.4, .level = 0.7, .tone = 1, .fromHertz = 230, .toHertz = 190, .fall = 0.02,
                        .toneDecay = 0.12, .noise = 0.12, .noiseDecay = 0.008, .highCut = 5000}},
     };
     // clang-format on
@@ -112,10 +113,10 @@ void addClang(Signal& signal, const DrumSound& sound, const KitCharacter& kit, i
     }
 }
 
-void normalise(Signal& signal) {
+void scaleToPeak(Signal& signal, double level) {
     double peak = 0;
     for (const double sample : signal) peak = std::max(peak, std::abs(sample));
-    for (double& sample : signal) sample /= peak;
+    for (double& sample : signal) sample *= level / peak;
 }
 
 }  // namespace
@@ -129,7 +130,7 @@ Signal drumHit(Drum drum, Kit kit, int rate) {
     if (sound.clang > 0) addClang(signal, sound, character, rate);
     drive(signal, character.drive);
     if (character.highCut < 16000) passBand(signal, rate, 20, character.highCut);
-    normalise(signal);
+    scaleToPeak(signal, sound.level);
     fadeOut(signal, rate, 0.01);
     return signal;
 }

@@ -25,7 +25,7 @@ enum class Drum {
 /// The character that a kit gives to each of its drums.
 enum class Kit { acoustic, house, techno, boomBap, loFi };
 
-/// One hit, with a peak of about 1.
+/// One hit, as loud as the drum is among the others of its kit; the kick peaks at 1.
 Signal drumHit(Drum drum, Kit kit, int rate);
 
 }  // namespace qvct::demo

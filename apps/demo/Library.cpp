@@ -41,6 +41,8 @@ class Writer {
         for (const PatchItem& item : patches()) {
             writeCache(add(item.path) + std::string(kCacheInBundle), description(item), item.compression);
         }
+        const SynthNote preview{Timbre::pad, 57, 0.5, Mode::minor};
+        writeCaf(pathOf(patches().front().path) + "/prelisten.caf", render(preview, {.rate = 22050}));
     }
 
     void settingsFiles() {

@@ -10,7 +10,7 @@
 namespace qvct::demo {
 namespace {
 
-constexpr int kStepsPerBeat = 4;
+constexpr std::size_t kStepsPerBeat = 4;
 constexpr double kPeak = 0.9;
 
 /// The channels of a sound in the making.
@@ -40,7 +40,7 @@ class Mix {
     void addNote(Timbre timbre, int key, double seconds, double held, double gain) {
         for (int channel = 0; channel < format_.channels; ++channel) {
             const int side = format_.channels == 1 ? 0 : 2 * channel - 1;
-            add(note(timbre, key, held, format_.rate, side), seconds, gain, channel);
+            add(playNote(timbre, key, held, format_.rate, side), seconds, gain, channel);
         }
     }
 
@@ -79,9 +79,13 @@ double gainOf(char step) {
     }
 }
 
-double secondsOfStep(std::size_t step, double swing, double tempo) {
+std::size_t stepsIn(int beats) {
+    return static_cast<std::size_t>(beats) * kStepsPerBeat;
+}
+
+double beatOfStep(std::size_t step, double swing) {
     const double late = step % 2 == 0 ? 0 : 2 * swing / 100 - 1;
-    return (static_cast<double>(step) + late) * 60 / tempo / kStepsPerBeat;
+    return (static_cast<double>(step) + late) / kStepsPerBeat;
 }
 
 /// How far a degree of the scale (from 1) lies above its tonic, in semitones.
@@ -90,6 +94,29 @@ int semitonesOf(int degree, Mode mode) {
     static constexpr std::array<int, 7> minor = {0, 2, 3, 5, 7, 8, 10};
     const auto index = static_cast<std::size_t>((degree - 1) % 7);
     return (mode == Mode::minor ? minor.at(index) : major.at(index)) + 12 * ((degree - 1) / 7);
+}
+
+/// The notes of a phrase, each held until the next begins or a rest comes, but for a small gap.
+std::vector<Note> notesOf(const SynthLoop& loop) {
+    constexpr double kHeld = 0.9;
+    const Phrase& melody = phrase(loop.phrase);
+    const std::string steps = withoutBlanks(melody.steps);
+    const std::size_t count = stepsIn(loop.bars * 4);
+    const int highestThird = melody.chords ? 6 : 0;
+    std::vector<Note> notes;
+    for (std::size_t step = 0; step < count; ++step) {
+        const char character = steps[step % steps.size()];
+        if (character < '1' || character > '9') continue;
+        std::size_t end = step + 1;
+        while (end < count && steps[end % steps.size()] == '-') ++end;
+        const double start = beatOfStep(step, melody.swing);
+        const double length = kHeld * (beatOfStep(end, melody.swing) - start);
+        for (int third = 0; third <= highestThird; third += 2) {
+            const int key = loop.key + semitonesOf(character - '0' + third, loop.mode);
+            notes.push_back({.start = start, .length = length, .key = key});
+        }
+    }
+    return notes;
 }
 
 /// A marker where each bar begins.
@@ -119,10 +146,10 @@ struct Renderer {
         for (const DrumLane& lane : pattern.lanes) {
             const Signal hit = drumHit(lane.drum, loop.kit, format.rate);
             const std::string steps = withoutBlanks(lane.steps);
-            for (std::size_t step = 0; step < static_cast<std::size_t>(beats * kStepsPerBeat); ++step) {
+            for (std::size_t step = 0; step < stepsIn(beats); ++step) {
                 const double gain = gainOf(steps[step % steps.size()]);
                 if (gain > 0)
-                    mix.addPanned(hit, secondsOfStep(step, pattern.swing, loop.tempo), gain, lane.pan);
+                    mix.addPanned(hit, beatOfStep(step, pattern.swing) * 60 / loop.tempo, gain, lane.pan);
             }
         }
         Sound sound = mix.sound();
@@ -146,22 +173,16 @@ struct Renderer {
     }
 
     Sound operator()(const SynthLoop& loop) const {
-        const Phrase& melody = phrase(loop.phrase);
-        const std::string steps = withoutBlanks(melody.steps);
-        const auto count = static_cast<std::size_t>(loop.bars * 4 * kStepsPerBeat);
-        Mix mix(format, loop.bars * 4 * 60 / loop.tempo);
-        for (std::size_t step = 0; step < count; ++step) {
-            const char character = steps[step % steps.size()];
-            if (character < '1' || character > '9') continue;
-            std::size_t end = step + 1;
-            while (end < count && steps[end % steps.size()] == '-') ++end;
-            const double start = secondsOfStep(step, melody.swing, loop.tempo);
-            addDegree(mix, loop, melody.chords, character - '0', start,
-                      secondsOfStep(end, melody.swing, loop.tempo) - start);
+        const double secondsPerBeat = 60 / loop.tempo;
+        const std::vector<Note> notes = notesOf(loop);
+        Mix mix(format, loop.bars * 4 * secondsPerBeat);
+        for (const Note& note : notes) {
+            mix.addNote(loop.timbre, note.key, note.start * secondsPerBeat, note.length * secondsPerBeat, 1);
         }
         Sound sound = mix.sound();
         sound.rootNote = loop.key;
         sound.mode = loop.mode;
+        sound.notes = notes;
         describeLoop(sound, loop.tempo, loop.bars, 4);
         return sound;
     }
@@ -173,15 +194,6 @@ struct Renderer {
             mix.add(climb(seconds, static_cast<std::uint32_t>(channel)), 0, 1, channel);
         }
         return mix.sound();
-    }
-
-    static void addDegree(Mix& mix, const SynthLoop& loop, bool chord, int degree, double start,
-                          double held) {
-        for (const int third : {0, 2, 4, 6}) {
-            if (third > 0 && !chord) return;
-            const int key = loop.key + semitonesOf(degree + third, loop.mode);
-            mix.addNote(loop.timbre, key, start, 0.9 * held, 1);
-        }
     }
 
     Signal climb(double seconds, std::uint32_t seed) const {

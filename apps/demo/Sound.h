@@ -18,6 +18,14 @@ struct LoopFacts {
     int meterBottom = 4;
 };
 
+/// A note that was played, in quarter notes from the start of the sound.
+struct Note {
+    double start = 0;
+    double length = 1;
+    int key = 60;  ///< MIDI note number.
+    int velocity = 96;
+};
+
 struct Marker {
     std::uint32_t frame = 0;
     std::string name;
@@ -34,6 +42,7 @@ struct Sound {
     Mode mode = Mode::none;            ///< Of the key whose tonic is `rootNote`.
     std::optional<LoopFacts> loop = {};
     std::vector<Marker> markers = {};
+    std::vector<Note> notes = {};
 
     std::uint32_t frames() const {
         return static_cast<std::uint32_t>(samples.size() / static_cast<std::size_t>(channels));

@@ -136,7 +136,7 @@ void shapeVowel(Signal& signal, int rate) {
 
 }  // namespace
 
-Signal note(Timbre timbre, int key, double seconds, int rate, int side) {
+Signal playNote(Timbre timbre, int key, double seconds, int rate, int side) {
     const Voice& voice = voiceOf(timbre);
     const double hertz = hertzOfKey(key);
     Signal signal(framesIn(seconds + voice.release, rate));

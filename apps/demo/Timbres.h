@@ -24,6 +24,6 @@ enum class Timbre {
 /// @param key    MIDI note number.
 /// @param side   -1 for the left channel, 1 for the right, 0 for mono: the sides differ a little in pitch and
 ///               phase, which makes a wide stereo picture.
-Signal note(Timbre timbre, int key, double seconds, int rate, int side);
+Signal playNote(Timbre timbre, int key, double seconds, int rate, int side);
 
 }  // namespace qvct::demo

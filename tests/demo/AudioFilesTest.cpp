@@ -138,6 +138,22 @@ TEST(AudioFiles, CafTellsItsFactsAsTextAndItsMarkersByNumber) {
                                    "\0\0\0\1\0\0\0\0\0\0\0\0\0\0\0\2\0\0\0\0\0\0\0\6Bar 2\0Bar III\0"s));
 }
 
+TEST(AudioFiles, AiffAndCafEmbedTheNotesAsAMidiFile) {
+    using namespace std::string_literals;
+    Sound sound = loopOfThreeBars();
+    sound.notes = {{.start = 1, .length = 1, .key = 40, .velocity = 100},
+                   {.start = 0, .length = 1, .key = 40}};
+    const std::string midi =
+        "MThd\0\0\0\6\0\0\0\1\1\xE0MTrk\0\0\0\x25"
+        "\0\xFF\x51\3\x09\x4B\x71"            // 609,137 microseconds a quarter note
+        "\0\xFF\x58\4\3\2\x18\x08"            // 3/4
+        "\0\x90\x28\x60\x83\x60\x80\x28\x60"  // 480 ticks later the first note ends ...
+        "\0\x90\x28\x64\x83\x60\x80\x28\x64"  // ... before the same one starts again
+        "\0\xFF\x2F\0"s;
+    EXPECT_THAT(aiffBytes(sound), testing::HasSubstr("MIDI\0\0\0\x3B"s + midi));
+    EXPECT_THAT(cafBytes(sound), testing::HasSubstr("midi\0\0\0\0\0\0\0\x3B"s + midi));
+}
+
 TEST(AudioFiles, OneShotsSayThatTheyAreNoLoops) {
     const TemporaryFolder folder;
     Sound sound = ramp(1, 44100, 16);
