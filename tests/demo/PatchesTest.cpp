@@ -30,6 +30,7 @@ std::string inflated(const std::string& bytes) {
     stream.next_out = reinterpret_cast<Bytef*>(text.data());
     stream.avail_out = static_cast<uInt>(text.size());
     EXPECT_EQ(inflate(&stream, Z_FINISH), Z_STREAM_END);
+    EXPECT_EQ(stream.avail_in, 0U) << "bytes after the end of the stream";
     text.resize(stream.total_out);
     inflateEnd(&stream);
     return text;
