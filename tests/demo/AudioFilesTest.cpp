@@ -1,0 +1,183 @@
+#include "demo/AudioFiles.h"
+#include "demo/Library.h"
+#include "support/TemporaryFolder.h"
+
+#include <array>
+#include <cmath>
+#include <stdexcept>
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <sndfile.hh>
+
+// The writers are held against a reader that is not ours.
+namespace qvct::demo {
+namespace {
+
+using test::TemporaryFolder;
+
+/// Ten frames that reach both ends of the range; the channels differ.
+Sound ramp(int channels, int rate, int bits) {
+    Sound sound{.channels = channels, .rate = rate, .bits = bits};
+    for (int frame = 0; frame < 10; ++frame) {
+        for (int channel = 0; channel < channels; ++channel) {
+            sound.samples.push_back(channel == 0 ? 1 - static_cast<float>(frame) / 4.5F : -1);
+        }
+    }
+    return sound;
+}
+
+int majorFormat(const std::string& extension) {
+    if (extension == "wav") return SF_FORMAT_WAV;
+    return extension == "caf" ? SF_FORMAT_CAF : SF_FORMAT_AIFF;
+}
+
+int subtype(int bits) {
+    if (bits == 16) return SF_FORMAT_PCM_16;
+    return bits == 24 ? SF_FORMAT_PCM_24 : SF_FORMAT_PCM_32;
+}
+
+TEST(AudioFiles, HoldTheSamplesExactlyInEveryContainerWidthAndRate) {
+    const TemporaryFolder folder;
+    for (const std::string extension : {"wav", "aiff", "caf"}) {
+        for (const int bits : {16, 24, 32}) {
+            for (const int rate : {8000, 22050, 44100, 48000, 192000}) {
+                const int channels = rate % 3 == 0 ? 2 : 1;
+                SCOPED_TRACE(extension + " " + std::to_string(bits) + " " + std::to_string(rate));
+                const Sound sound = ramp(channels, rate, bits);
+                const std::string path = folder.path("sound." + extension);
+                writeSound(path, sound);
+
+                SndfileHandle file(path);
+                ASSERT_EQ(file.error(), SF_ERR_NO_ERROR) << file.strError();
+                EXPECT_EQ(file.frames(), 10);
+                EXPECT_EQ(file.samplerate(), rate);
+                EXPECT_EQ(file.channels(), channels);
+                EXPECT_EQ(file.format() & SF_FORMAT_TYPEMASK, majorFormat(extension));
+                EXPECT_EQ(file.format() & SF_FORMAT_SUBMASK, subtype(bits));
+                std::vector<double> read(sound.samples.size());
+                file.readf(read.data(), 10);
+                for (std::size_t i = 0; i < read.size(); ++i) {
+                    EXPECT_NEAR(read[i], sound.samples[i], 1.5 * std::ldexp(1, 1 - bits)) << "sample " << i;
+                }
+            }
+        }
+    }
+}
+
+Sound loopOfThreeBars() {
+    Sound sound = ramp(1, 44100, 16);
+    sound.name = "Bassline";
+    sound.rootNote = 33;
+    sound.mode = Mode::minor;
+    sound.loop = LoopFacts{.tempo = 98.5, .beats = 9, .meterTop = 3};
+    sound.markers = {{2, "Bar 2"}, {7, "Bar III"}};
+    return sound;
+}
+
+TEST(AudioFiles, WavTellsTempoMeterAndRootNote) {
+    const TemporaryFolder folder;
+    writeWav(folder.path("loop.wav"), loopOfThreeBars());
+    SndfileHandle file(folder.path("loop.wav"));
+
+    SF_LOOP_INFO loop{};
+    ASSERT_EQ(file.command(SFC_GET_LOOP_INFO, &loop, sizeof(loop)), SF_TRUE);
+    EXPECT_FLOAT_EQ(loop.bpm, 98.5F);
+    EXPECT_EQ(loop.num_beats, 9);
+    EXPECT_EQ(loop.time_sig_num, 3);
+    EXPECT_EQ(loop.time_sig_den, 4);
+    EXPECT_EQ(loop.root_key, 33);
+    EXPECT_STREQ(file.getString(SF_STR_TITLE), "Bassline");
+}
+
+TEST(AudioFiles, SamplerChunksLoopOverTheWholeSound) {
+    const TemporaryFolder folder;
+    for (const std::string extension : {"wav", "aiff"}) {
+        SCOPED_TRACE(extension);
+        const std::string path = folder.path("loop." + extension);
+        writeSound(path, loopOfThreeBars());
+        SndfileHandle file(path);
+        SF_INSTRUMENT instrument{};
+        ASSERT_EQ(file.command(SFC_GET_INSTRUMENT, &instrument, sizeof(instrument)), SF_TRUE);
+        EXPECT_EQ(instrument.basenote, 33);
+        ASSERT_EQ(instrument.loop_count, 1);
+        EXPECT_EQ(instrument.loops[0].mode, SF_LOOP_FORWARD);
+        EXPECT_EQ(instrument.loops[0].start, 0U);
+        EXPECT_EQ(instrument.loops[0].end, 10U);
+    }
+}
+
+TEST(AudioFiles, MarkersKeepTheirFramesAndNames) {
+    const TemporaryFolder folder;
+    for (const std::string extension : {"wav", "aiff"}) {
+        SCOPED_TRACE(extension);
+        const std::string path = folder.path("loop." + extension);
+        writeSound(path, loopOfThreeBars());
+        SndfileHandle file(path);
+        SF_CUES cues{};
+        ASSERT_EQ(file.command(SFC_GET_CUE, &cues, sizeof(cues)), SF_TRUE);
+        ASSERT_EQ(cues.cue_count, 2U) << "the two that bound the loop do not count";
+        EXPECT_EQ(cues.cue_points[0].sample_offset, 2U);
+        EXPECT_EQ(cues.cue_points[1].sample_offset, 7U);
+        EXPECT_STREQ(cues.cue_points[0].name, "Bar 2");
+        EXPECT_STREQ(cues.cue_points[1].name, "Bar III");
+    }
+}
+
+TEST(AudioFiles, CafTellsItsFactsAsTextAndItsMarkersByNumber) {
+    using namespace std::string_literals;
+    const std::string file = cafBytes(loopOfThreeBars());
+    EXPECT_THAT(file, testing::HasSubstr("info\0\0\0\0\0\0\0\x42\0\0\0\4"s
+                                         "title\0Bassline\0key signature\0Am\0tempo\0"
+                                         "98.5\0time signature\0"
+                                         "3/4\0"s));
+    EXPECT_THAT(file, testing::HasSubstr("inst\0\0\0\0\0\0\0\x1C\x42\x04\0\0"s)) << "root note 33 as a float";
+    EXPECT_THAT(file, testing::HasSubstr("mark\0\0\0\0\0\0\0\x40"s));
+    EXPECT_THAT(file,
+                testing::HasSubstr("strg\0\0\0\0\0\0\0\x2A\0\0\0\2"
+                                   "\0\0\0\1\0\0\0\0\0\0\0\0\0\0\0\2\0\0\0\0\0\0\0\6Bar 2\0Bar III\0"s));
+}
+
+TEST(AudioFiles, AiffAndCafEmbedTheNotesAsAMidiFile) {
+    using namespace std::string_literals;
+    Sound sound = loopOfThreeBars();
+    sound.notes = {{.start = 1, .length = 1, .key = 40, .velocity = 100},
+                   {.start = 0, .length = 1, .key = 40}};
+    const std::string midi =
+        "MThd\0\0\0\6\0\0\0\1\1\xE0MTrk\0\0\0\x25"
+        "\0\xFF\x51\3\x09\x4B\x71"            // 609,137 microseconds a quarter note
+        "\0\xFF\x58\4\3\2\x18\x08"            // 3/4
+        "\0\x90\x28\x60\x83\x60\x80\x28\x60"  // 480 ticks later the first note ends ...
+        "\0\x90\x28\x64\x83\x60\x80\x28\x64"  // ... before the same one starts again
+        "\0\xFF\x2F\0"s;
+    EXPECT_THAT(aiffBytes(sound), testing::HasSubstr("MIDI\0\0\0\x3B"s + midi));
+    EXPECT_THAT(cafBytes(sound), testing::HasSubstr("midi\0\0\0\0\0\0\0\x3B"s + midi));
+}
+
+TEST(AudioFiles, OneShotsSayThatTheyAreNoLoops) {
+    const TemporaryFolder folder;
+    Sound sound = ramp(1, 44100, 16);
+    sound.rootNote = 62;
+    writeWav(folder.path("one.wav"), sound);
+    SndfileHandle file(folder.path("one.wav"));
+    SF_LOOP_INFO loop{};
+    ASSERT_EQ(file.command(SFC_GET_LOOP_INFO, &loop, sizeof(loop)), SF_TRUE);
+    EXPECT_EQ(loop.loop_mode, SF_LOOP_NONE);
+    EXPECT_EQ(loop.num_beats, 0);
+    EXPECT_EQ(loop.root_key, 62);
+
+    sound.rootNote.reset();
+    EXPECT_THAT(wavBytes(sound), testing::Not(testing::HasSubstr("acid")));
+    EXPECT_THAT(aiffBytes(sound), testing::Not(testing::HasSubstr("INST")));
+}
+
+TEST(AudioFiles, RefuseWhatTheyCannotWrite) {
+    const TemporaryFolder folder;
+    EXPECT_THROW(wavBytes(ramp(1, 44100, 12)), std::invalid_argument);
+    EXPECT_THROW(writeSound(folder.path("sound.ogg"), ramp(1, 44100, 16)), std::invalid_argument);
+    EXPECT_THROW(writeWav(folder.write("file", "") + "/sound.wav", ramp(1, 44100, 16)), std::system_error);
+    EXPECT_THROW(writeWav(folder.path(), ramp(1, 44100, 16)), std::system_error);
+}
+
+}  // namespace
+}  // namespace qvct::demo
