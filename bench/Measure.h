@@ -1,8 +1,8 @@
 #pragma once
 
 #include <algorithm>
-#include <chrono>
 #include <cstddef>
+#include <ctime>
 #include <string_view>
 #include <vector>
 
@@ -10,15 +10,16 @@
 
 namespace qvct::bench {
 
-/// Seconds that one call takes: the median of several, since these machines are noisy.
+/// Seconds of processor time that one call takes: the median of several, since these machines are noisy and
+/// shared.
 template <typename Work>
 double medianSeconds(Work work, std::size_t repetitions = 7) {
-    using Clock = std::chrono::steady_clock;
+    const auto now = [] { return static_cast<double>(std::clock()) / CLOCKS_PER_SEC; };
     std::vector<double> seconds;
     for (std::size_t i = 0; i < repetitions; ++i) {
-        const auto start = Clock::now();
+        const double start = now();
         work();
-        seconds.push_back(std::chrono::duration<double>(Clock::now() - start).count());
+        seconds.push_back(now() - start);
     }
     std::nth_element(seconds.begin(), seconds.begin() + static_cast<std::ptrdiff_t>(repetitions / 2),
                      seconds.end());

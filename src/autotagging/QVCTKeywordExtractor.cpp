@@ -30,6 +30,27 @@ std::vector<std::string> labelsOf(const PropertyList& value) {
     return labels;
 }
 
+/// The bytes on both sides of a place in a text; 0 at its ends.
+struct Neighbours {
+    Neighbours(std::string_view text, std::size_t offset)
+        : before(offset == 0 ? '\0' : text[offset - 1]), after(offset == text.size() ? '\0' : text[offset]) {}
+
+    bool areAscii() const {
+        return ((static_cast<unsigned char>(before) | static_cast<unsigned char>(after)) & 0x80U) == 0;
+    }
+    bool areInsideAsciiWordOrGap() const {
+        return areAscii() && isAsciiWordCharacter(before) == isAsciiWordCharacter(after);
+    }
+    /// Whether a word begins or ends between them.
+    bool isBoundary(std::string_view text, std::size_t offset) const {
+        return areAscii() ? isAsciiWordCharacter(before) != isAsciiWordCharacter(after)
+                          : isWordBoundary(text, offset);
+    }
+
+    char before;
+    char after;
+};
+
 bool compiles(std::string_view keyword) {
     return RegularExpression::compile(expressionForKeyword(keyword), RegularExpression::Case::insensitive)
         .has_value();
@@ -67,7 +88,7 @@ QVCTKeywordExtractor::QVCTKeywordExtractor(Dictionary mapping, std::shared_ptr<T
     setupKeywordMapping(mapping_);
     setupWithTaxonomy(*taxonomy_);
     compileKeywords();
-    compileScanner();
+    compileTrie();
 }
 
 void QVCTKeywordExtractor::setupKeywordMapping(const Dictionary& mapping) {
@@ -110,7 +131,7 @@ void QVCTKeywordExtractor::compileKeywords() {
     for (const std::string& label : keywordsSet_) look(label);
 }
 
-void QVCTKeywordExtractor::compileScanner() {
+void QVCTKeywordExtractor::compileTrie() {
     std::unordered_map<std::string, std::size_t> indices;
     for (std::uint32_t i = 0; i < keywords_.size(); ++i) {
         const std::string& keyword = keywords_[i].text;
@@ -128,7 +149,7 @@ void QVCTKeywordExtractor::compileScanner() {
     }
     std::vector<std::string> texts;
     for (const Literal& literal : literals_) texts.push_back(literal.text);
-    scanner_ = LiteralScanner(texts);
+    trie_ = LiteralTrie(texts);
     marks_.assign(keywords_.size(), Mark::unseen);
 }
 
@@ -157,22 +178,31 @@ void QVCTKeywordExtractor::mark(std::uint32_t keyword, Mark mark) {
 }
 
 void QVCTKeywordExtractor::scanForCandidates(std::string_view text) {
-    scanner_.scan(text, [&](std::uint32_t index, std::size_t end) {
-        const Literal& literal = literals_[index];
-        for (const std::uint32_t keyword : literal.expressions) mark(keyword, Mark::candidate);
-        if (literal.plain.empty() || !isWordBoundary(text, end - literal.text.size()) ||
-            !isWordBoundary(text, end)) {
-            return;
-        }
-        for (const std::uint32_t keyword : literal.plain) mark(keyword, Mark::found);
-    });
-    // Letters that only case folding makes equal to a keyword's show in the folded text, but folding moves
-    // characters about, so there nothing is decided on the spot.
-    if (isAscii(text) || (!hasNonAsciiLiterals_ && foldsApartFromAscii(text))) return;
-    scanner_.scan(foldCase(text), [this](std::uint32_t index, std::size_t /*end*/) {
-        for (const std::uint32_t keyword : literals_[index].expressions) mark(keyword, Mark::candidate);
-        for (const std::uint32_t keyword : literals_[index].plain) mark(keyword, Mark::candidate);
-    });
+    for (std::size_t start = 0; start < text.size(); ++start) {
+        if (!Neighbours(text, start).isBoundary(text, start)) continue;
+        trie_.matchAt(text, start, [&](std::uint32_t index, std::size_t end) {
+            const Literal& literal = literals_[index];
+            for (const std::uint32_t keyword : literal.expressions) mark(keyword, Mark::candidate);
+            if (literal.plain.empty() || !Neighbours(text, end).isBoundary(text, end)) return;
+            for (const std::uint32_t keyword : literal.plain) mark(keyword, Mark::found);
+        });
+    }
+    const bool mayFoldIntoMore = !isAscii(text) && (hasNonAsciiLiterals_ || !foldsApartFromAscii(text));
+    if (mayFoldIntoMore) scanFolded(foldCase(text));
+}
+
+// Letters that only case folding makes equal to a keyword's show in the folded text. Folding moves characters
+// about and makes a letter of a mark, so here a place is only passed over when ASCII stands on both sides.
+void QVCTKeywordExtractor::scanFolded(std::string_view text) {
+    for (std::size_t start = 0; start < text.size(); ++start) {
+        if (Neighbours(text, start).areInsideAsciiWordOrGap()) continue;
+        trie_.matchAt(text, start, [&](std::uint32_t index, std::size_t end) {
+            const Literal& literal = literals_[index];
+            for (const std::uint32_t keyword : literal.expressions) mark(keyword, Mark::candidate);
+            if (Neighbours(text, end).areInsideAsciiWordOrGap()) return;
+            for (const std::uint32_t keyword : literal.plain) mark(keyword, Mark::candidate);
+        });
+    }
 }
 
 std::vector<std::uint32_t> QVCTKeywordExtractor::matchingKeywords(std::string_view text) {

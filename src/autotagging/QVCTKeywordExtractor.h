@@ -1,7 +1,7 @@
 #pragma once
 
 #include "platform/CountedSet.h"
-#include "platform/LiteralScanner.h"
+#include "platform/LiteralTrie.h"
 #include "platform/PropertyList.h"
 #include "platform/RegularExpression.h"
 #include "platform/Url.h"
@@ -22,10 +22,10 @@ namespace qvct {
 /// A mapping's dictionary leads from a keyword (a word, or "regex:" and an expression) to a label or an array
 /// of labels; a label may end in a level, "Bright / Dark (0.0)".
 ///
-/// The result is that of one case-insensitive expression per keyword. To get there faster, one scan over the
-/// text finds the keywords whose letters occur at all; of these a plain word between ASCII neighbours is
-/// decided on the spot, and any other by its expression. Expressions that need nothing certain are always
-/// run.
+/// The result is that of one case-insensitive expression per keyword. To get there faster, one pass looks at
+/// every place where a word begins or ends for the keywords that start there; a plain word is decided on the
+/// spot, by what stands behind it, and any other by its expression. Expressions that need nothing certain are
+/// always run.
 ///
 /// Use one extractor from one thread at a time: it fills its cache of expressions as it goes.
 class QVCTKeywordExtractor {
@@ -76,12 +76,13 @@ class QVCTKeywordExtractor {
     void addToKeywordsSet(const std::string& label);
     void compileKeywords();
     void addKeyword(const std::string& text, bool isLabel);
-    void compileScanner();
+    void compileTrie();
     std::uint32_t resultIndex(const std::string& text);
     void findParents();
 
     std::vector<std::uint32_t> matchingKeywords(std::string_view text);
     void scanForCandidates(std::string_view text);
+    void scanFolded(std::string_view text);
     void mark(std::uint32_t keyword, Mark mark);
     CountedSet resultsOf(const std::vector<std::uint32_t>& keywords);
 
@@ -92,7 +93,7 @@ class QVCTKeywordExtractor {
 
     std::vector<Keyword> keywords_;
     std::vector<Literal> literals_;
-    LiteralScanner scanner_;
+    LiteralTrie trie_;
     std::vector<std::uint32_t> alwaysRun_;
     bool hasNonAsciiLiterals_ = false;
     std::vector<Mark> marks_;

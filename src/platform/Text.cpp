@@ -98,10 +98,6 @@ std::string_view trim(std::string_view text, IsTrimmed isTrimmed) {
     return text.substr(static_cast<std::size_t>(first), static_cast<std::size_t>(last - first));
 }
 
-bool isAsciiWordCharacter(char c) {
-    return (c >= '0' && c <= '9') || (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z') || c == '_';
-}
-
 /// ICU's "\w".
 bool isWordCharacter(UChar32 c) {
     constexpr UChar32 zeroWidthNonJoiner = 0x200C;

@@ -30,6 +30,9 @@ std::string replaceNonAlphanumerics(std::string_view text, std::string_view kept
 /// Whether a word begins or ends at that byte offset, exactly as "\b" of an ICU expression has it: between a
 /// letter, digit or connector and something else, combining marks being part of what they follow.
 bool isWordBoundary(std::string_view text, std::size_t offset);
+constexpr bool isAsciiWordCharacter(char c) {
+    return (c >= '0' && c <= '9') || (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z') || c == '_';
+}
 
 /// Without the blanks (and, if asked for, line breaks) at both ends.
 std::string_view trimBlanks(std::string_view text);

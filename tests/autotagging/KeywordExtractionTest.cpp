@@ -161,16 +161,6 @@ TEST(KeywordExpression, KnowsEveryCharacterThatFoldsIntoAscii) {
     }
 }
 
-TEST(LiteralScanner, FindsOverlappingAndNestedLiterals) {
-    const LiteralScanner scanner({"he", "she", "hers", "", "HIS", "e"});
-    std::vector<std::pair<std::uint32_t, std::size_t>> found;
-    scanner.scan("uSHErs his",
-                 [&found](std::uint32_t index, std::size_t end) { found.emplace_back(index, end); });
-    EXPECT_THAT(found,
-                testing::UnorderedElementsAre(testing::Pair(1, 4), testing::Pair(0, 4), testing::Pair(5, 4),
-                                              testing::Pair(2, 6), testing::Pair(4, 10)));
-}
-
 TagDictionarySet serviceTags(const char* path,
                              std::uint64_t options = QVCTAutoTaggingOptionFilenameKeywords) {
     return QVCTFilenameKeywordExtractorTaggingService::init()->tagsWithContentsOfURL(
