@@ -3,6 +3,7 @@
 #include "platform/PropertyList.h"
 
 #include <cstdint>
+#include <memory>
 #include <optional>
 #include <set>
 #include <string>
@@ -110,6 +111,8 @@ class LCFileData {
     /// The record as it is to be stored, and the facts that it stands on.
     const Dictionary& record() const { return record_; }
     const LCAudioFacts& facts() const { return facts_; }
+    /// The same record on other facts.
+    std::shared_ptr<LCFileData> withFacts(LCAudioFacts facts) const;
 
   private:
     int integer(std::string_view key, int otherwise) const;

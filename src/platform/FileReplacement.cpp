@@ -1,0 +1,256 @@
+#include "platform/FileReplacement.h"
+
+#include "platform/FileDescriptor.h"
+#include "platform/Text.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <climits>
+#include <cstring>
+#include <filesystem>
+#include <string_view>
+#include <vector>
+
+#include <fcntl.h>
+#include <fmt/format.h>
+#include <sys/stat.h>
+#include <sys/xattr.h>
+#include <unistd.h>
+
+namespace qvct {
+namespace {
+
+bool failFor(Error* error, std::string_view path, std::string_view reason) {
+    return fail(error, kErrorUnwritable, fmt::format("{}: {}", printable(path), reason));
+}
+
+bool failWithErrno(Error* error, std::string_view path, std::string_view action) {
+    return failFor(error, path, fmt::format("{}: {}", action, std::strerror(errno)));
+}
+
+bool writeAll(int descriptor, std::string_view bytes) {
+    while (!bytes.empty()) {
+        const ssize_t written = ::write(descriptor, bytes.data(), bytes.size());
+        if (written < 0 && errno == EINTR) continue;
+        if (written <= 0) return false;
+        bytes.remove_prefix(static_cast<std::size_t>(written));
+    }
+    return true;
+}
+
+/// Through a buffer: for stretches that share no block, and where the kernel cannot copy by itself.
+bool copyThroughBuffer(int from, std::uint64_t offset, std::uint64_t length, int to) {
+    std::vector<char> buffer(std::min<std::uint64_t>(length, 1U << 18U));
+    while (length > 0) {
+        const ssize_t got = ::pread(from, buffer.data(), std::min<std::uint64_t>(length, buffer.size()),
+                                    static_cast<off_t>(offset));
+        if (got < 0 && errno == EINTR) continue;
+        if (got == 0) errno = ESTALE;  // the old file shrank
+        if (got <= 0) return false;
+        const auto count = static_cast<std::size_t>(got);
+        if (!writeAll(to, {buffer.data(), count})) return false;
+        offset += count;
+        length -= count;
+    }
+    return true;
+}
+
+/// By the kernel, which shares blocks where it can.
+bool copyByKernel(int from, std::uint64_t offset, std::uint64_t length, int to) {
+    while (length > 0) {
+        auto position = static_cast<off_t>(offset);
+        const std::size_t step = std::min<std::uint64_t>(length, SSIZE_MAX / 2);
+        const ssize_t copied = ::copy_file_range(from, &position, to, nullptr, step, 0);
+        if (copied < 0 && errno == EINTR) continue;
+        const bool unable =
+            copied < 0 && errno != ENOSPC && errno != EFBIG && errno != EIO && errno != EDQUOT;
+        if (copied == 0 || unable) return copyThroughBuffer(from, offset, length, to);
+        if (copied < 0) return false;
+        offset += static_cast<std::uint64_t>(copied);
+        length -= static_cast<std::uint64_t>(copied);
+    }
+    return true;
+}
+
+/// Whole blocks can be shared only when they keep their place within a block.
+bool copyRange(int from, const FilePiece& piece, int to, std::uint64_t written) {
+    constexpr std::uint64_t kBlock = 4096;
+    if (piece.offset % kBlock != written % kBlock) {
+        return copyByKernel(from, piece.offset, piece.length, to);
+    }
+    const std::uint64_t head = std::min(piece.length, (kBlock - piece.offset % kBlock) % kBlock);
+    const std::uint64_t blocks = (piece.length - head) / kBlock * kBlock;
+    const std::uint64_t tail = piece.length - head - blocks;
+    return copyThroughBuffer(from, piece.offset, head, to) &&
+           copyByKernel(from, piece.offset + head, blocks, to) &&
+           copyThroughBuffer(from, piece.offset + head + blocks, tail, to);
+}
+
+/// Makes a file that nobody else has in the folder; its mode follows the process's mask.
+int makeFileIn(const std::string& folder, std::string& name) {
+    for (int attempt = 0; attempt < 100; ++attempt) {
+        name = fmt::format("{}.qvct-{}-{}.tmp", folder, ::getpid(), attempt);
+        const int descriptor = ::open(name.c_str(), O_RDWR | O_CREAT | O_EXCL | O_CLOEXEC, 0666);
+        if (descriptor >= 0 || errno != EEXIST) return descriptor;
+    }
+    return -1;
+}
+
+void flushFolder(const std::string& folder) {
+    const FileDescriptor descriptor(::open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    if (descriptor.isOpen()) ::fsync(descriptor.number());
+}
+
+/// A user's attributes must come along; labels that the system guards are its own affair.
+bool isOptionalAttribute(std::string_view name) {
+    return name.starts_with("security.") || name.starts_with("trusted.");
+}
+
+bool takeOverAttributes(int from, int to) {
+    const ssize_t length = ::flistxattr(from, nullptr, 0);
+    if (length <= 0) return length == 0 || errno == ENOTSUP;
+    std::string names(static_cast<std::size_t>(length), '\0');
+    const ssize_t listed = ::flistxattr(from, names.data(), names.size());
+    if (listed < 0) return false;
+    names.resize(static_cast<std::size_t>(listed));
+    for (std::size_t at = 0; at < names.size(); at += std::strlen(&names[at]) + 1) {
+        const char* name = &names[at];
+        const ssize_t size = ::fgetxattr(from, name, nullptr, 0);
+        std::string value(static_cast<std::size_t>(std::max<ssize_t>(size, 0)), '\0');
+        const bool taken = size >= 0 && ::fgetxattr(from, name, value.data(), value.size()) == size &&
+                           ::fsetxattr(to, name, value.data(), value.size(), 0) == 0;
+        if (!taken && !isOptionalAttribute(name)) return false;
+    }
+    return true;
+}
+
+/// The owner first, since changing it clears bits of the mode.
+bool takeOverOwnerAndMode(const struct stat& old, int to) {
+    mode_t mode = old.st_mode & 07777U;
+    const bool owned =
+        ::fchown(to, old.st_uid, old.st_gid) == 0 || ::fchown(to, static_cast<uid_t>(-1), old.st_gid) == 0;
+    struct stat now {};
+    if (!owned || ::fstat(to, &now) != 0 || now.st_uid != old.st_uid) mode &= ~(S_ISUID | S_ISGID);
+    return ::fchmod(to, mode) == 0;
+}
+
+bool takeOverTimes(const struct stat& old, int to) {
+    const struct timespec times[2] = {old.st_atim, old.st_mtim};
+    return ::futimens(to, times) == 0;
+}
+
+/// One replacement under way: the new file disappears unless it took its place.
+class Replacement {
+  public:
+    Replacement(const std::string& path, const FileReplacementOptions& options, Error* error)
+        : path_(path), options_(options), error_(error) {
+        std::error_code notThere;
+        const std::filesystem::path resolved = std::filesystem::canonical(path, notThere);
+        target_ = notThere ? path : resolved.string();
+        const std::size_t slash = target_.rfind('/');
+        folder_ = slash == std::string::npos ? "./" : target_.substr(0, slash + 1);
+    }
+    Replacement(const Replacement&) = delete;
+    Replacement& operator=(const Replacement&) = delete;
+    ~Replacement() {
+        if (!temporary_.empty()) ::unlink(temporary_.c_str());
+    }
+
+    bool run(std::span<const FilePiece> pieces) {
+        if (!openOld()) return false;
+        const FileDescriptor created(makeFileIn(folder_, temporary_));
+        if (!created.isOpen()) {
+            temporary_.clear();
+            return failWithErrno(error_, path_, "cannot make a file beside it");
+        }
+        const int to = created.number();
+        return write(pieces, to) && takeOver(to) && finish(to);
+    }
+
+  private:
+    /// False only when there is an old file that must not be replaced.
+    bool openOld() {
+        struct stat status {};
+        if (::stat(target_.c_str(), &status) != 0) {
+            return !options_.expected || failWithErrno(error_, path_, "cannot be opened");
+        }
+        if (!S_ISREG(status.st_mode)) return failFor(error_, path_, "is not a regular file");
+        constexpr mode_t kAnyWrite = S_IWUSR | S_IWGRP | S_IWOTH;
+        if ((status.st_mode & kAnyWrite) == 0 || ::access(target_.c_str(), W_OK) != 0) {
+            return failFor(error_, path_, "is protected from writing");
+        }
+        old_.emplace(::open(target_.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
+        if (!old_->isOpen() || ::fstat(old_->number(), &status_) != 0) {
+            return failWithErrno(error_, path_, "cannot be opened");
+        }
+        return isAsExpected();
+    }
+
+    bool isAsExpected() const {
+        struct stat now {};
+        if (!options_.expected) return true;
+        return (::fstat(old_->number(), &now) == 0 && FileStamp::of(now) == *options_.expected) ||
+               failFor(error_, path_, "was changed by another program meanwhile");
+    }
+
+    bool write(std::span<const FilePiece> pieces, int to) const {
+        std::uint64_t written = 0;
+        for (const FilePiece& piece : pieces) {
+            const bool isRange = piece.length > 0;
+            if (isRange && !old_) return failFor(error_, path_, "does not exist");
+            const bool done =
+                isRange ? copyRange(old_->number(), piece, to, written) : writeAll(to, piece.bytes);
+            if (!done) {
+                return failWithErrno(error_, path_,
+                                     fmt::format("cannot write the new contents at byte {}", written));
+            }
+            written += isRange ? piece.length : piece.bytes.size();
+        }
+        return true;
+    }
+
+    bool takeOver(int to) const {
+        if (!old_) return true;
+        if (!takeOverOwnerAndMode(status_, to)) return failWithErrno(error_, path_, "cannot keep its mode");
+        if (!takeOverAttributes(old_->number(), to)) {
+            return failWithErrno(error_, path_, "cannot keep its extended attributes");
+        }
+        return !options_.keepsTimes || takeOverTimes(status_, to) ||
+               failWithErrno(error_, path_, "cannot keep its times");
+    }
+
+    bool finish(int to) {
+        if (::fsync(to) != 0) return failWithErrno(error_, path_, "cannot be flushed");
+        if (options_.check && !options_.check(temporary_, error_)) return false;
+        if (!isAsExpected()) return false;
+        if (::rename(temporary_.c_str(), target_.c_str()) != 0) {
+            return failWithErrno(error_, path_, "cannot be replaced");
+        }
+        temporary_.clear();
+        flushFolder(folder_);
+        return true;
+    }
+
+    const std::string& path_;
+    const FileReplacementOptions& options_;
+    Error* error_;
+    std::string target_;
+    std::string folder_;
+    std::string temporary_;
+    std::optional<FileDescriptor> old_;
+    struct stat status_ {};
+};
+
+}  // namespace
+
+FileStamp FileStamp::of(const struct stat& status) {
+    return {status.st_dev, status.st_ino, static_cast<std::uint64_t>(status.st_size),
+            std::int64_t{status.st_mtim.tv_sec} * 1'000'000'000 + status.st_mtim.tv_nsec};
+}
+
+bool replaceFileByPieces(const std::string& path, std::span<const FilePiece> pieces,
+                         const FileReplacementOptions& options, Error* error) {
+    return Replacement(path, options, error).run(pieces);
+}
+
+}  // namespace qvct
