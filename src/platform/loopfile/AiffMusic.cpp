@@ -46,6 +46,7 @@ void readAiffMusic(const AiffFile& file, LCAudioFacts& facts) {
         BoundedCursor contents = file.cursor(chunk);
         switch (chunk.id) {
             case fourCC("NAME"):
+                if (!facts.displayName.empty()) break;
                 facts.displayName = textOfField(contents.text(std::min(contents.remaining(), kLargestText)));
                 break;
             case fourCC("INST"):

@@ -4,15 +4,21 @@
 
 namespace qvct {
 
+const std::uint8_t* ReadWindow::Buffer::find(std::uint64_t offset, std::size_t count) const {
+    if (offset < start || offset - start > filled || count > filled - (offset - start)) return nullptr;
+    return bytes.data() + (offset - start);
+}
+
 const std::uint8_t* ReadWindow::at(std::uint64_t offset, std::size_t count) {
     if (offset > size_ || count > size_ - offset || count > kSize) return nullptr;
-    if (offset < start_ || offset - start_ > filled_ || count > filled_ - (offset - start_)) {
-        const std::size_t wanted = std::min<std::uint64_t>(kSize, size_ - offset);
-        filled_ = reader_.read(offset, std::span(buffer_).first(wanted)) ? wanted : 0;
-        start_ = offset;
-        if (filled_ < count) return nullptr;
-    }
-    return buffer_.data() + (offset - start_);
+    if (const std::uint8_t* found = head_.find(offset, count)) return found;
+    if (const std::uint8_t* found = other_.find(offset, count)) return found;
+    const bool isHead = offset + count <= kSize;
+    Buffer& buffer = isHead ? head_ : other_;
+    buffer.start = isHead ? 0 : offset;
+    const std::size_t wanted = std::min<std::uint64_t>(kSize, size_ - buffer.start);
+    buffer.filled = reader_.read(buffer.start, std::span(buffer.bytes).first(wanted)) ? wanted : 0;
+    return buffer.find(offset, count);
 }
 
 bool ReadWindow::copy(std::uint64_t offset, std::span<std::uint8_t> into) {

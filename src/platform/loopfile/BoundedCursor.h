@@ -12,7 +12,7 @@
 
 namespace qvct {
 
-/// A reader seen through a small buffer, so that headers that lie together cost one system call.
+/// A reader seen through small buffers, so that headers that lie together cost one system call.
 class ReadWindow {
   public:
     static constexpr std::size_t kSize = 4096;
@@ -26,11 +26,18 @@ class ReadWindow {
     bool copy(std::uint64_t offset, std::span<std::uint8_t> into);
 
   private:
+    struct Buffer {
+        std::uint64_t start = 0;
+        std::size_t filled = 0;
+        std::array<std::uint8_t, kSize> bytes;
+
+        const std::uint8_t* find(std::uint64_t offset, std::size_t count) const;
+    };
+
     const RandomAccessReader& reader_;
     std::uint64_t size_;
-    std::uint64_t start_ = 0;
-    std::size_t filled_ = 0;
-    std::array<std::uint8_t, kSize> buffer_;
+    Buffer head_;   // the first bytes, to which parsers come back
+    Buffer other_;  // the place that was read last
 };
 
 enum class ByteOrder { little, big };

@@ -75,6 +75,7 @@ void IffFile::walk(std::uint64_t formSize, bool isOpenEnded) {
         chunks_.push_back(chunk);
     }
     takeOverPad(declaredEnd, isOpenEnded);
+    at = chunks_.empty() ? at : chunks_.back().end;
     if (fault_.empty() && at < formEnd_) {
         fault_ = fmt::format("{} bytes at byte {} are no chunk that is known of", formEnd_ - at, at);
     }

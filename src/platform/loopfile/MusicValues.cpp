@@ -43,7 +43,7 @@ void setBeats(LCAudioFacts& facts, std::uint64_t beats) {
 }
 
 void setRootNote(LCAudioFacts& facts, unsigned note) {
-    if (note <= 127) facts.midiRootNote = static_cast<int>(note);
+    if (note >= 1 && note <= 127) facts.midiRootNote = static_cast<int>(note);
 }
 
 void setSignatureText(LCAudioFacts& facts, std::string_view text) {

@@ -57,7 +57,7 @@ void readList(BoundedCursor list, LCAudioFacts& facts) {
         BoundedCursor contents = list.part(size);
         if (contents.failed()) return;
         list.skip(std::min<std::uint64_t>(size & 1U, list.remaining()));
-        if (id == fourCC("INAM")) {
+        if (id == fourCC("INAM") && facts.displayName.empty()) {
             facts.displayName = textOfField(contents.text(std::min(contents.remaining(), kLargestText)));
             return;
         }
