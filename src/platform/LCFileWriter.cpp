@@ -43,7 +43,8 @@ bool holdsAlready(const Container& container, const std::string& record) {
 bool isSameOutsideOfTheRecord(const std::string& path, const LCFingerprint& before,
                               const std::string& newFile, Error* error) {
     Error reason;
-    const auto after = fingerprintOfFile(URL::fileURLWithPath(newFile), &reason);
+    const auto reader = FileReader::open(newFile, &reason);
+    const auto after = reader ? fingerprintOfReader(*reader, path, &reason) : std::nullopt;
     const std::vector<std::string> differences =
         after ? before.differences(*after) : std::vector{reason.message};
     if (differences.empty()) return true;
@@ -99,7 +100,7 @@ bool LCFileWriter::writeFileData(const std::shared_ptr<const LCFileData>& data, 
     options.keepsTimes = options_.keepsTimes;
     options.expected = reader->stamp();
     if (options_.verifies) {
-        const auto before = fingerprintOfFile(URL::fileURLWithPath(path_), error);
+        const auto before = fingerprintOfReader(*reader, path_, error);
         if (!before) return false;
         options.check = [this, before = *before](const std::string& newFile, Error* checkError) {
             return isSameOutsideOfTheRecord(path_, before, newFile, checkError);

@@ -6,10 +6,14 @@
 
 #include <cstdint>
 #include <memory>
+#include <optional>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace qvct {
+
+class RandomAccessReader;
 
 /// How a record is written into a file.
 struct LCWriteOptions {
@@ -63,5 +67,8 @@ struct LCFingerprint {
 /// Nothing and an error for a file that is no container of ours.
 /// @cost  Reads the whole file.
 std::optional<LCFingerprint> fingerprintOfFile(const URL& url, Error* error = nullptr);
+/// The same over a reader; `name` stands in for the path.
+std::optional<LCFingerprint> fingerprintOfReader(const RandomAccessReader& reader, std::string_view name,
+                                                 Error* error = nullptr);
 
 }  // namespace qvct

@@ -79,14 +79,17 @@ bool addChunks(LCFingerprint& result, const RandomAccessReader& reader, const Co
 
 std::optional<LCFingerprint> fingerprintOfFile(const URL& url, Error* error) {
     const auto reader = FileReader::open(url.path(), error);
-    if (!reader) return std::nullopt;
-    ReadWindow window(*reader);
+    return reader ? fingerprintOfReader(*reader, url.path(), error) : std::nullopt;
+}
+
+std::optional<LCFingerprint> fingerprintOfReader(const RandomAccessReader& reader, std::string_view name,
+                                                 Error* error) {
+    ReadWindow window(reader);
     Error reason{{}, kErrorUnreadable, "became shorter while it was read"};
-    const auto container = Container::open(window, url.path(), &reason);
+    const auto container = Container::open(window, name, &reason);
     LCFingerprint result;
-    if (container && addChunks(result, *reader, *container)) return result;
-    fail(error, static_cast<ErrorCode>(reason.code),
-         fmt::format("{}: {}", printable(url.path()), reason.message));
+    if (container && addChunks(result, reader, *container)) return result;
+    fail(error, static_cast<ErrorCode>(reason.code), fmt::format("{}: {}", printable(name), reason.message));
     return std::nullopt;
 }
 

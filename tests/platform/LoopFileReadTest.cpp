@@ -178,7 +178,7 @@ TEST(LoopFileRead, HostileAndDamagedFiles) {
         {"wav-size-0", wav.file(format + "data" + big(0, 4)), nullptr, 0},
         {"wav-claims-a-gigabyte-in-24-bytes",
          "RIFF" + test::little(1U << 30U, 4) + "WAVEfmt " + test::little(1U << 30U, 4) + std::string(4, '\1'),
-         "chunk 'fmt ' at byte 12: is too short", 0},
+         "no chunk 'data'", 0},
         {"wav-chunk-size-FFFFFFF8", wav.file(format + "junk" + test::little(0xFFFFFFF8, 4) + data),
          "no chunk 'data'", 0},
         {"wav-format-too-short", wav.file(wav.chunk("fmt ", "\1") + data), "'fmt ' at byte 12: is too short",
