@@ -130,7 +130,7 @@ bool takeOverOwnerAndMode(const struct stat& old, int to) {
     const bool owned =
         ::fchown(to, old.st_uid, old.st_gid) == 0 || ::fchown(to, static_cast<uid_t>(-1), old.st_gid) == 0;
     struct stat now {};
-    if (!owned || ::fstat(to, &now) != 0 || now.st_uid != old.st_uid) mode &= ~(S_ISUID | S_ISGID);
+    if (!owned || ::fstat(to, &now) != 0 || now.st_uid != old.st_uid) mode &= 01777U;
     return ::fchmod(to, mode) == 0;
 }
 
