@@ -28,62 +28,83 @@ bool failWithErrno(Error* error, std::string_view path, std::string_view action)
     return failFor(error, path, fmt::format("{}: {}", action, std::strerror(errno)));
 }
 
-bool writeAll(int descriptor, std::string_view bytes) {
+bool writeAll(int descriptor, std::string_view bytes, std::uint64_t position) {
     while (!bytes.empty()) {
-        const ssize_t written = ::write(descriptor, bytes.data(), bytes.size());
+        const ssize_t written =
+            ::pwrite(descriptor, bytes.data(), bytes.size(), static_cast<off_t>(position));
         if (written < 0 && errno == EINTR) continue;
         if (written <= 0) return false;
         bytes.remove_prefix(static_cast<std::size_t>(written));
+        position += static_cast<std::uint64_t>(written);
     }
     return true;
 }
 
-/// Through a buffer: for stretches that share no block, and where the kernel cannot copy by itself.
-bool copyThroughBuffer(int from, std::uint64_t offset, std::uint64_t length, int to) {
-    std::vector<char> buffer(std::min<std::uint64_t>(length, 1U << 18U));
-    while (length > 0) {
-        const ssize_t got = ::pread(from, buffer.data(), std::min<std::uint64_t>(length, buffer.size()),
-                                    static_cast<off_t>(offset));
+/// A stretch of one file, and where it goes in the other.
+struct Copy {
+    int from;
+    std::uint64_t offset;
+    std::uint64_t length;
+    int to;
+    std::uint64_t position;
+
+    void advance(std::uint64_t count) {
+        offset += count;
+        length -= count;
+        position += count;
+    }
+};
+
+/// Where the kernel cannot copy by itself, and where no whole block is left to share.
+bool copyThroughBuffer(Copy copy) {
+    std::vector<char> buffer(std::min<std::uint64_t>(copy.length, 1U << 18U));
+    while (copy.length > 0) {
+        const ssize_t got =
+            ::pread(copy.from, buffer.data(), std::min<std::uint64_t>(copy.length, buffer.size()),
+                    static_cast<off_t>(copy.offset));
         if (got < 0 && errno == EINTR) continue;
         if (got == 0) errno = ESTALE;  // the old file shrank
         if (got <= 0) return false;
         const auto count = static_cast<std::size_t>(got);
-        if (!writeAll(to, {buffer.data(), count})) return false;
-        offset += count;
-        length -= count;
+        if (!writeAll(copy.to, {buffer.data(), count}, copy.position)) return false;
+        copy.advance(count);
     }
     return true;
 }
 
-/// By the kernel, which shares blocks where it can.
-bool copyByKernel(int from, std::uint64_t offset, std::uint64_t length, int to) {
-    while (length > 0) {
-        auto position = static_cast<off_t>(offset);
-        const std::size_t step = std::min<std::uint64_t>(length, SSIZE_MAX / 2);
-        const ssize_t copied = ::copy_file_range(from, &position, to, nullptr, step, 0);
-        if (copied < 0 && errno == EINTR) continue;
-        const bool unable =
-            copied < 0 && errno != ENOSPC && errno != EFBIG && errno != EIO && errno != EDQUOT;
-        if (copied == 0 || unable) return copyThroughBuffer(from, offset, length, to);
-        if (copied < 0) return false;
-        offset += static_cast<std::uint64_t>(copied);
-        length -= static_cast<std::uint64_t>(copied);
-    }
-    return true;
-}
-
-/// Whole blocks can be shared only when they keep their place within a block.
-bool copyRange(int from, const FilePiece& piece, int to, std::uint64_t written) {
+/// By the kernel, which shares whole blocks that keep their place within a block where it can.
+bool copyRange(Copy copy) {
     constexpr std::uint64_t kBlock = 4096;
-    if (piece.offset % kBlock != written % kBlock) {
-        return copyByKernel(from, piece.offset, piece.length, to);
+    while (copy.length >= kBlock) {
+        auto from = static_cast<off_t>(copy.offset);
+        auto to = static_cast<off_t>(copy.position);
+        const std::uint64_t step = std::min<std::uint64_t>(copy.length, SSIZE_MAX / 2) / kBlock * kBlock;
+        const ssize_t copied = ::copy_file_range(copy.from, &from, copy.to, &to, step, 0);
+        if (copied < 0 && errno == EINTR) continue;
+        const bool isFinal = errno == ENOSPC || errno == EFBIG || errno == EIO || errno == EDQUOT;
+        if (copied < 0 && isFinal) return false;
+        if (copied <= 0) break;
+        copy.advance(static_cast<std::uint64_t>(copied));
     }
-    const std::uint64_t head = std::min(piece.length, (kBlock - piece.offset % kBlock) % kBlock);
-    const std::uint64_t blocks = (piece.length - head) / kBlock * kBlock;
-    const std::uint64_t tail = piece.length - head - blocks;
-    return copyThroughBuffer(from, piece.offset, head, to) &&
-           copyByKernel(from, piece.offset + head, blocks, to) &&
-           copyThroughBuffer(from, piece.offset + head + blocks, tail, to);
+    return copyThroughBuffer(copy);
+}
+
+std::uint64_t lengthOf(const FilePiece& piece) {
+    return piece.length > 0 ? piece.length : piece.bytes.size();
+}
+
+/// Where the ranges end that keep their place in the file, from its beginning on. They are copied in one go,
+/// which is fastest and shares most, and the new bytes between them are then written over it.
+std::uint64_t endOfUnmoved(std::span<const FilePiece> pieces) {
+    std::uint64_t position = 0;
+    std::uint64_t end = 0;
+    for (const FilePiece& piece : pieces) {
+        const bool isRange = piece.length > 0;
+        if (isRange && piece.offset != position) break;
+        position += lengthOf(piece);
+        if (isRange) end = position;
+    }
+    return end;
 }
 
 /// Makes a file that nobody else has in the folder; its mode follows the process's mask.
@@ -194,19 +215,28 @@ class Replacement {
     }
 
     bool write(std::span<const FilePiece> pieces, int to) const {
-        std::uint64_t written = 0;
+        const std::uint64_t unmoved = endOfUnmoved(pieces);
+        if (unmoved > 0 && !copy(0, unmoved, to, 0)) return false;
+        std::uint64_t position = 0;
         for (const FilePiece& piece : pieces) {
+            const std::uint64_t end = position + lengthOf(piece);
             const bool isRange = piece.length > 0;
-            if (isRange && !old_) return failFor(error_, path_, "does not exist");
-            const bool done =
-                isRange ? copyRange(old_->number(), piece, to, written) : writeAll(to, piece.bytes);
-            if (!done) {
-                return failWithErrno(error_, path_,
-                                     fmt::format("cannot write the new contents at byte {}", written));
-            }
-            written += isRange ? piece.length : piece.bytes.size();
+            const bool isDone = isRange && end <= unmoved;
+            if (isRange && !isDone && !copy(piece.offset, piece.length, to, position)) return false;
+            if (!isRange && !writeAll(to, piece.bytes, position)) return failToWrite(position);
+            position = end;
         }
         return true;
+    }
+
+    bool copy(std::uint64_t offset, std::uint64_t length, int to, std::uint64_t position) const {
+        if (!old_) return failFor(error_, path_, "does not exist");
+        return copyRange({old_->number(), offset, length, to, position}) || failToWrite(position);
+    }
+
+    bool failToWrite(std::uint64_t position) const {
+        return failWithErrno(error_, path_,
+                             fmt::format("cannot write the new contents at byte {}", position));
     }
 
     bool takeOver(int to) const {
