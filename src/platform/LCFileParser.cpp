@@ -111,7 +111,7 @@ std::shared_ptr<LCFileParser> LCFileParser::fileParserForBytes(std::span<const s
 std::shared_ptr<LCFileParser> LCFileParser::fileParserForReader(std::shared_ptr<RandomAccessReader> reader,
                                                                 std::string_view name,
                                                                 unsigned allowedFileTypes) {
-    const std::shared_ptr<LCFileParser> parser(new LCFileParser());
+    std::shared_ptr<LCFileParser> parser(new LCFileParser());
     parser->reader_ = std::move(reader);
     parser->name_ = name;
     parser->allowedFileTypes_ = allowedFileTypes;

@@ -238,6 +238,22 @@ TEST(LoopFileWrite, AllMusicThatIsSetComesBackThroughARecord) {
     EXPECT_EQ(*again->contentInfoDictionary(), *data->contentInfoDictionary());
 }
 
+TEST(LoopFileWrite, WordsOfTheNameStandInForDescriptorsOnlyInEnhancedDataAndOnRequest) {
+    const Wav wav;
+    const TemporaryFolder folder;
+    const URL url =
+        URL::fileURLWithPath(folder.write("Deep_Bass-F# 01.wav", wav.file(wav.format() + wav.data())));
+    const std::set<std::string> words{"Deep", "Bass", "F#", "01"};
+    EXPECT_EQ(LCFileParser::fileParserForURL(url, true, 7)->enhancedFileData()->descriptors(), words);
+    EXPECT_TRUE(LCFileParser::fileParserForURL(url, true, 7)->fileData()->descriptors().empty());
+    EXPECT_TRUE(LCFileParser::fileParserForURL(url)->enhancedFileData()->descriptors().empty());
+    const auto data = read(url.path());
+    data->setDescriptors({"Dark"});
+    ASSERT_TRUE(write(url.path(), data));
+    const auto own = LCFileParser::fileParserForURL(url, true, 7)->enhancedFileData();
+    EXPECT_EQ(own->descriptors(), std::set<std::string>{"Dark"});
+}
+
 /// Every file is named after the reason why it is not rewritten with certainty.
 TEST(LoopFileWrite, RefusesWhatItCannotRewriteWithCertainty) {
     const Wav wav;
@@ -317,6 +333,7 @@ TEST(LoopFileWrite, NullDataAndOtherFilesFailWithAReason) {
     EXPECT_FALSE(write(text, std::make_shared<LCFileData>(), &error));
     EXPECT_THAT(error.message, HasSubstr("is no WAV"));
     EXPECT_FALSE(write(folder.path("missing.wav"), std::make_shared<LCFileData>(), &error));
+    EXPECT_FALSE(write(folder.path("new.loopdata"), std::make_shared<LCFileData>(), &error));
     EXPECT_FALSE(write(folder.path(), std::make_shared<LCFileData>(), &error));
     EXPECT_EQ(test::filesBelow(folder.path()).size(), 1U);
 }

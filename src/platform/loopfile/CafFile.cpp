@@ -127,15 +127,14 @@ std::optional<std::vector<FilePiece>> CafFile::piecesWith(const std::string& rec
         ours = "uuid" + bigEndian(kRecordUuid.size() + record.size()) +
                std::string(kRecordUuid.begin(), kRecordUuid.end()) + record;
     }
+    const Chunk* openEnd = endsOpen_ ? &chunks_.back() : nullptr;
     PieceList pieces;
     pieces.addRange(0, kFileHeader);
     for (const Chunk& chunk : chunks_) {
-        const bool isOpenEnd = endsOpen_ && &chunk == &chunks_.back();
-        if (isOpenEnd) pieces.addBytes(std::move(ours));
+        if (&chunk == openEnd) pieces.addBytes(ours);
         if (chunk.role != Chunk::Role::record) pieces.addRange(chunk.offset, chunk.end);
-        if (isOpenEnd) return pieces.take();
     }
-    pieces.addBytes(std::move(ours));
+    if (openEnd == nullptr) pieces.addBytes(ours);
     return pieces.take();
 }
 

@@ -121,7 +121,7 @@ std::string recordText(const Container& container) {
 std::string describe(const Container& container, const Chunk& chunk) {
     if (chunk.role == Chunk::Role::record) return recordText(container);
     BoundedCursor contents = container.cursor(chunk);
-    const std::string meaning = meaningOf(chunk.id);
+    std::string meaning = meaningOf(chunk.id);
     switch (chunk.id) {
         case fourCC("fmt "):
         case fourCC("COMM"):
