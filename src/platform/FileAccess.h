@@ -25,11 +25,7 @@ std::optional<std::vector<std::uint8_t>> readFile(const std::string& path, Error
 std::optional<std::string> readTextFile(const std::string& path, Error* error = nullptr);
 
 /// Replaces the file at `path` (or makes it) so that at any instant, and after a crash at any instant, either
-/// the old or the new contents stand there, whole.
-///
-/// The bytes go to a new file in the same folder, which takes over the old one's mode and is flushed and
-/// renamed over it; then the folder is flushed. A link at `path` is followed, so that the link stays.
-/// On failure the old file stands untouched and the new one is removed.
+/// the old or the new contents stand there, whole; how, and what it takes over: `replaceFileByPieces`.
 bool replaceFile(const std::string& path, std::string_view bytes, Error* error = nullptr);
 
 }  // namespace qvct

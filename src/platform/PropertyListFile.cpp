@@ -10,6 +10,7 @@
 #include <cstring>
 #include <limits>
 #include <memory>
+#include <unordered_set>
 
 #include <fmt/format.h>
 #include <plist/plist.h>
@@ -78,8 +79,10 @@ PropertyList uidOr(PropertyList::Dictionary dictionary) {
     return dictionary;
 }
 
+/// Of a key that comes twice the first value holds: a second one could not be written again.
 PropertyList dictionary(plist_t node) {
     PropertyList::Dictionary result;
+    std::unordered_set<std::string> seen;
     plist_dict_iter raw = nullptr;
     plist_dict_new_iter(node, &raw);
     const std::unique_ptr<void, decltype(&std::free)> iterator(raw, std::free);
@@ -89,7 +92,8 @@ PropertyList dictionary(plist_t node) {
         plist_dict_next_item(node, raw, &rawKey, &value);
         const std::unique_ptr<char, decltype(&std::free)> key(rawKey, std::free);
         if (value == nullptr) return uidOr(std::move(result));
-        result.append(key ? key.get() : "", valueOf(value));
+        const std::string name = key ? key.get() : "";
+        if (seen.insert(name).second) result.append(name, valueOf(value));
     }
 }
 

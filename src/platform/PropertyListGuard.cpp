@@ -25,6 +25,7 @@ std::string_view textOf(std::span<const std::uint8_t> bytes) {
 /// What one object of a binary property list is, read without looking past the end.
 struct Object {
     enum class Kind { leaf, array, dictionary } kind = Kind::leaf;
+    std::size_t textUnit = 0;        // bytes of a character; 0 for what is no text
     std::uint64_t count = 0;         // references of a container (keys and values of a dictionary)
     std::size_t firstReference = 0;  // offset of a container's references
     std::uint64_t payload = 0;       // bytes of a leaf
@@ -151,6 +152,7 @@ class BinaryGraph {
         object.count = object.kind == Object::Kind::dictionary ? 2 * length : length;
         object.payload = object.kind == Object::Kind::leaf ? length * unit : 0;
         const bool isUtf16 = type == 0x6;
+        object.textUnit = type == 0x5 || isUtf16 ? unit : 0;
         if (isUtf16 && !isPairedUtf16(at, length))
             return refuse(kErrorMalformed, at, "half a surrogate pair");
         return true;
@@ -165,6 +167,17 @@ class BinaryGraph {
             openPair = kind == 0xD800;
         }
         return !openPair;
+    }
+
+    /// The library ends the process at a key with a NUL character.
+    bool isKey(std::uint64_t index, std::size_t place) {
+        Object object;
+        if (!readObject(index, object)) return false;
+        bool isText = object.textUnit > 0;
+        for (std::uint64_t i = 0; isText && i < object.payload; i += object.textUnit) {
+            isText = bigEndian(object.firstReference + static_cast<std::size_t>(i), object.textUnit) != 0;
+        }
+        return isText || refuse(kErrorMalformed, place, "a key that is no text, or holds a NUL character");
     }
 
     bool walk() {
@@ -190,8 +203,11 @@ class BinaryGraph {
         const State state = states_[static_cast<std::size_t>(child)];
         if (state == State::open) return refuse(kErrorMalformed, place, "a container holds itself");
         if (state == State::unseen) return enter(child);
+        const bool isKeyPlace =
+            visit.object.kind == Object::Kind::dictionary && visit.next < visit.object.count / 2;
         ++visit.next;
-        return add(visit, totals_[static_cast<std::size_t>(child)], place);
+        return add(visit, totals_[static_cast<std::size_t>(child)], place) &&
+               (!isKeyPlace || isKey(child, place));
     }
 
     bool enter(std::uint64_t index) {

@@ -151,6 +151,43 @@ TEST(PropertyList, RefusesAContainerThatHoldsItself) {
     EXPECT_FALSE(parsePropertyList(bytes));
 }
 
+/// A binary list of one dictionary with two pairs; its objects are the dictionary, two keys and one value.
+std::string dictionaryOfTwoPairs(const std::string& firstKey, const std::string& secondKey) {
+    std::string bytes = "bplist00";
+    std::string offsets(1, static_cast<char>(bytes.size()));
+    bytes += std::string("\xD2\x01\x02\x03\x03", 5);
+    for (const std::string& object : {firstKey, secondKey, std::string("\x09")}) {
+        offsets += static_cast<char>(bytes.size());
+        bytes += object;
+    }
+    std::string trailer(32, '\0');
+    trailer[6] = 1;
+    trailer[7] = 1;
+    trailer[15] = 4;
+    trailer[31] = static_cast<char>(bytes.size());
+    return bytes + offsets + trailer;
+}
+
+TEST(PropertyList, RefusesKeysThatTheLibraryWouldEndTheProcessAt) {
+    const std::string a = "\x51\x61";
+    EXPECT_TRUE(parsePropertyList(dictionaryOfTwoPairs(a, "\x51\x62")));
+    const std::string withNul("\x52\x62\x00", 3);
+    const std::string wideNul("\x61\x00\x00", 3);
+    const std::string number("\x10\x07");
+    for (const std::string& key : {withNul, wideNul, number}) {
+        Error error;
+        EXPECT_FALSE(parsePropertyList(dictionaryOfTwoPairs(a, key), &error));
+        EXPECT_NE(error.message.find("a key that is no text"), std::string::npos) << error.message;
+    }
+    EXPECT_FALSE(parsePropertyList("<plist><dict><key>a&#0;b</key><true/></dict></plist>"));
+}
+
+TEST(PropertyList, OfAKeyThatComesTwiceTheFirstHolds) {
+    const auto value = parsePropertyList(dictionaryOfTwoPairs("\x51\x61", "\x51\x61"));
+    ASSERT_TRUE(value);
+    EXPECT_EQ(value->dictionary()->size(), 1U);
+}
+
 TEST(PropertyList, ReadsTheValidCorpusAndSurvivesTheHostileOneInTime) {
     const auto root = test::corpus("plists");
     QVCT_SKIP_WITHOUT(root);

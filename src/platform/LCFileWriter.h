@@ -1,0 +1,74 @@
+#pragma once
+
+#include "platform/Error.h"
+#include "platform/LCFileData.h"
+#include "platform/Url.h"
+
+#include <cstdint>
+#include <memory>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace qvct {
+
+class RandomAccessReader;
+
+/// How a record is written into a file.
+struct LCWriteOptions {
+    bool keepsTimes = false;  ///< The file keeps its times of access and change.
+    /// The new file is read back and compared with the old one before it takes its place: the audio, and
+    /// every chunk that is not ours. Costs a read of both.
+    bool verifies = false;
+};
+
+/// Writes the record of file data into the file at a URL, and nothing else.
+///
+/// Audio and every chunk that is not ours come out byte for byte, in their order, pad bytes included. The new
+/// file is made beside the old one, flushed and renamed over it: mode, owner (where permitted) and extended
+/// attributes stay, a symbolic link is followed, another hard link keeps the old contents. On any failure the
+/// old file stands untouched and the new one is removed. A file that cannot be rewritten with certainty
+/// (sizes that contradict each other, an unreadable record, one that would outgrow its container) is refused.
+///
+/// @cost  At most one copy of the file; its headers alone where the file system shares extents.
+class LCFileWriter {
+  public:
+    static std::shared_ptr<LCFileWriter> fileWriterForURL(const URL& url, LCWriteOptions options = {});
+
+    /// Whether the record now stands in the file. Null data fails. An empty record removes our chunk. A file
+    /// called ".loopdata" need not exist.
+    bool writeFileData(const std::shared_ptr<const LCFileData>& data, Error* error = nullptr) const;
+
+  private:
+    LCFileWriter(std::string path, LCWriteOptions options);
+
+    std::string path_;
+    LCWriteOptions options_;
+};
+
+/// Fingerprint of all that a write must not touch, for comparing a file before and after.
+struct LCFingerprint {
+    struct Part {
+        std::string id;
+        std::uint64_t size = 0;
+        std::uint64_t hash = 0;  ///< 64-bit FNV-1a of the contents and the pad bytes.
+        bool operator==(const Part&) const = default;
+    };
+    std::uint64_t audioSize = 0;
+    std::uint64_t audioHash = 0;
+    std::vector<Part> chunks;  ///< Every chunk that is not ours, in the order of the file.
+
+    bool operator==(const LCFingerprint&) const = default;
+    /// One sentence for each difference; empty when there is none.
+    std::vector<std::string> differences(const LCFingerprint& after) const;
+};
+
+/// Nothing and an error for a file that is no container of ours.
+/// @cost  Reads the whole file.
+std::optional<LCFingerprint> fingerprintOfFile(const URL& url, Error* error = nullptr);
+/// The same over a reader; `name` stands in for the path.
+std::optional<LCFingerprint> fingerprintOfReader(const RandomAccessReader& reader, std::string_view name,
+                                                 Error* error = nullptr);
+
+}  // namespace qvct

@@ -1,0 +1,83 @@
+#include "platform/loopfile/MusicValues.h"
+
+#include "platform/Text.h"
+
+#include <algorithm>
+#include <bit>
+#include <charconv>
+#include <cmath>
+#include <cstring>
+
+namespace qvct {
+
+std::string textOfField(std::string_view bytes) {
+    const std::string_view text = trimBlanksAndLineBreaks(bytes.substr(0, bytes.find('\0')));
+    if (isValidUtf8(text)) return std::string(text);
+    std::string converted;
+    for (const char byte : text) {
+        const auto code = static_cast<unsigned char>(byte);
+        if (code < 0x80) {
+            converted += byte;
+        } else {
+            converted += static_cast<char>(0xC0U | code >> 6U);
+            converted += static_cast<char>(0x80U | (code & 0x3FU));
+        }
+    }
+    return converted;
+}
+
+void setTempo(LCAudioFacts& facts, double bpm) {
+    constexpr double kFastest = 1000;
+    if (bpm > 0 && bpm <= kFastest) facts.bpm = static_cast<float>(bpm);
+}
+
+void setSignature(LCAudioFacts& facts, unsigned top, unsigned bottom) {
+    if (top < 1 || top > 64 || bottom > 64 || !std::has_single_bit(bottom)) return;
+    facts.signatureTop = static_cast<int>(top);
+    facts.signatureBottom = static_cast<int>(bottom);
+}
+
+void setBeats(LCAudioFacts& facts, std::uint64_t beats) {
+    constexpr std::uint64_t kMost = 1'000'000;
+    if (beats <= kMost) facts.beatCount = static_cast<int>(beats);
+}
+
+void setRootNote(LCAudioFacts& facts, unsigned note) {
+    if (note >= 1 && note <= 127) facts.midiRootNote = static_cast<int>(note);
+}
+
+void setSignatureText(LCAudioFacts& facts, std::string_view text) {
+    const std::size_t slash = text.find('/');
+    if (slash == std::string_view::npos) return;
+    unsigned top = 0;
+    unsigned bottom = 0;
+    std::from_chars(text.data(), text.data() + slash, top);
+    std::from_chars(text.data() + slash + 1, text.data() + text.size(), bottom);
+    setSignature(facts, top, bottom);
+}
+
+void setKeyText(LCAudioFacts& facts, std::string_view text) {
+    constexpr int kMinor = 1;
+    constexpr int kMajor = 2;
+    if (text.empty() || text.front() < 'A' || text.front() > 'G') return;
+    facts.keyType = text.find('m') == std::string_view::npos || text.find("maj") != std::string_view::npos
+                        ? kMajor
+                        : kMinor;
+}
+
+void setMidi(LCAudioFacts& facts, std::vector<std::uint8_t> bytes) {
+    if (bytes.size() < 14 || std::memcmp(bytes.data(), "MThd", 4) != 0) return;
+    facts.midiData = std::move(bytes);
+    facts.isLoop = true;
+}
+
+void setMarkers(LCAudioFacts& facts, std::vector<std::int64_t> frames) {
+    std::sort(frames.begin(), frames.end());
+    frames.erase(std::unique(frames.begin(), frames.end()), frames.end());
+    std::erase_if(frames, [&](std::int64_t frame) {
+        return frame < 0 || static_cast<std::uint64_t>(frame) > facts.frameCount;
+    });
+    facts.transientMarkers = std::move(frames);
+}
+
+}  // namespace qvct
