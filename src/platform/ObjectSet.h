@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <cstddef>
 #include <memory>
+#include <string>
 #include <unordered_map>
 #include <utility>
 #include <vector>
@@ -68,6 +69,13 @@ class ObjectSet {
         return size() == other.size() && std::all_of(begin(), end(), [&other](const Pointer& object) {
                    return other.contains(*object);
                });
+    }
+
+    /// The descriptions of the objects, in braces.
+    std::string description() const {
+        std::string text;
+        for (const Pointer& object : objects_) text += (text.empty() ? "" : ", ") + object->description();
+        return "{" + text + "}";
     }
 
   private:

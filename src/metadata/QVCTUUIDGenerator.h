@@ -1,0 +1,23 @@
+#pragma once
+
+#include <string>
+#include <string_view>
+
+namespace qvct {
+
+/// Identifiers that anybody makes anew from what they identify, so that none has to be stored.
+class QVCTUUIDGenerator {
+  public:
+    /// What our identifiers are made under; with it and the path everyone gets the same ones.
+    static constexpr std::string_view kPathNamespace = "42e60a19-8562-4e31-9514-3ae3912dfa41";
+
+    /// The identifier of what lies at a path: a name-based UUID (version 5, RFC 9562) of the path in lower
+    /// case hexadecimal digits.
+    ///
+    /// "." and ".." and doubled or trailing slashes make no difference, and neither does whether anything
+    /// lies there. A path that does not begin at the root is taken as if it did. Bytes are taken as they are:
+    /// names that only look alike have different identifiers.
+    static std::string automaticUUIDForAbsolutePath(std::string_view path);
+};
+
+}  // namespace qvct

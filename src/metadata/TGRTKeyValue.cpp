@@ -1,0 +1,72 @@
+#include "metadata/TGRTKeyValue.h"
+
+#include <utility>
+
+#include <fmt/format.h>
+
+namespace qvct {
+namespace {
+
+/// As people read it: 1 for true, no decimals where there are none.
+std::string textOfNumber(const PropertyList& number) {
+    if (const auto* value = number.unsignedInteger()) return fmt::to_string(*value);
+    if (const auto* value = number.real()) return fmt::to_string(*value);
+    return fmt::to_string(number.integerValue().value_or(0));
+}
+
+}  // namespace
+
+std::shared_ptr<TGRTKeyValue> TGRTKeyValue::initWithKeyNumberValue(std::string key,
+                                                                   PropertyList numberValue) {
+    if (!numberValue.isNumber()) return nullptr;
+    const std::string text = fmt::format("<TGRTKeyValue>key:{} number:{}", key, textOfNumber(numberValue));
+    std::shared_ptr<TGRTKeyValue> item(new TGRTKeyValue(std::move(key), stringHash(text)));
+    item->numberValue_ = std::move(numberValue);
+    return item;
+}
+
+std::shared_ptr<TGRTKeyValue> TGRTKeyValue::initWithKeyStringValue(std::string key, std::string stringValue) {
+    const std::string text = fmt::format("<TGRTKeyValue>key:{} string:{}", key, stringValue);
+    std::shared_ptr<TGRTKeyValue> item(new TGRTKeyValue(std::move(key), stringHash(text)));
+    item->stringValue_ = std::move(stringValue);
+    return item;
+}
+
+std::optional<PropertyList> TGRTKeyValue::value() const {
+    return stringValue_ ? std::optional<PropertyList>(*stringValue_) : numberValue_;
+}
+
+ObjectSet<TGRTKeyValue> TGRTKeyValue::keyValuesWithDictionary(const PropertyList* dictionary) {
+    ObjectSet<TGRTKeyValue> items;
+    if (dictionary == nullptr || dictionary->dictionary() == nullptr) return items;
+    for (const auto& [key, value] : *dictionary->dictionary()) {
+        if (const std::string* text = value.string()) {
+            items.insert(initWithKeyStringValue(key, *text));
+        } else {
+            items.insert(initWithKeyNumberValue(key, value));
+        }
+    }
+    return items;
+}
+
+PropertyList::Dictionary TGRTKeyValue::keyValueDictionaryForKeyValues(
+    const ObjectSet<TGRTKeyValue>& keyValues) {
+    PropertyList::Dictionary result;
+    for (const auto& item : keyValues) {
+        if (auto value = item->value()) result.set(item->key_, std::move(*value));
+    }
+    return result;
+}
+
+bool TGRTKeyValue::isEqual(const Object& other) const {
+    return dynamic_cast<const TGRTKeyValue*>(&other) != nullptr && other.hash() == hash();
+}
+
+std::string TGRTKeyValue::description() const {
+    const std::string text = stringValue_   ? *stringValue_
+                             : numberValue_ ? textOfNumber(*numberValue_)
+                                            : "(null)";
+    return fmt::format("<TGRTKeyValue {}> Key: {} Value: {}", static_cast<const void*>(this), key_, text);
+}
+
+}  // namespace qvct

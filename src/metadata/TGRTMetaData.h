@@ -1,0 +1,84 @@
+#pragma once
+
+#include "metadata/TGRTContentInfo.h"
+#include "metadata/TGRTKeyValue.h"
+#include "platform/Error.h"
+#include "platform/Object.h"
+#include "platform/ObjectSet.h"
+#include "platform/PropertyList.h"
+#include "platform/Url.h"
+#include "taxonomy/TGRTTagging.h"
+
+#include <cstdint>
+#include <memory>
+#include <optional>
+#include <string>
+#include <string_view>
+
+namespace qvct {
+
+class TGRTTaxonomy;
+
+/// The record of one content item: everything that its file stores about it.
+///
+/// It owns its content info; key values and taggings are shared with whoever made them. Use one record from
+/// one thread at a time.
+class TGRTMetaData : public Object {
+  public:
+    static std::shared_ptr<TGRTMetaData> init();
+
+    /// Nothing when the item has no name but that of its file.
+    const std::optional<std::string>& displayName() const { return displayName_; }
+    void setDisplayName(std::optional<std::string> name) { displayName_ = std::move(name); }
+    /// A FileType; files may hold others. 0 for none.
+    std::int64_t fileType() const { return fileType_; }
+    void setFileType(std::int64_t fileType) { fileType_ = fileType; }
+    /// 0 for none.
+    std::int64_t subFileType() const { return subFileType_; }
+    void setSubFileType(std::int64_t subFileType) { subFileType_ = subFileType; }
+    const ObjectSet<TGRTTagging>& taggings() const { return taggings_; }
+    void setTaggings(ObjectSet<TGRTTagging> taggings) { taggings_ = std::move(taggings); }
+    const ObjectSet<TGRTKeyValue>& keyValues() const { return keyValues_; }
+    void setKeyValues(ObjectSet<TGRTKeyValue> keyValues) { keyValues_ = std::move(keyValues); }
+    /// Null until one is set.
+    const std::shared_ptr<TGRTContentInfo>& contentInfo() const { return contentInfo_; }
+    /// Keeps a copy.
+    void setContentInfo(const std::shared_ptr<TGRTContentInfo>& contentInfo);
+
+    /// The value of the key-value item with that key.
+    std::optional<PropertyList> valueForKey(std::string_view key) const;
+
+    /// What to store at the URL: the property list that is stored there with this record's entries in place
+    /// of its own.
+    ///
+    /// Entries that the record knows nothing of stay, where they stand; so do the sub-type when the record
+    /// has none, and the content info when it has none. A stored UUID is removed. When nothing is stored
+    /// there it starts empty. So it does when what is there cannot be read, but then the error says so:
+    /// whoever writes the result destroys what is there.
+    PropertyList::Dictionary prepareDictionaryForURL(const URL& url, Error* error = nullptr) const;
+
+    /// The record that a dictionary holds; null without dictionary. Entries that are not of their type count
+    /// as absent. Labels that the taxonomy does not know are added to it, or dropped when it is read-only.
+    static std::shared_ptr<TGRTMetaData> metaDataFromDictionary(const PropertyList::Dictionary* dictionary,
+                                                                TGRTTaxonomy& taxonomy);
+    static ObjectSet<TGRTTagging> taggingsFromDictionary(const PropertyList::Dictionary& dictionary,
+                                                         TGRTTaxonomy& taxonomy);
+    /// Never null.
+    static std::shared_ptr<TGRTContentInfo> contentInfoFromDictionary(
+        const PropertyList::Dictionary& dictionary);
+    static ObjectSet<TGRTKeyValue> keyValuesFromDictionary(const PropertyList::Dictionary& dictionary);
+
+    std::string description() const override;
+
+  private:
+    TGRTMetaData() = default;
+
+    std::optional<std::string> displayName_;
+    std::int64_t fileType_ = 0;
+    std::int64_t subFileType_ = 0;
+    ObjectSet<TGRTTagging> taggings_;
+    ObjectSet<TGRTKeyValue> keyValues_;
+    std::shared_ptr<TGRTContentInfo> contentInfo_;
+};
+
+}  // namespace qvct
