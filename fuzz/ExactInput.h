@@ -11,7 +11,9 @@ namespace qvct::fuzz {
 /// The input in a buffer of exactly its size, so that reading one byte too many is seen.
 class ExactInput {
   public:
-    ExactInput(const std::uint8_t* data, std::size_t size) : bytes_(data, data + size) { bytes_.shrink_to_fit(); }
+    ExactInput(const std::uint8_t* data, std::size_t size) : bytes_(data, data + size) {
+        bytes_.shrink_to_fit();
+    }
     std::span<const std::uint8_t> bytes() const { return bytes_; }
     std::string_view text() const { return {reinterpret_cast<const char*>(bytes_.data()), bytes_.size()}; }
 

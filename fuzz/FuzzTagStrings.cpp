@@ -1,11 +1,11 @@
 // Whatever the label: no crash, and a tag written with its marker is read as the same kind of tag.
 
-#include <cmath>
-
 #include "ExactInput.h"
 #include "platform/Text.h"
 #include "taxonomy/TGRTCategory.h"
 #include "taxonomy/TGRTTag.h"
+
+#include <cmath>
 
 using namespace qvct;
 

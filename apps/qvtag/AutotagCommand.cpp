@@ -34,6 +34,7 @@ struct Item {
 
 std::string serviceNames() {
     std::vector<std::string> names;
+    names.reserve(kServices.size());
     for (const Service& service : kServices) names.emplace_back(service.name);
     return join(names, ", ");
 }

@@ -197,7 +197,8 @@ class Replacement {
         }
         if (!S_ISREG(status.st_mode)) return failFor(error_, path_, "is not a regular file");
         constexpr mode_t kAnyWrite = S_IWUSR | S_IWGRP | S_IWOTH;
-        if ((status.st_mode & kAnyWrite) == 0 || ::faccessat(AT_FDCWD, target_.c_str(), W_OK, AT_EACCESS) != 0) {
+        if ((status.st_mode & kAnyWrite) == 0 ||
+            ::faccessat(AT_FDCWD, target_.c_str(), W_OK, AT_EACCESS) != 0) {
             return failFor(error_, path_, "is protected from writing");
         }
         old_.emplace(::open(target_.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));

@@ -55,7 +55,8 @@ bool isSameOutsideOfTheRecord(const std::string& path, const LCFingerprint& befo
 
 bool makeLoopDataFile(const std::string& path, const std::string& record, Error* error) {
     if (record.empty()) {
-        return failFor(error, path, {{}, kErrorInvalidArgument, "a loop data file cannot be without a record"});
+        return failFor(error, path,
+                       {{}, kErrorInvalidArgument, "a loop data file cannot be without a record"});
     }
     const FilePiece whole{.bytes = record};
     return replaceFileByPieces(path, {&whole, 1}, {}, error);

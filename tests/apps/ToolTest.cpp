@@ -116,8 +116,9 @@ TEST(Autotag, CannotReadAFolderButGoesOn) {
     fs::permissions(folder.path(), fs::perms::others_read | fs::perms::others_exec, fs::perm_options::add);
     fs::permissions(folder.path("a"), fs::perms::none);
     // The superuser reads every folder, so he becomes nobody for this.
-    const ToolResult result = runTool({"autotag", "--json", folder.path()},
-                                      ::geteuid() == 0 ? "setpriv --reuid=65534 --clear-groups" : "");
+    const ToolResult result =
+        runTool({"autotag", "--json", folder.path()},
+                ::geteuid() == 0 ? "setpriv --reuid=65534 --regid=65534 --clear-groups" : "");
     fs::permissions(folder.path("a"), fs::perms::owner_all);
     EXPECT_EQ(result.status, 1);
     EXPECT_THAT(names(result.json()), ElementsAre("Snare.wav"));
