@@ -61,6 +61,16 @@ TEST(LoopFileRead, AOneShotIsNoLoopAndItsTempoMeansNothing) {
     EXPECT_EQ(data->midiRootNote(), 40);
 }
 
+TEST(LoopFileRead, AChunkThatIsAByteTooShortSaysNothing) {
+    const Wav wav;
+    const std::string acid = wav.acid(2, 50, 4, 120);
+    const std::string cutOff = wav.chunk("acid", acid.substr(8, 23)) + wav.chunk("smpl", acid.substr(0, 15));
+    const auto data = parserOf(wav.file(wav.format() + cutOff + wav.data()))->fileData();
+    ASSERT_TRUE(data);
+    EXPECT_FALSE(data->hasLoopTypeChunks());
+    EXPECT_EQ(data->midiRootNote(), -1);
+}
+
 TEST(LoopFileRead, TakesTheMusicOfAiffFilesAndLeavesLoopPointsOut) {
     const auto marker = [](unsigned number, unsigned frame, const std::string& name) {
         return big(number, 2) + big(frame, 4) + big(name.size(), 1) + name +

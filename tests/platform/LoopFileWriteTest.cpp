@@ -156,6 +156,7 @@ TEST(LoopFileWrite, AMissingLastPadByteIsAddedAndCounted) {
         Error error;
         ASSERT_TRUE(tag(path, &error)) << error.message;
         EXPECT_EQ(read(path)->taggingDictionary(), kTagging);
+        EXPECT_EQ(sizeAt(contentsOf(path), 4, 4, false), contentsOf(path).size() - 8);
         ASSERT_TRUE(untag(path));
         EXPECT_EQ(contentsOf(path), whole);
     }
