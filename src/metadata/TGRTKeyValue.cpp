@@ -1,5 +1,6 @@
 #include "metadata/TGRTKeyValue.h"
 
+#include <unordered_set>
 #include <utility>
 
 #include <fmt/format.h>
@@ -52,8 +53,15 @@ ObjectSet<TGRTKeyValue> TGRTKeyValue::keyValuesWithDictionary(const PropertyList
 PropertyList::Dictionary TGRTKeyValue::keyValueDictionaryForKeyValues(
     const ObjectSet<TGRTKeyValue>& keyValues) {
     PropertyList::Dictionary result;
+    std::unordered_set<std::string_view> keys;
     for (const auto& item : keyValues) {
-        if (auto value = item->value()) result.set(item->key_, std::move(*value));
+        auto value = item->value();
+        if (!value) continue;
+        if (keys.insert(item->key_).second) {
+            result.append(item->key_, std::move(*value));
+        } else {
+            result.set(item->key_, std::move(*value));
+        }
     }
     return result;
 }

@@ -51,8 +51,14 @@ class ObjectSet {
 
     /// The member that equals `object`, or null.
     const T* find(const T& object) const {
-        const auto [first, last] = byHash_.equal_range(object.hash());
-        const auto hit = std::find_if(first, last, [&](const auto& e) { return e.second->isEqual(object); });
+        return findWithHash(object.hash(), [&](const T& member) { return member.isEqual(object); });
+    }
+
+    /// The member with that hash that the predicate accepts, or null.
+    template <typename Predicate>
+    T* findWithHash(std::size_t hash, Predicate accepts) const {
+        const auto [first, last] = byHash_.equal_range(hash);
+        const auto hit = std::find_if(first, last, [&](const auto& e) { return accepts(*e.second); });
         return hit == last ? nullptr : hit->second;
     }
 
@@ -80,7 +86,7 @@ class ObjectSet {
 
   private:
     std::vector<Pointer> objects_;
-    std::unordered_multimap<std::size_t, const T*> byHash_;
+    std::unordered_multimap<std::size_t, T*> byHash_;
 };
 
 }  // namespace qvct

@@ -9,7 +9,6 @@
 #include <unicode/coll.h>
 #include <unicode/locid.h>
 #include <unicode/normalizer2.h>
-#include <unicode/numberformatter.h>
 #include <unicode/uchar.h>
 #include <unicode/unistr.h>
 #include <unicode/utf8.h>
@@ -49,17 +48,11 @@ std::string utf8(const icu::UnicodeString& text) {
     return result;
 }
 
-/// The user's locale; the root locale where none is set, so that "C" sorts as people do.
-icu::Locale userLocale() {
-    const icu::Locale locale = icu::Locale::getDefault();
-    const bool isPosix = std::string_view(locale.getVariant()) == "POSIX";
-    return isPosix ? icu::Locale::getRoot() : locale;
-}
-
 const icu::Collator& userCollator() {
     static const auto collator = [] {
         UErrorCode status = U_ZERO_ERROR;
-        return std::unique_ptr<icu::Collator>(icu::Collator::createInstance(userLocale(), status));
+        return std::unique_ptr<icu::Collator>(
+            icu::Collator::createInstance(icu::Locale(userLocaleName().c_str()), status));
     }();
     return *collator;
 }
@@ -141,6 +134,12 @@ std::u16string utf16FromUtf8(std::string_view text) {
 
 std::string utf8FromUtf16(std::u16string_view text) {
     return utf8(icu::UnicodeString(false, text.data(), static_cast<int32_t>(text.size())));
+}
+
+std::string userLocaleName() {
+    const icu::Locale locale = icu::Locale::getDefault();
+    const bool isPosix = std::string_view(locale.getVariant()) == "POSIX";
+    return (isPosix ? icu::Locale::getRoot() : locale).getName();
 }
 
 int localizedCompare(std::string_view a, std::string_view b) {
@@ -251,16 +250,6 @@ double leadingNumber(std::string_view text) {
     double value = 0;
     const auto [end, status] = std::from_chars(text.data(), text.data() + text.size(), value);
     return status == std::errc{} ? value : 0;
-}
-
-std::string localizedDecimal(double value, int fractionDigits) {
-    using icu::number::NumberFormatter;
-    using icu::number::Precision;
-    UErrorCode status = U_ZERO_ERROR;
-    const auto formatter = NumberFormatter::withLocale(userLocale())
-                               .precision(Precision::fixedFraction(fractionDigits))
-                               .grouping(UNUM_GROUPING_OFF);
-    return utf8(formatter.formatDouble(value, status).toString(status));
 }
 
 std::size_t displayWidth(std::string_view text) {

@@ -14,6 +14,9 @@ bool isAscii(std::string_view text);
 std::u16string utf16FromUtf8(std::string_view text);
 std::string utf8FromUtf16(std::u16string_view text);
 
+/// The user's locale, such as "de_DE"; the root locale's empty name where none is set ("C"), so that texts
+/// sort as people do.
+std::string userLocaleName();
 /// Order of two texts for people, in the order of the user's locale: negative, 0 or positive.
 int localizedCompare(std::string_view a, std::string_view b);
 /// Whether `text` holds `part`, without regard to case and diacritics. An empty part is never held.
@@ -45,8 +48,6 @@ std::string join(const std::vector<std::string>& parts, std::string_view separat
 std::string replaceAll(std::string_view text, std::string_view from, std::string_view to);
 /// The number that the text begins with, blanks skipped and whatever the locale; 0 when there is none.
 double leadingNumber(std::string_view text);
-/// A text with one decimal digit (or whole, for 0 digits) as the user's locale writes numbers.
-std::string localizedDecimal(double value, int fractionDigits);
 /// How many columns of a terminal the text takes.
 std::size_t displayWidth(std::string_view text);
 /// The text with every byte that is not printable UTF-8 escaped, fit for one line of a message.

@@ -16,6 +16,11 @@ std::shared_ptr<TGRTCategory> TGRTCategory::initWithIdentifier(std::string ident
     return std::shared_ptr<TGRTCategory>(new TGRTCategory(std::move(identifier)));
 }
 
+void TGRTCategory::setIdentifier(std::string identifier) {
+    anyWasRenamed_ = true;
+    identifier_ = std::move(identifier);
+}
+
 void TGRTCategory::addTag(const std::shared_ptr<TGRTTag>& tag) {
     if (!tag) return;
     ++revision_;

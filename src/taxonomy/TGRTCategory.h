@@ -4,6 +4,7 @@
 #include "platform/ObjectSet.h"
 #include "platform/PropertyList.h"
 
+#include <atomic>
 #include <cstdint>
 #include <memory>
 #include <string>
@@ -19,7 +20,7 @@ class TGRTTag;
 class QVContentTaggingCategory {
   public:
     virtual ~QVContentTaggingCategory() = default;
-    virtual std::string identifier() const = 0;
+    virtual const std::string& identifier() const = 0;
     /// All tags, at every depth.
     virtual const ObjectSet<TGRTTag>& tags() const = 0;
     virtual ObjectSet<TGRTTag> rootTags() const = 0;
@@ -29,13 +30,18 @@ class QVContentTaggingCategory {
 ///
 /// Tags join it as they are created. It keeps an index of their labels, so that a search does not walk the
 /// tree.
-class TGRTCategory : public Object, public QVContentTaggingCategory {
+class TGRTCategory : public Object,
+                     public QVContentTaggingCategory,
+                     public std::enable_shared_from_this<TGRTCategory> {
   public:
     static std::shared_ptr<TGRTCategory> initWithIdentifier(std::string identifier);
 
-    std::string identifier() const override { return identifier_; }
+    const std::string& identifier() const override { return identifier_; }
     /// Does not change hash and equality, which are those of the identifier at creation.
-    void setIdentifier(std::string identifier) { identifier_ = std::move(identifier); }
+    void setIdentifier(std::string identifier);
+    /// Whether any category of this process has been given another identifier. While none has, each is found
+    /// by the hash of its identifier.
+    static bool anyWasRenamed() { return anyWasRenamed_; }
 
     void addTag(const std::shared_ptr<TGRTTag>& tag);
     void removeTag(const std::shared_ptr<TGRTTag>& tag);
@@ -85,6 +91,8 @@ class TGRTCategory : public Object, public QVContentTaggingCategory {
     };
 
     explicit TGRTCategory(std::string identifier);
+
+    static inline std::atomic<bool> anyWasRenamed_ = false;
 
     std::string identifier_;
     std::size_t hash_;

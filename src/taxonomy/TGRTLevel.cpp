@@ -6,8 +6,18 @@
 
 namespace qvct {
 
+namespace {
+
+std::size_t hashOf(double weight) {
+    fmt::memory_buffer text;
+    fmt::format_to(std::back_inserter(text), "TGRTLevel {:f}", weight);
+    return stringHash({text.data(), text.size()});
+}
+
+}  // namespace
+
 TGRTLevel::TGRTLevel(double weight)
-    : hash_(stringHash(fmt::format("TGRTLevel {:f}", weight))),
+    : hash_(hashOf(weight)),
       // In this order a weight that is not a number becomes 0.
       weight_(std::max(0.0, std::min(weight, 1.0))) {}
 

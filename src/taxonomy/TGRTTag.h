@@ -21,9 +21,9 @@ class TGRTTag;
 class QVContentTaggingTag {
   public:
     virtual ~QVContentTaggingTag() = default;
-    virtual std::string label() const = 0;
+    virtual const std::string& label() const = 0;
     /// The names of the value steps; empty for most tags.
-    virtual std::vector<std::string> enumeratedLabels() const = 0;
+    virtual const std::vector<std::string>& enumeratedLabels() const = 0;
     virtual std::shared_ptr<TGRTTag> parent() const = 0;
     virtual const ObjectSet<TGRTTag>& children() const = 0;
     virtual std::shared_ptr<TGRTCategory> category() const = 0;
@@ -45,14 +45,14 @@ class TGRTTag : public Object, public QVContentTaggingTag, public std::enable_sh
     /// A tag without label; the dictionary is not read.
     static std::shared_ptr<TGRTTag> initWithDictionary(const PropertyList::Dictionary& dictionary);
 
-    std::string label() const override { return label_; }
+    const std::string& label() const override { return label_; }
     void setLabel(std::string label);
     TagValueType valueType() const { return valueType_; }
     void setValueType(TagValueType valueType) { valueType_ = valueType; }
     std::int64_t numberOfTagValueSteps() const { return numberOfTagValueSteps_; }
     void setNumberOfTagValueSteps(std::int64_t steps) { numberOfTagValueSteps_ = steps; }
     const std::vector<std::string>& valueStepLabels() const { return valueStepLabels_; }
-    std::vector<std::string> enumeratedLabels() const override { return valueStepLabels_; }
+    const std::vector<std::string>& enumeratedLabels() const override { return valueStepLabels_; }
 
     /// Null for a root tag, and once the parent is gone.
     std::shared_ptr<TGRTTag> parent() const override { return parent_.lock(); }

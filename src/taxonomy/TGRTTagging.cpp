@@ -1,7 +1,7 @@
 #include "taxonomy/TGRTTagging.h"
 
+#include "platform/DecimalFormatter.h"
 #include "platform/TaggingTypes.h"
-#include "platform/Text.h"
 #include "taxonomy/TGRTTaxonomy.h"
 
 #include <algorithm>
@@ -16,11 +16,19 @@ namespace qvct {
 namespace {
 
 std::string levelText(float weight) {
+    static const DecimalFormatter wholeNumbers(0);
     constexpr std::array levels = {kTaggingLevel1, kTaggingLevel2, kTaggingLevel3, kTaggingLevel4};
     for (std::size_t i = 0; i < levels.size(); ++i) {
-        if (weight == levels[i]) return localizedDecimal(static_cast<double>(i + 1), 0);
+        if (weight == levels[i]) return wholeNumbers.stringFromNumber(static_cast<double>(i + 1));
     }
-    return localizedDecimal(static_cast<double>(weight) * 4.0, 1);
+    return TGRTTagging::doubleFormatter().stringFromNumber(static_cast<double>(weight) * 4.0);
+}
+
+std::size_t hashOf(std::string_view label, const TGRTLevel* level, std::string_view category) {
+    fmt::memory_buffer text;
+    fmt::format_to(std::back_inserter(text), "<TGRTTagging>N:{} L:{} C:{}", label,
+                   static_cast<std::int64_t>(level == nullptr ? 0 : level->hash()), category);
+    return stringHash({text.data(), text.size()});
 }
 
 /// The tagging that one entry of a tagging dictionary describes, or null.
@@ -53,8 +61,7 @@ TGRTTagging::TGRTTagging(std::shared_ptr<TGRTTag> tag, std::shared_ptr<TGRTLevel
       level_(std::move(level)),
       label_(tag_->label()),
       category_(tag_->categoryIdentifier()),
-      hash_(stringHash(fmt::format("<TGRTTagging>N:{} L:{} C:{}", label_,
-                                   static_cast<std::int64_t>(level_ ? level_->hash() : 0), category_))) {
+      hash_(hashOf(label_, level_.get(), category_)) {
     if (const auto parent = tag_->parent()) parentLabel_ = parent->label();
 }
 
@@ -71,6 +78,11 @@ float TGRTTagging::weight() const {
 
 std::int64_t TGRTTagging::weightLevel() const {
     return std::lround(weight() * 10.0F);
+}
+
+const DecimalFormatter& TGRTTagging::doubleFormatter() {
+    static const DecimalFormatter formatter(1);
+    return formatter;
 }
 
 std::string TGRTTagging::displayString() const {
@@ -100,10 +112,13 @@ PropertyList::Dictionary TGRTTagging::taggingDictionaryForTaggings(const ObjectS
         return std::tie(a->category_, a->label_) < std::tie(b->category_, b->label_);
     });
     PropertyList::Dictionary result;
-    for (const auto& tagging : sorted) {
-        if (result.value(tagging->category_) == nullptr)
-            result.append(tagging->category_, PropertyList::Array{});
-        result.value(tagging->category_)->array()->emplace_back(entryForTagging(*tagging));
+    for (auto first = sorted.begin(); first != sorted.end();) {
+        const std::string& category = (*first)->category_;
+        PropertyList::Array entries;
+        for (; first != sorted.end() && (*first)->category_ == category; ++first) {
+            entries.emplace_back(entryForTagging(**first));
+        }
+        result.append(category, std::move(entries));
     }
     return result;
 }

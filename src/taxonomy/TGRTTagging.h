@@ -13,16 +13,17 @@
 
 namespace qvct {
 
+class DecimalFormatter;
 class TGRTTaxonomy;
 
 /// What a host's database stores of a tagging.
 class QVContentTaggingIndexableTaggingData {
   public:
     virtual ~QVContentTaggingIndexableTaggingData() = default;
-    virtual std::string label() const = 0;
+    virtual const std::string& label() const = 0;
     /// Empty for a root tag.
-    virtual std::string parentLabel() const = 0;
-    virtual std::string category() const = 0;
+    virtual const std::string& parentLabel() const = 0;
+    virtual const std::string& category() const = 0;
     /// 0 to 10.
     virtual std::int64_t weightLevel() const = 0;
     virtual std::int64_t type() const = 0;
@@ -40,9 +41,9 @@ class TGRTTagging : public Object, public QVContentTaggingIndexableTaggingData {
 
     const std::shared_ptr<TGRTTag>& tag() const { return tag_; }
     const std::shared_ptr<TGRTLevel>& level() const { return level_; }
-    std::string label() const override { return label_; }
-    std::string parentLabel() const override { return parentLabel_; }
-    std::string category() const override { return category_; }
+    const std::string& label() const override { return label_; }
+    const std::string& parentLabel() const override { return parentLabel_; }
+    const std::string& category() const override { return category_; }
     std::int64_t type() const override { return tag_->type(); }
     bool isAutoTagging() const { return isAutoTagging_; }
     void setIsAutoTagging(bool isAutoTagging) { isAutoTagging_ = isAutoTagging; }
@@ -54,6 +55,9 @@ class TGRTTagging : public Object, public QVContentTaggingIndexableTaggingData {
     /// The label, with the level in parentheses as the user's locale writes it: 1 to 4 for the four named
     /// levels, else the weight times 4 with one decimal.
     std::string displayString() const;
+
+    /// How weights are written that are none of the four named levels: one decimal. Shared by all threads.
+    static const DecimalFormatter& doubleFormatter();
 
     /// The taggings that a tagging dictionary holds. Unknown labels are added to the taxonomy, or dropped
     /// when it is read-only; entries that are not as they should be are passed over.

@@ -11,6 +11,7 @@
 
 #include <algorithm>
 #include <array>
+#include <unordered_map>
 #include <utility>
 
 #include <fmt/format.h>
@@ -129,15 +130,19 @@ std::vector<TGRTTaxonomy::TagPointer> TGRTTaxonomy::tagsFromDictionary(
     const PropertyList::Dictionary& dictionary, const TagPointer& parentTag,
     const CategoryPointer& category) {
     std::vector<std::string> labels;
-    for (const auto& entry : dictionary) labels.push_back(entry.key);
+    std::unordered_map<std::string_view, const PropertyList*> values;
+    for (const auto& [label, value] : dictionary) {
+        labels.push_back(label);
+        values.try_emplace(label, &value);
+    }
     std::vector<TagPointer> tags;
     for (const std::string& label : sortedTagLabelsFromArray(std::move(labels))) {
         tags.push_back(TGRTTag::initWithLabel(label, parentTag, category));
         const TagPointer tag = tags.back();
-        const PropertyList* value = dictionary.value(label);
+        const PropertyList& value = *values.at(label);
         std::vector<TagPointer> below;
-        if (const auto* children = value->dictionary()) below = tagsFromDictionary(*children, tag, category);
-        if (const auto* leaves = value->array()) below = tagsFromArray(*leaves, tag, category);
+        if (const auto* children = value.dictionary()) below = tagsFromDictionary(*children, tag, category);
+        if (const auto* leaves = value.array()) below = tagsFromArray(*leaves, tag, category);
         tags.insert(tags.end(), below.begin(), below.end());
     }
     return tags;
@@ -186,9 +191,11 @@ TGRTTaxonomy::TagPointer TGRTTaxonomy::findOrCreateTagWithLabel(std::string_view
                                                                 std::string_view categoryIdentifier,
                                                                 bool overwriteReadonly) {
     const auto category = findOrCreateCategoryWithIdentifier(categoryIdentifier, overwriteReadonly);
-    auto found = findTagForLabel(label, categoryIdentifier);
+    if (!category) return nullptr;
+    auto found = findInCategory(*category, TGRTCategory::LabelKey(label), std::nullopt);
     if (found || (readOnly_ && !overwriteReadonly)) return found;
-    const auto parent = parentLabel ? findTagForLabel(*parentLabel, categoryIdentifier) : nullptr;
+    const auto parent =
+        parentLabel ? findInCategory(*category, TGRTCategory::LabelKey(*parentLabel), std::nullopt) : nullptr;
     return TGRTTag::initWithLabel(label, parent, category);
 }
 
@@ -198,9 +205,16 @@ TGRTTaxonomy::TagPointer TGRTTaxonomy::findOrCreateSoundPackTagWithIdentifier(st
 }
 
 TGRTTaxonomy::CategoryPointer TGRTTaxonomy::findCategoryWithIdentifier(std::string_view identifier) const {
-    const auto hit = std::find_if(categories_.begin(), categories_.end(), [identifier](const auto& category) {
-        return category->identifier() == identifier;
-    });
+    const auto hasIdentifier = [identifier](const TGRTCategory& category) {
+        return category.identifier() == identifier;
+    };
+    if (!TGRTCategory::anyWasRenamed()) {
+        TGRTCategory* category = categories_.findWithHash(stringHash(identifier), hasIdentifier);
+        return category == nullptr ? nullptr : category->shared_from_this();
+    }
+    const auto hit =
+        std::find_if(categories_.begin(), categories_.end(),
+                     [&hasIdentifier](const auto& category) { return hasIdentifier(*category); });
     return hit == categories_.end() ? nullptr : *hit;
 }
 

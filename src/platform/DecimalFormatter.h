@@ -1,0 +1,26 @@
+#pragma once
+
+#include <memory>
+#include <string>
+
+namespace qvct {
+
+/// Writes numbers as the user's locale does, with a fixed number of decimals and without grouping.
+///
+/// The locale is that of the moment of creation. Making one takes some microseconds, using it is cheap and
+/// safe from every thread.
+class DecimalFormatter {
+  public:
+    explicit DecimalFormatter(int fractionDigits);
+    DecimalFormatter(DecimalFormatter&&) noexcept;
+    DecimalFormatter& operator=(DecimalFormatter&&) noexcept;
+    ~DecimalFormatter();
+
+    std::string stringFromNumber(double number) const;
+
+  private:
+    struct Implementation;
+    std::unique_ptr<Implementation> implementation_;
+};
+
+}  // namespace qvct
