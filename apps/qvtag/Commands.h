@@ -12,5 +12,7 @@ namespace qvct::tool {
 void addAutotagCommand(CLI::App& app, ToolContext& context);
 void addKeywordsCommand(CLI::App& app, ToolContext& context);
 void addTaxonomyCommand(CLI::App& app, ToolContext& context);
+/// Below the taxonomy command: what has become of retired vocabularies.
+void addLegacyTaxonomyCommands(CLI::App& taxonomy, ToolContext& context);
 
 }  // namespace qvct::tool

@@ -73,6 +73,12 @@ std::string textOfTagging(const TGRTTagging& tagging) {
     return fmt::format("{} {}%", tagging.label(), std::lround(tagging.level()->weight() * 100));
 }
 
+std::string pathOfTag(const TGRTTag& tag) {
+    std::string path = tag.label();
+    for (const auto& ancestor : tag.ancestors()) path = ancestor->label() + " > " + path;
+    return tag.categoryIdentifier() + " > " + path;
+}
+
 std::string padded(std::string_view text, std::size_t columns) {
     const std::size_t width = displayWidth(text);
     return std::string(text) + std::string(columns > width ? columns - width : 0, ' ');

@@ -40,6 +40,9 @@ std::vector<std::shared_ptr<TGRTTagging>> sortedTaggings(const ObjectSet<TGRTTag
 /// "House", or "Cold / Warm 100%" with a level.
 std::string textOfTagging(const TGRTTagging& tagging);
 
+/// "Genres > Electronic Music > House"
+std::string pathOfTag(const TGRTTag& tag);
+
 /// Pads with blanks to that many columns of a terminal.
 std::string padded(std::string_view text, std::size_t columns);
 /// Joins words with two blanks, breaking lines before `width` columns; further lines are indented. No breaks

@@ -56,13 +56,6 @@ Json jsonOfTag(const TGRTTag& tag) {
     return json;
 }
 
-/// "Genres > Electronic Music > House"
-std::string pathOf(const TGRTTag& tag) {
-    std::string path = tag.label();
-    for (const auto& ancestor : tag.ancestors()) path = ancestor->label() + " > " + path;
-    return tag.categoryIdentifier() + " > " + path;
-}
-
 void printTree(const TGRTTag& tag, const Terminal& terminal, std::size_t depth) {
     std::string remark = tag.valueType() == kTagValuePlain ? "" : std::string(kindOf(tag));
     if (!tag.valueStepLabels().empty()) remark += ": " + join(tag.valueStepLabels(), ", ");
@@ -128,7 +121,7 @@ void find(const Options& options, ToolContext& context) {
                                               similar.empty() ? "" : "; there are: " + join(similar, ", ")));
     }
     if (context.format != Format::table) return printJson(jsonOfTag(*tag), context.format);
-    fmt::print("{}\n", colored(context.terminal(), Color::faint, pathOf(*tag)));
+    fmt::print("{}\n", colored(context.terminal(), Color::faint, pathOfTag(*tag)));
     printTree(*tag, context.terminal(), 0);
 }
 
@@ -137,7 +130,7 @@ void search(const Options& options, ToolContext& context) {
     if (context.format != Format::table) {
         return printJson(Json(searching->findTagLabelsForString(options.text, false)), context.format);
     }
-    for (const auto& tag : searching->findTagsForString(options.text)) fmt::print("{}\n", pathOf(*tag));
+    for (const auto& tag : searching->findTagsForString(options.text)) fmt::print("{}\n", pathOfTag(*tag));
 }
 
 void exportTaxonomy(const Options& options, ToolContext& /*context*/) {
@@ -192,6 +185,8 @@ void addTaxonomyCommand(CLI::App& app, ToolContext& context) {
         ->check(CLI::IsMember({"plist", "strings", "mapping"}));
     exporting->footer("Example:\n  qvtag taxonomy export strings > Tags.strings");
     callback(exporting, options, context, exportTaxonomy);
+
+    addLegacyTaxonomyCommands(*taxonomy, context);
 }
 
 }  // namespace qvct::tool
