@@ -165,6 +165,59 @@ TEST(Taxonomy, AnExportedOneServesAsTheTaxonomyAgain) {
     EXPECT_EQ(environment.status, 1);
 }
 
+TEST(LegacyTaxonomy, ShowsWhatAKeywordHasBecome) {
+    const json dark = runTool({"taxonomy", "map", "Dark", "--json"}).json();
+    ASSERT_EQ(dark.size(), 2U);
+    EXPECT_EQ(dark[0]["vocabulary"], "loop");
+    EXPECT_EQ(dark[0]["category"], "LoopDescriptors");
+    EXPECT_EQ(dark[0]["parent"], nullptr);
+    EXPECT_EQ(dark[0]["taggings"][0]["label"], "Bright / Dark");
+    EXPECT_EQ(dark[0]["taggings"][0]["weightLevel"], 8);
+    EXPECT_EQ(dark[1]["category"], "VorthalTimbre");
+    const json synth = runTool({"taxonomy", "map", "Bass", "--vocabulary", "synth", "--json"}).json();
+    std::set<json> parents;
+    for (const json& item : synth) {
+        EXPECT_EQ(item["vocabulary"], "synth");
+        parents.insert(item["parent"]);
+    }
+    EXPECT_EQ(parents, (std::set<json>{nullptr, "Arpeggiated", "Rhythmic"}));
+    const ToolResult table = runTool({"taxonomy", "map", "Arrhythmic"});
+    EXPECT_EQ(table.output, "loop   LoopDescriptors > Arrhythmic  (nothing)\n");
+    const ToolResult lost = runTool({"taxonomy", "map", "dark"});
+    EXPECT_EQ(lost.status, 1);
+    EXPECT_THAT(lost.errors, HasSubstr("no retired keyword \"dark\"; there are: Dark"));
+    EXPECT_EQ(runTool({"taxonomy", "map", "Dark", "--vocabulary", "tape"}).status, 2);
+}
+
+TEST(LegacyTaxonomy, ShowsWhatTheTablesLeaveOut) {
+    const json builtIn = runTool({"taxonomy", "coverage", "--json"}).json();
+    ASSERT_EQ(builtIn.size(), 2U);
+    EXPECT_EQ(builtIn[0]["tags"], 138);
+    EXPECT_EQ(builtIn[1]["tags"], 175);
+    const json arrhythmic = {{"label", "Arrhythmic"}, {"parent", nullptr}, {"category", "LoopDescriptors"}};
+    EXPECT_THAT(builtIn[0]["withEmptyRow"], testing::Contains(arrhythmic));
+    for (const json& vocabulary : builtIn) {
+        EXPECT_THAT(vocabulary["withoutRow"], IsEmpty());
+        EXPECT_THAT(vocabulary["unknownLabels"], IsEmpty());
+        EXPECT_THAT(vocabulary["unknownKeywords"], IsEmpty());
+    }
+
+    const TemporaryFolder folder;
+    std::string table = runTool({"taxonomy", "export", "mapping"}).output;
+    table.resize(table.find('\n') + 1);
+    folder.write("LegacyLoopTaxonomyMapping.csv", table + "LoopDescriptors;Dark;;Darkish (0.5);Happy;;;\n" +
+                                                      "LoopDescriptors;Nonsense;;;;;;\n");
+    folder.write("LegacyVorthalTaxonomyMapping.csv", "no table");
+    const ToolResult own = runTool({"--resources", folder.path(), "taxonomy", "coverage", "--json"});
+    EXPECT_EQ(own.status, 1);
+    EXPECT_THAT(own.errors, HasSubstr("LegacyVorthalTaxonomyMapping.csv: not a mapping table"));
+    ASSERT_EQ(own.json().size(), 1U);
+    EXPECT_EQ(own.json()[0]["withoutRow"].size(), 137U);
+    EXPECT_THAT(own.json()[0]["unknownLabels"], ElementsAre("Darkish"));
+    EXPECT_THAT(own.json()[0]["unknownKeywords"], ElementsAre("LoopDescriptors;Nonsense;"));
+    EXPECT_THAT(runTool({"taxonomy", "coverage"}).output, HasSubstr("loop  "));
+}
+
 TEST(Usage, WrongWordsEndWithTwo) {
     for (const std::vector<std::string>& arguments : {std::vector<std::string>{},
                                                       {"nonsense"},
