@@ -151,17 +151,16 @@ struct ScriptContext::Implementation {
         return stop == Stop::none;
     }
 
-    /// Asked by the machine once a slice is over. Must ask for the next slice itself.
+    /// Asked by the machine once a slice is over. Must ask for the next slice itself, even when it says stop:
+    /// calls into the machine from our own functions may swallow the stopping.
     static bool shouldTerminate(JSContextRef context, void* self) {
         auto& implementation = *static_cast<Implementation*>(self);
         if (Clock::now() >= implementation.deadline) {
             implementation.stop = Stop::time;
         } else if (memoryInUse(context) > static_cast<double>(implementation.limits.memory)) {
             implementation.stop = Stop::memory;
-        } else {
-            JSContextGroupSetExecutionTimeLimit(implementation.group->reference(), kSlice, shouldTerminate,
-                                                self);
         }
+        JSContextGroupSetExecutionTimeLimit(implementation.group->reference(), kSlice, shouldTerminate, self);
         return implementation.stop != Stop::none;
     }
 
@@ -239,8 +238,7 @@ JSValueRef ScriptContext::Implementation::guardExpression(JSContextRef context, 
     if (!isRegularExpressionBounded(viewOf(pattern.get()), viewOf(flags.get()), viewOf(text.get()), start,
                                     of(context).deadline)) {
         const std::string reason = fmt::format("regular expression takes too long: /{}/", textOf(pattern.get()));
-        const JSValueRef message = JSValueMakeString(context, scriptString(reason).get());
-        *exception = JSObjectMakeError(context, 1, &message, nullptr);
+        *exception = JSValueMakeString(context, scriptString(reason).get());
     }
     return JSValueMakeUndefined(context);
 }
