@@ -7,7 +7,6 @@
 
 #include <mutex>
 #include <string>
-#include <unordered_map>
 
 namespace qvct {
 namespace {
@@ -23,7 +22,8 @@ std::string scriptResource(const std::string& name) {
     if (const auto path = ResourceBundle::pathForResource(name, "js")) {
         if (auto text = readTextFile(*path)) return *std::move(text);
     }
-    return QVCTCompiledResources::QVSearchKitJS().value_or("");
+    static const std::string library = QVCTCompiledResources::QVSearchKitJS().value_or("");
+    return library;
 }
 
 }  // namespace

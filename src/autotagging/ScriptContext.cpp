@@ -28,21 +28,18 @@ using Clock = std::chrono::steady_clock;
 constexpr double kSlice = 0.01;
 constexpr std::size_t kLongestMessage = 4096;
 
-/// Gives rules their way of logging, and puts every use of a regular expression under the guard: all methods
-/// of texts and expressions go through `exec`.
+/// Gives rules their way of logging, and puts every use of a regular expression under the guard (`this`): all
+/// methods of texts and expressions go through `exec`.
 constexpr std::string_view kPrelude = R"js(
 console.log = __log;
 (function (guard) {
-    "use strict";
-    const prototype = RegExp.prototype, exec = prototype.exec, apply = Reflect.apply, text = String;
-    const source = Object.getOwnPropertyDescriptor(prototype, "source").get;
-    const flags = Object.getOwnPropertyDescriptor(prototype, "flags").get;
-    prototype.exec = function (string) {
-        string = text(string);
-        guard(apply(source, this, []), apply(flags, this, []), string, this.lastIndex);
-        return apply(exec, this, [string]);
+    const exec = RegExp.prototype.exec;
+    RegExp.prototype.exec = function (string) {
+        string = String(string);
+        guard(this.source, this.flags, string, this.lastIndex);
+        return exec.call(this, string);
     };
-}))js";
+})(this);)js";
 
 /// The virtual machine of a thread, which its contexts share.
 class ContextGroup {
@@ -100,11 +97,13 @@ struct ScriptContext::Implementation {
 
     explicit Implementation(const ScriptLimits& chosen) : limits(chosen) {
         JSObjectSetPrivate(JSContextGetGlobalObject(context), this);
+        JSContextGroupSetExecutionTimeLimit(group->reference(), kSlice, shouldTerminate, this);
     }
     Implementation(const Implementation&) = delete;
     Implementation& operator=(const Implementation&) = delete;
 
     ~Implementation() {
+        JSContextGroupClearExecutionTimeLimit(group->reference());
         JSObjectSetPrivate(JSContextGetGlobalObject(context), nullptr);
         JSGlobalContextRelease(context);
         // A machine that was stopped may hold much memory: the thread's next context begins with a new one.
@@ -143,9 +142,7 @@ struct ScriptContext::Implementation {
         if (Clock::now() >= deadline) {
             stop = Stop::time;
         } else {
-            JSContextGroupSetExecutionTimeLimit(group->reference(), kSlice, shouldTerminate, this);
             work();
-            JSContextGroupClearExecutionTimeLimit(group->reference());
         }
         if (stop != Stop::none) logStop();
         return stop == Stop::none;
@@ -274,10 +271,10 @@ std::shared_ptr<ScriptContext> ScriptContext::make(const ScriptLimits& limits) {
     JSGlobalContextRef context = implementation->context;
     const JSObjectRef log = JSObjectMakeFunctionWithCallback(context, nullptr, Implementation::logMessage);
     setProperty(context, implementation->global(), "__log", log);
-    const JSValueRef install = JSEvaluateScript(context, scriptString(kPrelude).get(), nullptr, nullptr, 1, nullptr);
-    const JSValueRef guard =
+    const JSObjectRef guard =
         JSObjectMakeFunctionWithCallback(context, nullptr, Implementation::guardExpression);
-    JSObjectCallAsFunction(context, JSValueToObject(context, install, nullptr), nullptr, 1, &guard, nullptr);
+    static const ScriptString prelude = scriptString(kPrelude);
+    JSEvaluateScript(context, prelude.get(), guard, nullptr, 1, nullptr);
     return std::shared_ptr<ScriptContext>(new ScriptContext(std::move(implementation)));
 }
 
