@@ -26,29 +26,42 @@ bool isNamed(const xmlChar* name, const xmlNs* nameSpace, const std::string& wan
 
 const xmlAttr* attributeNamed(const xmlNode& element, const std::string& name) {
     const xmlAttr* attribute = element.properties;
-    while (attribute != nullptr && !isNamed(attribute->name, attribute->ns, name)) attribute = attribute->next;
+    while (attribute != nullptr && !isNamed(attribute->name, attribute->ns, name))
+        attribute = attribute->next;
     return attribute;
 }
 
 bool holdsNumber(Relation relation, double value, double constant) {
     switch (relation) {
-        case Relation::equal: return value == constant;
-        case Relation::notEqual: return value != constant;
-        case Relation::less: return value < constant;
-        case Relation::lessOrEqual: return value <= constant;
-        case Relation::greater: return value > constant;
-        case Relation::greaterOrEqual: return value >= constant;
-        default: return false;
+        case Relation::equal:
+            return value == constant;
+        case Relation::notEqual:
+            return value != constant;
+        case Relation::less:
+            return value < constant;
+        case Relation::lessOrEqual:
+            return value <= constant;
+        case Relation::greater:
+            return value > constant;
+        case Relation::greaterOrEqual:
+            return value >= constant;
+        default:
+            return false;
     }
 }
 
 bool holdsText(Relation relation, std::string_view value, std::string_view constant) {
     switch (relation) {
-        case Relation::equal: return value == constant;
-        case Relation::notEqual: return value != constant;
-        case Relation::contains: return value.find(constant) != std::string_view::npos;
-        case Relation::startsWith: return value.starts_with(constant);
-        default: return false;
+        case Relation::equal:
+            return value == constant;
+        case Relation::notEqual:
+            return value != constant;
+        case Relation::contains:
+            return value.find(constant) != std::string_view::npos;
+        case Relation::startsWith:
+            return value.starts_with(constant);
+        default:
+            return false;
     }
 }
 
@@ -228,8 +241,7 @@ class LocationPathParser {
         Condition junction;
         junction.kind = isConjunction ? Condition::Kind::conjunction : Condition::Kind::disjunction;
         do {
-            std::optional<Condition> operand =
-                isConjunction ? takeOperand(depth) : takeJunction(depth, true);
+            std::optional<Condition> operand = isConjunction ? takeOperand(depth) : takeJunction(depth, true);
             if (!operand) return std::nullopt;
             junction.operands.push_back(std::move(*operand));
         } while (takeWord(isConjunction ? "and" : "or"));
@@ -252,8 +264,8 @@ class LocationPathParser {
             return inner && take(")") ? std::move(inner) : std::nullopt;
         }
         Condition condition;
-        const bool taken = take("@") ? takeOperator(condition.comparison)
-                                     : takeFunction(condition.comparison);
+        const bool taken =
+            take("@") ? takeOperator(condition.comparison) : takeFunction(condition.comparison);
         return taken ? std::optional(std::move(condition)) : std::nullopt;
     }
 
@@ -278,8 +290,8 @@ class LocationPathParser {
     bool takeOperator(Comparison& comparison) {
         if (!takeAttribute(comparison)) return false;
         static constexpr std::pair<std::string_view, Relation> operators[] = {
-            {"=", Relation::equal},         {"!=", Relation::notEqual},       {"<=", Relation::lessOrEqual},
-            {"<", Relation::less},          {">=", Relation::greaterOrEqual}, {">", Relation::greater}};
+            {"=", Relation::equal}, {"!=", Relation::notEqual},       {"<=", Relation::lessOrEqual},
+            {"<", Relation::less},  {">=", Relation::greaterOrEqual}, {">", Relation::greater}};
         for (const auto& [token, relation] : operators) {
             if (!take(token)) continue;
             comparison.relation = relation;

@@ -1,11 +1,11 @@
 #include "autotagging/QVCTSoftwareInstrumentTaggingService.h"
 
-#include <utility>
-
 #include "autotagging/QVCTJavaScriptUtilities.h"
 #include "platform/FileAccess.h"
 #include "platform/ResourceBundle.h"
 #include "resources/QVCTCompiledResources.h"
+
+#include <utility>
 
 namespace qvct {
 namespace {

@@ -1,9 +1,9 @@
 #pragma once
 
+#include "autotagging/QVCTAutoTaggingService.h"
+
 #include <memory>
 #include <string>
-
-#include "autotagging/QVCTAutoTaggingService.h"
 
 namespace qvct {
 
@@ -15,7 +15,8 @@ class QVCTSoftwareInstrumentTaggingService : public QVCTAutoTaggingService {
   public:
     static std::shared_ptr<QVCTSoftwareInstrumentTaggingService> init();
 
-    TagDictionarySet tagsWithContentsOfURL(const URL& url, const std::shared_ptr<QVCTXMLDocument>& xmlDocument,
+    TagDictionarySet tagsWithContentsOfURL(const URL& url,
+                                           const std::shared_ptr<QVCTXMLDocument>& xmlDocument,
                                            const std::shared_ptr<TGRTMetaData>& metaData,
                                            const std::shared_ptr<LCFileData>& fileData,
                                            std::uint64_t options) override;

@@ -18,8 +18,8 @@ class QVCTXMLDocumentExport {
   public:
     virtual ~QVCTXMLDocumentExport() = default;
 
-    /// Whether the expression selects at least one node. A wrong expression, or one whose value is a number, a
-    /// text or a boolean, selects none.
+    /// Whether the expression selects at least one node. A wrong expression, or one whose value is a number,
+    /// a text or a boolean, selects none.
     virtual bool isMatchingXPath(std::string_view expression) const = 0;
     /// The first selected node as JSON (see `QVCTXMLParser` for its shape), or nothing.
     virtual std::optional<std::string> JSONStringForXPath(std::string_view expression) const = 0;

@@ -25,8 +25,8 @@ namespace qvct {
 /// Names are taken as written, prefixes and namespace declarations included. A parser is for one parse.
 class QVCTXMLParser {
   public:
-    /// The container, or nothing when the text is not well-formed XML. Entities are replaced within the bounds
-    /// of the XML library (declared ones only, none from outside), elements nest at most 256 deep.
+    /// The container, or nothing when the text is not well-formed XML. Entities are replaced within the
+    /// bounds of the XML library (declared ones only, none from outside), elements nest at most 256 deep.
     static std::optional<PropertyList::Dictionary> dictionaryForXMLData(std::string_view data);
 
     QVCTXMLParser();

@@ -1,11 +1,5 @@
 #include "autotagging/QVCTXMLRulesTaggingService.h"
 
-#include <cstdlib>
-#include <string_view>
-#include <utility>
-
-#include <fmt/format.h>
-
 #include "autotagging/QVCTJavaScriptUtilities.h"
 #include "autotagging/QVCTXMLDocument.h"
 #include "autotagging/XPathExpression.h"
@@ -16,6 +10,12 @@
 #include "platform/ResourceBundle.h"
 #include "platform/Text.h"
 #include "resources/QVCTCompiledResources.h"
+
+#include <cstdlib>
+#include <string_view>
+#include <utility>
+
+#include <fmt/format.h>
 
 namespace qvct {
 namespace {

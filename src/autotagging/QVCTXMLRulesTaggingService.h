@@ -1,13 +1,13 @@
 #pragma once
 
+#include "autotagging/QVCTAutoTaggingService.h"
+#include "platform/PropertyList.h"
+
 #include <chrono>
 #include <memory>
 #include <optional>
 #include <string>
 #include <vector>
-
-#include "autotagging/QVCTAutoTaggingService.h"
-#include "platform/PropertyList.h"
 
 namespace qvct {
 
@@ -47,7 +47,8 @@ class QVCTXMLRulesTaggingService : public QVCTAutoTaggingService {
 
     /// The tags of all rules in their order. Only the XML document is looked at.
     /// @cost  Default rules: about half a millisecond for an ordinary patch, mostly for the five scripts.
-    TagDictionarySet tagsWithContentsOfURL(const URL& url, const std::shared_ptr<QVCTXMLDocument>& xmlDocument,
+    TagDictionarySet tagsWithContentsOfURL(const URL& url,
+                                           const std::shared_ptr<QVCTXMLDocument>& xmlDocument,
                                            const std::shared_ptr<TGRTMetaData>& metaData,
                                            const std::shared_ptr<LCFileData>& fileData,
                                            std::uint64_t options) override;

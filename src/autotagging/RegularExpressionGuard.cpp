@@ -21,7 +21,7 @@ struct Closer {
 
 /// How the text's length enters into the worst number of steps.
 struct Choices {
-    int count = 0;          // of quantifiers and alternatives
+    int count = 0;           // of quantifiers and alternatives
     bool areNested = false;  // a quantifier applies to a group
 };
 
@@ -112,15 +112,32 @@ class Translation {
         if (rest_.empty()) return;
         const char16_t c = take();
         switch (c) {
-            case u'd': out_ += u"[0-9]"; break;
-            case u'D': out_ += u"[^0-9]"; break;
-            case u'w': out_ += u"[A-Za-z0-9_]"; break;
-            case u'W': out_ += u"[^A-Za-z0-9_]"; break;
-            case u'v': out_ += u"\\x0B"; break;
-            case u'0': out_ += u"\\x00"; break;
-            case u'b': out_ += isInClass_ ? u"\\x08" : u"\\b"; break;
-            case u'u': out_ += take(u"{") ? u"\\x{" : u"\\u"; break;
-            default: out_ += {u'\\', c};
+            case u'd':
+                out_ += u"[0-9]";
+                break;
+            case u'D':
+                out_ += u"[^0-9]";
+                break;
+            case u'w':
+                out_ += u"[A-Za-z0-9_]";
+                break;
+            case u'W':
+                out_ += u"[^A-Za-z0-9_]";
+                break;
+            case u'v':
+                out_ += u"\\x0B";
+                break;
+            case u'0':
+                out_ += u"\\x00";
+                break;
+            case u'b':
+                out_ += isInClass_ ? u"\\x08" : u"\\b";
+                break;
+            case u'u':
+                out_ += take(u"{") ? u"\\x{" : u"\\u";
+                break;
+            default:
+                out_ += {u'\\', c};
         }
     }
 

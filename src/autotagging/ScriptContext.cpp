@@ -234,7 +234,8 @@ JSValueRef ScriptContext::Implementation::guardExpression(JSContextRef context, 
     const std::size_t start = isSticky && last > 0 && last < 1e9 ? static_cast<std::size_t>(last) : 0;
     if (!isRegularExpressionBounded(viewOf(pattern.get()), viewOf(flags.get()), viewOf(text.get()), start,
                                     of(context).deadline)) {
-        const std::string reason = fmt::format("regular expression takes too long: /{}/", textOf(pattern.get()));
+        const std::string reason =
+            fmt::format("regular expression takes too long: /{}/", textOf(pattern.get()));
         *exception = JSValueMakeString(context, scriptString(reason).get());
     }
     return JSValueMakeUndefined(context);
@@ -307,10 +308,10 @@ std::optional<PropertyList::Array> ScriptContext::callForArray(std::string_view 
                                      !JSObjectIsFunction(self.context, const_cast<JSObjectRef>(callee)))) {
             return Implementation::logProblem(fmt::format("TypeError: {} is not a function", function));
         }
-        const JSValueRef value =
-            exception != nullptr ? nullptr
-                                 : JSObjectCallAsFunction(self.context, const_cast<JSObjectRef>(callee), nullptr,
-                                                          0, nullptr, &exception);
+        const JSValueRef value = exception != nullptr
+                                     ? nullptr
+                                     : JSObjectCallAsFunction(self.context, const_cast<JSObjectRef>(callee),
+                                                              nullptr, 0, nullptr, &exception);
         if (value == nullptr || exception != nullptr) return self.logException(exception);
         if (JSValueIsUndefined(self.context, value) || JSValueIsNull(self.context, value)) return;
         std::string problem;

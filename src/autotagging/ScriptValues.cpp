@@ -35,11 +35,16 @@ class Converter {
     /// Nothing for what a property list has no form for, or after a failure.
     std::optional<PropertyList> value(JSValueRef value, int depth) {
         switch (JSValueGetType(context_, value)) {
-            case kJSTypeBoolean: return PropertyList(JSValueToBoolean(context_, value));
-            case kJSTypeNumber: return PropertyList(JSValueToNumber(context_, value, nullptr));
-            case kJSTypeString: return text(value);
-            case kJSTypeObject: return object(value, depth);
-            default: return std::nullopt;
+            case kJSTypeBoolean:
+                return PropertyList(JSValueToBoolean(context_, value));
+            case kJSTypeNumber:
+                return PropertyList(JSValueToNumber(context_, value, nullptr));
+            case kJSTypeString:
+                return text(value);
+            case kJSTypeObject:
+                return object(value, depth);
+            default:
+                return std::nullopt;
         }
     }
 
@@ -107,7 +112,8 @@ class Converter {
     }
 
     bool takes(double values) {
-        if (!(values <= static_cast<double>(valuesLeft_))) return fail("RangeError: the result has too many values");
+        if (!(values <= static_cast<double>(valuesLeft_)))
+            return fail("RangeError: the result has too many values");
         valuesLeft_ -= static_cast<std::size_t>(values);
         return true;
     }
@@ -129,11 +135,16 @@ class Converter {
 
 std::string_view nameOf(JSType type) {
     switch (type) {
-        case kJSTypeBoolean: return "a boolean";
-        case kJSTypeNumber: return "a number";
-        case kJSTypeString: return "a string";
-        case kJSTypeObject: return "an object";
-        default: return "a symbol";
+        case kJSTypeBoolean:
+            return "a boolean";
+        case kJSTypeNumber:
+            return "a number";
+        case kJSTypeString:
+            return "a string";
+        case kJSTypeObject:
+            return "an object";
+        default:
+            return "a symbol";
     }
 }
 
@@ -146,8 +157,8 @@ ScriptString scriptString(std::string_view text) {
 }
 
 std::string textOf(JSStringRef string) {
-    return utf8FromUtf16({reinterpret_cast<const char16_t*>(JSStringGetCharactersPtr(string)),
-                          JSStringGetLength(string)});
+    return utf8FromUtf16(
+        {reinterpret_cast<const char16_t*>(JSStringGetCharactersPtr(string)), JSStringGetLength(string)});
 }
 
 std::string textOf(JSContextRef context, JSValueRef value, JSValueRef* exception) {
@@ -157,7 +168,8 @@ std::string textOf(JSContextRef context, JSValueRef value, JSValueRef* exception
 
 std::optional<PropertyList::Array> arrayOf(JSContextRef context, JSValueRef value, std::string& problem) {
     if (!JSValueIsArray(context, value)) {
-        problem = fmt::format("TypeError: not an array of tags but {}", nameOf(JSValueGetType(context, value)));
+        problem =
+            fmt::format("TypeError: not an array of tags but {}", nameOf(JSValueGetType(context, value)));
         return std::nullopt;
     }
     return Converter(context, problem).array(JSValueToObject(context, value, nullptr), 0);

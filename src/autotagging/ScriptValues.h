@@ -2,11 +2,11 @@
 
 #include "platform/PropertyList.h"
 
+#include <memory>
 #include <optional>
 #include <string>
 #include <string_view>
 #include <type_traits>
-#include <memory>
 
 #include <JavaScriptCore/JavaScript.h>
 

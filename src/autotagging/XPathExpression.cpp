@@ -18,23 +18,40 @@ constexpr std::size_t kMostCachedExpressions = 1024;
 
 std::string_view reasonOf(int code) {
     switch (code) {
-        case XML_XPATH_NUMBER_ERROR: return "malformed number";
-        case XML_XPATH_UNFINISHED_LITERAL_ERROR: return "unfinished text";
-        case XML_XPATH_START_LITERAL_ERROR: return "a text must begin here";
-        case XML_XPATH_VARIABLE_REF_ERROR: return "malformed variable";
-        case XML_XPATH_UNDEF_VARIABLE_ERROR: return "undefined variable";
-        case XML_XPATH_INVALID_PREDICATE_ERROR: return "malformed predicate";
-        case XML_XPATH_EXPR_ERROR: return "malformed expression";
-        case XML_XPATH_UNCLOSED_ERROR: return "unclosed bracket";
-        case XML_XPATH_UNKNOWN_FUNC_ERROR: return "unknown function";
-        case XML_XPATH_INVALID_OPERAND: return "operand of the wrong type";
-        case XML_XPATH_INVALID_TYPE: return "value of the wrong type";
-        case XML_XPATH_INVALID_ARITY: return "wrong number of arguments";
-        case XML_XPATH_UNDEF_PREFIX_ERROR: return "undefined prefix";
-        case XML_XPATH_ENCODING_ERROR: return "not UTF-8";
-        case XML_XPATH_INVALID_CHAR_ERROR: return "character that XML does not allow";
-        case XML_XPATH_MEMORY_ERROR: return "out of memory";
-        default: return "cannot be evaluated, or only with too much nesting or work";
+        case XML_XPATH_NUMBER_ERROR:
+            return "malformed number";
+        case XML_XPATH_UNFINISHED_LITERAL_ERROR:
+            return "unfinished text";
+        case XML_XPATH_START_LITERAL_ERROR:
+            return "a text must begin here";
+        case XML_XPATH_VARIABLE_REF_ERROR:
+            return "malformed variable";
+        case XML_XPATH_UNDEF_VARIABLE_ERROR:
+            return "undefined variable";
+        case XML_XPATH_INVALID_PREDICATE_ERROR:
+            return "malformed predicate";
+        case XML_XPATH_EXPR_ERROR:
+            return "malformed expression";
+        case XML_XPATH_UNCLOSED_ERROR:
+            return "unclosed bracket";
+        case XML_XPATH_UNKNOWN_FUNC_ERROR:
+            return "unknown function";
+        case XML_XPATH_INVALID_OPERAND:
+            return "operand of the wrong type";
+        case XML_XPATH_INVALID_TYPE:
+            return "value of the wrong type";
+        case XML_XPATH_INVALID_ARITY:
+            return "wrong number of arguments";
+        case XML_XPATH_UNDEF_PREFIX_ERROR:
+            return "undefined prefix";
+        case XML_XPATH_ENCODING_ERROR:
+            return "not UTF-8";
+        case XML_XPATH_INVALID_CHAR_ERROR:
+            return "character that XML does not allow";
+        case XML_XPATH_MEMORY_ERROR:
+            return "out of memory";
+        default:
+            return "cannot be evaluated, or only with too much nesting or work";
     }
 }
 
@@ -80,7 +97,8 @@ void XPathExpression::Closer::operator()(xmlXPathCompExpr* expression) const {
 
 std::shared_ptr<const XPathExpression> XPathExpression::compile(std::string_view text, Error* error) {
     if (text.empty() || text.size() > kLongestXPath || text.find('\0') != std::string_view::npos) {
-        fail(error, kErrorMalformed, fmt::format("XPath of {} bytes: empty, too long or binary", text.size()));
+        fail(error, kErrorMalformed,
+             fmt::format("XPath of {} bytes: empty, too long or binary", text.size()));
         return nullptr;
     }
     const XPathContext context(xmlXPathNewContext(nullptr));

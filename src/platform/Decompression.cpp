@@ -25,8 +25,7 @@ class BoundedOutput {
 
     bool append(Bytes piece, Error* error) {
         if (piece.size() > limit_ - bytes_.size()) {
-            return fail(error, kErrorTooLarge,
-                        fmt::format("compressed data grows beyond {} bytes", limit_));
+            return fail(error, kErrorTooLarge, fmt::format("compressed data grows beyond {} bytes", limit_));
         }
         bytes_.insert(bytes_.end(), piece.begin(), piece.end());
         return true;
