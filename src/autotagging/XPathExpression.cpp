@@ -146,7 +146,9 @@ std::vector<xmlNode*> XPathExpression::nodes(xmlXPathContext& context) const {
 }
 
 xmlNode* XPathExpression::firstNode(xmlXPathContext& context) const {
-    if (locationPath_) return locationPath_->firstNode(context.doc);
+    // The library compares texts that hold entity references in a way of its own.
+    const bool mayHoldReferences = context.doc->intSubset != nullptr;
+    if (locationPath_ && !mayHoldReferences) return locationPath_->firstNode(context.doc);
     const std::vector<xmlNode*> all = nodes(context);
     return all.empty() ? nullptr : all.front();
 }

@@ -42,7 +42,7 @@ class XPathExpression {
     /// The first of `nodes`, or null. Common forms stop there (`LocationPath`), others select all.
     _xmlNode* firstNode(_xmlXPathContext& context) const;
 
-    /// Whether `firstNode` walks the tree itself.
+    /// Whether `firstNode` walks the tree itself (in documents without entity declarations).
     bool isLocationPath() const { return locationPath_.has_value(); }
 
   private:
