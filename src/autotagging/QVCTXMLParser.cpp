@@ -15,6 +15,8 @@ namespace {
 
 /// Elements with fewer members are searched faster than looked up.
 constexpr std::size_t kIndexedMembers = 16;
+/// An ordinary element's.
+constexpr std::size_t kUsualMembers = 4;
 
 std::string_view viewOf(const xmlChar* text) {
     return text == nullptr ? std::string_view{} : reinterpret_cast<const char*>(text);
@@ -26,6 +28,7 @@ QVCTXMLParser& parserOf(void* context) {
 
 void startElement(void* context, const xmlChar* name, const xmlChar** attributes) {
     QVCTXMLParser::Attributes members;
+    members.reserve(kUsualMembers);
     for (; attributes != nullptr && *attributes != nullptr; attributes += 2) {
         members.emplace_back(viewOf(attributes[0]), viewOf(attributes[1]));
     }

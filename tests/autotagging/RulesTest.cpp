@@ -152,12 +152,12 @@ TEST(DefaultRules, EachScriptMatchesItsDocumentAndNotTheOneBesideIt) {
 
 TEST(DefaultRules, MaintenanceTagsEveryDocumentAndNoneElse) {
     const auto service = QVCTXMLRulesTaggingService::init();
-    EXPECT_EQ(tagsOfRule(*service, 21, "<Other/>"), R"([{"label":"Progress","level":0.0}])");
+    EXPECT_EQ(tagsOfRule(*service, 21, "<Other/>"), R"([{"label":"Progress","level":0}])");
     const URL url = URL::fileURLWithPath("/a.patch");
     const auto xml = document(patch("<Channel mode='Mono'/>"));
     const auto tags =
         service->tagsWithContentsOfURL(url, xml, nullptr, nullptr, QVCTAutoTaggingOptionXMLRules);
-    EXPECT_EQ(json({tags.begin(), tags.end()}), R"([{"label":"Mono"},{"label":"Progress","level":0.0}])");
+    EXPECT_EQ(json({tags.begin(), tags.end()}), R"([{"label":"Mono"},{"label":"Progress","level":0}])");
     EXPECT_TRUE(service->tagsWithContentsOfURL(url, xml, nullptr, nullptr, ~0x40ULL).empty());
     EXPECT_TRUE(service->tagsWithContentsOfURL(url, nullptr, nullptr, nullptr, ~0ULL).empty());
 }
