@@ -10,6 +10,8 @@ extern const unsigned char DefaultRules_plist[];
 extern const std::uint32_t DefaultRules_plist_len;
 extern const unsigned char DefaultTaxonomy_plist[];
 extern const std::uint32_t DefaultTaxonomy_plist_len;
+extern const unsigned char ExtractSoftwareInstrumentsRule_js[];
+extern const std::uint32_t ExtractSoftwareInstrumentsRule_js_len;
 extern const unsigned char LegacyLoopTaxonomy_plist[];
 extern const std::uint32_t LegacyLoopTaxonomy_plist_len;
 extern const unsigned char LegacyLoopTaxonomyMapping_csv[];

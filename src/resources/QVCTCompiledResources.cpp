@@ -70,6 +70,10 @@ std::optional<std::string> QVCTCompiledResources::QVSearchKitJS() {
     return resource<std::string>(QVSearchKit_js, QVSearchKit_js_len, kText);
 }
 
+std::optional<std::string> QVCTCompiledResources::ExtractSoftwareInstrumentsRuleJS() {
+    return resource<std::string>(ExtractSoftwareInstrumentsRule_js, ExtractSoftwareInstrumentsRule_js_len, kText);
+}
+
 std::optional<QVCTCompiledResources::Lines> QVCTCompiledResources::LegacyLoopTaxonomyMapping() {
     return lines(LegacyLoopTaxonomyMapping_csv, LegacyLoopTaxonomyMapping_csv_len);
 }

@@ -34,6 +34,7 @@ class QVCTCompiledResources {
     static std::optional<PropertyList::Dictionary> DefaultRulesPlist();
     static std::optional<PropertyList::Dictionary> DefaultKeywordMappingPlist();
     static std::optional<std::string> QVSearchKitJS();
+    static std::optional<std::string> ExtractSoftwareInstrumentsRuleJS();
     static std::optional<Lines> LegacyLoopTaxonomyMapping();
     static std::optional<Lines> LegacyVorthalTaxonomyMapping();
     /// "pack identifier;display name" of every content pack.

@@ -1,0 +1,29 @@
+// Whatever the text: XML and its JSON without a crash, and the JSON only of text that has one root element.
+
+#include "ExactInput.h"
+#include "autotagging/QVCTXMLDocument.h"
+#include "autotagging/QVCTXMLParser.h"
+#include "platform/Decompression.h"
+#include "platform/Log.h"
+#include "platform/Text.h"
+
+using namespace qvct;
+
+extern "C" int LLVMFuzzerInitialize(int* /*count*/, char*** /*values*/) {
+    setLogHandler([](std::string_view /*message*/) {});
+    return 0;
+}
+
+extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
+    const fuzz::ExactInput input(data, size);
+    if (const auto plain = decompress(input.bytes()))
+        fuzz::require(plain->size() <= size * kHighestCompressionRatio);
+    const auto dictionary = QVCTXMLParser::dictionaryForXMLData(input.text());
+    fuzz::require(!dictionary || dictionary->size() == 1);
+    const auto document = QVCTXMLDocument::initWithXMLData(input.text(), "fuzz");
+    fuzz::require(document->hasContent() || !document->isMatchingXPath("/*"));
+    const auto json = document->JSONString();
+    fuzz::require(!json || isValidUtf8(*json));
+    fuzz::require(!dictionary || document->hasContent());
+    return 0;
+}

@@ -1,0 +1,169 @@
+#include "autotagging/QVCTXMLDocument.h"
+
+#include "autotagging/QVCTXMLParser.h"
+#include "autotagging/XPathExpression.h"
+#include "platform/Decompression.h"
+#include "platform/FileAccess.h"
+#include "platform/Json.h"
+#include "platform/Log.h"
+#include "platform/Text.h"
+
+#include <limits>
+
+#include <fmt/format.h>
+#include <libxml/parser.h>
+#include <libxml/tree.h>
+
+namespace qvct {
+namespace {
+
+/// Most messages about one document; damaged ones may cause one for each line.
+constexpr int kMostMessages = 5;
+
+struct ParserCloser {
+    void operator()(xmlParserCtxt* context) const { xmlFreeParserCtxt(context); }
+};
+
+struct DocumentCloser {
+    void operator()(xmlDoc* document) const { xmlFreeDoc(document); }
+};
+using Document = std::unique_ptr<xmlDoc, DocumentCloser>;
+
+/// Passes the XML library's messages to the log.
+class Messages {
+  public:
+    explicit Messages(std::string_view name) : name_(printable(name)) {}
+
+    static void receive(void* context, xmlErrorPtr error) {
+        auto& self = *static_cast<Messages*>(static_cast<xmlParserCtxt*>(context)->_private);
+        const std::string_view reason = error->message == nullptr ? "unknown fault" : error->message;
+        if (++self.count_ > kMostMessages) return;
+        log(fmt::format("{}, line {}: {}", self.name_, error->line, trimBlanksAndLineBreaks(reason)));
+    }
+
+    void logOmitted() const {
+        if (count_ > kMostMessages) log(fmt::format("{}: {} more faults", name_, count_ - kMostMessages));
+    }
+
+  private:
+    std::string name_;
+    int count_ = 0;
+};
+
+Document parse(std::string_view text, std::string_view name) {
+    static const bool isInitialized = (xmlInitParser(), true);  // before several threads parse at once
+    const std::unique_ptr<xmlParserCtxt, ParserCloser> context(isInitialized ? xmlNewParserCtxt() : nullptr);
+    if (!context || text.size() > static_cast<std::size_t>(std::numeric_limits<int>::max())) return nullptr;
+    Messages messages(name);
+    context->_private = &messages;
+    context->sax->serror = Messages::receive;
+    Document document(xmlCtxtReadMemory(context.get(), text.data(), static_cast<int>(text.size()), nullptr,
+                                        nullptr, XML_PARSE_RECOVER | XML_PARSE_NONET));
+    messages.logOmitted();
+    return document;
+}
+
+std::string_view textOf(const std::vector<std::uint8_t>& bytes) {
+    return {reinterpret_cast<const char*>(bytes.data()), bytes.size()};
+}
+
+}  // namespace
+
+struct QVCTXMLDocument::Implementation {
+    Document document;
+    XPathContext context;  // after the document, on which it depends
+
+    explicit Implementation(Document parsed) : document(std::move(parsed)) {
+        if (document) context = makeXPathContext(document.get());
+    }
+
+    xmlNode* firstNode(std::string_view expression) const {
+        if (!context || expression.empty()) return nullptr;
+        const auto compiled = XPathExpression::cached(expression);
+        return compiled ? compiled->firstNode(*context) : nullptr;
+    }
+};
+
+QVCTXMLDocument::QVCTXMLDocument(std::unique_ptr<Implementation> implementation)
+    : implementation_(std::move(implementation)) {}
+QVCTXMLDocument::~QVCTXMLDocument() = default;
+
+std::shared_ptr<QVCTXMLDocument> QVCTXMLDocument::initWithXMLData(std::string_view text,
+                                                                  std::string_view name) {
+    auto implementation = std::make_unique<Implementation>(text.empty() ? nullptr : parse(text, name));
+    return std::shared_ptr<QVCTXMLDocument>(new QVCTXMLDocument(std::move(implementation)));
+}
+
+std::shared_ptr<QVCTXMLDocument> QVCTXMLDocument::initWithContentsOfURL(const URL& url) {
+    if (url.pathExtension() == "zxml") return initWithContentsOfQVZippedXMLURL(url);
+    Error error;
+    const auto bytes = readFile(url.path(), &error);
+    if (!bytes) log(error.message);
+    return initWithXMLData(bytes ? textOf(*bytes) : std::string_view{}, url.path());
+}
+
+std::shared_ptr<QVCTXMLDocument> QVCTXMLDocument::initWithContentsOfQVZippedXMLURL(const URL& url) {
+    Error error;
+    std::optional<std::vector<std::uint8_t>> xml;
+    if (const auto bytes = readFile(url.path(), &error)) {
+        xml = decompress(*bytes, &error);
+        if (!xml) error.message = fmt::format("{}: {}", printable(url.path()), error.message);
+    }
+    if (!xml) log(error.message);
+    return initWithXMLData(xml ? textOf(*xml) : std::string_view{}, url.path());
+}
+
+bool QVCTXMLDocument::hasContent() const {
+    return implementation_->document != nullptr;
+}
+
+std::vector<std::shared_ptr<QVSKXMLNode>> QVCTXMLDocument::nodesForXPath(std::string_view expression) const {
+    std::vector<std::shared_ptr<QVSKXMLNode>> nodes;
+    if (!implementation_->context || expression.empty()) return nodes;
+    const auto compiled = XPathExpression::cached(expression);
+    if (!compiled) return nodes;
+    for (xmlNode* node : compiled->nodes(*implementation_->context)) {
+        nodes.push_back(QVSKXMLNode::initWithXMLNode(node));
+    }
+    return nodes;
+}
+
+std::shared_ptr<QVSKXMLNode> QVCTXMLDocument::firstNodeForXPath(std::string_view expression) const {
+    return QVSKXMLNode::initWithXMLNode(implementation_->firstNode(expression));
+}
+
+bool QVCTXMLDocument::anyNodesForXPath(std::string_view expression) const {
+    return implementation_->firstNode(expression) != nullptr;
+}
+
+bool QVCTXMLDocument::isMatchingXPath(std::string_view expression) const {
+    return anyNodesForXPath(expression);
+}
+
+std::optional<std::string> QVCTXMLDocument::JSONStringForXPath(std::string_view expression) const {
+    const auto node = firstNodeForXPath(expression);
+    return node ? JSONStringWithData(node->XMLData()) : std::nullopt;
+}
+
+std::optional<std::string> QVCTXMLDocument::JSONString() const {
+    return JSONStringWithData(XMLData());
+}
+
+std::string QVCTXMLDocument::XMLData() const {
+    if (!hasContent()) return {};
+    xmlChar* raw = nullptr;
+    int size = 0;
+    xmlDocDumpFormatMemory(implementation_->document.get(), &raw, &size, 0);
+    const std::unique_ptr<xmlChar, decltype(xmlFree)> text(raw, xmlFree);
+    return size > 0 ? std::string(reinterpret_cast<const char*>(raw), static_cast<std::size_t>(size))
+                    : std::string{};
+}
+
+std::optional<std::string> QVCTXMLDocument::JSONStringWithData(std::string_view data) {
+    if (data.empty()) return std::nullopt;
+    auto dictionary = QVCTXMLParser::dictionaryForXMLData(data);
+    if (!dictionary) return std::nullopt;
+    return jsonText(PropertyList(std::move(*dictionary)), JsonStyle::pretty);
+}
+
+}  // namespace qvct

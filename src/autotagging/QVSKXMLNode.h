@@ -1,0 +1,25 @@
+#pragma once
+
+#include <memory>
+#include <string>
+
+struct _xmlNode;
+
+namespace qvct {
+
+/// One matched node of an XML document, kept as its XML text, so that it outlives the document.
+class QVSKXMLNode {
+  public:
+    /// Serializes the node with all below it, without indentation. Empty text when there is nothing to write.
+    /// @cost  O(size of the subtree)
+    static std::shared_ptr<QVSKXMLNode> initWithXMLNode(_xmlNode* node);
+
+    const std::string& XMLData() const { return xmlData_; }
+
+  private:
+    explicit QVSKXMLNode(std::string xmlData) : xmlData_(std::move(xmlData)) {}
+
+    std::string xmlData_;
+};
+
+}  // namespace qvct

@@ -1,0 +1,340 @@
+#include "autotagging/ScriptContext.h"
+
+#include "autotagging/QVCTXMLDocument.h"
+#include "autotagging/RegularExpressionGuard.h"
+#include "autotagging/ScriptValues.h"
+#include "platform/Log.h"
+#include "platform/Text.h"
+
+#include <string>
+#include <utility>
+
+#include <fmt/format.h>
+
+// Exported by the engine, but not declared in its headers.
+extern "C" {
+using JSShouldTerminateCallback = bool (*)(JSContextRef, void*);
+void JSContextGroupSetExecutionTimeLimit(JSContextGroupRef, double seconds, JSShouldTerminateCallback, void*);
+void JSContextGroupClearExecutionTimeLimit(JSContextGroupRef);
+JSObjectRef JSGetMemoryUsageStatistics(JSContextRef);
+}
+
+namespace qvct {
+namespace {
+
+using Clock = std::chrono::steady_clock;
+
+/// Seconds of work between two looks at the limits.
+constexpr double kSlice = 0.01;
+constexpr std::size_t kLongestMessage = 4096;
+
+/// Gives rules their way of logging, and puts every use of a regular expression under the guard (`this`): all
+/// methods of texts and expressions go through `exec`.
+constexpr std::string_view kPrelude = R"js(
+console.log = __log;
+(function (guard) {
+    const exec = RegExp.prototype.exec;
+    RegExp.prototype.exec = function (string) {
+        string = String(string);
+        guard(this.source, this.flags, string, this.lastIndex);
+        return exec.call(this, string);
+    };
+})(this);)js";
+
+/// The virtual machine of a thread, which its contexts share.
+class ContextGroup {
+  public:
+    ContextGroup() : group_(JSContextGroupCreate()) {}
+    ContextGroup(const ContextGroup&) = delete;
+    ContextGroup& operator=(const ContextGroup&) = delete;
+    ~ContextGroup() { JSContextGroupRelease(group_); }
+    JSContextGroupRef reference() const { return group_; }
+
+  private:
+    JSContextGroupRef group_;
+};
+
+std::shared_ptr<ContextGroup>& groupOfThisThread() {
+    thread_local std::shared_ptr<ContextGroup> group;
+    return group;
+}
+
+std::shared_ptr<ContextGroup> sharedGroup() {
+    std::shared_ptr<ContextGroup>& group = groupOfThisThread();
+    if (!group) group = std::make_shared<ContextGroup>();
+    return group;
+}
+
+std::u16string_view viewOf(JSStringRef string) {
+    return {reinterpret_cast<const char16_t*>(JSStringGetCharactersPtr(string)), JSStringGetLength(string)};
+}
+
+std::string argument(JSContextRef context, std::size_t count, const JSValueRef values[], std::size_t index,
+                     JSValueRef* exception) {
+    return textOf(context, index < count ? values[index] : JSValueMakeUndefined(context), exception);
+}
+
+JSValueRef valueOf(JSContextRef context, const std::optional<std::string>& text) {
+    return text ? JSValueMakeString(context, scriptString(*text).get()) : JSValueMakeNull(context);
+}
+
+void setProperty(JSContextRef context, JSObjectRef object, std::string_view name, JSValueRef value) {
+    JSObjectSetProperty(context, object, scriptString(name).get(), value, kJSPropertyAttributeNone, nullptr);
+}
+
+}  // namespace
+
+struct ScriptContext::Implementation {
+    enum class Stop { none, time, memory };
+
+    ScriptLimits limits;
+    Clock::time_point deadline = Clock::now() + limits.time;
+    Stop stop = Stop::none;
+    int messages = 0;
+    const QVCTXMLDocument* document = nullptr;
+    std::shared_ptr<ContextGroup> group = sharedGroup();
+    JSGlobalContextRef context = JSGlobalContextCreateInGroup(group->reference(), globalClass());
+
+    explicit Implementation(const ScriptLimits& chosen) : limits(chosen) {
+        JSObjectSetPrivate(JSContextGetGlobalObject(context), this);
+        JSContextGroupSetExecutionTimeLimit(group->reference(), kSlice, shouldTerminate, this);
+    }
+    Implementation(const Implementation&) = delete;
+    Implementation& operator=(const Implementation&) = delete;
+
+    ~Implementation() {
+        JSContextGroupClearExecutionTimeLimit(group->reference());
+        JSObjectSetPrivate(JSContextGetGlobalObject(context), nullptr);
+        JSGlobalContextRelease(context);
+        // A machine that was stopped may hold much memory: the thread's next context begins with a new one.
+        if (stop != Stop::none && groupOfThisThread() == group) groupOfThisThread().reset();
+    }
+
+    /// The context that a callback belongs to. Scripts cannot reach it.
+    static Implementation& of(JSContextRef context) {
+        return *static_cast<Implementation*>(JSObjectGetPrivate(JSContextGetGlobalObject(context)));
+    }
+
+    JSObjectRef global() const { return JSContextGetGlobalObject(context); }
+
+    void logException(JSValueRef thrown) {
+        if (stop == Stop::none && thrown != nullptr) logProblem(textOf(context, thrown, nullptr));
+        if (stop != Stop::none) logStop();
+    }
+
+    static void logProblem(std::string_view text) {
+        log(fmt::format("JavaScript Exception: {}", text.substr(0, kLongestMessage)));
+    }
+
+    void logStop() {
+        if (std::exchange(isStopLogged, true)) return;
+        if (stop == Stop::time) {
+            logProblem(fmt::format("stopped after {} ms", limits.time.count()));
+        } else {
+            logProblem(fmt::format("stopped at more than {} MiB of memory", limits.memory >> 20U));
+        }
+    }
+
+    /// Runs `work`, which enters the machine, under the limits; false once one was reached.
+    template <typename Work>
+    bool run(Work work) {
+        if (stop != Stop::none) return false;
+        if (Clock::now() >= deadline) {
+            stop = Stop::time;
+        } else {
+            work();
+        }
+        if (stop != Stop::none) logStop();
+        return stop == Stop::none;
+    }
+
+    /// Asked by the machine once a slice is over. Must ask for the next slice itself, even when it says stop:
+    /// calls into the machine from our own functions may swallow the stopping.
+    static bool shouldTerminate(JSContextRef context, void* self) {
+        auto& implementation = *static_cast<Implementation*>(self);
+        if (Clock::now() >= implementation.deadline) {
+            implementation.stop = Stop::time;
+        } else if (memoryInUse(context) > static_cast<double>(implementation.limits.memory)) {
+            implementation.stop = Stop::memory;
+        }
+        JSContextGroupSetExecutionTimeLimit(implementation.group->reference(), kSlice, shouldTerminate, self);
+        return implementation.stop != Stop::none;
+    }
+
+    static double memoryInUse(JSContextRef context) {
+        const JSObjectRef statistics = JSGetMemoryUsageStatistics(context);
+        const JSValueRef capacity =
+            JSObjectGetProperty(context, statistics, scriptString("heapCapacity").get(), nullptr);
+        return JSValueToNumber(context, capacity, nullptr);
+    }
+
+    static JSClassRef globalClass();
+    static JSClassRef documentClass();
+    static JSValueRef logMessage(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
+                                 JSValueRef*);
+    static JSValueRef guardExpression(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
+                                      JSValueRef*);
+    static JSValueRef isMatchingXPath(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
+                                      JSValueRef*);
+    static JSValueRef jsonStringForXPath(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
+                                         JSValueRef*);
+    static JSValueRef jsonString(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
+                                 JSValueRef*);
+
+    bool isStopLogged = false;
+};
+
+JSClassRef ScriptContext::Implementation::globalClass() {
+    static const JSClassRef made = [] {
+        JSClassDefinition definition = kJSClassDefinitionEmpty;
+        definition.className = "global";
+        return JSClassCreate(&definition);
+    }();
+    return made;
+}
+
+JSClassRef ScriptContext::Implementation::documentClass() {
+    static const JSClassRef made = [] {
+        constexpr JSPropertyAttributes fixed = kJSPropertyAttributeReadOnly | kJSPropertyAttributeDontDelete;
+        static const JSStaticFunction functions[] = {{"isMatchingXPath", isMatchingXPath, fixed},
+                                                     {"JSONStringForXPath", jsonStringForXPath, fixed},
+                                                     {"JSONString", jsonString, fixed},
+                                                     {nullptr, nullptr, 0}};
+        JSClassDefinition definition = kJSClassDefinitionEmpty;
+        definition.className = "QVCTXMLDocument";
+        definition.staticFunctions = functions;
+        return JSClassCreate(&definition);
+    }();
+    return made;
+}
+
+JSValueRef ScriptContext::Implementation::logMessage(JSContextRef context, JSObjectRef /*function*/,
+                                                     JSObjectRef /*self*/, size_t count,
+                                                     const JSValueRef values[], JSValueRef* exception) {
+    const std::string message = argument(context, count, values, 0, exception);
+    const int number = ++of(context).messages;
+    if (number <= kMostScriptMessages) {
+        log(fmt::format("JavaScript: {}", std::string_view(message).substr(0, kLongestMessage)));
+    } else if (number == kMostScriptMessages + 1) {
+        log("JavaScript: (further messages of this script are dropped)");
+    }
+    return JSValueMakeUndefined(context);
+}
+
+JSValueRef ScriptContext::Implementation::guardExpression(JSContextRef context, JSObjectRef /*function*/,
+                                                          JSObjectRef /*self*/, size_t count,
+                                                          const JSValueRef values[], JSValueRef* exception) {
+    if (count < 4) return JSValueMakeUndefined(context);
+    const ScriptString pattern(JSValueToStringCopy(context, values[0], exception));
+    const ScriptString flags(JSValueToStringCopy(context, values[1], exception));
+    const ScriptString text(JSValueToStringCopy(context, values[2], exception));
+    const double last = JSValueToNumber(context, values[3], exception);
+    if (!pattern || !flags || !text || *exception != nullptr) return JSValueMakeUndefined(context);
+    const bool isSticky = viewOf(flags.get()).find_first_of(u"gy") != std::u16string_view::npos;
+    const std::size_t start = isSticky && last > 0 && last < 1e9 ? static_cast<std::size_t>(last) : 0;
+    if (!isRegularExpressionBounded(viewOf(pattern.get()), viewOf(flags.get()), viewOf(text.get()), start,
+                                    of(context).deadline)) {
+        const std::string reason =
+            fmt::format("regular expression takes too long: /{}/", textOf(pattern.get()));
+        *exception = JSValueMakeString(context, scriptString(reason).get());
+    }
+    return JSValueMakeUndefined(context);
+}
+
+JSValueRef ScriptContext::Implementation::isMatchingXPath(JSContextRef context, JSObjectRef /*function*/,
+                                                          JSObjectRef /*self*/, size_t count,
+                                                          const JSValueRef values[], JSValueRef* exception) {
+    const std::string expression = argument(context, count, values, 0, exception);
+    return JSValueMakeBoolean(context, of(context).document->isMatchingXPath(expression));
+}
+
+JSValueRef ScriptContext::Implementation::jsonStringForXPath(JSContextRef context, JSObjectRef /*function*/,
+                                                             JSObjectRef /*self*/, size_t count,
+                                                             const JSValueRef values[],
+                                                             JSValueRef* exception) {
+    const std::string expression = argument(context, count, values, 0, exception);
+    return valueOf(context, of(context).document->JSONStringForXPath(expression));
+}
+
+JSValueRef ScriptContext::Implementation::jsonString(JSContextRef context, JSObjectRef /*function*/,
+                                                     JSObjectRef /*self*/, size_t /*count*/,
+                                                     const JSValueRef /*values*/[],
+                                                     JSValueRef* /*exception*/) {
+    return valueOf(context, of(context).document->JSONString());
+}
+
+ScriptContext::ScriptContext(std::unique_ptr<Implementation> implementation)
+    : implementation_(std::move(implementation)) {}
+ScriptContext::~ScriptContext() = default;
+
+std::shared_ptr<ScriptContext> ScriptContext::make(const ScriptLimits& limits) {
+    auto implementation = std::make_unique<Implementation>(limits);
+    JSGlobalContextRef context = implementation->context;
+    const JSObjectRef log = JSObjectMakeFunctionWithCallback(context, nullptr, Implementation::logMessage);
+    setProperty(context, implementation->global(), "__log", log);
+    const JSObjectRef guard =
+        JSObjectMakeFunctionWithCallback(context, nullptr, Implementation::guardExpression);
+    static const ScriptString prelude = scriptString(kPrelude);
+    JSEvaluateScript(context, prelude.get(), guard, nullptr, 1, nullptr);
+    return std::shared_ptr<ScriptContext>(new ScriptContext(std::move(implementation)));
+}
+
+void ScriptContext::exposeDocument(const QVCTXMLDocument& document) {
+    Implementation& self = *implementation_;
+    self.document = &document;
+    setProperty(self.context, self.global(), "document",
+                JSObjectMake(self.context, Implementation::documentClass(), nullptr));
+}
+
+bool ScriptContext::evaluate(std::string_view script) {
+    Implementation& self = *implementation_;
+    const ScriptString text = scriptString(script);
+    JSValueRef exception = nullptr;
+    const bool ran = self.run([&] {
+        JSEvaluateScript(self.context, text.get(), nullptr, nullptr, 1, &exception);
+        if (exception != nullptr) self.logException(exception);
+    });
+    return ran && exception == nullptr;
+}
+
+std::optional<PropertyList::Array> ScriptContext::callForArray(std::string_view function) {
+    Implementation& self = *implementation_;
+    std::optional<PropertyList::Array> result;
+    self.run([&] {
+        JSValueRef exception = nullptr;
+        const JSValueRef callee =
+            JSObjectGetProperty(self.context, self.global(), scriptString(function).get(), &exception);
+        if (exception == nullptr && (!JSValueIsObject(self.context, callee) ||
+                                     !JSObjectIsFunction(self.context, const_cast<JSObjectRef>(callee)))) {
+            return Implementation::logProblem(fmt::format("TypeError: {} is not a function", function));
+        }
+        const JSValueRef value = exception != nullptr
+                                     ? nullptr
+                                     : JSObjectCallAsFunction(self.context, const_cast<JSObjectRef>(callee),
+                                                              nullptr, 0, nullptr, &exception);
+        if (value == nullptr || exception != nullptr) return self.logException(exception);
+        if (JSValueIsUndefined(self.context, value) || JSValueIsNull(self.context, value)) return;
+        std::string problem;
+        result = arrayOf(self.context, value, problem);
+        if (!result && self.stop == Implementation::Stop::none) Implementation::logProblem(problem);
+    });
+    return isStopped() ? std::nullopt : std::move(result);
+}
+
+bool ScriptContext::isStopped() const {
+    return implementation_->stop != Implementation::Stop::none;
+}
+
+bool ScriptContext::checkSyntax(std::string_view script, Error* error) {
+    const auto context = make({});
+    const JSGlobalContextRef reference = context->implementation_->context;
+    JSValueRef exception = nullptr;
+    if (JSCheckScriptSyntax(reference, scriptString(script).get(), nullptr, 1, &exception)) return true;
+    const JSValueRef line = JSObjectGetProperty(reference, JSValueToObject(reference, exception, nullptr),
+                                                scriptString("line").get(), nullptr);
+    return fail(error, kErrorMalformed,
+                fmt::format("script, line {}: {}", textOf(reference, line, nullptr),
+                            textOf(reference, exception, nullptr)));
+}
+
+}  // namespace qvct

@@ -1,0 +1,156 @@
+#include "autotagging/XPathExpression.h"
+
+#include "platform/Log.h"
+#include "platform/Text.h"
+
+#include <string>
+#include <unordered_map>
+
+#include <fmt/format.h>
+#include <libxml/xpath.h>
+#include <libxml/xpathInternals.h>
+
+namespace qvct {
+namespace {
+
+/// Most expressions that a thread keeps; scripts may make up new ones without end.
+constexpr std::size_t kMostCachedExpressions = 1024;
+
+std::string_view reasonOf(int code) {
+    switch (code) {
+        case XML_XPATH_NUMBER_ERROR:
+            return "malformed number";
+        case XML_XPATH_UNFINISHED_LITERAL_ERROR:
+            return "unfinished text";
+        case XML_XPATH_START_LITERAL_ERROR:
+            return "a text must begin here";
+        case XML_XPATH_VARIABLE_REF_ERROR:
+            return "malformed variable";
+        case XML_XPATH_UNDEF_VARIABLE_ERROR:
+            return "undefined variable";
+        case XML_XPATH_INVALID_PREDICATE_ERROR:
+            return "malformed predicate";
+        case XML_XPATH_EXPR_ERROR:
+            return "malformed expression";
+        case XML_XPATH_UNCLOSED_ERROR:
+            return "unclosed bracket";
+        case XML_XPATH_UNKNOWN_FUNC_ERROR:
+            return "unknown function";
+        case XML_XPATH_INVALID_OPERAND:
+            return "operand of the wrong type";
+        case XML_XPATH_INVALID_TYPE:
+            return "value of the wrong type";
+        case XML_XPATH_INVALID_ARITY:
+            return "wrong number of arguments";
+        case XML_XPATH_UNDEF_PREFIX_ERROR:
+            return "undefined prefix";
+        case XML_XPATH_ENCODING_ERROR:
+            return "not UTF-8";
+        case XML_XPATH_INVALID_CHAR_ERROR:
+            return "character that XML does not allow";
+        case XML_XPATH_MEMORY_ERROR:
+            return "out of memory";
+        default:
+            return "cannot be evaluated, or only with too much nesting or work";
+    }
+}
+
+std::string shortened(std::string_view text) {
+    constexpr std::size_t kLongest = 200;
+    return printable(text.substr(0, kLongest)) + (text.size() > kLongest ? "..." : "");
+}
+
+void keepSyntaxError(void* target, xmlErrorPtr raised) {
+    const std::string_view text = raised->str1 == nullptr ? std::string_view{} : raised->str1;
+    *static_cast<Error*>(target) = {
+        std::string(QVCTErrorDomain), kErrorMalformed,
+        fmt::format("XPath \"{}\", character {}: {}", shortened(text), raised->int1, reasonOf(raised->code))};
+}
+
+void logEvaluationError(void* text, xmlErrorPtr raised) {
+    log(fmt::format("XPath \"{}\": {}", shortened(*static_cast<const std::string*>(text)),
+                    reasonOf(raised->code)));
+}
+
+struct ObjectCloser {
+    void operator()(xmlXPathObject* object) const { xmlXPathFreeObject(object); }
+};
+
+}  // namespace
+
+void XPathContextCloser::operator()(xmlXPathContext* context) const {
+    xmlXPathFreeContext(context);
+}
+
+XPathContext makeXPathContext(_xmlDoc* document) {
+    XPathContext context(xmlXPathNewContext(document));
+    if (context) {
+        context->error = logEvaluationError;
+        context->opLimit = kMostXPathOperations;
+    }
+    return context;
+}
+
+void XPathExpression::Closer::operator()(xmlXPathCompExpr* expression) const {
+    xmlXPathFreeCompExpr(expression);
+}
+
+std::shared_ptr<const XPathExpression> XPathExpression::compile(std::string_view text, Error* error) {
+    if (text.empty() || text.size() > kLongestXPath || text.find('\0') != std::string_view::npos) {
+        fail(error, kErrorMalformed,
+             fmt::format("XPath of {} bytes: empty, too long or binary", text.size()));
+        return nullptr;
+    }
+    const XPathContext context(xmlXPathNewContext(nullptr));
+    if (!context) return nullptr;
+    Error raised;
+    context->error = keepSyntaxError;
+    context->userData = &raised;
+    auto expression = std::make_shared<XPathExpression>();
+    expression->text_ = text;
+    expression->compiled_.reset(
+        xmlXPathCtxtCompile(context.get(), reinterpret_cast<const xmlChar*>(expression->text_.c_str())));
+    if (!expression->compiled_) {
+        if (error != nullptr) *error = std::move(raised);
+        return nullptr;
+    }
+    expression->locationPath_ = LocationPath::parse(text);
+    return expression;
+}
+
+std::shared_ptr<const XPathExpression> XPathExpression::cached(std::string_view text) {
+    thread_local std::unordered_map<std::string, std::shared_ptr<const XPathExpression>> cache;
+    std::string key(text);
+    if (const auto hit = cache.find(key); hit != cache.end()) return hit->second;
+    if (cache.size() >= kMostCachedExpressions) cache.clear();
+    Error error;
+    std::shared_ptr<const XPathExpression> expression = compile(text, &error);
+    if (!expression) log(error.message);
+    return cache.emplace(std::move(key), std::move(expression)).first->second;
+}
+
+std::vector<xmlNode*> XPathExpression::nodes(xmlXPathContext& context) const {
+    context.opCount = 0;
+    context.node = nullptr;
+    context.userData = const_cast<std::string*>(&text_);  // for messages, which only read it
+    const std::unique_ptr<xmlXPathObject, ObjectCloser> result(
+        xmlXPathCompiledEval(compiled_.get(), &context));
+    if (!result || result->type != XPATH_NODESET || result->nodesetval == nullptr) return {};
+    std::vector<xmlNode*> selected;
+    for (int i = 0; i < result->nodesetval->nodeNr; ++i) {
+        // Name space nodes are made for the result and would not outlive it.
+        xmlNode* node = result->nodesetval->nodeTab[i];
+        if (node->type != XML_NAMESPACE_DECL) selected.push_back(node);
+    }
+    return selected;
+}
+
+xmlNode* XPathExpression::firstNode(xmlXPathContext& context) const {
+    // The library compares texts that hold entity references in a way of its own.
+    const bool mayHoldReferences = context.doc->intSubset != nullptr;
+    if (locationPath_ && !mayHoldReferences) return locationPath_->firstNode(context.doc);
+    const std::vector<xmlNode*> all = nodes(context);
+    return all.empty() ? nullptr : all.front();
+}
+
+}  // namespace qvct

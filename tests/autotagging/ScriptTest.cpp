@@ -1,0 +1,219 @@
+#include "autotagging/QVCTJavaScriptUtilities.h"
+#include "autotagging/QVCTXMLDocument.h"
+#include "autotagging/RegularExpressionGuard.h"
+#include "platform/Json.h"
+#include "support/CapturedLog.h"
+
+#include <cstdio>
+#include <thread>
+
+#include <gmock/gmock.h>
+
+namespace qvct {
+namespace {
+
+using std::chrono::milliseconds;
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::IsEmpty;
+using testing::SizeIs;
+
+std::shared_ptr<QVCTXMLDocument> sample() {
+    return QVCTXMLDocument::initWithXMLData("<P><a n='1'/><a n='2'/></P>", "test.xml");
+}
+
+std::string resultOf(std::string_view script) {
+    const auto result = QVCTJavaScriptUtilities::tagsForXMLDocument(sample(), script);
+    return result ? jsonText(PropertyList(*result), JsonStyle::compact) : "nil";
+}
+
+/// What `main` returns when that is its body.
+std::string resultOfMain(const std::string& body) {
+    return resultOf("function main() { " + body + " }");
+}
+
+/// Other limits for as long as it lives.
+class Limits {
+  public:
+    explicit Limits(const ScriptLimits& limits) { QVCTJavaScriptUtilities::setLimits(limits); }
+    Limits(const Limits&) = delete;
+    Limits& operator=(const Limits&) = delete;
+    ~Limits() { QVCTJavaScriptUtilities::setLimits({}); }
+};
+
+TEST(Script, ResultsBecomeDictionariesTextsNumbersAndBooleans) {
+    const test::CapturedLog log;
+    const struct {
+        const char *body, *result;
+    } rows[] = {
+        {"return [{label: 'a', level: 0.5}]", R"([{"label":"a","level":0.5}])"},
+        {"return [{a: {b: [1, true, 'x', {c: false}]}}]", R"([{"a":{"b":[1,true,"x",{"c":false}]}}])"},
+        {"return [null, undefined, Symbol('s'), {a: null, b: undefined}]", "[{}]"},
+        {"return [[1], [], 'text']", R"([[1],[],"text"])"},
+        {"return ['\\ud800', '\\u00e4\\ud83c\\udfb5']", "[\"\xef\xbf\xbd\",\"\xc3\xa4\xf0\x9f\x8e\xb5\"]"},
+        {"return []", "[]"},
+        {"return null", "nil"},
+        {"return", "nil"},
+    };
+    for (const auto& row : rows) EXPECT_EQ(resultOfMain(row.body), row.result) << row.body;
+    EXPECT_THAT(log.messages(), IsEmpty());
+}
+
+TEST(Script, WhatIsNoArrayOrFailsIsLoggedAndNothing) {
+    for (const char* body :
+         {"return 'text'", "return 5", "return {length: 1}", "throw new Error('boo')",
+          "return [{get label() { throw 'no' }}]",
+          "return [new Proxy({}, {ownKeys() { return ['a'] }, getOwnPropertyDescriptor() { return {value: 1, "
+          "enumerable: true, configurable: true} }, get() { throw 1 }})]",
+          "var a = {}; a.a = a; return [a]", "return new Array(1e9)", "return [new Array(3000).fill(1)]",
+          "return ['x'.repeat(2e6)]", "missing()"}) {
+        const test::CapturedLog log;
+        EXPECT_EQ(resultOfMain(body), "nil") << body;
+        ASSERT_THAT(log.messages(), SizeIs(1)) << body;
+        EXPECT_THAT(log.messages()[0], HasSubstr("JavaScript Exception: ")) << body;
+    }
+    for (const char* script : {"", "var main = 5", "var x = 1"}) {
+        const test::CapturedLog log;
+        EXPECT_EQ(resultOf(script), "nil") << script;
+        EXPECT_THAT(log.messages(), ElementsAre("JavaScript Exception: TypeError: main is not a function"))
+            << script;
+    }
+}
+
+TEST(Script, GoesOnAfterAFault) {
+    const test::CapturedLog log;
+    EXPECT_EQ(resultOf("function main() { return [1]; } missing.x;"), "[1]");
+    EXPECT_THAT(log.messages(),
+                ElementsAre("JavaScript Exception: ReferenceError: Can't find variable: missing"));
+}
+
+TEST(Script, SeesTheDocumentTheLogAndTheLibraryAndNoOtherScriptsGlobals) {
+    const test::CapturedLog log;
+    EXPECT_EQ(
+        resultOfMain(
+            "return [document.isMatchingXPath('/P/a[2]'), document.isMatchingXPath('/P/a[3]'), "
+            "JSON.parse(document.JSONStringForXPath('/P/a[2]')).a.n, document.JSONStringForXPath('/b'), "
+            "JSON.parse(document.JSONString()).P.a.length]"),
+        R"([true,false,"2",2])");
+    EXPECT_EQ(resultOf("var n = 0; for (var k in document) n++; function main() { return [n, typeof "
+                       "document.context]; }"),
+              R"([3,"undefined"])");
+    EXPECT_EQ(
+        resultOfMain("var g = QVSearchKit.api.GetPlugInParameter; return [QVSearchKit.api.VERSION, g([{name: "
+                     "'x'}, {name: '5', v: 1}], 5).v, g([], 'x'), g({name: 'x'}, 'x')]"),
+        R"(["1.0.0",1])");
+    EXPECT_EQ(
+        resultOf("var leak = 1; QVSearchKit.api.VERSION = 'changed'; function main() { return [leak]; }"),
+        "[1]");
+    EXPECT_EQ(resultOfMain("return [typeof leak, QVSearchKit.api.VERSION]"), R"(["undefined","1.0.0"])");
+    EXPECT_THAT(log.messages(), IsEmpty());
+    resultOf("console.log('one'); __log({}); function main() {}");
+    EXPECT_THAT(log.messages(), ElementsAre("JavaScript: one", "JavaScript: [object Object]"));
+}
+
+TEST(Script, CannotFloodTheLog) {
+    const test::CapturedLog log;
+    resultOfMain("for (var i = 0; i < 10000; i++) console.log('x'.repeat(5000))");
+    EXPECT_EQ(log.messages().size(), 101U);
+    EXPECT_LT(log.messages()[0].size(), 5000U);
+}
+
+TEST(Script, WithoutADocumentTheResultIsEmpty) {
+    EXPECT_EQ(QVCTJavaScriptUtilities::tagsForXMLDocument(nullptr, "for (;;);"), PropertyList::Array{});
+}
+
+TEST(Script, WithoutEndIsStoppedAndTheNextOneRuns) {
+    const Limits limits({milliseconds(150), std::size_t{256} << 20});
+    for (const char* script :
+         {"for (;;);", "function main() { for (;;); }",
+          "function main() { return [{get label() { for (;;); }}] }", "throw {toString() { for (;;); }}",
+          "function main() { try { for (;;); } finally { for (;;); } }",
+          "function main() { for (;;) try { for (;;); } catch (e) {} }",
+          "function main() { for (;;) document.JSONString() }"}) {
+        const test::CapturedLog log;
+        const auto start = std::chrono::steady_clock::now();
+        EXPECT_EQ(resultOf(script), "nil") << script;
+        EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(5)) << script;
+        EXPECT_THAT(log.messages(), ElementsAre("JavaScript Exception: stopped after 150 ms")) << script;
+        EXPECT_EQ(resultOfMain("return [1]"), "[1]");
+    }
+}
+
+TEST(Script, RecursionWithoutEndIsAnException) {
+    const test::CapturedLog log;
+    EXPECT_EQ(resultOfMain("return main()"), "nil");
+    EXPECT_THAT(log.messages(), ElementsAre(HasSubstr("RangeError: Maximum call stack size exceeded")));
+}
+
+TEST(Script, CatastrophicExpressionsAreStoppedWhateverCallsThem) {
+    const Limits limits({milliseconds(200), std::size_t{256} << 20});
+    const std::string text = "'a'.repeat(300)", pattern = "/a*a*a*a*a*a*b/";
+    for (const std::string& use :
+         {pattern + ".test(" + text + ")", pattern + ".exec(" + text + ")", text + ".match(" + pattern + ")",
+          text + ".replace(" + pattern + ", '')", text + ".search(" + pattern + ")",
+          text + ".split(" + pattern + ")", "[..." + text + ".matchAll(" + pattern + "g)]",
+          text + ".replaceAll(" + pattern + "g, '')", text + ".match('a*a*a*a*a*a*b')",
+          "/(a+)+$/.test(" + text + " + 'b')", "/^(\\w+\\s?)*$/.test(" + text + " + '!')"}) {
+        const test::CapturedLog log;
+        const auto start = std::chrono::steady_clock::now();
+        EXPECT_EQ(resultOfMain("return [" + use + "]"), "nil") << use;
+        EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(5)) << use;
+        EXPECT_THAT(log.messages(), ElementsAre(HasSubstr("JavaScript Exception: "))) << use;
+    }
+}
+
+TEST(Script, OrdinaryExpressionsWorkAsEver) {
+    EXPECT_EQ(resultOfMain("return ['x-y z'.replace(/[-\\s]+/g, '_'), 'a1b2'.match(/\\d/g).join(''), 'a, "
+                           "b,c'.split(/,\\s*/), "
+                           "'aXbX'.search(/x/i), /^(\\w+\\s?)+$/.test('warm analog pad '.repeat(500) + 'x'), "
+                           "'2024-05'.replace(/(?<y>\\d+)-(?<m>\\d+)/, '$<m>/$<y>')]"),
+              R"(["x_y_z","12",["a","b","c"],1,true,"05/2024"])");
+    EXPECT_EQ(resultOfMain(
+                  "var r = /a/y; r.lastIndex = 1; return [r.test('ba'), r.lastIndex, /a/.exec('ba').index]"),
+              "[true,2,1]");
+}
+
+TEST(RegularExpressionGuard, WritesPatternsAsTheOtherEngineReadsThem) {
+    const struct {
+        const char16_t *pattern, *icu;
+    } rows[] = {{u"a$", u"a\\z"},
+                {u"[$[&&]", u"[$\\[\\&\\&]"},
+                {u"\\d[\\w\\D]", u"[0-9][[A-Za-z0-9_][^0-9]]"},
+                {u"[]a[^]", u"(?!)a[\\s\\S]"},
+                {u"\\b[\\b]", u"\\b[\\x08]"},
+                {u"\\u{1F3B5}\\u0041", u"\\x{1F3B5}\\u0041"},
+                {u"\\$\\[", u"\\$\\["}};
+    for (const auto& row : rows) EXPECT_EQ(icuPattern(row.pattern, false), row.icu);
+    EXPECT_EQ(icuPattern(u"a$", true), u"a$");
+}
+
+TEST(Script, MemoryWithoutEndIsStopped) {
+    const Limits limits({milliseconds(20000), std::size_t{64} << 20});
+    const test::CapturedLog log;
+    EXPECT_EQ(resultOf("var a = []; for (;;) a.push(1);"), "nil");
+    EXPECT_EQ(resultOf("var a = []; for (;;) a.push({x: [1, 2, 3]});"), "nil");
+    EXPECT_THAT(log.messages(), testing::Each("JavaScript Exception: stopped at more than 64 MiB of memory"));
+    EXPECT_EQ(log.messages().size(), 2U);
+}
+
+TEST(Script, EachThreadHasItsOwnMachine) {
+    std::vector<std::thread> threads;
+    std::vector<std::string> results(4);
+    for (std::string& result : results) {
+        threads.emplace_back([&result] {
+            for (int i = 0; i < 50; ++i) result = resultOfMain("return [document.isMatchingXPath('/P/a')]");
+        });
+    }
+    for (std::thread& thread : threads) thread.join();
+    EXPECT_THAT(results, testing::Each("[true]"));
+}
+
+TEST(Script, SyntaxIsCheckedWithoutRunning) {
+    Error error;
+    EXPECT_TRUE(ScriptContext::checkSyntax("for (;;);"));
+    EXPECT_FALSE(ScriptContext::checkSyntax("var a;\nvar b = ;", &error));
+    EXPECT_THAT(error.message, HasSubstr("script, line 2: SyntaxError"));
+}
+
+}  // namespace
+}  // namespace qvct

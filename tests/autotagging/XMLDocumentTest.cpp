@@ -1,0 +1,307 @@
+#include "autotagging/QVCTXMLDocument.h"
+#include "autotagging/QVCTXMLParser.h"
+#include "autotagging/XPathExpression.h"
+#include "platform/Json.h"
+#include "platform/Text.h"
+#include "support/CapturedLog.h"
+#include "support/TemporaryFolder.h"
+
+#include <chrono>
+
+#include <gmock/gmock.h>
+#include <zlib.h>
+
+namespace qvct {
+namespace {
+
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::IsEmpty;
+
+std::shared_ptr<QVCTXMLDocument> document(std::string_view text) {
+    return QVCTXMLDocument::initWithXMLData(text, "test.xml");
+}
+
+std::string compactJson(std::string_view xml) {
+    const auto dictionary = QVCTXMLParser::dictionaryForXMLData(xml);
+    return dictionary ? jsonText(PropertyList(*dictionary), JsonStyle::compact) : "nil";
+}
+
+std::string gzipped(std::string_view text) {
+    z_stream stream{};
+    deflateInit2(&stream, 6, Z_DEFLATED, 31, 8, Z_DEFAULT_STRATEGY);
+    std::string out(text.size() + 100, '\0');
+    stream.next_in = reinterpret_cast<Bytef*>(const_cast<char*>(text.data()));
+    stream.avail_in = static_cast<uInt>(text.size());
+    stream.next_out = reinterpret_cast<Bytef*>(out.data());
+    stream.avail_out = static_cast<uInt>(out.size());
+    deflate(&stream, Z_FINISH);
+    out.resize(stream.total_out);
+    deflateEnd(&stream);
+    return out;
+}
+
+TEST(XmlToDictionaries, KeepsItsShapeAndQuirks) {
+    const struct {
+        const char *xml, *json;
+    } rows[] = {
+        {"<a/>", R"({"a":{}})"},
+        {"<a>x<b>y</b>z</a>", R"({"a":{"b":{"text":"xy"},"text":"z"}})"},
+        {"<a>\n <b/>\n</a>", R"({"a":{"b":{"text":""},"text":""}})"},
+        {"<a text='1'>two</a>", R"({"a":{"text":"two"}})"},
+        {"<a text='1'></a>", R"({"a":{"text":"1"}})"},
+        {"<a b='1'><b c='2'/></a>", R"({"a":{"b":["1",{"c":"2"}]}})"},
+        {"<a><b n='1'/><c/><b n='2'/><b n='3'/></a>",
+         R"({"a":{"b":[{"n":"1"},{"n":"2"},{"n":"3"}],"c":{}}})"},
+        {"<P><Parameter name='n' valueString='v'/></P>",
+         R"({"P":{"Parameter":{"name":"n","valueString":"v"}}})"},
+        {"<p:a xmlns:p='u' p:x='1'/>", R"({"p:a":{"xmlns:p":"u","p:x":"1"}})"},
+        {"<a> \n&lt;&#65;<![CDATA[<&>]]> <!-- no --><?p i?></a>", R"({"a":{"text":"<A<&>"}})"},
+        {"<!DOCTYPE a [<!ENTITY e '<q>in</q>'>]><a>x&e;</a>", R"({"a":{"q":{"text":"xin"}}})"},
+        {"<a><text/>own</a>", R"({"a":{"text":"own"}})"},
+        {"<a>", "nil"},
+        {"<a></b>", "nil"},
+        {"<a/><b/>", "nil"},
+        {"<a>&unknown;</a>", "nil"},
+        {"<a b='1' b='2'/>", "nil"},
+        {"", "nil"},
+        {"text", "nil"},
+    };
+    for (const auto& row : rows) EXPECT_EQ(compactJson(row.xml), row.json) << row.xml;
+}
+
+TEST(XmlToDictionaries, ManyDifferentChildrenTakeNoQuadraticTime) {
+    std::string xml = "<a>";
+    for (int i = 0; i < 200000; ++i) xml += "<c" + std::to_string(i) + "/>";
+    const auto start = std::chrono::steady_clock::now();
+    const auto dictionary = QVCTXMLParser::dictionaryForXMLData(xml + "<c7/></a>");
+    EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(20));
+    ASSERT_TRUE(dictionary.has_value());
+    EXPECT_EQ(dictionary->value("a")->dictionary()->size(), 200000U);
+    EXPECT_EQ(dictionary->value("a")->dictionary()->value("c7")->array()->size(), 2U);
+}
+
+TEST(XmlDocument, ReadsPlainAndCompressedFilesByTheirExactExtension) {
+    const test::TemporaryFolder folder;
+    const test::CapturedLog log;
+    const std::string xml = "<Patch name='a'/>";
+    const auto opens = [&](const char* name, std::string_view bytes) {
+        const URL url = URL::fileURLWithPath(folder.write(name, bytes));
+        return QVCTXMLDocument::initWithContentsOfURL(url)->isMatchingXPath("/Patch[@name='a']");
+    };
+    EXPECT_TRUE(opens("a.xml", xml));
+    EXPECT_TRUE(opens("a b \xc3\xa4%20.xml", xml));
+    EXPECT_TRUE(opens("a.zxml", gzipped(xml)));
+    EXPECT_FALSE(opens("a.ZXML", gzipped(xml)));
+    EXPECT_TRUE(opens("b.ZXML", xml));
+    EXPECT_FALSE(opens("plain.zxml", xml));
+    EXPECT_FALSE(opens("nothing.zxml", gzipped("")));
+    EXPECT_FALSE(opens("empty.xml", ""));
+    const URL upper = URL::fileURLWithPath(folder.path("a.ZXML"));
+    EXPECT_TRUE(QVCTXMLDocument::initWithContentsOfQVZippedXMLURL(upper)->hasContent());
+}
+
+TEST(XmlDocument, WithoutContentEveryQueryAnswersNothing) {
+    const test::TemporaryFolder folder;
+    const test::CapturedLog log;
+    for (const std::string& path : {folder.path("missing.xml"), folder.path(), folder.path("missing.zxml")}) {
+        const auto none = QVCTXMLDocument::initWithContentsOfURL(URL::fileURLWithPath(path));
+        ASSERT_NE(none, nullptr);
+        EXPECT_FALSE(none->hasContent());
+        EXPECT_THAT(none->nodesForXPath("//*"), IsEmpty());
+        EXPECT_FALSE(none->isMatchingXPath("/*"));
+        EXPECT_EQ(none->JSONString(), std::nullopt);
+        EXPECT_EQ(none->JSONStringForXPath("/*"), std::nullopt);
+        EXPECT_EQ(none->XMLData(), "");
+    }
+    ASSERT_EQ(log.messages().size(), 3U);
+    EXPECT_THAT(log.messages()[0], HasSubstr("missing.xml"));
+}
+
+TEST(XmlDocument, RecoversWhatMakesSense) {
+    const test::CapturedLog log;
+    EXPECT_TRUE(document("<Patch><Channels><Channel mode='Mono'><Plug")
+                    ->isMatchingXPath("/Patch/Channels/Channel[@mode='Mono']"));
+    EXPECT_TRUE(document("<a><b></c></a>")->isMatchingXPath("/a/b"));
+    EXPECT_FALSE(document("no XML at all")->isMatchingXPath("/*"));
+    EXPECT_THAT(log.messages().front(), HasSubstr("test.xml, line 1: "));
+}
+
+TEST(XmlDocument, DamagedFilesDoNotFloodTheLog) {
+    std::string xml = "<a>";
+    for (int i = 0; i < 1000; ++i) xml += "<b c='1' c='2'/>";
+    const test::CapturedLog log;
+    document(xml + "</a>");
+    EXPECT_LE(log.messages().size(), 6U);
+}
+
+TEST(XmlDocument, NodesAndJson) {
+    const auto three = document("<a><b n='1'>x</b><b n='2'/><b n='3'/></a>");
+    std::vector<std::string> nodes;
+    for (const auto& node : three->nodesForXPath("/a/b")) nodes.push_back(node->XMLData());
+    EXPECT_THAT(nodes, ElementsAre("<b n=\"1\">x</b>", "<b n=\"2\"/>", "<b n=\"3\"/>"));
+    EXPECT_EQ(three->JSONStringForXPath("//b"),
+              "{\n    \"b\": {\n        \"n\": \"1\",\n        \"text\": \"x\"\n    }\n}");
+    EXPECT_EQ(three->JSONStringForXPath("/a/c"), std::nullopt);
+    EXPECT_EQ(three->JSONStringForXPath("//@n"), std::nullopt);  // an attribute alone is no XML text
+    EXPECT_THAT(*three->JSONString(), HasSubstr("\"n\": \"3\""));
+    for (const char* noNodes : {"count(//b)", "//b/@n = 1", "string(/a)", "b", "", "//namespace::*", "//c"}) {
+        EXPECT_FALSE(three->isMatchingXPath(noNodes)) << noNodes;
+        EXPECT_THAT(three->nodesForXPath(noNodes), IsEmpty()) << noNodes;
+    }
+}
+
+TEST(XmlDocument, WrongExpressionsSelectNothingAndAreLoggedOnce) {
+    const auto xml = document("<a/>");
+    const test::CapturedLog log;
+    for (const char* wrong : {"/a[", "@", "'open", "file://~/rules/x.xpath", "/a)|(/a"}) {
+        EXPECT_FALSE(xml->isMatchingXPath(wrong)) << wrong;
+        EXPECT_THAT(xml->nodesForXPath(wrong), IsEmpty());
+    }
+    EXPECT_EQ(log.messages().size(), 5U);
+    EXPECT_THAT(log.messages()[0], HasSubstr("XPath \"/a[\", character 3: "));
+}
+
+TEST(XmlDocument, HostileExpressionsEnd) {
+    const test::CapturedLog log;
+    Error error;
+    const std::string deep = std::string(20000, '(') + "1" + std::string(20000, ')');
+    EXPECT_EQ(XPathExpression::compile(deep, &error), nullptr);
+    EXPECT_FALSE(error.message.empty());
+    EXPECT_EQ(XPathExpression::compile(std::string(70000, 'a')), nullptr);
+    std::string wide = "<a>";
+    for (int i = 0; i < 5000; ++i) wide += "<b/>";
+    const auto start = std::chrono::steady_clock::now();
+    EXPECT_FALSE(document(wide + "</a>")->isMatchingXPath("//*[//*[//*[contains(@x,'1')]]]"));
+    EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(30));
+    EXPECT_EQ(log.messages().size(), 1U);
+}
+
+TEST(XmlDocument, HostileEntitiesAndNestingEnd) {
+    const test::CapturedLog log;
+    std::string bomb = "<!DOCTYPE l [<!ENTITY a 'aaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaa'>";
+    for (char c = 'b'; c < 'l'; ++c) {
+        bomb += std::string("<!ENTITY ") + c + " '";
+        for (int i = 0; i < 16; ++i) bomb += std::string("&") + static_cast<char>(c - 1) + ";";
+        bomb += "'>";
+    }
+    for (const char* body : {"]><Patch><c>&k;</c></Patch>", "]><Patch name='&k;'><c/></Patch>"}) {
+        const auto start = std::chrono::steady_clock::now();
+        const auto xml = document(bomb + body);
+        EXPECT_FALSE(xml->isMatchingXPath("/Patch[string-length(.)>100000 or string-length(@name)>100000]"));
+        EXPECT_FALSE(xml->isMatchingXPath("/Patch[contains(@name,'aaa')]"));
+        EXPECT_LT(xml->JSONString().value_or("").size(), 100000U);
+        EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(10));
+    }
+    std::string deep;
+    for (int i = 0; i < 10000; ++i) deep += "<a>";
+    EXPECT_TRUE(document(deep)->isMatchingXPath("/a/a/a"));
+    EXPECT_TRUE(document(deep)->JSONString().has_value());
+}
+
+TEST(XmlDocument, NothingOutsideIsEverRead) {
+    const test::TemporaryFolder folder;
+    const test::CapturedLog log;
+    const std::string secret = "file://" + folder.write("secret.txt", "secret words");
+    const std::string dtd = "file://" + folder.write("outside.dtd", "<!ENTITY e 'secret words'>");
+    for (const std::string& xml : {"<!DOCTYPE a [<!ENTITY e SYSTEM '" + secret + "'>]><a>&e;</a>",
+                                   "<!DOCTYPE a SYSTEM '" + dtd + "'><a>&e;</a>",
+                                   "<!DOCTYPE a [<!ENTITY % p SYSTEM '" + dtd + "'>%p;]><a>&e;</a>"}) {
+        EXPECT_FALSE(document(xml)->isMatchingXPath("/a[contains(.,'secret')]")) << xml;
+        EXPECT_THAT(document(xml)->JSONString().value_or(""), testing::Not(HasSubstr("secret"))) << xml;
+        EXPECT_THAT(compactJson(xml), testing::Not(HasSubstr("secret"))) << xml;
+    }
+}
+
+/// The walk of common expressions must agree with the XML library in everything.
+TEST(LocationPath, SelectsTheNodeThatTheLibrarySelects) {
+    const std::string text =
+        "<P xmlns:x='u' m=''><C m='Mono' v='1.50' w=' 7 ' n='abc'/>"
+        "<C m='Stereo' v='x' x:m='Mono'><D v='-1'/><D v='2' k='Vorthal &amp; more'/><D/></C><x:C m='q'/>text"
+        "<C m=\"it's\" v='' w='1e3'><D v='2' k='b'/><D v='2' k='b' l='1'/></C></P>";
+    const auto plain = document(text);
+    const auto withEntities = document("<!DOCTYPE P [<!ENTITY e 'x'>]>" + replaceAll(text, "&amp;", "&e;"));
+    const char* const expressions[] = {"/P",
+                                       "/Q",
+                                       "/P/C",
+                                       "/P/C[1]",
+                                       "/P/C[2]",
+                                       "/P/C[3]",
+                                       "/P/C[4]",
+                                       "/P/C/D[2]",
+                                       "(/P/C/D)[4]",
+                                       "(/P/C/D)[6]",
+                                       " ( / P / C [ @m = 'Stereo' ] ) [ 1 ] ",
+                                       "/P/C[@m='Mono']",
+                                       "/P/C[@m!='Mono']",
+                                       "/P/C[@x!='Mono']",
+                                       "/P/C[@m=\"it's\"]",
+                                       "/P/C[@v=1]",
+                                       "/P/C[@v>1]",
+                                       "/P/C[@v<1]",
+                                       "/P/C[@v!=1]",
+                                       "/P/C[@w=7]",
+                                       "/P/C[@w>=1000]",
+                                       "/P/C[@w<=7]",
+                                       "/P/C/D[@v<0]",
+                                       "/P/C/D[@v>=2][2]",
+                                       "/P/C/D[2][@v>=2]",
+                                       "/P/C/D[@k][@l]",
+                                       "/P/C/D[@k and @l]",
+                                       "/P/C/D[@k='zz' or @l=1]",
+                                       "/P/C/D[@k='zz' or @l=1 and @v=3]",
+                                       "/P/C/D[(@k='b' or @l) and @v=2][2]",
+                                       "/P/C[contains(@m,'ere')]",
+                                       "/P/C[contains(@zz,'')]",
+                                       "/P/C[contains(@zz,'a')]",
+                                       "/P/C[starts-with(@n,'ab')]",
+                                       "/P/C[starts-with(@n,'b')]",
+                                       "/P/C/D[contains(@k,'rth')]",
+                                       "/P/C/D[@k='Vorthal & more']",
+                                       "/P[@m='']",
+                                       "/P[@m]",
+                                       "/P[@m=0]",
+                                       "/P/C[@m='Mono'and@v=1]",
+                                       "/P/C/D[@v=2 and contains(@k,'b') and @l>0]"};
+    for (const char* expression : expressions) {
+        const auto compiled = XPathExpression::compile(expression);
+        ASSERT_NE(compiled, nullptr) << expression;
+        EXPECT_TRUE(compiled->isLocationPath()) << expression;
+        for (const auto& xml : {plain, withEntities}) {
+            const auto all = xml->nodesForXPath(expression);
+            const auto first = xml->firstNodeForXPath(expression);
+            EXPECT_EQ(first ? first->XMLData() : "none", all.empty() ? "none" : all.front()->XMLData())
+                << expression;
+        }
+    }
+}
+
+TEST(LocationPath, LeavesOtherFormsToTheLibrary) {
+    for (const char* other : {"//C",
+                              "/P/*",
+                              "/P/@m",
+                              "/P/C | /P/D",
+                              "/P/C[last()]",
+                              "/P/C[@v=1.5]",
+                              "/P/x:C",
+                              "P/C",
+                              "/P/C[D]",
+                              "/P/C[not(@m)]",
+                              "/P/C['1'=@v]",
+                              "/P/C[@v<'2']",
+                              "/P/C[position()=1]",
+                              "/",
+                              "/P/text()",
+                              "/P/child::C",
+                              "/P/C[@v=-1]",
+                              "(/P/C)",
+                              "/P/C[0]",
+                              "count(/P/C)"}) {
+        const auto compiled = XPathExpression::compile(other);
+        ASSERT_NE(compiled, nullptr) << other;
+        EXPECT_FALSE(compiled->isLocationPath()) << other;
+    }
+}
+
+}  // namespace
+}  // namespace qvct
