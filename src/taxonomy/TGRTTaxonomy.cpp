@@ -6,6 +6,7 @@
 #include "platform/TaggingTypes.h"
 #include "platform/Text.h"
 #include "resources/QVCTCompiledResources.h"
+#include "taxonomy/LegacyMappingTable.h"
 #include "taxonomy/TGRTTagging.h"
 
 #include <algorithm>
@@ -289,9 +290,7 @@ std::string TGRTTaxonomy::serializedTaxonomyData() const {
 }
 
 std::vector<std::string> TGRTTaxonomy::mappingExport() const {
-    std::vector<std::string> rows = {
-        "Type;Legacy Keyword;Legacy Keyword Sub;New Taxonomy Keyword 1;New Taxonomy Keyword 2;"
-        "New Taxonomy Keyword 3;New Taxonomy Keyword 4;Comments, Questions"};
+    std::vector<std::string> rows = {std::string(kLegacyMappingHeader)};
     for (const auto& tag : allTags()) rows.push_back(mappingExportForTag(*tag));
     return rows;
 }
