@@ -19,6 +19,8 @@ std::shared_ptr<TGRTCategory> TGRTCategory::initWithIdentifier(std::string ident
 void TGRTCategory::addTag(const std::shared_ptr<TGRTTag>& tag) {
     if (!tag) return;
     ++revision_;
+    // A root tag that equals one that is here changes nothing.
+    if (!tag->parent() && tag->children().empty() && tags_.contains(*tag)) return;
     const auto parent = tag->parent();
     const bool isOfThisTree = !parent || parent->category().get() == this;
     // A tag that equals another one is only found below its own parent, and one from elsewhere brings a tree

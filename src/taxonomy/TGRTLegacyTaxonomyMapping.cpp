@@ -6,6 +6,7 @@
 #include "platform/Text.h"
 #include "resources/QVCTCompiledResources.h"
 #include "taxonomy/LegacyMappingTable.h"
+#include "taxonomy/LegacyTagLookup.h"
 
 #include <algorithm>
 #include <utility>
@@ -104,8 +105,8 @@ std::shared_ptr<TGRTTag> TGRTLegacyTaxonomyMapping::legacyTagForLine(const Lines
     const std::string& sub = fields[kLegacyMappingSubKeyword];
     std::shared_ptr<TGRTTag> tag;
     if (!type.empty() && !keyword.empty()) {
-        tag = sub.empty() ? taxonomy.findTagForLabel(keyword, type)
-                          : taxonomy.findTagForLabel(sub, keyword, type);
+        tag = sub.empty() ? findLegacyTag(taxonomy, keyword, {}, type)
+                          : findLegacyTag(taxonomy, sub, keyword, type);
     }
     if (!tag) {
         log(fmt::format("No legacy tag found for: {} {} {}", type, keyword, sub));

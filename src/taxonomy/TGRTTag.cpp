@@ -30,7 +30,11 @@ std::shared_ptr<TGRTTag> TGRTTag::initWithLabel(std::string_view rawLabel,
     tag->parent_ = parentTag;
     tag->hash_ = stringHash(fmt::format("{}||{}||{}", tag->label_, labelOrNone(parentTag),
                                         category ? category->identifier() : std::string{}));
-    if (parentTag) parentTag->children_.insert(tag);
+    if (parentTag) {
+        // Of two equal children the later one stays.
+        parentTag->children_.erase(*tag);
+        parentTag->children_.insert(tag);
+    }
     tag->category_ = category;
     if (category) category->addTag(tag);
     return tag;
@@ -140,7 +144,7 @@ bool TGRTTag::isEqual(const Object& other) const {
 
 std::string TGRTTag::description() const {
     return fmt::format("<TGRTTag {}> label: {} parentTag: {} category: {}", static_cast<const void*>(this),
-                       label_, labelOrNone(parent()), categoryIdentifier());
+                       label_, labelOrNone(parent()), category() ? categoryIdentifier() : "(null)");
 }
 
 }  // namespace qvct

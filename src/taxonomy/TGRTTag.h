@@ -15,6 +15,7 @@
 namespace qvct {
 
 class TGRTCategory;
+class TGRTTag;
 
 /// What a host sees of a tag.
 class QVContentTaggingTag {
@@ -23,6 +24,9 @@ class QVContentTaggingTag {
     virtual std::string label() const = 0;
     /// The names of the value steps; empty for most tags.
     virtual std::vector<std::string> enumeratedLabels() const = 0;
+    virtual std::shared_ptr<TGRTTag> parent() const = 0;
+    virtual const ObjectSet<TGRTTag>& children() const = 0;
+    virtual std::shared_ptr<TGRTCategory> category() const = 0;
     /// 1 bipolar; 2 a flag, a content pack or a content type; else 0.
     virtual std::int64_t type() const = 0;
 };
@@ -51,11 +55,11 @@ class TGRTTag : public Object, public QVContentTaggingTag, public std::enable_sh
     std::vector<std::string> enumeratedLabels() const override { return valueStepLabels_; }
 
     /// Null for a root tag, and once the parent is gone.
-    std::shared_ptr<TGRTTag> parent() const { return parent_.lock(); }
-    std::shared_ptr<TGRTCategory> category() const { return category_.lock(); }
+    std::shared_ptr<TGRTTag> parent() const override { return parent_.lock(); }
+    std::shared_ptr<TGRTCategory> category() const override { return category_.lock(); }
     /// The category's identifier; empty without category.
     std::string categoryIdentifier() const;
-    const ObjectSet<TGRTTag>& children() const { return children_; }
+    const ObjectSet<TGRTTag>& children() const override { return children_; }
     /// Takes the child over from its current parent's children. The child's own link upward stays as it is.
     void addChild(const std::shared_ptr<TGRTTag>& tag);
     void removeChild(const std::shared_ptr<TGRTTag>& tag);
