@@ -1,8 +1,6 @@
-#include "platform/FileAccess.h"
-#include "platform/ResourceBundle.h"
 #include "platform/Text.h"
 #include "platform/UserDefaults.h"
-#include "resources/QVCTCompiledResources.h"
+#include "resources/PackDisplayNames.h"
 #include "taxonomy/QVTagIdentifierUtility.h"
 #include "taxonomy/TGRTTaxonomy.h"
 
@@ -32,14 +30,6 @@ constexpr std::array<std::pair<const char*, const char*>, 12> kKeyNames = {{{"C"
 
 constexpr std::array<std::pair<const char*, const char*>, 3> kAdjustments = {
     {{"Generative Instrument Loop", "Drummer Loop"}, {"Non-rhythmic", "Non-Rhythmic"}, {" KeyType", ""}}};
-
-/// "identifier;name" of every content pack, from the resource folder or the compiled copy.
-std::vector<std::string> packDisplayNameLines() {
-    if (const auto path = ResourceBundle::pathForResource("PackDisplayNames", "csv")) {
-        if (const auto text = readTextFile(*path)) return split(replaceAll(*text, "\r\n", "\n"), "\n");
-    }
-    return QVCTCompiledResources::PackDisplayNames().value_or(std::vector<std::string>{});
-}
 
 void replaceIfPresent(Localization& strings, const std::string& key, std::string_view value) {
     if (const auto entry = strings.find(key); entry != strings.end()) entry->second = value;
@@ -80,13 +70,7 @@ Localization TGRTTaxonomy::localizationDictionary() const {
     for (const auto& category : categories_) {
         strings[category->identifier()] = shown(category->identifier(), reversed);
     }
-    for (const std::string& line : packDisplayNameLines()) {
-        const std::size_t separator = line.find(';');
-        if (separator != std::string::npos) {
-            replaceIfPresent(strings, line.substr(0, separator),
-                             std::string_view(line).substr(separator + 1));
-        }
-    }
+    for (const auto& [identifier, name] : packDisplayNames()) replaceIfPresent(strings, identifier, name);
     for (const auto& [key, name] : kKeyNames) replaceIfPresent(strings, key, name);
     for (auto& [key, value] : strings) {
         for (const auto& [from, to] : kAdjustments) value = replaceAll(value, from, to);

@@ -1,0 +1,50 @@
+#pragma once
+
+#include "metadata/TGRTContentInfo.h"
+#include "metadata/TGRTMetaData.h"
+#include "platform/Error.h"
+#include "platform/ObjectSet.h"
+#include "platform/Url.h"
+#include "taxonomy/TGRTTagging.h"
+
+#include <memory>
+
+namespace qvct {
+
+/// How a record is written.
+struct ContentWriteOptions {
+    bool keepsTimes = false;  ///< The rewritten file keeps its times of access and change.
+    /// Audio files: the new file is compared with the old one before it takes its place, and abandoned when
+    /// more than our record differs.
+    bool verifies = false;
+};
+
+// The writers of an item's parts. Each answers whether the file now holds what was written, and else fills
+// the error with path and reason. Files are replaced whole (see `replaceFileByPieces`), so that on failure
+// the old one stands untouched. What cannot be read is never written over. Writers have no state.
+
+class TGRTTaggingsWriter {
+  public:
+    virtual ~TGRTTaggingsWriter() = default;
+    /// Replaces the stored taggings. The stored UUID is removed: the content is to be identified anew.
+    virtual bool writeTaggings(const ObjectSet<TGRTTagging>& taggings, const URL& url, Error* error = nullptr,
+                               const ContentWriteOptions& options = {}) const = 0;
+};
+
+class TGRTContentInfoWriter {
+  public:
+    virtual ~TGRTContentInfoWriter() = default;
+    /// Replaces the stored content info; null counts as an empty one.
+    virtual bool writeContentInfo(const std::shared_ptr<const TGRTContentInfo>& contentInfo, const URL& url,
+                                  Error* error = nullptr, const ContentWriteOptions& options = {}) const = 0;
+};
+
+class TGRTMetaDataWriter {
+  public:
+    virtual ~TGRTMetaDataWriter() = default;
+    /// Stores the record. Bundles, settings and presets give a record without file type that of their kind.
+    virtual bool writeMetaData(const std::shared_ptr<TGRTMetaData>& metaData, const URL& url,
+                               Error* error = nullptr, const ContentWriteOptions& options = {}) const = 0;
+};
+
+}  // namespace qvct

@@ -1,0 +1,75 @@
+#include "formats/StoredRecord.h"
+
+#include "platform/FileAccess.h"
+#include "platform/FileReplacement.h"
+#include "platform/PropertyListFile.h"
+#include "platform/Text.h"
+
+#include <fmt/format.h>
+#include <sys/stat.h>
+
+namespace qvct {
+namespace {
+
+std::optional<PropertyList::Dictionary> parseStoredDictionary(const std::string& bytes, Error* error) {
+    if (bytes.empty()) return PropertyList::Dictionary{};
+    Error reason;
+    auto value = parsePropertyList(bytes, &reason);
+    if (value && value->dictionary() != nullptr) return std::move(*value->dictionary());
+    fail(error, kErrorMalformed,
+         fmt::format("not written over, since what is there cannot be read ({})",
+                     value ? "no dictionary" : reason.message));
+    return std::nullopt;
+}
+
+}  // namespace
+
+bool changeStoredFile(
+    const std::string& path,
+    const std::function<std::optional<std::string>(const std::string& stored, Error* error)>& change,
+    Error* error, const ContentWriteOptions& options) {
+    struct stat status {};
+    std::string stored;
+    FileReplacementOptions how;
+    how.keepsTimes = options.keepsTimes;
+    if (::stat(path.c_str(), &status) == 0) {
+        how.expected = FileStamp::of(status);
+        const auto bytes = readFile(path, error);
+        if (!bytes) return false;
+        stored.assign(bytes->begin(), bytes->end());
+    }
+    Error reason;
+    auto changed = change(stored, &reason);
+    if (!changed) {
+        return fail(error, static_cast<ErrorCode>(reason.code),
+                    fmt::format("{}: {}", printable(path), reason.message));
+    }
+    if (how.expected && *changed == stored) return true;
+    const FilePiece whole{.bytes = std::move(*changed)};
+    return replaceFileByPieces(path, {&whole, 1}, how, error);
+}
+
+bool changeStoredDictionary(const std::string& path,
+                            const std::function<void(PropertyList::Dictionary&)>& change, Error* error,
+                            const ContentWriteOptions& options) {
+    const auto changeBytes = [&change](const std::string& stored,
+                                       Error* reason) -> std::optional<std::string> {
+        auto dictionary = parseStoredDictionary(stored, reason);
+        if (!dictionary) return std::nullopt;
+        change(*dictionary);
+        const bool isBinary = stored.starts_with("bplist");
+        std::string bytes = serializePropertyList(
+            std::move(*dictionary), isBinary ? PropertyListFormat::binary : PropertyListFormat::xml);
+        if (!bytes.empty()) return bytes;
+        fail(reason, kErrorInvalidArgument, "the record holds a text that cannot be stored");
+        return std::nullopt;
+    };
+    return changeStoredFile(path, changeBytes, error, options);
+}
+
+bool failForMissingRecord(const std::string& path, Error* error) {
+    return fail(error, kErrorInvalidArgument,
+                fmt::format("{}: there is no record to write", printable(path)));
+}
+
+}  // namespace qvct

@@ -1,0 +1,32 @@
+#pragma once
+
+#include "formats/ContentWriters.h"
+#include "platform/Error.h"
+#include "platform/PropertyList.h"
+
+#include <functional>
+#include <optional>
+#include <string>
+
+namespace qvct {
+
+// How records that lie in files of their own, or in text, are changed: read, changed in memory, replaced
+// whole. A file that somebody else changes meanwhile is an error and stays as it is; nothing is written when
+// nothing changes.
+
+/// `change` makes the new bytes of the old (none for a file that is not there), or fills the error.
+bool changeStoredFile(
+    const std::string& path,
+    const std::function<std::optional<std::string>(const std::string& stored, Error* error)>& change,
+    Error* error, const ContentWriteOptions& options);
+
+/// The same for a property list. Entries that `change` leaves alone stay, in their order. A new file is XML,
+/// one that is there keeps its encoding; one that cannot be read as a dictionary is not written over.
+bool changeStoredDictionary(const std::string& path,
+                            const std::function<void(PropertyList::Dictionary&)>& change, Error* error,
+                            const ContentWriteOptions& options);
+
+/// Fails because the caller handed in no record; names the path.
+bool failForMissingRecord(const std::string& path, Error* error);
+
+}  // namespace qvct

@@ -1,0 +1,45 @@
+#pragma once
+
+#include "formats/TGRTMetaDataReader.h"
+#include "taxonomy/TGRTTaxonomy.h"
+
+#include <memory>
+#include <span>
+#include <string_view>
+#include <utility>
+
+namespace qvct {
+
+/// Base of all readers. It reads nothing itself.
+///
+/// Readers are immutable: several threads may use one, as far as its taxonomy allows. A writable taxonomy
+/// grows by the labels that a file holds and it does not know.
+class TGRTBaseMetaDataReader : public TGRTMetaDataReader, public TGRTTaggingsReader {
+  public:
+    /// REQUIRES: the taxonomy is not null.
+    static std::shared_ptr<TGRTBaseMetaDataReader> initWithTaxonomy(std::shared_ptr<TGRTTaxonomy> taxonomy) {
+        return std::shared_ptr<TGRTBaseMetaDataReader>(new TGRTBaseMetaDataReader(std::move(taxonomy)));
+    }
+
+    /// In which labels are resolved.
+    const std::shared_ptr<TGRTTaxonomy>& taxonomy() const { return taxonomy_; }
+
+    std::shared_ptr<TGRTMetaData> readMetaDataFromURL(const URL& url, std::uint64_t options,
+                                                      Error* error = nullptr) const override;
+    bool readUUID(std::string* uuid, std::int64_t* fileType, ObjectSet<TGRTTagging>* taggings,
+                  ObjectSet<TGRTKeyValue>* keyValues, std::uint64_t options, const URL& url) const override;
+    ObjectSet<TGRTTagging> taggingsForFileURL(const URL& url) const override;
+    ObjectSet<TGRTTagging> taggingsForFileURL(const URL& url, std::uint64_t options) const override;
+
+  protected:
+    explicit TGRTBaseMetaDataReader(std::shared_ptr<TGRTTaxonomy> taxonomy)
+        : taxonomy_(std::move(taxonomy)) {}
+
+    /// Whether the extension, in lower case, is one of those.
+    static bool isExtensionIn(std::string_view extension, std::span<const std::string_view> lowercased);
+
+  private:
+    std::shared_ptr<TGRTTaxonomy> taxonomy_;
+};
+
+}  // namespace qvct

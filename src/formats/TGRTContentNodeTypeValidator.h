@@ -1,0 +1,39 @@
+#pragma once
+
+#include "formats/ContentWriters.h"
+#include "formats/TGRTMetaDataReader.h"
+#include "platform/Url.h"
+
+#include <memory>
+#include <optional>
+
+namespace qvct {
+
+/// What a host can do with an item; a bit set.
+enum ItemActions : unsigned {
+    kItemLoadableOnTrack = 1,
+    kItemLoadableInPlugIn = 2,
+    kItemCanPrelisten = 4,
+    kItemInsertableOnTrack = 8
+};
+
+/// Decides whether a URL is content of its kind, and hands out the reader and the writers for it: null for
+/// what is not.
+class TGRTContentNodeTypeValidator {
+  public:
+    virtual ~TGRTContentNodeTypeValidator() = default;
+
+    virtual bool isValidContentTypeAtFileURL(const URL& url) const = 0;
+    /// ItemActions.
+    virtual unsigned itemActionsForFileURL(const URL& url) const = 0;
+    /// The audio file to play for the item.
+    virtual std::optional<URL> prelistenURLForFileURL(const URL& url) const = 0;
+
+    virtual std::shared_ptr<TGRTMetaDataReader> metaDataReaderForFileURL(const URL& url) const = 0;
+    virtual std::shared_ptr<TGRTTaggingsReader> taggingReaderForFileURL(const URL& url) const = 0;
+    virtual std::shared_ptr<TGRTTaggingsWriter> taggingWriterForFileURL(const URL& url) const = 0;
+    virtual std::shared_ptr<TGRTContentInfoWriter> contentInfoWriterForFileURL(const URL& url) const = 0;
+    virtual std::shared_ptr<TGRTMetaDataWriter> metaDataWriterForFileURL(const URL& url) const = 0;
+};
+
+}  // namespace qvct

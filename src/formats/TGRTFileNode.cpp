@@ -1,0 +1,88 @@
+#include "formats/TGRTFileNode.h"
+
+#include "formats/TGRTMetaDataReaderFactory.h"
+#include "formats/audiofile/TGRTAudioFileTypeValidator.h"
+#include "formats/bundle/TGRTBundleTypeValidators.h"
+#include "formats/preset/TGRTVorthalPresetTypeValidator.h"
+#include "formats/settings/TGRTCstSxvPstTypeValidator.h"
+#include "platform/Text.h"
+
+#include <algorithm>
+#include <array>
+
+#include <fmt/format.h>
+
+namespace qvct {
+
+std::shared_ptr<TGRTFileNode> TGRTFileNode::nodeWithFileURL(const URL& url) {
+    return std::shared_ptr<TGRTFileNode>(new TGRTFileNode(url));
+}
+
+std::shared_ptr<const TGRTContentNodeTypeValidator> TGRTFileNode::validatorForFileURL(const URL& url) {
+    using Pointer = std::shared_ptr<const TGRTContentNodeTypeValidator>;
+    static const std::array<Pointer, 6> validators = {
+        std::make_shared<TGRTPatchTypeValidator>(),     std::make_shared<TGRTOstraProjectTypeValidator>(),
+        std::make_shared<TGRTCstSxvPstTypeValidator>(), std::make_shared<TGRTVorthalPresetTypeValidator>(),
+        std::make_shared<TGRTTavioLoopTypeValidator>(), std::make_shared<TGRTAudioFileTypeValidator>()};
+    const auto hit = std::find_if(validators.begin(), validators.end(), [&url](const Pointer& validator) {
+        return validator->isValidContentTypeAtFileURL(url);
+    });
+    return hit == validators.end() ? nullptr : *hit;
+}
+
+std::shared_ptr<TGRTMetaData> TGRTFileNode::readMetaDataWithOptions(std::uint64_t options,
+                                                                    Error* error) const {
+    if (const auto reader = TGRTMetaDataReaderFactory::metaDataReaderForURL(url_)) {
+        return reader->readMetaDataFromURL(url_, options, error);
+    }
+    const auto reader = metaDataReaderForFileURL(url_);
+    if (reader) return reader->readMetaDataFromURL(url_, options, error);
+    fail(error, kErrorInvalidArgument, fmt::format("{}: no kind of content", printable(url_.path())));
+    return nullptr;
+}
+
+unsigned TGRTFileNode::itemActions() const {
+    const auto kind = validator();
+    return kind ? kind->itemActionsForFileURL(url_) : 0;
+}
+
+std::optional<URL> TGRTFileNode::prelistenURL() const {
+    const auto kind = validator();
+    return kind ? kind->prelistenURLForFileURL(url_) : std::nullopt;
+}
+
+std::shared_ptr<TGRTMetaDataReader> TGRTFileNode::metaDataReaderForFileURL(const URL& url) const {
+    const auto kind = validatorForFileURL(url);
+    return kind ? kind->metaDataReaderForFileURL(url) : nullptr;
+}
+
+std::shared_ptr<TGRTTaggingsReader> TGRTFileNode::taggingReaderForFileURL(const URL& url) const {
+    const auto kind = validatorForFileURL(url);
+    return kind ? kind->taggingReaderForFileURL(url) : nullptr;
+}
+
+std::shared_ptr<TGRTTaggingsWriter> TGRTFileNode::taggingWriterForFileURL(const URL& url) const {
+    const auto kind = validatorForFileURL(url);
+    return kind ? kind->taggingWriterForFileURL(url) : nullptr;
+}
+
+std::shared_ptr<TGRTContentInfoWriter> TGRTFileNode::contentInfoWriterForFileURL(const URL& url) const {
+    const auto kind = validatorForFileURL(url);
+    return kind ? kind->contentInfoWriterForFileURL(url) : nullptr;
+}
+
+std::shared_ptr<TGRTMetaDataWriter> TGRTFileNode::metaDataWriterForFileURL(const URL& url) const {
+    const auto kind = validatorForFileURL(url);
+    return kind ? kind->metaDataWriterForFileURL(url) : nullptr;
+}
+
+bool TGRTFileNode::isEqual(const Object& other) const {
+    const auto* node = dynamic_cast<const TGRTFileNode*>(&other);
+    return node != nullptr && node->url_ == url_;
+}
+
+std::string TGRTFileNode::description() const {
+    return fmt::format("<TGRTFileNode {}> {}", static_cast<const void*>(this), url_.absoluteString());
+}
+
+}  // namespace qvct

@@ -1,0 +1,21 @@
+#pragma once
+
+#include "formats/TGRTBaseMetaDataReader.h"
+#include "platform/Url.h"
+#include "taxonomy/TGRTTaxonomy.h"
+
+#include <memory>
+
+namespace qvct {
+
+/// Picks the reader for a URL by its extension alone, whatever its case. The file is not opened.
+class TGRTMetaDataReaderFactory {
+  public:
+    /// Null for an extension of no content. REQUIRES: the taxonomy is not null.
+    static std::shared_ptr<TGRTBaseMetaDataReader> metaDataReaderForURL(
+        const URL& url, const std::shared_ptr<TGRTTaxonomy>& taxonomy);
+    /// With the shared writable default taxonomy.
+    static std::shared_ptr<TGRTBaseMetaDataReader> metaDataReaderForURL(const URL& url);
+};
+
+}  // namespace qvct

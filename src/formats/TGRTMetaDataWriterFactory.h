@@ -1,0 +1,18 @@
+#pragma once
+
+#include "formats/ContentWriters.h"
+#include "platform/Url.h"
+
+#include <memory>
+
+namespace qvct {
+
+/// Picks the writer for a URL as its file node does; null where there is none.
+class TGRTMetaDataWriterFactory {
+  public:
+    static std::shared_ptr<TGRTTaggingsWriter> taggingWriterForURL(const URL& url);
+    static std::shared_ptr<TGRTContentInfoWriter> contentInfoWriterForURL(const URL& url);
+    static std::shared_ptr<TGRTMetaDataWriter> metaDataWriterForURL(const URL& url);
+};
+
+}  // namespace qvct

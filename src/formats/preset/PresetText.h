@@ -1,0 +1,58 @@
+#pragma once
+
+#include "platform/Error.h"
+
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace qvct {
+
+/// The text of a synth preset (docs/formats/synth-preset.md): lines in sections, of which we read and rewrite
+/// those that we know. All others come out byte for byte, in their order, line ends included.
+class PresetText {
+  public:
+    /// "key = value" of a section, both unescaped.
+    struct Item {
+        std::string key;
+        std::string value;
+        bool operator==(const Item&) const = default;
+    };
+    using Items = std::vector<Item>;
+
+    /// Nothing, and an error with the line, when the text is not UTF-8. Sections that are not closed reach to
+    /// the next one.
+    static std::optional<PresetText> parse(std::string_view text, Error* error = nullptr);
+
+    /// The items of all sections of that name, in their order; lines that are no items are passed over.
+    Items items(std::string_view section) const;
+
+    /// Replaces those items of a section whose keys are `owned` by `replacement`, which takes the place of
+    /// the first of them, or follows the section's last line. A section that is not there is added at the
+    /// end, unless there is nothing to put into it.
+    void setItems(std::string_view section, const std::vector<std::string_view>& owned,
+                  const Items& replacement);
+
+    /// The line of the first section that is not closed; such a text cannot be rewritten with certainty.
+    std::optional<std::size_t> firstUnclosedSection() const { return firstUnclosed_; }
+
+    std::string text() const;
+
+  private:
+    struct Line {
+        std::string bytes;    // with what ends it
+        std::string section;  // empty outside of sections, and for the lines that open and close one
+        bool closes = false;
+    };
+
+    static std::optional<Item> itemOfLine(std::string_view line);
+    std::string lineOf(const Item& item) const;
+    void appendSection(std::string_view section, const Items& items);
+
+    std::vector<Line> lines_;
+    std::string lineEnd_ = "\n";
+    std::optional<std::size_t> firstUnclosed_;
+};
+
+}  // namespace qvct

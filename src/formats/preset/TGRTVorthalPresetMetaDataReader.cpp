@@ -1,0 +1,44 @@
+#include "formats/preset/TGRTVorthalPresetMetaDataReader.h"
+
+#include "formats/preset/PresetRecord.h"
+#include "formats/preset/TGRTVorthalLegacyTaggingParser.h"
+#include "platform/FileAccess.h"
+#include "platform/Text.h"
+
+#include <array>
+
+#include <fmt/format.h>
+
+namespace qvct {
+
+bool TGRTVorthalPresetMetaDataReader::supportsFileExtension(std::string_view extension) {
+    constexpr std::array<std::string_view, 1> extensions = {"vcp"};
+    return isExtensionIn(extension, extensions);
+}
+
+std::shared_ptr<TGRTMetaData> TGRTVorthalPresetMetaDataReader::readMetaDataFromURL(const URL& url,
+                                                                                   std::uint64_t options,
+                                                                                   Error* error) const {
+    const auto bytes = readFile(url.path(), error, kLargestPreset);
+    if (!bytes) return nullptr;
+    Error reason;
+    const auto preset =
+        PresetText::parse({reinterpret_cast<const char*>(bytes->data()), bytes->size()}, &reason);
+    if (!preset) {
+        fail(error, static_cast<ErrorCode>(reason.code),
+             fmt::format("{}: {}", printable(url.path()), reason.message));
+        return nullptr;
+    }
+    auto record = recordOfPreset(*preset, *taxonomy());
+    auto taggings = record->taggings();
+    if ((options & kReadLegacyTaggings) != 0) {
+        taggings.insertAll(TGRTVorthalLegacyTaggingParser::legacyFormatTaggingsForFileURL(url));
+    }
+    if ((options & kReadMappedTaggings) != 0) {
+        taggings.insertAll(TGRTVorthalLegacyTaggingParser::mappedTaggingsForFileURL(url));
+    }
+    record->setTaggings(std::move(taggings));
+    return record;
+}
+
+}  // namespace qvct

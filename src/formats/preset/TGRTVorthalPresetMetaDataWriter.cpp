@@ -1,0 +1,65 @@
+#include "formats/preset/TGRTVorthalPresetMetaDataWriter.h"
+
+#include "formats/StoredRecord.h"
+#include "formats/preset/PresetRecord.h"
+#include "platform/FileAccess.h"
+#include "platform/TaggingTypes.h"
+#include "platform/Text.h"
+
+#include <functional>
+
+#include <fmt/format.h>
+
+namespace qvct {
+namespace {
+
+bool changePreset(const URL& url, const std::function<void(PresetText&)>& change, Error* error,
+                  const ContentWriteOptions& options) {
+    if (!fileExists(url.path())) {
+        return fail(error, kErrorUnreadable, fmt::format("{}: no such preset", printable(url.path())));
+    }
+    const auto changeText = [&change](const std::string& stored,
+                                      Error* reason) -> std::optional<std::string> {
+        auto preset = PresetText::parse(stored, reason);
+        if (!preset) return std::nullopt;
+        if (const auto line = preset->firstUnclosedSection()) {
+            fail(reason, kErrorMalformed, fmt::format("line {}: the section does not end", *line));
+            return std::nullopt;
+        }
+        change(*preset);
+        return preset->text();
+    };
+    return changeStoredFile(url.path(), changeText, error, options);
+}
+
+}  // namespace
+
+bool TGRTVorthalPresetMetaDataWriter::writeTaggings(const ObjectSet<TGRTTagging>& taggings, const URL& url,
+                                                    Error* error, const ContentWriteOptions& options) const {
+    return changePreset(
+        url, [&](PresetText& preset) { setTaggings(preset, taggings); }, error, options);
+}
+
+bool TGRTVorthalPresetMetaDataWriter::writeContentInfo(
+    const std::shared_ptr<const TGRTContentInfo>& contentInfo, const URL& url, Error* error,
+    const ContentWriteOptions& options) const {
+    const auto change = [&](PresetText& preset) {
+        setContentInfo(preset, contentInfo ? *contentInfo : *TGRTContentInfo::init());
+    };
+    return changePreset(url, change, error, options);
+}
+
+bool TGRTVorthalPresetMetaDataWriter::writeMetaData(const std::shared_ptr<TGRTMetaData>& metaData,
+                                                    const URL& url, Error* error,
+                                                    const ContentWriteOptions& options) const {
+    if (!metaData) return failForMissingRecord(url.path(), error);
+    if (metaData->fileType() == kFileTypeNone) metaData->setFileType(kFileTypeSynthPreset);
+    const auto change = [&](PresetText& preset) {
+        setTaggings(preset, metaData->taggings());
+        if (metaData->contentInfo()) setContentInfo(preset, *metaData->contentInfo());
+        setDescription(preset, *metaData);
+    };
+    return changePreset(url, change, error, options);
+}
+
+}  // namespace qvct

@@ -1,0 +1,83 @@
+#include "formats/settings/TGRTBinaryFileMetaDataReader.h"
+
+#include "formats/settings/CFBinaryPlistFindTrailer.h"
+#include "platform/FileAccess.h"
+#include "platform/Log.h"
+#include "platform/ProcessArguments.h"
+#include "platform/PropertyListFile.h"
+#include "platform/Text.h"
+
+#include <algorithm>
+#include <array>
+
+#include <fmt/format.h>
+
+namespace qvct {
+
+std::optional<EmbeddedPropertyList> findEmbeddedPropertyList(std::span<const std::uint8_t> bytes,
+                                                             Error* error) {
+    constexpr std::string_view magic = "bplist00";
+    const auto start = std::search(bytes.begin(), bytes.end(), magic.begin(), magic.end());
+    if (start == bytes.end()) {
+        fail(error, kErrorNoPropertyList, "no embedded property list");
+        return std::nullopt;
+    }
+    EmbeddedPropertyList found{static_cast<std::uint64_t>(start - bytes.begin()), 0, false};
+    const auto rest = bytes.subspan(found.offset);
+    std::uint64_t trailer = 0;
+    if (!CFBinaryPlistFindTrailer(rest.data(), rest.size(), &trailer)) {
+        fail(error, kErrorNoPropertyList,
+             fmt::format("the property list at byte {} has no end", found.offset));
+        return std::nullopt;
+    }
+    found.length = trailer + kBinaryPlistTrailerLength;
+    Error reason;
+    auto value = parsePropertyList(rest.first(found.length), &reason);
+    if (!value) {
+        fail(error, kErrorNoPropertyList,
+             fmt::format("the property list at byte {} cannot be parsed: {}", found.offset, reason.message));
+        return std::nullopt;
+    }
+    found.value = std::move(*value);
+    return found;
+}
+
+bool TGRTBinaryFileMetaDataReader::supportsFileExtension(std::string_view extension) {
+    constexpr std::array<std::string_view, 1> extensions = {"data"};
+    return isExtensionIn(extension, extensions);
+}
+
+std::shared_ptr<TGRTMetaData> TGRTBinaryFileMetaDataReader::readMetaDataFromURL(const URL& url,
+                                                                                std::uint64_t /*options*/,
+                                                                                Error* error) const {
+    const auto extracted = _extractDictionaryFromURL(url, error);
+    const PropertyList::Dictionary dictionary = extracted.value_or(PropertyList::Dictionary{});
+    auto record = TGRTMetaData::init();
+    record->setTaggings(TGRTMetaData::taggingsFromDictionary(dictionary, *taxonomy()));
+    const PropertyList* type = dictionary.value(QVContentTaggingTypeKeyName);
+    if (type != nullptr) record->setFileType(type->integerValue().value_or(kFileTypeNone));
+    const PropertyList* name = dictionary.value(QVContentTaggingDisplayKeyName);
+    if (name != nullptr && name->string() != nullptr) record->setDisplayName(*name->string());
+    if (dictionary.value(QVContentInfoKey) != nullptr) {
+        record->setContentInfo(TGRTMetaData::contentInfoFromDictionary(dictionary));
+    }
+    return record;
+}
+
+std::optional<PropertyList::Dictionary> TGRTBinaryFileMetaDataReader::_extractDictionaryFromURL(
+    const URL& url, Error* error) const {
+    Error reason;
+    std::optional<EmbeddedPropertyList> found;
+    if (const auto bytes = readFile(url.path(), &reason)) found = findEmbeddedPropertyList(*bytes, &reason);
+    if (found && found->value.dictionary() != nullptr) return std::move(*found->value.dictionary());
+    if (found) fail(&reason, kErrorNoPropertyList, "the embedded property list is no dictionary");
+
+    const std::string place = printable(url.path()) + ": ";
+    const std::string_view message = reason.message;
+    const std::string_view why = message.starts_with(place) ? message.substr(place.size()) : message;
+    if (!processHasArgument("-XCTest")) log(fmt::format("Indexing {}{}", place, why));
+    fail(error, kErrorNoPropertyList, fmt::format("{}{}", place, why));
+    return std::nullopt;
+}
+
+}  // namespace qvct

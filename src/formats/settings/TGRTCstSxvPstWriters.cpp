@@ -1,0 +1,48 @@
+#include "formats/settings/TGRTCstSxvPstWriters.h"
+
+#include "formats/StoredRecord.h"
+#include "formats/settings/TGRTCstSxvPstMetaDataReader.h"
+#include "platform/QVContentTaggingTypes.h"
+
+namespace qvct {
+namespace {
+
+URL sideCar(const URL& url) {
+    return TGRTCstSxvPstMetaDataReader::sideCarURLForURL(url);
+}
+
+}  // namespace
+
+bool TGRTCstSxvPstTaggingWriter::writeTaggings(const ObjectSet<TGRTTagging>& taggings, const URL& url,
+                                               Error* error, const ContentWriteOptions& options) const {
+    const auto change = [&](PropertyList::Dictionary& stored) {
+        stored.set(QVContentTaggingKeyName, TGRTTagging::taggingDictionaryForTaggings(taggings));
+        stored.set(QVContentTaggingTypeKeyName,
+                   std::int64_t{QVContentTaggingTypes::fallBackFileTypeForURL(url)});
+        stored.remove(QVContentTaggingUUIDKeyName);
+    };
+    return changeStoredDictionary(sideCar(url).path(), change, error, options);
+}
+
+bool TGRTCstSxvPstContentInfoWriter::writeContentInfo(
+    const std::shared_ptr<const TGRTContentInfo>& contentInfo, const URL& url, Error* error,
+    const ContentWriteOptions& options) const {
+    const auto change = [&contentInfo](PropertyList::Dictionary& stored) {
+        stored.set(QVContentInfoKey, contentInfo ? contentInfo->dictionary() : PropertyList::Dictionary{});
+    };
+    return changeStoredDictionary(sideCar(url).path(), change, error, options);
+}
+
+bool TGRTCstSxvPstMetaDataWriter::writeMetaData(const std::shared_ptr<TGRTMetaData>& metaData, const URL& url,
+                                                Error* error, const ContentWriteOptions& options) const {
+    if (!metaData) return failForMissingRecord(url.path(), error);
+    if (metaData->fileType() == kFileTypeNone) {
+        metaData->setFileType(QVContentTaggingTypes::fallBackFileTypeForURL(url));
+    }
+    const auto change = [&](PropertyList::Dictionary& stored) {
+        stored = metaData->prepareDictionaryForURL(sideCar(url));
+    };
+    return changeStoredDictionary(sideCar(url).path(), change, error, options);
+}
+
+}  // namespace qvct

@@ -1,0 +1,89 @@
+#include "platform/XmlDocument.h"
+
+#include "platform/FileAccess.h"
+#include "platform/Text.h"
+
+#include <limits>
+
+#include <fmt/format.h>
+#include <libxml/parser.h>
+#include <libxml/tree.h>
+#include <libxml/xpath.h>
+#include <libxml/xpathInternals.h>
+
+namespace qvct {
+namespace {
+
+struct Closer {
+    void operator()(xmlParserCtxt* parser) const { xmlFreeParserCtxt(parser); }
+    void operator()(xmlDoc* document) const { xmlFreeDoc(document); }
+    void operator()(xmlXPathContext* context) const { xmlXPathFreeContext(context); }
+    void operator()(xmlXPathObject* result) const { xmlXPathFreeObject(result); }
+    void operator()(xmlChar* text) const { xmlFree(text); }
+};
+template <typename T>
+using Owned = std::unique_ptr<T, Closer>;
+
+/// A file this large takes several times its size in memory once it is parsed.
+constexpr std::uint64_t kLargestXmlFile = 64ULL << 20U;
+
+const xmlChar* xmlText(const std::string& text) {
+    return reinterpret_cast<const xmlChar*>(text.c_str());
+}
+
+}  // namespace
+
+struct XmlDocument::Implementation {
+    Owned<xmlDoc> document;
+};
+
+XmlDocument::XmlDocument(std::unique_ptr<Implementation> implementation)
+    : implementation_(std::move(implementation)) {}
+XmlDocument::~XmlDocument() = default;
+
+std::shared_ptr<XmlDocument> XmlDocument::fromFile(const std::string& path, Error* error) {
+    const auto bytes = readFile(path, error, kLargestXmlFile);
+    if (!bytes) return nullptr;
+    return fromText({reinterpret_cast<const char*>(bytes->data()), bytes->size()}, path, error);
+}
+
+std::shared_ptr<XmlDocument> XmlDocument::fromText(std::string_view text, std::string_view name,
+                                                   Error* error) {
+    static const bool isInitialized = (xmlInitParser(), true);  // before several threads parse at once
+    const Owned<xmlParserCtxt> parser(isInitialized ? xmlNewParserCtxt() : nullptr);
+    if (!parser || text.size() > static_cast<std::size_t>(std::numeric_limits<int>::max())) {
+        fail(error, kErrorTooLarge, fmt::format("{}: too large to be parsed", printable(name)));
+        return nullptr;
+    }
+    constexpr int options = XML_PARSE_RECOVER | XML_PARSE_NONET | XML_PARSE_NOERROR | XML_PARSE_NOWARNING;
+    auto implementation = std::make_unique<Implementation>();
+    implementation->document.reset(xmlCtxtReadMemory(parser.get(), text.data(), static_cast<int>(text.size()),
+                                                     nullptr, nullptr, options));
+    if (!implementation->document) {
+        const char* reason = parser->lastError.message == nullptr ? "no XML" : parser->lastError.message;
+        fail(error, kErrorMalformed,
+             fmt::format("{}, line {}: {}", printable(name), parser->lastError.line,
+                         trimBlanksAndLineBreaks(reason)));
+        return nullptr;
+    }
+    return std::shared_ptr<XmlDocument>(new XmlDocument(std::move(implementation)));
+}
+
+std::vector<std::string> XmlDocument::attributeValues(const std::string& xpath,
+                                                      const std::string& attribute) const {
+    const Owned<xmlXPathContext> context(xmlXPathNewContext(implementation_->document.get()));
+    const Owned<xmlXPathObject> result(context ? xmlXPathEvalExpression(xmlText(xpath), context.get())
+                                               : nullptr);
+    std::vector<std::string> values;
+    if (!result || result->type != XPATH_NODESET || result->nodesetval == nullptr) return values;
+    xmlXPathNodeSetSort(result->nodesetval);
+    for (int i = 0; i < result->nodesetval->nodeNr; ++i) {
+        const xmlNode* node = result->nodesetval->nodeTab[i];
+        const Owned<xmlChar> value(node->type == XML_ELEMENT_NODE ? xmlGetProp(node, xmlText(attribute))
+                                                                  : nullptr);
+        values.emplace_back(value ? reinterpret_cast<const char*>(value.get()) : "");
+    }
+    return values;
+}
+
+}  // namespace qvct
