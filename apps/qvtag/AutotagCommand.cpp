@@ -19,12 +19,18 @@ struct Service {
     std::uint64_t option;
 };
 
-constexpr std::array<Service, 1> kServices = {{{"keywords", QVCTAutoTaggingOptionFilenameKeywords}}};
+constexpr std::array<Service, 6> kServices = {{{"keywords", QVCTAutoTaggingOptionFilenameKeywords},
+                                               {"rules", QVCTAutoTaggingOptionXMLRules},
+                                               {"content-type", QVCTAutoTaggingOptionContentType},
+                                               {"instruments", QVCTAutoTaggingOptionSoftwareInstruments},
+                                               {"user", QVCTAutoTaggingOptionUserGenerated},
+                                               {"translate", QVCTAutoTaggingOptionTranslateTags}}};
 
 struct Options {
     std::vector<std::string> paths;
     std::vector<std::string> services;
     std::string keywordsFile;
+    std::string rulesFile;
 };
 
 struct Item {
@@ -57,12 +63,14 @@ std::uint64_t optionsForServices(const std::vector<std::string>& names, ToolCont
     return bits;
 }
 
-QVTaggingAggregator::Settings keywordMapping(const std::string& file, ToolContext& context) {
+/// The settings in a file; none, and a line on standard error, when it is not one.
+QVTaggingAggregator::Settings settingsIn(const std::string& file, std::string_view what,
+                                         ToolContext& context) {
     if (file.empty()) return std::nullopt;
     Error error;
-    auto mapping = readDictionaryFile(file, &error);
-    if (!mapping) context.itemFailed(fmt::format("{} (using the built-in keywords)", error.message));
-    return mapping;
+    auto settings = readDictionaryFile(file, &error);
+    if (!settings) context.itemFailed(fmt::format("{} (using the built-in {})", error.message, what));
+    return settings;
 }
 
 Json jsonOfItem(const Item& item) {
@@ -112,7 +120,8 @@ void noteTotals(const std::vector<Item>& items, const ToolContext& context) {
 void run(const Options& options, ToolContext& context) {
     const std::uint64_t bits = optionsForServices(options.services, context);
     const auto aggregator =
-        QVTaggingAggregator::initWithRules(std::nullopt, keywordMapping(options.keywordsFile, context));
+        QVTaggingAggregator::initWithRules(settingsIn(options.rulesFile, "rules", context),
+                                           settingsIn(options.keywordsFile, "keywords", context));
     const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
     std::vector<Item> items;
     for (const URL& url : context.contentItems(options.paths)) {
@@ -138,6 +147,9 @@ void addAutotagCommand(CLI::App& app, ToolContext& context) {
     command
         ->add_option("--keywords", options->keywordsFile,
                      "Property list of keywords to use instead of the built-in")
+        ->type_name("FILE");
+    command
+        ->add_option("--rules", options->rulesFile, "Property list of rules to use instead of the built-in")
         ->type_name("FILE");
     command->footer("Example:\n  qvtag autotag --json Loops \"Patches/Warm Pad.patch\"");
     command->callback([options, &context] { run(*options, context); });

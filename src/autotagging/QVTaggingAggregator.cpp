@@ -1,6 +1,15 @@
 #include "autotagging/QVTaggingAggregator.h"
 
+#include "autotagging/QVCTContentTypeTaggingService.h"
 #include "autotagging/QVCTFilenameKeywordExtractorTaggingService.h"
+#include "autotagging/QVCTSoftwareInstrumentTaggingService.h"
+#include "autotagging/QVCTTranslateTagsTaggingService.h"
+#include "autotagging/QVCTUserGeneratedTaggingService.h"
+#include "autotagging/QVCTXMLDocument.h"
+#include "autotagging/QVCTXMLRulesTaggingService.h"
+#include "formats/QVContentEditorFileUtilities.h"
+#include "formats/TGRTFileNode.h"
+#include "platform/LCFileParser.h"
 
 #include <string>
 #include <utility>
@@ -36,15 +45,36 @@ std::shared_ptr<QVTaggingAggregator> QVTaggingAggregator::initWithRules(Settings
         defaultTaggingServicesWithRules(std::move(rules), std::move(keywordMapping))));
 }
 
-QVTaggingAggregator::Services QVTaggingAggregator::defaultTaggingServicesWithRules(Settings /*rules*/,
+QVTaggingAggregator::Services QVTaggingAggregator::defaultTaggingServicesWithRules(Settings rules,
                                                                                    Settings keywordMapping) {
-    return {QVCTFilenameKeywordExtractorTaggingService::initWithKeywordMapping(std::move(keywordMapping))};
+    return {QVCTFilenameKeywordExtractorTaggingService::initWithKeywordMapping(std::move(keywordMapping)),
+            QVCTXMLRulesTaggingService::initWithRules(std::move(rules)),
+            std::make_shared<QVCTContentTypeTaggingService>(),
+            QVCTSoftwareInstrumentTaggingService::init(),
+            std::make_shared<QVCTUserGeneratedTaggingService>(),
+            std::make_shared<QVCTTranslateTagsTaggingService>()};
+}
+
+std::shared_ptr<QVCTXMLDocument> QVTaggingAggregator::xmlDocumentForURL(const URL& url) {
+    const auto cache = QVContentEditorFileUtilities::intermediateCacheURLForURL(url);
+    return cache ? QVCTXMLDocument::initWithContentsOfURL(*cache) : nullptr;
+}
+
+std::shared_ptr<TGRTMetaData> QVTaggingAggregator::metaDataForURL(const URL& url, std::uint64_t options) {
+    return TGRTFileNode::nodeWithFileURL(url)->readMetaDataWithOptions(options);
+}
+
+std::shared_ptr<LCFileData> QVTaggingAggregator::fileDataForURL(const URL& url) {
+    return LCFileParser::fileParserForURL(url)->enhancedFileData();
 }
 
 TagDictionarySet QVTaggingAggregator::tagsWithContentsOfURL(const URL& url, std::uint64_t options) {
+    const auto xmlDocument = xmlDocumentForURL(url);
+    const auto metaData = metaDataForURL(url, options);
+    const auto fileData = fileDataForURL(url);
     TagDictionarySet tags;
     for (const auto& service : taggingServices_) {
-        tags.insertAll(service->tagsWithContentsOfURL(url, nullptr, nullptr, nullptr, options));
+        tags.insertAll(service->tagsWithContentsOfURL(url, xmlDocument, metaData, fileData, options));
     }
     return tags;
 }

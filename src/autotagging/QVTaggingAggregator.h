@@ -41,6 +41,13 @@ class QVTaggingAggregator {
     const std::shared_ptr<TGRTTaxonomy>& taxonomy() const { return taxonomy_; }
     void setTaxonomy(std::shared_ptr<TGRTTaxonomy> taxonomy) { taxonomy_ = std::move(taxonomy); }
 
+    // What the services are given of an item: prepared once a call, each null where the item has none. A host
+    // that has one at hand overrides.
+
+    virtual std::shared_ptr<QVCTXMLDocument> xmlDocumentForURL(const URL& url);
+    virtual std::shared_ptr<TGRTMetaData> metaDataForURL(const URL& url, std::uint64_t options);
+    virtual std::shared_ptr<LCFileData> fileDataForURL(const URL& url);
+
   protected:
     explicit QVTaggingAggregator(Services services) : taggingServices_(std::move(services)) {}
 
