@@ -18,10 +18,6 @@ constexpr std::size_t kTrailerSize = 32;
 /// Values may outnumber the file's bytes by this much (shared leaves are common, shared containers are not).
 constexpr std::uint64_t kExpansionSlack = 1U << 16;
 
-std::string_view textOf(std::span<const std::uint8_t> bytes) {
-    return {reinterpret_cast<const char*>(bytes.data()), bytes.size()};
-}
-
 /// What one object of a binary property list is, read without looking past the end.
 struct Object {
     enum class Kind { leaf, array, dictionary } kind = Kind::leaf;
@@ -262,29 +258,6 @@ class BinaryGraph {
 
 bool isSafeBinaryPropertyList(std::span<const std::uint8_t> bytes, Error* error) {
     return BinaryGraph(bytes, error).check();
-}
-
-bool isSafeXmlPropertyList(std::span<const std::uint8_t> bytes, Error* error) {
-    const std::string_view text = textOf(bytes);
-    int depth = 0;
-    for (std::size_t at = text.find('<'); at != std::string_view::npos; at = text.find('<', at + 1)) {
-        const char first = at + 1 < text.size() ? text[at + 1] : '\0';
-        if (first == '!' || first == '?') {
-            // Tags inside comments and character data are text: they may only make the count too high.
-            continue;
-        }
-        if (first == '/') {
-            depth = std::max(0, depth - 1);
-            continue;
-        }
-        const std::size_t close = text.find('>', at);
-        if (close == std::string_view::npos) break;
-        if (text[close - 1] != '/' && ++depth > kDeepestPropertyList) {
-            return fail(error, kErrorTooLarge,
-                        fmt::format("XML property list, byte {}: nested too deeply", at));
-        }
-    }
-    return true;
 }
 
 }  // namespace qvct

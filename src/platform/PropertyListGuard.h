@@ -13,7 +13,10 @@ namespace qvct {
 /// @cost  O(size), without recursion.
 bool isSafeBinaryPropertyList(std::span<const std::uint8_t> bytes, Error* error);
 
-/// Whether an XML property list nests its elements at most kDeepestPropertyList deep.
+/// Whether an XML property list is well-formed and of its grammar: one value, keys and values in turn, whole
+/// numbers of 64 bits, data in base 64, no entities of its own, nested at most kDeepestPropertyList deep. A
+/// reader that lets faults pass would lose what stands behind them when the file is written again.
+/// @cost  O(size), without recursion.
 bool isSafeXmlPropertyList(std::span<const std::uint8_t> bytes, Error* error);
 
 }  // namespace qvct

@@ -51,6 +51,15 @@ Reading readInChild(const std::string& file, long mostKibibytes) {
             std::chrono::steady_clock::now() - start};
 }
 
+/// Files that lie among the others for having once broken a reader, or for being no property lists.
+bool isSoundAllTheSame(const std::string& file) {
+    return file.ends_with("crash-348c909a0b3532977185f551eb5d2ed04e694883");
+}
+bool isUnsoundAllTheSame(const std::string& file) {
+    return file.ends_with("/amp.plist") || file.ends_with("/invalid_tag.plist") ||
+           file.ends_with("/malformed_dict.bplist") || file.ends_with("/recursion.bplist");
+}
+
 TEST(PropertyListCorpus, HostileListsAreRefusedInTimeAndMemory) {
     QVCT_SKIP_WITHOUT(test::corpus("plists"));
     constexpr long most = 64L * 1024;
@@ -59,14 +68,14 @@ TEST(PropertyListCorpus, HostileListsAreRefusedInTimeAndMemory) {
     const auto xml = filesBelow(test::corpus("plists/libplist/hostile-xml"));
     files.insert(files.end(), xml.begin(), xml.end());
     for (const std::string& file : filesBelow(test::corpus("plists/cpython"))) {
-        if (file.find("invalid_bin") != std::string::npos) files.push_back(file);
+        if (file.find("/valid_") == std::string::npos) files.push_back(file);
     }
     ASSERT_GT(files.size(), 70U);
     for (const std::string& file : files) {
         const Reading reading = readInChild(file, most);
         EXPECT_TRUE(reading.endedWell) << file << ": crashed, or took over 64 MiB";
         EXPECT_LT(reading.seconds, longest) << file;
-        EXPECT_FALSE(reading.read) << file;
+        EXPECT_EQ(reading.read, isSoundAllTheSame(file)) << file;
     }
 }
 
@@ -100,7 +109,7 @@ TEST(PropertyListCorpus, ValidListsSurviveBothEncodings) {
     for (const std::string& file : files) {
         Error error;
         const auto original = readPropertyListFile(file, &error);
-        EXPECT_TRUE(original) << error.message;
+        EXPECT_EQ(original.has_value(), !isUnsoundAllTheSame(file)) << error.message;
         if (!original) continue;
         for (const auto format : {PropertyListFormat::xml, PropertyListFormat::binary}) {
             const auto again = parsePropertyList(serializePropertyList(*original, format), &error);

@@ -6,6 +6,7 @@
 #include <chrono>
 #include <limits>
 
+#include <fmt/format.h>
 #include <gtest/gtest.h>
 
 namespace qvct {
@@ -143,6 +144,47 @@ TEST(PropertyList, RefusesWhatWouldExhaustMemoryOrTheStack) {
             << c.what << ": " << error.message;
         EXPECT_EQ(error.message.empty(), c.accepted) << c.what;
     }
+}
+
+TEST(PropertyList, RefusesXmlThatIsNoPropertyList) {
+    struct {
+        const char* value;
+        const char* reason;  // null: accepted
+    } const cases[] = {
+        {"<dict><key>a</key><!-- b --><integer> -0x10 </integer></dict>", nullptr},
+        {"<string><![CDATA[<dict>]]>&lt;&#233;</string>", nullptr},
+        {"<data>\n\tAAEC\n\t</data></plist>behind it", nullptr},
+        {"<dict><key>a</key></dict>", "a key without value"},
+        {"<dict><string>a</string></dict>", "an element where it may not stand"},
+        {"<dict><key>a</key><key>b</key></dict>", "an element where it may not stand"},
+        {"<array><key>a</key></array>", "an element where it may not stand"},
+        {"<string>a<true/></string>", "an element where it may not stand"},
+        {"<true/><true/>", "an element where it may not stand"},
+        {"<array>a</array>", "text between elements"},
+        {"<word>a</word>", "an element that is none of a property list"},
+        {"<x:dict xmlns:x=\"y\"/>", "an element that is none of a property list"},
+        {"<integer>18446744073709551616</integer>", "not a whole number of 64 bits"},
+        {"<integer>-9223372036854775809</integer>", "not a whole number of 64 bits"},
+        {"<integer>1.5</integer>", "not a whole number of 64 bits"},
+        {"<integer/>", "not a whole number of 64 bits"},
+        {"<data>AA*C</data>", "data that is not base 64"},
+        {"<string>&unknown;</string>", "not well-formed XML"},
+        {"<string>a", "not well-formed XML"},
+        {"<array></dict>", "not well-formed XML"},
+        {"", "no value"},
+    };
+    for (const auto& c : cases) {
+        Error error;
+        const bool read = parsePropertyList(fmt::format("<plist>{}</plist>", c.value), &error).has_value();
+        EXPECT_EQ(read, c.reason == nullptr) << c.value << error.message;
+        if (c.reason != nullptr) {
+            EXPECT_NE(error.message.find(c.reason), std::string::npos) << c.value << ": " << error.message;
+        }
+    }
+    Error error;
+    EXPECT_FALSE(
+        parsePropertyList("<!DOCTYPE plist [<!ENTITY a \"b\">]><plist><string>&a;</string></plist>", &error));
+    EXPECT_NE(error.message.find("an entity declaration"), std::string::npos) << error.message;
 }
 
 TEST(PropertyList, RefusesAContainerThatHoldsItself) {

@@ -6,6 +6,7 @@
 
 #include <cstdio>
 #include <cstdlib>
+#include <ctime>
 
 #include <gmock/gmock.h>
 
@@ -109,16 +110,16 @@ TEST(TaggingDictionary, SkipsWhatIsNotAsItShouldBe) {
     EXPECT_TRUE(TGRTTagging::taggingsWithTaggingDictionary(nullptr, *taxonomy).empty());
 }
 
-TEST(TaggingDictionary, AHundredThousandUnknownCategoriesTakeNoTime) {
+TEST(TaggingDictionary, ManyUnknownCategoriesTakeNoMoreThanTheirShare) {
+    constexpr int count = 40000;
     Dictionary list;
-    for (int i = 0; i < 100000; ++i) {
-        list.append(std::to_string(i), Array{Dictionary{{"Name", "x%"}}, Dictionary{{"Name", "y"}}});
-    }
+    for (int i = 0; i < count; ++i) list.append(std::to_string(i), Array{Dictionary{{"Name", "x%"}}});
     const PropertyList hostile = std::move(list);
     const std::clock_t start = std::clock();
     const auto taggings = TGRTTagging::taggingsWithTaggingDictionary(&hostile, *TGRTTaxonomy::init());
-    EXPECT_EQ(TGRTTagging::taggingDictionaryForTaggings(taggings).size(), 100000U);
-    EXPECT_LT(static_cast<double>(std::clock() - start) / CLOCKS_PER_SEC, 10.0);  // squared it takes a minute
+    EXPECT_EQ(TGRTTagging::taggingDictionaryForTaggings(taggings).size(), count);
+    // About 2 s without optimisation; 20 when each category is compared with all others.
+    EXPECT_LT(static_cast<double>(std::clock() - start) / CLOCKS_PER_SEC, 8.0);
 }
 
 TEST(Tagging, DescribesItself) {
