@@ -18,6 +18,8 @@ constexpr double kLikely = 0.010;     // seconds at which a rise would count for
 constexpr double kStep = 0.0005;      // seconds of one sum of energy
 constexpr std::size_t kSide = 3;      // sums before and after a rise
 constexpr double kGround = 0.02;      // share of the mean energy below which differences do not count
+constexpr double kBeside = 0.010;     // seconds before and after an onset that are compared
+constexpr double kLoss = 0.78;        // what remains at least of the energy where something begins
 constexpr std::size_t kBlock = 4096;  // frames
 
 }  // namespace
@@ -32,8 +34,9 @@ class OnsetDetector::Analyser {
           picker_(rate_ / static_cast<double>(flux_.hop())),
           step_(std::max<std::size_t>(1, static_cast<std::size_t>(rate_ * kStep))),
           reach_(static_cast<std::size_t>(rate_ * kReach) / step_),
-          kept_((picker_.delay() + 2) * flux_.hop() + flux_.windowSize() +
-                (2 * reach_ + 2 * kSide + 2) * step_),
+          beside_(static_cast<std::size_t>(rate_ * kBeside)),
+          kept_((picker_.delay() + 2 * SpectralFlux::kTogether) * flux_.hop() + flux_.windowSize() +
+                2 * (reach_ + kSide + 1) * step_ + 2 * beside_),
           nextFrame_(kept_ + flux_.hop()),
           origin_(-static_cast<std::int64_t>(kept_)) {}
 
@@ -61,9 +64,11 @@ class OnsetDetector::Analyser {
         // The first level is held before the start, so that an offset of the whole signal is no onset.
         if (samples_.empty()) samples_.assign(kept_, mixed_.front());
         samples_.insert(samples_.end(), mixed_.begin(), mixed_.end());
-        for (; nextFrame_ <= samples_.size(); nextFrame_ += flux_.hop()) {
-            const float rise = flux_.next(&samples_[nextFrame_ - flux_.windowSize()]);
-            if (const auto frame = picker_.next(rise)) add(*frame);
+        const std::size_t together = SpectralFlux::kTogether * flux_.hop();
+        for (; nextFrame_ + together - flux_.hop() <= samples_.size(); nextFrame_ += together) {
+            for (const float rise : flux_.next(&samples_[nextFrame_ - flux_.windowSize()])) {
+                if (const auto frame = picker_.next(rise)) add(*frame);
+            }
         }
         const std::size_t gone = samples_.size() - kept_;
         samples_.erase(samples_.begin(), samples_.begin() + static_cast<std::ptrdiff_t>(gone));
@@ -74,9 +79,35 @@ class OnsetDetector::Analyser {
     void add(std::int64_t frame) {
         const std::int64_t middle = (frame + 1) * static_cast<std::int64_t>(flux_.hop()) -
                                     static_cast<std::int64_t>(flux_.windowSize() / 2);
+        const std::int64_t attack = attackNear(middle);
+        if (!bringsEnergy(attack)) return;
         const std::int64_t onset =
-            std::max<std::int64_t>(0, attackNear(middle) * static_cast<std::int64_t>(mixer_.factor()));
+            std::max<std::int64_t>(0, attack * static_cast<std::int64_t>(mixer_.factor()));
         if (onset < length_ && (onsets_.empty() || onset > onsets_.back())) onsets_.push_back(onset);
+    }
+
+    struct Energy {
+        double signal = 0, slope = 0;
+    };
+
+    Energy energyOf(std::size_t from, std::size_t end) const {
+        Energy energy;
+        for (std::size_t i = from; i < end; ++i) {
+            const double sample = static_cast<double>(samples_[i]);
+            const double slope = sample - static_cast<double>(samples_[i - 1]);
+            energy.signal += sample * sample;
+            energy.slope += slope * slope;
+        }
+        return energy;
+    }
+
+    /// Whether the signal or its slope, which weighs high tones more, keeps its energy: a sound that is cut
+    /// off scatters over the spectrum like an onset, but leaves less than was there.
+    bool bringsEnergy(std::int64_t attack) const {
+        const auto at = static_cast<std::size_t>(attack - origin_);
+        const Energy before = energyOf(at - beside_, at);
+        const Energy after = energyOf(at, at + beside_);
+        return after.signal >= kLoss * before.signal || after.slope >= kLoss * before.slope;
     }
 
     /// Where the energy of the slope of the signal, which weighs high tones more, rises by the largest
@@ -86,11 +117,7 @@ class OnsetDetector::Analyser {
         const std::size_t steps = 2 * (reach_ + kSide);
         energies_.assign(steps + 1, 0);  // running sums
         for (std::size_t k = 0; k < steps; ++k) {
-            double energy = 0;
-            for (std::size_t i = first + k * step_; i < first + (k + 1) * step_; ++i) {
-                const double slope = static_cast<double>(samples_[i]) - static_cast<double>(samples_[i - 1]);
-                energy += slope * slope;
-            }
+            const double energy = energyOf(first + k * step_, first + (k + 1) * step_).slope;
             energies_[k + 1] = energies_[k] + energy;
         }
         const double ground =
@@ -113,6 +140,7 @@ class OnsetDetector::Analyser {
     SpectralFlux flux_;
     OnsetPicker picker_;
     std::size_t step_, reach_;  // samples of one sum; sums by which an onset may be moved
+    std::size_t beside_;        // samples on each side that are compared
     std::size_t kept_;          // samples that stay for the next window and for moving peaks
     std::size_t nextFrame_;     // end of the next window in samples_
     std::int64_t origin_;       // position of samples_[0] in the mixed signal

@@ -1,12 +1,13 @@
 #include "platform/SpectralFlux.h"
 
+#include "platform/Lanes.h"
+
 #include <algorithm>
-#include <bit>
 #include <cmath>
-#include <cstdint>
+#include <complex>
 #include <numbers>
 
-#include <kiss_fftr.h>
+#include <kissfft.hh>
 
 namespace qvct {
 namespace {
@@ -22,46 +23,46 @@ constexpr float kCompression = 1000;  // The scale is logarithmic from 60 dB bel
 constexpr float kQuietest = 0.001F;   // Signals below do not get louder.
 constexpr double kForgetting = 0.1;   // share of the loudest level forgotten in a second
 
-/// Binary logarithm to about 0.006, for x >= 1; in a form that compilers vectorise.
-float roughLog2(float x) {
-    const auto bits = std::bit_cast<std::uint32_t>(x);
-    const auto exponent = static_cast<float>(static_cast<std::int32_t>(bits >> 23) - 127);
-    const float mantissa = std::bit_cast<float>((bits & 0x7FFFFFU) | 0x3F800000U);
-    return exponent + (2.0F - 0.33582878F * mantissa) * mantissa - 1.65871022F;
+// An even product of small primes, which transforms quickly.
+std::size_t windowSizeFor(double sampleRate) {
+    auto half = std::max<std::size_t>(kSmallestWindow, std::lround(sampleRate * kWindowSeconds)) / 2;
+    for (;; ++half) {
+        std::size_t rest = half;
+        for (const std::size_t prime : {2U, 3U, 5U}) {
+            while (rest % prime == 0) rest /= prime;
+        }
+        if (rest == 1) return 2 * half;
+    }
 }
 
-std::size_t windowSizeFor(double sampleRate) {
-    const auto wanted = static_cast<int>(std::lround(sampleRate * kWindowSeconds));
-    return std::max<std::size_t>(kSmallestWindow,
-                                 static_cast<std::size_t>(kiss_fftr_next_fast_size_real(wanted)));
+// Each frame with the one two before it: the last two of the former four, then the first two of these.
+Lanes twoBefore(Lanes former, Lanes these) {
+    return Lanes(__builtin_shufflevector(former.v, these.v, 2, 3, 4, 5));
 }
 
 }  // namespace
 
 struct SpectralFlux::Transform {
     explicit Transform(std::size_t size)
-        : plan(kiss_fftr_alloc(static_cast<int>(size), 0, nullptr, nullptr)),
-          input(size),
-          bins(size / 2 + 1) {}
-    Transform(const Transform&) = delete;
-    Transform& operator=(const Transform&) = delete;
-    ~Transform() { kiss_fftr_free(plan); }
+        : plan(size / 2, false), input(size), bins(size / 2), magnitudes(size / 2) {}
 
-    kiss_fftr_cfg plan;
-    std::vector<float> input;
-    std::vector<kiss_fft_cpx> bins;
+    kissfft<Lanes> plan;
+    std::vector<Lanes> input;
+    std::vector<std::complex<Lanes>> bins;
+    std::vector<Lanes> magnitudes;
+    std::vector<Lanes> levels, formerLevels;  // by band: of these four frames and of the four before
 };
 
 SpectralFlux::SpectralFlux(double sampleRate)
     : hop_(std::max<std::size_t>(1, static_cast<std::size_t>(std::lround(sampleRate / kFramesPerSecond)))),
       framesPerSecond_(sampleRate / static_cast<double>(hop_)),
       window_(windowSizeFor(sampleRate)),
-      magnitudes_(window_.size() / 2 + 1),
       loudest_(kQuietest),
       transform_(std::make_unique<Transform>(window_.size())) {
     makeWindow();
     makeBands(sampleRate);
-    levels_.resize((kLag + 1) * bands_.size());
+    transform_->levels.resize(bands_.size());
+    transform_->formerLevels.resize(bands_.size());
 }
 
 SpectralFlux::~SpectralFlux() = default;
@@ -96,48 +97,63 @@ void SpectralFlux::makeBands(double sampleRate) {
 }
 
 void SpectralFlux::transform(const float* samples) {
-    float* input = transform_->input.data();
-    for (std::size_t i = 0; i < window_.size(); ++i) input[i] = samples[i] * window_[i];
-    kiss_fftr(transform_->plan, input, transform_->bins.data());
-    const kiss_fft_cpx* bins = transform_->bins.data();
-    for (std::size_t i = 0; i < magnitudes_.size(); ++i) {
-        magnitudes_[i] = std::sqrt(bins[i].r * bins[i].r + bins[i].i * bins[i].i);
+    auto& [plan, input, bins, magnitudes, levels, formerLevels] = *transform_;
+    for (std::size_t i = 0; i < window_.size(); ++i) {
+        const float* sample = samples + i;
+        const Lanes::Vector four = {sample[0], sample[hop_], sample[2 * hop_], sample[3 * hop_]};
+        input[i] = Lanes(four) * window_[i];
+    }
+    plan.transform_real(input.data(), bins.data());
+    for (std::size_t i = 0; i < bins.size(); ++i) {
+        magnitudes[i] = squareRoot(bins[i].real() * bins[i].real() + bins[i].imag() * bins[i].imag());
     }
 }
 
-void SpectralFlux::measureBands(float* levels) {
-    float loudest = kQuietest;
+void SpectralFlux::measureBands() {
+    std::vector<Lanes>& levels = transform_->levels;
+    Lanes loudest(kQuietest);
     for (std::size_t b = 0; b < bands_.size(); ++b) {
         const Band& band = bands_[b];
-        const float* magnitude = &magnitudes_[band.firstBin];
+        const Lanes* magnitude = &transform_->magnitudes[band.firstBin];
         const float* weight = &weights_[band.firstWeight];
-        float level = 0;
+        Lanes level(0);
         for (std::size_t i = 0; i < band.count; ++i) level += magnitude[i] * weight[i];
         levels[b] = level;
-        loudest = std::max(loudest, level);
+        loudest = larger(loudest, level);
     }
-    loudest_ =
-        std::max(loudest, loudest_ * static_cast<float>(1 - std::min(1.0, kForgetting / framesPerSecond_)));
-    const float scale = kCompression / loudest_;
-    for (std::size_t b = 0; b < bands_.size(); ++b) levels[b] = roughLog2(1 + scale * levels[b]);
+    Lanes scale;
+    const auto kept = static_cast<float>(1 - std::min(1.0, kForgetting / framesPerSecond_));
+    for (int frame = 0; frame < 4; ++frame) {
+        loudest_ = std::max(loudest.v[frame], loudest_ * kept);
+        scale.v[frame] = kCompression / loudest_;
+    }
+    for (Lanes& level : levels) level = roughLog2(Lanes(1) + scale * level);
 }
 
-float SpectralFlux::next(const float* samples) {
+std::array<float, SpectralFlux::kTogether> SpectralFlux::next(const float* samples) {
+    std::array<float, kTogether> rises{};
     const std::size_t count = bands_.size();
-    if (count == 0) return 0;  // The rate is too low to hear anything.
+    if (count == 0) return rises;  // The rate is too low to hear anything.
+    transform_->levels.swap(transform_->formerLevels);
     transform(samples);
-    float* now = &levels_[row_ * count];
-    measureBands(now);
-    row_ = (row_ + 1) % (kLag + 1);
+    measureBands();
 
-    const float* past = &levels_[row_ * count];
-    float rise = 0;
+    const std::vector<Lanes>& now = transform_->levels;
+    const std::vector<Lanes>& former = transform_->formerLevels;
+    const auto past = [&](std::size_t band) { return twoBefore(former[band], now[band]); };
+    Lanes rise(0);
+    Lanes below = past(0);
+    Lanes here = below;
     for (std::size_t b = 0; b < count; ++b) {
-        const float below = past[b > 0 ? b - 1 : 0];
-        const float above = past[std::min(b + 1, count - 1)];
-        rise += std::max(0.0F, now[b] - std::max({past[b], below, above}));
+        const Lanes above = b + 1 < count ? past(b + 1) : here;
+        rise += larger(Lanes(0), now[b] - larger(here, larger(below, above)));
+        below = here;
+        here = above;
     }
-    return rise / static_cast<float>(count);
+    for (std::size_t frame = 0; frame < kTogether; ++frame) {
+        rises[frame] = rise.v[frame] / static_cast<float>(count);
+    }
+    return rises;
 }
 
 }  // namespace qvct

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <array>
 #include <cstddef>
 #include <memory>
 #include <vector>
@@ -14,7 +15,7 @@ namespace qvct {
 /// mean of the rises is the curve. After S. Boeck, G. Widmer, "Maximum filter vibrato suppression for onset
 /// detection", DAFx 2013.
 ///
-/// @cost  One real FFT of 23 ms a frame.
+/// @cost  One real FFT of 23 ms a frame, four frames at once.
 class SpectralFlux {
   public:
     /// REQUIRES: sampleRate >= 1.
@@ -25,8 +26,13 @@ class SpectralFlux {
     /// Samples from one frame to the next: 5 ms.
     std::size_t hop() const { return hop_; }
 
-    /// The rise at the next frame, in octaves of magnitude; `samples` are windowSize() finite ones.
-    float next(const float* samples);
+    /// Frames that are measured together.
+    static constexpr std::size_t kTogether = 4;
+
+    /// The rise at each of the next kTogether frames, in octaves of magnitude. `samples` are the first
+    /// frame's; the others begin a hop later each. REQUIRES: windowSize() + (kTogether - 1) * hop() samples,
+    /// all finite.
+    std::array<float, kTogether> next(const float* samples);
 
   private:
     struct Transform;
@@ -37,16 +43,13 @@ class SpectralFlux {
     void makeWindow();
     void makeBands(double sampleRate);
     void transform(const float* samples);
-    void measureBands(float* levels);
+    void measureBands();
 
     std::size_t hop_;
     double framesPerSecond_;
     std::vector<float> window_;
     std::vector<Band> bands_;
     std::vector<float> weights_;
-    std::vector<float> magnitudes_;
-    std::vector<float> levels_;  // of the last frames: a ring of rows
-    std::size_t row_ = 0;
     float loudest_;
     std::unique_ptr<Transform> transform_;
 };
