@@ -93,16 +93,17 @@ class Painter {
     void paintGrid() {
         rectangle(kLeft, kSoundTop, kPlotWidth, kSoundHeight, "#f4f4f4");
         const bool drawsCells = beats_ * kCellsPerBeat <= kMostGridCells;
-        const int beatStep = std::max(1, static_cast<int>(beats_ / kMostGridCells) + 1);
-        const int labelStep = std::max(1, static_cast<int>(std::ceil(beats_ / 64)));
-        for (int beat = 0; beat <= beats_; beat += beatStep) {
+        const auto beatStep = static_cast<std::int64_t>(beats_ / kMostGridCells) + 1;
+        const std::int64_t labelStep = beatStep * (static_cast<std::int64_t>(beats_ / 64) / beatStep + 1);
+        for (std::int64_t beat = 0; static_cast<double>(beat) <= beats_; beat += beatStep) {
+            const auto at = static_cast<double>(beat);
             const bool isBar = plot_.signatureTop > 0 && beat % plot_.signatureTop == 0;
-            line(x(beat), kSoundTop, kSoundTop + kSoundHeight, isBar ? "#666" : "#aaa", isBar ? 1.5 : 1);
-            if (beat % labelStep == 0 && beat < beats_) {
-                text(x(beat) + 2, kSoundTop + kSoundHeight + 14, std::to_string(beat + 1));
+            line(x(at), kSoundTop, kSoundTop + kSoundHeight, isBar ? "#666" : "#aaa", isBar ? 1.5 : 1);
+            if (beat % labelStep == 0 && at < beats_) {
+                text(x(at) + 2, kSoundTop + kSoundHeight + 14, std::to_string(beat + 1));
             }
-            for (int cell = 1; drawsCells && cell < kCellsPerBeat && beat < beats_; ++cell) {
-                line(x(beat + cell / kCellsPerBeat), kSoundTop, kSoundTop + kSoundHeight, "#ddd", 0.5);
+            for (int cell = 1; drawsCells && cell < kCellsPerBeat && at < beats_; ++cell) {
+                line(x(at + cell / kCellsPerBeat), kSoundTop, kSoundTop + kSoundHeight, "#ddd", 0.5);
             }
         }
     }

@@ -20,6 +20,7 @@ constexpr std::size_t kSide = 3;      // sums before and after a rise
 constexpr double kGround = 0.02;      // share of the mean energy below which differences do not count
 constexpr double kBeside = 0.010;     // seconds before and after an onset that are compared
 constexpr double kLoss = 0.78;        // what remains at least of the energy where something begins
+constexpr double kSilence = 0.001;    // share of the energy to come that is none
 constexpr std::size_t kBlock = 4096;  // frames
 
 }  // namespace
@@ -79,7 +80,7 @@ class OnsetDetector::Analyser {
     void add(std::int64_t frame) {
         const std::int64_t middle = (frame + 1) * static_cast<std::int64_t>(flux_.hop()) -
                                     static_cast<std::int64_t>(flux_.windowSize() / 2);
-        const std::int64_t attack = attackNear(middle);
+        const std::int64_t attack = attackNear(pastSilence(middle));
         if (!bringsEnergy(attack)) return;
         const std::int64_t onset =
             std::max<std::int64_t>(0, attack * static_cast<std::int64_t>(mixer_.factor()));
@@ -108,6 +109,19 @@ class OnsetDetector::Analyser {
         const Energy before = energyOf(at - beside_, at);
         const Energy after = energyOf(at, at + beside_);
         return after.signal >= kLoss * before.signal || after.slope >= kLoss * before.slope;
+    }
+
+    /// A sound out of silence shows in the spectrum as soon as the window touches it, before its attack is
+    /// within reach; then a position closer to it.
+    std::int64_t pastSilence(std::int64_t middle) const {
+        const std::size_t reach = reach_ * step_;
+        for (int i = 0; i < 2; ++i) {
+            const auto at = static_cast<std::size_t>(middle - origin_);
+            const double here = energyOf(at - reach, at + reach).slope;
+            if (here >= kSilence * energyOf(at + reach, at + 3 * reach).slope) break;
+            middle += static_cast<std::int64_t>(reach);
+        }
+        return middle;
     }
 
     /// Where the energy of the slope of the signal, which weighs high tones more, rises by the largest
