@@ -42,7 +42,8 @@ void DownMixer::mix(std::span<const float> frames, std::vector<float>& mixed) {
         float* out = mixed.data() + from;
         for (std::size_t i = 0; i < left / 2; ++i) {
             const float* f = frame + 4 * i;
-            out[i] = bounded(a * (f[0] + f[2]) + b * (f[1] + f[3]));
+            out[i] =
+                bounded((f[0] * a + f[1] * b) + (f[2] * a + f[3] * b));  // in the order of the general way
         }
         frame += left / 2 * 4;
         left %= 2;

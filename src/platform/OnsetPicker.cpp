@@ -9,7 +9,7 @@ namespace {
 constexpr double kBefore = 0.010, kAfter = 0.005;              // seconds
 constexpr double kMedianBefore = 0.100, kMedianAfter = 0.050;  // seconds
 constexpr double kDistance = 0.030;                            // seconds
-constexpr float kThreshold = 0.1F, kMedianFactor = 1.5F;
+constexpr float kThreshold = 0.12F, kMedianFactor = 1.75F;
 
 std::size_t framesIn(double seconds, double framesPerSecond) {
     return std::max<std::size_t>(1, static_cast<std::size_t>(std::lround(seconds * framesPerSecond)));
