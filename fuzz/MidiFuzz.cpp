@@ -1,16 +1,13 @@
 // Any bytes as a MIDI file: times ascend and are finite, notes lie within their track, levels are in [0, 1].
+#include "ExactInput.h"
 #include "analysis/QVCTMidiAnalysis.h"
 #include "platform/MidiSequence.h"
 
 #include <cmath>
-#include <cstdlib>
-#include <memory>
 
 namespace {
 
-void require(bool holds) {
-    if (!holds) std::abort();
-}
+using qvct::fuzz::require;
 
 void measure(const qvct::MidiTrack& track, int beats, int top, int bottom) {
     const auto analysis = qvct::QVCTMidiAnalysis::initWithTempo(120, beats, top, bottom);
@@ -25,10 +22,8 @@ void measure(const qvct::MidiTrack& track, int beats, int top, int bottom) {
 }  // namespace
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
-    const std::unique_ptr<std::uint8_t[]> exact(
-        new std::uint8_t[size]);  // so that reading past the end shows
-    std::copy(data, data + size, exact.get());
-    const auto sequence = qvct::MidiSequence::parse({exact.get(), size});
+    const qvct::fuzz::ExactInput input(data, size);
+    const auto sequence = qvct::MidiSequence::parse(input.bytes());
     if (!sequence) return 0;
     require(std::isfinite(sequence->length()));
     for (const qvct::MidiTrack& track : sequence->tracks()) {

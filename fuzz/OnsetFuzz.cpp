@@ -1,9 +1,9 @@
 // Any bytes as blocks of samples, at any rate and channel count: onsets ascend and lie within the signal, and
 // the size of the blocks does not matter.
+#include "ExactInput.h"
 #include "platform/OnsetDetector.h"
 
 #include <algorithm>
-#include <cstdlib>
 #include <cstring>
 
 namespace {
@@ -37,9 +37,9 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     const auto frames = static_cast<std::int64_t>(samples.size()) / channels;
     std::int64_t last = -1;
     for (const std::int64_t onset : onsets) {
-        if (onset <= last || onset >= frames) std::abort();
+        qvct::fuzz::require(onset > last && onset < frames);
         last = onset;
     }
-    if (onsets != onsetsOf(samples, rate, channels, 100000)) std::abort();
+    qvct::fuzz::require(onsets == onsetsOf(samples, rate, channels, 100000));
     return 0;
 }

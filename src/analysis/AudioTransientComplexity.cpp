@@ -1,6 +1,12 @@
 #include "analysis/AudioTransientComplexity.h"
 
 #include "analysis/QVCTMidiAnalysis.h"
+#include "platform/AudioDecoder.h"
+#include "platform/LCFileParser.h"
+#include "platform/OnsetDetector.h"
+
+#include <string>
+#include <vector>
 
 namespace qvct {
 namespace {
@@ -8,7 +14,32 @@ namespace {
 constexpr std::int32_t kPitch = 60;
 constexpr std::int32_t kVelocity = 127;
 
+// An editor's markers at the edges of a loop stand for the edges, not for sounds.
+std::vector<std::int64_t> withoutEdges(std::vector<std::int64_t> markers, std::int64_t frames) {
+    if (!markers.empty() && markers.back() == frames) markers.pop_back();
+    if (!markers.empty() && markers.front() == 0) markers.erase(markers.begin());
+    return markers;
+}
+
 }  // namespace
+
+bool AudioTransientComplexity::computeRhythmicDensityAndComplexityUsingTransients(const URL& url,
+                                                                                  bool withNewAnalysis) {
+    if (alreadyComputed_) return true;
+    const std::string extension = url.pathExtension();
+    if (extension != "aif" && extension != "caf") return false;
+    const auto data = LCFileParser::fileParserForURL(url)->enhancedFileData();
+    if (!data) return false;
+    const LoopMetre metre{data->bpm(), data->beatCount(), data->signatureTop(), data->signatureBottom()};
+    if (!metre.isMeasured()) return false;
+
+    const auto decoder = AudioDecoder::open(url.path());
+    if (!decoder) return false;
+    const std::int64_t frames = decoder->frames();
+    return computeRhythmicDensityAndComplexity(
+        withNewAnalysis ? OnsetDetector::detect(*decoder) : withoutEdges(data->transientMarkers(), frames),
+        frames, metre);
+}
 
 bool AudioTransientComplexity::computeRhythmicDensityAndComplexity(std::span<const std::int64_t> onsets,
                                                                    std::int64_t frames,

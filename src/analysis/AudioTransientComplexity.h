@@ -1,5 +1,7 @@
 #pragma once
 
+#include "platform/Url.h"
+
 #include <cstdint>
 #include <span>
 
@@ -26,6 +28,15 @@ struct LoopMetre {
 /// threads at once.
 class AudioTransientComplexity {
   public:
+    /// Measures the onsets of the loop at a URL: those of a fresh search, or the transient markers that are
+    /// stored in the file without a first one at its start and a last one at its end.
+    ///
+    /// False, with the stored values left as they are, when the extension is not exactly "aif" or "caf", the
+    /// file cannot be read, its metre is not measured or there is no onset.
+    ///
+    /// @cost  A fresh search decodes the whole file, in constant memory.
+    bool computeRhythmicDensityAndComplexityUsingTransients(const URL& url, bool withNewAnalysis);
+
     /// Measures onsets at ascending sample-frame positions of a loop of `frames` frames.
     ///
     /// Onsets past the last beat are folded back by `QVCTMidiAnalysis`. False, with the stored values left as

@@ -1,6 +1,12 @@
 #include "analysis/AudioTransientComplexity.h"
 #include "analysis/QVCTMidiAnalysis.h"
+#include "platform/LCFileData.h"
+#include "platform/LCFileParser.h"
+#include "platform/LCFileWriter.h"
+#include "support/TemporaryFolder.h"
 
+#include <cmath>
+#include <string>
 #include <vector>
 
 #include <gtest/gtest.h>
@@ -45,6 +51,70 @@ TEST(AudioTransientComplexity, RefusesWhatCannotBeMeasured) {
     EXPECT_FALSE(audio.computeRhythmicDensityAndComplexity({}, 400, kFourBeats));
     EXPECT_TRUE(audio.computeRhythmicDensityAndComplexity(onsets, 400, kFourBeats))
         << "a refusal is not kept";
+}
+
+std::string bigEndian(std::uint32_t value, int bytes) {
+    std::string out;
+    for (int shift = 8 * (bytes - 1); shift >= 0; shift -= 8)
+        out.push_back(static_cast<char>(value >> shift));
+    return out;
+}
+
+// Two seconds at 8000 Hz, a click every half second from the first quarter on.
+std::string clicksAsAiff() {
+    constexpr std::uint32_t kFrames = 16000;
+    std::string sound;
+    for (std::uint32_t i = 0; i < kFrames; ++i) {
+        const std::uint32_t since = (i + 2000) % 4000;
+        const double sample = 20000 * std::exp(-0.01 * since) * (since % 2 ? -1 : 1);
+        sound += bigEndian(static_cast<std::uint32_t>(static_cast<int>(sample)), 2);
+    }
+    const std::string common = "COMM" + bigEndian(18, 4) + bigEndian(1, 2) + bigEndian(kFrames, 4) +
+                               bigEndian(16, 2) + std::string("\x40\x0b\xfa\0\0\0\0\0\0\0", 10);
+    const std::string data =
+        "SSND" + bigEndian(static_cast<std::uint32_t>(sound.size() + 8), 4) + bigEndian(0, 8) + sound;
+    return "FORM" + bigEndian(static_cast<std::uint32_t>(4 + common.size() + data.size()), 4) + "AIFF" +
+           common + data;
+}
+
+URL writeLoop(const test::TemporaryFolder& folder, const std::string& name, int top) {
+    const URL url = URL::fileURLWithPath(folder.write(name, clicksAsAiff()));
+    const auto data = LCFileParser::fileParserForURL(url)->fileData();
+    data->setTavioLoopType(0);
+    data->setBpm(120);
+    data->setBeatCount(4);
+    data->setSignatureTop(top);
+    data->setSignatureBottom(4);
+    data->setTransientMarkers({0, 2000, 16000});
+    EXPECT_TRUE(LCFileWriter::fileWriterForURL(url)->writeFileData(data));
+    return url;
+}
+
+TEST(AudioTransientComplexity, MeasuresALoopFileByItsSoundOrItsMarkers) {
+    const test::TemporaryFolder folder;
+    const URL url = writeLoop(folder, "clicks.aif", 4);
+    const auto densityOf = [](std::vector<double> beats) {
+        const auto midi = QVCTMidiAnalysis::initWithTempo(120, 4, 4, 4);
+        for (const double beat : beats) midi->addNote({beat, beat, 60, 127});
+        return midi->computeRhythmicDensity();
+    };
+    AudioTransientComplexity fresh;
+    ASSERT_TRUE(fresh.computeRhythmicDensityAndComplexityUsingTransients(url, true));
+    EXPECT_EQ(fresh.getDensity(), densityOf({0.5, 1.5, 2.5, 3.5}));
+    AudioTransientComplexity stored;
+    ASSERT_TRUE(stored.computeRhythmicDensityAndComplexityUsingTransients(url, false));
+    EXPECT_EQ(stored.getDensity(), densityOf({0.5})) << "the markers at both edges are dropped";
+}
+
+TEST(AudioTransientComplexity, RefusesOtherExtensionsMetresAndUnreadableFiles) {
+    const test::TemporaryFolder folder;
+    const URL refused[] = {writeLoop(folder, "a.aiff", 4), writeLoop(folder, "b.AIF", 4),
+                           writeLoop(folder, "c.aif", 5), URL::fileURLWithPath(folder.path("absent.aif")),
+                           URL::fileURLWithPath(folder.write("no.caf", "caff"))};
+    for (const URL& url : refused) {
+        AudioTransientComplexity audio;
+        EXPECT_FALSE(audio.computeRhythmicDensityAndComplexityUsingTransients(url, true)) << url.path();
+    }
 }
 
 }  // namespace
