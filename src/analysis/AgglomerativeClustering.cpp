@@ -28,7 +28,7 @@ float overlapDistance(const Note& a, const Note& b) {
 // of a pair holds the span of every pair in between; so only neighbours are looked at.
 class Timeline {
   public:
-    Timeline(const std::vector<Note>& notes, std::vector<std::size_t> order, double threshold)
+    Timeline(const std::vector<Note>& notes, const std::vector<std::size_t>& order, double threshold)
         : notes_(notes), threshold_(threshold) {
         runs_.reserve(order.size());
         for (const std::size_t note : order) {
@@ -114,7 +114,8 @@ float AgglomerativeClustering::distance(const Note& a, const Note& b, Method met
             return startDistance(a, b);
         case kStartInThreshold: {
             const float difference = startDistance(a, b);
-            return difference <= threshold_ ? difference : kInfinity;
+            if (difference <= threshold_) return difference;
+            return kInfinity;
         }
         case kStartAndEnd:
             return static_cast<float>(std::hypot(a.startTime - b.startTime, a.endTime - b.endTime));
@@ -138,7 +139,7 @@ void AgglomerativeClustering::runAnalysis(Method method) {
         std::stable_sort(finite.begin(), finite.end(), [this](std::size_t a, std::size_t b) {
             return notes_[a].startTime < notes_[b].startTime;
         });
-        for (auto& cluster : Timeline(notes_, std::move(finite), threshold_).merged()) {
+        for (auto& cluster : Timeline(notes_, finite, threshold_).merged()) {
             std::sort(cluster.begin(), cluster.end());
             clusters_.push_back(std::move(cluster));
         }

@@ -62,18 +62,19 @@ float FractalComplexity::computeComplexity(const std::vector<Note>& notes, doubl
     std::vector<Interval> intervals;
     if (divisions[0] >= 1) appendParts(intervals, 0, static_cast<float>(length / divisions[0]), divisions[0]);
 
-    const float sum = complexityFrom(NoteLookup(notes), std::move(intervals), 0,
-                                     {divisions, resolutions, weights}, levelScores);
+    const float sum =
+        complexityFrom(NoteLookup(notes), intervals, 0, {divisions, resolutions, weights}, levelScores);
     float totalWeight = 0;
     for (const float weight : weights) totalWeight += weight;
     return sum / totalWeight;
 }
 
-float FractalComplexity::computeComplexity(const std::vector<Note>& notes, std::vector<Interval> intervals,
-                                           int level, const std::vector<std::int32_t>& divisions,
+float FractalComplexity::computeComplexity(const std::vector<Note>& notes,
+                                           const std::vector<Interval>& intervals, int level,
+                                           const std::vector<std::int32_t>& divisions,
                                            const std::vector<double>& resolutions,
                                            const std::vector<float>& weights) const {
-    return complexityFrom(NoteLookup(notes), std::move(intervals), static_cast<std::size_t>(level),
+    return complexityFrom(NoteLookup(notes), intervals, static_cast<std::size_t>(level),
                           {divisions, resolutions, weights}, nullptr);
 }
 
@@ -98,7 +99,7 @@ float FractalComplexity::complexityFrom(const NoteLookup& notes, std::vector<Int
     for (const auto& [start, end] : intervals) {
         if (next >= 1) appendParts(parts, start, static_cast<float>((end - start) / next), next);
     }
-    return complexityFrom(notes, std::move(parts), level + 1, hierarchy, levelScores) + score;
+    return complexityFrom(notes, parts, level + 1, hierarchy, levelScores) + score;
 }
 
 float FractalComplexity::distance(const std::vector<Note>& notes, const std::vector<Interval>& intervals,
@@ -144,6 +145,7 @@ int FractalComplexity::thereExistsANoteInRange(const std::vector<Note>& notes, d
 
 float FractalComplexity::testDistance() const {
     std::vector<Note> notes;
+    notes.reserve(16);
     for (int i = 0; i < 16; ++i) notes.push_back({double(i), i + 0.5, 60, 100});
     return distance(notes, {{0, 8}, {8, 16}}, 0, 2, 0.125);
 }

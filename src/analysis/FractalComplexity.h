@@ -36,7 +36,7 @@ class FractalComplexity {
                             const std::vector<double>& resolutions, const std::vector<float>& weights,
                             std::vector<float>* levelScores = nullptr) const;
     /// The weighted sum of the scores of `level` and of those below it; `intervals` are those of `level`.
-    float computeComplexity(const std::vector<Note>& notes, std::vector<Interval> intervals, int level,
+    float computeComplexity(const std::vector<Note>& notes, const std::vector<Interval>& intervals, int level,
                             const std::vector<std::int32_t>& divisions,
                             const std::vector<double>& resolutions, const std::vector<float>& weights) const;
 
@@ -58,8 +58,9 @@ class FractalComplexity {
   private:
     struct Hierarchy;
 
-    static float complexityFrom(const NoteLookup& notes, std::vector<Interval> intervals, std::size_t level,
-                                const Hierarchy& hierarchy, std::vector<float>* levelScores);
+    static float complexityFrom(const NoteLookup& notes, const std::vector<Interval>& intervals,
+                                std::size_t level, const Hierarchy& hierarchy,
+                                std::vector<float>* levelScores);
     static float groupDistance(const NoteLookup& notes, const std::vector<Interval>& intervals,
                                std::size_t first, int groupSize, double resolution);
 };

@@ -19,7 +19,7 @@ std::size_t openSlot(std::uint8_t channel, std::uint8_t pitch) {
 
 }  // namespace
 
-MidiTrackReader::MidiTrackReader() : open_(16 * 128) {}
+MidiTrackReader::MidiTrackReader() : open_(16U << 7) {}
 
 MidiTrackEvents MidiTrackReader::read(std::span<const std::uint8_t> chunk, std::size_t offset) {
     chunk_ = chunk;

@@ -81,7 +81,9 @@ void SpectralFlux::makeBands(double sampleRate) {
     const double binWidth = sampleRate / static_cast<double>(window_.size());
     const double highest = std::min(kHighestHertz, sampleRate / 2 - binWidth);
     std::vector<std::size_t> centers;
-    for (double hertz = kLowestHertz; hertz <= highest; hertz *= std::exp2(1 / kBandsPerOctave)) {
+    for (int step = 0;; ++step) {
+        const double hertz = kLowestHertz * std::exp2(step / kBandsPerOctave);
+        if (hertz > highest) break;
         const auto bin = static_cast<std::size_t>(std::lround(hertz / binWidth));
         if (bin >= 1 && (centers.empty() || bin > centers.back())) centers.push_back(bin);
     }
