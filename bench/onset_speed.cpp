@@ -1,0 +1,84 @@
+// How fast onsets are found, decoding included: a stereo file of 16 bits at 44.1 kHz, beside aubioonset on
+// the same file, both in processor time of one core. Usage: onset_speed [minutes]
+#include "Aubio.h"
+#include "Corpus.h"
+#include "WavFile.h"
+#include "platform/AudioDecoder.h"
+#include "platform/OnsetDetector.h"
+
+#include <cstdlib>
+
+#include <fmt/format.h>
+#include <sys/resource.h>
+#include <unistd.h>
+
+namespace qvct::bench {
+namespace {
+
+double processorSeconds(int who) {
+    rusage usage{};
+    ::getrusage(who, &usage);
+    const auto seconds = [](const timeval& time) {
+        return double(time.tv_sec) + double(time.tv_usec) * 1e-6;
+    };
+    return seconds(usage.ru_utime) + seconds(usage.ru_stime);
+}
+
+std::vector<float> stereoGrooves(const DrumCorpus& corpus, double minutes) {
+    const Setting plain{"dry", 1, 0, 0, false, 0};
+    const auto samples = static_cast<std::size_t>(minutes * 60 * kRate) * 2;
+    std::vector<float> stereo;
+    for (std::size_t i = 0; stereo.size() < samples; i = (i + 1) % corpus.grooves.size()) {
+        for (const float sample : render(corpus.grooves[i], corpus.kitFor(i, plain), plain, 60).samples) {
+            stereo.push_back(sample);
+            stereo.push_back(0.8F * sample);
+        }
+    }
+    stereo.resize(samples);
+    return stereo;
+}
+
+void report(const char* name, double audio, double processor, std::size_t onsets) {
+    fmt::print("{:12} {:8.3f} s for {:.0f} s: {:6.0f} times real time, {} onsets\n", name, processor, audio,
+               audio / processor, onsets);
+}
+
+}  // namespace
+}  // namespace qvct::bench
+
+int main(int count, char** arguments) {
+    using namespace qvct::bench;
+    const double minutes = count > 1 ? std::atof(arguments[1]) : 10;
+    const DrumCorpus corpus = DrumCorpus::load(QVCT_CORPUS);
+    if (corpus.isEmpty() || minutes <= 0) {
+        fmt::print(stderr, "no grooves or drum machines below {}\n", QVCT_CORPUS);
+        return 1;
+    }
+    char wav[] = "/tmp/qvct-onsets-XXXXXX";
+    ::close(::mkstemp(wav));
+    writeWav(wav, stereoGrooves(corpus, minutes), kRate, 2);
+
+    double ours = 1e300;  // the best of three, as other programs share the machine
+    for (int round = 0; round < 3; ++round) {
+        const double start = processorSeconds(RUSAGE_SELF);
+        const auto decoder = qvct::AudioDecoder::open(std::string(wav));
+        const auto onsets = qvct::OnsetDetector::detect(*decoder);
+        ours = std::min(ours, processorSeconds(RUSAGE_SELF) - start);
+        if (round == 2) report("ours", minutes * 60, ours, onsets.size());
+    }
+    double theirs = 1e300;
+    for (int round = 0; round < 3; ++round) {
+        const double start = processorSeconds(RUSAGE_CHILDREN);
+        const auto onsets = aubioOnsets(wav);
+        if (!onsets) {
+            fmt::print("aubioonset is not installed\n");
+            break;
+        }
+        theirs = std::min(theirs, processorSeconds(RUSAGE_CHILDREN) - start);
+        if (round == 2) {
+            report("aubioonset", minutes * 60, theirs, onsets->size());
+            fmt::print("ratio        {:.2f}\n", theirs / ours);
+        }
+    }
+    ::unlink(wav);
+}

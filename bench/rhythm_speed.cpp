@@ -1,0 +1,80 @@
+// How long the rhythm of a MIDI loop takes, from the bytes of the file to both levels, and how long the
+// clustering of 10,000 notes takes.
+#include "Corpus.h"
+#include "analysis/AgglomerativeClustering.h"
+#include "analysis/QVCTMidiAnalysis.h"
+#include "platform/FileAccess.h"
+
+#include <chrono>
+#include <random>
+
+#include <fmt/format.h>
+
+namespace qvct::bench {
+namespace {
+
+double secondsSince(std::chrono::steady_clock::time_point start) {
+    return std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
+}
+
+// Four bars of a groove, as a loop of a library has them.
+double secondsForLoop(const std::vector<std::uint8_t>& bytes, std::size_t& notes) {
+    constexpr int kBeats = 16;
+    constexpr int kRounds = 20;
+    double best = 1e300;
+    for (int round = 0; round < kRounds; ++round) {
+        const auto start = std::chrono::steady_clock::now();
+        const auto sequence = MidiSequence::parse(bytes);
+        const auto analysis = QVCTMidiAnalysis::initWithTempo(120, kBeats, 4, 4);
+        for (const MidiNote& note : sequence->tracks()[0].notes) {
+            if (note.start < kBeats) analysis->addNote({note.start, note.end(), note.pitch, note.velocity});
+        }
+        notes = analysis->notes().size();
+        volatile float level = analysis->computeRhythmicComplexity() + analysis->computeRhythmicDensity();
+        static_cast<void>(level);
+        best = std::min(best, secondsSince(start));
+    }
+    return best;
+}
+
+void measureLoops(const std::string& folder) {
+    double worst = 0, sum = 0;
+    std::size_t loops = 0, mostNotes = 0;
+    for (const auto& entry : std::filesystem::directory_iterator(folder)) {
+        const auto bytes = readFile(entry.path().string());
+        if (entry.path().extension() != ".mid" || !bytes || bytes->size() > 8192) continue;
+        std::size_t notes = 0;
+        const double seconds = secondsForLoop(*bytes, notes);
+        worst = std::max(worst, seconds);
+        mostNotes = std::max(mostNotes, notes);
+        sum += seconds;
+        ++loops;
+    }
+    fmt::print("{} loops of 16 beats, up to {} notes: mean {:.1f} us, worst {:.1f} us\n", loops, mostNotes,
+               sum / double(loops) * 1e6, worst * 1e6);
+}
+
+void measureClustering() {
+    for (const double beats : {10000.0, 1000.0, 1.0}) {
+        std::mt19937 random(1);
+        std::uniform_real_distribution<double> time(0, beats);
+        std::vector<Note> notes;
+        for (int i = 0; i < 10000; ++i) notes.push_back({time(random), 0, 60, 100});
+        const auto start = std::chrono::steady_clock::now();
+        AgglomerativeClustering clustering(notes);
+        clustering.setThreshold(0.125);
+        clustering.runAnalysis(AgglomerativeClustering::kStartInThreshold);
+        fmt::print("10,000 notes over {:.0f} beats: {:.2f} ms, {} clusters\n", beats,
+                   secondsSince(start) * 1e3, clustering.clusters().size());
+    }
+}
+
+}  // namespace
+}  // namespace qvct::bench
+
+int main() {
+    using namespace qvct::bench;
+    const std::string folder = QVCT_CORPUS "/midi/groove";
+    if (std::filesystem::is_directory(folder)) measureLoops(folder);
+    measureClustering();
+}

@@ -1,0 +1,34 @@
+#pragma once
+
+#include <cstddef>
+#include <span>
+#include <vector>
+
+namespace qvct {
+
+/// Mixes interleaved channels to one and averages runs of frames to bring the rate down to about 22 kHz.
+///
+/// A plain average: what it folds down from above is still the energy of the same moment, which is all that
+/// the search for onsets asks. The channels weigh unequally, so that opposite ones do not cancel.
+class DownMixer {
+  public:
+    DownMixer(double sampleRate, int channels);
+
+    /// Frames that become one sample.
+    std::size_t factor() const { return factor_; }
+    std::size_t channels() const { return gains_.size(); }
+
+    /// Appends the samples of the next frames to `mixed`, all of them finite and within 16 times full scale.
+    /// A run that the block leaves incomplete goes on with the next block.
+    void mix(std::span<const float> frames, std::vector<float>& mixed);
+
+  private:
+    float mixedFrame(const float* frame) const;
+
+    std::size_t factor_;
+    std::vector<float> gains_;
+    float run_ = 0;  // sum of an incomplete run
+    std::size_t runLength_ = 0;
+};
+
+}  // namespace qvct

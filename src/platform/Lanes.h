@@ -1,0 +1,71 @@
+#pragma once
+
+#include <cmath>
+#include <type_traits>
+
+namespace qvct {
+
+/// Four floats that are worked on at once, with the arithmetic of one; for the compilers' vector units.
+struct Lanes {
+    using Vector = float __attribute__((vector_size(16)));
+
+    Lanes() = default;
+    Lanes(float all) : v{all, all, all, all} {}  // NOLINT(google-explicit-constructor): stands in for a float
+    Lanes(Vector lanes) : v(lanes) {}            // NOLINT(google-explicit-constructor)
+    /// The first lane: how code that is written for numbers takes the cosine of one it repeated in all lanes.
+    operator float() const { return v[0]; }  // NOLINT(google-explicit-constructor)
+
+    Lanes& operator+=(Lanes other) { return v += other.v, *this; }
+    Lanes& operator-=(Lanes other) { return v -= other.v, *this; }
+    Lanes& operator*=(Lanes other) { return v *= other.v, *this; }
+    Lanes operator-() const { return Lanes(-v); }
+
+    Vector v{};
+};
+
+inline Lanes operator+(Lanes a, Lanes b) {
+    return Lanes(a.v + b.v);
+}
+inline Lanes operator-(Lanes a, Lanes b) {
+    return Lanes(a.v - b.v);
+}
+inline Lanes operator*(Lanes a, Lanes b) {
+    return Lanes(a.v * b.v);
+}
+inline Lanes operator/(Lanes a, Lanes b) {
+    return Lanes(a.v / b.v);
+}
+
+template <typename Number>
+requires std::is_arithmetic_v<Number> Lanes operator*(Number a, Lanes b) {
+    return Lanes(static_cast<float>(a)) * b;
+}
+template <typename Number>
+requires std::is_arithmetic_v<Number> Lanes operator*(Lanes a, Number b) {
+    return a * Lanes(static_cast<float>(b));
+}
+template <typename Number>
+requires std::is_arithmetic_v<Number> Lanes operator/(Lanes a, Number b) {
+    return a / Lanes(static_cast<float>(b));
+}
+
+inline Lanes larger(Lanes a, Lanes b) {
+    return Lanes(a.v > b.v ? a.v : b.v);
+}
+
+inline Lanes squareRoot(Lanes a) {
+    Lanes roots;
+    for (int i = 0; i < 4; ++i) roots.v[i] = std::sqrt(a.v[i]);
+    return roots;
+}
+
+/// Binary logarithm to about 0.006, for finite values of at least 1.
+inline Lanes roughLog2(Lanes x) {
+    using Bits = int __attribute__((vector_size(16)));
+    const Bits bits = reinterpret_cast<Bits>(x.v);
+    const Lanes exponent(__builtin_convertvector((bits >> 23) - 127, Lanes::Vector));
+    const Lanes mantissa(reinterpret_cast<Lanes::Vector>((bits & 0x7FFFFF) | 0x3F800000));
+    return exponent + (Lanes(2) - Lanes(0.33582878F) * mantissa) * mantissa - Lanes(1.65871022F);
+}
+
+}  // namespace qvct

@@ -1,0 +1,57 @@
+#pragma once
+
+#include <array>
+#include <cstddef>
+#include <memory>
+#include <vector>
+
+namespace qvct {
+
+/// How much the spectrum of a signal rises from one moment to the next: a novelty curve that peaks at onsets.
+///
+/// The magnitudes of short windows are gathered in bands of equal musical width and put on a logarithmic
+/// scale below the loudest band of the last seconds, so that level does not matter. Each band is compared
+/// with the loudest of itself and its neighbours two frames before, so that a wavering pitch is no onset; the
+/// mean of the rises is the curve. After S. Boeck, G. Widmer, "Maximum filter vibrato suppression for onset
+/// detection", DAFx 2013.
+///
+/// @cost  One real FFT of 23 ms a frame, four frames at once.
+class SpectralFlux {
+  public:
+    /// REQUIRES: sampleRate >= 1.
+    explicit SpectralFlux(double sampleRate);
+    ~SpectralFlux();
+
+    std::size_t windowSize() const { return window_.size(); }
+    /// Samples from one frame to the next: 5 ms.
+    std::size_t hop() const { return hop_; }
+
+    /// Frames that are measured together.
+    static constexpr std::size_t kTogether = 4;
+
+    /// The rise at each of the next kTogether frames, in octaves of magnitude. `samples` are the first
+    /// frame's; the others begin a hop later each. REQUIRES: windowSize() + (kTogether - 1) * hop() samples,
+    /// all finite.
+    std::array<float, kTogether> next(const float* samples);
+
+  private:
+    struct Transform;
+    struct Band {
+        std::size_t firstBin, firstWeight, count;
+    };
+
+    void makeWindow();
+    void makeBands(double sampleRate);
+    void transform(const float* samples);
+    void measureBands();
+
+    std::size_t hop_;
+    double framesPerSecond_;
+    std::vector<float> window_;
+    std::vector<Band> bands_;
+    std::vector<float> weights_;
+    float loudest_;
+    std::unique_ptr<Transform> transform_;
+};
+
+}  // namespace qvct
