@@ -1,5 +1,8 @@
 #include "Commands.h"
+#include "RhythmMeasurement.h"
+#include "analysis/QVCTRhythmicTaggingService.h"
 #include "autotagging/QVTaggingAggregator.h"
+#include "platform/LCFileParser.h"
 #include "platform/PropertyListFile.h"
 #include "platform/QVContentTaggingTypes.h"
 #include "platform/Text.h"
@@ -19,8 +22,9 @@ struct Service {
     std::uint64_t option;
 };
 
-constexpr std::array<Service, 6> kServices = {{{"keywords", QVCTAutoTaggingOptionFilenameKeywords},
+constexpr std::array<Service, 7> kServices = {{{"keywords", QVCTAutoTaggingOptionFilenameKeywords},
                                                {"rules", QVCTAutoTaggingOptionXMLRules},
+                                               {"rhythm", QVCTAutoTaggingOptionRhythm},
                                                {"content-type", QVCTAutoTaggingOptionContentType},
                                                {"instruments", QVCTAutoTaggingOptionSoftwareInstruments},
                                                {"user", QVCTAutoTaggingOptionUserGenerated},
@@ -31,6 +35,7 @@ struct Options {
     std::vector<std::string> services;
     std::string keywordsFile;
     std::string rulesFile;
+    bool measuresAnyRhythm = false;
 };
 
 struct Item {
@@ -117,6 +122,29 @@ void noteTotals(const std::vector<Item>& items, const ToolContext& context) {
     context.note(fmt::format("{} items, {} of them tagged, {} tags", items.size(), tagged, tags));
 }
 
+bool isGraded(const ObjectSet<TGRTTagging>& taggings) {
+    return std::any_of(taggings.begin(), taggings.end(),
+                       [](const auto& tagging) { return tagging->label() == "Rhythmic Density"; });
+}
+
+/// Grades audio that the rhythm service leaves alone, where its length in beats is known.
+void addAnyRhythm(const URL& url, const TGRTTaxonomy& taxonomy, ObjectSet<TGRTTagging>& taggings) {
+    if (isGraded(taggings)) return;
+    const auto data = LCFileParser::fileParserForURL(url)->enhancedFileData();
+    if (!data || data->beatCount() == 0) return;
+    Error ignored;
+    const auto rhythm = measureRhythm(url, {}, &ignored);
+    if (!rhythm) return;
+    for (const TagDictionary& tag :
+         QVCTRhythmicTaggingService::tagsForValues(rhythm->density, rhythm->complexity)) {
+        auto tagging = TGRTTagging::initWithTag(
+            taxonomy.findTagForLabel(*tag.value(kTagDictionaryLabelKey)->string()),
+            TGRTLevel::levelWithWeight(*tag.value(kTagDictionaryLevelKey)->doubleValue()));
+        if (tagging) tagging->setIsAutoTagging(true);
+        taggings.insert(tagging);
+    }
+}
+
 void run(const Options& options, ToolContext& context) {
     const std::uint64_t bits = optionsForServices(options.services, context);
     const auto aggregator =
@@ -125,7 +153,9 @@ void run(const Options& options, ToolContext& context) {
     const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
     std::vector<Item> items;
     for (const URL& url : context.contentItems(options.paths)) {
-        items.push_back({url, sortedTaggings(aggregator->taggingsWithContentsOfURL(url, *taxonomy, bits))});
+        auto taggings = aggregator->taggingsWithContentsOfURL(url, *taxonomy, bits);
+        if (options.measuresAnyRhythm) addAnyRhythm(url, *taxonomy, taggings);
+        items.push_back({url, sortedTaggings(taggings)});
     }
     if (context.format == Format::table) {
         printTable(items, context.terminal());
@@ -151,6 +181,8 @@ void addAutotagCommand(CLI::App& app, ToolContext& context) {
     command
         ->add_option("--rules", options->rulesFile, "Property list of rules to use instead of the built-in")
         ->type_name("FILE");
+    command->add_flag("--rhythm-any", options->measuresAnyRhythm,
+                      "Grade the rhythm of every sound whose length in beats is known");
     command->footer("Example:\n  qvtag autotag --json Loops \"Patches/Warm Pad.patch\"");
     command->callback([options, &context] { run(*options, context); });
 }

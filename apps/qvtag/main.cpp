@@ -35,6 +35,7 @@ int run(int argc, char** argv) {
     app.parse_complete_callback([&context] { context.prepare(); });
     qvct::tool::addAutotagCommand(app, context);
     qvct::tool::addKeywordsCommand(app, context);
+    qvct::tool::addRhythmCommand(app, context);
     qvct::tool::addRulesCommand(app, context);
     qvct::tool::addTaxonomyCommand(app, context);
     try {

@@ -23,6 +23,20 @@ std::vector<std::int64_t> withoutEdges(std::vector<std::int64_t> markers, std::i
 
 }  // namespace
 
+std::vector<Note> notesOfOnsets(std::span<const std::int64_t> onsets, std::int64_t frames,
+                                std::int32_t beatCount) {
+    std::vector<Note> notes;
+    const std::int64_t framesPerBeat = beatCount == 0 ? 0 : frames / beatCount;
+    if (framesPerBeat <= 0) return notes;
+    const float beatsPerFrame = 1.0F / static_cast<float>(framesPerBeat);
+    notes.reserve(onsets.size());
+    for (const std::int64_t onset : onsets) {
+        const double beat = static_cast<double>(static_cast<float>(onset) * beatsPerFrame);
+        notes.push_back({beat, beat, kPitch, kVelocity});
+    }
+    return notes;
+}
+
 bool AudioTransientComplexity::computeRhythmicDensityAndComplexityUsingTransients(const URL& url,
                                                                                   bool withNewAnalysis) {
     if (alreadyComputed_) return true;
@@ -46,16 +60,12 @@ bool AudioTransientComplexity::computeRhythmicDensityAndComplexity(std::span<con
                                                                    const LoopMetre& metre) {
     if (alreadyComputed_) return true;
     if (!metre.isMeasured()) return false;
-    const std::int64_t framesPerBeat = frames / metre.beatCount;
-    if (framesPerBeat <= 0 || onsets.empty()) return false;
+    const std::vector<Note> notes = notesOfOnsets(onsets, frames, metre.beatCount);
+    if (notes.empty()) return false;
 
     const auto analysis = QVCTMidiAnalysis::initWithTempo(metre.bpm, metre.beatCount, metre.signatureTop,
                                                           metre.signatureBottom);
-    const float beatsPerFrame = 1.0F / static_cast<float>(framesPerBeat);
-    for (const std::int64_t onset : onsets) {
-        const double beat = static_cast<double>(static_cast<float>(onset) * beatsPerFrame);
-        analysis->addNote({beat, beat, kPitch, kVelocity});
-    }
+    for (const Note& note : notes) analysis->addNote(note);
     complexity_ = analysis->computeRhythmicComplexity();
     density_ = analysis->computeRhythmicDensity();
     alreadyComputed_ = true;

@@ -1,9 +1,11 @@
 #pragma once
 
+#include "analysis/Note.h"
 #include "platform/Url.h"
 
 #include <cstdint>
 #include <span>
+#include <vector>
 
 namespace qvct {
 
@@ -21,6 +23,11 @@ struct LoopMetre {
                signatureTop != 7;
     }
 };
+
+/// Onsets at sample-frame positions as notes of equal loudness, in single precision; none where a beat has no
+/// frames.
+std::vector<Note> notesOfOnsets(std::span<const std::int64_t> onsets, std::int64_t frames,
+                                std::int32_t beatCount);
 
 /// Rhythmic density and complexity of an audio loop: its onsets are measured as notes of equal loudness.
 ///

@@ -78,7 +78,7 @@ float FractalComplexity::computeComplexity(const std::vector<Note>& notes,
                           {divisions, resolutions, weights}, nullptr);
 }
 
-float FractalComplexity::complexityFrom(const NoteLookup& notes, std::vector<Interval> intervals,
+float FractalComplexity::complexityFrom(const NoteLookup& notes, const std::vector<Interval>& intervals,
                                         std::size_t level, const Hierarchy& hierarchy,
                                         std::vector<float>* levelScores) {
     const std::int32_t division = hierarchy.divisions[level];

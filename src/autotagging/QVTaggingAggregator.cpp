@@ -1,5 +1,6 @@
 #include "autotagging/QVTaggingAggregator.h"
 
+#include "analysis/QVCTRhythmicTaggingService.h"
 #include "autotagging/QVCTContentTypeTaggingService.h"
 #include "autotagging/QVCTFilenameKeywordExtractorTaggingService.h"
 #include "autotagging/QVCTSoftwareInstrumentTaggingService.h"
@@ -49,6 +50,7 @@ QVTaggingAggregator::Services QVTaggingAggregator::defaultTaggingServicesWithRul
                                                                                    Settings keywordMapping) {
     return {QVCTFilenameKeywordExtractorTaggingService::initWithKeywordMapping(std::move(keywordMapping)),
             QVCTXMLRulesTaggingService::initWithRules(std::move(rules)),
+            std::make_shared<QVCTRhythmicTaggingService>(),
             std::make_shared<QVCTContentTypeTaggingService>(),
             QVCTSoftwareInstrumentTaggingService::init(),
             std::make_shared<QVCTUserGeneratedTaggingService>(),

@@ -1,0 +1,124 @@
+#include "Commands.h"
+#include "RhythmMeasurement.h"
+#include "platform/FileAccess.h"
+#include "platform/Text.h"
+
+#include <charconv>
+#include <cmath>
+#include <memory>
+
+#include <CLI/CLI.hpp>
+#include <fmt/format.h>
+
+namespace qvct::tool {
+namespace {
+
+struct Options {
+    std::vector<std::string> paths;
+    RhythmRequest request;
+    std::string signature;
+    std::string plotFile;
+};
+
+/// "6/8" into its two numbers.
+bool readSignature(const std::string& text, RhythmRequest& request) {
+    if (text.empty()) return true;
+    std::int32_t top = 0;
+    std::int32_t bottom = 0;
+    const char* end = text.data() + text.size();
+    const auto [slash, topStatus] = std::from_chars(text.data(), end, top);
+    if (topStatus != std::errc{} || slash == end || *slash != '/') return false;
+    const auto [rest, bottomStatus] = std::from_chars(slash + 1, end, bottom);
+    constexpr std::int32_t most = 64;
+    if (bottomStatus != std::errc{} || rest != end || top < 1 || bottom < 1 || top > most || bottom > most) {
+        return false;
+    }
+    request.signatureTop = top;
+    request.signatureBottom = bottom;
+    return true;
+}
+
+/// Whole numbers without a fraction, others with what tells them apart.
+double rounded(double value) {
+    return std::round(value * 1e6) / 1e6;
+}
+
+Json jsonOf(const std::string& path, const RhythmResult& result) {
+    Json json{{"path", URL::fileURLWithPath(path).path()},
+              {"density", result.density},
+              {"complexity", result.complexity},
+              {"onsets", Json::array()}};
+    for (const double onset : result.onsets) json["onsets"].push_back(rounded(onset));
+    json["beatCount"] = result.beatCount;
+    json["tempo"] = rounded(result.tempo);
+    json["signature"] = fmt::format("{}/{}", result.signatureTop, result.signatureBottom);
+    return json;
+}
+
+std::string bar(float value) {
+    constexpr std::size_t width = 10;
+    const auto full = static_cast<std::size_t>(std::lround(value * static_cast<float>(width)));
+    std::string text;
+    for (std::size_t i = 0; i < width; ++i) text += i < full ? "█" : "░";
+    return text;
+}
+
+void printRow(const std::string& path, const RhythmResult& result) {
+    fmt::print(
+        "{}\n  density {} {:3.0f}%   complexity {} {:3.0f}%   {} onsets in {} beats of {}/{} at {:g} bpm\n",
+        printable(path), bar(result.density), static_cast<double>(result.density) * 100,
+        bar(result.complexity), static_cast<double>(result.complexity) * 100, result.onsets.size(),
+        result.beatCount, result.signatureTop, result.signatureBottom, rounded(result.tempo));
+}
+
+void writePlot(const Options& options, const RhythmResult& result, ToolContext& context) {
+    if (options.plotFile.empty()) return;
+    Error error;
+    if (!replaceFile(options.plotFile, result.plot.svg(), &error)) context.itemFailed(error.message);
+}
+
+void run(Options options, ToolContext& context) {
+    if (!readSignature(options.signature, options.request)) {
+        return context.usageFailed(
+            fmt::format("\"{}\" is no time signature such as 6/8", printable(options.signature)));
+    }
+    if (!options.plotFile.empty() && options.paths.size() != 1) {
+        return context.usageFailed("--plot draws one file; name only one");
+    }
+    Json items = Json::array();
+    for (const std::string& path : options.paths) {
+        Error error;
+        const auto result = measureRhythm(URL::fileURLWithPath(path), options.request, &error);
+        if (!result) {
+            context.itemFailed(error.message);
+            continue;
+        }
+        writePlot(options, *result, context);
+        if (context.format == Format::table) {
+            printRow(path, *result);
+        } else {
+            items.push_back(jsonOf(path, *result));
+        }
+    }
+    if (context.format != Format::table) printJson(items, context.format);
+}
+
+}  // namespace
+
+void addRhythmCommand(CLI::App& app, ToolContext& context) {
+    const auto options = std::make_shared<Options>();
+    auto* command = app.add_subcommand("rhythm", "Measures how dense and how complex a rhythm is");
+    command->add_option("files", options->paths, "MIDI files, loops and other sounds")
+        ->required()
+        ->type_name("FILE");
+    command->add_option("--tempo", options->request.tempo, "Quarter notes a minute")
+        ->check(CLI::Range(1.0, 1000.0));
+    command->add_option("--beats", options->request.beats, "Length in beats")->check(CLI::Range(1, 100000));
+    command->add_option("--signature", options->signature, "Time signature, such as 6/8");
+    command->add_option("--plot", options->plotFile, "Draw the rhythm, and what gave it its numbers")
+        ->type_name("FILE.svg");
+    command->footer("Example:\n  qvtag rhythm \"Deep House Beat.caf\" --plot beat.svg");
+    command->callback([options, &context] { run(*options, context); });
+}
+
+}  // namespace qvct::tool

@@ -1,0 +1,179 @@
+#include "RhythmMeasurement.h"
+
+#include "analysis/AudioTransientComplexity.h"
+#include "analysis/MetricWeights.h"
+#include "analysis/QVCTMidiAnalysis.h"
+#include "platform/AudioDecoder.h"
+#include "platform/LCFileParser.h"
+#include "platform/MidiSequence.h"
+#include "platform/OnsetDetector.h"
+#include "platform/Text.h"
+
+#include <algorithm>
+#include <cmath>
+
+#include <fmt/format.h>
+
+namespace qvct::tool {
+namespace {
+
+constexpr double kUsualTempo = 120;
+/// No loop is longer; what claims to be is a mistake.
+constexpr std::int32_t kMostBeats = QVCTMidiAnalysis::kLongestLoop;
+
+/// Tempo, length and signature, as far as they are known.
+struct Metre {
+    double tempo = 0;
+    std::int32_t beats = 0;
+    std::int32_t top = 0;
+    std::int32_t bottom = 0;
+};
+
+bool failFor(Error* error, const URL& url, std::string_view reason) {
+    return fail(error, kErrorInvalidArgument, fmt::format("{}: {}", printable(url.path()), reason));
+}
+
+void applyRequest(const RhythmRequest& request, Metre& metre) {
+    metre.tempo = request.tempo.value_or(metre.tempo);
+    metre.beats = request.beats.value_or(metre.beats);
+    metre.top = request.signatureTop.value_or(metre.top == 0 ? 4 : metre.top);
+    metre.bottom = request.signatureBottom.value_or(metre.bottom == 0 ? 4 : metre.bottom);
+}
+
+/// Beats up to the end, rounded up to whole bars.
+std::int32_t wholeBars(double end, std::int32_t top) {
+    const double bars = std::max(1.0, std::ceil(end / top));
+    return static_cast<std::int32_t>(std::min(bars * top, static_cast<double>(kMostBeats) + 1));
+}
+
+Metre metreOf(const LCFileData* data) {
+    if (data == nullptr) return {};
+    return {static_cast<double>(data->bpm()), data->beatCount(), data->signatureTop(),
+            data->signatureBottom()};
+}
+
+/// Every note of every track, in the order of their starts.
+std::vector<Note> notesOf(const MidiSequence& sequence) {
+    std::vector<Note> notes;
+    for (const MidiTrack& track : sequence.tracks()) {
+        for (const MidiNote& note : track.notes)
+            notes.push_back({note.start, note.end(), note.pitch, note.velocity});
+    }
+    std::stable_sort(notes.begin(), notes.end(),
+                     [](const Note& a, const Note& b) { return a.startTime < b.startTime; });
+    return notes;
+}
+
+std::optional<RhythmResult> measured(const URL& url, std::vector<Note> notes, const Metre& metre,
+                                     Error* error) {
+    if (notes.empty()) {
+        failFor(error, url, "nothing sounds in it");
+        return std::nullopt;
+    }
+    if (metre.beats < 1 || metre.beats > kMostBeats) {
+        failFor(error, url, fmt::format("a loop of {} beats cannot be measured", metre.beats));
+        return std::nullopt;
+    }
+    const auto analysis = QVCTMidiAnalysis::initWithTempo(static_cast<float>(metre.tempo), metre.beats,
+                                                          metre.top, metre.bottom);
+    for (const Note& note : notes) analysis->addNote(note);
+    RhythmDetail detail;
+    RhythmResult result;
+    result.complexity = analysis->computeRhythmicComplexity(&detail);
+    result.density = analysis->computeRhythmicDensity();
+    for (const Note& note : analysis->notes()) result.onsets.push_back(note.startTime);
+    result.beatCount = metre.beats;
+    result.tempo = metre.tempo;
+    result.signatureTop = metre.top;
+    result.signatureBottom = metre.bottom;
+
+    RhythmPlot& plot = result.plot;
+    plot.title = url.lastPathComponent();
+    plot.tempo = metre.tempo;
+    plot.beatCount = metre.beats;
+    plot.signatureTop = metre.top;
+    plot.signatureBottom = metre.bottom;
+    plot.density = result.density;
+    plot.complexity = result.complexity;
+    plot.notes = analysis->notes();
+    plot.onsets = result.onsets;
+    plot.divisions = detail.divisions;
+    plot.levelScores = detail.levelScores;
+    for (const float weakness : analysis->getSyncopationMask()) plot.metricWeights.push_back(1 - weakness);
+    return result;
+}
+
+std::optional<RhythmResult> measureMidi(const URL& url, const MidiSequence& sequence, Metre metre,
+                                        const RhythmRequest& request, Error* error) {
+    if (metre.tempo == 0)
+        metre.tempo = sequence.tempos().empty() ? kUsualTempo : sequence.tempos().front().bpm;
+    if (metre.top == 0 && !sequence.meters().empty()) {
+        metre.top = sequence.meters().front().numerator;
+        metre.bottom = sequence.meters().front().denominator;
+    }
+    applyRequest(request, metre);
+    if (metre.beats == 0) metre.beats = wholeBars(sequence.endOfNotes(), metre.top);
+    return measured(url, notesOf(sequence), metre, error);
+}
+
+/// The lowest and highest sample of equal slices of the file.
+std::vector<RhythmPlot::Peak> waveformOf(const std::string& path) {
+    constexpr std::size_t slices = 1200;
+    const auto decoder = AudioDecoder::open(path);
+    if (!decoder || decoder->frames() <= 0) return {};
+    std::vector<RhythmPlot::Peak> peaks(slices);
+    const auto channels = static_cast<std::size_t>(decoder->channels());
+    const auto frames = static_cast<double>(decoder->frames());
+    std::vector<float> block(4096 * channels);
+    std::size_t frame = 0;
+    for (std::size_t got = decoder->read(block); got > 0; got = decoder->read(block)) {
+        for (std::size_t i = 0; i < got; ++i, ++frame) {
+            const auto slice = static_cast<std::size_t>(static_cast<double>(frame) / frames * slices);
+            RhythmPlot::Peak& peak = peaks[std::min(slice, slices - 1)];
+            const float sample = std::clamp(block[i * channels], -1.0F, 1.0F);
+            peak.low = std::min(peak.low, sample);
+            peak.high = std::max(peak.high, sample);
+        }
+    }
+    return peaks;
+}
+
+std::optional<RhythmResult> measureAudio(const URL& url, Metre metre, const RhythmRequest& request,
+                                         Error* error) {
+    const auto decoder = AudioDecoder::open(url.path(), error);
+    if (!decoder) return std::nullopt;
+    const std::int64_t frames = decoder->frames();
+    const double minutes = static_cast<double>(frames) / decoder->sampleRate() / 60;
+    applyRequest(request, metre);
+    if (metre.beats == 0)
+        metre.beats = static_cast<std::int32_t>(std::lround(std::min(metre.tempo * minutes, 1e6)));
+    if (metre.beats == 0) {
+        failFor(error, url, "its length in beats is unknown; say --beats or --tempo");
+        return std::nullopt;
+    }
+    if (metre.tempo == 0) metre.tempo = metre.beats / minutes;
+    auto result =
+        measured(url, notesOfOnsets(OnsetDetector::detect(*decoder), frames, metre.beats), metre, error);
+    if (result) result->plot.waveform = waveformOf(url.path());
+    return result;
+}
+
+}  // namespace
+
+std::optional<RhythmResult> measureRhythm(const URL& url, const RhythmRequest& request, Error* error) {
+    const std::string extension = url.lowercasePathExtension();
+    if (extension == "mid" || extension == "midi") {
+        const auto sequence = MidiSequence::read(url.path(), error);
+        return sequence ? measureMidi(url, *sequence, {}, request, error) : std::nullopt;
+    }
+    const auto data = LCFileParser::fileParserForURL(url)->enhancedFileData();
+    if (data && !data->midiData().empty()) {
+        const auto sequence = MidiSequence::parse(data->midiData());
+        if (sequence && !sequence->tracks().empty()) {
+            return measureMidi(url, *sequence, metreOf(data.get()), request, error);
+        }
+    }
+    return measureAudio(url, metreOf(data.get()), request, error);
+}
+
+}  // namespace qvct::tool

@@ -1,0 +1,37 @@
+#pragma once
+
+#include "RhythmPlot.h"
+#include "platform/Error.h"
+#include "platform/Url.h"
+
+#include <cstdint>
+#include <optional>
+#include <vector>
+
+namespace qvct::tool {
+
+/// What a user knows better than the file.
+struct RhythmRequest {
+    std::optional<double> tempo;
+    std::optional<std::int32_t> beats;
+    std::optional<std::int32_t> signatureTop;
+    std::optional<std::int32_t> signatureBottom;
+};
+
+struct RhythmResult {
+    float density = 0;
+    float complexity = 0;
+    std::vector<double> onsets;  ///< Beats.
+    std::int32_t beatCount = 0;
+    double tempo = 0;
+    std::int32_t signatureTop = 4;
+    std::int32_t signatureBottom = 4;
+    RhythmPlot plot;
+};
+
+/// Measures a MIDI file, a loop with MIDI inside, or any sound that can be decoded. What neither the request
+/// nor the file tells is derived: the beats from tempo and length, the signature as 4/4. Nothing, and an
+/// error, when the length in beats cannot be known or nothing sounds.
+std::optional<RhythmResult> measureRhythm(const URL& url, const RhythmRequest& request, Error* error);
+
+}  // namespace qvct::tool
