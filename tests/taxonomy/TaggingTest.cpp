@@ -85,7 +85,7 @@ TEST(TaggingDictionary, SurvivesBeingWrittenAndReadBack) {
         {"Source", Array{Dictionary{{"Name", "Bass"}, {"Weight", 1.0}}}}};
     EXPECT_EQ(written, expected);
     const auto read = TGRTTagging::taggingsWithTaggingDictionary(&written, *TGRTTaxonomy::defaultTaxonomy());
-    EXPECT_EQ(read, taggings);
+    ASSERT_EQ(read, taggings);
     EXPECT_TRUE(read.find(*automatic)->isAutoTagging());
 }
 
