@@ -9,6 +9,8 @@
 #include "platform/Text.h"
 
 #include <limits>
+#include <unordered_map>
+#include <utility>
 
 #include <fmt/format.h>
 #include <libxml/parser.h>
@@ -16,6 +18,9 @@
 
 namespace qvct {
 namespace {
+
+/// Most JSON text that a document keeps for the next script, in bytes.
+constexpr std::size_t kMostKeptJson = std::size_t{1} << 20;
 
 /// Most messages about one document; damaged ones may cause one for each line.
 constexpr int kMostMessages = 5;
@@ -72,6 +77,9 @@ std::string_view textOf(const std::vector<std::uint8_t>& bytes) {
 struct QVCTXMLDocument::Implementation {
     Document document;
     XPathContext context;  // after the document, on which it depends
+    /// By expression: the scripts of a rule set ask for the same plug-ins.
+    std::unordered_map<std::string, std::optional<std::string>> keptJson;
+    std::size_t keptBytes = 0;
 
     explicit Implementation(Document parsed) : document(std::move(parsed)) {
         if (document) context = makeXPathContext(document.get());
@@ -141,8 +149,17 @@ bool QVCTXMLDocument::isMatchingXPath(std::string_view expression) const {
 }
 
 std::optional<std::string> QVCTXMLDocument::JSONStringForXPath(std::string_view expression) const {
+    Implementation& self = *implementation_;
+    std::string key(expression);
+    if (const auto kept = self.keptJson.find(key); kept != self.keptJson.end()) return kept->second;
     const auto node = firstNodeForXPath(expression);
-    return node ? JSONStringWithData(node->XMLData()) : std::nullopt;
+    std::optional<std::string> json = node ? JSONStringWithData(node->XMLData()) : std::nullopt;
+    const std::size_t bytes = key.size() + (json ? json->size() : 0);
+    if (self.keptBytes + bytes <= kMostKeptJson) {
+        self.keptBytes += bytes;
+        self.keptJson.emplace(std::move(key), json);
+    }
+    return json;
 }
 
 std::optional<std::string> QVCTXMLDocument::JSONString() const {

@@ -107,6 +107,7 @@ void QVCTXMLParser::Element::add(std::string key, PropertyList value) {
 
 PropertyList::Dictionary QVCTXMLParser::Element::takeDictionary() {
     PropertyList::Dictionary dictionary;
+    dictionary.reserve(members.size());
     for (auto& [key, value] : members) dictionary.append(std::move(key), std::move(value));
     return dictionary;
 }

@@ -38,6 +38,10 @@ void PropertyList::Dictionary::append(std::string key, PropertyList newValue) {
     entries_.push_back(Entry{std::move(key), std::move(newValue)});
 }
 
+void PropertyList::Dictionary::reserve(std::size_t entries) {
+    entries_.reserve(entries);
+}
+
 bool PropertyList::Dictionary::remove(std::string_view key) {
     return std::erase_if(entries_, [key](const Entry& e) { return e.key == key; }) > 0;
 }

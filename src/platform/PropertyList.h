@@ -50,6 +50,7 @@ class PropertyList {
         void set(std::string_view key, PropertyList value);
         /// Appends without looking for `key`, which the caller knows to be absent.
         void append(std::string key, PropertyList value);
+        void reserve(std::size_t entries);
         /// Whether there was such a key.
         bool remove(std::string_view key);
 
