@@ -49,7 +49,7 @@ Json jsonOfRecord(const URL& url, const TGRTMetaData& record) {
 }
 
 void printField(const Terminal& terminal, std::string_view name, const std::vector<Word>& words) {
-    constexpr std::size_t width = 14;
+    constexpr std::size_t width = 22;
     if (words.empty()) return;
     fmt::print("  {}{}\n", colored(terminal, Color::faint, padded(name, width - 2)),
                wrapped(terminal, words, width));
