@@ -30,7 +30,7 @@ std::string settingsBytes(const PluginIdentity& identity, std::endian order) {
 
 std::string presetText(std::string_view name, std::string_view attributes) {
     return fmt::format(
-        "<metadata>\nName = {}\nVersion = 1\n</metadata>\n"
+        "<metadata>\nDisplayName = {}\nVersion = 1\n</metadata>\n"
         "<tagging>\nAttribs = {}\n</tagging>\n"
         "<applicationinfo>\nAppIdentifier = org.qvcontenttagging.demo\nMinimumVersion = "
         "1.0\n</applicationinfo>\n"

@@ -10,10 +10,13 @@ namespace qvct::tool {
 
 /// Each adds one command to the tool. A command reports what fails through the context and never throws.
 void addAutotagCommand(CLI::App& app, ToolContext& context);
+void addInspectCommand(CLI::App& app, ToolContext& context);
 void addKeywordsCommand(CLI::App& app, ToolContext& context);
 void addRhythmCommand(CLI::App& app, ToolContext& context);
 void addRulesCommand(CLI::App& app, ToolContext& context);
+void addReadCommand(CLI::App& app, ToolContext& context);
 void addTaxonomyCommand(CLI::App& app, ToolContext& context);
+void addWriteCommand(CLI::App& app, ToolContext& context);
 /// Below the taxonomy command: what has become of retired vocabularies.
 void addLegacyTaxonomyCommands(CLI::App& taxonomy, ToolContext& context);
 

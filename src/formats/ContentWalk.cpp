@@ -1,10 +1,10 @@
 #include "formats/ContentWalk.h"
 
+#include "formats/audiofile/TGRTAudioFileTypeValidator.h"
 #include "platform/QVContentTaggingTypes.h"
 #include "platform/Text.h"
 
 #include <algorithm>
-#include <array>
 #include <cerrno>
 #include <cstring>
 #include <memory>
@@ -23,13 +23,6 @@ using Identity = std::pair<dev_t, ino_t>;
 bool isBundleName(const URL& url) {
     const FileType type = QVContentTaggingTypes::fallBackFileTypeForURL(url);
     return type == kFileTypePatch || type == kFileTypeProject;
-}
-
-bool isPreviewOfOtherContent(const URL& url) {
-    constexpr std::array<std::string_view, 4> endings = {".cst.caf", ".vcp.caf", ".pst.caf", ".sxv.caf"};
-    const std::string name = lowercase(url.lastPathComponent());
-    return std::any_of(endings.begin(), endings.end(),
-                       [&name](auto ending) { return name.ends_with(ending); });
 }
 
 struct FolderEntry {
@@ -100,7 +93,7 @@ class Walk {
 
 bool isContentName(const URL& url) {
     return QVContentTaggingTypes::fallBackFileTypeForURL(url) != kFileTypeNone &&
-           !url.lastPathComponent().starts_with('.') && !isPreviewOfOtherContent(url);
+           !url.lastPathComponent().starts_with('.') && !TGRTAudioFileTypeValidator::isPrelistenFile(url);
 }
 
 void walkContent(const std::string& path, const std::function<void(const URL& item)>& item,

@@ -10,6 +10,9 @@ namespace qvct {
 
 /// Whether a name is that of content: its extension is that of a file kind that the framework knows, it is
 /// not hidden, and it is not the recorded preview of another item.
+///
+/// Data files (".data") do not count: half of the world's programs call files so, and only a search through
+/// all of its bytes tells whether one carries a record. Who names one can read it.
 bool isContentName(const URL& url);
 
 /// Calls `item` for every content item at or below `path`, in the order of names.

@@ -1,5 +1,6 @@
 #include "platform/XmlDocument.h"
 
+#include "platform/Decompression.h"
 #include "platform/FileAccess.h"
 #include "platform/Text.h"
 
@@ -27,6 +28,10 @@ using Owned = std::unique_ptr<T, Closer>;
 /// A file this large takes several times its size in memory once it is parsed.
 constexpr std::uint64_t kLargestXmlFile = 64ULL << 20U;
 
+std::string_view textOf(const std::vector<std::uint8_t>& bytes) {
+    return {reinterpret_cast<const char*>(bytes.data()), bytes.size()};
+}
+
 const xmlChar* xmlText(const std::string& text) {
     return reinterpret_cast<const xmlChar*>(text.c_str());
 }
@@ -44,7 +49,12 @@ XmlDocument::~XmlDocument() = default;
 std::shared_ptr<XmlDocument> XmlDocument::fromFile(const std::string& path, Error* error) {
     const auto bytes = readFile(path, error, kLargestXmlFile);
     if (!bytes) return nullptr;
-    return fromText({reinterpret_cast<const char*>(bytes->data()), bytes->size()}, path, error);
+    if (!path.ends_with(".zxml")) return fromText(textOf(*bytes), path, error);
+    Error reason;
+    const auto xml = decompress(*bytes, &reason);
+    if (xml) return fromText(textOf(*xml), path, error);
+    fail(error, static_cast<ErrorCode>(reason.code), fmt::format("{}: {}", printable(path), reason.message));
+    return nullptr;
 }
 
 std::shared_ptr<XmlDocument> XmlDocument::fromText(std::string_view text, std::string_view name,

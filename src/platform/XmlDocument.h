@@ -16,7 +16,8 @@ namespace qvct {
 /// entities hold. Use a document from one thread at a time.
 class XmlDocument {
   public:
-    /// Null, and an error, when the file cannot be read, is too large, or holds nothing.
+    /// A name that ends in ".zxml" says that the file is compressed. Null, and an error, when the file cannot
+    /// be read, is too large, or holds nothing.
     static std::shared_ptr<XmlDocument> fromFile(const std::string& path, Error* error = nullptr);
     /// `name` stands in messages.
     static std::shared_ptr<XmlDocument> fromText(std::string_view text, std::string_view name,

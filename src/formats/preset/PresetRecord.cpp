@@ -148,8 +148,9 @@ void setTaggings(PresetText& preset, const ObjectSet<TGRTTagging>& taggings) {
 void setContentInfo(PresetText& preset, const TGRTContentInfo& contentInfo) {
     PresetText::Items applications;
     for (const auto& info : contentInfo.applicationInfos()) {
-        if (!info->dictionary()) continue;
-        for (const auto& [key, value] : *info->dictionary()) {
+        const auto dictionary = info->dictionary();
+        if (!dictionary) continue;
+        for (const auto& [key, value] : *dictionary) {
             addItem(applications, key, value.string() != nullptr ? *value.string() : textOf(value));
         }
     }

@@ -78,7 +78,7 @@ std::optional<PresetText> PresetText::parse(std::string_view text, Error* error)
     };
     for (std::size_t start = 0; start < text.size();) {
         const std::size_t end = std::min(text.find('\n', start), text.size() - 1) + 1;
-        Line line{std::string(text.substr(start, end - start)), open, false};
+        Line line{std::string(text.substr(start, end - start)), open};
         start = end;
         if (!isValidUtf8(line.bytes)) {
             fail(error, kErrorMalformed, fmt::format("line {}: not UTF-8", preset.lines_.size() + 1));
@@ -91,9 +91,10 @@ std::optional<PresetText> PresetText::parse(std::string_view text, Error* error)
             leaveOpen();
             open = *tag;
             opened = preset.lines_.size() + 1;
-            line.section.clear();
+            line.section = open;
+            line.role = Line::opening;
         } else if (tag && !open.empty() && tag->substr(1) == open) {
-            line.closes = true;
+            line.role = Line::closing;
             open.clear();
         }
         preset.lines_.push_back(std::move(line));
@@ -113,8 +114,25 @@ std::optional<PresetText::Item> PresetText::itemOfLine(std::string_view line) {
 PresetText::Items PresetText::items(std::string_view section) const {
     Items result;
     for (const Line& line : lines_) {
-        if (line.section != section || line.closes) continue;
+        if (line.section != section || line.role != Line::inside) continue;
         if (auto item = itemOfLine(line.bytes)) result.push_back(std::move(*item));
+    }
+    return result;
+}
+
+std::vector<PresetText::Section> PresetText::sections() const {
+    std::vector<Section> result;
+    std::uint64_t offset = 0;
+    for (const Line& line : lines_) {
+        if (line.role == Line::opening) result.push_back({line.section, offset, 0, {}, false});
+        if (!line.section.empty()) {
+            Section& section = result.back();
+            section.size += line.bytes.size();
+            section.isClosed = line.role == Line::closing;
+            auto item = line.role == Line::inside ? itemOfLine(line.bytes) : std::nullopt;
+            if (item) section.items.push_back(std::move(*item));
+        }
+        offset += line.bytes.size();
     }
     return result;
 }
@@ -130,8 +148,8 @@ void PresetText::setItems(std::string_view section, const std::vector<std::strin
     std::optional<std::size_t> end;  // of the section's first occurrence
     for (Line& line : lines_) {
         const bool isInside = line.section == section;
-        if (isInside && line.closes && !end) end = lines.size();
-        const auto item = isInside && !line.closes ? itemOfLine(line.bytes) : std::nullopt;
+        if (isInside && line.role == Line::closing && !end) end = lines.size();
+        const auto item = isInside && line.role == Line::inside ? itemOfLine(line.bytes) : std::nullopt;
         const bool isOwned = item && std::find(owned.begin(), owned.end(), item->key) != owned.end();
         if (isOwned && !place) place = lines.size();
         if (!isOwned) lines.push_back(std::move(line));
@@ -140,16 +158,16 @@ void PresetText::setItems(std::string_view section, const std::vector<std::strin
     if (!place) place = end;
     if (!place) return appendSection(section, replacement);
     std::vector<Line> added;
-    for (const Item& item : replacement) added.push_back({lineOf(item), std::string(section), false});
+    for (const Item& item : replacement) added.push_back({lineOf(item), std::string(section)});
     lines_.insert(lines_.begin() + static_cast<std::ptrdiff_t>(*place), added.begin(), added.end());
 }
 
 void PresetText::appendSection(std::string_view section, const Items& items) {
     if (items.empty()) return;
     if (!lines_.empty() && !lines_.back().bytes.ends_with('\n')) lines_.back().bytes += lineEnd_;
-    lines_.push_back({fmt::format("<{}>{}", section, lineEnd_), {}, false});
-    for (const Item& item : items) lines_.push_back({lineOf(item), std::string(section), false});
-    lines_.push_back({fmt::format("</{}>{}", section, lineEnd_), std::string(section), true});
+    lines_.push_back({fmt::format("<{}>{}", section, lineEnd_), std::string(section), Line::opening});
+    for (const Item& item : items) lines_.push_back({lineOf(item), std::string(section)});
+    lines_.push_back({fmt::format("</{}>{}", section, lineEnd_), std::string(section), Line::closing});
 }
 
 std::string PresetText::text() const {

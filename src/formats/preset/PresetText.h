@@ -2,6 +2,7 @@
 
 #include "platform/Error.h"
 
+#include <cstdint>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -28,6 +29,16 @@ class PresetText {
     /// The items of all sections of that name, in their order; lines that are no items are passed over.
     Items items(std::string_view section) const;
 
+    /// One section as it stands in the text, from its opening to its closing line.
+    struct Section {
+        std::string name;
+        std::uint64_t offset = 0;  ///< In bytes.
+        std::uint64_t size = 0;
+        Items items;
+        bool isClosed = false;
+    };
+    std::vector<Section> sections() const;
+
     /// Replaces those items of a section whose keys are `owned` by `replacement`, which takes the place of
     /// the first of them, or follows the section's last line. A section that is not there is added at the
     /// end, unless there is nothing to put into it.
@@ -42,8 +53,8 @@ class PresetText {
   private:
     struct Line {
         std::string bytes;    // with what ends it
-        std::string section;  // empty outside of sections, and for the lines that open and close one
-        bool closes = false;
+        std::string section;  // in which it stands, its opening and closing lines included; else empty
+        enum { opening, inside, closing } role = inside;
     };
 
     static std::optional<Item> itemOfLine(std::string_view line);

@@ -1,0 +1,125 @@
+#include "Commands.h"
+#include "PropertyListOutput.h"
+#include "formats/TGRTFileNode.h"
+#include "platform/QVContentTaggingTypes.h"
+#include "platform/Text.h"
+
+#include <memory>
+
+#include <CLI/CLI.hpp>
+#include <fmt/format.h>
+
+namespace qvct::tool {
+namespace {
+
+struct Options {
+    std::vector<std::string> paths;
+    bool legacy = false;
+    bool mapped = false;
+};
+
+/// The record of an item; an empty one of its kind when it stores none, null when it cannot be read.
+std::shared_ptr<TGRTMetaData> readRecord(const URL& url, std::uint64_t bits, ToolContext& context) {
+    Error error;
+    auto record = TGRTFileNode::nodeWithFileURL(url)->readMetaDataWithOptions(bits, &error);
+    if (!error.message.empty()) {
+        context.itemFailed(error.message);
+        return nullptr;
+    }
+    if (record) return record;
+    record = TGRTMetaData::init();
+    record->setFileType(QVContentTaggingTypes::fallBackFileTypeForURL(url));
+    return record;
+}
+
+Json jsonOfRecord(const URL& url, const TGRTMetaData& record) {
+    Json json;
+    json["path"] = url.path();
+    const std::string name = record.displayName().value_or("");
+    json["displayName"] = name.empty() ? Json() : Json(name);
+    json["fileType"] = record.fileType();
+    json["subFileType"] = record.subFileType();
+    json["taggings"] = Json::array();
+    for (const auto& tagging : sortedTaggings(record.taggings()))
+        json["taggings"].push_back(jsonOfTagging(*tagging));
+    json["keyValues"] = jsonOfPropertyList(TGRTKeyValue::keyValueDictionaryForKeyValues(record.keyValues()));
+    json["contentInfo"] =
+        record.contentInfo() ? jsonOfPropertyList(record.contentInfo()->dictionary()) : Json::object();
+    return json;
+}
+
+void printField(const Terminal& terminal, std::string_view name, const std::vector<Word>& words) {
+    constexpr std::size_t width = 22;
+    if (words.empty()) return;
+    fmt::print("  {}{}\n", colored(terminal, Color::faint, padded(name, width - 2)),
+               wrapped(terminal, words, width));
+}
+
+void printRecord(const URL& url, const TGRTMetaData& record, const Terminal& terminal) {
+    fmt::print("{}\n", colored(terminal, Color::strong, printable(url.path())));
+    std::string kind(QVContentTaggingTypes::nameForFileType(record.fileType()));
+    if (record.subFileType() > 0) kind += fmt::format(", sub type {}", record.subFileType());
+    printField(terminal, "kind", {{kind, Color::plain}});
+    const std::string name = record.displayName().value_or("");
+    if (!name.empty()) printField(terminal, "name", {{printable(name), Color::plain}});
+    std::vector<Word> words;
+    std::string category;
+    const auto flush = [&] {
+        printField(terminal, category, words);
+        words.clear();
+    };
+    for (const auto& tagging : sortedTaggings(record.taggings())) {
+        if (tagging->category() != category) flush();
+        category = tagging->category();
+        words.push_back({textOfTagging(*tagging), tagging->level() ? Color::accent : Color::plain});
+    }
+    flush();
+    for (const auto& keyValue : record.keyValues()) {
+        words.push_back({fmt::format("{} {}", printable(keyValue->key()),
+                                     textOfPropertyList(keyValue->value().value_or(PropertyList("")))),
+                         Color::plain});
+    }
+    printField(terminal, "values", words);
+    words.clear();
+    if (!record.contentInfo()) return;
+    for (const std::string& path : record.contentInfo()->assetDependencyPaths())
+        words.push_back({printable(path), Color::plain});
+    printField(terminal, "needs", words);
+    words.clear();
+    for (const auto& info : record.contentInfo()->applicationInfos())
+        words.push_back({printable(fmt::format("{} {}", info->appIdentifier().value_or(""),
+                                               info->minimumVersion().value_or(""))),
+                         Color::plain});
+    printField(terminal, "opened by", words);
+}
+
+void run(const Options& options, ToolContext& context) {
+    const std::uint64_t bits = (options.legacy ? std::uint64_t{kReadLegacyTaggings} : 0) |
+                               (options.mapped ? std::uint64_t{kReadMappedTaggings} : 0);
+    Json json = Json::array();
+    for (const URL& url : context.contentItems(options.paths)) {
+        const auto record = readRecord(url, bits, context);
+        if (!record) continue;
+        if (context.format == Format::table) {
+            printRecord(url, *record, context.terminal());
+        } else {
+            json.push_back(jsonOfRecord(url, *record));
+        }
+    }
+    if (context.format != Format::table) printJson(json, context.format);
+}
+
+}  // namespace
+
+void addReadCommand(CLI::App& app, ToolContext& context) {
+    const auto options = std::make_shared<Options>();
+    auto* command = app.add_subcommand("read", "Shows what files and bundles store about themselves");
+    command->add_option("paths", options->paths, "Files and folders")->required()->type_name("PATH");
+    command->add_flag("--legacy", options->legacy,
+                      "Also the tags of retired vocabularies in old loops and presets");
+    command->add_flag("--mapped", options->mapped, "Also what those tags are called today");
+    command->footer("Example:\n  qvtag read --json --mapped Loops");
+    command->callback([options, &context] { run(*options, context); });
+}
+
+}  // namespace qvct::tool

@@ -1,0 +1,118 @@
+#include "TaggingEdit.h"
+
+#include "ToolContext.h"
+#include "platform/Text.h"
+#include "taxonomy/TGRTTaxonomySearching.h"
+
+#include <algorithm>
+#include <charconv>
+
+#include <fmt/format.h>
+
+namespace qvct::tool {
+namespace {
+
+std::optional<double> levelOf(std::string_view text) {
+    const bool isPercentage = text.ends_with('%');
+    if (isPercentage) text.remove_suffix(1);
+    double level = 0;
+    const auto [end, fault] = std::from_chars(text.data(), text.data() + text.size(), level);
+    if (fault != std::errc() || end != text.data() + text.size()) return std::nullopt;
+    if (isPercentage) level /= 100;
+    return level >= 0 && level <= 1 ? std::optional(level) : std::nullopt;
+}
+
+std::string knownCategories(const TGRTTaxonomy& taxonomy) {
+    std::vector<std::string> names;
+    for (const auto& category : taxonomy.categories()) names.push_back(category->identifier());
+    return join(names, ", ");
+}
+
+/// What is wrong with adding the tag; empty when nothing is.
+std::string problemOf(const TagArgument& argument) {
+    const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
+    if (!taxonomy->findCategoryWithIdentifier(argument.category)) {
+        return fmt::format("no category \"{}\"; there are: {}", printable(argument.category),
+                           knownCategories(*taxonomy));
+    }
+    if (taxonomy->findTagForLabel(argument.label, argument.category)) return {};
+    const auto similar =
+        TGRTTaxonomySearching::initWithTaxonomy(taxonomy)->findTagLabelsForString(argument.label, false);
+    return fmt::format("no tag \"{}\" in {}{}", printable(argument.label), argument.category,
+                       similar.empty() ? "" : "; there are: " + join(similar, ", "));
+}
+
+bool isOfTag(const TGRTTagging& tagging, std::string_view category, std::string_view label) {
+    return tagging.category() == category && tagging.label() == label;
+}
+
+}  // namespace
+
+std::optional<TagArgument> TagArgument::parse(std::string_view text, bool takesLevel) {
+    const std::size_t slash = text.find('/');
+    if (slash == std::string_view::npos || slash == 0) return std::nullopt;
+    TagArgument argument{std::string(text.substr(0, slash)), std::string(text.substr(slash + 1)), {}};
+    const std::size_t equals = argument.label.rfind('=');
+    if (takesLevel && equals != std::string::npos) {
+        argument.level = levelOf(std::string_view(argument.label).substr(equals + 1));
+        if (argument.level) argument.label.resize(equals);
+    }
+    return argument.label.empty() ? std::nullopt : std::optional(argument);
+}
+
+std::optional<TaggingEdit> TaggingEdit::make(const std::vector<std::string>& add,
+                                             const std::vector<std::string>& remove, bool creates,
+                                             ToolContext& context) {
+    TaggingEdit edit;
+    bool isRight = true;
+    const auto refuse = [&](const std::string& message) {
+        context.usageFailed(message);
+        isRight = false;
+    };
+    const auto taxonomy = TGRTTaxonomy::mutableDefaultTaxonomy();
+    for (const std::string& text : add) {
+        const auto argument = TagArgument::parse(text, true);
+        const std::string problem = !argument ? fmt::format("\"{}\" is no Category/Label", printable(text))
+                                    : creates ? std::string{}
+                                              : problemOf(*argument);
+        if (!problem.empty()) {
+            refuse(problem);
+            continue;
+        }
+        const auto tag = taxonomy->findOrCreateTagWithLabel(argument->label, argument->category);
+        edit.added_.push_back(TGRTTagging::initWithTag(
+            tag, argument->level ? TGRTLevel::levelWithWeight(*argument->level) : nullptr));
+        if (!edit.added_.back()) refuse(fmt::format("\"{}\" is no label", printable(argument->label)));
+    }
+    for (const std::string& text : remove) {
+        const auto argument = TagArgument::parse(text, false);
+        if (argument) edit.removed_.push_back(*argument);
+        if (!argument) refuse(fmt::format("\"{}\" is no Category/Label", printable(text)));
+    }
+    return isRight ? std::optional(edit) : std::nullopt;
+}
+
+ObjectSet<TGRTTagging> TaggingEdit::apply(const ObjectSet<TGRTTagging>& taggings) const {
+    ObjectSet<TGRTTagging> result;
+    for (const auto& tagging : taggings) {
+        const bool isRemoved = std::any_of(removed_.begin(), removed_.end(), [&](const TagArgument& tag) {
+            return isOfTag(*tagging, tag.category, tag.label);
+        });
+        const bool isReplaced = std::any_of(added_.begin(), added_.end(), [&](const auto& added) {
+            return isOfTag(*tagging, added->category(), added->label()) && !added->isEqual(*tagging);
+        });
+        if (!isRemoved && !isReplaced) result.insert(tagging);
+    }
+    for (const auto& tagging : added_) result.insert(tagging);
+    return result;
+}
+
+ObjectSet<TGRTTagging> difference(const ObjectSet<TGRTTagging>& a, const ObjectSet<TGRTTagging>& b) {
+    ObjectSet<TGRTTagging> result;
+    for (const auto& tagging : a) {
+        if (!b.contains(*tagging)) result.insert(tagging);
+    }
+    return result;
+}
+
+}  // namespace qvct::tool

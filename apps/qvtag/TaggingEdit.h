@@ -1,0 +1,49 @@
+#pragma once
+
+#include "platform/ObjectSet.h"
+#include "taxonomy/TGRTTagging.h"
+#include "taxonomy/TGRTTaxonomy.h"
+
+#include <memory>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace qvct::tool {
+
+class ToolContext;
+
+/// "Category/Label" or "Category/Label=LEVEL" as typed. The first "/" separates, so that labels may hold some
+/// ("Bright / Dark"); the last "=" does where a level follows it: 0 to 1, or 0% to 100%.
+struct TagArgument {
+    std::string category;
+    std::string label;
+    std::optional<double> level;
+
+    /// Nothing when there is no category or no label.
+    static std::optional<TagArgument> parse(std::string_view text, bool takesLevel);
+};
+
+/// A change of an item's taggings.
+class TaggingEdit {
+  public:
+    /// Wrong arguments are reported as wrong usage. Tags to add must be in the default taxonomy, unless
+    /// `creates`.
+    static std::optional<TaggingEdit> make(const std::vector<std::string>& add,
+                                           const std::vector<std::string>& remove, bool creates,
+                                           ToolContext& context);
+
+    bool isEmpty() const { return added_.empty() && removed_.empty(); }
+    /// Without what is removed, and with what is added in place of the same tag at another level.
+    ObjectSet<TGRTTagging> apply(const ObjectSet<TGRTTagging>& taggings) const;
+
+  private:
+    std::vector<std::shared_ptr<TGRTTagging>> added_;
+    std::vector<TagArgument> removed_;
+};
+
+/// The taggings of `a` that `b` has not.
+ObjectSet<TGRTTagging> difference(const ObjectSet<TGRTTagging>& a, const ObjectSet<TGRTTagging>& b);
+
+}  // namespace qvct::tool

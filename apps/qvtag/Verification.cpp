@@ -1,0 +1,78 @@
+#include "Verification.h"
+
+#include "formats/TGRTFileNode.h"
+#include "formats/preset/PresetRecord.h"
+#include "platform/FileAccess.h"
+#include "platform/QVContentTaggingTypes.h"
+
+#include <fmt/format.h>
+
+namespace qvct::tool {
+namespace {
+
+/// The bytes of an item that no write may change.
+std::optional<std::string> untouchedBytes(const URL& url, Error* error) {
+    if (isDirectory(url.path())) return std::string{};
+    const auto bytes = readFile(url.path(), error);
+    if (!bytes) return std::nullopt;
+    std::string text(bytes->begin(), bytes->end());
+    if (QVContentTaggingTypes::fallBackFileTypeForURL(url) != kFileTypeSynthPreset) return text;
+    auto preset = PresetText::parse(text, error);
+    if (!preset) return std::nullopt;
+    setTaggings(*preset, {});
+    setDescription(*preset, *TGRTMetaData::init());
+    return preset->text();
+}
+
+bool isAudio(const URL& url) {
+    const FileType type = QVContentTaggingTypes::fallBackFileTypeForURL(url);
+    return type == kFileTypeAudioFile || type == kFileTypeLoop || type == kFileTypeNone;
+}
+
+}  // namespace
+
+std::optional<Verification> Verification::before(const URL& url, Error* error) {
+    Verification verification(url);
+    if (isAudio(url)) {
+        verification.audio_ = fingerprintOfFile(url, error);
+        return verification.audio_ ? std::optional(verification) : std::nullopt;
+    }
+    verification.untouched_ = untouchedBytes(url, error);
+    return verification.untouched_ ? std::optional(verification) : std::nullopt;
+}
+
+std::vector<std::string> Verification::faultsAfterWriting(const TGRTMetaData& expected) const {
+    std::vector<std::string> faults;
+    Error error;
+    if (audio_) {
+        const auto after = fingerprintOfFile(url_, &error);
+        if (after) faults = audio_->differences(*after);
+        if (!after) faults.push_back(error.message);
+    } else {
+        const auto after = untouchedBytes(url_, &error);
+        if (!after) faults.push_back(error.message);
+        if (after && *after != *untouched_) faults.emplace_back("what is not ours differs");
+    }
+    const auto stored = TGRTFileNode::nodeWithFileURL(url_)->readMetaDataWithOptions(0, &error);
+    if (!stored) {
+        faults.push_back(error.message.empty() ? "no record is there" : error.message);
+    } else if (!(stored->taggings() == expected.taggings()) ||
+               stored->displayName().value_or("") != expected.displayName().value_or("")) {
+        faults.emplace_back("the record that is there is not the one that was written");
+    }
+    return faults;
+}
+
+Json Verification::summary() const {
+    Json json = Json::object();
+    if (audio_) {
+        json["audioBytes"] = audio_->audioSize;
+        json["audioHash"] = fmt::format("{:016x}", audio_->audioHash);
+        json["chunks"] = audio_->chunks.size();
+    } else if (!untouched_->empty()) {
+        json["bytes"] = untouched_->size();
+    }
+    return json;
+}
+
+}  // namespace qvct::tool

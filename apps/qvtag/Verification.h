@@ -1,0 +1,36 @@
+#pragma once
+
+#include "Output.h"
+#include "metadata/TGRTMetaData.h"
+#include "platform/Error.h"
+#include "platform/LCFileWriter.h"
+#include "platform/Url.h"
+
+#include <optional>
+#include <string>
+#include <vector>
+
+namespace qvct::tool {
+
+/// What a write must leave alone, taken before it and compared after it: of audio the samples and every chunk
+/// that is not ours, of settings files the whole file, of presets every line that is not ours. Of every kind
+/// the record is read back.
+class Verification {
+  public:
+    /// Nothing and an error when the item cannot be read.
+    static std::optional<Verification> before(const URL& url, Error* error);
+
+    /// One sentence for each fault; empty when all is as it should be.
+    std::vector<std::string> faultsAfterWriting(const TGRTMetaData& expected) const;
+    /// What was compared: {"audioBytes","audioHash","chunks"}, {"bytes"} or nothing.
+    Json summary() const;
+
+  private:
+    explicit Verification(URL url) : url_(std::move(url)) {}
+
+    URL url_;
+    std::optional<LCFingerprint> audio_;
+    std::optional<std::string> untouched_;
+};
+
+}  // namespace qvct::tool

@@ -1,0 +1,220 @@
+#include "Commands.h"
+#include "TaggingEdit.h"
+#include "Verification.h"
+#include "formats/TGRTFileNode.h"
+#include "formats/bundle/TGRTBundleMetaDataReader.h"
+#include "platform/FileAccess.h"
+#include "platform/PropertyListFile.h"
+#include "platform/Text.h"
+
+#include <algorithm>
+#include <memory>
+#include <optional>
+
+#include <CLI/CLI.hpp>
+#include <fmt/format.h>
+
+namespace qvct::tool {
+namespace {
+
+struct Options {
+    std::vector<std::string> paths;
+    std::vector<std::string> add;
+    std::vector<std::string> remove;
+    std::optional<std::string> name;
+    bool creates = false;
+    bool isDryRun = false;
+    bool verifies = false;
+    bool keepsTimes = false;
+};
+
+/// What a write does, or did, to one item.
+struct Change {
+    URL url;
+    std::shared_ptr<TGRTMetaData> record;  // as it is to be
+    ObjectSet<TGRTTagging> added;
+    ObjectSet<TGRTTagging> removed;
+    std::string oldName;
+    std::optional<std::string> newName;
+    bool isWritten = false;
+    std::optional<Json> verified;
+
+    bool isNone() const { return added.empty() && removed.empty() && !newName; }
+};
+
+/// The entries of a bundle's property list that a record cannot hold. Writing a whole record drops them.
+std::vector<std::string> foreignEntries(const URL& url) {
+    const auto reader = std::dynamic_pointer_cast<TGRTBundleMetaDataReader>(
+        TGRTFileNode::nodeWithFileURL(url)->metaDataReaderForFileURL(url));
+    if (!reader) return {};
+    const auto stored =
+        readDictionaryFile(url.URLByAppendingPathComponent(reader->plistPathComponent()).path());
+    auto record = TGRTMetaData::init();
+    record->setDisplayName("");
+    record->setSubFileType(1);
+    record->setContentInfo(TGRTContentInfo::init());
+    const auto known = record->prepareDictionaryForURL(url);
+    std::vector<std::string> keys;
+    for (const auto& entry : stored.value_or(PropertyList::Dictionary{})) {
+        const bool isKnown = known.value(entry.key) != nullptr || entry.key == QVContentTaggingUUIDKeyName;
+        if (!isKnown) keys.push_back(printable(entry.key));
+    }
+    return keys;
+}
+
+std::optional<Change> changeOfItem(const URL& url, const TaggingEdit& edit, const Options& options,
+                                   ToolContext& context) {
+    const auto node = TGRTFileNode::nodeWithFileURL(url);
+    const std::string path = printable(url.path());
+    Error error;
+    Change change{url, nullptr, {}, {}, {}, {}, false, {}};
+    if (!node->validator()) {
+        node->readMetaDataWithOptions(0, &error);
+        const std::string reason = error.message.empty() ? path + ": cannot be written" : error.message;
+        context.itemFailed(reason);
+        return std::nullopt;
+    }
+    change.record = node->readMetaDataWithOptions(0, &error);
+    if (!error.message.empty()) {
+        context.itemFailed(error.message);
+        return std::nullopt;
+    }
+    if (!change.record) change.record = TGRTMetaData::init();
+    const auto before = change.record->taggings();
+    change.record->setTaggings(edit.apply(before));
+    change.added = difference(change.record->taggings(), before);
+    change.removed = difference(before, change.record->taggings());
+    change.oldName = change.record->displayName().value_or("");
+    if (options.name && *options.name != change.oldName) {
+        change.newName = options.name;
+        change.record->setDisplayName(*options.name);
+        const std::vector<std::string> lost = foreignEntries(url);
+        if (!lost.empty()) {
+            context.itemFailed(
+                fmt::format("{}: not renamed, since that would drop entries that are not ours: {}", path,
+                            join(lost, ", ")));
+            return std::nullopt;
+        }
+    }
+    return change;
+}
+
+bool write(const Change& change, const Options& options, Error* error) {
+    const ContentWriteOptions how{.keepsTimes = options.keepsTimes, .verifies = options.verifies};
+    const auto node = TGRTFileNode::nodeWithFileURL(change.url);
+    if (change.newName) {
+        const auto writer = node->metaDataWriterForFileURL(change.url);
+        return writer && writer->writeMetaData(change.record, change.url, error, how);
+    }
+    const auto writer = node->taggingWriterForFileURL(change.url);
+    return writer && writer->writeTaggings(change.record->taggings(), change.url, error, how);
+}
+
+/// Whether the item is as it should be now.
+bool carryOut(Change& change, const Options& options, ToolContext& context) {
+    Error error;
+    std::optional<Verification> verification;
+    if (options.verifies) {
+        verification = Verification::before(change.url, &error);
+        if (!verification) {
+            context.itemFailed(error.message);
+            return false;
+        }
+    }
+    change.isWritten = write(change, options, &error);
+    if (!change.isWritten) {
+        context.itemFailed(error.message.empty() ? printable(change.url.path()) + ": cannot be written"
+                                                 : error.message);
+        return false;
+    }
+    if (!verification) return true;
+    const std::vector<std::string> faults = verification->faultsAfterWriting(*change.record);
+    change.verified = verification->summary();
+    (*change.verified)["faults"] = faults;
+    for (const std::string& fault : faults)
+        context.itemFailed(fmt::format("{}: {}", printable(change.url.path()), fault));
+    return true;
+}
+
+Json jsonOfTaggings(const ObjectSet<TGRTTagging>& taggings) {
+    Json json = Json::array();
+    for (const auto& tagging : sortedTaggings(taggings)) json.push_back(jsonOfTagging(*tagging));
+    return json;
+}
+
+Json jsonOfChange(const Change& change) {
+    Json json;
+    json["path"] = change.url.path();
+    json["written"] = change.isWritten;
+    json["added"] = jsonOfTaggings(change.added);
+    json["removed"] = jsonOfTaggings(change.removed);
+    json["name"] = change.newName ? Json{{"from", change.oldName}, {"to", *change.newName}} : Json();
+    json["verified"] = change.verified.value_or(Json());
+    return json;
+}
+
+void printChange(const Change& change, const Terminal& terminal) {
+    fmt::print("{}\n", colored(terminal, Color::strong, printable(change.url.path())));
+    for (const auto& tagging : sortedTaggings(change.removed))
+        fmt::print("  - {}/{}\n", tagging->category(), textOfTagging(*tagging));
+    for (const auto& tagging : sortedTaggings(change.added))
+        fmt::print("  + {}/{}\n", tagging->category(), textOfTagging(*tagging));
+    if (change.newName)
+        fmt::print("  name \"{}\" becomes \"{}\"\n", printable(change.oldName), printable(*change.newName));
+    if (change.isNone()) fmt::print("  {}\n", colored(terminal, Color::faint, "nothing to change"));
+    if (change.verified) {
+        fmt::print("  {}\n", colored(terminal, Color::faint, "verified " + jsonText(*change.verified, true)));
+    }
+}
+
+void run(const Options& options, ToolContext& context) {
+    const auto edit = TaggingEdit::make(options.add, options.remove, options.creates, context);
+    if (!edit) return;
+    if (edit->isEmpty() && !options.name)
+        return context.usageFailed("nothing to write: --add, --remove or --name");
+    Json json = Json::array();
+    std::size_t written = 0;
+    std::size_t unchanged = 0;
+    for (const URL& url : context.contentItems(options.paths)) {
+        auto change = changeOfItem(url, *edit, options, context);
+        if (!change) continue;
+        unchanged += change->isNone() ? 1 : 0;
+        if (!change->isNone() && !options.isDryRun && !carryOut(*change, options, context)) continue;
+        written += change->isWritten ? 1 : 0;
+        if (context.format == Format::table) {
+            printChange(*change, context.terminal());
+        } else {
+            json.push_back(jsonOfChange(*change));
+        }
+    }
+    if (context.format != Format::table) return printJson(json, context.format);
+    context.note(options.isDryRun ? std::string("nothing was written: this is a dry run")
+                                  : fmt::format("{} items written, {} unchanged", written, unchanged));
+}
+
+}  // namespace
+
+void addWriteCommand(CLI::App& app, ToolContext& context) {
+    const auto options = std::make_shared<Options>();
+    auto* command = app.add_subcommand("write", "Changes the tags and the name that items store");
+    command->add_option("paths", options->paths, "Files and folders")->required()->type_name("PATH");
+    command
+        ->add_option("--add", options->add, "Tag to add, or to give another level (0 to 1, or a percentage)")
+        ->type_name("CATEGORY/LABEL[=LEVEL]")
+        ->allow_extra_args(false);
+    command->add_option("--remove", options->remove, "Tag to remove, whatever its level")
+        ->type_name("CATEGORY/LABEL")
+        ->allow_extra_args(false);
+    command->add_option("--name", options->name, "Display name")->type_name("NAME");
+    command->add_flag("--create", options->creates, "Also add tags that the taxonomy does not know");
+    command->add_flag("--dry-run", options->isDryRun, "Show what would change, and write nothing");
+    command->add_flag("--verify", options->verifies,
+                      "Compare audio and all that is not ours before and after, and read the record back");
+    command->add_flag("--keep-times", options->keepsTimes, "Files keep their times of access and change");
+    command->footer(
+        "The first \"/\" separates category and label: \"Sound Descriptors/Bright / Dark=25%\".\n"
+        "Example:\n  qvtag write --add Genres/House --add \"Source/Bass=0.5\" --dry-run Loops");
+    command->callback([options, &context] { run(*options, context); });
+}
+
+}  // namespace qvct::tool

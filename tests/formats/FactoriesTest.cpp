@@ -1,0 +1,283 @@
+#include "FormatsSupport.h"
+#include "formats/QVContentEditorFileUtilities.h"
+#include "formats/TGRTFileNode.h"
+#include "formats/TGRTMetaDataReaderFactory.h"
+#include "formats/TGRTMetaDataWriterFactory.h"
+#include "formats/TGRTPackage.h"
+#include "formats/audiofile/TGRTAudioFileTypeValidator.h"
+#include "formats/bundle/TGRTBundleTypeValidators.h"
+#include "formats/preset/TGRTVorthalPresetTypeValidator.h"
+#include "formats/settings/TGRTBinaryFileMetaDataReader.h"
+#include "formats/settings/TGRTCstSxvPstTypeValidator.h"
+#include "support/AudioFixtures.h"
+
+#include <filesystem>
+#include <typeindex>
+
+#include <gmock/gmock.h>
+
+namespace qvct {
+namespace {
+
+using test::Caf;
+using test::Dictionary;
+using test::TemporaryFolder;
+using test::urlOf;
+using test::Wav;
+using testing::ElementsAre;
+
+/// The class of what a pointer points to.
+template <typename Pointer>
+std::type_index classOf(const Pointer& pointer) {
+    return pointer ? std::type_index(typeid(*pointer)) : std::type_index(typeid(nullptr));
+}
+
+template <typename Class>
+std::type_index is() {
+    return typeid(Class);
+}
+
+std::string plainWav() {
+    const Wav wav;
+    return wav.file(wav.format() + wav.data());
+}
+
+std::string loopWav() {
+    const Wav wav;
+    return wav.file(wav.acid(0, 60, 4, 120) + wav.format() + wav.data());
+}
+
+TEST(ReaderFactory, GoesByTheExtensionAlone) {
+    struct {
+        const char* path;
+        std::type_index reader;
+    } const cases[] = {
+        {"/none/KICK.WAV", is<TGRTTavioLoopMetaDataReader>()},
+        {"/none/a.aif", is<TGRTTavioLoopMetaDataReader>()},
+        {"/none/a.AIFF", is<TGRTTavioLoopMetaDataReader>()},
+        {"/none/a.caf", is<TGRTTavioLoopMetaDataReader>()},
+        {"/none/a.loopdata", is<TGRTTavioLoopMetaDataReader>()},
+        {"/none/a.Patch", is<TGRTPatchMetaDataReader>()},
+        {"/none/a.ostrax", is<TGRTOstraProjectMetaDataReader>()},
+        {"/none/a.vcp", is<TGRTVorthalPresetMetaDataReader>()},
+        {"/none/a.cst", is<TGRTCstSxvPstMetaDataReader>()},
+        {"/none/a.sxv", is<TGRTCstSxvPstMetaDataReader>()},
+        {"/none/a.pst", is<TGRTCstSxvPstMetaDataReader>()},
+        {"/none/a.aaz", is<TGRTCstSxvPstMetaDataReader>()},
+        {"/none/a.data", is<TGRTBinaryFileMetaDataReader>()},
+        {"/none/a.txt", is<std::nullptr_t>()},
+        {"/none/wav", is<std::nullptr_t>()},
+    };
+    for (const auto& c : cases) {
+        EXPECT_EQ(classOf(TGRTMetaDataReaderFactory::metaDataReaderForURL(urlOf(c.path))), c.reader)
+            << c.path;
+    }
+    EXPECT_FALSE(TGRTBundleMetaDataReader::supportsFileExtension("patch"));
+    EXPECT_FALSE(TGRTAudioFileMetaDataReader::supportsFileExtension("loopdata"));
+}
+
+TEST(BaseReader, FillsNothingButTheUUID) {
+    const auto reader = TGRTMetaDataReaderFactory::metaDataReaderForURL(urlOf("/no/such.wav"));
+    std::string uuid = "mine";
+    std::int64_t fileType = 99;
+    auto taggings = test::taggingsOf({{"Genres", "House"}});
+    ObjectSet<TGRTKeyValue> keyValues = {TGRTKeyValue::initWithKeyStringValue("a", "b")};
+    EXPECT_FALSE(reader->readUUID(&uuid, &fileType, &taggings, &keyValues, 0, urlOf("/no/such.wav")));
+    EXPECT_EQ(uuid, "mine");
+    EXPECT_EQ(fileType, kFileTypeNone);
+    EXPECT_TRUE(taggings.empty() && keyValues.empty());
+    EXPECT_FALSE(reader->readUUID(nullptr, nullptr, nullptr, nullptr, 0, urlOf("/no/such.wav")));
+}
+
+/// Every kind of item that there is, and things that only look like one.
+struct Items {
+    TemporaryFolder folder;
+
+    Items() {
+        folder.write("plain.wav", plainWav());
+        folder.write("loop.wav", loopWav());
+        folder.write("named.any", plainWav());
+        folder.write("broken.wav", "RIFF");
+        folder.write("Bass.cst", "");
+        folder.write("Bass.cst.caf", Caf::file(Caf::description() + Caf::data()));
+        folder.write("Sampler.sxv", "");
+        folder.write("Echo.PST", "");
+        folder.write("Strip.aaz", "");
+        folder.write("Lead.vcp", "");
+        folder.write("Pad.patch/prelisten.caf", Caf::file(Caf::description() + Caf::data()));
+        folder.write("Pad.patch/inside.pst", "");
+        folder.write("Pad.patch/deep/inside.pst", "");
+        folder.write("Dry.patch/x", "");
+        folder.write("Song.ostrax/x", "");
+        folder.write("file.patch", "");
+        folder.write("file.ostrax", "");
+        folder.write("folder.vcp/x", "");
+        folder.write("folder.cst/x", "");
+        folder.write("words.txt", "words");
+    }
+};
+
+TEST(FileNode, FindsTheValidatorWithItsActionsReaderAndWriters) {
+    const Items items;
+    const auto none = is<std::nullptr_t>();
+    struct {
+        const char* name;
+        std::type_index validator;
+        unsigned actions;
+        const char* preview;
+        std::type_index reader;
+        std::type_index taggingWriter;
+        std::type_index metaDataWriter;
+    } const cases[] = {
+        {"plain.wav", is<TGRTAudioFileTypeValidator>(), 12, "plain.wav", is<TGRTAudioFileMetaDataReader>(),
+         is<TGRTAudioFileTaggingWriter>(), is<TGRTAudioFileMetaDataWriter>()},
+        {"loop.wav", is<TGRTTavioLoopTypeValidator>(), 12, "loop.wav", is<TGRTTavioLoopMetaDataReader>(),
+         is<TGRTTavioLoopTaggingWriter>(), is<TGRTTavioLoopMetaDataWriter>()},
+        {"named.any", is<TGRTAudioFileTypeValidator>(), 12, "named.any", is<TGRTAudioFileMetaDataReader>(),
+         is<TGRTAudioFileTaggingWriter>(), is<TGRTAudioFileMetaDataWriter>()},
+        {"Bass.cst", is<TGRTCstSxvPstTypeValidator>(), 1, "", is<TGRTCstSxvPstMetaDataReader>(),
+         is<TGRTCstSxvPstTaggingWriter>(), is<TGRTCstSxvPstMetaDataWriter>()},
+        {"Sampler.sxv", is<TGRTCstSxvPstTypeValidator>(), 3, "", is<TGRTCstSxvPstMetaDataReader>(),
+         is<TGRTCstSxvPstTaggingWriter>(), is<TGRTCstSxvPstMetaDataWriter>()},
+        {"Echo.PST", is<TGRTCstSxvPstTypeValidator>(), 3, "", is<TGRTCstSxvPstMetaDataReader>(),
+         is<TGRTCstSxvPstTaggingWriter>(), is<TGRTCstSxvPstMetaDataWriter>()},
+        {"Strip.aaz", is<TGRTCstSxvPstTypeValidator>(), 0, "", is<TGRTCstSxvPstMetaDataReader>(),
+         is<TGRTCstSxvPstTaggingWriter>(), is<TGRTCstSxvPstMetaDataWriter>()},
+        {"Lead.vcp", is<TGRTVorthalPresetTypeValidator>(), 2, "", is<TGRTVorthalPresetMetaDataReader>(),
+         is<TGRTVorthalPresetMetaDataWriter>(), is<TGRTVorthalPresetMetaDataWriter>()},
+        {"Pad.patch", is<TGRTPatchTypeValidator>(), 5, "Pad.patch/prelisten.caf",
+         is<TGRTPatchMetaDataReader>(), is<TGRTPatchTaggingWriter>(), is<TGRTPatchMetaDataWriter>()},
+        {"Dry.patch", is<TGRTPatchTypeValidator>(), 1, "", is<TGRTPatchMetaDataReader>(),
+         is<TGRTPatchTaggingWriter>(), is<TGRTPatchMetaDataWriter>()},
+        {"Song.ostrax", is<TGRTOstraProjectTypeValidator>(), 0, "", is<TGRTOstraProjectMetaDataReader>(),
+         is<TGRTOstraProjectTaggingWriter>(), is<TGRTOstraProjectMetaDataWriter>()},
+        {"Pad.patch/deep/inside.pst", is<TGRTCstSxvPstTypeValidator>(), 3, "",
+         is<TGRTCstSxvPstMetaDataReader>(), is<TGRTCstSxvPstTaggingWriter>(),
+         is<TGRTCstSxvPstMetaDataWriter>()},
+        // What lies in a patch, previews, and what is not what its name says.
+        {"Pad.patch/inside.pst", none, 0, "", none, none, none},
+        {"Pad.patch/prelisten.caf", none, 0, "", none, none, none},
+        {"Bass.cst.caf", none, 0, "", none, none, none},
+        {"file.patch", none, 0, "", none, none, none},
+        {"file.ostrax", none, 0, "", none, none, none},
+        {"folder.vcp", none, 0, "", none, none, none},
+        {"folder.cst", none, 0, "", none, none, none},
+        {"broken.wav", none, 0, "", none, none, none},
+        {"words.txt", none, 0, "", none, none, none},
+        {"absent.wav", none, 0, "", none, none, none},
+    };
+    for (const auto& c : cases) {
+        const URL url = urlOf(items.folder.path(c.name));
+        const auto node = TGRTFileNode::nodeWithFileURL(url);
+        EXPECT_EQ(classOf(node->validator()), c.validator) << c.name;
+        EXPECT_EQ(node->itemActions(), c.actions) << c.name;
+        const auto preview = node->prelistenURL();
+        EXPECT_EQ(preview ? preview->path() : "", *c.preview ? items.folder.path(c.preview) : "") << c.name;
+        EXPECT_EQ(classOf(node->metaDataReaderForFileURL(url)), c.reader) << c.name;
+        EXPECT_EQ(classOf(TGRTMetaDataWriterFactory::taggingWriterForURL(url)), c.taggingWriter) << c.name;
+        EXPECT_EQ(classOf(TGRTMetaDataWriterFactory::metaDataWriterForURL(url)), c.metaDataWriter) << c.name;
+        EXPECT_EQ(TGRTMetaDataWriterFactory::contentInfoWriterForURL(url) == nullptr, c.reader == none)
+            << c.name;
+    }
+}
+
+TEST(FileNode, ActionsOfTwoValidatorsDoNotLookAtTheURL) {
+    const URL absent = urlOf("/no/such.txt");
+    EXPECT_EQ(TGRTAudioFileTypeValidator().itemActionsForFileURL(absent), 12U);
+    EXPECT_EQ(TGRTVorthalPresetTypeValidator().itemActionsForFileURL(absent), 2U);
+    EXPECT_EQ(TGRTCstSxvPstTypeValidator().itemActionsForFileURL(urlOf("/no/such.pst")), 0U);
+    const URL remote = URL::URLWithString("http://host/tmp");
+    EXPECT_EQ(TGRTFileNode::validatorForFileURL(remote), nullptr);
+}
+
+TEST(FileNode, ReadsAudioOfAnyNameAndNamesWhatIsNoContent) {
+    const Items items;
+    const auto read = [&](const char* name, Error* error) {
+        return TGRTFileNode::nodeWithFileURL(urlOf(items.folder.path(name)))
+            ->readMetaDataWithOptions(0, error);
+    };
+    Error error;
+    ASSERT_NE(read("named.any", &error), nullptr);
+    EXPECT_EQ(read("named.any", &error)->fileType(), kFileTypeAudioFile);
+    EXPECT_EQ(read("Bass.cst", &error), nullptr);
+    EXPECT_EQ(error.message, "") << "an item that stores nothing is not broken";
+    EXPECT_EQ(read("words.txt", &error), nullptr);
+    EXPECT_THAT(error.message, testing::EndsWith("words.txt: no kind of content"));
+}
+
+TEST(PrelistenFiles, AreToldByTheEndOfThePath) {
+    struct {
+        const char* path;
+        bool isPreview;
+    } const cases[] = {
+        {"/a/Bass.cst.caf", true},
+        {"/a/BASS.CST.CAF", true},
+        {"/a/x.vcp.caf", true},
+        {"/a/x.pst.caf", true},
+        {"/a/x.sxv.caf", true},
+        {"/a/Pad.patch/prelisten.caf", true},
+        {"/a/Pad.PATCH/Prelisten.caf", true},
+        {"/a/.cst.caf", true},
+        {"/a/x.aaz.caf", false},
+        {"/a/x.patch.caf", false},
+        {"/a/x.cst.wav", false},
+        {"/a/prelisten.caf", false},
+        {"/a/Pad.patch/other.caf", false},
+        {"/a/Pad.patch/prelisten.aif", false},
+        {"/a/cst.caf", false},
+    };
+    for (const auto& c : cases)
+        EXPECT_EQ(TGRTAudioFileTypeValidator::isPrelistenFile(urlOf(c.path)), c.isPreview) << c.path;
+}
+
+/// The names of the candidates in order; each is found once those before it are gone.
+void expectInOrder(const TemporaryFolder& folder, const std::vector<std::string>& candidates,
+                   const std::function<std::optional<URL>()>& lookUp) {
+    for (const std::string& name : candidates) folder.write(name, "");
+    for (const std::string& name : candidates) {
+        const auto found = lookUp();
+        ASSERT_TRUE(found) << name;
+        EXPECT_EQ(found->path(), folder.path(name));
+        std::filesystem::remove(found->path());
+    }
+    EXPECT_EQ(lookUp(), std::nullopt);
+}
+
+TEST(FileUtilities, LookForCompanionsInTheirOrder) {
+    const TemporaryFolder folder;
+    const URL bundle = urlOf(folder.path("Pad.patch"));
+    expectInOrder(folder,
+                  {"Pad.patch/org.qvcontenttagging.intermediate.cache.zxml",
+                   "Pad.patch/org.qvcontenttagging.intermediate.cache.xml",
+                   "Pad.patch/#Root.cst.intermediate.cache.xml", "Pad.patch.zxml", "Pad.patch.xml"},
+                  [&] { return QVContentEditorFileUtilities::intermediateCacheURLForURL(bundle); });
+    expectInOrder(folder, {"Pad.patch/prelisten.caf", "Pad.patch.caf"},
+                  [&] { return QVContentEditorFileUtilities::prelistenURLForURL(bundle); });
+    const URL sound = urlOf(folder.path("Kick.AIFF"));
+    expectInOrder(folder, {"Kick.AIFF", "Kick.AIFF.caf"},
+                  [&] { return QVContentEditorFileUtilities::prelistenURLForURL(sound); });
+    for (const char* own : {"/no/such.XML", "/no/such.zxml"})
+        EXPECT_EQ(QVContentEditorFileUtilities::intermediateCacheURLForURL(urlOf(own)), urlOf(own));
+    EXPECT_EQ(QVContentEditorFileUtilities::intermediateCacheURLForURL(std::nullopt), std::nullopt);
+    EXPECT_EQ(QVContentEditorFileUtilities::prelistenURLForURL(std::nullopt), std::nullopt);
+}
+
+TEST(Packages, GatherTheItemsThatNameThem) {
+    const TemporaryFolder folder;
+    std::vector<URL> items;
+    for (const auto& [name, pack] :
+         {std::pair{"a.cst", "0002_analogpulse"}, {"b.cst", "home made"}, {"c.cst", "0002_analogpulse"}}) {
+        test::writeList(folder, std::string(name) + ".plist",
+                        {{"Tagging", test::taggingDictionary("Soundpack", pack)}});
+        items.push_back(urlOf(folder.path(name)));
+    }
+    items.push_back(urlOf(folder.path("absent.cst")));
+    const auto packages = TGRTPackage::packagesForItems(items);
+    ASSERT_EQ(packages.size(), 2U);
+    EXPECT_EQ(packages[0]->displayName(), "Analog Pulse");
+    EXPECT_THAT(packages[0]->items(), ElementsAre(items[0], items[2]));
+    EXPECT_EQ(packages[1]->displayName(), "home made");
+}
+
+}  // namespace
+}  // namespace qvct
