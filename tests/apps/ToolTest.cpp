@@ -230,7 +230,7 @@ TEST(Usage, WrongWordsEndWithTwo) {
         EXPECT_THAT(result.errors, Not(IsEmpty()));
     }
     EXPECT_EQ(runTool({"--help"}).status, 0);
-    for (const char* command : {"autotag", "keywords", "taxonomy"}) {
+    for (const char* command : {"autotag", "inspect", "keywords", "read", "taxonomy", "write"}) {
         EXPECT_THAT(runTool({command, "--help"}).output, HasSubstr("Example:\n  qvtag ")) << command;
     }
 }

@@ -5,6 +5,8 @@
 #include "platform/LCFileWriter.h"
 #include "support/AudioFixtures.h"
 
+#include <algorithm>
+#include <functional>
 #include <map>
 
 #include <gmock/gmock.h>
@@ -84,7 +86,7 @@ TEST(LoopReader, ReadsLoopsAndOtherAudio) {
     EXPECT_EQ(loop->contentInfo()->assetDependencyPaths().count("/a"), 1U);
     EXPECT_THAT(
         valuesOf(*loop),
-        UnorderedElementsAre(Pair("LengthInSeconds", testing::FloatNear(0.0227F, 0.001F)),
+        UnorderedElementsAre(Pair("LengthInSeconds", testing::DoubleNear(0.0227, 0.001)),
                              Pair("BeatCount", 8), Pair("TavioLoopType", 0), Pair("MidiRootNote", -1),
                              Pair("KeyType", 0), Pair("SignatureTop", 0), Pair("SignatureBottom", 0)));
     EXPECT_EQ(loop->keyValues().ordered()[1]->key(), "BeatCount");
@@ -95,7 +97,7 @@ TEST(LoopReader, ReadsLoopsAndOtherAudio) {
     const auto notes = read(path, 3);
     EXPECT_EQ(notes->fileType(), 7);
     EXPECT_EQ(notes->subFileType(), -1);
-    EXPECT_THAT(valuesOf(*notes), ElementsAre(Pair("LengthInSeconds", testing::Gt(0))));
+    EXPECT_THAT(valuesOf(*notes), ElementsAre(Pair("LengthInSeconds", testing::Gt(0.0))));
     EXPECT_TRUE(TGRTTavioLoopTypeValidator().isValidContentTypeAtFileURL(urlOf(path)));
 
     EXPECT_EQ(read(folder.write("a.cst.caf", plain())), nullptr) << "previews have no record";

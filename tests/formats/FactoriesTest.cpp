@@ -12,6 +12,7 @@
 #include "support/AudioFixtures.h"
 
 #include <filesystem>
+#include <functional>
 #include <typeindex>
 
 #include <gmock/gmock.h>

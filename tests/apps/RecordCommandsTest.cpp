@@ -1,0 +1,231 @@
+// qvtag read, write and inspect: one item of every kind, as a user has them.
+
+#include "support/AudioFixtures.h"
+#include "support/RunTool.h"
+
+#include <filesystem>
+#include <map>
+#include <set>
+
+#include <gmock/gmock.h>
+#include <sys/stat.h>
+
+namespace qvct::test {
+namespace {
+
+using nlohmann::json;
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::IsEmpty;
+
+/// An item of each kind that can be written.
+struct Items {
+    TemporaryFolder folder;
+    std::vector<std::string> names = {"loop.wav",    "shot.aif", "Pad.patch",
+                                      "Song.ostrax", "Bass.cst", "Lead.vcp"};
+
+    Items() {
+        const Wav wav;
+        folder.write("loop.wav", wav.file(wav.acid(0, 60, 4, 120) + wav.format() + wav.data()));
+        folder.write("shot.aif", Aiff::file(Aiff::common() + Aiff::sound()));
+        folder.write("Pad.patch/data.plist", "");
+        folder.write("Song.ostrax/Media/x", "");
+        folder.write("Bass.cst", "settings");
+        folder.write("Lead.vcp", "Cutoff 3\n<tagging>\nAttribs = 4001,6004\n</tagging>\n");
+    }
+
+    std::vector<std::string> arguments(std::vector<std::string> before) const {
+        for (const std::string& name : names) before.push_back(folder.path(name));
+        return before;
+    }
+};
+
+std::set<std::string> tagsOf(const json& item) {
+    std::set<std::string> tags;
+    for (const json& tagging : item["taggings"])
+        tags.insert(tagging["category"].get<std::string>() + "/" + tagging["label"].get<std::string>() +
+                    (tagging["level"].is_null() ? "" : "=" + tagging["level"].dump()));
+    return tags;
+}
+
+TEST(Read, GivesOneRecordAnItem) {
+    const Items items;
+    const ToolResult result = runTool(items.arguments({"read", "--json"}));
+    EXPECT_EQ(result.status, 0) << result.errors;
+    const json records = result.json();
+    std::vector<int> types;
+    for (const json& record : records) {
+        types.push_back(record["fileType"]);
+        std::vector<std::string> keys;
+        for (const auto& [key, value] : record.items()) keys.push_back(key);
+        EXPECT_THAT(keys, testing::UnorderedElementsAre("path", "displayName", "fileType", "subFileType",
+                                                        "taggings", "keyValues", "contentInfo"));
+        EXPECT_TRUE(record["displayName"].is_null());
+        EXPECT_THAT(record["taggings"], IsEmpty());
+    }
+    EXPECT_THAT(types, ElementsAre(2, 7, 1, 8, 6, 3));
+    EXPECT_EQ(records[0]["keyValues"]["BeatCount"], 4);
+    const std::string preset = items.folder.path("Lead.vcp");
+    EXPECT_THAT(tagsOf(runTool({"read", "--json", "--legacy", preset}).json()[0]),
+                ElementsAre("VorthalCategory/Bass", "VorthalTimbre/Bright"));
+    EXPECT_THAT(tagsOf(runTool({"read", "--json", "--mapped", preset}).json()[0]),
+                testing::Contains(testing::StartsWith("Sound Descriptors/Bright / Dark=")));
+}
+
+TEST(Write, ChangesEveryKindOfItemAndVerifies) {
+    const Items items;
+    const std::vector<std::string> change = {
+        "write", "--json",       "--verify", "--keep-times",
+        "--add", "Genres/House", "--add",    "Sound Descriptors/Bright / Dark=25%"};
+    const ToolResult result = runTool(items.arguments(change));
+    EXPECT_EQ(result.status, 0) << result.errors;
+    for (const json& item : result.json()) {
+        EXPECT_EQ(item["written"], true);
+        EXPECT_EQ(item["added"].size(), 2U);
+        EXPECT_THAT(item["verified"]["faults"], IsEmpty());
+    }
+    EXPECT_EQ(result.json()[0]["verified"]["audioBytes"], 4000);
+    for (const json& item : runTool(items.arguments({"read", "--json"})).json())
+        EXPECT_THAT(tagsOf(item), ElementsAre("Genres/House", "Sound Descriptors/Bright / Dark=0.25"));
+    EXPECT_EQ(runTool({"read", "--json", items.folder.path("loop.wav")}).json()[0]["fileType"], 2);
+
+    // Another level replaces the tag; what is not there need not be removed.
+    const ToolResult again =
+        runTool(items.arguments({"write", "--json", "--add", "Sound Descriptors/Bright / Dark=1", "--remove",
+                                 "Genres/House", "--remove", "Genres/Techno"}));
+    EXPECT_EQ(again.status, 0) << again.errors;
+    for (const json& item : runTool(items.arguments({"read", "--json"})).json())
+        EXPECT_THAT(tagsOf(item), ElementsAre("Sound Descriptors/Bright / Dark=1.0"));
+    const ToolResult unchanged = runTool(items.arguments({"write", "--json", "--remove", "Genres/House"}));
+    for (const json& item : unchanged.json()) EXPECT_EQ(item["written"], false);
+}
+
+TEST(Write, NamesItemsAndKeepsTimes) {
+    const Items items;
+    const auto old = std::filesystem::file_time_type::clock::now() - std::chrono::hours(1000);
+    for (const char* name : {"loop.wav", "shot.aif", "Lead.vcp"})
+        std::filesystem::last_write_time(items.folder.path(name), old);
+    const ToolResult result =
+        runTool(items.arguments({"write", "--json", "--keep-times", "--name", "A = \"b\"\n"}));
+    EXPECT_EQ(result.status, 0) << result.errors;
+    for (const json& item : runTool(items.arguments({"read", "--json"})).json())
+        EXPECT_EQ(item["displayName"], "A = \"b\"\n") << item["path"];
+    for (const char* name : {"loop.wav", "shot.aif", "Lead.vcp"})
+        EXPECT_EQ(std::filesystem::last_write_time(items.folder.path(name)), old) << name;
+}
+
+TEST(Write, DryRunShowsTheDifferenceAndTouchesNothing) {
+    const Items items;
+    const auto contents = [&] {
+        std::map<std::string, std::string> files;
+        for (const auto& entry : std::filesystem::recursive_directory_iterator(items.folder.path()))
+            files[entry.path()] = entry.is_regular_file() ? readAll(entry.path()) : "";
+        return files;
+    };
+    const auto before = contents();
+    const ToolResult result = runTool(items.arguments({"write", "--dry-run", "--add", "Genres/House=0.5"}));
+    EXPECT_EQ(result.status, 0) << result.errors;
+    EXPECT_THAT(result.output, HasSubstr("loop.wav\n  + Genres/House 50%\n"));
+    EXPECT_EQ(contents(), before);
+}
+
+TEST(Write, RefusesWrongWordsBeforeAnythingIsTouched) {
+    const Items items;
+    const std::string item = items.folder.path("Bass.cst");
+    struct {
+        std::vector<std::string> arguments;
+        const char* message;
+    } const cases[] = {
+        {{"--add", "Genres/Huose"}, "no tag \"Huose\" in Genres"},
+        {{"--add", "Genre/House"}, "no category \"Genre\"; there are: Artist"},
+        {{"--add", "House"}, "\"House\" is no Category/Label"},
+        {{"--add", "Genres/House=1.5"}, "no tag \"House=1.5\""},
+        {{"--remove", "/House"}, "\"/House\" is no Category/Label"},
+        {{}, "nothing to write"},
+    };
+    for (const auto& c : cases) {
+        std::vector<std::string> arguments = {"write", item, "--add", "Genres/House"};
+        if (c.arguments.empty()) arguments.resize(2);
+        arguments.insert(arguments.end(), c.arguments.begin(), c.arguments.end());
+        const ToolResult result = runTool(arguments);
+        EXPECT_EQ(result.status, 2);
+        EXPECT_THAT(result.errors, HasSubstr(c.message));
+        EXPECT_FALSE(std::filesystem::exists(item + ".plist"));
+    }
+    EXPECT_EQ(runTool({"write", item, "--create", "--add", "Custom/Huose/x"}).status, 0);
+    EXPECT_THAT(tagsOf(runTool({"read", "--json", item}).json()[0]), ElementsAre("Custom/Huose/x"));
+}
+
+TEST(Write, NamesWhatFailsAndDoesTheRest) {
+    const Items items;
+    const std::string broken = items.folder.write("broken.wav", "RIFF");
+    const std::string text = items.folder.write("words.txt", "words");
+    const std::string list = items.folder.write("Sad.pst.plist", "no list");
+    const std::string sad = items.folder.write("Sad.pst", "");
+    items.folder.write("Pad.patch/tags.plist",
+                       "<plist version=\"1.0\"><dict><key>Mine</key><true/></dict></plist>");
+    const std::string patch = items.folder.path("Pad.patch");
+    const ToolResult result = runTool(
+        {"write", "--json", "--name", "New", broken, text, sad, patch, items.folder.path("Bass.cst")});
+    EXPECT_EQ(result.status, 1);
+    EXPECT_EQ(result.json().size(), 1U);
+    for (const std::string& message : {broken, text + ": no kind of content", list, patch + ": not renamed"})
+        EXPECT_THAT(result.errors, HasSubstr(message));
+    EXPECT_EQ(readAll(list), "no list");
+    EXPECT_EQ(runTool({"write", "--add", "Genres/House", patch}).status, 0);
+    EXPECT_THAT(readAll(patch + "/tags.plist"), HasSubstr("<key>Mine</key>"));
+}
+
+const json* partWithId(const json& parts, const std::string& id) {
+    for (const json& part : parts) {
+        if (part["id"] == id) return &part;
+        if (const json* child = partWithId(part["parts"], id)) return child;
+    }
+    return nullptr;
+}
+
+TEST(Inspect, ShowsWhatIsInEveryKindOfItem) {
+    const Items items;
+    items.folder.write("Bass.cst", std::string("QVST\0\2\0\xff\0\0\0\10MELCefx1tdly", 24));
+    items.folder.write("bits.data", "xxbplist00" + noise(60));
+    ASSERT_EQ(runTool(items.arguments({"write", "--quiet", "--add", "Genres/House"})).status, 0);
+    const ToolResult result = runTool(items.arguments({"inspect", "--json"}));
+    EXPECT_EQ(result.status, 0) << result.errors;
+    const json all = result.json();
+    struct {
+        std::size_t item;
+        const char* id;
+        json offset;
+        json size;
+        const char* meaning;
+    } const cases[] = {
+        {0, "acid", 12, 24, "loop"},
+        {0, "Name", nullptr, nullptr, "House"},
+        {1, "SSND", nullptr, nullptr, ""},
+        {2, "tags.plist", nullptr, nullptr, "record, 3 entries"},
+        {3, "Type", nullptr, nullptr, "8"},
+        {4, "header", 0, 24, "plug-in"},
+        {4, "sub ID", 7, 1, "-1"},
+        {4, "manufacturer", 12, 4, "\"MELC\" 0x4D454C43"},
+        {4, "Bass.cst.plist", nullptr, nullptr, "record"},
+        {5, "<tagging>", 9, nullptr, "3 items"},
+        {5, "Attribs", nullptr, nullptr, "4001,6004"},
+    };
+    for (const auto& c : cases) {
+        const json* part = partWithId(all[c.item]["parts"], c.id);
+        ASSERT_NE(part, nullptr) << c.id;
+        if (!c.offset.is_null()) {
+            EXPECT_EQ((*part)["offset"], c.offset) << c.id;
+        }
+        if (!c.size.is_null()) {
+            EXPECT_EQ((*part)["size"], c.size) << c.id;
+        }
+        EXPECT_THAT((*part)["meaning"].get<std::string>(), HasSubstr(c.meaning)) << c.id;
+    }
+    const ToolResult data = runTool({"inspect", items.folder.path("bits.data")});
+    EXPECT_EQ(data.status, 1);
+    EXPECT_THAT(data.errors, HasSubstr("bits.data: the property list at byte 2 has no end"));
+}
+
+}  // namespace
+}  // namespace qvct::test
