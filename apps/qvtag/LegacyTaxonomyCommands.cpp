@@ -157,8 +157,9 @@ void printList(std::string_view heading, const std::vector<std::string>& lines) 
 
 void printCoverage(const Coverage& coverage, const Terminal& terminal) {
     const auto paths = [](const std::vector<TagPointer>& tags) {
-        std::vector<std::string> lines;
-        for (const auto& tag : tags) lines.push_back(pathOfTag(*tag));
+        std::vector<std::string> lines(tags.size());
+        std::transform(tags.begin(), tags.end(), lines.begin(),
+                       [](const auto& tag) { return pathOfTag(*tag); });
         return lines;
     };
     const std::size_t mapped = coverage.tags - coverage.withEmptyRow.size() - coverage.withoutRow.size();
