@@ -69,31 +69,18 @@ double milliseconds(double seconds) {
     return seconds * 1e3;
 }
 
-/// Documents keep what scripts ask of them, so each evaluation gets one of its own, parsed beforehand.
-class Documents {
-  public:
-    Documents(std::string_view xml, std::size_t count) {
-        for (std::size_t i = 0; i < count; ++i) {
-            documents_.push_back(QVCTXMLDocument::initWithXMLData(xml, "bench"));
-        }
-    }
-    std::shared_ptr<QVCTXMLDocument> next() { return documents_.at(next_++); }
-
-  private:
-    std::vector<std::shared_ptr<QVCTXMLDocument>> documents_;
-    std::size_t next_ = 0;
-};
-
 void compareOnLargePatch(const PropertyList::Array& rules, QVCTXMLRulesTaggingService& service) {
     constexpr std::size_t kRepetitions = 41;
     const std::string xml = patchDescription(3000);
     const URL url = URL::fileURLWithPath("/bench.patch");
-    Documents forAlone(xml, kRepetitions), forTogether(xml, kRepetitions);
-    const double alone =
-        bench::medianSeconds([&] { evaluateEachAlone(rules, forAlone.next()); }, kRepetitions);
-    const double together = bench::medianSeconds(
-        [&] {
-            bench::keep(service.tagsWithContentsOfURL(url, forTogether.next(), nullptr, nullptr,
+    // Documents keep what scripts ask of them, so each evaluation gets one of its own.
+    const auto parsed = [&xml] { return QVCTXMLDocument::initWithXMLData(xml, "bench"); };
+    const double alone = bench::medianSecondsOn(
+        parsed, [&](const auto& document) { evaluateEachAlone(rules, document); }, kRepetitions);
+    const double together = bench::medianSecondsOn(
+        parsed,
+        [&](const auto& document) {
+            bench::keep(service.tagsWithContentsOfURL(url, document, nullptr, nullptr,
                                                       QVCTAutoTaggingOptionXMLRules));
         },
         kRepetitions);

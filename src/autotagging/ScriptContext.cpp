@@ -28,10 +28,9 @@ using Clock = std::chrono::steady_clock;
 constexpr double kSlice = 0.01;
 constexpr std::size_t kLongestMessage = 4096;
 
-/// Gives rules their way of logging, and puts every use of a regular expression under the guard (`this`): all
-/// methods of texts and expressions go through `exec`.
-constexpr std::string_view kPrelude = R"js(
-console.log = __log;
+/// Puts every use of a regular expression under the guard (`this`): all methods of texts and expressions go
+/// through `exec`.
+constexpr std::string_view kGuardInstallation = R"js(
 (function (guard) {
     const exec = RegExp.prototype.exec;
     RegExp.prototype.exec = function (string) {
@@ -93,10 +92,10 @@ struct ScriptContext::Implementation {
     int messages = 0;
     const QVCTXMLDocument* document = nullptr;
     std::shared_ptr<ContextGroup> group = sharedGroup();
-    JSGlobalContextRef context = JSGlobalContextCreateInGroup(group->reference(), globalClass());
+    JSGlobalContextRef context = JSGlobalContextCreateInGroup(group->reference(), nullptr);
 
     explicit Implementation(const ScriptLimits& chosen) : limits(chosen) {
-        JSObjectSetPrivate(JSContextGetGlobalObject(context), this);
+        outer = std::exchange(current, this);
         JSContextGroupSetExecutionTimeLimit(group->reference(), kSlice, shouldTerminate, this);
     }
     Implementation(const Implementation&) = delete;
@@ -104,16 +103,15 @@ struct ScriptContext::Implementation {
 
     ~Implementation() {
         JSContextGroupClearExecutionTimeLimit(group->reference());
-        JSObjectSetPrivate(JSContextGetGlobalObject(context), nullptr);
+        current = outer;
         JSGlobalContextRelease(context);
         // A machine that was stopped may hold much memory: the thread's next context begins with a new one.
         if (stop != Stop::none && groupOfThisThread() == group) groupOfThisThread().reset();
     }
 
-    /// The context that a callback belongs to. Scripts cannot reach it.
-    static Implementation& of(JSContextRef context) {
-        return *static_cast<Implementation*>(JSObjectGetPrivate(JSContextGetGlobalObject(context)));
-    }
+    /// The context whose script calls back. Kept here and not in the global object, since the engine looks up
+    /// the variables of a global object with private data slowly.
+    static Implementation& running() { return *current; }
 
     JSObjectRef global() const { return JSContextGetGlobalObject(context); }
 
@@ -168,7 +166,9 @@ struct ScriptContext::Implementation {
         return JSValueToNumber(context, capacity, nullptr);
     }
 
-    static JSClassRef globalClass();
+    void defineLog();
+    void installGuard();
+
     static JSClassRef documentClass();
     static JSValueRef logMessage(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
                                  JSValueRef*);
@@ -182,16 +182,11 @@ struct ScriptContext::Implementation {
                                  JSValueRef*);
 
     bool isStopLogged = false;
+    Implementation* outer = nullptr;
+    static thread_local Implementation* current;
 };
 
-JSClassRef ScriptContext::Implementation::globalClass() {
-    static const JSClassRef made = [] {
-        JSClassDefinition definition = kJSClassDefinitionEmpty;
-        definition.className = "global";
-        return JSClassCreate(&definition);
-    }();
-    return made;
-}
+thread_local ScriptContext::Implementation* ScriptContext::Implementation::current = nullptr;
 
 JSClassRef ScriptContext::Implementation::documentClass() {
     static const JSClassRef made = [] {
@@ -208,11 +203,28 @@ JSClassRef ScriptContext::Implementation::documentClass() {
     return made;
 }
 
+/// `console` is an object of our own, since the engine's takes longer to make than most scripts run.
+void ScriptContext::Implementation::defineLog() {
+    const JSObjectRef logFunction = JSObjectMakeFunctionWithCallback(context, nullptr, logMessage);
+    const JSObjectRef console = JSObjectMake(context, nullptr, nullptr);
+    for (const char* name : {"log", "info", "warn", "error", "debug"}) {
+        setProperty(context, console, name, logFunction);
+    }
+    setProperty(context, global(), "console", console);
+    setProperty(context, global(), "__log", logFunction);
+}
+
+void ScriptContext::Implementation::installGuard() {
+    static const ScriptString installation = scriptString(kGuardInstallation);
+    const JSObjectRef guard = JSObjectMakeFunctionWithCallback(context, nullptr, guardExpression);
+    JSEvaluateScript(context, installation.get(), guard, nullptr, 1, nullptr);
+}
+
 JSValueRef ScriptContext::Implementation::logMessage(JSContextRef context, JSObjectRef /*function*/,
                                                      JSObjectRef /*self*/, size_t count,
                                                      const JSValueRef values[], JSValueRef* exception) {
     const std::string message = argument(context, count, values, 0, exception);
-    const int number = ++of(context).messages;
+    const int number = ++running().messages;
     if (number <= kMostScriptMessages) {
         log(fmt::format("JavaScript: {}", std::string_view(message).substr(0, kLongestMessage)));
     } else if (number == kMostScriptMessages + 1) {
@@ -233,7 +245,7 @@ JSValueRef ScriptContext::Implementation::guardExpression(JSContextRef context, 
     const bool isSticky = viewOf(flags.get()).find_first_of(u"gy") != std::u16string_view::npos;
     const std::size_t start = isSticky && last > 0 && last < 1e9 ? static_cast<std::size_t>(last) : 0;
     if (!isRegularExpressionBounded(viewOf(pattern.get()), viewOf(flags.get()), viewOf(text.get()), start,
-                                    of(context).deadline)) {
+                                    running().deadline)) {
         const std::string reason =
             fmt::format("regular expression takes too long: /{}/", textOf(pattern.get()));
         *exception = JSValueMakeString(context, scriptString(reason).get());
@@ -245,7 +257,7 @@ JSValueRef ScriptContext::Implementation::isMatchingXPath(JSContextRef context, 
                                                           JSObjectRef /*self*/, size_t count,
                                                           const JSValueRef values[], JSValueRef* exception) {
     const std::string expression = argument(context, count, values, 0, exception);
-    return JSValueMakeBoolean(context, of(context).document->isMatchingXPath(expression));
+    return JSValueMakeBoolean(context, running().document->isMatchingXPath(expression));
 }
 
 JSValueRef ScriptContext::Implementation::jsonStringForXPath(JSContextRef context, JSObjectRef /*function*/,
@@ -253,14 +265,14 @@ JSValueRef ScriptContext::Implementation::jsonStringForXPath(JSContextRef contex
                                                              const JSValueRef values[],
                                                              JSValueRef* exception) {
     const std::string expression = argument(context, count, values, 0, exception);
-    return valueOf(context, of(context).document->JSONStringForXPath(expression));
+    return valueOf(context, running().document->JSONStringForXPath(expression));
 }
 
 JSValueRef ScriptContext::Implementation::jsonString(JSContextRef context, JSObjectRef /*function*/,
                                                      JSObjectRef /*self*/, size_t /*count*/,
                                                      const JSValueRef /*values*/[],
                                                      JSValueRef* /*exception*/) {
-    return valueOf(context, of(context).document->JSONString());
+    return valueOf(context, running().document->JSONString());
 }
 
 ScriptContext::ScriptContext(std::unique_ptr<Implementation> implementation)
@@ -269,13 +281,8 @@ ScriptContext::~ScriptContext() = default;
 
 std::shared_ptr<ScriptContext> ScriptContext::make(const ScriptLimits& limits) {
     auto implementation = std::make_unique<Implementation>(limits);
-    JSGlobalContextRef context = implementation->context;
-    const JSObjectRef log = JSObjectMakeFunctionWithCallback(context, nullptr, Implementation::logMessage);
-    setProperty(context, implementation->global(), "__log", log);
-    const JSObjectRef guard =
-        JSObjectMakeFunctionWithCallback(context, nullptr, Implementation::guardExpression);
-    static const ScriptString prelude = scriptString(kPrelude);
-    JSEvaluateScript(context, prelude.get(), guard, nullptr, 1, nullptr);
+    implementation->defineLog();
+    implementation->installGuard();
     return std::shared_ptr<ScriptContext>(new ScriptContext(std::move(implementation)));
 }
 
