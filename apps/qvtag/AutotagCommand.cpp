@@ -2,6 +2,7 @@
 #include "RhythmMeasurement.h"
 #include "analysis/QVCTRhythmicTaggingService.h"
 #include "autotagging/QVTaggingAggregator.h"
+#include "formats/TGRTFileNode.h"
 #include "platform/LCFileParser.h"
 #include "platform/PropertyListFile.h"
 #include "platform/QVContentTaggingTypes.h"
@@ -78,11 +79,17 @@ QVTaggingAggregator::Settings settingsIn(const std::string& file, std::string_vi
     return settings;
 }
 
+/// What the item's record says that it is, else its name.
+std::int64_t fileTypeOf(const URL& url) {
+    const auto record = TGRTFileNode::nodeWithFileURL(url)->readMetaDataWithOptions(0);
+    const std::int64_t stored = record ? record->fileType() : std::int64_t{kFileTypeNone};
+    return stored != kFileTypeNone ? stored : QVContentTaggingTypes::fallBackFileTypeForURL(url);
+}
+
 Json jsonOfItem(const Item& item) {
     Json json;
     json["path"] = item.url.path();
-    json["type"] =
-        QVContentTaggingTypes::nameForFileType(QVContentTaggingTypes::fallBackFileTypeForURL(item.url));
+    json["type"] = QVContentTaggingTypes::nameForFileType(fileTypeOf(item.url));
     json["taggings"] = Json::array();
     for (const auto& tagging : item.taggings) json["taggings"].push_back(jsonOfTagging(*tagging));
     return json;

@@ -202,7 +202,7 @@ TEST(Inspect, ShowsWhatIsInEveryKindOfItem) {
         {0, "acid", 12, 24, "loop"},
         {0, "Name", nullptr, nullptr, "House"},
         {1, "SSND", nullptr, nullptr, ""},
-        {2, "tags.plist", nullptr, nullptr, "record, 3 entries"},
+        {2, "tags.plist", nullptr, nullptr, "record, 2 entries"},
         {3, "Type", nullptr, nullptr, "8"},
         {4, "header", 0, 24, "plug-in"},
         {4, "sub ID", 7, 1, "-1"},
