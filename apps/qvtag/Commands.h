@@ -12,6 +12,7 @@ namespace qvct::tool {
 void addAutotagCommand(CLI::App& app, ToolContext& context);
 void addInspectCommand(CLI::App& app, ToolContext& context);
 void addKeywordsCommand(CLI::App& app, ToolContext& context);
+void addObjectCommand(CLI::App& app, ToolContext& context);
 void addRhythmCommand(CLI::App& app, ToolContext& context);
 void addRulesCommand(CLI::App& app, ToolContext& context);
 void addReadCommand(CLI::App& app, ToolContext& context);

@@ -1,5 +1,6 @@
 #include "Commands.h"
 #include "PropertyListOutput.h"
+#include "RecordOutput.h"
 #include "formats/TGRTFileNode.h"
 #include "platform/QVContentTaggingTypes.h"
 #include "platform/Text.h"
@@ -48,40 +49,15 @@ Json jsonOfRecord(const URL& url, const TGRTMetaData& record) {
     return json;
 }
 
-void printField(const Terminal& terminal, std::string_view name, const std::vector<Word>& words) {
-    constexpr std::size_t width = 22;
-    if (words.empty()) return;
-    fmt::print("  {}{}\n", colored(terminal, Color::faint, padded(name, width - 2)),
-               wrapped(terminal, words, width));
-}
-
 void printRecord(const URL& url, const TGRTMetaData& record, const Terminal& terminal) {
     fmt::print("{}\n", colored(terminal, Color::strong, printable(url.path())));
-    std::string kind(QVContentTaggingTypes::nameForFileType(record.fileType()));
-    if (record.subFileType() > 0) kind += fmt::format(", sub type {}", record.subFileType());
-    printField(terminal, "kind", {{kind, Color::plain}});
+    printKind(terminal, record.fileType(), record.subFileType());
     const std::string name = record.displayName().value_or("");
     if (!name.empty()) printField(terminal, "name", {{printable(name), Color::plain}});
-    std::vector<Word> words;
-    std::string category;
-    const auto flush = [&] {
-        printField(terminal, category, words);
-        words.clear();
-    };
-    for (const auto& tagging : sortedTaggings(record.taggings())) {
-        if (tagging->category() != category) flush();
-        category = tagging->category();
-        words.push_back({textOfTagging(*tagging), tagging->level() ? Color::accent : Color::plain});
-    }
-    flush();
-    for (const auto& keyValue : record.keyValues()) {
-        words.push_back({fmt::format("{} {}", printable(keyValue->key()),
-                                     textOfPropertyList(keyValue->value().value_or(PropertyList("")))),
-                         Color::plain});
-    }
-    printField(terminal, "values", words);
-    words.clear();
+    printTaggings(terminal, record.taggings());
+    printKeyValues(terminal, record.keyValues());
     if (!record.contentInfo()) return;
+    std::vector<Word> words;
     for (const std::string& path : record.contentInfo()->assetDependencyPaths())
         words.push_back({printable(path), Color::plain});
     printField(terminal, "needs", words);

@@ -36,6 +36,7 @@ int run(int argc, char** argv) {
     qvct::tool::addAutotagCommand(app, context);
     qvct::tool::addInspectCommand(app, context);
     qvct::tool::addKeywordsCommand(app, context);
+    qvct::tool::addObjectCommand(app, context);
     qvct::tool::addRhythmCommand(app, context);
     qvct::tool::addRulesCommand(app, context);
     qvct::tool::addReadCommand(app, context);
