@@ -56,6 +56,9 @@ class ContentStore {
     /// Adds the items of the chunk that have the term.
     void addPosting(TermId term, std::int64_t chunk, IdSet& ids);
 
+    /// Throws unless every page, record and index entry is as it should be. @cost O(items).
+    void checkAll();
+
     Connection& connection() { return connection_; }
 
   private:

@@ -76,6 +76,10 @@ std::string Connection::text(const char* sql) {
     return statement.step() ? std::string(statement.bytes(0)) : std::string();
 }
 
+bool Connection::isInTransaction() const {
+    return sqlite3_get_autocommit(handle_) == 0;
+}
+
 void Connection::fail(std::string_view doing) const {
     const int result = sqlite3_extended_errcode(handle_);
     const std::string_view reason = reasonOf(result, sqlite3_errmsg(handle_));

@@ -43,6 +43,7 @@ class Connection {
     std::string text(const char* sql);
     [[noreturn]] void fail(std::string_view doing) const;
     const std::string& path() const { return path_; }
+    bool isInTransaction() const;
     sqlite3* handle() const { return handle_; }
 
   private:

@@ -171,11 +171,13 @@ void StoreWriter::noteNames(const IndexedItem& item) {
             .execute();
     };
     const auto noteTag = [&](const std::string& label, const std::string& category) {
-        const std::string value = tagTerm(label, category);
-        if (!names_.insert(value).second) return;
+        if (!names_.insert("t" + label + '\0' + category).second) return;
         noteField(false, category);
-        Statement(store_.connection(), "INSERT OR IGNORE INTO tag VALUES (?, ?, ?)")
-            .bind(1, termId(value))
+        // Of spellings that differ in case one stands for all, the same whatever came first.
+        Statement(store_.connection(),
+                  "INSERT INTO tag VALUES (?, ?, ?) ON CONFLICT DO UPDATE SET "
+                  "label = min(label, excluded.label), category = min(category, excluded.category)")
+            .bind(1, termId(tagTerm(label, category)))
             .bind(2, label)
             .bind(3, category)
             .execute();
