@@ -185,9 +185,8 @@ void IndexRun::storeOne(const Described& described, Pending& pending) {
     } else {
         ++progress_.described;
     }
-    if (!isNewDatabase_) {
-        const auto before = writer_.idOfMoved(item);
-        if (before && !writer_.store().item(pending.id)) {
+    if (!isNewDatabase_ && !writer_.store().item(pending.id)) {
+        if (const auto before = writer_.idOfMoved(item)) {
             writer_.addEarlierPath(*before, writer_.store().item(*before)->path);
             pending.id = *before;
             ++progress_.moved;

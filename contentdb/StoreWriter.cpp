@@ -76,7 +76,7 @@ std::optional<ItemId> StoreWriter::idOfMoved(const IndexedItem& item) {
     if (item.payloadHash.empty()) return std::nullopt;
     // Copies of one sound may be many; a few that are still where they were say enough.
     Statement statement(store_.connection(),
-                        "SELECT id FROM item WHERE payload = ? AND length(payload) > 0 LIMIT 100");
+                        "SELECT id FROM item WHERE payload = ? AND length(payload) > 0 LIMIT 16");
     for (statement.bind(1, item.payloadHash); statement.step();) {
         const auto candidate = store_.item(statement.integer(0));
         if (candidate && candidate->path != item.path && !fileExists(candidate->path))
