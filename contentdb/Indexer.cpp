@@ -39,7 +39,6 @@ void putAside(const IndexOptions& options, const DatabaseFailure& failure) {
 IndexProgress runOnce(const IndexOptions& options, const std::vector<std::string>& folders,
                       const DescriberFactory& factory) {
     const unsigned processors = std::max(1U, std::thread::hardware_concurrency());
-    // The workers are forked before the database is open, while there is little to inherit.
     WorkerPool workers(factory,
                        {options.workers != 0 ? options.workers : processors, options.timeLimitPerItem});
     const auto connection = openDatabase(options.database, Access::write);

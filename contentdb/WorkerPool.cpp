@@ -168,7 +168,6 @@ WorkerPool::WorkerPool(DescriberFactory factory, Settings settings)
     implementation_->factory = std::move(factory);
     implementation_->settings = settings;
     implementation_->processes.resize(std::max(1U, settings.workers));
-    for (Process& process : implementation_->processes) implementation_->start(process);
 }
 
 WorkerPool::~WorkerPool() {
@@ -201,13 +200,16 @@ bool WorkerPool::collect(const std::function<void(Described)>& take) {
     constexpr int patience = 100;  // milliseconds until the time limits are looked at again
     std::vector<pollfd> sockets;
     for (Process& process : implementation_->processes) {
-        if (process.id < 0) return false;
+        // A process is made when there is work for it: a run that finds nothing new makes none.
+        if (process.id < 0 && !process.waiting.empty() && !implementation_->start(process)) return false;
+        if (process.id < 0) continue;
         implementation_->send(process);
         const int events = process.output.empty() ? POLLIN : POLLIN | POLLOUT;
         sockets.push_back({process.socket, static_cast<short>(events), 0});
     }
     ::poll(sockets.data(), sockets.size(), patience);
     for (Process& process : implementation_->processes) {
+        if (process.id < 0) continue;
         implementation_->endIfLate(process);
         if (!implementation_->receive(process, take) && !implementation_->replace(process, take))
             return false;

@@ -69,8 +69,7 @@ class Indexing : public testing::Test {
         std::vector<std::string> names;
         if (!database) return names;
         const auto all = database->search(*parseQuery(query, *database->vocabulary(), nullptr), 100000);
-        for (const Found& found : *all) 
-            names.push_back(found.item.name);
+        for (const Found& found : *all) names.push_back(found.item.name);
         return names;
     }
 
@@ -224,8 +223,7 @@ TEST_F(Indexing, OfPartsUnitesToTheSameContent) {
     EXPECT_TRUE(united->check(&error)) << error.message;
     EXPECT_EQ(united->totals()->failures, 1);
     const auto all = whole->search(*parseQuery("", {}, nullptr), 1000);
-    for (const Found& found : *all) 
-        EXPECT_EQ(united->item(found.item.path)->item, found.item);
+    for (const Found& found : *all) EXPECT_EQ(united->item(found.item.path)->item, found.item);
     EXPECT_FALSE(mergeDatabases(parts, merged, &error));
     EXPECT_THAT(error.message, HasSubstr("exists already"));
 }

@@ -17,8 +17,7 @@ std::vector<std::string> foundNames(const std::string& path, const std::string& 
     const auto database = ContentDatabase::open(path);
     std::vector<std::string> names;
     const auto all = database->search(*parseQuery(text, *database->vocabulary(), nullptr), 1000);
-    for (const Found& found : *all) 
-        names.push_back(found.item.name);
+    for (const Found& found : *all) names.push_back(found.item.name);
     return names;
 }
 
