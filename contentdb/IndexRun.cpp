@@ -20,6 +20,8 @@ using Clock = std::chrono::steady_clock;
 /// Items stored in one transaction, at most; fewer when reading them takes long.
 constexpr std::size_t kBatch = 8192;
 constexpr std::chrono::seconds kLongestBatch{3};
+/// And fewer when they have many terms, so that a batch stays small in memory.
+constexpr std::size_t kMostTermsInBatch = 1'000'000;
 /// A file that changed this shortly before it was looked at may change again within the same tick of the file
 /// system's clock: its stamp would not tell. It is read again by the next run.
 constexpr std::int64_t kTick = 20'000'000;
@@ -136,8 +138,10 @@ bool IndexRun::submit(const ListedItem& item, ItemId id, const std::shared_ptr<O
 }
 
 bool IndexRun::collect() {
-    areWorkersInOrder_ =
-        workers_.collect([this](Described described) { batch_.push_back(std::move(described)); });
+    areWorkersInOrder_ = workers_.collect([this](Described described) {
+        termsInBatch_ += described.terms.size();
+        batch_.push_back(std::move(described));
+    });
     if (options_.isCancelled && options_.isCancelled()) isStopped_ = true;
     flushIfDue();
     report();
@@ -145,7 +149,9 @@ bool IndexRun::collect() {
 }
 
 void IndexRun::flushIfDue() {
-    if (batch_.size() >= kBatch || Clock::now() - lastFlush_ >= kLongestBatch) flush();
+    if (batch_.size() >= kBatch || termsInBatch_ >= kMostTermsInBatch ||
+        Clock::now() - lastFlush_ >= kLongestBatch)
+        flush();
 }
 
 void IndexRun::flush() {
@@ -156,6 +162,7 @@ void IndexRun::flush() {
     for (const auto& folder : complete_) storeFolder(*folder);
     writer_.commit();
     batch_.clear();
+    termsInBatch_ = 0;
     complete_.clear();
 }
 

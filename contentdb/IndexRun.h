@@ -67,6 +67,7 @@ class IndexRun {
     std::uint64_t lastTicket_ = 0;
     std::unordered_map<std::uint64_t, Pending> pending_;
     std::vector<Described> batch_;
+    std::size_t termsInBatch_ = 0;
     std::vector<std::shared_ptr<OpenFolder>> complete_;  // to be stored with the batch
     std::vector<std::string> roots_;
     std::unordered_set<std::int64_t> visited_;  // folders, by number

@@ -11,6 +11,7 @@
 
 #include <fmt/format.h>
 #include <gmock/gmock.h>
+#include <sys/resource.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -272,6 +273,35 @@ TEST_F(Indexing, RefusesASecondRunAForeignFileAndAMissingFolder) {
     EXPECT_THAT(refusal(), HasSubstr(fmt::format("another run is writing to it (process {})", child)));
     ::waitpid(child, nullptr, 0);
     EXPECT_EQ(names().size(), 401U);
+}
+
+TEST_F(Indexing, KeepsWhatItHasWhenTheDiskIsFull) {
+    for (int i = 0; i < 300; ++i) write(fmt::format("Kick {}.wav", i), std::to_string(i));
+    settle();
+    index();
+    for (int i = 0; i < 9000; ++i) write(fmt::format("more/{}/Snare {}.wav", i % 9, i), std::to_string(i));
+    settle();
+    const pid_t child = ::fork();
+    if (child == 0) {
+        // Stands for a full disk: no file may grow beyond this.
+        ::signal(SIGXFSZ, SIG_IGN);
+        const rlimit limit = {600000, 600000};
+        ::setrlimit(RLIMIT_FSIZE, &limit);
+        IndexOptions options;
+        options.folders = {library()};
+        options.database = database();
+        Error error;
+        const auto progress = indexLibrary(
+            options, [] { return std::make_unique<NameDescriber>(); }, &error);
+        ::_exit(!progress && error.message.find(database()) != std::string::npos ? 7 : 0);
+    }
+    int status = 0;
+    ::waitpid(child, &status, 0);
+    EXPECT_EQ(WEXITSTATUS(status), 7);
+    EXPECT_GE(names().size(), 300U);
+    EXPECT_TRUE(ContentDatabase::open(database())->check());
+    index();
+    EXPECT_EQ(names().size(), 9300U);
 }
 
 TEST_F(Indexing, TakesAnyNameAndCirclesOfLinks) {
