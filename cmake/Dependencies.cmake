@@ -2,6 +2,7 @@
 find_package(PkgConfig REQUIRED)
 find_package(ICU REQUIRED COMPONENTS uc i18n)
 find_package(LibXml2 REQUIRED)
+find_package(SQLite3 REQUIRED)
 find_package(ZLIB REQUIRED)
 find_package(fmt REQUIRED)
 find_package(spdlog REQUIRED)

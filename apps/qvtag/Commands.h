@@ -11,11 +11,16 @@ namespace qvct::tool {
 /// Each adds one command to the tool. A command reports what fails through the context and never throws.
 void addAutotagCommand(CLI::App& app, ToolContext& context);
 void addInspectCommand(CLI::App& app, ToolContext& context);
+/// `db`: merges and checks databases.
+void addDatabaseCommand(CLI::App& app, ToolContext& context);
+void addIndexCommand(CLI::App& app, ToolContext& context);
 void addKeywordsCommand(CLI::App& app, ToolContext& context);
 void addObjectCommand(CLI::App& app, ToolContext& context);
 void addRhythmCommand(CLI::App& app, ToolContext& context);
 void addRulesCommand(CLI::App& app, ToolContext& context);
 void addReadCommand(CLI::App& app, ToolContext& context);
+/// `search`, `facets` and `similar`: what a database holds.
+void addSearchCommands(CLI::App& app, ToolContext& context);
 void addTaxonomyCommand(CLI::App& app, ToolContext& context);
 void addWriteCommand(CLI::App& app, ToolContext& context);
 /// Below the taxonomy command: what has become of retired vocabularies.

@@ -34,12 +34,15 @@ int run(int argc, char** argv) {
     addSharedOptions(app, context);
     app.parse_complete_callback([&context] { context.prepare(); });
     qvct::tool::addAutotagCommand(app, context);
+    qvct::tool::addDatabaseCommand(app, context);
+    qvct::tool::addIndexCommand(app, context);
     qvct::tool::addInspectCommand(app, context);
     qvct::tool::addKeywordsCommand(app, context);
     qvct::tool::addObjectCommand(app, context);
+    qvct::tool::addReadCommand(app, context);
     qvct::tool::addRhythmCommand(app, context);
     qvct::tool::addRulesCommand(app, context);
-    qvct::tool::addReadCommand(app, context);
+    qvct::tool::addSearchCommands(app, context);
     qvct::tool::addTaxonomyCommand(app, context);
     qvct::tool::addWriteCommand(app, context);
     try {

@@ -1,0 +1,125 @@
+#include "contentdb/ContentDatabase.h"
+
+#include "contentdb/Terms.h"
+#include "platform/Text.h"
+#include "taxonomy/TGRTTaxonomy.h"
+
+#include <algorithm>
+
+#include <fmt/format.h>
+
+namespace qvct::contentdb {
+
+struct ContentDatabase::Implementation {
+    explicit Implementation(const std::string& path)
+        : connection(openDatabase(path, Access::read)), store(*connection) {}
+
+    /// Runs `work` on one state of the database, whatever is written meanwhile.
+    template <typename Work>
+    auto read(Error* error, Work work) -> std::optional<decltype(work())> {
+        using Result = std::optional<decltype(work())>;
+        return guarded(error, Result(), [&]() -> Result {
+            connection->run("BEGIN");
+            try {
+                Result result = work();
+                connection->run("COMMIT");
+                return result;
+            } catch (const DatabaseFailure&) {
+                if (connection->isInTransaction()) connection->run("ROLLBACK");
+                throw;
+            }
+        });
+    }
+
+    std::unique_ptr<Connection> connection;
+    ContentStore store;
+};
+
+ContentDatabase::ContentDatabase(std::unique_ptr<Implementation> implementation)
+    : implementation_(std::move(implementation)) {}
+ContentDatabase::~ContentDatabase() = default;
+
+std::unique_ptr<ContentDatabase> ContentDatabase::open(const std::string& path, Error* error) {
+    auto implementation = guarded(error, std::unique_ptr<Implementation>(),
+                                  [&] { return std::make_unique<Implementation>(path); });
+    if (!implementation) return nullptr;
+    return std::unique_ptr<ContentDatabase>(new ContentDatabase(std::move(implementation)));
+}
+
+std::optional<Vocabulary> ContentDatabase::vocabulary(Error* error) {
+    return implementation_->read(error, [this] {
+        Vocabulary vocabulary{implementation_->store.fields(false), implementation_->store.fields(true)};
+        for (const auto& category : TGRTTaxonomy::defaultTaxonomy()->categories()) {
+            const auto& known = vocabulary.categories;
+            if (std::find(known.begin(), known.end(), category->identifier()) == known.end())
+                vocabulary.categories.push_back(category->identifier());
+        }
+        return vocabulary;
+    });
+}
+
+std::optional<std::vector<Found>> ContentDatabase::search(const Query& query, std::size_t limit,
+                                                          Error* error) {
+    return implementation_->read(error,
+                                 [&] { return contentdb::search(implementation_->store, query, limit); });
+}
+
+std::optional<std::int64_t> ContentDatabase::count(const Query& query, Error* error) {
+    return implementation_->read(error, [&] { return countMatches(implementation_->store, query); });
+}
+
+std::optional<std::vector<Facet>> ContentDatabase::facets(const Query& query, Error* error) {
+    return implementation_->read(error, [&] { return contentdb::facets(implementation_->store, query); });
+}
+
+std::optional<std::vector<Similar>> ContentDatabase::similar(std::string_view path, std::size_t limit,
+                                                             Error* error) {
+    const auto found = item(path, error);
+    if (!found) return std::nullopt;
+    return implementation_->read(error,
+                                 [&] { return similarItems(implementation_->store, found->id, limit); });
+}
+
+std::optional<Found> ContentDatabase::item(std::string_view path, Error* error) {
+    const auto found = implementation_->read(error, [&]() -> std::optional<Found> {
+        const auto id = implementation_->store.idOfPath(path);
+        auto item = id ? implementation_->store.item(*id) : std::nullopt;
+        if (!item) return std::nullopt;
+        return Found{*id, std::move(*item)};
+    });
+    if (found && !*found)
+        fail(error, kErrorInvalidArgument, fmt::format("{}: not in the index", printable(path)));
+    return found ? *found : std::nullopt;
+}
+
+std::optional<std::vector<std::string>> ContentDatabase::earlierPaths(ItemId id, Error* error) {
+    return implementation_->read(error, [&] { return implementation_->store.earlierPaths(id); });
+}
+
+std::optional<ContentDatabase::Totals> ContentDatabase::totals(Error* error) {
+    return implementation_->read(error, [this] {
+        return Totals{implementation_->store.countOfItems(), implementation_->store.countOfFailures()};
+    });
+}
+
+bool ContentDatabase::forEachFailure(const std::function<bool(const IndexedItem&)>& visit, Error* error) {
+    return implementation_
+        ->read(error,
+               [&] {
+                   implementation_->store.forEachFailure(visit);
+                   return true;
+               })
+        .has_value();
+}
+
+bool ContentDatabase::check(Error* error) {
+    return implementation_
+        ->read(error,
+               [this] {
+                   implementation_->store.checkAll();
+                   return true;
+               })
+        .has_value();
+}
+
+}  // namespace qvct::contentdb

@@ -1,0 +1,65 @@
+#pragma once
+
+#include "contentdb/Indexer.h"
+#include "contentdb/Query.h"
+#include "contentdb/Schema.h"
+#include "contentdb/Search.h"
+#include "platform/Error.h"
+
+#include <cstddef>
+#include <cstdint>
+#include <functional>
+#include <memory>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace qvct::contentdb {
+
+/// A library as an object for hosts: what `indexLibrary` has stored, to be searched and read.
+///
+/// One thread at a time for each object; several objects and processes may have the same database open, also
+/// while a run writes to it: each operation sees what was stored when it began. A damaged page is found when
+/// it is read and answered by an error, never by a wrong result.
+class ContentDatabase {
+  public:
+    /// Null, and an error, when there is no such database, or it is damaged or of another version.
+    static std::unique_ptr<ContentDatabase> open(const std::string& path, Error* error = nullptr);
+    ~ContentDatabase();
+
+    /// The fields that queries to this database may name: its categories and numbers, and those of the
+    /// default taxonomy.
+    std::optional<Vocabulary> vocabulary(Error* error = nullptr);
+    /// At most `limit` items, in the query's order.
+    std::optional<std::vector<Found>> search(const Query& query, std::size_t limit, Error* error = nullptr);
+    std::optional<std::int64_t> count(const Query& query, Error* error = nullptr);
+    /// How many of the found items have each tag, the most frequent first.
+    std::optional<std::vector<Facet>> facets(const Query& query, Error* error = nullptr);
+    /// The items nearest to the one at the path, best first.
+    std::optional<std::vector<Similar>> similar(std::string_view path, std::size_t limit,
+                                                Error* error = nullptr);
+    /// The item at the path; nothing and an error when there is none.
+    std::optional<Found> item(std::string_view path, Error* error = nullptr);
+    /// Where the item was before it was moved.
+    std::optional<std::vector<std::string>> earlierPaths(ItemId id, Error* error = nullptr);
+
+    struct Totals {
+        std::int64_t items = 0;
+        std::int64_t failures = 0;
+    };
+    std::optional<Totals> totals(Error* error = nullptr);
+    /// Calls `visit` with each item that could not be read, until it answers false.
+    bool forEachFailure(const std::function<bool(const IndexedItem&)>& visit, Error* error = nullptr);
+
+    /// Reads everything: each page and its checksum, each tree, each record, and whether the index says of
+    /// each item what the item says. @cost O(items), some minutes for a million.
+    bool check(Error* error = nullptr);
+
+  private:
+    struct Implementation;
+    explicit ContentDatabase(std::unique_ptr<Implementation> implementation);
+    std::unique_ptr<Implementation> implementation_;
+};
+
+}  // namespace qvct::contentdb

@@ -1,0 +1,264 @@
+#include "contentdb/IndexRun.h"
+
+#include "contentdb/Terms.h"
+#include "platform/Object.h"
+#include "platform/Text.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <ctime>
+#include <utility>
+
+#include <fmt/format.h>
+#include <sys/stat.h>
+
+namespace qvct::contentdb {
+namespace {
+
+using Clock = std::chrono::steady_clock;
+
+/// Items stored in one transaction, at most; fewer when reading them takes long.
+constexpr std::size_t kBatch = 8192;
+constexpr std::chrono::seconds kLongestBatch{3};
+/// And fewer when they have many terms, so that a batch stays small in memory.
+constexpr std::size_t kMostTermsInBatch = 1'000'000;
+/// A file that changed this shortly before it was looked at may change again within the same tick of the file
+/// system's clock: its stamp would not tell. It is read again by the next run.
+constexpr std::int64_t kTick = 20'000'000;
+constexpr std::int64_t kClockSkew = 2'000'000'000;
+
+std::int64_t wallNanoseconds() {
+    timespec now{};
+    ::clock_gettime(CLOCK_REALTIME, &now);
+    constexpr std::int64_t second = 1'000'000'000;
+    return now.tv_sec * second + now.tv_nsec;
+}
+
+bool isGone(const std::string& path) {
+    struct stat status {};
+    return ::lstat(path.c_str(), &status) != 0 && (errno == ENOENT || errno == ENOTDIR);
+}
+
+std::string joined(const std::string& folder, std::string_view name) {
+    return (folder == "/" ? folder : folder + "/") + std::string(name);
+}
+
+}  // namespace
+
+IndexRun::IndexRun(const IndexOptions& options, Connection& connection, WorkerPool& workers)
+    : options_(options),
+      workers_(workers),
+      writer_(connection),
+      nextId_(writer_.store().lastId() + 1),
+      isNewDatabase_(nextId_ == 1),
+      lastFlush_(Clock::now()),
+      lastReport_(lastFlush_) {}
+
+bool IndexRun::walk(const std::string& folder) {
+    roots_.push_back(folder);
+    walkLibrary(
+        folder,
+        [this](const std::string& path, const std::vector<ListedItem>& items) { return visit(path, items); },
+        [this](const std::string& path, const Error& error) {
+            unreadable_.insert(path);
+            if (options_.failed) options_.failed(error);
+        });
+    return areWorkersInOrder_;
+}
+
+bool IndexRun::visit(const std::string& path, const std::vector<ListedItem>& all) {
+    std::vector<ListedItem> part;
+    if (options_.parts > 1) part = itemsOfPart(path, all);
+    const std::vector<ListedItem>& items = options_.parts > 1 ? part : all;
+    progress_.seen += items.size();
+    const FolderRecord known = writer_.folder(path);
+    if (known.id != 0) visited_.insert(known.id);
+    const std::uint64_t digest = digestOf(items);
+    const bool isUnchanged = known.digest == digest && !(options_.prune && known.gone > 0);
+    if ((isUnchanged && !options_.retryFailed) || (known.id == 0 && items.empty())) {
+        progress_.unchanged += items.size();
+        progress_.missing += static_cast<std::uint64_t>(known.gone);
+    } else {
+        const auto folder = std::make_shared<OpenFolder>(OpenFolder{path, digest, 0, 1});
+        if (!submitChanged(folder, known.id, items)) return false;
+        if (--folder->remaining == 0) complete_.push_back(folder);
+    }
+    report();
+    return !isStopped_;
+}
+
+std::vector<ListedItem> IndexRun::itemsOfPart(const std::string& path,
+                                              const std::vector<ListedItem>& items) const {
+    std::vector<ListedItem> part;
+    for (const ListedItem& item : items) {
+        if (stringHash(joined(path, item.name)) % options_.parts == options_.part - 1) part.push_back(item);
+    }
+    return part;
+}
+
+bool IndexRun::submitChanged(const std::shared_ptr<OpenFolder>& folder, std::int64_t folderId,
+                             const std::vector<ListedItem>& items) {
+    auto known = folderId == 0 ? decltype(writer_.files(0))() : writer_.files(folderId);
+    const std::int64_t now = wallNanoseconds();
+    for (ListedItem item : items) {
+        const std::int64_t age = now - item.stamp.changed;
+        if (age < kTick && age > -kClockSkew) {
+            item.stamp.changed = 0;
+            folder->digest = 0;
+        }
+        const auto hit = known.find(item.name);
+        const bool isKnown = hit != known.end();
+        const ItemId id = isKnown ? hit->second.id : 0;
+        const bool isSame = isKnown && hit->second.stamp == item.stamp && item.stamp.changed != 0 &&
+                            !(options_.retryFailed && hit->second.hasFailed);
+        if (isKnown) known.erase(hit);
+        if (isSame) {
+            ++progress_.unchanged;
+        } else if (!submit(item, id, folder)) {
+            return false;
+        }
+    }
+    for (const auto& [name, file] : known) {
+        ++progress_.missing;
+        ++folder->gone;
+        if (options_.prune) gone_.push_back(file.id);
+    }
+    if (options_.prune) folder->gone = 0;
+    return true;
+}
+
+bool IndexRun::submit(const ListedItem& item, ItemId id, const std::shared_ptr<OpenFolder>& folder) {
+    while (!workers_.hasRoom()) {
+        if (!collect()) return false;
+    }
+    ++folder->remaining;
+    pending_[++lastTicket_] = {id != 0 ? id : nextId_++, folder};
+    workers_.submit(lastTicket_, joined(folder->path, item.name), item.stamp);
+    return true;
+}
+
+bool IndexRun::collect() {
+    areWorkersInOrder_ = workers_.collect([this](Described described) {
+        termsInBatch_ += described.terms.size();
+        batch_.push_back(std::move(described));
+    });
+    if (options_.isCancelled && options_.isCancelled()) isStopped_ = true;
+    flushIfDue();
+    report();
+    return areWorkersInOrder_ && !isStopped_;
+}
+
+void IndexRun::flushIfDue() {
+    if (batch_.size() >= kBatch || termsInBatch_ >= kMostTermsInBatch ||
+        Clock::now() - lastFlush_ >= kLongestBatch)
+        flush();
+}
+
+void IndexRun::flush() {
+    lastFlush_ = Clock::now();
+    if (batch_.empty() && complete_.empty()) return;
+    writer_.begin();
+    store(batch_);
+    for (const auto& folder : complete_) storeFolder(*folder);
+    writer_.commit();
+    batch_.clear();
+    termsInBatch_ = 0;
+    complete_.clear();
+}
+
+void IndexRun::store(std::vector<Described>& batch) {
+    // In the order of the walk, so that the same library gives the same database.
+    std::sort(batch.begin(), batch.end(),
+              [](const Described& a, const Described& b) { return a.ticket < b.ticket; });
+    for (const Described& described : batch) {
+        const auto hit = pending_.find(described.ticket);
+        storeOne(described, hit->second);
+        OpenFolder& folder = *hit->second.folder;
+        if (--folder.remaining == 0) complete_.push_back(hit->second.folder);
+        pending_.erase(hit);
+    }
+}
+
+void IndexRun::storeOne(const Described& described, Pending& pending) {
+    const IndexedItem& item = described.item;
+    if (!item.failure.empty()) {
+        ++progress_.failed;
+        if (options_.failed) {
+            options_.failed({std::string(QVCTErrorDomain), kErrorUnreadable,
+                             item.failure.find(item.path) != std::string::npos
+                                 ? item.failure
+                                 : fmt::format("{}: {}", printable(item.path), item.failure)});
+        }
+    } else {
+        ++progress_.described;
+    }
+    if (!isNewDatabase_ && !writer_.store().item(pending.id)) {
+        if (const auto before = writer_.idOfMoved(item)) {
+            writer_.addEarlierPath(*before, writer_.store().item(*before)->path);
+            pending.id = *before;
+            ++progress_.moved;
+        }
+    }
+    writer_.put(pending.id, item, described.terms);
+}
+
+void IndexRun::storeFolder(const OpenFolder& folder) {
+    FolderRecord record = writer_.folder(folder.path);
+    if (record.id == 0) return;  // nothing of it was stored
+    visited_.insert(record.id);
+    record.digest = folder.digest;
+    record.gone = folder.gone;
+    writer_.setFolder(record);
+}
+
+bool IndexRun::finish() {
+    while (areWorkersInOrder_ && !isStopped_ && workers_.isBusy()) collect();
+    flush();
+    if (options_.prune && areWorkersInOrder_ && !isStopped_) prune();
+    if (options_.progress) options_.progress(progress_);
+    return areWorkersInOrder_;
+}
+
+void IndexRun::prune() {
+    writer_.begin();
+    for (const ItemId id : gone_) removeIfGone(id);
+    writer_.commit();
+    for (const std::string& root : roots_) pruneUnvisited(root);
+}
+
+void IndexRun::pruneUnvisited(const std::string& root) {
+    std::vector<std::int64_t> folders;
+    writer_.forEachFolder(root, [&](const FolderRecord& folder, std::string_view path) {
+        if (!visited_.contains(folder.id) && !isBelowFailed(path)) folders.push_back(folder.id);
+    });
+    for (const std::int64_t folder : folders) {
+        writer_.begin();
+        for (const auto& [name, file] : writer_.files(folder)) {
+            ++progress_.missing;
+            removeIfGone(file.id);
+        }
+        writer_.commit();
+    }
+}
+
+void IndexRun::removeIfGone(ItemId id) {
+    const auto item = writer_.store().item(id);
+    if (!item || !isGone(item->path)) return;
+    writer_.remove(id);
+    ++progress_.pruned;
+}
+
+bool IndexRun::isBelowFailed(std::string_view path) const {
+    return std::any_of(unreadable_.begin(), unreadable_.end(), [path](const std::string& failed) {
+        return path == failed || path.starts_with(failed + "/");
+    });
+}
+
+void IndexRun::report() {
+    constexpr std::chrono::milliseconds pause{100};
+    if (!options_.progress || Clock::now() - lastReport_ < pause) return;
+    lastReport_ = Clock::now();
+    options_.progress(progress_);
+}
+
+}  // namespace qvct::contentdb

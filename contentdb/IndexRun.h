@@ -1,0 +1,80 @@
+#pragma once
+
+#include "contentdb/Indexer.h"
+#include "contentdb/LibraryWalk.h"
+#include "contentdb/StoreWriter.h"
+#include "contentdb/WorkerPool.h"
+
+#include <chrono>
+#include <cstdint>
+#include <memory>
+#include <set>
+#include <string>
+#include <unordered_map>
+#include <unordered_set>
+#include <vector>
+
+namespace qvct::contentdb {
+
+/// One run of the indexer over an open database. Throws DatabaseFailure.
+class IndexRun {
+  public:
+    IndexRun(const IndexOptions& options, Connection& connection, WorkerPool& workers);
+
+    /// False when the workers cannot be kept running.
+    bool walk(const std::string& folder);
+    bool finish();
+    const IndexProgress& progress() const { return progress_; }
+
+  private:
+    /// A folder some of whose items are still to be stored; then its digest can be.
+    struct OpenFolder {
+        std::string path;
+        std::uint64_t digest = 0;
+        std::int64_t gone = 0;
+        std::size_t remaining = 0;
+    };
+    struct Pending {
+        ItemId id = 0;
+        std::shared_ptr<OpenFolder> folder;
+    };
+
+    bool visit(const std::string& path, const std::vector<ListedItem>& items);
+    std::vector<ListedItem> itemsOfPart(const std::string& path, const std::vector<ListedItem>& items) const;
+    bool submitChanged(const std::shared_ptr<OpenFolder>& folder, std::int64_t folderId,
+                       const std::vector<ListedItem>& items);
+    bool submit(const ListedItem& item, ItemId id, const std::shared_ptr<OpenFolder>& folder);
+    bool collect();
+    void store(std::vector<Described>& batch);
+    void storeOne(const Described& described, Pending& pending);
+    void storeFolder(const OpenFolder& folder);
+    void flush();
+    void flushIfDue();
+    void prune();
+    void pruneUnvisited(const std::string& root);
+    void removeIfGone(ItemId id);
+    bool isBelowFailed(std::string_view path) const;
+    void report();
+
+    const IndexOptions& options_;
+    WorkerPool& workers_;
+    StoreWriter writer_;
+    IndexProgress progress_;
+    ItemId nextId_;
+    bool isNewDatabase_;
+    bool isStopped_ = false;
+    bool areWorkersInOrder_ = true;
+    std::uint64_t lastTicket_ = 0;
+    std::unordered_map<std::uint64_t, Pending> pending_;
+    std::vector<Described> batch_;
+    std::size_t termsInBatch_ = 0;
+    std::vector<std::shared_ptr<OpenFolder>> complete_;  // to be stored with the batch
+    std::vector<std::string> roots_;
+    std::unordered_set<std::int64_t> visited_;  // folders, by number
+    std::set<std::string, std::less<>> unreadable_;
+    std::vector<ItemId> gone_;
+    std::chrono::steady_clock::time_point lastFlush_;
+    std::chrono::steady_clock::time_point lastReport_;
+};
+
+}  // namespace qvct::contentdb

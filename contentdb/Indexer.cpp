@@ -1,0 +1,85 @@
+#include "contentdb/Indexer.h"
+
+#include "contentdb/IndexRun.h"
+#include "contentdb/RunLock.h"
+#include "contentdb/Schema.h"
+#include "platform/FileAccess.h"
+#include "platform/Text.h"
+#include "platform/Url.h"
+
+#include <filesystem>
+#include <thread>
+
+#include <fmt/format.h>
+
+namespace qvct::contentdb {
+namespace {
+
+/// A name beside the database that is not taken yet.
+std::string nameForDamaged(const std::string& database) {
+    std::string name = database + ".damaged";
+    for (int i = 2; fileExists(name); ++i) name = fmt::format("{}.damaged-{}", database, i);
+    return name;
+}
+
+/// Puts a damaged database aside with its log.
+void putAside(const IndexOptions& options, const DatabaseFailure& failure) {
+    const std::string aside = nameForDamaged(options.database);
+    for (const char* part : {"", "-wal", "-shm"}) {
+        std::error_code ignored;
+        if (*part == '\0' || fileExists(options.database + part))
+            std::filesystem::rename(options.database + part, aside + part, ignored);
+    }
+    if (options.note) {
+        options.note(
+            fmt::format("{}; it was put aside as {} and is built anew", failure.what(), printable(aside)));
+    }
+}
+
+IndexProgress runOnce(const IndexOptions& options, const std::vector<std::string>& folders,
+                      const DescriberFactory& factory) {
+    const unsigned processors = std::max(1U, std::thread::hardware_concurrency());
+    WorkerPool workers(factory,
+                       {options.workers != 0 ? options.workers : processors, options.timeLimitPerItem});
+    const auto connection = openDatabase(options.database, Access::write);
+    IndexRun run(options, *connection, workers);
+    bool isInOrder = true;
+    for (const std::string& folder : folders) isInOrder = isInOrder && run.walk(folder);
+    if (!run.finish() || !isInOrder)
+        throw DatabaseFailure(kErrorUnreadable, "the processes that read items cannot be kept running");
+    return run.progress();
+}
+
+}  // namespace
+
+std::optional<IndexProgress> indexLibrary(const IndexOptions& options, const DescriberFactory& factory,
+                                          Error* error) {
+    const auto refuse = [error](ErrorCode code, const std::string& message) {
+        qvct::fail(error, code, message);
+        return std::nullopt;
+    };
+    if (options.parts == 0 || options.part == 0 || options.part > options.parts)
+        return refuse(kErrorInvalidArgument,
+                      fmt::format("there is no part {} of {}", options.part, options.parts));
+    std::vector<std::string> folders;
+    for (const std::string& folder : options.folders) {
+        folders.push_back(URL::fileURLWithPath(folder).path());
+        if (!isDirectory(folders.back()))
+            return refuse(kErrorUnreadable, fmt::format("{}: no such folder", printable(folder)));
+    }
+    const auto lock = RunLock::acquire(options.database, error);
+    if (!lock) return std::nullopt;
+    return guarded(error, std::optional<IndexProgress>(), [&]() -> std::optional<IndexProgress> {
+        try {
+            return runOnce(options, folders, factory);
+        } catch (const DatabaseFailure& failure) {
+            const bool isOurs =
+                failure.code() == kErrorMalformed && isMarkedAsContentDatabase(options.database);
+            if (!isOurs) throw;
+            putAside(options, failure);
+        }
+        return runOnce(options, folders, factory);
+    });
+}
+
+}  // namespace qvct::contentdb

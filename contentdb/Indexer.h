@@ -1,0 +1,69 @@
+#pragma once
+
+#include "contentdb/IndexedItem.h"
+#include "platform/Error.h"
+
+#include <chrono>
+#include <cstdint>
+#include <functional>
+#include <optional>
+#include <string>
+#include <vector>
+
+namespace qvct::contentdb {
+
+/// Where a run is.
+struct IndexProgress {
+    std::uint64_t seen = 0;       ///< content items that the walk has met
+    std::uint64_t unchanged = 0;  ///< of these, passed over because nothing has changed
+    std::uint64_t described = 0;  ///< read anew and stored
+    std::uint64_t moved = 0;      ///< of these, known before under another path
+    std::uint64_t failed = 0;     ///< could not be read; stored with the reason
+    std::uint64_t missing = 0;    ///< known to the index, but gone from the disk
+    std::uint64_t pruned = 0;     ///< of these, taken out of the index
+};
+
+struct IndexOptions {
+    /// Folders to walk.
+    std::vector<std::string> folders;
+    std::string database;
+    /// Takes items out of the index whose files are gone.
+    bool prune = false;
+    /// Reads items again that failed before, though they have not changed.
+    bool retryFailed = false;
+    /// Takes only this part of the items (from 1), to be united with the others by `mergeDatabases`.
+    unsigned part = 1;
+    unsigned parts = 1;
+    /// 0: as many as there are processors.
+    unsigned workers = 0;
+    std::chrono::milliseconds timeLimitPerItem{30000};
+
+    /// Called now and then from the calling thread.
+    std::function<void(const IndexProgress&)> progress;
+    /// Called for each item or folder that cannot be read, with path and reason.
+    std::function<void(const Error&)> failed;
+    /// Told when a damaged database was put aside ("<database>.damaged") and is built anew.
+    std::function<void(const std::string& message)> note;
+    /// Asked now and then; true ends the run early, with all that was read so far stored.
+    std::function<bool()> isCancelled;
+};
+
+/// Brings the database up to date with the folders, making it if there is none.
+///
+/// Only items that are new or whose size, times or inode have changed are read, each in a worker process (see
+/// WorkerPool). Batches of items are stored whole or not at all: a run that was interrupted at any point is
+/// continued by the next. An item with the payload of one that is gone is that item, moved.
+///
+/// Nothing, and an error, when there is no such folder, the database cannot be written, or another run is
+/// going on. What was stored until then stays.
+/// @cost  An unchanged folder: one listing and one look at each file. Memory is bounded whatever the size.
+std::optional<IndexProgress> indexLibrary(const IndexOptions& options, const DescriberFactory& factory,
+                                          Error* error = nullptr);
+
+/// Unites the databases into a new one with the content that one run over everything would have made. The
+/// first database that has an item counts.
+/// False, and an error, when one cannot be read or `target` exists already; then no new database is left.
+bool mergeDatabases(const std::vector<std::string>& databases, const std::string& target,
+                    Error* error = nullptr);
+
+}  // namespace qvct::contentdb

@@ -1,0 +1,281 @@
+#include "contentdb/LibraryWalk.h"
+
+#include "formats/ContentWalk.h"
+#include "platform/QVContentTaggingTypes.h"
+#include "platform/Text.h"
+#include "platform/Url.h"
+
+#include <algorithm>
+#include <array>
+#include <cerrno>
+#include <cstring>
+#include <map>
+#include <memory>
+#include <utility>
+
+#include <dirent.h>
+#include <fcntl.h>
+#include <fmt/format.h>
+#include <sys/stat.h>
+
+namespace qvct::contentdb {
+namespace {
+
+using Identity = std::pair<dev_t, ino_t>;
+using Folder = std::unique_ptr<DIR, int (*)(DIR*)>;
+
+/// Deepest that folders are entered: no path that the system takes holds more.
+constexpr std::size_t kDeepest = 2000;
+
+enum class Kind : unsigned char { other, file, settings, bundle };
+
+/// The kind of content that a name promises, remembered by extension.
+class NameKinds {
+  public:
+    Kind of(std::string_view name) {
+        const std::size_t dot = name.rfind('.');
+        if (dot == std::string_view::npos || name[0] == '.') return Kind::other;
+        const std::string_view extension = name.substr(dot + 1);
+        auto known = kinds_.find(extension);
+        if (known == kinds_.end()) {
+            constexpr std::size_t enough = 10000;  // extensions that a hostile folder can make us remember
+            if (kinds_.size() >= enough) kinds_.clear();
+            known = kinds_.emplace(extension, kindOfExtension(extension)).first;
+        }
+        // Whether it is the preview of another item only the whole name tells.
+        const bool mayBePreview =
+            extension.size() == 3 && (extension[0] | 0x20) == 'c' && known->second == Kind::file;
+        if (mayBePreview && !isContentName(URL::fileURLWithPath("/" + std::string(name)))) return Kind::other;
+        return known->second;
+    }
+
+  private:
+    static Kind kindOfExtension(std::string_view extension) {
+        const URL url = URL::fileURLWithPath("/x." + std::string(extension));
+        switch (QVContentTaggingTypes::fallBackFileTypeForURL(url)) {
+            case kFileTypeNone:
+                return Kind::other;
+            case kFileTypePatch:
+            case kFileTypeProject:
+                return Kind::bundle;
+            case kFileTypeSynthPreset:
+            case kFileTypeSamplerSettings:
+            case kFileTypePlugInSettings:
+            case kFileTypeChannelStrip:
+                return Kind::settings;
+            default:
+                return Kind::file;
+        }
+    }
+
+    std::map<std::string, Kind, std::less<>> kinds_;
+};
+
+/// A folder's names, sorted, in one piece of memory.
+class Listing {
+  public:
+    struct Entry {
+        std::size_t start;
+        std::size_t size;
+        unsigned char kind;  // as readdir tells it
+    };
+
+    explicit Listing(DIR* folder) {
+        while (const dirent* entry = ::readdir(folder)) {
+            if (entry->d_name[0] == '.') continue;
+            const std::size_t size = std::strlen(entry->d_name);
+            entries_.push_back({names_.size(), size, entry->d_type});
+            names_.append(entry->d_name, size + 1);  // with its end, for the system's calls
+        }
+        std::sort(entries_.begin(), entries_.end(),
+                  [this](const Entry& a, const Entry& b) { return name(a) < name(b); });
+    }
+
+    const std::vector<Entry>& entries() const { return entries_; }
+    std::string_view name(const Entry& entry) const { return {names_.data() + entry.start, entry.size}; }
+    bool contains(std::string_view wanted) const {
+        const auto hit = std::lower_bound(entries_.begin(), entries_.end(), wanted,
+                                          [this](const Entry& a, std::string_view b) { return name(a) < b; });
+        return hit != entries_.end() && name(*hit) == wanted;
+    }
+
+  private:
+    std::string names_;
+    std::vector<Entry> entries_;
+};
+
+std::int64_t nanoseconds(const timespec& time) {
+    constexpr std::int64_t second = 1'000'000'000;
+    return time.tv_sec * second + time.tv_nsec;
+}
+
+FileStamp stampOf(const struct stat& status) {
+    return {static_cast<std::uint64_t>(status.st_size), nanoseconds(status.st_mtim),
+            nanoseconds(status.st_ctim), static_cast<std::uint64_t>(status.st_ino)};
+}
+
+/// Makes the stamp tell changes of a second file as well.
+void include(FileStamp& stamp, const FileStamp& other) {
+    stamp.size += other.size;
+    stamp.modified = std::max(stamp.modified, other.modified);
+    stamp.changed = std::max(stamp.changed, other.changed);
+    stamp.inode = stamp.inode * 31 + other.inode;
+}
+
+/// Takes in all that lies in a bundle, up to a bound that no bundle reaches.
+void includeContents(int parent, const char* name, FileStamp& stamp, std::size_t& budget, std::size_t depth) {
+    constexpr std::size_t deepest = 16;
+    const int file = ::openat(parent, name, O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC);
+    if (file < 0 || depth > deepest) {
+        if (file >= 0) ::close(file);
+        return;
+    }
+    const Folder folder(::fdopendir(file), ::closedir);
+    if (!folder) return;
+    const Listing listing(folder.get());
+    for (const Listing::Entry& entry : listing.entries()) {
+        struct stat status {};
+        const char* its = listing.name(entry).data();
+        if (budget == 0 || ::fstatat(file, its, &status, AT_SYMLINK_NOFOLLOW) != 0) continue;
+        --budget;
+        include(stamp, stampOf(status));
+        if (S_ISDIR(status.st_mode)) includeContents(file, its, stamp, budget, depth + 1);
+    }
+}
+
+class Walk {
+  public:
+    Walk(const FolderVisitor& visit, const std::function<void(const std::string&, const Error&)>& failed)
+        : visit_(visit), failed_(failed) {}
+
+    bool folder(const std::string& path) {
+        std::vector<std::string> folders;
+        Identity identity;
+        if (!list(path, identity, folders)) return false;
+        open_.push_back(identity);
+        bool goesOn = true;
+        for (const std::string& name : folders) {
+            if (goesOn) goesOn = folder(path == "/" ? "/" + name : path + "/" + name);
+        }
+        open_.pop_back();
+        return goesOn;
+    }
+
+  private:
+    /// Shows the folder's items to the visitor; what lies in it is entered later, when it is closed again.
+    bool list(const std::string& path, Identity& identity, std::vector<std::string>& folders) {
+        const Folder folder(::opendir(path.c_str()), ::closedir);
+        struct stat status {};
+        if (!folder || ::fstat(::dirfd(folder.get()), &status) != 0) {
+            fail(path);
+            return true;
+        }
+        identity = {status.st_dev, status.st_ino};
+        if (open_.size() >= kDeepest || std::find(open_.begin(), open_.end(), identity) != open_.end())
+            return true;
+        const Listing listing(folder.get());
+        std::vector<ListedItem> items;
+        for (const Listing::Entry& entry : listing.entries())
+            addEntry(path, ::dirfd(folder.get()), listing, entry, items, folders);
+        return visit_(path, items);
+    }
+
+    void fail(const std::string& path) {
+        failed_(path, {std::string(QVCTErrorDomain), kErrorUnreadable,
+                       fmt::format("{}: {}", printable(path), std::strerror(errno))});
+    }
+
+    void addEntry(const std::string& path, int folder, const Listing& listing, const Listing::Entry& entry,
+                  std::vector<ListedItem>& items, std::vector<std::string>& folders) {
+        const std::string_view name = listing.name(entry);
+        const Kind kind = kinds_.of(name);
+        if (kind == Kind::other && entry.kind == DT_REG) return;
+        if (kind == Kind::other && entry.kind == DT_DIR) {
+            folders.emplace_back(name);
+            return;
+        }
+        struct stat status {};
+        if (::fstatat(folder, name.data(), &status, 0) != 0) {
+            if (kind != Kind::other) fail(path + "/" + std::string(name));
+            return;
+        }
+        if (S_ISDIR(status.st_mode) && kind != Kind::bundle) {
+            folders.emplace_back(name);
+            return;
+        }
+        const bool isContent =
+            kind == Kind::bundle ? S_ISDIR(status.st_mode) : kind != Kind::other && S_ISREG(status.st_mode);
+        if (!isContent) return;
+        ListedItem item{name, stampOf(status)};
+        if (kind == Kind::settings) includeCompanions(folder, listing, item);
+        if (kind == Kind::bundle) {
+            std::size_t budget = 10000;
+            includeContents(folder, name.data(), item.stamp, budget, 0);
+        }
+        items.push_back(item);
+    }
+
+    static void includeCompanions(int folder, const Listing& listing, ListedItem& item) {
+        for (const char* ending : {".plist", ".caf"}) {
+            const std::string companion = std::string(item.name) + ending;
+            struct stat status {};
+            if (listing.contains(companion) && ::fstatat(folder, companion.c_str(), &status, 0) == 0)
+                include(item.stamp, stampOf(status));
+        }
+    }
+
+    const FolderVisitor& visit_;
+    const std::function<void(const std::string&, const Error&)>& failed_;
+    NameKinds kinds_;
+    std::vector<Identity> open_;  // the folders from the start down to where we are
+};
+
+std::uint64_t countBelow(const std::string& path, NameKinds& kinds, std::size_t depth) {
+    const Folder folder(::opendir(path.c_str()), ::closedir);
+    std::uint64_t count = 0;
+    while (const dirent* entry = folder ? ::readdir(folder.get()) : nullptr) {
+        const std::string_view name = entry->d_name;
+        const Kind kind = kinds.of(name);
+        if (kind != Kind::other) {
+            ++count;
+        } else if (entry->d_type == DT_DIR && name[0] != '.' && depth < kDeepest) {
+            count += countBelow(path + "/" + std::string(name), kinds, depth + 1);
+        }
+    }
+    return count;
+}
+
+}  // namespace
+
+bool walkLibrary(const std::string& folder, const FolderVisitor& visit,
+                 const std::function<void(const std::string& path, const Error& error)>& failed) {
+    return Walk(visit, failed).folder(folder);
+}
+
+std::uint64_t countContentNames(const std::string& folder) {
+    NameKinds kinds;
+    return countBelow(folder, kinds, 0);
+}
+
+std::uint64_t digestOf(const std::vector<ListedItem>& items) {
+    std::uint64_t state = 0x51776374;
+    const auto add = [&state](std::uint64_t word) {
+        state = (state ^ word) * 0x9e3779b97f4a7c15U;
+        state ^= state >> 32U;
+    };
+    for (const ListedItem& item : items) {
+        add(item.name.size());
+        for (std::size_t at = 0; at < item.name.size(); at += 8) {
+            std::uint64_t word = 0;
+            std::memcpy(&word, item.name.data() + at, std::min<std::size_t>(8, item.name.size() - at));
+            add(word);
+        }
+        add(item.stamp.size);
+        add(static_cast<std::uint64_t>(item.stamp.modified));
+        add(static_cast<std::uint64_t>(item.stamp.changed));
+        add(item.stamp.inode);
+    }
+    return state == 0 ? 1 : state;
+}
+
+}  // namespace qvct::contentdb

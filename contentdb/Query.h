@@ -1,0 +1,119 @@
+#pragma once
+
+#include "contentdb/IndexedItem.h"
+#include "platform/RegularExpression.h"
+
+#include <cstddef>
+#include <memory>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <variant>
+#include <vector>
+
+namespace qvct::contentdb {
+
+/// Something of an item that a query can name.
+struct Field {
+    enum class Kind { name, path, type, pack, tag, key, level, number };
+    Kind kind = Kind::name;
+    /// The category (folded; empty for any) of `tag`, the label of `level`, the key (bare) of `number`.
+    std::string of;
+
+    bool operator==(const Field&) const = default;
+};
+
+/// The item has these words in a row in its name, its path or a label; in folded form.
+struct WordsMatch {
+    std::vector<std::string> words;
+    bool lastMayContinue = true;
+    /// For a text without letters and digits: it occurs as it is.
+    std::string literal;
+};
+/// The item has the tag or one below it; folded.
+struct TagMatch {
+    std::string label;
+    std::string category;
+};
+/// One of the item's numbers in the field lies in the range. For levels the field is `levelField(label)`.
+struct NumberMatch {
+    std::string field;
+    double low;
+    double high;
+    bool includesLow = true;
+    bool includesHigh = true;
+
+    bool contains(double value) const {
+        return (includesLow ? value >= low : value > low) && (includesHigh ? value <= high : value < high);
+    }
+};
+struct TypeMatch {
+    std::int64_t type;
+};
+/// The field is (a pack), or contains (a name or path), the text; folded.
+struct TextMatch {
+    Field field;
+    std::string text;
+};
+/// The expression occurs in one of the field's texts, in any case.
+struct ExpressionMatch {
+    Field field;
+    std::shared_ptr<RegularExpression> expression;
+};
+
+/// A condition on an item: a tree of all, any and not over matches.
+struct Condition;
+struct AllOf {
+    std::vector<Condition> parts;
+};
+struct AnyOf {
+    std::vector<Condition> parts;
+};
+struct NoneOf {
+    std::vector<Condition> parts;
+};
+struct Condition {
+    std::variant<AllOf, AnyOf, NoneOf, WordsMatch, TagMatch, NumberMatch, TypeMatch, TextMatch,
+                 ExpressionMatch>
+        is;
+};
+
+struct SortKey {
+    Field field;
+    bool isDescending = false;
+};
+
+/// A parsed query. Belongs to one thread at a time, because of its regular expressions.
+struct Query {
+    Condition condition;
+    /// Without any: in the order in which items came into the database.
+    std::vector<SortKey> order;
+};
+
+/// The names that are fields besides the built-in ones.
+struct Vocabulary {
+    /// Identifiers of tag categories: "Genres" can be named as `genres`, `genre`, `gen`.
+    std::vector<std::string> categories;
+    /// Keys of numbers: "BeatCount".
+    std::vector<std::string> numbers;
+};
+
+/// What is wrong with a query, and where.
+struct QueryError {
+    std::string message;
+    std::size_t position = 0;  ///< byte offset in the query
+    std::size_t length = 0;    ///< bytes that it concerns; 0 at the end
+};
+
+/// Reads a query as docs/query.md describes it. An empty one matches everything.
+/// @cost  O(length), without recursion.
+std::optional<Query> parseQuery(std::string_view text, const Vocabulary& vocabulary, QueryError* error);
+
+/// Evaluates a query in memory: whether it finds the item. Failed items are never found.
+bool matches(const Query& query, const IndexedItem& item);
+
+/// Whether `a` comes before `b` in the query's order; items without the field last. Equal items are not
+/// before each other: whoever sorts keeps them in the order of the database.
+bool comesBefore(const Query& query, const IndexedItem& a, const IndexedItem& b);
+
+}  // namespace qvct::contentdb

@@ -1,0 +1,25 @@
+#pragma once
+
+#include "contentdb/Query.h"
+
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace qvct::contentdb {
+
+/// The field that a word names, or nothing and a reason.
+std::optional<Field> fieldNamed(std::string_view word, const Vocabulary& vocabulary, std::string& reason);
+
+/// Labels of the tags that a musical key consists of ("A", "C#", "Bbm", "A minor"); empty when it is no key.
+std::vector<std::string> keyLabels(std::string_view text);
+/// The file type that a word names.
+std::optional<std::int64_t> typeNamed(std::string_view word);
+
+/// What an item has in a field: its numbers, or its texts.
+std::vector<double> numbersInField(const IndexedItem& item, const Field& field);
+std::vector<std::string> textsInField(const IndexedItem& item, const Field& field);
+bool isNumeric(const Field& field);
+
+}  // namespace qvct::contentdb

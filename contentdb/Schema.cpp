@@ -1,0 +1,157 @@
+#include "contentdb/Schema.h"
+
+#include "contentdb/ChecksumVfs.h"
+#include "platform/FileAccess.h"
+#include "platform/Text.h"
+
+#include <array>
+#include <cstdint>
+#include <cstring>
+#include <filesystem>
+#include <fstream>
+
+#include <fmt/format.h>
+
+namespace qvct::contentdb {
+namespace {
+
+constexpr std::uint32_t kApplicationId = 0x51564344;  // "QVCD"
+
+/// Step N brings a database of version N to version N + 1. Steps are never changed, only added.
+constexpr std::array kMigrations = {
+    // Paths and names are blobs, since they need not be UTF-8. An item's folder is kept apart, so that a
+    // folder
+    // in which nothing has changed is passed over by its digest alone.
+    R"(CREATE TABLE folder (
+           id INTEGER PRIMARY KEY,
+           path BLOB NOT NULL UNIQUE,
+           digest INTEGER NOT NULL,  -- of the names and stamps in it; 0: to be looked at again
+           gone INTEGER NOT NULL     -- how many of its items were missing then
+       );
+       CREATE TABLE item (
+           id INTEGER PRIMARY KEY,
+           folder INTEGER NOT NULL,
+           file BLOB NOT NULL,
+           size INTEGER NOT NULL, modified INTEGER NOT NULL, changed INTEGER NOT NULL, inode INTEGER NOT NULL,
+           payload BLOB NOT NULL,
+           failed INTEGER NOT NULL,
+           description BLOB NOT NULL
+       );
+       CREATE UNIQUE INDEX item_place ON item (folder, file);
+       CREATE INDEX item_payload ON item (payload) WHERE length(payload) > 0;
+       CREATE INDEX item_failed ON item (id) WHERE failed = 1;
+       CREATE TABLE earlier_path (item INTEGER, path BLOB, PRIMARY KEY (item, path)) WITHOUT ROWID;
+       -- What items are found by, and for each term and chunk of 65,536 items the items that have it.
+       CREATE TABLE term (id INTEGER PRIMARY KEY, value BLOB NOT NULL UNIQUE);
+       CREATE TABLE posting (key INTEGER PRIMARY KEY, ids BLOB NOT NULL);
+       -- Tags as they are written, and the categories and number fields that a query may name.
+       CREATE TABLE tag (term INTEGER PRIMARY KEY, label BLOB NOT NULL, category BLOB NOT NULL);
+       CREATE TABLE field (isNumber INTEGER, name BLOB, PRIMARY KEY (isNumber, name)) WITHOUT ROWID;)"};
+
+/// The first bytes of the file, or fewer if it is shorter.
+std::string header(const std::string& path) {
+    constexpr std::size_t size = 100;
+    std::string bytes(size, '\0');
+    std::ifstream file(path, std::ios::binary);
+    file.read(bytes.data(), size);
+    bytes.resize(static_cast<std::size_t>(file.gcount()));
+    return bytes;
+}
+
+[[noreturn]] void refuse(const std::string& path, ErrorCode code, std::string_view reason) {
+    throw DatabaseFailure(code, fmt::format("{}: {}", printable(path), reason));
+}
+
+void create(Connection& connection) {
+    connection.run(fmt::format("PRAGMA page_size = {}", kPageSize).c_str());
+    Transaction transaction(connection);
+    // Another process may have been quicker.
+    if (connection.number("PRAGMA user_version") == 0) {
+        connection.run(fmt::format("PRAGMA application_id = {}", kApplicationId).c_str());
+        connection.run(kMigrations[0]);
+        connection.run("PRAGMA user_version = 1");
+    }
+    transaction.commit();
+}
+
+void migrate(Connection& connection) {
+    constexpr auto present = static_cast<std::int64_t>(kMigrations.size());
+    Transaction transaction(connection);
+    for (std::int64_t version = connection.number("PRAGMA user_version"); version < present; ++version) {
+        connection.run(kMigrations[static_cast<std::size_t>(version)]);
+        connection.run(fmt::format("PRAGMA user_version = {}", version + 1).c_str());
+    }
+    transaction.commit();
+}
+
+void prepare(Connection& connection, bool isNew, Access access) {
+    connection.run("PRAGMA cell_size_check = ON; PRAGMA temp_store = MEMORY; PRAGMA cache_size = -49152");
+    if (isNew) create(connection);
+    constexpr auto present = static_cast<std::int64_t>(kMigrations.size());
+    const std::int64_t version = connection.number("PRAGMA user_version");
+    if (connection.number("PRAGMA application_id") != kApplicationId)
+        refuse(connection.path(), kErrorInvalidArgument, "not a content database");
+    if (version > present) {
+        refuse(connection.path(), kErrorInvalidArgument,
+               fmt::format("made by a newer version (form {}, known are 1 to {})", version, present));
+    }
+    if (access == Access::read) {
+        if (version < present)
+            refuse(connection.path(), kErrorInvalidArgument,
+                   "of an older form; indexing brings it up to date");
+        return;
+    }
+    if (version < present) migrate(connection);
+    if (connection.text("PRAGMA journal_mode = WAL") != "wal")
+        refuse(connection.path(), kErrorUnwritable, "no write-ahead log can be kept here");
+    connection.run("PRAGMA synchronous = NORMAL; PRAGMA wal_autocheckpoint = 4000");
+}
+
+/// The file by an URI that says that nobody writes to it, so that no log is needed beside it.
+std::string immutableUri(const std::string& path) {
+    std::string uri = "file:";
+    for (const char c : std::filesystem::absolute(path).string())
+        uri += fmt::format("%{:02X}", static_cast<unsigned char>(c));
+    return uri + "?immutable=1";
+}
+
+std::unique_ptr<Connection> openForReading(const std::string& path) {
+    try {
+        auto connection = std::make_unique<Connection>(path, Connection::Access::readOnly);
+        prepare(*connection, false, Access::read);
+        return connection;
+    } catch (const DatabaseFailure& failure) {
+        // In a folder that cannot be written the shared state of the log cannot be made.
+        if (failure.code() != kErrorUnreadable || fileExists(path + "-wal")) throw;
+    }
+    auto connection = std::make_unique<Connection>(immutableUri(path), Connection::Access::readOnly);
+    prepare(*connection, false, Access::read);
+    return connection;
+}
+
+}  // namespace
+
+bool isMarkedAsContentDatabase(const std::string& path) {
+    constexpr std::string_view magic = "SQLite format 3";
+    constexpr std::size_t place = 68;
+    const std::string bytes = header(path);
+    return bytes.size() > place + 4 && bytes.compare(0, magic.size(), magic) == 0 &&
+           bytes.compare(place, 4, "QVCD") == 0;
+}
+
+std::unique_ptr<Connection> openDatabase(const std::string& path, Access access) {
+    std::error_code ignored;
+    const bool exists = fileExists(path);
+    if (!exists && access == Access::read) refuse(path, kErrorUnreadable, "there is no such database");
+    if (isDirectory(path)) refuse(path, kErrorInvalidArgument, "a folder, not a database");
+    const bool isNew = !exists || std::filesystem::file_size(path, ignored) == 0;
+    // An interrupted creation is finished by SQLite itself, from its journal.
+    if (!isNew && !isMarkedAsContentDatabase(path) && !fileExists(path + "-journal"))
+        refuse(path, kErrorInvalidArgument, "not a content database, or one whose beginning is damaged");
+    if (access == Access::read) return openForReading(path);
+    auto connection = std::make_unique<Connection>(path, Connection::Access::create);
+    prepare(*connection, isNew || connection->number("PRAGMA application_id") == 0, access);
+    return connection;
+}
+
+}  // namespace qvct::contentdb

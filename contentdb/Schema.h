@@ -1,0 +1,20 @@
+#pragma once
+
+#include "contentdb/Sqlite.h"
+
+#include <memory>
+#include <string>
+
+namespace qvct::contentdb {
+
+enum class Access { read, write };
+
+/// Opens a content database, making it (for `Access::write`) where there is none, and brings an older one to
+/// the present form. Refuses a file that is something else, damaged, or made by a newer version.
+/// @throws DatabaseFailure: kErrorMalformed when it is a content database that is damaged.
+std::unique_ptr<Connection> openDatabase(const std::string& path, Access access);
+
+/// Whether the file carries the mark of a content database, damaged or not.
+bool isMarkedAsContentDatabase(const std::string& path);
+
+}  // namespace qvct::contentdb

@@ -1,0 +1,58 @@
+#include "contentdb/ContentStore.h"
+#include "contentdb/Terms.h"
+#include "platform/Text.h"
+
+#include <fmt/format.h>
+
+namespace qvct::contentdb {
+namespace {
+
+/// A number for a set of (entry, item) pairs that does not depend on their order.
+class Tally {
+  public:
+    void add(std::int64_t key, std::uint16_t id) {
+        std::uint64_t state = static_cast<std::uint64_t>(key) * 0x9e3779b97f4a7c15U + id;
+        state = (state ^ state >> 31U) * 0xbf58476d1ce4e5b9U;
+        sum_ += state ^ state >> 29U;
+        ++count_;
+    }
+    bool operator==(const Tally&) const = default;
+
+  private:
+    std::uint64_t sum_ = 0;
+    std::uint64_t count_ = 0;
+};
+
+}  // namespace
+
+void ContentStore::checkAll() {
+    const auto damaged = [this](std::string_view what) {
+        throw DatabaseFailure(kErrorMalformed, fmt::format("{}: the database is damaged: {}",
+                                                           printable(connection_.path()), what));
+    };
+    const std::string verdict = connection_.text("PRAGMA integrity_check(1)");
+    if (verdict != "ok") damaged(verdict);
+    Tally said;
+    for (ItemId id = 1, last = lastId(); id <= last; ++id) {
+        const auto its = item(id);
+        if (!its) continue;
+        for (const std::string& value : termsOf(*its)) {
+            const auto known = term(value);
+            if (!known) damaged(fmt::format("a term of {} is missing", printable(its->path)));
+            said.add(postingKey(*known, id >> kChunkBits), static_cast<std::uint16_t>(id & (kChunkSize - 1)));
+        }
+    }
+    Tally indexed;
+    Statement postings(connection_, "SELECT key, ids FROM posting");
+    while (postings.step()) {
+        IdSet ids;
+        if (!ids.insertEncoded(postings.bytes(1))) damaged("an index entry");
+        ids.forEach([&](std::uint16_t id) {
+            indexed.add(postings.integer(0), id);
+            return true;
+        });
+    }
+    if (!(said == indexed)) damaged("the index does not say what the items say");
+}
+
+}  // namespace qvct::contentdb

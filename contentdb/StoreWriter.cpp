@@ -1,0 +1,219 @@
+#include "contentdb/StoreWriter.h"
+
+#include "contentdb/ItemCodec.h"
+#include "contentdb/Terms.h"
+#include "contentdb/Words.h"
+#include "platform/FileAccess.h"
+#include "platform/Text.h"
+
+#include <algorithm>
+
+#include <fmt/format.h>
+
+namespace qvct::contentdb {
+namespace {
+
+/// Most terms whose numbers are remembered; beyond that they are looked up again.
+constexpr std::size_t kMostCachedTerms = 200000;
+
+}  // namespace
+
+StoreWriter::StoreWriter(Connection& connection)
+    : store_(connection),
+      put_(connection, "INSERT OR REPLACE INTO item VALUES (?, ?, ?, ?, ?, ?, ?, ?, ?, ?)"),
+      putTerm_(connection, "INSERT INTO term (value) VALUES (?) RETURNING id"),
+      putPosting_(connection, "INSERT OR REPLACE INTO posting VALUES (?, ?)"),
+      dropPosting_(connection, "DELETE FROM posting WHERE key = ?"),
+      folder_(connection, "SELECT id, digest, gone FROM folder WHERE path = ?"),
+      putFolder_(connection, "INSERT INTO folder (path, digest, gone) VALUES (?, 0, 0) RETURNING id") {}
+
+StoreWriter::~StoreWriter() = default;
+
+void StoreWriter::begin() {
+    transaction_.emplace(store_.connection());
+}
+
+void StoreWriter::commit() {
+    flushPostings();
+    transaction_->commit();
+    transaction_.reset();
+}
+
+void StoreWriter::put(ItemId id, const IndexedItem& item, const std::vector<std::string>& terms) {
+    if (id > kLastItemId) {
+        throw DatabaseFailure(
+            kErrorTooLarge,
+            fmt::format("{}: more than {} items", printable(store_.connection().path()), kLastItemId));
+    }
+    std::vector<std::string> before;
+    if (const auto old = store_.item(id)) before = termsOf(*old);
+    std::vector<std::string> difference;
+    std::set_difference(before.begin(), before.end(), terms.begin(), terms.end(),
+                        std::back_inserter(difference));
+    for (const std::string& term : difference) change(id, term, false);
+    difference.clear();
+    std::set_difference(terms.begin(), terms.end(), before.begin(), before.end(),
+                        std::back_inserter(difference));
+    for (const std::string& term : difference) change(id, term, true);
+    noteNames(item);
+    const Place place = placeOf(item.path);
+    const std::string description = encodedDescription(item);
+    put_.bind(1, id).bind(2, folderId(place.folder)).bind(3, place.file);
+    put_.bind(4, item.stamp.size).bind(5, item.stamp.modified).bind(6, item.stamp.changed);
+    put_.bind(7, item.stamp.inode).bind(8, item.payloadHash).bind(9, std::int64_t{!item.failure.empty()});
+    put_.bind(10, description).execute();
+}
+
+void StoreWriter::remove(ItemId id) {
+    const auto old = store_.item(id);
+    if (!old) return;
+    for (const std::string& term : termsOf(*old)) change(id, term, false);
+    for (const char* sql : {"DELETE FROM item WHERE id = ?", "DELETE FROM earlier_path WHERE item = ?"})
+        Statement(store_.connection(), sql).bind(1, id).execute();
+}
+
+std::optional<ItemId> StoreWriter::idOfMoved(const IndexedItem& item) {
+    if (item.payloadHash.empty()) return std::nullopt;
+    // Copies of one sound may be many; a few that are still where they were say enough.
+    Statement statement(store_.connection(),
+                        "SELECT id FROM item WHERE payload = ? AND length(payload) > 0 LIMIT 16");
+    for (statement.bind(1, item.payloadHash); statement.step();) {
+        const auto candidate = store_.item(statement.integer(0));
+        if (candidate && candidate->path != item.path && !fileExists(candidate->path))
+            return statement.integer(0);
+    }
+    return std::nullopt;
+}
+
+void StoreWriter::addEarlierPath(ItemId id, std::string_view path) {
+    Statement(store_.connection(), "INSERT OR IGNORE INTO earlier_path VALUES (?, ?)")
+        .bind(1, id)
+        .bind(2, path)
+        .execute();
+}
+
+FolderRecord StoreWriter::folder(std::string_view path) {
+    FolderRecord record;
+    if (folder_.bind(1, path).step())
+        record = {folder_.integer(0), folder_.unsignedInteger(1), folder_.integer(2)};
+    folder_.reset();
+    return record;
+}
+
+std::map<std::string, FileRecord, std::less<>> StoreWriter::files(std::int64_t folder) {
+    Statement statement(store_.connection(),
+                        "SELECT file, id, size, modified, changed, inode, failed FROM item WHERE folder = ?");
+    std::map<std::string, FileRecord, std::less<>> files;
+    for (statement.bind(1, folder); statement.step();) {
+        files[std::string(statement.bytes(0))] = {statement.integer(1),
+                                                  {statement.unsignedInteger(2), statement.integer(3),
+                                                   statement.integer(4), statement.unsignedInteger(5)},
+                                                  statement.integer(6) != 0};
+    }
+    return files;
+}
+
+void StoreWriter::setFolder(const FolderRecord& folder) {
+    Statement(store_.connection(), "UPDATE folder SET digest = ?, gone = ? WHERE id = ?")
+        .bind(1, folder.digest)
+        .bind(2, folder.gone)
+        .bind(3, folder.id)
+        .execute();
+}
+
+void StoreWriter::forEachFolder(std::string_view path,
+                                const std::function<void(const FolderRecord&, std::string_view)>& visit) {
+    // Everything below "a" begins with "a/" and is less than "a0", '0' being the byte after '/'.
+    const std::string_view base = path == "/" ? std::string_view() : path;
+    const std::string below = std::string(base) + "/";
+    const std::string behind = std::string(base) + "0";
+    Statement statement(
+        store_.connection(),
+        "SELECT id, digest, gone, path FROM folder WHERE path = ?1 OR (path >= ?2 AND path < ?3)");
+    for (statement.bind(1, path).bind(2, below).bind(3, behind); statement.step();) {
+        visit({statement.integer(0), statement.unsignedInteger(1), statement.integer(2)}, statement.bytes(3));
+    }
+}
+
+std::int64_t StoreWriter::folderId(std::string_view path) {
+    if (lastFolderId_ != 0 && path == lastFolder_) return lastFolderId_;
+    std::int64_t id = folder(path).id;
+    if (id == 0) {
+        putFolder_.bind(1, path).step();
+        id = putFolder_.integer(0);
+        putFolder_.reset();
+    }
+    lastFolder_ = path;
+    lastFolderId_ = id;
+    return id;
+}
+
+TermId StoreWriter::termId(const std::string& value) {
+    const auto known = termIds_.find(value);
+    if (known != termIds_.end()) return known->second;
+    auto id = store_.term(value);
+    if (!id) {
+        putTerm_.bind(1, value).step();
+        id = putTerm_.integer(0);
+        putTerm_.reset();
+    }
+    if (termIds_.size() >= kMostCachedTerms) termIds_.clear();
+    termIds_.emplace(value, *id);
+    return *id;
+}
+
+void StoreWriter::noteNames(const IndexedItem& item) {
+    const auto noteField = [this](bool isNumber, const std::string& name) {
+        if (!names_.insert((isNumber ? "#" : "@") + name).second) return;
+        Statement(store_.connection(), "INSERT OR IGNORE INTO field VALUES (?, ?)")
+            .bind(1, std::int64_t{isNumber})
+            .bind(2, name)
+            .execute();
+    };
+    const auto noteTag = [&](const std::string& label, const std::string& category) {
+        if (!names_.insert("t" + label + '\0' + category).second) return;
+        noteField(false, category);
+        // Of spellings that differ in case one stands for all, the same whatever came first.
+        Statement(store_.connection(),
+                  "INSERT INTO tag VALUES (?, ?, ?) ON CONFLICT DO UPDATE SET "
+                  "label = min(label, excluded.label), category = min(category, excluded.category)")
+            .bind(1, termId(tagTerm(label, category)))
+            .bind(2, label)
+            .bind(3, category)
+            .execute();
+    };
+    for (const IndexedTagging& tagging : item.taggings) {
+        noteTag(tagging.label, tagging.category);
+        for (const std::string& ancestor : tagging.ancestors) noteTag(ancestor, tagging.category);
+    }
+    for (const IndexedValue& value : item.values) {
+        if (std::holds_alternative<double>(value.value)) noteField(true, value.key);
+    }
+}
+
+void StoreWriter::change(ItemId id, const std::string& term, bool isAdded) {
+    changes_.push_back({postingKey(termId(term), id >> kChunkBits),
+                        static_cast<std::uint16_t>(id & (kChunkSize - 1)), isAdded});
+}
+
+void StoreWriter::flushPostings() {
+    std::stable_sort(changes_.begin(), changes_.end(),
+                     [](const Change& a, const Change& b) { return a.key < b.key; });
+    for (std::size_t at = 0; at < changes_.size();) {
+        const std::int64_t key = changes_[at].key;
+        IdSet ids;
+        store_.addPosting(key >> kChunkBits, key & (kChunkSize - 1), ids);
+        for (; at < changes_.size() && changes_[at].key == key; ++at) {
+            changes_[at].isAdded ? ids.insert(changes_[at].id) : ids.erase(changes_[at].id);
+        }
+        if (ids.empty()) {
+            dropPosting_.bind(1, key).execute();
+        } else {
+            const std::string bytes = ids.encoded();
+            putPosting_.bind(1, key).bind(2, bytes).execute();
+        }
+    }
+    changes_.clear();
+}
+
+}  // namespace qvct::contentdb

@@ -1,0 +1,167 @@
+#include "Library.h"
+
+#include <algorithm>
+#include <cmath>
+
+#include <fmt/format.h>
+#include <gmock/gmock.h>
+
+namespace qvct::test {
+namespace {
+
+using namespace contentdb;
+
+/// Queries of every kind of term, alone and combined, from the words and tags that the items are made of.
+class QueryGenerator {
+  public:
+    explicit QueryGenerator(std::uint64_t seed) : items_(seed) {}
+
+    std::string next() {
+        std::string query;
+        for (std::size_t left = 1 + pick(3); left > 0; --left) {
+            if (!query.empty()) query += pick(5) == 0 ? " , " : " ";
+            if (pick(4) == 0) query += "-";
+            query += term();
+        }
+        if (pick(3) == 0) query += " " + std::string(kOrders[pick(kOrders.size())]);
+        return query;
+    }
+
+  private:
+    std::size_t pick(std::size_t count) { return items_.pick(count); }
+    std::string quoted(std::string_view text) { return "\"" + std::string(text) + "\""; }
+
+    std::string range(double scale) {
+        double low = static_cast<double>(pick(2000)) / 1000 * scale;
+        double high = static_cast<double>(pick(2000)) / 1000 * scale;
+        if (low > high) std::swap(low, high);
+        switch (pick(6)) {
+            case 0:
+                return fmt::format(":{}..{}", low, high);
+            case 1:
+                return fmt::format(":{:.0f}..{:.0f}", std::floor(low), std::ceil(high));
+            case 2:
+                return fmt::format(">{}", low);
+            case 3:
+                return fmt::format("<={:.0f}", high);
+            case 4:
+                return fmt::format(":..{}", high);
+            default:
+                return fmt::format(":{:.0f}", low);
+        }
+    }
+
+    std::string term() {
+        const ItemGenerator::Tag& tag = items_.tag();
+        switch (pick(16)) {
+            case 0:
+                return items_.word();
+            case 1:
+                return items_.word().substr(0, 1 + pick(3));
+            case 2:
+                return quoted(items_.word());
+            case 3:
+                return quoted(items_.word() + " " + items_.word());
+            case 4:
+                return items_.word() + "," + items_.word();
+            case 5:
+                return "tag:" + quoted(tag.label);
+            case 6:
+                return (pick(2) == 0 ? "GENRE:" : "source:") + quoted(tag.label) + "," +
+                       quoted(items_.tag().label);
+            case 7:
+                return "level:" + quoted(tag.label) + (pick(4) == 0 ? "" : range(0.5));
+            case 8:
+                return "bpm" + range(100);
+            case 9:
+                return pick(2) == 0 ? "length" + range(12) : "gain" + range(-1);
+            case 10:
+                return "beats:" + std::to_string(4U << pick(4));
+            case 11:
+                return pick(2) == 0 ? "key:A" : "key:C#m";
+            case 12:
+                return pick(2) == 0 ? "type:loop" : "pack:\"pack " + std::to_string(pick(20)) + "\"";
+            case 13:
+                return "path:" + quoted(items_.word() + "/");
+            case 14:
+                return pick(2) == 0 ? "name::^k.*[13579]" : "genre::^deep";
+            default:
+                return std::string(kOddTerms[pick(kOddTerms.size())]);
+        }
+    }
+
+    static constexpr std::array<std::string_view, 6> kOrders = {"bpm+",         "bpm-",  "name+",
+                                                                "genre- name+", "size-", "length+"};
+    static constexpr std::array<std::string_view, 7> kOddTerms = {
+        "\xf0\x9f\xa5\x81", "%", "STRASSE", "cafe", "\"\xc3\xa9tude\"", "line", "size>50000"};
+
+    ItemGenerator items_;
+};
+
+std::vector<std::int64_t> inMemory(const Query& query, const std::vector<IndexedItem>& items,
+                                   std::size_t limit) {
+    std::vector<std::int64_t> ids;
+    for (std::size_t i = 0; i < items.size(); ++i) {
+        if (matches(query, items[i])) ids.push_back(static_cast<std::int64_t>(i + 1));
+    }
+    const auto item = [&items](std::int64_t id) -> const IndexedItem& {
+        return items[static_cast<std::size_t>(id - 1)];
+    };
+    std::stable_sort(ids.begin(), ids.end(),
+                     [&](std::int64_t a, std::int64_t b) { return comesBefore(query, item(a), item(b)); });
+    if (ids.size() > limit) ids.resize(limit);
+    return ids;
+}
+
+TEST(Evaluators, FindTheSameInTheSameOrder) {
+    const TemporaryFolder folder;
+    std::size_t queriesWithMatches = 0;
+    for (const std::uint64_t seed : {1U, 2U, 3U}) {
+        std::vector<IndexedItem> items = generatedItems(seed, 400);
+        items[7].failure = "cannot be read";
+        const std::string path = folder.path("library" + std::to_string(seed));
+        store(path, items);
+        const auto database = ContentDatabase::open(path);
+        ASSERT_NE(database, nullptr);
+        const Vocabulary vocabulary = *database->vocabulary();
+        QueryGenerator queries(seed);
+        for (int i = 0; i < 200; ++i) {
+            const std::string text = queries.next();
+            QueryError error;
+            const auto query = parseQuery(text, vocabulary, &error);
+            ASSERT_TRUE(query) << text << ": " << error.message;
+            const std::size_t limit = i % 2 == 0 ? 10 : items.size();
+            const auto found = database->search(*query, limit);
+            ASSERT_TRUE(found) << text;
+            std::vector<std::int64_t> ids;
+            for (const Found& one : *found) ids.push_back(one.id);
+            EXPECT_EQ(ids, inMemory(*query, items, limit)) << text;
+            EXPECT_EQ(*database->count(*query),
+                      static_cast<std::int64_t>(inMemory(*query, items, items.size()).size()))
+                << text;
+            if (!ids.empty()) ++queriesWithMatches;
+        }
+    }
+    EXPECT_GT(queriesWithMatches, 250U);
+}
+
+TEST(Evaluators, CountTagsOfTheMatchesAsASearchForThemWould) {
+    const TemporaryFolder folder;
+    const std::vector<IndexedItem> items = generatedItems(5, 800);
+    store(folder.path("db"), items);
+    const auto database = ContentDatabase::open(folder.path("db"));
+    const Vocabulary vocabulary = *database->vocabulary();
+    const auto counts = database->facets(*parseQuery("kick bpm:80..140", vocabulary, nullptr));
+    ASSERT_TRUE(counts);
+    EXPECT_GT(counts->size(), 5U);
+    for (const Facet& facet : *counts) {
+        const std::string text = fmt::format("kick bpm:80..140 \"{}\":\"{}\"", facet.category, facet.label);
+        const auto query = parseQuery(text, vocabulary, nullptr);
+        ASSERT_TRUE(query) << text;
+        EXPECT_EQ(inMemory(*query, items, items.size()).size(), static_cast<std::size_t>(facet.count))
+            << text;
+    }
+}
+
+}  // namespace
+}  // namespace qvct::test

@@ -1,0 +1,322 @@
+#include "Library.h"
+#include "platform/FileAccess.h"
+#include "platform/Url.h"
+#include "support/RunTool.h"
+
+#include <chrono>
+#include <csignal>
+#include <filesystem>
+#include <set>
+#include <thread>
+
+#include <fmt/format.h>
+#include <gmock/gmock.h>
+#include <sys/resource.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+namespace qvct::test {
+namespace {
+
+using namespace contentdb;
+using testing::Contains;
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::UnorderedElementsAre;
+
+/// Describes a file by its name and bytes; some names make it fail, crash or hang.
+class NameDescriber : public ItemDescriber {
+  public:
+    std::optional<IndexedItem> describe(const std::string& path, Error* error) override {
+        const URL url = URL::fileURLWithPath(path);
+        IndexedItem item;
+        item.name = url.lastPathComponentWithoutExtension();
+        if (item.name.find("fails") != std::string::npos) {
+            qvct::fail(error, kErrorMalformed, "it is broken");
+            return std::nullopt;
+        }
+        if (item.name.find("crashes") != std::string::npos) ::raise(SIGSEGV);
+        if (item.name.find("exits") != std::string::npos) ::_exit(3);
+        if (item.name.find("hangs") != std::string::npos) std::this_thread::sleep_for(std::chrono::hours(1));
+        if (item.name.find("throws") != std::string::npos) throw std::runtime_error("out of luck");
+        if (item.name.find("slow") != std::string::npos)
+            std::this_thread::sleep_for(std::chrono::milliseconds(5));
+        item.fileType = kFileTypeAudioFile;
+        if (!isDirectory(path)) item.payloadHash = readAll(path);
+        item.taggings = {{"Drums", "Source", {}, {}, Provenance::automatic, "names"}};
+        return item;
+    }
+};
+
+class Indexing : public testing::Test {
+  protected:
+    IndexProgress index(const std::function<void(IndexOptions&)>& change = {}) {
+        IndexOptions options;
+        options.folders = {library()};
+        options.database = database();
+        options.workers = 2;
+        options.timeLimitPerItem = std::chrono::milliseconds(300);
+        options.note = [this](const std::string& message) { notes_.push_back(message); };
+        if (change) change(options);
+        Error error;
+        const auto progress = indexLibrary(
+            options, [] { return std::make_unique<NameDescriber>(); }, &error);
+        EXPECT_TRUE(progress) << error.message;
+        return progress.value_or(IndexProgress{});
+    }
+
+    std::vector<std::string> names(const std::string& query = "", const std::string& path = {}) const {
+        const auto database = ContentDatabase::open(path.empty() ? this->database() : path);
+        std::vector<std::string> names;
+        if (!database) return names;
+        const auto all = database->search(*parseQuery(query, *database->vocabulary(), nullptr), 100000);
+        for (const Found& found : *all) names.push_back(found.item.name);
+        return names;
+    }
+
+    void write(const std::string& name, const std::string& bytes) const {
+        folder_.write("library/" + name, bytes);
+    }
+    /// Until what was written is older than a tick of the file system's clock.
+    static void settle() { std::this_thread::sleep_for(std::chrono::milliseconds(40)); }
+    std::string library() const { return folder_.path("library"); }
+    std::string database() const { return folder_.path("db"); }
+
+    TemporaryFolder folder_;
+    std::vector<std::string> notes_;
+};
+
+TEST_F(Indexing, ReadsWhatHasChangedOnly) {
+    for (const char* name : {"b/Snare.wav", "a/Kick.wav", "Pad.cst", "a/Bell.patch/tags.plist"})
+        write(name, name);
+    settle();
+    EXPECT_EQ(index().described, 4U);
+    EXPECT_THAT(names(), ElementsAre("Pad", "Bell", "Kick", "Snare"));
+    IndexProgress again = index();
+    EXPECT_EQ(again.described, 0U);
+    EXPECT_EQ(again.unchanged, 4U);
+    write("a/Kick.wav", "another sound");
+    write("a/Bell.patch/tags.plist", "another record");
+    write("Pad.cst.plist", "a record beside it");
+    settle();
+    again = index();
+    EXPECT_EQ(again.described, 3U);
+    EXPECT_EQ(again.unchanged, 1U);
+    EXPECT_EQ(index().described, 0U);
+}
+
+TEST_F(Indexing, ReadsAgainWhatMayHaveChangedWithinATick) {
+    write("Kick.wav", "1");
+    index();
+    settle();
+    EXPECT_EQ(index().described, 1U);
+    EXPECT_EQ(index().described, 0U);
+}
+
+TEST_F(Indexing, ForgetsMissingFilesOnlyWhenTold) {
+    for (const char* name : {"Kick.wav", "gone/Snare.wav", "gone/deep/Hat.wav", "Clap.wav"})
+        write(name, name);
+    settle();
+    index();
+    std::filesystem::remove_all(library() + "/gone");
+    std::filesystem::remove(library() + "/Clap.wav");
+    EXPECT_EQ(index().pruned, 0U);
+    EXPECT_EQ(names().size(), 4U);
+    EXPECT_EQ(index([](IndexOptions& options) { options.prune = true; }).pruned, 3U);
+    EXPECT_THAT(names(), ElementsAre("Kick"));
+    EXPECT_TRUE(ContentDatabase::open(database())->check());
+}
+
+TEST_F(Indexing, KnowsAMovedFileAgain) {
+    for (const char* name : {"a/Kick.wav", "a/Snare.wav"}) write(name, name);
+    settle();
+    index();
+    const ItemId before = ContentDatabase::open(database())->item(library() + "/a/Kick.wav")->id;
+    std::filesystem::create_directory(library() + "/z");
+    std::filesystem::rename(library() + "/a/Kick.wav", library() + "/z/Renamed.wav");
+    settle();
+    EXPECT_EQ(index([](IndexOptions& options) { options.prune = true; }).moved, 1U);
+    const auto database = ContentDatabase::open(this->database());
+    const auto found = database->item(library() + "/z/Renamed.wav");
+    ASSERT_TRUE(found);
+    EXPECT_EQ(found->id, before);
+    EXPECT_THAT(*database->earlierPaths(before), ElementsAre(library() + "/a/Kick.wav"));
+    EXPECT_THAT(names(), UnorderedElementsAre("Renamed", "Snare"));
+    EXPECT_TRUE(database->check());
+}
+
+TEST_F(Indexing, LosesOneItemToEachThatFailsCrashesOrHangs) {
+    std::vector<std::string> good;
+    for (int i = 0; i < 300; ++i) {
+        good.push_back("Kick" + std::to_string(i));
+        write(good.back() + ".wav", "");
+    }
+    for (const char* name :
+         {"A fails.wav", "B crashes.wav", "L hangs.wav", "Kick15 exits.wav", "M throws.wav"})
+        write(name, "");
+    settle();
+    const IndexProgress progress = index();
+    EXPECT_EQ(progress.described, 300U);
+    EXPECT_EQ(progress.failed, 5U);
+    EXPECT_THAT(names(), testing::UnorderedElementsAreArray(good));
+    std::vector<std::string> reasons;
+    ContentDatabase::open(database())->forEachFailure([&](const IndexedItem& item) {
+        reasons.push_back(URL::fileURLWithPath(item.path).lastPathComponent() + ": " + item.failure);
+        return true;
+    });
+    EXPECT_THAT(reasons,
+                ElementsAre("A fails.wav: it is broken",
+                            HasSubstr("B crashes.wav: reading it crashed (Segmentation fault"),
+                            HasSubstr("Kick15 exits.wav: reading it ended the process (status 3)"),
+                            "L hangs.wav: reading it took longer than 0.3 s", "M throws.wav: out of luck"));
+    EXPECT_EQ(index().failed, 0U);
+    EXPECT_EQ(index([](IndexOptions& options) { options.retryFailed = true; }).failed, 5U);
+}
+
+TEST_F(Indexing, GoesOnWhereItWasKilled) {
+    for (int i = 0; i < 2000; ++i) write(fmt::format("{}/slow {}.wav", i % 7, i), std::to_string(i));
+    settle();
+    std::size_t stored = 0;
+    for (int attempt = 0; attempt < 3; ++attempt) {
+        const pid_t child = ::fork();
+        if (child == 0) {
+            index();
+            ::_exit(0);
+        }
+        std::this_thread::sleep_for(std::chrono::milliseconds(3300));
+        ::kill(child, SIGKILL);
+        ::waitpid(child, nullptr, 0);
+        const std::size_t now = names().size();
+        EXPECT_GE(now, stored);
+        stored = now;
+    }
+    EXPECT_GT(stored, 100U);
+    const IndexProgress last = index();
+    EXPECT_EQ(last.unchanged, stored);
+    EXPECT_EQ(last.described, 2000 - stored);
+    EXPECT_EQ(names().size(), 2000U);
+    EXPECT_TRUE(ContentDatabase::open(database())->check());
+}
+
+TEST_F(Indexing, OfPartsUnitesToTheSameContent) {
+    for (int i = 0; i < 500; ++i) write(fmt::format("{}/{}/Kick {}.wav", i % 5, i % 3, i), std::to_string(i));
+    write("2/A fails.wav", "");
+    settle();
+    index();
+    std::vector<std::string> parts;
+    std::size_t sum = 0;
+    for (unsigned part = 1; part <= 3; ++part) {
+        parts.push_back(folder_.path("part" + std::to_string(part)));
+        sum += index([&](IndexOptions& options) {
+                   options.database = parts.back();
+                   options.part = part;
+                   options.parts = 3;
+               }).described;
+    }
+    EXPECT_EQ(sum, 500U);
+    const std::string merged = folder_.path("merged");
+    Error error;
+    ASSERT_TRUE(mergeDatabases({parts[2], parts[0], parts[1]}, merged, &error)) << error.message;
+    EXPECT_EQ(names("", merged), names());
+    EXPECT_EQ(names("name-", merged), names("name-"));
+    const auto whole = ContentDatabase::open(database());
+    const auto united = ContentDatabase::open(merged);
+    EXPECT_TRUE(united->check(&error)) << error.message;
+    EXPECT_EQ(united->totals()->failures, 1);
+    const auto all = whole->search(*parseQuery("", {}, nullptr), 1000);
+    for (const Found& found : *all) EXPECT_EQ(united->item(found.item.path)->item, found.item);
+    EXPECT_FALSE(mergeDatabases(parts, merged, &error));
+    EXPECT_THAT(error.message, HasSubstr("exists already"));
+}
+
+TEST_F(Indexing, RebuildsADamagedDatabaseAndKeepsTheOld) {
+    for (int i = 0; i < 300; ++i) write(fmt::format("Kick {}.wav", i), "");
+    settle();
+    index();
+    std::string bytes = readAll(database());
+    for (std::size_t at = 9000; at < bytes.size(); at += 8192) bytes[at] = static_cast<char>(bytes[at] ^ 1);
+    folder_.write("db", bytes);
+    EXPECT_EQ(index().described, 300U);
+    EXPECT_EQ(names().size(), 300U);
+    EXPECT_THAT(notes_, ElementsAre(HasSubstr("built anew")));
+    EXPECT_EQ(readAll(database() + ".damaged"), bytes);
+}
+
+TEST_F(Indexing, RefusesASecondRunAForeignFileAndAMissingFolder) {
+    write("Kick.wav", "");
+    const std::string song = folder_.write("song.wav", std::string(20000, 'x'));
+    IndexOptions options;
+    options.folders = {library()};
+    options.database = song;
+    const auto refusal = [&options] {
+        Error error;
+        EXPECT_FALSE(indexLibrary(
+            options, [] { return std::make_unique<NameDescriber>(); }, &error));
+        return error.message;
+    };
+    EXPECT_THAT(refusal(), HasSubstr("not a content database"));
+    EXPECT_EQ(readAll(song), std::string(20000, 'x'));
+    options.database = folder_.path("none/db");
+    EXPECT_THAT(refusal(), HasSubstr("cannot be written"));
+    options.database = database();
+    options.folders = {folder_.path("none")};
+    EXPECT_THAT(refusal(), HasSubstr("no such folder"));
+    // Another process has the lock: in this one it would be the same holder.
+    for (int i = 0; i < 400; ++i) write(fmt::format("slow {}.wav", i), "");
+    options.folders = {library()};
+    const pid_t child = ::fork();
+    if (child == 0) {
+        index();
+        ::_exit(0);
+    }
+    std::this_thread::sleep_for(std::chrono::milliseconds(300));
+    EXPECT_THAT(refusal(), HasSubstr(fmt::format("another run is writing to it (process {})", child)));
+    ::waitpid(child, nullptr, 0);
+    EXPECT_EQ(names().size(), 401U);
+}
+
+TEST_F(Indexing, KeepsWhatItHasWhenTheDiskIsFull) {
+    for (int i = 0; i < 300; ++i) write(fmt::format("Kick {}.wav", i), std::to_string(i));
+    settle();
+    index();
+    for (int i = 0; i < 9000; ++i) write(fmt::format("more/{}/Snare {}.wav", i % 9, i), std::to_string(i));
+    settle();
+    const pid_t child = ::fork();
+    if (child == 0) {
+        // Stands for a full disk: no file may grow beyond this.
+        ::signal(SIGXFSZ, SIG_IGN);
+        const rlimit limit = {600000, 600000};
+        ::setrlimit(RLIMIT_FSIZE, &limit);
+        IndexOptions options;
+        options.folders = {library()};
+        options.database = database();
+        Error error;
+        const auto progress = indexLibrary(
+            options, [] { return std::make_unique<NameDescriber>(); }, &error);
+        ::_exit(!progress && error.message.find(database()) != std::string::npos ? 7 : 0);
+    }
+    int status = 0;
+    ::waitpid(child, &status, 0);
+    EXPECT_EQ(WEXITSTATUS(status), 7);
+    EXPECT_GE(names().size(), 300U);
+    EXPECT_TRUE(ContentDatabase::open(database())->check());
+    index();
+    EXPECT_EQ(names().size(), 9300U);
+}
+
+TEST_F(Indexing, TakesAnyNameAndCirclesOfLinks) {
+    const std::vector<std::string> odd = {"it's \"quoted\"",  "two\nlines",   "100%_*",
+                                          "\xf0\x9f\xa5\x81", "raw \xff\xfe", "-x,y:z"};
+    for (const std::string& name : odd) write(name + ".wav", name);
+    std::filesystem::create_directory_symlink(library(), library() + "/circle");
+    settle();
+    EXPECT_EQ(index().described, odd.size());
+    EXPECT_THAT(names(), testing::UnorderedElementsAreArray(odd));
+    EXPECT_THAT(names("\"\xf0\x9f\xa5\x81\""), ElementsAre("\xf0\x9f\xa5\x81"));
+    EXPECT_THAT(names("%"), ElementsAre("100%_*"));
+    EXPECT_THAT(names("raw"), ElementsAre("raw \xff\xfe"));
+    EXPECT_EQ(index().described, 0U);
+}
+
+}  // namespace
+}  // namespace qvct::test

@@ -1,0 +1,110 @@
+#include "Library.h"
+#include "contentdb/IdSet.h"
+
+#include <filesystem>
+#include <fstream>
+
+#include <gmock/gmock.h>
+
+namespace qvct::test {
+namespace {
+
+using namespace contentdb;
+using testing::ElementsAre;
+using testing::HasSubstr;
+
+std::vector<std::string> foundNames(const std::string& path, const std::string& text) {
+    const auto database = ContentDatabase::open(path);
+    std::vector<std::string> names;
+    const auto all = database->search(*parseQuery(text, *database->vocabulary(), nullptr), 1000);
+    for (const Found& found : *all) names.push_back(found.item.name);
+    return names;
+}
+
+TEST(Store, KeepsEveryByteOfAnItem) {
+    const TemporaryFolder folder;
+    const std::vector<IndexedItem> items = generatedItems(3, 500);
+    store(folder.path("db"), items);
+    const auto database = ContentDatabase::open(folder.path("db"));
+    for (const IndexedItem& item : items) {
+        const auto found = database->item(item.path);
+        ASSERT_TRUE(found);
+        EXPECT_EQ(found->item, item);
+    }
+    Error error;
+    EXPECT_TRUE(database->check(&error)) << error.message;
+}
+
+TEST(Store, FindsAnItemByItsNewFactsOnly) {
+    const TemporaryFolder folder;
+    const std::string path = folder.path("db");
+    std::vector<IndexedItem> items = generatedItems(4, 50);
+    items[20].name = "Oldname";
+    store(path, items);
+    items[20].name = "Newname";
+    items[20].taggings = {{"Polka", "Genres", {}, 0.25F, Provenance::stored, {}}};
+    {
+        const auto connection = openDatabase(path, Access::write);
+        StoreWriter writer(*connection);
+        writer.begin();
+        writer.put(21, items[20], termsOf(items[20]));
+        writer.remove(1);
+        writer.commit();
+    }
+    EXPECT_THAT(foundNames(path, "oldname"), testing::IsEmpty());
+    EXPECT_THAT(foundNames(path, "newname genre:polka level:polka=0.25"), ElementsAre("Newname"));
+    EXPECT_EQ(foundNames(path, "").size(), 49U);
+    EXPECT_TRUE(ContentDatabase::open(path)->check());
+}
+
+TEST(Store, IsNotThereBeforeTheBatchIsWhole) {
+    const TemporaryFolder folder;
+    const std::string path = folder.path("db");
+    store(path, generatedItems(4, 10));
+    {
+        const auto connection = openDatabase(path, Access::write);
+        StoreWriter writer(*connection);
+        writer.begin();
+        for (ItemId id = 1; id <= 10; ++id) writer.remove(id);
+    }
+    EXPECT_EQ(foundNames(path, "").size(), 10U);
+}
+
+TEST(Store, RefusesWhatIsNoContentDatabaseOfThisVersion) {
+    const TemporaryFolder folder;
+    const std::string newer = folder.path("newer");
+    store(newer, {});
+    Connection(newer, Connection::Access::readWrite).run("PRAGMA user_version = 99");
+    folder.write("song.wav", std::string(5000, 'x'));
+    const std::string empty = folder.write("empty", "");
+    struct Case {
+        std::string path;
+        std::string reason;
+    };
+    for (const Case& one :
+         {Case{newer, "newer version"}, Case{folder.path("song.wav"), "not a content database"},
+          Case{empty, "not a content database"}, Case{folder.path("none"), "no such database"},
+          Case{folder.path(), "a folder"}}) {
+        Error error;
+        EXPECT_EQ(ContentDatabase::open(one.path, &error), nullptr) << one.path;
+        EXPECT_THAT(error.message, HasSubstr(one.reason));
+        EXPECT_THAT(error.message, HasSubstr(one.path));
+    }
+}
+
+TEST(IdSet, ComesBackFromEitherForm) {
+    for (const std::uint32_t count : {0U, 1U, 4095U, 4096U, 4097U, 65536U}) {
+        IdSet set;
+        for (std::uint32_t i = 0; i < count; ++i) set.insert(static_cast<std::uint16_t>(i * 7919U));
+        EXPECT_EQ(set.count(), count);
+        IdSet back;
+        EXPECT_TRUE(back.insertEncoded(set.encoded()));
+        EXPECT_EQ(back, set);
+    }
+    IdSet set;
+    EXPECT_FALSE(set.insertEncoded("abc"));
+    EXPECT_FALSE(set.insertEncoded(std::string(8194, 'x')));
+}
+
+}  // namespace
+}  // namespace qvct::test
