@@ -4,6 +4,7 @@
 #include "contentdb/Words.h"
 #include "platform/QVContentTaggingTypes.h"
 #include "platform/TaggingTypes.h"
+#include "platform/Text.h"
 
 #include <algorithm>
 #include <array>
@@ -86,7 +87,7 @@ std::vector<std::string> keyLabels(std::string_view text) {
     const char letter = static_cast<char>(text[0] & ~0x20);
     if (letter < 'A' || letter > 'G') return {};
     int step = steps[static_cast<std::size_t>(letter - 'A')];
-    std::string rest = folded(text.substr(1));
+    std::string rest = folded(trimBlanks(text.substr(1)));
     const auto skip = [&rest](std::string_view beginning) {
         if (!rest.starts_with(beginning)) return false;
         rest.erase(0, beginning.size());

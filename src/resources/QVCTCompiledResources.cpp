@@ -71,7 +71,8 @@ std::optional<std::string> QVCTCompiledResources::QVSearchKitJS() {
 }
 
 std::optional<std::string> QVCTCompiledResources::ExtractSoftwareInstrumentsRuleJS() {
-    return resource<std::string>(ExtractSoftwareInstrumentsRule_js, ExtractSoftwareInstrumentsRule_js_len, kText);
+    return resource<std::string>(ExtractSoftwareInstrumentsRule_js, ExtractSoftwareInstrumentsRule_js_len,
+                                 kText);
 }
 
 std::optional<QVCTCompiledResources::Lines> QVCTCompiledResources::LegacyLoopTaxonomyMapping() {

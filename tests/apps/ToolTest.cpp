@@ -49,7 +49,8 @@ TEST(Autotag, WritesOneStableRecordAnItem) {
         {"label":"Bright / Dark","parent":null,"category":"Sound Descriptors","level":1.0,"auto":true,"weightLevel":10},
         {"label":"Drums","parent":null,"category":"Source","level":null,"auto":true,"weightLevel":10},
         {"label":"Kick","parent":"Drums","category":"Source","level":null,"auto":true,"weightLevel":10}])");
-    const ToolResult lines = runTool({"--jsonl", "autotag", "--services", "keywords", path, path});
+    const ToolResult lines =
+        runTool({"--jsonl", "autotag", "--services", "keywords", path, folder.write("b.wav", "")});
     EXPECT_EQ(std::count(lines.output.begin(), lines.output.end(), '\n'), 2);
     const json first = json::parse(lines.output.substr(0, lines.output.find('\n')));
     EXPECT_EQ(first["path"], path);

@@ -65,20 +65,23 @@ TEST(ContentType, IsWhatRecordChunksAndNameSayInThisOrder) {
     QVCTContentTypeTaggingService service;
     for (const auto& c : cases) {
         const URL url = URL::fileURLWithPath(c.path);
-        EXPECT_EQ(labels(service.tagsWithContentsOfURL(url, c.xml, c.record, c.file, 0x8)), c.expected) << c.path;
-        EXPECT_THAT(service.tagsWithContentsOfURL(url, c.xml, c.record, c.file, ~std::uint64_t{0x8}), IsEmpty());
+        EXPECT_EQ(labels(service.tagsWithContentsOfURL(url, c.xml, c.record, c.file, 0x8)), c.expected)
+            << c.path;
+        EXPECT_THAT(service.tagsWithContentsOfURL(url, c.xml, c.record, c.file, ~std::uint64_t{0x8}),
+                    IsEmpty());
     }
 }
 
 TEST(UserGenerated, IsWhatLiesInNoPack) {
     QVCTUserGeneratedTaggingService service;
     const auto tags = [&service](const char* path, const std::shared_ptr<TGRTMetaData>& metaData) {
-        return labels(service.tagsWithContentsOfURL(URL::fileURLWithPath(path), nullptr, metaData, nullptr, 0x100));
+        return labels(
+            service.tagsWithContentsOfURL(URL::fileURLWithPath(path), nullptr, metaData, nullptr, 0x100));
     };
     const auto inPack = record(2, 0);
     const auto taxonomy = TGRTTaxonomy::testingTaxonomy();
-    inPack->setTaggings({TGRTTagging::initWithTag(
-        taxonomy->findOrCreateTagWithLabel("9999_own", "Soundpack"), nullptr)});
+    inPack->setTaggings(
+        {TGRTTagging::initWithTag(taxonomy->findOrCreateTagWithLabel("9999_own", "Soundpack"), nullptr)});
     EXPECT_THAT(tags("/Me/Kick.wav", nullptr), ElementsAre("User generated"));
     EXPECT_THAT(tags("/Me/Kick.wav", record(7, 0)), ElementsAre("User generated"));
     EXPECT_THAT(tags("/Me/Kick.wav", inPack), IsEmpty());

@@ -6,6 +6,7 @@
 #include <chrono>
 #include <csignal>
 #include <filesystem>
+#include <fstream>
 #include <set>
 #include <thread>
 
@@ -43,6 +44,7 @@ class NameDescriber : public ItemDescriber {
             std::this_thread::sleep_for(std::chrono::milliseconds(5));
         item.fileType = kFileTypeAudioFile;
         if (!isDirectory(path)) item.payloadHash = readAll(path);
+        if (item.payloadHash == "before") std::ofstream(path) << "after!";
         item.taggings = {{"Drums", "Source", {}, {}, Provenance::automatic, "names"}};
         return item;
     }
@@ -105,11 +107,14 @@ TEST_F(Indexing, ReadsWhatHasChangedOnly) {
     EXPECT_EQ(index().described, 0U);
 }
 
-TEST_F(Indexing, ReadsAgainWhatMayHaveChangedWithinATick) {
-    write("Kick.wav", "1");
+TEST_F(Indexing, ReadsAgainWhatChangedWhileItWasRead) {
+    write("Kick rewritten.wav", "before");
+    settle();
     index();
     settle();
     EXPECT_EQ(index().described, 1U);
+    const auto item = ContentDatabase::open(database())->item(library() + "/Kick rewritten.wav");
+    EXPECT_EQ(item->item.payloadHash, "after!");
     EXPECT_EQ(index().described, 0U);
 }
 
@@ -279,7 +284,7 @@ TEST_F(Indexing, KeepsWhatItHasWhenTheDiskIsFull) {
     for (int i = 0; i < 300; ++i) write(fmt::format("Kick {}.wav", i), std::to_string(i));
     settle();
     index();
-    for (int i = 0; i < 9000; ++i) write(fmt::format("more/{}/Snare {}.wav", i % 9, i), std::to_string(i));
+    for (int i = 0; i < 3000; ++i) write(fmt::format("more/{}/Snare {}.wav", i % 9, i), std::to_string(i));
     settle();
     const pid_t child = ::fork();
     if (child == 0) {
@@ -301,7 +306,7 @@ TEST_F(Indexing, KeepsWhatItHasWhenTheDiskIsFull) {
     EXPECT_GE(names().size(), 300U);
     EXPECT_TRUE(ContentDatabase::open(database())->check());
     index();
-    EXPECT_EQ(names().size(), 9300U);
+    EXPECT_EQ(names().size(), 3300U);
 }
 
 TEST_F(Indexing, TakesAnyNameAndCirclesOfLinks) {

@@ -281,8 +281,8 @@ TEST(DataFiles, FindTheirListBetweenOtherBytes) {
                    {"ContentInfo", Dictionary{{"Dependencies", PropertyList::Array{"/a"}}}},
                    {"KeyValueData", Dictionary{{"a", 1}}}},
         PropertyListFormat::binary);
-    const auto record =
-        read(folder.write("a.data", std::string("before\0bplist0", 14) + list + std::string(40, '\0') + "bplist00"));
+    const auto record = read(folder.write(
+        "a.data", std::string("before\0bplist0", 14) + list + std::string(40, '\0') + "bplist00"));
     EXPECT_EQ(record->fileType(), 4);
     EXPECT_EQ(record->displayName(), "Deep");
     EXPECT_EQ(record->contentInfo()->assetDependencyPaths().count("/a"), 1U);
