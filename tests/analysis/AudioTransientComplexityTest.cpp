@@ -56,7 +56,7 @@ TEST(AudioTransientComplexity, RefusesWhatCannotBeMeasured) {
 std::string bigEndian(std::uint32_t value, int bytes) {
     std::string out;
     for (int shift = 8 * (bytes - 1); shift >= 0; shift -= 8)
-        out.push_back(static_cast<char>(value >> shift));
+        out.push_back(static_cast<char>(std::uint64_t{value} >> static_cast<unsigned>(shift)));
     return out;
 }
 
