@@ -180,7 +180,8 @@ void addAutotagCommand(CLI::App& app, ToolContext& context) {
     auto* command = app.add_subcommand("autotag", "Derives tags for files and for everything below folders");
     command->add_option("paths", options->paths, "Files and folders")->required()->type_name("PATH");
     command->add_option("--services", options->services, "Only these services: " + serviceNames())
-        ->delimiter(',');
+        ->delimiter(',')
+        ->allow_extra_args(false);
     command
         ->add_option("--keywords", options->keywordsFile,
                      "Property list of keywords to use instead of the built-in")
