@@ -61,7 +61,9 @@ void touch(const std::string& path, std::string_view bytes) {
     ::close(file);
 }
 
-/// Folders of 200 files each, as packs have them; names by the generator.
+constexpr std::size_t kChanges = 1000;
+
+/// Folders of 200 files each, as packs have them; names by the generator. The paths of those to be changed.
 std::vector<std::string> makeLibrary(const std::string& folder, std::size_t count) {
     constexpr std::size_t filesPerFolder = 200;
     test::ItemGenerator generator(1);
@@ -73,9 +75,10 @@ std::vector<std::string> makeLibrary(const std::string& folder, std::size_t coun
                                   generator.word(), i / filesPerFolder);
             fs::create_directories(current);
         }
-        paths.push_back(fmt::format("{}/{}_{}_{}bpm {:07}.wav", current, generator.word(), generator.word(),
-                                    60 + generator.pick(120), i));
-        touch(paths.back(), {});
+        const std::string path = fmt::format("{}/{}_{}_{}bpm {:07}.wav", current, generator.word(),
+                                             generator.word(), 60 + generator.pick(120), i);
+        touch(path, {});
+        if (i % std::max<std::size_t>(1, count / kChanges) == 0) paths.push_back(path);
     }
     return paths;
 }
@@ -123,14 +126,13 @@ void benchIndex(std::size_t count, const std::string& folder) {
     bench::printRow(fmt::format("  indexed again, {} read", progress.described),
                     fmt::format("{:.3f} s", again), "");
     bench::printRow("  ratio", fmt::format("{:.2f}", again / bare), "at most 1.5");
-    constexpr std::size_t changes = 1000;
-    for (std::size_t i = 0; i < changes; ++i) touch(paths[i * (count / changes)], "changed");
+    for (const std::string& path : paths) touch(path, "changed");
     ::usleep(50000);
     const double changed = seconds([&] { progress = index(library, database); });
-    bench::printRow(
-        fmt::format("  {} changes", progress.described),
-        fmt::format("{:.2f} s more, {:.2f} ms each", changed - again, (changed - again) * 1e3 / changes),
-        "in proportion");
+    bench::printRow(fmt::format("  {} changes", progress.described),
+                    fmt::format("{:.2f} s more, {:.2f} ms each", changed - again,
+                                (changed - again) * 1e3 / static_cast<double>(paths.size())),
+                    "in proportion");
     bench::printRow(
         "  memory of the run; of one worker",
         fmt::format("{:.0f} MB; {:.0f} MB", megabytesAtMost(RUSAGE_SELF), megabytesAtMost(RUSAGE_CHILDREN)),
