@@ -19,7 +19,6 @@ using Clock = std::chrono::steady_clock;
 
 /// Items stored in one transaction, at most; fewer when reading them takes long.
 constexpr std::size_t kBatch = 8192;
-constexpr std::chrono::seconds kLongestBatch{3};
 /// And fewer when they have many terms, so that a batch stays small in memory.
 constexpr std::size_t kMostTermsInBatch = 1'000'000;
 /// A file that changed this shortly before it was looked at may change again within the same tick of the file
@@ -150,7 +149,7 @@ bool IndexRun::collect() {
 
 void IndexRun::flushIfDue() {
     if (batch_.size() >= kBatch || termsInBatch_ >= kMostTermsInBatch ||
-        Clock::now() - lastFlush_ >= kLongestBatch)
+        Clock::now() - lastFlush_ >= options_.longestBatch)
         flush();
 }
 

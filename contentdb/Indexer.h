@@ -37,6 +37,9 @@ struct IndexOptions {
     /// 0: as many as there are processors.
     unsigned workers = 0;
     std::chrono::milliseconds timeLimitPerItem{30000};
+    /// Longest that an item waits, once read, until it is stored: what an interruption may cost. Shorter
+    /// costs speed.
+    std::chrono::milliseconds longestBatch{3000};
 
     /// Called now and then from the calling thread.
     std::function<void(const IndexProgress&)> progress;
