@@ -20,7 +20,7 @@ std::string labelOrNone(const std::shared_ptr<TGRTTag>& tag) {
 std::shared_ptr<TGRTTag> TGRTTag::initWithLabel(std::string_view rawLabel,
                                                 const std::shared_ptr<TGRTTag>& parentTag,
                                                 const std::shared_ptr<TGRTCategory>& category) {
-    const std::shared_ptr<TGRTTag> tag(new TGRTTag);
+    std::shared_ptr<TGRTTag> tag(new TGRTTag);
     tag->label_ = normalizedTagString(rawLabel);
     tag->valueType_ = tagValueType(rawLabel);
     if (tag->valueType_ == kTagValueBipolar || tag->valueType_ == kTagValueStepped) {
