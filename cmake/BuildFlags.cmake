@@ -14,7 +14,10 @@ if(QVCT_SANITIZERS)
 endif()
 
 set(CMAKE_CXX_EXTENSIONS OFF)
+# One set of objects makes the static and the shared libraries.
 set(CMAKE_POSITION_INDEPENDENT_CODE ON)
+set(CMAKE_CXX_VISIBILITY_PRESET hidden)
+set(CMAKE_VISIBILITY_INLINES_HIDDEN ON)
 find_program(CCACHE ccache)
 if(CCACHE)
   set(CMAKE_CXX_COMPILER_LAUNCHER "${CCACHE}")

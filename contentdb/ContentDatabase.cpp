@@ -1,5 +1,7 @@
 #include "contentdb/ContentDatabase.h"
 
+#include "contentdb/Schema.h"
+#include "contentdb/Search.h"
 #include "contentdb/Terms.h"
 #include "platform/Text.h"
 #include "taxonomy/TGRTTaxonomy.h"

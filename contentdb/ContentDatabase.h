@@ -2,9 +2,9 @@
 
 #include "contentdb/Indexer.h"
 #include "contentdb/Query.h"
-#include "contentdb/Schema.h"
-#include "contentdb/Search.h"
+#include "contentdb/SearchResults.h"
 #include "platform/Error.h"
+#include "platform/Export.h"
 
 #include <cstddef>
 #include <cstdint>
@@ -22,7 +22,7 @@ namespace qvct::contentdb {
 /// One thread at a time for each object; several objects and processes may have the same database open, also
 /// while a run writes to it: each operation sees what was stored when it began. A damaged page is found when
 /// it is read and answered by an error, never by a wrong result.
-class ContentDatabase {
+class QVCT_API ContentDatabase {
   public:
     /// Null, and an error, when there is no such database, or it is damaged or of another version.
     static std::unique_ptr<ContentDatabase> open(const std::string& path, Error* error = nullptr);

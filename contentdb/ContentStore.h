@@ -3,6 +3,7 @@
 #include "contentdb/IdSet.h"
 #include "contentdb/IndexedItem.h"
 #include "contentdb/Schema.h"
+#include "contentdb/SearchResults.h"
 #include "contentdb/Sqlite.h"
 
 #include <cstdint>
@@ -15,7 +16,6 @@
 
 namespace qvct::contentdb {
 
-using ItemId = std::int64_t;
 using TermId = std::int64_t;
 
 /// Entry of the index: one term, one chunk of items.

@@ -2,6 +2,7 @@
 
 #include "contentdb/IndexedItem.h"
 #include "platform/Error.h"
+#include "platform/Export.h"
 
 #include <chrono>
 #include <cstdint>
@@ -60,13 +61,13 @@ struct IndexOptions {
 /// Nothing, and an error, when there is no such folder, the database cannot be written, or another run is
 /// going on. What was stored until then stays.
 /// @cost  An unchanged folder: one listing and one look at each file. Memory is bounded whatever the size.
-std::optional<IndexProgress> indexLibrary(const IndexOptions& options, const DescriberFactory& factory,
-                                          Error* error = nullptr);
+QVCT_API std::optional<IndexProgress> indexLibrary(const IndexOptions& options,
+                                                   const DescriberFactory& factory, Error* error = nullptr);
 
 /// Unites the databases into a new one with the content that one run over everything would have made. The
 /// first database that has an item counts.
 /// False, and an error, when one cannot be read or `target` exists already; then no new database is left.
-bool mergeDatabases(const std::vector<std::string>& databases, const std::string& target,
-                    Error* error = nullptr);
+QVCT_API bool mergeDatabases(const std::vector<std::string>& databases, const std::string& target,
+                             Error* error = nullptr);
 
 }  // namespace qvct::contentdb

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "contentdb/IndexedItem.h"
+#include "platform/Export.h"
 #include "platform/RegularExpression.h"
 
 #include <cstddef>
@@ -107,13 +108,14 @@ struct QueryError {
 
 /// Reads a query as docs/query.md describes it. An empty one matches everything.
 /// @cost  O(length), without recursion.
-std::optional<Query> parseQuery(std::string_view text, const Vocabulary& vocabulary, QueryError* error);
+QVCT_API std::optional<Query> parseQuery(std::string_view text, const Vocabulary& vocabulary,
+                                         QueryError* error);
 
 /// Evaluates a query in memory: whether it finds the item. Failed items are never found.
-bool matches(const Query& query, const IndexedItem& item);
+QVCT_API bool matches(const Query& query, const IndexedItem& item);
 
 /// Whether `a` comes before `b` in the query's order; items without the field last. Equal items are not
 /// before each other: whoever sorts keeps them in the order of the database.
-bool comesBefore(const Query& query, const IndexedItem& a, const IndexedItem& b);
+QVCT_API bool comesBefore(const Query& query, const IndexedItem& a, const IndexedItem& b);
 
 }  // namespace qvct::contentdb

@@ -2,6 +2,7 @@
 
 #include "contentdb/ContentStore.h"
 #include "contentdb/Query.h"
+#include "contentdb/SearchResults.h"
 
 #include <cstddef>
 #include <cstdint>
@@ -9,24 +10,6 @@
 #include <vector>
 
 namespace qvct::contentdb {
-
-struct Found {
-    ItemId id = 0;
-    IndexedItem item;
-};
-
-/// How many of the found items have a tag, or one below it.
-struct Facet {
-    std::string label;
-    std::string category;
-    std::int64_t count = 0;
-};
-
-struct Similar {
-    ItemId id = 0;
-    IndexedItem item;
-    double similarity = 0;  ///< in [0, 1]
-};
 
 /// Evaluates a query over the index. Every function throws DatabaseFailure.
 ///

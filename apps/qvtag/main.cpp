@@ -1,6 +1,8 @@
 #include "Commands.h"
+#include "platform/Version.h"
 
 #include <exception>
+#include <string>
 
 #include <CLI/CLI.hpp>
 #include <fmt/format.h>
@@ -28,7 +30,7 @@ void addSharedOptions(CLI::App& app, qvct::tool::ToolContext& context) {
 int run(int argc, char** argv) {
     qvct::tool::ToolContext context;
     CLI::App app("Describes sounds with tags: reads, derives and searches them.", "qvtag");
-    app.set_version_flag("--version", QVCT_VERSION);
+    app.set_version_flag("--version", std::string(qvct::version()));
     app.require_subcommand(1);
     app.fallthrough();
     addSharedOptions(app, context);

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "autotagging/TagDictionary.h"
+#include "platform/Export.h"
 #include "platform/Url.h"
 
 #include <cstdint>
@@ -24,7 +25,7 @@ enum QVCTAutoTaggingOptions : std::uint64_t {
 };
 
 /// One way of deriving tags. Each service answers to one bit of the options.
-class QVCTAutoTaggingService {
+class QVCT_API QVCTAutoTaggingService {
   public:
     virtual ~QVCTAutoTaggingService() = default;
 

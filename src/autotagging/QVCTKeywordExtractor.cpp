@@ -1,6 +1,7 @@
 #include "autotagging/QVCTKeywordExtractor.h"
 
 #include "autotagging/KeywordExpression.h"
+#include "platform/LiteralTrie.h"
 #include "platform/Log.h"
 #include "platform/PropertyListFile.h"
 #include "platform/ResourceBundle.h"
@@ -91,6 +92,8 @@ QVCTKeywordExtractor::QVCTKeywordExtractor(Dictionary mapping, std::shared_ptr<T
     compileTrie();
 }
 
+QVCTKeywordExtractor::~QVCTKeywordExtractor() = default;
+
 void QVCTKeywordExtractor::setupKeywordMapping(const Dictionary& mapping) {
     for (const auto& entry : mapping) {
         for (const std::string& label : labelsOf(entry.value)) addToKeywordsSet(label);
@@ -149,7 +152,7 @@ void QVCTKeywordExtractor::compileTrie() {
     }
     std::vector<std::string> texts;
     for (const Literal& literal : literals_) texts.push_back(literal.text);
-    trie_ = LiteralTrie(texts);
+    trie_ = std::make_unique<LiteralTrie>(texts);
     marks_.assign(keywords_.size(), Mark::unseen);
 }
 
@@ -180,7 +183,7 @@ void QVCTKeywordExtractor::mark(std::uint32_t keyword, Mark mark) {
 void QVCTKeywordExtractor::scanForCandidates(std::string_view text) {
     for (std::size_t start = 0; start < text.size(); ++start) {
         if (!Neighbours(text, start).isBoundary(text, start)) continue;
-        trie_.matchAt(text, start, [&](std::uint32_t index, std::size_t end) {
+        trie_->matchAt(text, start, [&](std::uint32_t index, std::size_t end) {
             const Literal& literal = literals_[index];
             for (const std::uint32_t keyword : literal.expressions) mark(keyword, Mark::candidate);
             if (literal.plain.empty() || !Neighbours(text, end).isBoundary(text, end)) return;
@@ -196,7 +199,7 @@ void QVCTKeywordExtractor::scanForCandidates(std::string_view text) {
 void QVCTKeywordExtractor::scanFolded(std::string_view text) {
     for (std::size_t start = 0; start < text.size(); ++start) {
         if (Neighbours(text, start).areInsideAsciiWordOrGap()) continue;
-        trie_.matchAt(text, start, [&](std::uint32_t index, std::size_t end) {
+        trie_->matchAt(text, start, [&](std::uint32_t index, std::size_t end) {
             const Literal& literal = literals_[index];
             for (const std::uint32_t keyword : literal.expressions) mark(keyword, Mark::candidate);
             if (Neighbours(text, end).areInsideAsciiWordOrGap()) return;

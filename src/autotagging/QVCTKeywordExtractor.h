@@ -1,7 +1,7 @@
 #pragma once
 
 #include "platform/CountedSet.h"
-#include "platform/LiteralTrie.h"
+#include "platform/Export.h"
 #include "platform/PropertyList.h"
 #include "platform/RegularExpression.h"
 #include "platform/Url.h"
@@ -17,6 +17,8 @@
 
 namespace qvct {
 
+class LiteralTrie;
+
 /// Finds tag labels in a text: the words of a keyword mapping and every label of a taxonomy, as whole words.
 ///
 /// A mapping's dictionary leads from a keyword (a word, or "regex:" and an expression) to a label or an array
@@ -28,7 +30,7 @@ namespace qvct {
 /// always run.
 ///
 /// Use one extractor from one thread at a time: it fills its cache of expressions as it goes.
-class QVCTKeywordExtractor {
+class QVCT_API QVCTKeywordExtractor {
   public:
     /// From the resource folder, else compiled in.
     static PropertyList::Dictionary defaultKeywordMapping();
@@ -39,6 +41,7 @@ class QVCTKeywordExtractor {
     /// Without a mapping the default one; without a taxonomy the default one.
     static std::shared_ptr<QVCTKeywordExtractor> initWithKeywordMappingDictionary(
         std::optional<PropertyList::Dictionary> mapping, std::shared_ptr<TGRTTaxonomy> taxonomy = nullptr);
+    ~QVCTKeywordExtractor();
 
     const PropertyList::Dictionary& keywordMappingDictionary() const { return mapping_; }
     /// Every label that the mapping yields and every label of the taxonomy.
@@ -93,7 +96,7 @@ class QVCTKeywordExtractor {
 
     std::vector<Keyword> keywords_;
     std::vector<Literal> literals_;
-    LiteralTrie trie_;
+    std::unique_ptr<LiteralTrie> trie_;
     std::vector<std::uint32_t> alwaysRun_;
     bool hasNonAsciiLiterals_ = false;
     std::vector<Mark> marks_;

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "autotagging/QVSKXMLNode.h"
+#include "platform/Export.h"
 #include "platform/Url.h"
 
 #include <memory>
@@ -14,7 +15,7 @@ namespace qvct {
 class ScriptContext;
 
 /// What scripts may call on the global `document`, and nothing else.
-class QVCTXMLDocumentExport {
+class QVCT_API QVCTXMLDocumentExport {
   public:
     virtual ~QVCTXMLDocumentExport() = default;
 
@@ -35,7 +36,7 @@ class QVCTXMLDocumentExport {
 /// comes out of compressed ones are at most 256 MiB; memory is about six times the text.
 ///
 /// Immutable once made. Queries share state: use a document from one thread at a time.
-class QVCTXMLDocument : public QVCTXMLDocumentExport {
+class QVCT_API QVCTXMLDocument : public QVCTXMLDocumentExport {
   public:
     /// Reads the file; the extension "zxml" (in lower case only) says that it is compressed.
     /// Never null: a file that cannot be read or holds nothing gives a document without content, logged.

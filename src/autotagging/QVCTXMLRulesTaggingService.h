@@ -1,6 +1,7 @@
 #pragma once
 
 #include "autotagging/QVCTAutoTaggingService.h"
+#include "platform/Export.h"
 #include "platform/PropertyList.h"
 
 #include <chrono>
@@ -35,7 +36,7 @@ struct RuleProblem {
 /// Rules without effect are passed over silently; `problems` tells why.
 ///
 /// Immutable: safe from every thread, each with documents of its own.
-class QVCTXMLRulesTaggingService : public QVCTAutoTaggingService {
+class QVCT_API QVCTXMLRulesTaggingService : public QVCTAutoTaggingService {
   public:
     static std::shared_ptr<QVCTXMLRulesTaggingService> init();
     /// Without rules the default ones.

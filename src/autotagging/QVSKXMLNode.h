@@ -1,5 +1,7 @@
 #pragma once
 
+#include "platform/Export.h"
+
 #include <memory>
 #include <string>
 
@@ -8,7 +10,7 @@ struct _xmlNode;
 namespace qvct {
 
 /// One matched node of an XML document, kept as its XML text, so that it outlives the document.
-class QVSKXMLNode {
+class QVCT_API QVSKXMLNode {
   public:
     /// Serializes the node with all below it, without indentation. Empty text when there is nothing to write.
     /// @cost  O(size of the subtree)

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "autotagging/QVCTAutoTaggingService.h"
+#include "platform/Export.h"
 #include "platform/ObjectSet.h"
 #include "platform/PropertyList.h"
 #include "platform/Url.h"
@@ -18,7 +19,7 @@ namespace qvct {
 ///
 /// Nothing is kept between calls but what the services cache. The keyword service works from one thread at a
 /// time, so give each thread an aggregator of its own.
-class QVTaggingAggregator {
+class QVCT_API QVTaggingAggregator {
   public:
     using Services = std::vector<std::shared_ptr<QVCTAutoTaggingService>>;
     using Settings = std::optional<PropertyList::Dictionary>;

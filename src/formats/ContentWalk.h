@@ -1,6 +1,7 @@
 #pragma once
 
 #include "platform/Error.h"
+#include "platform/Export.h"
 #include "platform/Url.h"
 
 #include <functional>
@@ -13,7 +14,7 @@ namespace qvct {
 ///
 /// Data files (".data") do not count: half of the world's programs call files so, and only a search through
 /// all of its bytes tells whether one carries a record. Who names one can read it.
-bool isContentName(const URL& url);
+QVCT_API bool isContentName(const URL& url);
 
 /// Calls `item` for every content item at or below `path`, in the order of names.
 ///
@@ -21,7 +22,7 @@ bool isContentName(const URL& url);
 /// lies inside itself is entered once. A path that names a file itself is an item whatever its name.
 /// What cannot be read is reported to `failed`, and the walk goes on.
 /// @cost  One listing a folder; files are looked at only where the file system does not tell their kind.
-void walkContent(const std::string& path, const std::function<void(const URL& item)>& item,
-                 const std::function<void(const Error& error)>& failed);
+QVCT_API void walkContent(const std::string& path, const std::function<void(const URL& item)>& item,
+                          const std::function<void(const Error& error)>& failed);
 
 }  // namespace qvct

@@ -3,6 +3,7 @@
 #include "metadata/TGRTContentInfo.h"
 #include "metadata/TGRTMetaData.h"
 #include "platform/Error.h"
+#include "platform/Export.h"
 #include "platform/ObjectSet.h"
 #include "platform/Url.h"
 #include "taxonomy/TGRTTagging.h"
@@ -23,7 +24,7 @@ struct ContentWriteOptions {
 // the error with path and reason. Files are replaced whole (see `replaceFileByPieces`), so that on failure
 // the old one stands untouched. What cannot be read is never written over. Writers have no state.
 
-class TGRTTaggingsWriter {
+class QVCT_API TGRTTaggingsWriter {
   public:
     virtual ~TGRTTaggingsWriter() = default;
     /// Replaces the stored taggings. The stored UUID is removed: the content is to be identified anew.
@@ -31,7 +32,7 @@ class TGRTTaggingsWriter {
                                const ContentWriteOptions& options = {}) const = 0;
 };
 
-class TGRTContentInfoWriter {
+class QVCT_API TGRTContentInfoWriter {
   public:
     virtual ~TGRTContentInfoWriter() = default;
     /// Replaces the stored content info; null counts as an empty one.
@@ -39,7 +40,7 @@ class TGRTContentInfoWriter {
                                   Error* error = nullptr, const ContentWriteOptions& options = {}) const = 0;
 };
 
-class TGRTMetaDataWriter {
+class QVCT_API TGRTMetaDataWriter {
   public:
     virtual ~TGRTMetaDataWriter() = default;
     /// Stores the record. Bundles, settings and presets give a record without file type that of their kind.

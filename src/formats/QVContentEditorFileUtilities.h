@@ -1,5 +1,6 @@
 #pragma once
 
+#include "platform/Export.h"
 #include "platform/Url.h"
 
 #include <optional>
@@ -7,7 +8,7 @@
 namespace qvct {
 
 /// Where an item's companions lie. Only what exists is answered.
-class QVContentEditorFileUtilities {
+class QVCT_API QVContentEditorFileUtilities {
   public:
     /// The XML description of an item. A URL with the extension "xml" or "zxml" is its own, whether it exists
     /// or not; for others the first of: inside the item the intermediate cache of ours (compressed, then

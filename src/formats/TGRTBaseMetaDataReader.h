@@ -1,6 +1,7 @@
 #pragma once
 
 #include "formats/TGRTMetaDataReader.h"
+#include "platform/Export.h"
 #include "taxonomy/TGRTTaxonomy.h"
 
 #include <memory>
@@ -14,7 +15,7 @@ namespace qvct {
 ///
 /// Readers are immutable: several threads may use one, as far as its taxonomy allows. A writable taxonomy
 /// grows by the labels that a file holds and it does not know.
-class TGRTBaseMetaDataReader : public TGRTMetaDataReader, public TGRTTaggingsReader {
+class QVCT_API TGRTBaseMetaDataReader : public TGRTMetaDataReader, public TGRTTaggingsReader {
   public:
     /// REQUIRES: the taxonomy is not null.
     static std::shared_ptr<TGRTBaseMetaDataReader> initWithTaxonomy(std::shared_ptr<TGRTTaxonomy> taxonomy) {

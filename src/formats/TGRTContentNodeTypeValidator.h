@@ -2,6 +2,7 @@
 
 #include "formats/ContentWriters.h"
 #include "formats/TGRTMetaDataReader.h"
+#include "platform/Export.h"
 #include "platform/Url.h"
 
 #include <memory>
@@ -19,7 +20,7 @@ enum ItemActions : unsigned {
 
 /// Decides whether a URL is content of its kind, and hands out the reader and the writers for it: null for
 /// what is not.
-class TGRTContentNodeTypeValidator {
+class QVCT_API TGRTContentNodeTypeValidator {
   public:
     virtual ~TGRTContentNodeTypeValidator() = default;
 

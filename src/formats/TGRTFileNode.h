@@ -3,6 +3,7 @@
 #include "formats/TGRTContentNodeTypeValidator.h"
 #include "metadata/TGRTMetaData.h"
 #include "platform/Error.h"
+#include "platform/Export.h"
 #include "platform/Object.h"
 #include "platform/Url.h"
 #include "taxonomy/TGRTTaggingCollection.h"
@@ -17,7 +18,7 @@ namespace qvct {
 /// One file or bundle, seen as content: its validator, and through it its reader and writers.
 ///
 /// Nodes with equal URLs are equal. Immutable; what it answers follows the disk, nothing is remembered.
-class TGRTFileNode : public Object, public FileURLNode {
+class QVCT_API TGRTFileNode : public Object, public FileURLNode {
   public:
     static std::shared_ptr<TGRTFileNode> nodeWithFileURL(const URL& url);
 

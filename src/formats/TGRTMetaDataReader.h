@@ -3,6 +3,7 @@
 #include "metadata/TGRTKeyValue.h"
 #include "metadata/TGRTMetaData.h"
 #include "platform/Error.h"
+#include "platform/Export.h"
 #include "platform/ObjectSet.h"
 #include "platform/TaggingTypes.h"
 #include "platform/Url.h"
@@ -22,7 +23,7 @@ enum MetaDataReaderOptions : std::uint64_t {
 };
 
 /// Turns one kind of content file into a record.
-class TGRTMetaDataReader {
+class QVCT_API TGRTMetaDataReader {
   public:
     virtual ~TGRTMetaDataReader() = default;
 
@@ -41,7 +42,7 @@ class TGRTMetaDataReader {
 };
 
 /// Reads the taggings alone; none from what cannot be read.
-class TGRTTaggingsReader {
+class QVCT_API TGRTTaggingsReader {
   public:
     virtual ~TGRTTaggingsReader() = default;
     virtual ObjectSet<TGRTTagging> taggingsForFileURL(const URL& url) const = 0;

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "formats/TGRTBaseMetaDataReader.h"
+#include "platform/Export.h"
 #include "platform/Url.h"
 #include "taxonomy/TGRTTaxonomy.h"
 
@@ -9,7 +10,7 @@
 namespace qvct {
 
 /// Picks the reader for a URL by its extension alone, whatever its case. The file is not opened.
-class TGRTMetaDataReaderFactory {
+class QVCT_API TGRTMetaDataReaderFactory {
   public:
     /// Null for an extension of no content. REQUIRES: the taxonomy is not null.
     static std::shared_ptr<TGRTBaseMetaDataReader> metaDataReaderForURL(

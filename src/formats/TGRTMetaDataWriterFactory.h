@@ -1,6 +1,7 @@
 #pragma once
 
 #include "formats/ContentWriters.h"
+#include "platform/Export.h"
 #include "platform/Url.h"
 
 #include <memory>
@@ -8,7 +9,7 @@
 namespace qvct {
 
 /// Picks the writer for a URL as its file node does; null where there is none.
-class TGRTMetaDataWriterFactory {
+class QVCT_API TGRTMetaDataWriterFactory {
   public:
     static std::shared_ptr<TGRTTaggingsWriter> taggingWriterForURL(const URL& url);
     static std::shared_ptr<TGRTContentInfoWriter> contentInfoWriterForURL(const URL& url);

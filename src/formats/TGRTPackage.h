@@ -1,6 +1,7 @@
 #pragma once
 
 #include "metadata/TGRTMetaData.h"
+#include "platform/Export.h"
 #include "platform/Object.h"
 #include "platform/Url.h"
 
@@ -14,7 +15,7 @@ namespace qvct {
 /// A content pack: what it is called, and the items that are tagged with it.
 ///
 /// Packs with one identifier are equal.
-class TGRTPackage : public Object {
+class QVCT_API TGRTPackage : public Object {
   public:
     /// Identifier and display name of the packs that are known.
     using Names = std::vector<std::pair<std::string, std::string>>;

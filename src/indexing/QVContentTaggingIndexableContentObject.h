@@ -2,6 +2,7 @@
 
 #include "metadata/TGRTDependencyItem.h"
 #include "metadata/TGRTKeyValue.h"
+#include "platform/Export.h"
 #include "platform/ObjectSet.h"
 #include "taxonomy/TGRTTagging.h"
 
@@ -17,7 +18,7 @@ namespace qvct {
 /// QVContentTaggingIndexableTaggingData, QVContentTaggingIndexableValueData and
 /// QVContentTaggingDependencyItem. Those hold texts and numbers of their own and stay valid whatever becomes
 /// of the taxonomy; what else the elements are leads into it.
-class QVContentTaggingIndexableContentObject {
+class QVCT_API QVContentTaggingIndexableContentObject {
   public:
     virtual ~QVContentTaggingIndexableContentObject() = default;
     virtual const std::string& displayName() const = 0;

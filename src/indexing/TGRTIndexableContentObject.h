@@ -3,6 +3,7 @@
 #include "indexing/QVContentTaggingIndexableContentObject.h"
 #include "metadata/TGRTMetaData.h"
 #include "platform/Error.h"
+#include "platform/Export.h"
 #include "platform/Object.h"
 #include "platform/TaggingTypes.h"
 #include "platform/Url.h"
@@ -27,7 +28,7 @@ enum IndexingOptions : std::uint64_t {
 ///
 /// It is built from one item alone and not changed afterwards. The class operations have no state: they are
 /// as safe from several threads as readers and taxonomy are, so with kIndexInMutableTaxonomy one at a time.
-class TGRTIndexableContentObject : public Object, public QVContentTaggingIndexableContentObject {
+class QVCT_API TGRTIndexableContentObject : public Object, public QVContentTaggingIndexableContentObject {
   public:
     using Taggings = ObjectSet<TGRTTagging>;
     using CategoryTaggings = std::map<std::string, Taggings, std::less<>>;

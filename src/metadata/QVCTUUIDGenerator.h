@@ -1,12 +1,14 @@
 #pragma once
 
+#include "platform/Export.h"
+
 #include <string>
 #include <string_view>
 
 namespace qvct {
 
 /// Identifiers that anybody makes anew from what they identify, so that none has to be stored.
-class QVCTUUIDGenerator {
+class QVCT_API QVCTUUIDGenerator {
   public:
     /// What our identifiers are made under; with it and the path everyone gets the same ones.
     static constexpr std::string_view kPathNamespace = "42e60a19-8562-4e31-9514-3ae3912dfa41";

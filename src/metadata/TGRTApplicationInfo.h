@@ -1,5 +1,6 @@
 #pragma once
 
+#include "platform/Export.h"
 #include "platform/Object.h"
 #include "platform/PropertyList.h"
 
@@ -12,7 +13,7 @@ namespace qvct {
 /// An application that can open a piece of content, from some version on.
 ///
 /// Equality and hash are those of the three fields as they stand: do not change one that is in a set.
-class TGRTApplicationInfo : public Object {
+class QVCT_API TGRTApplicationInfo : public Object {
   public:
     static std::shared_ptr<TGRTApplicationInfo> init();
     /// Fields that are absent, or not of their type, stay unset.

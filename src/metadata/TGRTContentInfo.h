@@ -2,6 +2,7 @@
 
 #include "metadata/TGRTApplicationInfo.h"
 #include "metadata/TGRTDependencyItem.h"
+#include "platform/Export.h"
 #include "platform/Object.h"
 #include "platform/ObjectSet.h"
 #include "platform/PropertyList.h"
@@ -14,7 +15,7 @@
 namespace qvct {
 
 /// What a piece of content needs: the files it depends on and the applications that can open it.
-class TGRTContentInfo : public Object {
+class QVCT_API TGRTContentInfo : public Object {
   public:
     /// An empty one.
     static std::shared_ptr<TGRTContentInfo> init();

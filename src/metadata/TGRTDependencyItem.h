@@ -1,5 +1,6 @@
 #pragma once
 
+#include "platform/Export.h"
 #include "platform/Object.h"
 
 #include <memory>
@@ -8,7 +9,7 @@
 namespace qvct {
 
 /// What a host's database stores of a dependency.
-class QVContentTaggingDependencyItem {
+class QVCT_API QVContentTaggingDependencyItem {
   public:
     virtual ~QVContentTaggingDependencyItem() = default;
     virtual std::string UUID() const = 0;
@@ -19,7 +20,7 @@ class QVContentTaggingDependencyItem {
 /// A file that content depends on, such as a sample: its path and the identifier that follows from it.
 ///
 /// Two items are equal when their identifiers are; an item without path equals nothing, not even itself.
-class TGRTDependencyItem : public Object, public QVContentTaggingDependencyItem {
+class QVCT_API TGRTDependencyItem : public Object, public QVContentTaggingDependencyItem {
   public:
     static std::shared_ptr<TGRTDependencyItem> dependencyItemWithPath(std::string path);
 

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "platform/Export.h"
 #include "platform/Object.h"
 #include "platform/ObjectSet.h"
 #include "platform/PropertyList.h"
@@ -11,7 +12,7 @@
 namespace qvct {
 
 /// What a host's database stores of a key value.
-class QVContentTaggingIndexableValueData {
+class QVCT_API QVContentTaggingIndexableValueData {
   public:
     virtual ~QVContentTaggingIndexableValueData() = default;
     virtual std::string key() const = 0;
@@ -23,7 +24,7 @@ class QVContentTaggingIndexableValueData {
 ///
 /// Equality and hash are those of key and value at creation. Numbers of one value are equal whatever their
 /// type; a string and a number that print alike are not.
-class TGRTKeyValue : public Object, public QVContentTaggingIndexableValueData {
+class QVCT_API TGRTKeyValue : public Object, public QVContentTaggingIndexableValueData {
   public:
     /// `initWithKey:numberValue:`; booleans are numbers too. Null when the value is no number.
     static std::shared_ptr<TGRTKeyValue> initWithKeyNumberValue(std::string key, PropertyList numberValue);

@@ -3,6 +3,7 @@
 #include "metadata/TGRTContentInfo.h"
 #include "metadata/TGRTKeyValue.h"
 #include "platform/Error.h"
+#include "platform/Export.h"
 #include "platform/Object.h"
 #include "platform/ObjectSet.h"
 #include "platform/PropertyList.h"
@@ -23,7 +24,7 @@ class TGRTTaxonomy;
 ///
 /// It owns its content info; key values and taggings are shared with whoever made them. Use one record from
 /// one thread at a time.
-class TGRTMetaData : public Object {
+class QVCT_API TGRTMetaData : public Object {
   public:
     static std::shared_ptr<TGRTMetaData> init();
 

@@ -1,5 +1,7 @@
 #pragma once
 
+#include "platform/Export.h"
+
 #include <string>
 #include <string_view>
 
@@ -31,6 +33,6 @@ enum ErrorCode : int {
 
 /// Fills `error`, if asked for, with a framework error. Always false, so that a failing operation can
 /// `return fail(error, ...)`.
-bool fail(Error* error, ErrorCode code, std::string message);
+QVCT_API bool fail(Error* error, ErrorCode code, std::string message);
 
 }  // namespace qvct

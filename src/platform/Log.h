@@ -1,5 +1,7 @@
 #pragma once
 
+#include "platform/Export.h"
+
 #include <functional>
 #include <string_view>
 
@@ -11,10 +13,10 @@ using LogHandler = std::function<void(std::string_view message)>;
 /// Writes one line to the log. Line breaks and control characters inside the message are escaped.
 ///
 /// Messages go to the handler if one is set, else to standard error. Safe from every thread.
-void log(std::string_view message);
+QVCT_API void log(std::string_view message);
 
 /// Sends all further messages to `handler`; an empty one brings standard error back.
 /// Answers the handler that was set before, so that it can be restored.
-LogHandler setLogHandler(LogHandler handler);
+QVCT_API LogHandler setLogHandler(LogHandler handler);
 
 }  // namespace qvct

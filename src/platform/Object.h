@@ -1,5 +1,7 @@
 #pragma once
 
+#include "platform/Export.h"
+
 #include <cstddef>
 #include <string>
 #include <string_view>
@@ -9,7 +11,7 @@ namespace qvct {
 /// Base of every model object: equality, hash and a description for people.
 ///
 /// By default an object equals only itself.
-class Object {
+class QVCT_API Object {
   public:
     Object() = default;
     Object(const Object&) = delete;

@@ -1,5 +1,7 @@
 #pragma once
 
+#include "platform/Export.h"
+
 #include <cstdint>
 #include <optional>
 #include <string>
@@ -15,7 +17,7 @@ namespace qvct {
 /// Values are deep: a copy shares nothing with its source. Dictionaries keep the order of the file, then of
 /// insertion. Equality is by value: dictionaries compare without regard to order, numbers by their numeric
 /// value whatever their type (0 equals 0.0), booleans only equal booleans.
-class PropertyList {
+class QVCT_API PropertyList {
   public:
     struct Entry;
     using Array = std::vector<PropertyList>;

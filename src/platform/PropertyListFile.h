@@ -1,6 +1,7 @@
 #pragma once
 
 #include "platform/Error.h"
+#include "platform/Export.h"
 #include "platform/PropertyList.h"
 
 #include <cstdint>
@@ -24,19 +25,21 @@ enum class PropertyListFormat { xml, binary };
 /// The value that the bytes hold in either encoding, or nothing and an error with the byte offset where
 /// known.
 /// @cost  O(size); memory at most proportional to the size.
-std::optional<PropertyList> parsePropertyList(std::span<const std::uint8_t> bytes, Error* error = nullptr);
-std::optional<PropertyList> parsePropertyList(std::string_view bytes, Error* error = nullptr);
+QVCT_API std::optional<PropertyList> parsePropertyList(std::span<const std::uint8_t> bytes,
+                                                       Error* error = nullptr);
+QVCT_API std::optional<PropertyList> parsePropertyList(std::string_view bytes, Error* error = nullptr);
 
 /// XML with header, document type and tabs, or binary format 1.0. Empty on failure, which only values that
 /// no property list can hold bring about (a text with a NUL character).
-std::string serializePropertyList(const PropertyList& value, PropertyListFormat format);
+QVCT_API std::string serializePropertyList(const PropertyList& value, PropertyListFormat format);
 
 /// The value in a file; errors name the path.
-std::optional<PropertyList> readPropertyListFile(const std::string& path, Error* error = nullptr);
+QVCT_API std::optional<PropertyList> readPropertyListFile(const std::string& path, Error* error = nullptr);
 /// The dictionary in a file; any other value is an error.
-std::optional<PropertyList::Dictionary> readDictionaryFile(const std::string& path, Error* error = nullptr);
+QVCT_API std::optional<PropertyList::Dictionary> readDictionaryFile(const std::string& path,
+                                                                    Error* error = nullptr);
 /// Writes as `replaceFile` does: the file holds the old or the new value at any instant.
-bool writePropertyListFile(const PropertyList& value, const std::string& path, PropertyListFormat format,
-                           Error* error = nullptr);
+QVCT_API bool writePropertyListFile(const PropertyList& value, const std::string& path,
+                                    PropertyListFormat format, Error* error = nullptr);
 
 }  // namespace qvct

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "platform/Error.h"
+#include "platform/Export.h"
 
 #include <memory>
 #include <optional>
@@ -14,7 +15,7 @@ namespace qvct {
 ///
 /// Searching changes the expression's own state: use one from one thread at a time. A search that backtracks
 /// without end is given up after about a second and counts as no match.
-class RegularExpression {
+class QVCT_API RegularExpression {
   public:
     enum class Case { sensitive, insensitive };
     /// A match: UTF-16 offsets of the whole (first) and of each capture group.

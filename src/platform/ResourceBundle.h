@@ -1,5 +1,7 @@
 #pragma once
 
+#include "platform/Export.h"
+
 #include <optional>
 #include <string>
 #include <string_view>
@@ -11,7 +13,7 @@ namespace qvct {
 /// Looked into, in this order: the folder set here, the folder that the environment variable QVCT_RESOURCES
 /// names, the resource folder of the installation. Setting is for start-up, before the first look-up of
 /// another thread.
-class ResourceBundle {
+class QVCT_API ResourceBundle {
   public:
     /// An empty path sets nothing again.
     static void setDirectory(std::string path);

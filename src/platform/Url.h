@@ -1,5 +1,7 @@
 #pragma once
 
+#include "platform/Export.h"
+
 #include <string>
 #include <string_view>
 
@@ -8,7 +10,7 @@ namespace qvct {
 /// Where a content item lies: almost always a file URL.
 ///
 /// A file URL is kept as its path, byte for byte, since file names need not be UTF-8.
-class URL {
+class QVCT_API URL {
   public:
     /// The URL of a path. A relative path is taken from the current directory; "." and ".." and doubled
     /// slashes are resolved in the text, without looking at the disk. A trailing slash is dropped.

@@ -1,12 +1,14 @@
 #pragma once
 
+#include "platform/Export.h"
+
 #include <string_view>
 
 namespace qvct {
 
 /// Boolean settings of the host, by name. A name that was never set is taken from the environment variable
 /// QVCT_DEFAULT_<name> ("1", "yes", "true"), else false. Safe from every thread.
-class UserDefaults {
+class QVCT_API UserDefaults {
   public:
     static bool boolForKey(std::string_view key);
     static void setBool(bool value, std::string_view key);

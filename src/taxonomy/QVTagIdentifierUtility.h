@@ -1,12 +1,14 @@
 #pragma once
 
+#include "platform/Export.h"
+
 #include <string>
 #include <string_view>
 
 namespace qvct {
 
 /// Keys that hosts and the framework derive from tag labels alike.
-class QVTagIdentifierUtility {
+class QVCT_API QVTagIdentifierUtility {
   public:
     /// The key under which a pole of a bipolar label ("Bright / Dark") is translated.
     static std::string localizationKeyForJingJangTagLabel(std::string_view label, bool lowerValue);

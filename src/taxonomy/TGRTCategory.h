@@ -1,5 +1,6 @@
 #pragma once
 
+#include "platform/Export.h"
 #include "platform/Object.h"
 #include "platform/ObjectSet.h"
 #include "platform/PropertyList.h"
@@ -17,7 +18,7 @@ namespace qvct {
 class TGRTTag;
 
 /// What a host sees of a category.
-class QVContentTaggingCategory {
+class QVCT_API QVContentTaggingCategory {
   public:
     virtual ~QVContentTaggingCategory() = default;
     virtual const std::string& identifier() const = 0;
@@ -30,9 +31,9 @@ class QVContentTaggingCategory {
 ///
 /// Tags join it as they are created. It keeps an index of their labels, so that a search does not walk the
 /// tree.
-class TGRTCategory : public Object,
-                     public QVContentTaggingCategory,
-                     public std::enable_shared_from_this<TGRTCategory> {
+class QVCT_API TGRTCategory : public Object,
+                              public QVContentTaggingCategory,
+                              public std::enable_shared_from_this<TGRTCategory> {
   public:
     static std::shared_ptr<TGRTCategory> initWithIdentifier(std::string identifier);
 

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "platform/Export.h"
 #include "platform/ObjectSet.h"
 #include "platform/Url.h"
 #include "taxonomy/TGRTTagging.h"
@@ -19,7 +20,7 @@ namespace qvct {
 ///
 /// Immutable once made, and safe from every thread. It keeps the default taxonomy that its taggings belong
 /// to.
-class TGRTLegacyTaxonomyMapping {
+class QVCT_API TGRTLegacyTaxonomyMapping {
   public:
     using Lines = std::vector<std::string>;
 

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "platform/Export.h"
 #include "platform/Object.h"
 
 #include <memory>
@@ -8,7 +9,7 @@
 namespace qvct {
 
 /// The weight with which a tag applies to content.
-class TGRTLevel : public Object {
+class QVCT_API TGRTLevel : public Object {
   public:
     /// A level of that weight, clamped to [0, 1]. Its identity is that of the weight as given: levels made
     /// from 1.5 and from 1.0 weigh the same but are not equal. A weight that is not a number counts as 0.

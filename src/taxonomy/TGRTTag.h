@@ -1,5 +1,6 @@
 #pragma once
 
+#include "platform/Export.h"
 #include "platform/Object.h"
 #include "platform/ObjectSet.h"
 #include "platform/PropertyList.h"
@@ -18,7 +19,7 @@ class TGRTCategory;
 class TGRTTag;
 
 /// What a host sees of a tag.
-class QVContentTaggingTag {
+class QVCT_API QVContentTaggingTag {
   public:
     virtual ~QVContentTaggingTag() = default;
     virtual const std::string& label() const = 0;
@@ -35,7 +36,9 @@ class QVContentTaggingTag {
 ///
 /// A tag is owned by its category and its parent; its own links upward are weak, so the taxonomy must be kept
 /// while its tags are used. Equality and hash are those of (label, parent's label, category) at creation.
-class TGRTTag : public Object, public QVContentTaggingTag, public std::enable_shared_from_this<TGRTTag> {
+class QVCT_API TGRTTag : public Object,
+                         public QVContentTaggingTag,
+                         public std::enable_shared_from_this<TGRTTag> {
   public:
     /// A tag of a raw label, whose markers become its value type and steps. It joins the parent's children
     /// and the category. Parent and category may be null.

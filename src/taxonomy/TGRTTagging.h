@@ -1,5 +1,6 @@
 #pragma once
 
+#include "platform/Export.h"
 #include "platform/Object.h"
 #include "platform/ObjectSet.h"
 #include "platform/PropertyList.h"
@@ -17,7 +18,7 @@ class DecimalFormatter;
 class TGRTTaxonomy;
 
 /// What a host's database stores of a tagging.
-class QVContentTaggingIndexableTaggingData {
+class QVCT_API QVContentTaggingIndexableTaggingData {
   public:
     virtual ~QVContentTaggingIndexableTaggingData() = default;
     virtual const std::string& label() const = 0;
@@ -33,7 +34,7 @@ class QVContentTaggingIndexableTaggingData {
 ///
 /// Label, parent label and category are those of the tag at creation. Equality is that of label, level and
 /// category; whether a tagging service made it does not take part.
-class TGRTTagging : public Object, public QVContentTaggingIndexableTaggingData {
+class QVCT_API TGRTTagging : public Object, public QVContentTaggingIndexableTaggingData {
   public:
     /// Null for a null tag or one without label. The level may be null.
     static std::shared_ptr<TGRTTagging> initWithTag(std::shared_ptr<TGRTTag> tag,

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "platform/Export.h"
 #include "platform/ObjectSet.h"
 #include "platform/Url.h"
 #include "taxonomy/TGRTTagging.h"
@@ -14,7 +15,7 @@
 namespace qvct {
 
 /// What a collection of taggings needs to know of a file node.
-class FileURLNode {
+class QVCT_API FileURLNode {
   public:
     virtual ~FileURLNode() = default;
     virtual URL fileURL() const = 0;
@@ -26,7 +27,7 @@ enum TaggingState : std::int64_t { kTaggingStateNone = 0, kTaggingStateAll = 1, 
 /// The taggings of several file nodes at once, such as of an editor's selection.
 ///
 /// Nodes are told apart by their URL. Null nodes are ignored.
-class TGRTTaggingCollection {
+class QVCT_API TGRTTaggingCollection {
   public:
     using Node = std::shared_ptr<FileURLNode>;
     using Taggings = ObjectSet<TGRTTagging>;

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "platform/Error.h"
+#include "platform/Export.h"
 #include "platform/Object.h"
 #include "platform/ObjectSet.h"
 #include "platform/PropertyList.h"
@@ -29,7 +30,7 @@ enum TaxonomyType : std::int64_t {
 };
 
 /// What a host sees of a taxonomy.
-class QVContentTaggingTaxonomy {
+class QVCT_API QVContentTaggingTaxonomy {
   public:
     using Localization = std::map<std::string, std::string>;
 
@@ -49,7 +50,7 @@ class QVContentTaggingTaxonomy {
 ///
 /// Labels are compared as they are, case included, and without markers ("Bright / Dark", not "Bright /
 /// Dark-+").
-class TGRTTaxonomy : public Object, public QVContentTaggingTaxonomy {
+class QVCT_API TGRTTaxonomy : public Object, public QVContentTaggingTaxonomy {
   public:
     using TagPointer = std::shared_ptr<TGRTTag>;
     using CategoryPointer = std::shared_ptr<TGRTCategory>;

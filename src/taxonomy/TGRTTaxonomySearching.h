@@ -1,5 +1,6 @@
 #pragma once
 
+#include "platform/Export.h"
 #include "taxonomy/TGRTTaxonomy.h"
 
 #include <memory>
@@ -11,7 +12,7 @@
 namespace qvct {
 
 /// Finds tags by what a user types, for suggestions.
-class TGRTTaxonomySearching {
+class QVCT_API TGRTTaxonomySearching {
   public:
     /// The table is made once; after adding tags to the taxonomy, make it anew with `_updateSearchTable`.
     static std::shared_ptr<TGRTTaxonomySearching> initWithTaxonomy(std::shared_ptr<TGRTTaxonomy> taxonomy);

@@ -1,5 +1,7 @@
 #pragma once
 
+#include "platform/Export.h"
+
 #include <cstdint>
 #include <optional>
 #include <string>
@@ -21,16 +23,16 @@ enum TagValueType : std::int64_t {
 };
 
 /// The label for people: without markers, prefix and step names. Blanks stay.
-std::string normalizedTagString(std::string_view raw);
-TagValueType tagValueType(std::string_view raw);
+QVCT_API std::string normalizedTagString(std::string_view raw);
+QVCT_API TagValueType tagValueType(std::string_view raw);
 /// The number behind "$", else how many steps are named.
-std::int64_t numberOfTagValueSteps(std::string_view raw);
+QVCT_API std::int64_t numberOfTagValueSteps(std::string_view raw);
 /// The named steps, blanks kept, or the two poles of a bipolar label; nothing when there are none.
-std::optional<std::vector<std::string>> tagStepLabels(std::string_view raw);
+QVCT_API std::optional<std::vector<std::string>> tagStepLabels(std::string_view raw);
 
 /// Splits what people write, "Warm (0.75)", into the label and, through `level`, the weight in parentheses
 /// (nothing when there is none).
-std::string labelFromString(std::string_view text, std::optional<double>* level = nullptr);
+QVCT_API std::string labelFromString(std::string_view text, std::optional<double>* level = nullptr);
 
 /// The identifier of content that is named by a text: the text itself.
 inline std::string contentUUID(std::string_view text) {

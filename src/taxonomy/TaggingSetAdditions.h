@@ -1,5 +1,6 @@
 #pragma once
 
+#include "platform/Export.h"
 #include "platform/ObjectSet.h"
 #include "taxonomy/TGRTTagging.h"
 
@@ -11,17 +12,18 @@ namespace qvct {
 /// Finding and replacing taggings of a set by their label.
 
 /// The first tagging with that label, or null.
-std::shared_ptr<TGRTTagging> anyTaggingForLabel(const ObjectSet<TGRTTagging>& taggings,
-                                                std::string_view label);
-bool containsTagWithLabel(const ObjectSet<TGRTTagging>& taggings, std::string_view label);
+QVCT_API std::shared_ptr<TGRTTagging> anyTaggingForLabel(const ObjectSet<TGRTTagging>& taggings,
+                                                         std::string_view label);
+QVCT_API bool containsTagWithLabel(const ObjectSet<TGRTTagging>& taggings, std::string_view label);
 
 /// Replaces the tagging with a label by one of a new tag with the new label, which joins the old tag's parent
 /// and category. The level stays; the new tagging is no automatic one.
 /// @return  Whether there was one. False, too, when nothing is left of the new label without its markers.
-bool renameTagWithLabel(ObjectSet<TGRTTagging>& taggings, std::string_view label, std::string_view newLabel);
+QVCT_API bool renameTagWithLabel(ObjectSet<TGRTTagging>& taggings, std::string_view label,
+                                 std::string_view newLabel);
 
 /// Replaces the tagging with a label by one of another tag, in the same way.
-bool reassignTagWithLabel(ObjectSet<TGRTTagging>& taggings, std::string_view label,
-                          const std::shared_ptr<TGRTTag>& tag);
+QVCT_API bool reassignTagWithLabel(ObjectSet<TGRTTagging>& taggings, std::string_view label,
+                                   const std::shared_ptr<TGRTTag>& tag);
 
 }  // namespace qvct

@@ -1,0 +1,62 @@
+# What a host may include, and so what the shared libraries export; every other symbol is hidden. Installed below
+# include/qvcontenttagging with the folders kept.
+set(QVCT_PUBLIC_HEADERS
+  platform/CountedSet.h
+  platform/Error.h
+  platform/Export.h
+  platform/Log.h
+  platform/Object.h
+  platform/ObjectSet.h
+  platform/PropertyList.h
+  platform/PropertyListFile.h
+  platform/QVContentTaggingTypes.h
+  platform/RegularExpression.h
+  platform/ResourceBundle.h
+  platform/TaggingTypes.h
+  platform/Url.h
+  platform/UserDefaults.h
+  platform/Version.h
+  taxonomy/QVTagIdentifierUtility.h
+  taxonomy/TagNormalization.h
+  taxonomy/TaggingSetAdditions.h
+  taxonomy/TGRTCategory.h
+  taxonomy/TGRTLegacyTaxonomyMapping.h
+  taxonomy/TGRTLevel.h
+  taxonomy/TGRTTag.h
+  taxonomy/TGRTTagging.h
+  taxonomy/TGRTTaggingCollection.h
+  taxonomy/TGRTTaxonomy.h
+  taxonomy/TGRTTaxonomySearching.h
+  metadata/QVCTUUIDGenerator.h
+  metadata/TGRTApplicationInfo.h
+  metadata/TGRTContentInfo.h
+  metadata/TGRTDependencyItem.h
+  metadata/TGRTKeyValue.h
+  metadata/TGRTMetaData.h
+  formats/ContentWalk.h
+  formats/ContentWriters.h
+  formats/QVContentEditorFileUtilities.h
+  formats/TGRTBaseMetaDataReader.h
+  formats/TGRTContentNodeTypeValidator.h
+  formats/TGRTFileNode.h
+  formats/TGRTMetaDataReader.h
+  formats/TGRTMetaDataReaderFactory.h
+  formats/TGRTMetaDataWriterFactory.h
+  formats/TGRTPackage.h
+  autotagging/QVCTAutoTaggingService.h
+  autotagging/QVCTKeywordExtractor.h
+  autotagging/QVCTXMLDocument.h
+  autotagging/QVCTXMLRulesTaggingService.h
+  autotagging/QVSKXMLNode.h
+  autotagging/QVTaggingAggregator.h
+  autotagging/TagDictionary.h
+  indexing/QVContentTaggingIndexableContentObject.h
+  indexing/TGRTIndexableContentObject.h)
+
+# Those of the content database, a library of its own.
+set(QVCT_PUBLIC_DATABASE_HEADERS
+  contentdb/ContentDatabase.h
+  contentdb/IndexedItem.h
+  contentdb/Indexer.h
+  contentdb/Query.h
+  contentdb/SearchResults.h)

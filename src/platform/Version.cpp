@@ -1,0 +1,9 @@
+#include "platform/Version.h"
+
+namespace qvct {
+
+std::string_view version() {
+    return QVCT_VERSION;
+}
+
+}  // namespace qvct
