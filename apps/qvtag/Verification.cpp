@@ -75,4 +75,13 @@ Json Verification::summary() const {
     return json;
 }
 
+std::string Verification::description() const {
+    if (audio_) {
+        return fmt::format("compared: {} bytes of audio (hash {:016x}) and {} chunks", audio_->audioSize,
+                           audio_->audioHash, audio_->chunks.size());
+    }
+    if (!untouched_->empty()) return fmt::format("compared: {} bytes that are not ours", untouched_->size());
+    return "compared: the record";
+}
+
 }  // namespace qvct::tool

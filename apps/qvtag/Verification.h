@@ -24,6 +24,8 @@ class Verification {
     std::vector<std::string> faultsAfterWriting(const TGRTMetaData& expected) const;
     /// What was compared: {"audioBytes","audioHash","chunks"}, {"bytes"} or nothing.
     Json summary() const;
+    /// The same in words.
+    std::string description() const;
 
   private:
     explicit Verification(URL url) : url_(std::move(url)) {}

@@ -31,13 +31,14 @@ struct Options {
 /// What a write does, or did, to one item.
 struct Change {
     URL url;
-    std::shared_ptr<TGRTMetaData> record;  // as it is to be
-    ObjectSet<TGRTTagging> added;
-    ObjectSet<TGRTTagging> removed;
-    std::string oldName;
-    std::optional<std::string> newName;
+    std::shared_ptr<TGRTMetaData> record = {};  // as it is to be
+    ObjectSet<TGRTTagging> added = {};
+    ObjectSet<TGRTTagging> removed = {};
+    std::string oldName = {};
+    std::optional<std::string> newName = {};
     bool isWritten = false;
-    std::optional<Json> verified;
+    std::optional<Verification> verification = {};  // of what was written
+    std::vector<std::string> faults = {};           // that it found
 
     bool isNone() const { return added.empty() && removed.empty() && !newName; }
 };
@@ -67,7 +68,7 @@ std::optional<Change> changeOfItem(const URL& url, const TaggingEdit& edit, cons
     const auto node = TGRTFileNode::nodeWithFileURL(url);
     const std::string path = printable(url.path());
     Error error;
-    Change change{url, nullptr, {}, {}, {}, {}, false, {}};
+    Change change{.url = url};
     if (!node->validator()) {
         node->readMetaDataWithOptions(0, &error);
         const std::string reason = error.message.empty() ? path + ": cannot be written" : error.message;
@@ -113,10 +114,9 @@ bool write(const Change& change, const Options& options, Error* error) {
 /// Whether the item is as it should be now.
 bool carryOut(Change& change, const Options& options, ToolContext& context) {
     Error error;
-    std::optional<Verification> verification;
     if (options.verifies) {
-        verification = Verification::before(change.url, &error);
-        if (!verification) {
+        change.verification = Verification::before(change.url, &error);
+        if (!change.verification) {
             context.itemFailed(error.message);
             return false;
         }
@@ -127,11 +127,9 @@ bool carryOut(Change& change, const Options& options, ToolContext& context) {
                                                  : error.message);
         return false;
     }
-    if (!verification) return true;
-    const std::vector<std::string> faults = verification->faultsAfterWriting(*change.record);
-    change.verified = verification->summary();
-    (*change.verified)["faults"] = faults;
-    for (const std::string& fault : faults)
+    if (!change.verification) return true;
+    change.faults = change.verification->faultsAfterWriting(*change.record);
+    for (const std::string& fault : change.faults)
         context.itemFailed(fmt::format("{}: {}", printable(change.url.path()), fault));
     return true;
 }
@@ -149,7 +147,12 @@ Json jsonOfChange(const Change& change) {
     json["added"] = jsonOfTaggings(change.added);
     json["removed"] = jsonOfTaggings(change.removed);
     json["name"] = change.newName ? Json{{"from", change.oldName}, {"to", *change.newName}} : Json();
-    json["verified"] = change.verified.value_or(Json());
+    if (!change.verification) {
+        json["verified"] = nullptr;
+        return json;
+    }
+    json["verified"] = change.verification->summary();
+    json["verified"]["faults"] = change.faults;
     return json;
 }
 
@@ -162,9 +165,8 @@ void printChange(const Change& change, const Terminal& terminal) {
     if (change.newName)
         fmt::print("  name \"{}\" becomes \"{}\"\n", printable(change.oldName), printable(*change.newName));
     if (change.isNone()) fmt::print("  {}\n", colored(terminal, Color::faint, "nothing to change"));
-    if (change.verified) {
-        fmt::print("  {}\n", colored(terminal, Color::faint, "verified " + jsonText(*change.verified, true)));
-    }
+    if (change.verification)
+        fmt::print("  {}\n", colored(terminal, Color::faint, change.verification->description()));
 }
 
 void run(const Options& options, ToolContext& context) {

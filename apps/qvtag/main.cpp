@@ -27,6 +27,19 @@ void addSharedOptions(CLI::App& app, qvct::tool::ToolContext& context) {
         ->type_name("DIR");
 }
 
+/// An empty path, as a variable that is not set leaves it, would name the current folder and all that is in
+/// it.
+void refuseEmptyPaths(CLI::App& app) {
+    for (CLI::Option* option : app.get_options()) {
+        const std::string type = option->get_type_name();
+        if (type != "PATH" && type != "FILE" && type != "DIR") continue;
+        option->check([](const std::string& path) {
+            return path.empty() ? std::string("an empty path names nothing") : std::string();
+        });
+    }
+    for (CLI::App* command : app.get_subcommands({})) refuseEmptyPaths(*command);
+}
+
 int run(int argc, char** argv) {
     qvct::tool::ToolContext context;
     CLI::App app("Describes sounds with tags: reads, derives and searches them.", "qvtag");
@@ -47,6 +60,7 @@ int run(int argc, char** argv) {
     qvct::tool::addSearchCommands(app, context);
     qvct::tool::addTaxonomyCommand(app, context);
     qvct::tool::addWriteCommand(app, context);
+    refuseEmptyPaths(app);
     try {
         app.parse(argc, argv);
     } catch (const CLI::ParseError& error) {

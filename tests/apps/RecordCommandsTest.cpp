@@ -142,6 +142,7 @@ TEST(Write, RefusesWrongWordsBeforeAnythingIsTouched) {
         {{"--add", "Genres/House=1.5"}, "no tag \"House=1.5\""},
         {{"--remove", "/House"}, "\"/House\" is no Category/Label"},
         {{}, "nothing to write"},
+        {{""}, "an empty path names nothing"},  // and not all of the current folder
     };
     for (const auto& c : cases) {
         std::vector<std::string> arguments = {"write", item, "--add", "Genres/House"};
