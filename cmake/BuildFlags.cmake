@@ -9,7 +9,8 @@ if(QVCT_SANITIZERS)
   set(sanitize "-fsanitize=${QVCT_SANITIZERS}")
   target_compile_options(qvct_build_flags INTERFACE
     ${sanitize} -fno-sanitize-recover=all -fno-omit-frame-pointer)
-  target_link_options(qvct_build_flags INTERFACE ${sanitize})
+  target_link_options(qvct_build_flags INTERFACE
+    ${sanitize} "-Wl,--version-script=${CMAKE_CURRENT_LIST_DIR}/Sanitizers.map")
 endif()
 
 set(CMAKE_CXX_EXTENSIONS OFF)
