@@ -38,6 +38,12 @@ bool readSignature(const std::string& text, RhythmRequest& request) {
     return true;
 }
 
+/// What a range lets through, since it compares with nothing.
+std::string refuseNotANumber(const std::string& text) {
+    double value = 0;
+    return CLI::detail::lexical_cast(text, value) && std::isnan(value) ? "not a number" : "";
+}
+
 /// Whole numbers without a fraction, others with what tells them apart.
 double rounded(double value) {
     return std::round(value * 1e6) / 1e6;
@@ -112,7 +118,7 @@ void addRhythmCommand(CLI::App& app, ToolContext& context) {
         ->required()
         ->type_name("FILE");
     command->add_option("--tempo", options->request.tempo, "Quarter notes a minute")
-        ->check(CLI::Range(1.0, 1000.0));
+        ->check(CLI::Range(1.0, 1000.0) & CLI::Validator(refuseNotANumber, ""));
     command->add_option("--beats", options->request.beats, "Length in beats")->check(CLI::Range(1, 100000));
     command->add_option("--signature", options->signature, "Time signature, such as 6/8");
     command->add_option("--plot", options->plotFile, "Draw the rhythm, and what gave it its numbers")

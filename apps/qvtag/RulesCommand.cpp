@@ -91,6 +91,11 @@ Service serviceWith(const std::string& rulesFile, ToolContext& context) {
         context.itemFailed(error.message);
         return nullptr;
     }
+    const PropertyList* list = rules->value("DefaultRules");
+    if (list == nullptr || list->array() == nullptr) {
+        context.itemFailed(fmt::format("{}: there is no array under \"DefaultRules\"", printable(rulesFile)));
+        return nullptr;
+    }
     return QVCTXMLRulesTaggingService::initWithRules(std::move(rules));
 }
 

@@ -118,14 +118,14 @@ PropertyList::Dictionary QVCTXMLRulesTaggingService::defaultRules() {
 void QVCTXMLRulesTaggingService::setupWithRules(const PropertyList::Dictionary& rules) {
     const PropertyList* list = rules.value("DefaultRules");
     if (list == nullptr || list->array() == nullptr) return;
+    const PropertyList::Dictionary empty;
     std::size_t number = 0;
     for (const PropertyList& element : *list->array()) {
-        ++number;
-        const PropertyList::Dictionary* rule = element.dictionary();
-        if (rule == nullptr) continue;
-        const bool hasType = rule->value("type") != nullptr;
-        rules_.push_back({number, hasType ? textForKey(*rule, "type").value_or("") : std::string(kXPathType),
-                          textForKey(*rule, "rule").value_or(""), textForKey(*rule, "tag")});
+        const PropertyList::Dictionary& rule =
+            element.dictionary() != nullptr ? *element.dictionary() : empty;
+        const bool hasType = rule.value("type") != nullptr;
+        rules_.push_back({++number, hasType ? textForKey(rule, "type").value_or("") : std::string(kXPathType),
+                          textForKey(rule, "rule").value_or(""), textForKey(rule, "tag")});
     }
 }
 

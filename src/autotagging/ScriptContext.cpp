@@ -28,18 +28,6 @@ using Clock = std::chrono::steady_clock;
 constexpr double kSlice = 0.01;
 constexpr std::size_t kLongestMessage = 4096;
 
-/// Puts every use of a regular expression under the guard (`this`): all methods of texts and expressions go
-/// through `exec`.
-constexpr std::string_view kGuardInstallation = R"js(
-(function (guard) {
-    const exec = RegExp.prototype.exec;
-    RegExp.prototype.exec = function (string) {
-        string = String(string);
-        guard(this.source, this.flags, string, this.lastIndex);
-        return exec.call(this, string);
-    };
-})(this);)js";
-
 /// The virtual machine of a thread, which its contexts share.
 class ContextGroup {
   public:
@@ -81,6 +69,10 @@ void setProperty(JSContextRef context, JSObjectRef object, std::string_view name
     JSObjectSetProperty(context, object, scriptString(name).get(), value, kJSPropertyAttributeNone, nullptr);
 }
 
+JSValueRef property(JSContextRef context, JSObjectRef object, std::string_view name, JSValueRef* exception) {
+    return JSObjectGetProperty(context, object, scriptString(name).get(), exception);
+}
+
 }  // namespace
 
 struct ScriptContext::Implementation {
@@ -93,6 +85,7 @@ struct ScriptContext::Implementation {
     const QVCTXMLDocument* document = nullptr;
     std::shared_ptr<ContextGroup> group = sharedGroup();
     JSGlobalContextRef context = JSGlobalContextCreateInGroup(group->reference(), nullptr);
+    JSObjectRef exec = nullptr;  ///< The engine's `RegExp.prototype.exec`.
 
     explicit Implementation(const ScriptLimits& chosen) : limits(chosen) {
         outer = std::exchange(current, this);
@@ -104,6 +97,7 @@ struct ScriptContext::Implementation {
     ~Implementation() {
         JSContextGroupClearExecutionTimeLimit(group->reference());
         current = outer;
+        JSValueUnprotect(context, exec);
         JSGlobalContextRelease(context);
         // A machine that was stopped may hold much memory: the thread's next context begins with a new one.
         if (stop != Stop::none && groupOfThisThread() == group) groupOfThisThread().reset();
@@ -161,9 +155,7 @@ struct ScriptContext::Implementation {
 
     static double memoryInUse(JSContextRef context) {
         const JSObjectRef statistics = JSGetMemoryUsageStatistics(context);
-        const JSValueRef capacity =
-            JSObjectGetProperty(context, statistics, scriptString("heapCapacity").get(), nullptr);
-        return JSValueToNumber(context, capacity, nullptr);
+        return JSValueToNumber(context, property(context, statistics, "heapCapacity", nullptr), nullptr);
     }
 
     void defineLog();
@@ -172,8 +164,9 @@ struct ScriptContext::Implementation {
     static JSClassRef documentClass();
     static JSValueRef logMessage(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
                                  JSValueRef*);
-    static JSValueRef guardExpression(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
-                                      JSValueRef*);
+    static JSValueRef guardedExec(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
+                                  JSValueRef*);
+    static bool isBounded(JSContextRef, JSObjectRef expression, JSStringRef text, JSValueRef* exception);
     static JSValueRef isMatchingXPath(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
                                       JSValueRef*);
     static JSValueRef jsonStringForXPath(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
@@ -214,10 +207,14 @@ void ScriptContext::Implementation::defineLog() {
     setProperty(context, global(), "__log", logFunction);
 }
 
+/// Puts every use of a regular expression under the guard: all methods of texts and expressions go through
+/// `exec`. Done by hand, since compiling a script for it in each context would take longer.
 void ScriptContext::Implementation::installGuard() {
-    static const ScriptString installation = scriptString(kGuardInstallation);
-    const JSObjectRef guard = JSObjectMakeFunctionWithCallback(context, nullptr, guardExpression);
-    JSEvaluateScript(context, installation.get(), guard, nullptr, 1, nullptr);
+    const JSObjectRef expression = JSObjectMakeRegExp(context, 0, nullptr, nullptr);
+    const JSObjectRef prototype = const_cast<JSObjectRef>(JSObjectGetPrototype(context, expression));
+    exec = const_cast<JSObjectRef>(property(context, prototype, "exec", nullptr));
+    JSValueProtect(context, exec);
+    setProperty(context, prototype, "exec", JSObjectMakeFunctionWithCallback(context, nullptr, guardedExec));
 }
 
 JSValueRef ScriptContext::Implementation::logMessage(JSContextRef context, JSObjectRef /*function*/,
@@ -233,24 +230,37 @@ JSValueRef ScriptContext::Implementation::logMessage(JSContextRef context, JSObj
     return JSValueMakeUndefined(context);
 }
 
-JSValueRef ScriptContext::Implementation::guardExpression(JSContextRef context, JSObjectRef /*function*/,
-                                                          JSObjectRef /*self*/, size_t count,
-                                                          const JSValueRef values[], JSValueRef* exception) {
-    if (count < 4) return JSValueMakeUndefined(context);
-    const ScriptString pattern(JSValueToStringCopy(context, values[0], exception));
-    const ScriptString flags(JSValueToStringCopy(context, values[1], exception));
-    const ScriptString text(JSValueToStringCopy(context, values[2], exception));
-    const double last = JSValueToNumber(context, values[3], exception);
-    if (!pattern || !flags || !text || *exception != nullptr) return JSValueMakeUndefined(context);
+JSValueRef ScriptContext::Implementation::guardedExec(JSContextRef context, JSObjectRef /*function*/,
+                                                      JSObjectRef self, size_t count,
+                                                      const JSValueRef values[], JSValueRef* exception) {
+    const JSValueRef value = count > 0 ? values[0] : JSValueMakeUndefined(context);
+    const ScriptString text(JSValueToStringCopy(context, value, exception));
+    if (!text || !isBounded(context, self, text.get(), exception)) return JSValueMakeUndefined(context);
+    const JSValueRef argument = JSValueMakeString(context, text.get());
+    const JSValueRef result = JSObjectCallAsFunction(context, running().exec, self, 1, &argument, exception);
+    return result != nullptr ? result : JSValueMakeUndefined(context);
+}
+
+/// False, and an exception, for what would take too long or cannot be asked.
+bool ScriptContext::Implementation::isBounded(JSContextRef context, JSObjectRef expression, JSStringRef text,
+                                              JSValueRef* exception) {
+    const auto asked = [&](std::string_view name) {
+        const JSValueRef value = property(context, expression, name, exception);
+        return *exception == nullptr ? value : JSValueMakeUndefined(context);
+    };
+    const ScriptString pattern(JSValueToStringCopy(context, asked("source"), exception));
+    const ScriptString flags(JSValueToStringCopy(context, asked("flags"), exception));
+    const double last = JSValueToNumber(context, asked("lastIndex"), exception);
+    if (!pattern || !flags || *exception != nullptr) return false;
     const bool isSticky = viewOf(flags.get()).find_first_of(u"gy") != std::u16string_view::npos;
     const std::size_t start = isSticky && last > 0 && last < 1e9 ? static_cast<std::size_t>(last) : 0;
-    if (!isRegularExpressionBounded(viewOf(pattern.get()), viewOf(flags.get()), viewOf(text.get()), start,
-                                    running().deadline)) {
-        const std::string reason =
-            fmt::format("regular expression takes too long: /{}/", textOf(pattern.get()));
-        *exception = JSValueMakeString(context, scriptString(reason).get());
+    if (isRegularExpressionBounded(viewOf(pattern.get()), viewOf(flags.get()), viewOf(text), start,
+                                   running().deadline)) {
+        return true;
     }
-    return JSValueMakeUndefined(context);
+    const std::string reason = fmt::format("regular expression takes too long: /{}/", textOf(pattern.get()));
+    *exception = JSValueMakeString(context, scriptString(reason).get());
+    return false;
 }
 
 JSValueRef ScriptContext::Implementation::isMatchingXPath(JSContextRef context, JSObjectRef /*function*/,
@@ -309,8 +319,7 @@ std::optional<PropertyList::Array> ScriptContext::callForArray(std::string_view 
     std::optional<PropertyList::Array> result;
     self.run([&] {
         JSValueRef exception = nullptr;
-        const JSValueRef callee =
-            JSObjectGetProperty(self.context, self.global(), scriptString(function).get(), &exception);
+        const JSValueRef callee = property(self.context, self.global(), function, &exception);
         if (exception == nullptr && (!JSValueIsObject(self.context, callee) ||
                                      !JSObjectIsFunction(self.context, const_cast<JSObjectRef>(callee)))) {
             return Implementation::logProblem(fmt::format("TypeError: {} is not a function", function));
@@ -337,8 +346,8 @@ bool ScriptContext::checkSyntax(std::string_view script, Error* error) {
     const JSGlobalContextRef reference = context->implementation_->context;
     JSValueRef exception = nullptr;
     if (JSCheckScriptSyntax(reference, scriptString(script).get(), nullptr, 1, &exception)) return true;
-    const JSValueRef line = JSObjectGetProperty(reference, JSValueToObject(reference, exception, nullptr),
-                                                scriptString("line").get(), nullptr);
+    const JSValueRef line =
+        property(reference, JSValueToObject(reference, exception, nullptr), "line", nullptr);
     return fail(error, kErrorMalformed,
                 fmt::format("script, line {}: {}", textOf(reference, line, nullptr),
                             textOf(reference, exception, nullptr)));

@@ -228,10 +228,12 @@ TEST(Rules, ProblemsNameTheRuleAndTheReason) {
     for (const RuleProblem& problem : service->problems()) {
         problems.push_back(std::to_string(problem.number) + ": " + problem.reason);
     }
-    EXPECT_THAT(problems,
-                ElementsAre(HasSubstr("2: XPath \"/a[\", character 3"), HasSubstr("4: unknown type \"Lua\""),
-                            HasSubstr("5: there is no text under \"tag\""), HasSubstr("6: script, line 1: "),
-                            HasSubstr("7: /missing: no such file"), HasSubstr("8: ")));
+    EXPECT_THAT(
+        problems,
+        ElementsAre(HasSubstr("2: XPath \"/a[\", character 3"),
+                    HasSubstr("3: there is no text under \"rule\""), HasSubstr("4: unknown type \"Lua\""),
+                    HasSubstr("5: there is no text under \"tag\""), HasSubstr("6: script, line 1: "),
+                    HasSubstr("7: /missing: no such file"), HasSubstr("8: ")));
     EXPECT_THAT(QVCTXMLRulesTaggingService::init()->problems(), IsEmpty());
 }
 

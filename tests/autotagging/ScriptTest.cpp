@@ -129,7 +129,8 @@ TEST(Script, WithoutEndIsStoppedAndTheNextOneRuns) {
           "function main() { return [{get label() { for (;;); }}] }", "throw {toString() { for (;;); }}",
           "function main() { try { for (;;); } finally { for (;;); } }",
           "function main() { for (;;) try { for (;;); } catch (e) {} }",
-          "function main() { for (;;) document.JSONString() }"}) {
+          "function main() { for (;;) document.JSONString() }",
+          "function main() { for (;;) /a/.test('ba') }"}) {
         const test::CapturedLog log;
         const auto start = std::chrono::steady_clock::now();
         EXPECT_EQ(resultOf(script), "nil") << script;
@@ -168,6 +169,12 @@ TEST(Script, OrdinaryExpressionsWorkAsEver) {
                            "'aXbX'.search(/x/i), /^(\\w+\\s?)+$/.test('warm analog pad '.repeat(500) + 'x'), "
                            "'2024-05'.replace(/(?<y>\\d+)-(?<m>\\d+)/, '$<m>/$<y>')]"),
               R"(["x_y_z","12",["a","b","c"],1,true,"05/2024"])");
+    EXPECT_EQ(
+        resultOfMain(
+            "var thrown = 0; for (var f of [() => /a/.exec.call(7, 'a'), () => /a/.exec(Symbol('s')), () => "
+            "/a/.exec.call({get source() { throw 1 }}, 'a')]) try { f() } catch (e) { thrown++ } "
+            "return [thrown, /undefined/.test(), /a/.exec('b')]"),
+        "[3,true]");
     EXPECT_EQ(resultOfMain(
                   "var r = /a/y; r.lastIndex = 1; return [r.test('ba'), r.lastIndex, /a/.exec('ba').index]"),
               "[true,2,1]");

@@ -10,22 +10,25 @@
 
 	// Assigns opt_object at the dotted path of name, below opt_objectToExportTo or the global object.
 	QVSearchKit.exportSymbol = function (name, opt_object, opt_objectToExportTo) {
-		var parts = name.split(".");
 		var target = opt_objectToExportTo || QVSearchKit.global;
+		var dot = name.indexOf(".");
+		var part = dot < 0 ? name : name.substring(0, dot);
 
 		// Hosts whose globals can only be declared, not assigned.
-		if (!(parts[0] in target) && typeof target.execScript === "function") {
-			target.execScript("var " + parts[0]);
+		if (!(part in target) && typeof target.execScript === "function") {
+			target.execScript("var " + part);
 		}
 
-		for (var i = 0; i < parts.length; i++) {
-			var isLast = i === parts.length - 1;
-			if (isLast && QVSearchKit.isDef(opt_object)) {
-				target[parts[i]] = opt_object;
-			} else if (!target[parts[i]]) {
-				target[parts[i]] = {};
-			}
-			target = target[parts[i]];
+		while (dot >= 0) {
+			target = target[part] || (target[part] = {});
+			var start = dot + 1;
+			dot = name.indexOf(".", start);
+			part = name.substring(start, dot < 0 ? name.length : dot);
+		}
+		if (opt_object !== undefined) {
+			target[part] = opt_object;
+		} else if (!target[part]) {
+			target[part] = {};
 		}
 	};
 

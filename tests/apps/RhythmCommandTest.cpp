@@ -1,0 +1,229 @@
+#include "demo/Library.h"
+#include "support/AudioFixtures.h"
+#include "support/Corpus.h"
+#include "support/RunTool.h"
+
+#include <cmath>
+
+#include <gmock/gmock.h>
+
+namespace qvct::test {
+namespace {
+
+using nlohmann::json;
+using testing::AllOf;
+using testing::ElementsAre;
+using testing::HasSubstr;
+
+/// A file of 96 ticks a beat with notes of a quarter beat at these sixteenths.
+std::string midi(const std::vector<unsigned>& sixteenths, const std::string& facts = {}) {
+    std::string events = facts;
+    unsigned now = 0;
+    for (const unsigned start : sixteenths) {
+        const unsigned wait = start * 24 - now;
+        events += {static_cast<char>(0x80U | wait >> 7U), static_cast<char>(wait & 0x7FU)};
+        events += std::string("\x90\x24\x64\x18\x80\x24\x40", 7);
+        now = start * 24 + 24;
+    }
+    events += std::string("\0\xFF\x2F\0", 4);
+    return "MThd" + big(6, 4) + big(0, 2) + big(1, 2) + big(96, 2) + "MTrk" + big(events.size(), 4) + events;
+}
+
+/// Tempo 100 and 3/4, as events at the start.
+const std::string kFacts = std::string("\0\xFF\x51\x03\x09\x27\xC0\0\xFF\x58\x04\x03\x02\x18\x08", 15);
+
+/// Clicks at these frames in a 16-bit mono WAV of two seconds, with tempo facts if asked for.
+std::string clicks(const std::vector<std::size_t>& frames, const std::string& facts = {}) {
+    std::string samples(2 * 88200, '\0');
+    for (const std::size_t frame : frames) {
+        for (unsigned i = 0; i < 1000; ++i) {
+            const double value = 20000 * std::sin(0.3 * i) * std::exp(-0.005 * i);
+            samples.replace((frame + i) * 2, 2, little(static_cast<std::uint64_t>(std::llround(value)), 2));
+        }
+    }
+    const Wav wav;
+    return wav.file(wav.format(1) + facts + wav.chunk("data", samples));
+}
+
+ToolResult rhythm(std::vector<std::string> arguments) {
+    arguments.insert(arguments.begin(), {"rhythm", "--json"});
+    return runTool(arguments);
+}
+
+/// What must hold whatever the file was.
+void expectSound(const json& item, const std::string& what) {
+    for (const char* key : {"density", "complexity"}) {
+        ASSERT_TRUE(item[key].is_number()) << what << key;  // JSON writes null for what is no number
+        EXPECT_GE(item[key].get<double>(), 0) << what;
+        EXPECT_LE(item[key].get<double>(), 1) << what;
+    }
+    for (const json& onset : item["onsets"]) EXPECT_TRUE(onset.is_number()) << what;
+    EXPECT_GE(item["beatCount"].get<int>(), 1) << what;
+    EXPECT_TRUE(item["tempo"].is_number()) << what;
+}
+
+TEST(RhythmCommand, TakesTempoMetreAndLengthFromAMidiFileOrTheOptions) {
+    const TemporaryFolder folder;
+    const std::string file = folder.write("a.mid", midi({0, 4, 6, 14}, kFacts));
+    const json told = rhythm({file}).json()[0];
+    EXPECT_EQ(told["path"], file);
+    EXPECT_EQ(told["onsets"], json({0.0, 1.0, 1.5, 3.5}));
+    EXPECT_EQ(told["tempo"], 100.0);
+    EXPECT_EQ(told["signature"], "3/4");
+    EXPECT_EQ(told["beatCount"], 6) << "the last note ends at 3.75, in the second bar";
+    EXPECT_NEAR(told["density"].get<double>(), std::log(4 / 48.0 * 0.9502129 + 0.0497871) / 3 + 1, 1e-6);
+
+    const json asked = rhythm({file, "--tempo", "90.5", "--beats", "12", "--signature", "12/8"}).json()[0];
+    EXPECT_EQ(asked["tempo"], 90.5);
+    EXPECT_EQ(asked["beatCount"], 12);
+    EXPECT_EQ(asked["signature"], "12/8");
+    EXPECT_NEAR(asked["density"].get<double>(), std::log(4 / 48.0 * 0.9502129 + 0.0497871) / 3 + 1, 1e-6);
+
+    const json bare = rhythm({folder.write("b.MID", midi({0, 16}))}).json()[0];
+    EXPECT_EQ(bare["signature"], "4/4");
+    EXPECT_EQ(bare["tempo"], 120.0);
+    EXPECT_EQ(bare["beatCount"], 8);
+    EXPECT_THAT(runTool({"rhythm", file}).output, HasSubstr("4 onsets in 6 beats of 3/4 at 100 bpm\n"));
+}
+
+TEST(RhythmCommand, ReadsTheNotesInALoopAndListensToOthers) {
+    const TemporaryFolder folder;
+    demo::writeLibrary(folder.path());
+    const json notes =
+        rhythm({folder.path("Loops/African/Marimba Mallet Pattern G Major 112bpm.caf")}).json()[0];
+    ASSERT_EQ(notes["onsets"].size(), 16U);
+    for (std::size_t i = 0; i < 16; ++i) EXPECT_EQ(notes["onsets"][i], 0.5 * static_cast<double>(i));
+    EXPECT_EQ(notes["tempo"], 112.0);
+
+    const json sound = rhythm({folder.path("Loops/Drum'n'Bass/Jungle Drum Break 174bpm.wav")}).json()[0];
+    EXPECT_EQ(sound["tempo"], 174.0);
+    EXPECT_GE(sound["onsets"].size(), 8U);
+    expectSound(sound, "wav");
+    for (const json& onset : sound["onsets"]) {
+        const double sixteenths = onset.get<double>() * 4;
+        EXPECT_NEAR(sixteenths, std::round(sixteenths), 0.15) << "breaks are played on sixteenths";
+    }
+}
+
+TEST(RhythmCommand, AsksForTheLengthThatASoundDoesNotTell) {
+    const TemporaryFolder folder;
+    const std::string file = folder.write("c.wav", clicks({11025, 33075, 55125}));
+    const ToolResult unknown = rhythm({file});
+    EXPECT_EQ(unknown.status, 1);
+    EXPECT_THAT(unknown.errors, HasSubstr("c.wav: its length in beats is unknown; say --beats or --tempo"));
+    const json told = rhythm({file, "--beats", "4"}).json()[0];
+    EXPECT_EQ(told["tempo"], 120.0) << "four beats in two seconds";
+    ASSERT_EQ(told["onsets"].size(), 3U);
+    for (std::size_t i = 0; i < 3; ++i) EXPECT_NEAR(told["onsets"][i], 0.5 + static_cast<double>(i), 0.01);
+    EXPECT_EQ(rhythm({file, "--tempo", "60"}).json()[0]["beatCount"], 2);
+}
+
+TEST(RhythmCommand, DrawsAPlot) {
+    const TemporaryFolder folder;
+    const std::string plot = folder.path("p.svg"), file = folder.write("a.mid", midi({0, 4, 6, 14}));
+    EXPECT_EQ(runTool({"rhythm", file, "--plot", plot}).status, 0);
+    EXPECT_THAT(readAll(plot), AllOf(HasSubstr("<svg "), HasSubstr("a.mid"), HasSubstr("</svg>")));
+    const ToolResult two = runTool({"rhythm", file, file, "--plot", plot});
+    EXPECT_EQ(two.status, 2);
+    EXPECT_THAT(two.errors, HasSubstr("--plot draws one file"));
+    const ToolResult lost = runTool({"rhythm", file, "--plot", folder.path("no/p.svg")});
+    EXPECT_EQ(lost.status, 1);
+    EXPECT_THAT(lost.errors, HasSubstr("no/p.svg: cannot make a file beside it: No such file"));
+}
+
+TEST(RhythmCommand, NamesWhatCannotBeMeasuredAndDoesTheRest) {
+    const TemporaryFolder folder;
+    const std::string good = folder.write("a.mid", midi({0, 4}));
+    const Wav wav;
+    const struct {
+        std::string path, reason;
+    } rows[] = {
+        {folder.path("none.mid"), "none.mid: No such file"},
+        {folder.path("none.wav"), "none.wav: "},
+        {folder.write("text.mid", "no notes"), "text.mid: "},
+        {folder.write("text.wav", "no sound"), "text.wav: "},
+        {folder.write("d.mid", "MThd" + big(6, 4) + big(0, 2) + big(1, 2) + big(0, 2)), "d.mid: "},
+        {folder.write("empty.mid", emptyMidi()), "empty.mid: nothing sounds in it"},
+        {folder.write("silence.wav", clicks({})), "silence.wav: nothing sounds in it"},
+        {folder.write("nothing.wav", wav.file(wav.format(1) + wav.chunk("data", ""))), "nothing.wav: "},
+        {folder.path(), folder.path() + ": "}};
+    for (const auto& row : rows) {
+        const ToolResult result = rhythm({row.path, good, "--beats", "4"});
+        EXPECT_EQ(result.status, 1) << row.path;
+        EXPECT_THAT(result.errors, HasSubstr(row.reason));
+        EXPECT_EQ(std::count(result.errors.begin(), result.errors.end(), '\n'), 1) << result.errors;
+        EXPECT_EQ(result.json().size(), 1U) << row.path;
+    }
+    for (const std::vector<std::string>& words : {std::vector<std::string>{"--beats", "0"},
+                                                  {"--beats", "-4"},
+                                                  {"--tempo", "0"},
+                                                  {"--tempo", "nan"},
+                                                  {"--signature", "0/4"},
+                                                  {"--signature", "4"}}) {
+        const ToolResult result = rhythm({good, words[0], words[1]});
+        EXPECT_EQ(result.status, 2) << words[0] << words[1];
+        EXPECT_EQ(result.output, "");
+    }
+}
+
+TEST(RhythmCommand, LengthsThatDoNotFitGiveNumbersAllTheSame) {
+    const TemporaryFolder folder;
+    const std::string notes = folder.write("a.mid", midi({0, 4, 7}));
+    const std::string sound = folder.write("c.wav", clicks({11025, 33075}));
+    for (const char* beats : {"1", "3", "1000", "16384"}) {
+        for (const char* signature : {"4/4", "5/4", "7/8", "4/64", "64/1"}) {
+            const ToolResult result = rhythm({notes, sound, "--beats", beats, "--signature", signature});
+            EXPECT_EQ(result.status, 0) << result.errors;
+            for (const json& item : result.json()) expectSound(item, std::string(beats) + signature);
+        }
+    }
+    EXPECT_THAT(rhythm({notes, "--beats", "20000"}).errors, HasSubstr("20000 beats cannot be measured"));
+}
+
+TEST(RhythmCommand, EveryMidiFileOfTheCorpusGivesWhatCanBeReadOrAReason) {
+    QVCT_SKIP_WITHOUT(corpus("midi/test-files"));
+    const std::vector<std::string> files = filesBelow(corpus("midi/test-files"));
+    std::size_t measured = 0;
+    for (const std::string& file : files) {
+        const ToolResult result = rhythm({file});
+        ASSERT_THAT(result.status, testing::AnyOf(0, 1)) << file << result.errors;
+        if (result.status == 1) {
+            EXPECT_THAT(result.errors, HasSubstr(std::filesystem::path(file).filename().string() + ": "));
+            EXPECT_EQ(result.json(), json::array());
+            continue;
+        }
+        ++measured;
+        expectSound(result.json()[0], file);
+    }
+    EXPECT_GT(measured, files.size() / 3);
+}
+
+TEST(Autotag, GradesTheRhythmOfEveryLoopOnRequest) {
+    const TemporaryFolder folder;
+    const Wav wav;
+    const std::string loop = folder.write("a.wav", clicks({11025, 33075}, wav.acid(0, 60, 4, 120)));
+    const std::string shot = folder.write("b.wav", clicks({11025, 33075}));
+    const auto levels = [](const json& item) {
+        std::vector<std::string> found;
+        for (const json& tagging : item["taggings"]) {
+            if (tagging["label"] != "Rhythmic Density" && tagging["label"] != "Rhythmic Complexity") continue;
+            EXPECT_TRUE(tagging["level"].is_number() && tagging["auto"].get<bool>()) << tagging;
+            found.push_back(tagging["label"]);
+        }
+        return found;
+    };
+    const json plain = runTool({"autotag", "--json", loop, shot}).json();
+    EXPECT_THAT(levels(plain[0]), testing::IsEmpty()) << "the service takes other kinds of loops only";
+    const json any = runTool({"autotag", "--json", "--rhythm-any", loop, shot}).json();
+    EXPECT_THAT(levels(any[0]), testing::UnorderedElementsAre("Rhythmic Density", "Rhythmic Complexity"));
+    EXPECT_THAT(levels(any[1]), testing::IsEmpty()) << "its length in beats is unknown";
+
+    demo::writeLibrary(folder.path("demo"));  // a loop with notes inside, which the service does grade
+    const std::string caf = folder.path("demo/Loops/Techno/Acid Synth Bass F Minor 132bpm.caf");
+    const json service = runTool({"autotag", "--json", caf}).json();
+    EXPECT_EQ(levels(service[0]).size(), 2U);
+    EXPECT_EQ(runTool({"autotag", "--json", "--rhythm-any", caf}).json(), service);
+}
+
+}  // namespace
+}  // namespace qvct::test

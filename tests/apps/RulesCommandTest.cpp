@@ -1,0 +1,213 @@
+#include "demo/Library.h"
+#include "support/RunTool.h"
+
+#include <algorithm>
+#include <filesystem>
+#include <set>
+
+#include <gmock/gmock.h>
+
+namespace qvct::test {
+namespace {
+
+using nlohmann::json;
+using testing::AllOf;
+using testing::ElementsAre;
+using testing::HasSubstr;
+
+const std::string kMono = "<Patch><Channels><Channel mode='Mono'/></Channels></Patch>";
+
+/// A property list of these rules, each the inside of its dictionary.
+std::string ruleList(const std::vector<std::string>& rules) {
+    std::string text = "<plist version=\"1.0\"><dict><key>DefaultRules</key><array>";
+    for (const std::string& rule : rules) text += "<dict>" + rule + "</dict>";
+    return text + "</array></dict></plist>";
+}
+
+std::string xPathRule(const std::string& expression) {
+    return "<key>rule</key><string>" + expression + "</string><key>tag</key><string>Mono</string>";
+}
+
+std::string scriptRule(const std::string& script) {
+    return "<key>type</key><string>JavaScript</string><key>rule</key><string>" + script + "</string>";
+}
+
+std::ptrdiff_t lines(const std::string& text) {
+    return std::count(text.begin(), text.end(), '\n');
+}
+
+class RulesCommand : public testing::Test {
+  protected:
+    RulesCommand() { folder_.write("A.patch/org.qvcontenttagging.intermediate.cache.xml", kMono); }
+
+    /// The tool with this rule file over the one patch.
+    ToolResult tryRules(const std::string& contents) const {
+        return runTool({"--json", "rules", "test", folder_.write("r.plist", contents), patch_});
+    }
+
+    TemporaryFolder folder_;
+    std::string patch_ = folder_.path("A.patch");
+};
+
+TEST_F(RulesCommand, ShowsWhichRulesMatchAndWhy) {
+    const ToolResult result = runTool({"rules", patch_, "--json"});
+    EXPECT_EQ(result.status, 0) << result.errors;
+    ASSERT_EQ(result.json().size(), 1U);
+    EXPECT_EQ(result.json()[0]["path"], patch_);
+    EXPECT_EQ(result.json()[0]["rules"], json::parse(R"([
+        {"number": 2, "type": "XPath", "tags": [{"label": "Mono"}], "evidence": "<Channel mode=\"Mono\"/>"},
+        {"number": 21, "type": "JavaScript", "tags": [{"label": "Progress", "level": 0.0}],
+         "evidence": "[{\"label\":\"Progress\",\"level\":0}]"}])"));
+    EXPECT_THAT(runTool({"rules", patch_}).output,
+                AllOf(HasSubstr("   2  XPath       Mono\n      <Channel mode=\"Mono\"/>\n"),
+                      HasSubstr("Progress 0%")));
+    EXPECT_THAT(runTool({"rules", "--json", folder_.write("Kick.wav", "")}).errors,
+                HasSubstr("Kick.wav: has no XML description"));
+}
+
+TEST_F(RulesCommand, DemonstrationContentMeetsEveryDefaultRule) {
+    demo::writeLibrary(folder_.path("demo"));
+    const ToolResult result = runTool({"rules", folder_.path("demo/Patches"), "--json"});
+    std::set<int> matched;
+    for (const json& item : result.json()) {
+        std::set<int> numbers;
+        for (const json& rule : item["rules"]) numbers.insert(rule["number"].get<int>());
+        EXPECT_TRUE(numbers.contains(21)) << item["path"] << " was not read";  // which tags every document
+        matched.merge(numbers);
+    }
+    matched.insert(19);  // speaks only when it is debugged
+    EXPECT_EQ(matched.size(), 22U) << testing::PrintToString(matched);
+}
+
+TEST_F(RulesCommand, TriesRulesAndCountsTheirMatches) {
+    folder_.write("more/B.patch/org.qvcontenttagging.intermediate.cache.xml", "<Patch/>");
+    const std::string rules = folder_.write(
+        "r.plist", ruleList({xPathRule("//Channel"), xPathRule("/Patch"),
+                             scriptRule("function main() { return document.isMatchingXPath('//Channel') "
+                                        "? [{label: 'S'}] : []; }")}));
+    const ToolResult result =
+        runTool({"rules", "test", rules, "--json", patch_, folder_.path("more"), folder_.path("none")});
+    EXPECT_EQ(result.status, 1);
+    EXPECT_THAT(result.errors, HasSubstr("none: No such file"));
+    const json report = result.json();
+    EXPECT_EQ(report["items"], 2);
+    const std::tuple<const char*, int> expected[] = {{"XPath", 1}, {"XPath", 2}, {"JavaScript", 1}};
+    ASSERT_EQ(report["rules"].size(), std::size(expected));
+    for (std::size_t i = 0; i < std::size(expected); ++i) {
+        const json& rule = report["rules"][i];
+        EXPECT_EQ(rule["number"], i + 1);
+        EXPECT_EQ(std::tuple(rule["type"], rule["matches"]), expected[i]);
+        EXPECT_GT(rule["microseconds"].get<double>(), 0);
+    }
+    EXPECT_THAT(runTool({"rules", "test", rules, patch_}).output,
+                HasSubstr("matches of 1      time an item\n   1  XPath                      1 "));
+    EXPECT_THAT(runTool({"rules", "--rules", rules, patch_}).output, HasSubstr("   3  JavaScript  S\n"));
+}
+
+TEST_F(RulesCommand, NamesTheRuleThatIsWrong) {
+    const std::string parentheses = std::string(20000, '(') + "1" + std::string(20000, ')');
+    const std::string latin = "file://" + folder_.write("latin.xpath", "/a[@x='\xe9']");
+    const struct {
+        std::string rule, reason;
+    } rows[] = {
+        {xPathRule("/a["), "rule 2: XPath \"/a[\", character 3: "},
+        {xPathRule(parentheses), "rule 2: XPath \"((("},
+        {xPathRule("file://" + folder_.path("none.xpath")), "none.xpath: no such file"},
+        {xPathRule(latin), "latin.xpath: is not UTF-8 text"},
+        {xPathRule("file://" + folder_.path()), ": is a folder"},
+        {"<key>rule</key><string>/a</string>", "rule 2: there is no text under \"tag\""},
+        {"<key>tag</key><string>Mono</string>", "rule 2: there is no text under \"rule\""},
+        {"<key>type</key><string>Lua</string>" + xPathRule("/a"), "rule 2: unknown type \"Lua\""},
+        {scriptRule("var x;\nvar y = ;"), "rule 2: script, line 2: SyntaxError"},
+    };
+    for (const auto& row : rows) {
+        const ToolResult result = tryRules(ruleList({xPathRule("/Patch"), row.rule}));
+        EXPECT_EQ(result.status, 1);
+        EXPECT_EQ(result.json()["rules"][0]["matches"], 1) << row.reason;
+        const std::string first = result.errors.substr(0, result.errors.find('\n'));
+        EXPECT_THAT(first, AllOf(HasSubstr("r.plist: rule 2: "), HasSubstr(row.reason)));
+        EXPECT_LT(result.errors.size(), 1500U) << row.reason;
+    }
+}
+
+TEST_F(RulesCommand, ScriptsThatFailCostOnlyThemselves) {
+    for (const char* script : {"var x = 1;", "function main() { return 'text'; }",
+                               "function main() { return 5; }", "function main() { return [[1]]; }",
+                               "function main() { return [{get label() { throw new Error('no'); }}]; }",
+                               "function main() { for (;;); }", "function main() { return main(); }"}) {
+        const ToolResult result = tryRules(ruleList({scriptRule(script), xPathRule("/Patch")}));
+        EXPECT_EQ(result.json()["rules"][0]["matches"], 0) << script;
+        EXPECT_EQ(result.json()["rules"][1]["matches"], 1) << script;
+        EXPECT_THAT(result.errors, HasSubstr("JavaScript Exception: ")) << script;
+        EXPECT_EQ(lines(result.errors), 1) << script << result.errors;
+    }
+}
+
+TEST_F(RulesCommand, RefusesWhatIsNoRuleFileAndAutotagGoesOnWithout) {
+    const struct {
+        std::string path, reason;
+    } rows[] = {
+        {folder_.path("none.plist"), "none.plist: No such file"},
+        {folder_.path(), ": is a folder"},
+        {folder_.write("latin.plist", "<plist><dict><key>\xe9</key></dict></plist>"), "latin.plist: XML"},
+        {folder_.write("list.plist", "<plist version=\"1.0\"><array/></plist>"), "not a dictionary"},
+    };
+    for (const auto& row : rows) {
+        for (const ToolResult& result : {runTool({"rules", "test", row.path, patch_}),
+                                         runTool({"rules", "--rules", row.path, patch_})}) {
+            EXPECT_EQ(result.status, 1);
+            EXPECT_EQ(result.output, "");
+            EXPECT_THAT(result.errors, HasSubstr(row.reason));
+            EXPECT_EQ(lines(result.errors), 1) << result.errors;
+        }
+        const ToolResult tagged =
+            runTool({"autotag", "--json", "--services", "rules", "--rules", row.path, patch_});
+        EXPECT_EQ(tagged.status, 1);
+        EXPECT_THAT(tagged.errors, AllOf(HasSubstr(row.reason), HasSubstr("using the built-in rules")));
+        EXPECT_EQ(tagged.json()[0]["taggings"].size(), 2U) << row.path;
+    }
+    EXPECT_THAT(tryRules("<plist version=\"1.0\"><dict/></plist>").errors,
+                HasSubstr("r.plist: there is no array under \"DefaultRules\""));
+    EXPECT_EQ(runTool({"rules"}).status, 2);
+    EXPECT_EQ(runTool({"rules", "test", folder_.path("r.plist")}).status, 2);
+}
+
+TEST_F(RulesCommand, AutotagTakesTheRulesOfAFile) {
+    const std::string rules = folder_.write(
+        "r.plist", ruleList({"<key>rule</key><string>//Channel</string><key>tag</key><string>Arpeggiated"
+                             "</string>",
+                             scriptRule("function main() { return [{label: 'Swing', level: 0.6}]; }")}));
+    const json item =
+        runTool({"autotag", "--json", "--services", "rules", "--rules", rules, patch_}).json()[0];
+    std::vector<std::string> labels;
+    for (const json& tagging : item["taggings"]) labels.push_back(tagging["label"]);
+    EXPECT_THAT(labels, testing::UnorderedElementsAre("Arpeggiated", "Swing"));
+}
+
+TEST_F(RulesCommand, HostileDocumentsEndAndReadNothingElse) {
+    std::string bomb = "<!DOCTYPE l [<!ENTITY a 'aaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaa'>";
+    for (char c = 'b'; c < 'l'; ++c) {
+        bomb += std::string("<!ENTITY ") + c + " '";
+        for (int i = 0; i < 16; ++i) bomb += std::string("&") + static_cast<char>(c - 1) + ";";
+        bomb += "'>";
+    }
+    std::string deep;
+    for (int i = 0; i < 10000; ++i) deep += "<a>";
+    const std::string secret = folder_.write("secret.txt", "secret words");
+    const std::string rules = folder_.write(
+        "r.plist",
+        ruleList({xPathRule("//*"), scriptRule("function main() { return [{label: 'got: ' + "
+                                               "(document.JSONString() || '').substr(0, 500)}]; }")}));
+    for (const std::string& xml : {bomb + "]><Patch><c>&k;</c></Patch>", deep,
+                                   "<!DOCTYPE a [<!ENTITY e SYSTEM 'file://" + secret + "'>]><a>&e;</a>"}) {
+        folder_.write("A.patch/org.qvcontenttagging.intermediate.cache.xml", xml);
+        const ToolResult result = runTool({"rules", "--json", "--rules", rules, patch_});
+        EXPECT_EQ(result.status, 0) << result.errors;
+        EXPECT_THAT(result.output, HasSubstr("got: ")) << result.errors;
+        EXPECT_LT(result.output.size(), 100000U);
+        EXPECT_THAT(result.output, testing::Not(HasSubstr("secret words")));
+    }
+}
+
+}  // namespace
+}  // namespace qvct::test
