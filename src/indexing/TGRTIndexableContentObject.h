@@ -43,6 +43,10 @@ class TGRTIndexableContentObject : public Object, public QVContentTaggingIndexab
                                                                                     std::uint64_t options,
                                                                                     Error* error = nullptr);
 
+    /// The object of an item whose record has been read; it may be null. Never null.
+    static std::shared_ptr<TGRTIndexableContentObject> indexableContentObjectForMetaData(
+        const TGRTMetaData* metaData, const URL& url, const TGRTTaxonomy& taxonomy);
+
     // What it is made of.
 
     static std::shared_ptr<TGRTTaxonomy> taxonomyForOptions(std::uint64_t options);
