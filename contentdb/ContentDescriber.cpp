@@ -55,6 +55,7 @@ IndexedTagging indexed(const TGRTTagging& tagging, Provenance provenance, std::s
     if (tagging.level()) result.level = tagging.level()->weight();
     result.provenance = provenance;
     result.service = service;
+    result.isAuto = tagging.isAutoTagging();
     return result;
 }
 
