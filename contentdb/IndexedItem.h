@@ -30,6 +30,8 @@ struct IndexedTagging {
     Provenance provenance = Provenance::stored;
     /// The tagging service, of automatic taggings.
     std::string service;
+    /// A service made it, now or before it was stored.
+    bool isAuto = false;
 
     bool operator==(const IndexedTagging&) const = default;
 };

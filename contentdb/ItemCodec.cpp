@@ -15,6 +15,7 @@ void write(ByteWriter& out, const IndexedTagging& tagging) {
     if (tagging.level) out.number(std::bit_cast<std::uint32_t>(*tagging.level));
     out.number(static_cast<std::uint64_t>(tagging.provenance));
     out.text(tagging.service);
+    out.number(tagging.isAuto ? 1 : 0);
 }
 
 IndexedTagging readTagging(ByteReader& in) {
@@ -25,6 +26,7 @@ IndexedTagging readTagging(ByteReader& in) {
     if (in.number() != 0) tagging.level = std::bit_cast<float>(static_cast<std::uint32_t>(in.number()));
     tagging.provenance = static_cast<Provenance>(in.number());
     tagging.service = in.text();
+    tagging.isAuto = in.number() != 0;
     return tagging;
 }
 

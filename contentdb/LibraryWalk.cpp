@@ -1,5 +1,6 @@
 #include "contentdb/LibraryWalk.h"
 
+#include "contentdb/Digest.h"
 #include "formats/ContentWalk.h"
 #include "platform/QVContentTaggingTypes.h"
 #include "platform/Text.h"
@@ -258,24 +259,15 @@ std::uint64_t countContentNames(const std::string& folder) {
 }
 
 std::uint64_t digestOf(const std::vector<ListedItem>& items) {
-    std::uint64_t state = 0x51776374;
-    const auto add = [&state](std::uint64_t word) {
-        state = (state ^ word) * 0x9e3779b97f4a7c15U;
-        state ^= state >> 32U;
-    };
+    Digest digest;
     for (const ListedItem& item : items) {
-        add(item.name.size());
-        for (std::size_t at = 0; at < item.name.size(); at += 8) {
-            std::uint64_t word = 0;
-            std::memcpy(&word, item.name.data() + at, std::min<std::size_t>(8, item.name.size() - at));
-            add(word);
-        }
-        add(item.stamp.size);
-        add(static_cast<std::uint64_t>(item.stamp.modified));
-        add(static_cast<std::uint64_t>(item.stamp.changed));
-        add(item.stamp.inode);
+        digest.add(item.name);
+        digest.add(item.stamp.size);
+        digest.add(static_cast<std::uint64_t>(item.stamp.modified));
+        digest.add(static_cast<std::uint64_t>(item.stamp.changed));
+        digest.add(item.stamp.inode);
     }
-    return state == 0 ? 1 : state;
+    return digest.value() == 0 ? 1 : digest.value();
 }
 
 }  // namespace qvct::contentdb

@@ -1,5 +1,6 @@
 #include "Commands.h"
 #include "RhythmMeasurement.h"
+#include "Services.h"
 #include "analysis/QVCTRhythmicTaggingService.h"
 #include "autotagging/QVTaggingAggregator.h"
 #include "formats/TGRTFileNode.h"
@@ -9,7 +10,6 @@
 #include "platform/Text.h"
 
 #include <algorithm>
-#include <array>
 #include <memory>
 
 #include <CLI/CLI.hpp>
@@ -17,19 +17,6 @@
 
 namespace qvct::tool {
 namespace {
-
-struct Service {
-    std::string_view name;
-    std::uint64_t option;
-};
-
-constexpr std::array<Service, 7> kServices = {{{"keywords", QVCTAutoTaggingOptionFilenameKeywords},
-                                               {"rules", QVCTAutoTaggingOptionXMLRules},
-                                               {"rhythm", QVCTAutoTaggingOptionRhythm},
-                                               {"content-type", QVCTAutoTaggingOptionContentType},
-                                               {"instruments", QVCTAutoTaggingOptionSoftwareInstruments},
-                                               {"user", QVCTAutoTaggingOptionUserGenerated},
-                                               {"translate", QVCTAutoTaggingOptionTranslateTags}}};
 
 struct Options {
     std::vector<std::string> paths;
@@ -43,31 +30,6 @@ struct Item {
     URL url;
     std::vector<std::shared_ptr<TGRTTagging>> taggings;
 };
-
-std::string serviceNames() {
-    std::vector<std::string> names;
-    names.reserve(kServices.size());
-    for (const Service& service : kServices) names.emplace_back(service.name);
-    return join(names, ", ");
-}
-
-/// The option bits of the services by name; all of them when none is named.
-std::uint64_t optionsForServices(const std::vector<std::string>& names, ToolContext& context) {
-    std::uint64_t bits = 0;
-    for (const std::string& name : names) {
-        const auto* hit = std::find_if(kServices.begin(), kServices.end(),
-                                       [&name](const Service& service) { return service.name == name; });
-        if (hit == kServices.end()) {
-            context.usageFailed(
-                fmt::format("no service \"{}\"; there are: {}", printable(name), serviceNames()));
-        } else {
-            bits |= hit->option;
-        }
-    }
-    if (!names.empty()) return bits;
-    for (const Service& service : kServices) bits |= service.option;
-    return bits;
-}
 
 /// The settings in a file; none, and a line on standard error, when it is not one.
 QVTaggingAggregator::Settings settingsIn(const std::string& file, std::string_view what,
@@ -153,14 +115,15 @@ void addAnyRhythm(const URL& url, const TGRTTaxonomy& taxonomy, ObjectSet<TGRTTa
 }
 
 void run(const Options& options, ToolContext& context) {
-    const std::uint64_t bits = optionsForServices(options.services, context);
+    const auto bits = optionsForServices(options.services, context);
+    if (!bits) return;
     const auto aggregator =
         QVTaggingAggregator::initWithRules(settingsIn(options.rulesFile, "rules", context),
                                            settingsIn(options.keywordsFile, "keywords", context));
     const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
     std::vector<Item> items;
     for (const URL& url : context.contentItems(options.paths)) {
-        auto taggings = aggregator->taggingsWithContentsOfURL(url, *taxonomy, bits);
+        auto taggings = aggregator->taggingsWithContentsOfURL(url, *taxonomy, *bits);
         if (options.measuresAnyRhythm) addAnyRhythm(url, *taxonomy, taggings);
         items.push_back({url, sortedTaggings(taggings)});
     }
@@ -179,9 +142,7 @@ void addAutotagCommand(CLI::App& app, ToolContext& context) {
     const auto options = std::make_shared<Options>();
     auto* command = app.add_subcommand("autotag", "Derives tags for files and for everything below folders");
     command->add_option("paths", options->paths, "Files and folders")->required()->type_name("PATH");
-    command->add_option("--services", options->services, "Only these services: " + serviceNames())
-        ->delimiter(',')
-        ->allow_extra_args(false);
+    addServicesOption(*command, options->services);
     command
         ->add_option("--keywords", options->keywordsFile,
                      "Property list of keywords to use instead of the built-in")

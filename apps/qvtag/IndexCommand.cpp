@@ -1,7 +1,8 @@
 #include "Commands.h"
-#include "Describer.h"
 #include "Progress.h"
+#include "Services.h"
 #include "contentdb/ContentDatabase.h"
+#include "contentdb/ContentDescriber.h"
 #include "contentdb/LibraryWalk.h"
 #include "platform/Text.h"
 
@@ -60,8 +61,9 @@ void printRun(const Json& run, const IndexProgress& progress, const ToolContext&
 }
 
 void run(Options& options, ToolContext& context) {
-    const auto factory = describerFactory(options.services, context);
-    if (!factory) return;
+    const auto services = optionsForServices(options.services, context);
+    if (!services) return;
+    const auto factory = [&services] { return std::make_unique<contentdb::ContentDescriber>(*services); };
     Progress bar(context.quiet);
     IndexOptions& index = options.index;
     index.timeLimitPerItem = std::chrono::seconds(options.secondsPerItem);
@@ -102,7 +104,7 @@ void addIndexCommand(CLI::App& app, ToolContext& context) {
         ->type_name("FILE");
     command->add_flag("--prune", index.prune, "Take items out whose files are gone");
     command->add_flag("--retry", index.retryFailed, "Read items again that failed before");
-    command->add_option("--services", options->services, "Only these services derive tags")->delimiter(',');
+    addServicesOption(*command, options->services);
     auto* part = command->add_option("--part", index.part, "Index only part I of the items")->type_name("I");
     auto* parts = command->add_option("--parts", index.parts, "Into how many parts the items are divided")
                       ->type_name("N");

@@ -3,8 +3,11 @@
 #include "platform/QVContentTaggingTypes.h"
 #include "platform/Text.h"
 #include "platform/Url.h"
+#include "taxonomy/TGRTTagging.h"
+#include "taxonomy/TGRTTaxonomy.h"
 
 #include <algorithm>
+#include <cmath>
 #include <functional>
 #include <map>
 #include <memory>
@@ -36,21 +39,33 @@ std::string_view nameOf(Provenance provenance) {
     return "stored";
 }
 
+/// In tenths; the tag's default level stands in where the tagging has none.
+std::int64_t weightLevelOf(const IndexedTagging& tagging) {
+    const auto level = tagging.level ? TGRTLevel::levelWithWeight(*tagging.level) : nullptr;
+    const auto tag = TGRTTaxonomy::defaultTaxonomy()->findTagForLabel(tagging.label, tagging.category);
+    const auto known = TGRTTagging::initWithTag(tag, level);
+    constexpr float tenths = 10;
+    return known ? known->weightLevel() : std::lround(tagging.level.value_or(1) * tenths);
+}
+
 Json jsonOf(const IndexedTagging& tagging) {
     Json json;
     json["label"] = tagging.label;
     json["parent"] = tagging.ancestors.empty() ? Json() : Json(tagging.ancestors[0]);
     json["category"] = tagging.category;
     json["level"] = tagging.level ? Json(*tagging.level) : Json();
-    json["auto"] = tagging.provenance == Provenance::automatic;
+    json["auto"] = tagging.isAuto;
+    json["weightLevel"] = weightLevelOf(tagging);
     json["provenance"] = nameOf(tagging.provenance);
     json["service"] = tagging.service.empty() ? Json() : Json(tagging.service);
     return json;
 }
 
-Json jsonOf(const IndexedItem& item) {
+Json jsonOf(ContentDatabase& database, ItemId id, const IndexedItem& item) {
     Json json;
+    json["id"] = id;
     json["path"] = item.path;
+    json["earlierPaths"] = database.earlierPaths(id).value_or(std::vector<std::string>());
     json["displayName"] = item.name;
     json["type"] = QVContentTaggingTypes::nameForFileType(item.fileType);
     json["fileType"] = item.fileType;
@@ -130,7 +145,7 @@ void searchItems(const Options& options, ToolContext& context) {
     if (!found) return context.itemFailed(error.message);
     if (context.format != Format::table) {
         Json json = Json::array();
-        for (const Found& one : *found) json.push_back(jsonOf(one.item));
+        for (const Found& one : *found) json.push_back(jsonOf(*database, one.id, one.item));
         return printJson(json, context.format);
     }
     std::vector<const IndexedItem*> items;
@@ -171,7 +186,7 @@ void findSimilar(const Options& options, ToolContext& context) {
     if (context.format != Format::table) {
         Json json = Json::array();
         for (const Similar& one : *found) {
-            json.push_back(jsonOf(one.item));
+            json.push_back(jsonOf(*database, one.id, one.item));
             json.back()["similarity"] = one.similarity;
         }
         return printJson(json, context.format);

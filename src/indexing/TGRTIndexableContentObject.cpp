@@ -78,18 +78,23 @@ std::shared_ptr<TGRTIndexableContentObject> TGRTIndexableContentObject::indexabl
     const bool isKnown = record && record->fileType() != kFileTypeNone;
     if (!isKnown && (options & kIndexWithoutRecord) == 0) return nullptr;
 
+    return indexableContentObjectForMetaData(record.get(), url, *taxonomy);
+}
+
+std::shared_ptr<TGRTIndexableContentObject> TGRTIndexableContentObject::indexableContentObjectForMetaData(
+    const TGRTMetaData* metaData, const URL& url, const TGRTTaxonomy& taxonomy) {
     auto object = init();
-    const std::string name = record ? record->displayName().value_or("") : "";
+    const std::string name = metaData != nullptr ? metaData->displayName().value_or("") : "";
     object->setDisplayName(name.empty() ? url.lastPathComponentWithoutExtension() : name);
     object->setPreviewAvailable(QVContentEditorFileUtilities::prelistenURLForURL(url).has_value());
-    object->setTaggingDatas(taggingsByAddingVirtualTagsToTaggings(record ? record->taggings() : Taggings(),
-                                                                  record.get(), *taxonomy));
-    if (!record) return object;
-    object->setFileType(record->fileType());
-    object->setSubFileType(record->subFileType());
-    object->setValueDatas(record->keyValues());
-    object->setPackageIdentifiers(packageIdentifierFromTaggings(record->taggings()));
-    if (record->contentInfo()) object->setDependencyItems(record->contentInfo()->assetDependencyItems());
+    object->setTaggingDatas(taggingsByAddingVirtualTagsToTaggings(
+        metaData != nullptr ? metaData->taggings() : Taggings(), metaData, taxonomy));
+    if (metaData == nullptr) return object;
+    object->setFileType(metaData->fileType());
+    object->setSubFileType(metaData->subFileType());
+    object->setValueDatas(metaData->keyValues());
+    object->setPackageIdentifiers(packageIdentifierFromTaggings(metaData->taggings()));
+    if (metaData->contentInfo()) object->setDependencyItems(metaData->contentInfo()->assetDependencyItems());
     return object;
 }
 

@@ -44,6 +44,10 @@ class QVCT_API TGRTIndexableContentObject : public Object, public QVContentTaggi
                                                                                     std::uint64_t options,
                                                                                     Error* error = nullptr);
 
+    /// The object of an item whose record has been read; it may be null. Never null.
+    static std::shared_ptr<TGRTIndexableContentObject> indexableContentObjectForMetaData(
+        const TGRTMetaData* metaData, const URL& url, const TGRTTaxonomy& taxonomy);
+
     // What it is made of.
 
     static std::shared_ptr<TGRTTaxonomy> taxonomyForOptions(std::uint64_t options);

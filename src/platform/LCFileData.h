@@ -19,6 +19,8 @@ struct LCAudioFacts {
     std::uint64_t frameCount = 0;
     std::uint32_t channelCount = 0;
     std::uint32_t bitsPerSample = 0;  ///< 0 where the coding has no such number.
+    std::uint64_t audioOffset = 0;    ///< Of the sound's bytes in the file.
+    std::uint64_t audioSize = 0;      ///< Of the sound in bytes, as far as the file reaches; 0 for none.
 
     bool isLoop = false;        ///< A chunk of another maker says so.
     bool isAuthored = false;    ///< That chunk is one that only an editor of loops writes.

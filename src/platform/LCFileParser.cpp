@@ -40,6 +40,10 @@ std::shared_ptr<LCFileData> read(ReadWindow& window, std::string_view name, unsi
     const auto container = Container::open(window, name, error);
     LCAudioFacts facts;
     if (!container || !container->readFacts(facts, error)) return nullptr;
+    if (const Chunk* sound = container->find(Chunk::Role::audio)) {
+        facts.audioOffset = sound->contents;
+        facts.audioSize = sound->size;
+    }
     auto record = readRecord(*container);
     if (container->isRecordAlone() && !record) {
         fail(error, kErrorMalformed, "holds no record that can be read (byte 0)");

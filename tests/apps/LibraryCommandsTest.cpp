@@ -1,6 +1,8 @@
+#include "support/AudioFixtures.h"
 #include "support/RunTool.h"
 
 #include <filesystem>
+#include <set>
 
 #include <gmock/gmock.h>
 #include <unistd.h>
@@ -15,12 +17,19 @@ using testing::HasSubstr;
 class LibraryCommands : public testing::Test {
   protected:
     LibraryCommands() {
-        for (const char* name : {"Drums/Dark Kick 01.wav", "Drums/House Snare.wav", "Drums/Techno Kick.aif",
-                                 "Pads/Warm Pad.cst", "Pads/Deep House Bass.caf"}) {
-            folder_.write(std::string("sounds/") + name, name);
-        }
-        ::usleep(40000);
+        const std::string wav = Wav().file(Wav().format() + Wav().data());
+        const std::pair<const char*, std::string> files[] = {
+            {"Drums/Dark Kick 01.wav", wav},
+            {"Drums/House Snare.wav", Wav().file(Wav().format() + Wav().data(5000))},
+            {"Drums/Techno Kick.aif", Aiff::file(Aiff::common() + Aiff::sound())},
+            {"Pads/Warm Pad.cst", "settings"},
+            {"Pads/Deep House Bass.caf", Caf::file(Caf::description() + Caf::data())}};
+        for (const auto& [name, bytes] : files) folder_.write(std::string("sounds/") + name, bytes);
+        settle();
     }
+
+    /// Until what was written is older than a tick of the file system's clock.
+    static void settle() { ::usleep(40000); }
 
     ToolResult index(std::vector<std::string> more = {}, const std::string& database = "db") const {
         std::vector<std::string> arguments = {"index", folder_.path("sounds"), "--json", "--db",
@@ -66,6 +75,67 @@ TEST_F(LibraryCommands, IndexAndFind) {
     }
     EXPECT_TRUE(hasKick);
     EXPECT_EQ(run({"search", "", "--limit", "2"}).json().size(), 2U);
+}
+
+TEST_F(LibraryCommands, KnowItemsAgainThatWereMovedAndTagged) {
+    index();
+    const auto idOf = [this](const std::string& query) {
+        const json found = run({"search", query}).json();
+        return found.size() == 1 ? found[0]["id"].get<int>() : -1;
+    };
+    const int kick = idOf("dark");
+    const int snare = idOf("snare");
+    const int bass = idOf("bass");
+    const int pad = idOf("name:pad");
+    const std::string sounds = folder_.path("sounds");
+    std::filesystem::create_directories(sounds + "/New");
+    std::filesystem::rename(sounds + "/Drums/Dark Kick 01.wav", sounds + "/New/Thump.wav");
+    const auto write = [](const std::string& path) {
+        EXPECT_EQ(runTool({"write", "--add", "Genres/Jazz", path}).status, 0);
+    };
+    write(sounds + "/New/Thump.wav");
+    write(sounds + "/Drums/House Snare.wav");
+    write(sounds + "/Pads/Deep House Bass.caf");
+    std::filesystem::rename(sounds + "/Pads", sounds + "/Warm");
+    write(sounds + "/Warm/Warm Pad.cst");
+    settle();
+    const json again = index({"--prune"}).json();
+    EXPECT_EQ(again["indexed"], 4);
+    EXPECT_EQ(again["moved"], 3);
+    EXPECT_EQ(again["pruned"], 0);
+    EXPECT_EQ(idOf("thump genre:jazz"), kick);
+    EXPECT_EQ(idOf("snare genre:jazz"), snare);
+    EXPECT_EQ(idOf("bass genre:jazz"), bass);
+    EXPECT_EQ(idOf("name:pad genre:jazz"), pad);
+    const json thump = run({"search", "thump"}).json()[0];
+    EXPECT_EQ(thump["earlierPaths"], json({sounds + "/Drums/Dark Kick 01.wav"}));
+    EXPECT_EQ(names("").size(), 5U);
+    EXPECT_EQ(runTool({"db", "check", folder_.path("db")}).status, 0);
+}
+
+TEST_F(LibraryCommands, TagByTheNamedServicesAndTakeTheFoldersBehind) {
+    const ToolResult result = runTool({"index", "--db", folder_.path("db"), "--json", "--services",
+                                       "content-type,user", folder_.path("sounds")});
+    ASSERT_EQ(result.status, 0) << result.errors;
+    EXPECT_EQ(result.json()["indexed"], 5);
+    std::set<std::string> services;
+    for (const json& item : run({"search", ""}).json()) {
+        for (const json& tagging : item["taggings"])
+            services.insert(tagging["service"].is_null() ? tagging["provenance"] : tagging["service"]);
+    }
+    EXPECT_THAT(services, ElementsAre("content-type", "user"));
+    const ToolResult wrong = index({"--services", "keywords,magic"});
+    EXPECT_EQ(wrong.status, 2);
+    EXPECT_THAT(wrong.errors, HasSubstr("no service \"magic\""));
+}
+
+TEST_F(LibraryCommands, NameWhatCannotBeRead) {
+    folder_.write("sounds/broken.wav", "RIFF");
+    const ToolResult result = index();
+    EXPECT_EQ(result.status, 1);
+    EXPECT_THAT(result.errors, HasSubstr("broken.wav"));
+    EXPECT_EQ(result.json()["failed"], 1);
+    EXPECT_THAT(runTool({"db", "check", folder_.path("db")}).output, HasSubstr("broken.wav"));
 }
 
 TEST_F(LibraryCommands, CountTagsAndFindSimilar) {

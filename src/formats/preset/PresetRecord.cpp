@@ -1,7 +1,10 @@
 #include "formats/preset/PresetRecord.h"
 
 #include "platform/TaggingTypes.h"
+#include "platform/Text.h"
 
+#include <algorithm>
+#include <array>
 #include <charconv>
 #include <optional>
 #include <unordered_map>
@@ -179,6 +182,22 @@ void setDescription(PresetText& preset, const TGRTMetaData& record) {
         }
     }
     preset.setItems(kMetaData, owned, items);
+}
+
+std::string textWithoutRecord(const PresetText& preset) {
+    constexpr std::array sectionsOfRecord = {kMetaData, kTagging, kApplicationInfo, kAssetDependencies};
+    const std::string text = preset.text();
+    std::string result;
+    std::size_t end = 0;
+    for (const PresetText::Section& section : preset.sections()) {
+        const auto* const hit = std::find(sectionsOfRecord.begin(), sectionsOfRecord.end(), section.name);
+        if (hit == sectionsOfRecord.end()) continue;
+        result.append(text, end, section.offset - end);
+        end = section.offset + section.size;
+    }
+    result.append(text, end);
+    // Before a section that is added the last line is ended.
+    return std::string(trimBlanksAndLineBreaks(result));
 }
 
 }  // namespace qvct

@@ -19,4 +19,7 @@ void setContentInfo(PresetText& preset, const TGRTContentInfo& contentInfo);
 /// Replaces display name and key values, and the sub type unless the record has none.
 void setDescription(PresetText& preset, const TGRTMetaData& record);
 
+/// The text without the sections that hold a record: it stays the same whatever record is written.
+std::string textWithoutRecord(const PresetText& preset);
+
 }  // namespace qvct

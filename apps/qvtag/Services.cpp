@@ -1,0 +1,45 @@
+#include "Services.h"
+
+#include "autotagging/TaggingServiceNames.h"
+#include "platform/Text.h"
+
+#include <algorithm>
+
+#include <CLI/CLI.hpp>
+#include <fmt/format.h>
+
+namespace qvct::tool {
+namespace {
+
+std::string allNames() {
+    std::vector<std::string> names;
+    for (const TaggingServiceName& service : kTaggingServiceNames) names.emplace_back(service.name);
+    return join(names, ", ");
+}
+
+}  // namespace
+
+void addServicesOption(CLI::App& command, std::vector<std::string>& names) {
+    command.add_option("--services", names, "Only these services derive tags: " + allNames())
+        ->delimiter(',')
+        ->allow_extra_args(false)
+        ->type_name("A,B");
+}
+
+std::optional<std::uint64_t> optionsForServices(const std::vector<std::string>& names, ToolContext& context) {
+    if (names.empty()) return optionsForAllTaggingServices();
+    std::uint64_t options = 0;
+    for (const std::string& name : names) {
+        const auto* const hit =
+            std::find_if(kTaggingServiceNames.begin(), kTaggingServiceNames.end(),
+                         [&name](const TaggingServiceName& service) { return service.name == name; });
+        if (hit == kTaggingServiceNames.end()) {
+            context.usageFailed(fmt::format("no service \"{}\"; there are: {}", printable(name), allNames()));
+            return std::nullopt;
+        }
+        options |= hit->option;
+    }
+    return options;
+}
+
+}  // namespace qvct::tool

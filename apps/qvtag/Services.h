@@ -1,0 +1,23 @@
+#pragma once
+
+#include "ToolContext.h"
+
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <vector>
+
+namespace CLI {
+class App;
+}
+
+namespace qvct::tool {
+
+/// Adds "--services": one list, behind which paths may follow.
+void addServicesOption(CLI::App& command, std::vector<std::string>& names);
+
+/// The options of the services by name; of all of them when none is named. Nothing after a wrong name, which
+/// is reported.
+std::optional<std::uint64_t> optionsForServices(const std::vector<std::string>& names, ToolContext& context);
+
+}  // namespace qvct::tool

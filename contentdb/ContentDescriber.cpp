@@ -1,0 +1,179 @@
+#include "contentdb/ContentDescriber.h"
+
+#include "autotagging/QVCTXMLDocument.h"
+#include "autotagging/QVTaggingAggregator.h"
+#include "contentdb/PayloadHash.h"
+#include "formats/TGRTMetaDataReaderFactory.h"
+#include "indexing/TGRTIndexableContentObject.h"
+#include "platform/LCFileData.h"
+#include "platform/QVContentTaggingTypes.h"
+#include "platform/RegularExpression.h"
+#include "platform/Text.h"
+
+#include <array>
+#include <cmath>
+#include <utility>
+
+namespace qvct::contentdb {
+namespace {
+
+using Taggings = ObjectSet<TGRTTagging>;
+
+/// Asks one service after the other about an item that is prepared once.
+class OneItemAggregator : public QVTaggingAggregator {
+  public:
+    OneItemAggregator() : QVTaggingAggregator(defaultTaggingServicesWithRules(std::nullopt, std::nullopt)) {}
+
+    void prepare(const URL& url, std::shared_ptr<TGRTMetaData> record, std::uint64_t services) {
+        constexpr std::uint64_t readersOfXml = QVCTAutoTaggingOptionXMLRules |
+                                               QVCTAutoTaggingOptionSoftwareInstruments |
+                                               QVCTAutoTaggingOptionContentType;
+        xmlDocument_ = (services & readersOfXml) != 0 ? QVTaggingAggregator::xmlDocumentForURL(url) : nullptr;
+        fileData_ = QVTaggingAggregator::fileDataForURL(url);
+        record_ = std::move(record);
+    }
+    const std::shared_ptr<LCFileData>& fileData() const { return fileData_; }
+
+    std::shared_ptr<QVCTXMLDocument> xmlDocumentForURL(const URL& /*url*/) override { return xmlDocument_; }
+    std::shared_ptr<TGRTMetaData> metaDataForURL(const URL& /*url*/, std::uint64_t /*options*/) override {
+        return record_;
+    }
+    std::shared_ptr<LCFileData> fileDataForURL(const URL& /*url*/) override { return fileData_; }
+
+  private:
+    std::shared_ptr<QVCTXMLDocument> xmlDocument_;
+    std::shared_ptr<TGRTMetaData> record_;
+    std::shared_ptr<LCFileData> fileData_;
+};
+
+IndexedTagging indexed(const TGRTTagging& tagging, Provenance provenance, std::string_view service) {
+    IndexedTagging result;
+    result.label = tagging.label();
+    result.category = tagging.category();
+    for (auto above = tagging.tag()->parent(); above; above = above->parent())
+        result.ancestors.push_back(above->label());
+    if (tagging.level()) result.level = tagging.level()->weight();
+    result.provenance = provenance;
+    result.service = service;
+    result.isAuto = tagging.isAutoTagging();
+    return result;
+}
+
+/// Adds those that are not there yet.
+void addTaggings(IndexedItem& item, Taggings& known, const Taggings& added, Provenance provenance,
+                 std::string_view service = {}) {
+    for (const auto& tagging : added) {
+        if (known.insert(tagging)) item.taggings.push_back(indexed(*tagging, provenance, service));
+    }
+}
+
+/// Whether the number only says that nothing is known.
+bool isUnknown(std::string_view key, double value) {
+    constexpr std::array zeroIfUnknown = {QVContentKeyLengthInSeconds, QVContentKeyBeatCount,
+                                          QVContentKeySignatureTop, QVContentKeySignatureBottom};
+    if (key == QVContentKeyMidiRootNote) return value < 0;
+    return value == 0 && std::find(zeroIfUnknown.begin(), zeroIfUnknown.end(), key) != zeroIfUnknown.end();
+}
+
+bool hasValue(const IndexedItem& item, std::string_view key) {
+    return std::any_of(item.values.begin(), item.values.end(),
+                       [key](const IndexedValue& value) { return value.key == key; });
+}
+
+void addNumber(IndexedItem& item, std::string_view key, double number) {
+    if (std::isfinite(number) && !isUnknown(key, number) && !hasValue(item, key))
+        item.values.push_back({std::string(key), number});
+}
+
+void addValues(IndexedItem& item, const ObjectSet<TGRTKeyValue>& values) {
+    for (const auto& keyValue : values) {
+        const auto value = keyValue->value();
+        if (!value) continue;
+        if (value->string() != nullptr) {
+            item.values.push_back({keyValue->key(), *value->string()});
+        } else if (const auto number = value->doubleValue()) {
+            addNumber(item, keyValue->key(), *number);
+        }
+    }
+}
+
+}  // namespace
+
+struct ContentDescriber::Implementation {
+    explicit Implementation(std::uint64_t options) : services(options) {}
+
+    // The record may name tags of the user's own; services speak of the taxonomy's.
+    static constexpr std::uint64_t kOptions = kIndexInMutableTaxonomy | kIndexWithoutRecord;
+    std::shared_ptr<TGRTTaxonomy> taxonomyOfRecords =
+        TGRTIndexableContentObject::taxonomyForOptions(kOptions);
+    std::shared_ptr<TGRTTaxonomy> taxonomyOfServices = TGRTTaxonomy::defaultTaxonomy();
+    std::uint64_t services;
+    OneItemAggregator aggregator;
+    RegularExpression namedTempo = *RegularExpression::compile(
+        R"((?<![\d.,])(\d{2,3}(?:[.,]\d+)?)[\s_-]?bpm(?![\p{L}\d]))", RegularExpression::Case::insensitive);
+
+    std::shared_ptr<TGRTMetaData> record(const URL& url, Error& error) const {
+        const auto reader = TGRTMetaDataReaderFactory::metaDataReaderForURL(url, taxonomyOfRecords);
+        return reader ? reader->readMetaDataFromURL(url, kOptions, &error) : nullptr;
+    }
+
+    void addAllTaggings(IndexedItem& item, const URL& url, const TGRTMetaData* record,
+                        const Taggings& withVirtual) {
+        Taggings known;
+        if (record != nullptr) addTaggings(item, known, record->taggings(), Provenance::stored);
+        addTaggings(item, known, withVirtual, Provenance::virtualTag);
+        for (const auto& [name, option] : kTaggingServiceNames) {
+            if ((services & option) == 0) continue;
+            addTaggings(item, known, aggregator.taggingsWithContentsOfURL(url, *taxonomyOfServices, option),
+                        Provenance::automatic, name);
+        }
+    }
+
+    void addTempoAndBeats(IndexedItem& item, const std::string& fileName) {
+        if (const auto& file = aggregator.fileData()) {
+            addNumber(item, QVContentKeyBeatCount, file->beatCount());
+            if (file->bpm() > 0) addNumber(item, "Tempo", double{file->bpm()});
+        }
+        if (hasValue(item, "Tempo")) return;
+        const std::u16string text = utf16FromUtf8(fileName);
+        const auto match = namedTempo.firstMatch(text);
+        if (match.size() < 2) return;
+        const auto number = std::u16string_view(text).substr(match[1].start, match[1].end - match[1].start);
+        addNumber(item, "Tempo", leadingNumber(replaceAll(utf8FromUtf16(number), ",", ".")));
+    }
+};
+
+ContentDescriber::ContentDescriber(std::uint64_t services)
+    : implementation_(std::make_unique<Implementation>(services)) {}
+
+ContentDescriber::~ContentDescriber() = default;
+
+std::optional<IndexedItem> ContentDescriber::describe(const std::string& path, Error* error) {
+    Implementation& its = *implementation_;
+    const URL url = URL::fileURLWithPath(path);
+    Error reason;
+    const auto record = its.record(url, reason);
+    if (!reason.message.empty()) {
+        if (error != nullptr) *error = reason;
+        return std::nullopt;
+    }
+    const auto object = TGRTIndexableContentObject::indexableContentObjectForMetaData(record.get(), url,
+                                                                                      *its.taxonomyOfRecords);
+    its.aggregator.prepare(url, record, its.services);
+    IndexedItem item;
+    item.name = object->displayName();
+    item.fileType = object->fileType();
+    if (item.fileType == kFileTypeNone) item.fileType = QVContentTaggingTypes::fallBackFileTypeForURL(url);
+    item.subFileType = object->subFileType();
+    item.previewAvailable = object->previewAvailable();
+    item.packs.assign(object->packageIdentifiers().begin(), object->packageIdentifiers().end());
+    for (const auto& dependency : object->dependencyItems())
+        item.dependencies.push_back({dependency->UUID(), dependency->path()});
+    its.addAllTaggings(item, url, record.get(), object->taggingDatas());
+    addValues(item, object->valueDatas());
+    its.addTempoAndBeats(item, url.lastPathComponent());
+    item.payloadHash = payloadHash(url, its.aggregator.fileData().get());
+    return item;
+}
+
+}  // namespace qvct::contentdb
