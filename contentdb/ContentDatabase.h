@@ -33,6 +33,8 @@ class QVCT_API ContentDatabase {
     std::optional<Vocabulary> vocabulary(Error* error = nullptr);
     /// At most `limit` items, in the query's order.
     std::optional<std::vector<Found>> search(const Query& query, std::size_t limit, Error* error = nullptr);
+    /// How many items the query finds.
+    /// @cost  That of `search` without reading what the index decides.
     std::optional<std::int64_t> count(const Query& query, Error* error = nullptr);
     /// How many of the found items have each tag, the most frequent first.
     std::optional<std::vector<Facet>> facets(const Query& query, Error* error = nullptr);
@@ -44,10 +46,12 @@ class QVCT_API ContentDatabase {
     /// Where the item was before it was moved.
     std::optional<std::vector<std::string>> earlierPaths(ItemId id, Error* error = nullptr);
 
+    /// What the database holds.
     struct Totals {
-        std::int64_t items = 0;
-        std::int64_t failures = 0;
+        std::int64_t items = 0;     ///< All items, the failed ones too.
+        std::int64_t failures = 0;  ///< Items that could not be read.
     };
+    /// The totals, counted anew. @cost O(items) in the worst case.
     std::optional<Totals> totals(Error* error = nullptr);
     /// Calls `visit` with each item that could not be read, until it answers false.
     bool forEachFailure(const std::function<bool(const IndexedItem&)>& visit, Error* error = nullptr);

@@ -44,6 +44,7 @@ struct IndexedValue {
     bool operator==(const IndexedValue&) const = default;
 };
 
+/// A file that the item needs.
 struct IndexedDependency {
     std::string uuid;
     std::string path;

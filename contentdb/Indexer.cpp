@@ -61,6 +61,7 @@ std::optional<IndexProgress> indexLibrary(const IndexOptions& options, const Des
     if (options.parts == 0 || options.part == 0 || options.part > options.parts)
         return refuse(kErrorInvalidArgument,
                       fmt::format("there is no part {} of {}", options.part, options.parts));
+    if (!factory) return refuse(kErrorInvalidArgument, "there is nothing that describes items");
     std::vector<std::string> folders;
     for (const std::string& folder : options.folders) {
         folders.push_back(URL::fileURLWithPath(folder).path());

@@ -24,9 +24,11 @@ struct IndexProgress {
     std::uint64_t pruned = 0;     ///< of these, taken out of the index
 };
 
+/// What a run is to do. Only `folders` and `database` have to be given.
 struct IndexOptions {
     /// Folders to walk.
     std::vector<std::string> folders;
+    /// Path of the database; made when there is none.
     std::string database;
     /// Takes items out of the index whose files are gone.
     bool prune = false;

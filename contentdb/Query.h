@@ -16,6 +16,7 @@ namespace qvct::contentdb {
 
 /// Something of an item that a query can name.
 struct Field {
+    /// Which of an item's texts, sets or numbers.
     enum class Kind { name, path, type, pack, tag, key, level, number };
     Kind kind = Kind::name;
     /// The category (folded; empty for any) of `tag`, the label of `level`, the key (bare) of `number`.
@@ -44,10 +45,12 @@ struct NumberMatch {
     bool includesLow = true;
     bool includesHigh = true;
 
+    /// Whether the value lies in the range.
     bool contains(double value) const {
         return (includesLow ? value >= low : value > low) && (includesHigh ? value <= high : value < high);
     }
 };
+/// The item is of that FileType.
 struct TypeMatch {
     std::int64_t type;
 };
@@ -64,21 +67,26 @@ struct ExpressionMatch {
 
 /// A condition on an item: a tree of all, any and not over matches.
 struct Condition;
+/// Every part holds; so does none at all.
 struct AllOf {
     std::vector<Condition> parts;
 };
+/// At least one part holds.
 struct AnyOf {
     std::vector<Condition> parts;
 };
+/// No part holds.
 struct NoneOf {
     std::vector<Condition> parts;
 };
+/// One node of the tree.
 struct Condition {
     std::variant<AllOf, AnyOf, NoneOf, WordsMatch, TagMatch, NumberMatch, TypeMatch, TextMatch,
                  ExpressionMatch>
         is;
 };
 
+/// What a query sorts by.
 struct SortKey {
     Field field;
     bool isDescending = false;

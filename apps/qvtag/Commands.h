@@ -8,6 +8,9 @@ class App;
 
 namespace qvct::tool {
 
+/// `generate`, hidden: what the build makes of the command line.
+void addGenerateCommand(CLI::App& app);
+
 /// Each adds one command to the tool. A command reports what fails through the context and never throws.
 void addAutotagCommand(CLI::App& app, ToolContext& context);
 void addInspectCommand(CLI::App& app, ToolContext& context);

@@ -50,6 +50,7 @@ int run(int argc, char** argv) {
     app.parse_complete_callback([&context] { context.prepare(); });
     qvct::tool::addAutotagCommand(app, context);
     qvct::tool::addDatabaseCommand(app, context);
+    qvct::tool::addGenerateCommand(app);
     qvct::tool::addIndexCommand(app, context);
     qvct::tool::addInspectCommand(app, context);
     qvct::tool::addKeywordsCommand(app, context);

@@ -34,6 +34,7 @@ class QVCT_API QVCTKeywordExtractor {
   public:
     /// From the resource folder, else compiled in.
     static PropertyList::Dictionary defaultKeywordMapping();
+    /// A new extractor with the default mapping and taxonomy.
     static std::shared_ptr<QVCTKeywordExtractor> defaultKeywordExtractor();
     /// Null, and an error, when the file is not a readable dictionary.
     static std::shared_ptr<QVCTKeywordExtractor> keywordExtractorWithKeywordMappingDictionaryURL(

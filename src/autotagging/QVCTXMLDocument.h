@@ -53,6 +53,7 @@ class QVCT_API QVCTXMLDocument : public QVCTXMLDocumentExport {
     std::vector<std::shared_ptr<QVSKXMLNode>> nodesForXPath(std::string_view expression) const;
     /// The first of them, or null. Does not look for the others where the expression allows it.
     std::shared_ptr<QVSKXMLNode> firstNodeForXPath(std::string_view expression) const;
+    /// Whether the expression selects a node.
     bool anyNodesForXPath(std::string_view expression) const;
 
     bool isMatchingXPath(std::string_view expression) const override;
@@ -61,6 +62,7 @@ class QVCT_API QVCTXMLDocument : public QVCTXMLDocumentExport {
 
     /// The document as XML, not indented anew; empty when there is no content.
     std::string XMLData() const;
+    /// The JSON of a document's XML text; nothing when it has no content.
     static std::optional<std::string> JSONStringWithData(std::string_view data);
 
     /// The script context in which the document is exposed at this time. Not used by the document itself.

@@ -38,6 +38,7 @@ struct RuleProblem {
 /// Immutable: safe from every thread, each with documents of its own.
 class QVCT_API QVCTXMLRulesTaggingService : public QVCTAutoTaggingService {
   public:
+    /// With the default rules.
     static std::shared_ptr<QVCTXMLRulesTaggingService> init();
     /// Without rules the default ones.
     static std::shared_ptr<QVCTXMLRulesTaggingService> initWithRules(

@@ -32,7 +32,23 @@ std::shared_ptr<TGRTTagging> taggingForTagDictionary(const TagDictionary& dictio
     return tagging;
 }
 
+/// Reads records in a taxonomy of its own.
+class IndependentAggregator : public QVTaggingAggregator {
+  public:
+    IndependentAggregator()
+        : QVTaggingAggregator(defaultTaggingServicesWithRules(std::nullopt, std::nullopt)) {
+        setTaxonomy(TGRTTaxonomy::newTaxonomyOfType(kDefaultTaxonomy, false, false));
+    }
+    std::shared_ptr<TGRTMetaData> metaDataForURL(const URL& url, std::uint64_t options) override {
+        return TGRTFileNode::nodeWithFileURL(url)->readMetaDataWithOptions(options, taxonomy());
+    }
+};
+
 }  // namespace
+
+std::shared_ptr<QVTaggingAggregator> QVTaggingAggregator::independentTaggingAggregator() {
+    return std::make_shared<IndependentAggregator>();
+}
 
 std::shared_ptr<QVTaggingAggregator> QVTaggingAggregator::defaultTaggingAggregator() {
     auto aggregator = initWithRules(std::nullopt, std::nullopt);
@@ -55,6 +71,10 @@ QVTaggingAggregator::Services QVTaggingAggregator::defaultTaggingServicesWithRul
             QVCTSoftwareInstrumentTaggingService::init(),
             std::make_shared<QVCTUserGeneratedTaggingService>(),
             std::make_shared<QVCTTranslateTagsTaggingService>()};
+}
+
+QVTaggingAggregator::QVTaggingAggregator(Services services) : taggingServices_(std::move(services)) {
+    std::erase(taggingServices_, nullptr);
 }
 
 std::shared_ptr<QVCTXMLDocument> QVTaggingAggregator::xmlDocumentForURL(const URL& url) {

@@ -17,8 +17,9 @@ namespace qvct {
 
 /// Derives tags for content items: asks every tagging service that the options name and merges their answers.
 ///
-/// Nothing is kept between calls but what the services cache. The keyword service works from one thread at a
-/// time, so give each thread an aggregator of its own.
+/// Nothing is kept between calls but what the services cache. An aggregator works from one thread at a time:
+/// the keyword service does, and records are read in the shared writable default taxonomy, which they may add
+/// labels to. Threads that are to work at the same time each take an `independentTaggingAggregator`.
 class QVCT_API QVTaggingAggregator {
   public:
     using Services = std::vector<std::shared_ptr<QVCTAutoTaggingService>>;
@@ -26,8 +27,13 @@ class QVCT_API QVTaggingAggregator {
 
     /// With the built-in rules and keywords, for the default taxonomy.
     static std::shared_ptr<QVTaggingAggregator> defaultTaggingAggregator();
+    /// The same with a writable copy of the default taxonomy for itself, in which it reads records: nothing
+    /// that it changes is shared with another one.
+    static std::shared_ptr<QVTaggingAggregator> independentTaggingAggregator();
     /// With rules and keywords of the host's own; nothing stands for the built-in ones.
     static std::shared_ptr<QVTaggingAggregator> initWithRules(Settings rules, Settings keywordMapping);
+    /// The services of such an aggregator, in the order in which it asks them: to be handed, with services of
+    /// the host's own, to a subclass.
     static Services defaultTaggingServicesWithRules(Settings rules, Settings keywordMapping);
 
     virtual ~QVTaggingAggregator() = default;
@@ -45,12 +51,17 @@ class QVCT_API QVTaggingAggregator {
     // What the services are given of an item: prepared once a call, each null where the item has none. A host
     // that has one at hand overrides.
 
+    /// The XML description in or beside the item.
     virtual std::shared_ptr<QVCTXMLDocument> xmlDocumentForURL(const URL& url);
+    /// The stored record. `options` are MetaDataReaderOptions.
     virtual std::shared_ptr<TGRTMetaData> metaDataForURL(const URL& url, std::uint64_t options);
+    /// What the chunks of an audio file say. The type is opaque to hosts: pass on what the base class
+    /// answers.
     virtual std::shared_ptr<LCFileData> fileDataForURL(const URL& url);
 
   protected:
-    explicit QVTaggingAggregator(Services services) : taggingServices_(std::move(services)) {}
+    /// Null services are left out.
+    explicit QVTaggingAggregator(Services services);
 
   private:
     Services taggingServices_;

@@ -12,7 +12,9 @@ namespace qvct {
 /// What tagging services produce: a "label" and, where the tag has a weight, a "level".
 using TagDictionary = PropertyList::Dictionary;
 
+/// Key of a tag dictionary's label, a string.
 inline constexpr std::string_view kTagDictionaryLabelKey = "label";
+/// Key of its level, a number in [0, 1].
 inline constexpr std::string_view kTagDictionaryLevelKey = "level";
 
 /// Tag dictionaries, each once, in the order in which they were added. Two are the same only when all their
@@ -22,9 +24,11 @@ class TagDictionarySet {
     using value_type = TagDictionary;
     using const_iterator = std::vector<TagDictionary>::const_iterator;
 
+    /// Adds the dictionary unless the same one is there.
     void insert(TagDictionary dictionary) {
         if (std::find(begin(), end(), dictionary) == end()) dictionaries_.push_back(std::move(dictionary));
     }
+    /// Adds each dictionary that is not there yet.
     void insertAll(const TagDictionarySet& other) {
         for (const TagDictionary& dictionary : other) insert(dictionary);
     }

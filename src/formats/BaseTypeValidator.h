@@ -14,8 +14,11 @@ class BaseTypeValidator : public TGRTContentNodeTypeValidator {
   public:
     /// Resolves labels in the shared writable default taxonomy.
     std::shared_ptr<TGRTBaseMetaDataReader> readerForFileURL(const URL& url) const {
-        return isValidContentTypeAtFileURL(url) ? makeReader(TGRTTaxonomy::mutableDefaultTaxonomy())
-                                                : nullptr;
+        return readerForFileURL(url, TGRTTaxonomy::mutableDefaultTaxonomy());
+    }
+    std::shared_ptr<TGRTBaseMetaDataReader> readerForFileURL(
+        const URL& url, const std::shared_ptr<TGRTTaxonomy>& taxonomy) const {
+        return taxonomy && isValidContentTypeAtFileURL(url) ? makeReader(taxonomy) : nullptr;
     }
     std::shared_ptr<TGRTMetaDataReader> metaDataReaderForFileURL(const URL& url) const override {
         return readerForFileURL(url);

@@ -39,12 +39,17 @@ class Walk {
         const URL url = URL::fileURLWithPath(path);
         struct stat status {};
         if (::stat(url.path().c_str(), &status) != 0) return fail(url);
-        if (!S_ISDIR(status.st_mode) || isBundleName(url)) return item_(url);
+        if (!S_ISDIR(status.st_mode) || isBundleName(url)) return item(url);
         folder(url, {status.st_dev, status.st_ino});
     }
 
   private:
+    void item(const URL& url) {
+        if (item_) item_(url);
+    }
+
     void fail(const URL& url) {
+        if (!failed_) return;
         failed_({std::string(QVCTErrorDomain), kErrorUnreadable,
                  fmt::format("{}: {}", printable(url.path()), std::strerror(errno))});
     }
@@ -81,7 +86,7 @@ class Walk {
         }
         const bool isFolder = !isKnown && S_ISDIR(status.st_mode);
         if (isFolder && !isBundleName(url)) return folder(url, {status.st_dev, status.st_ino});
-        if (isContentName(url) && isFolder == isBundleName(url)) item_(url);
+        if (isContentName(url) && isFolder == isBundleName(url)) item(url);
     }
 
     const std::function<void(const URL&)>& item_;

@@ -24,6 +24,7 @@ struct ContentWriteOptions {
 // the error with path and reason. Files are replaced whole (see `replaceFileByPieces`), so that on failure
 // the old one stands untouched. What cannot be read is never written over. Writers have no state.
 
+/// Writes an item's taggings and leaves the rest of its record alone.
 class QVCT_API TGRTTaggingsWriter {
   public:
     virtual ~TGRTTaggingsWriter() = default;
@@ -32,6 +33,7 @@ class QVCT_API TGRTTaggingsWriter {
                                const ContentWriteOptions& options = {}) const = 0;
 };
 
+/// Writes an item's content info and leaves the rest of its record alone.
 class QVCT_API TGRTContentInfoWriter {
   public:
     virtual ~TGRTContentInfoWriter() = default;
@@ -40,6 +42,7 @@ class QVCT_API TGRTContentInfoWriter {
                                   Error* error = nullptr, const ContentWriteOptions& options = {}) const = 0;
 };
 
+/// Writes an item's whole record.
 class QVCT_API TGRTMetaDataWriter {
   public:
     virtual ~TGRTMetaDataWriter() = default;

@@ -17,8 +17,9 @@ namespace qvct {
 /// grows by the labels that a file holds and it does not know.
 class QVCT_API TGRTBaseMetaDataReader : public TGRTMetaDataReader, public TGRTTaggingsReader {
   public:
-    /// REQUIRES: the taxonomy is not null.
+    /// Null without a taxonomy.
     static std::shared_ptr<TGRTBaseMetaDataReader> initWithTaxonomy(std::shared_ptr<TGRTTaxonomy> taxonomy) {
+        if (!taxonomy) return nullptr;
         return std::shared_ptr<TGRTBaseMetaDataReader>(new TGRTBaseMetaDataReader(std::move(taxonomy)));
     }
 
@@ -33,6 +34,7 @@ class QVCT_API TGRTBaseMetaDataReader : public TGRTMetaDataReader, public TGRTTa
     ObjectSet<TGRTTagging> taggingsForFileURL(const URL& url, std::uint64_t options) const override;
 
   protected:
+    /// The taxonomy is not null.
     explicit TGRTBaseMetaDataReader(std::shared_ptr<TGRTTaxonomy> taxonomy)
         : taxonomy_(std::move(taxonomy)) {}
 

@@ -24,17 +24,21 @@ class QVCT_API TGRTContentNodeTypeValidator {
   public:
     virtual ~TGRTContentNodeTypeValidator() = default;
 
+    /// Whether what lies at the URL is content of this kind. Looks at the disk.
     virtual bool isValidContentTypeAtFileURL(const URL& url) const = 0;
     /// ItemActions.
     virtual unsigned itemActionsForFileURL(const URL& url) const = 0;
     /// The audio file to play for the item.
     virtual std::optional<URL> prelistenURLForFileURL(const URL& url) const = 0;
 
+    /// @{
+    /// A new reader or writer for the item, or null for what is not content of this kind.
     virtual std::shared_ptr<TGRTMetaDataReader> metaDataReaderForFileURL(const URL& url) const = 0;
     virtual std::shared_ptr<TGRTTaggingsReader> taggingReaderForFileURL(const URL& url) const = 0;
     virtual std::shared_ptr<TGRTTaggingsWriter> taggingWriterForFileURL(const URL& url) const = 0;
     virtual std::shared_ptr<TGRTContentInfoWriter> contentInfoWriterForFileURL(const URL& url) const = 0;
     virtual std::shared_ptr<TGRTMetaDataWriter> metaDataWriterForFileURL(const URL& url) const = 0;
+    /// @}
 };
 
 }  // namespace qvct

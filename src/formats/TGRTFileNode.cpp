@@ -32,10 +32,22 @@ std::shared_ptr<const TGRTContentNodeTypeValidator> TGRTFileNode::validatorForFi
 
 std::shared_ptr<TGRTMetaData> TGRTFileNode::readMetaDataWithOptions(std::uint64_t options,
                                                                     Error* error) const {
-    if (const auto reader = TGRTMetaDataReaderFactory::metaDataReaderForURL(url_)) {
-        return reader->readMetaDataFromURL(url_, options, error);
+    return readMetaDataWithOptions(options, TGRTTaxonomy::mutableDefaultTaxonomy(), error);
+}
+
+std::shared_ptr<TGRTMetaData> TGRTFileNode::readMetaDataWithOptions(
+    std::uint64_t options, const std::shared_ptr<TGRTTaxonomy>& taxonomy, Error* error) const {
+    if (!taxonomy) {
+        fail(error, kErrorInvalidArgument,
+             fmt::format("{}: no taxonomy to read it with", printable(url_.path())));
+        return nullptr;
     }
-    const auto reader = metaDataReaderForFileURL(url_);
+    auto reader = TGRTMetaDataReaderFactory::metaDataReaderForURL(url_, taxonomy);
+    if (!reader) {
+        // All of ours are of this class.
+        const auto kind = std::dynamic_pointer_cast<const BaseTypeValidator>(validator());
+        reader = kind ? kind->readerForFileURL(url_, taxonomy) : nullptr;
+    }
     if (reader) return reader->readMetaDataFromURL(url_, options, error);
     fail(error, kErrorInvalidArgument, fmt::format("{}: no kind of content", printable(url_.path())));
     return nullptr;

@@ -20,6 +20,7 @@ namespace qvct {
 /// Nodes with equal URLs are equal. Immutable; what it answers follows the disk, nothing is remembered.
 class QVCT_API TGRTFileNode : public Object, public FileURLNode {
   public:
+    /// A node for the URL, whether anything lies there or not. Never null.
     static std::shared_ptr<TGRTFileNode> nodeWithFileURL(const URL& url);
 
     URL fileURL() const override { return url_; }
@@ -36,17 +37,23 @@ class QVCT_API TGRTFileNode : public Object, public FileURLNode {
     /// shared writable default taxonomy.
     std::shared_ptr<TGRTMetaData> readMetaDataWithOptions(std::uint64_t options,
                                                           Error* error = nullptr) const;
+    /// The same with labels resolved in a taxonomy of the caller's. Null, and an error, without one.
+    std::shared_ptr<TGRTMetaData> readMetaDataWithOptions(std::uint64_t options,
+                                                          const std::shared_ptr<TGRTTaxonomy>& taxonomy,
+                                                          Error* error = nullptr) const;
 
     /// ItemActions of this node.
     unsigned itemActions() const;
     std::optional<URL> prelistenURL() const;
 
-    // What the validator of a URL answers; null where there is none.
+    /// @{
+    /// What the validator of a URL answers; null where there is none.
     std::shared_ptr<TGRTMetaDataReader> metaDataReaderForFileURL(const URL& url) const;
     std::shared_ptr<TGRTTaggingsReader> taggingReaderForFileURL(const URL& url) const;
     std::shared_ptr<TGRTTaggingsWriter> taggingWriterForFileURL(const URL& url) const;
     std::shared_ptr<TGRTContentInfoWriter> contentInfoWriterForFileURL(const URL& url) const;
     std::shared_ptr<TGRTMetaDataWriter> metaDataWriterForFileURL(const URL& url) const;
+    /// @}
 
     bool isEqual(const Object& other) const override;
     std::size_t hash() const override { return stringHash(url_.absoluteString()); }

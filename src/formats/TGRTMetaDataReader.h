@@ -45,8 +45,11 @@ class QVCT_API TGRTMetaDataReader {
 class QVCT_API TGRTTaggingsReader {
   public:
     virtual ~TGRTTaggingsReader() = default;
+    /// @{
+    /// The stored taggings, and those that the options (MetaDataReaderOptions) ask for.
     virtual ObjectSet<TGRTTagging> taggingsForFileURL(const URL& url) const = 0;
     virtual ObjectSet<TGRTTagging> taggingsForFileURL(const URL& url, std::uint64_t options) const = 0;
+    /// @}
 };
 
 }  // namespace qvct

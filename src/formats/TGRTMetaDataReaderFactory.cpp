@@ -28,6 +28,7 @@ std::shared_ptr<TGRTBaseMetaDataReader> TGRTMetaDataReaderFactory::metaDataReade
                                        &readerIfSupported<TGRTTavioLoopMetaDataReader>,
                                        &readerIfSupported<TGRTOstraProjectMetaDataReader>,
                                        &readerIfSupported<TGRTBinaryFileMetaDataReader>};
+    if (!taxonomy) return nullptr;
     const std::string extension = url.pathExtension();
     for (const auto candidate : candidates) {
         if (auto reader = candidate(extension, taxonomy)) return reader;

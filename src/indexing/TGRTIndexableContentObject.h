@@ -50,6 +50,7 @@ class QVCT_API TGRTIndexableContentObject : public Object, public QVContentTaggi
 
     // What it is made of.
 
+    /// The default taxonomy: with kIndexInMutableTaxonomy the shared writable one.
     static std::shared_ptr<TGRTTaxonomy> taxonomyForOptions(std::uint64_t options);
     /// The labels of the taggings that name a content pack.
     static std::set<std::string> packageIdentifierFromTaggings(const Taggings& taggings);

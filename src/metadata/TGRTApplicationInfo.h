@@ -15,6 +15,7 @@ namespace qvct {
 /// Equality and hash are those of the three fields as they stand: do not change one that is in a set.
 class QVCT_API TGRTApplicationInfo : public Object {
   public:
+    /// One without identifier and version.
     static std::shared_ptr<TGRTApplicationInfo> init();
     /// Fields that are absent, or not of their type, stay unset.
     static std::shared_ptr<TGRTApplicationInfo> initWithDictionary(

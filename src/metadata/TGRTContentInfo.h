@@ -27,6 +27,7 @@ class QVCT_API TGRTContentInfo : public Object {
 
     /// No dependencies.
     void setup() { resetDependencyPaths(); }
+    /// Forgets all dependencies.
     void resetDependencyPaths() { assetDependencyItems_ = {}; }
     /// Adds a dependency for each path that has none yet.
     void updateDependencyPaths(const std::vector<std::string>& paths);

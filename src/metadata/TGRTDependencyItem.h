@@ -22,6 +22,7 @@ class QVCT_API QVContentTaggingDependencyItem {
 /// Two items are equal when their identifiers are; an item without path equals nothing, not even itself.
 class QVCT_API TGRTDependencyItem : public Object, public QVContentTaggingDependencyItem {
   public:
+    /// The item for a path; its identifier is that of `QVCTUUIDGenerator`.
     static std::shared_ptr<TGRTDependencyItem> dependencyItemWithPath(std::string path);
 
     std::string UUID() const override { return identifier_; }

@@ -26,6 +26,7 @@ class TGRTTaxonomy;
 /// one thread at a time.
 class QVCT_API TGRTMetaData : public Object {
   public:
+    /// An empty record.
     static std::shared_ptr<TGRTMetaData> init();
 
     /// Nothing when the item has no name but that of its file.
@@ -62,11 +63,13 @@ class QVCT_API TGRTMetaData : public Object {
     /// as absent. Labels that the taxonomy does not know are added to it, or dropped when it is read-only.
     static std::shared_ptr<TGRTMetaData> metaDataFromDictionary(const PropertyList::Dictionary* dictionary,
                                                                 TGRTTaxonomy& taxonomy);
+    /// The taggings alone; none without that entry. Labels as above.
     static ObjectSet<TGRTTagging> taggingsFromDictionary(const PropertyList::Dictionary& dictionary,
                                                          TGRTTaxonomy& taxonomy);
     /// Never null.
     static std::shared_ptr<TGRTContentInfo> contentInfoFromDictionary(
         const PropertyList::Dictionary& dictionary);
+    /// The key values alone; none without that entry.
     static ObjectSet<TGRTKeyValue> keyValuesFromDictionary(const PropertyList::Dictionary& dictionary);
 
     std::string description() const override;

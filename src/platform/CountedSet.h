@@ -13,12 +13,14 @@ namespace qvct {
 /// Lookups are linear: sets of this kind hold a handful.
 class CountedSet {
   public:
+    /// A text and how often it was added.
     struct Entry {
         std::string text;
         std::size_t count;
         bool operator==(const Entry&) const = default;
     };
 
+    /// Counts the text `times` times more.
     void add(std::string_view text, std::size_t times = 1) {
         const auto hit = find(text);
         if (hit == entries_.end()) {

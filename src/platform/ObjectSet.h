@@ -21,6 +21,7 @@ class ObjectSet {
     using Pointer = std::shared_ptr<T>;
 
     ObjectSet() = default;
+    /// The objects without those that equal an earlier one.
     ObjectSet(std::initializer_list<Pointer> objects) {
         for (const Pointer& object : objects) insert(object);
     }
@@ -62,6 +63,7 @@ class ObjectSet {
         return hit == last ? nullptr : hit->second;
     }
 
+    /// Whether an equal object is a member.
     bool contains(const T& object) const { return find(object) != nullptr; }
     std::size_t size() const { return objects_.size(); }
     bool empty() const { return objects_.empty(); }

@@ -38,20 +38,27 @@ class QVCT_API PropertyList {
     class Dictionary {
       public:
         Dictionary();
+        /// The entries as they stand: keys have to differ.
         Dictionary(std::initializer_list<Entry> entries);
+        /// @{
+        /// Copies are deep.
         Dictionary(const Dictionary&);
         Dictionary(Dictionary&&) noexcept;
         Dictionary& operator=(const Dictionary&);
         Dictionary& operator=(Dictionary&&) noexcept;
+        /// @}
         ~Dictionary();
 
-        /// The value under `key`, or null.
+        /// @{
+        /// The value under `key`, or null. Valid until the dictionary changes.
         const PropertyList* value(std::string_view key) const;
         PropertyList* value(std::string_view key);
+        /// @}
         /// Replaces the value under `key` where it stands, or appends it.
         void set(std::string_view key, PropertyList value);
         /// Appends without looking for `key`, which the caller knows to be absent.
         void append(std::string key, PropertyList value);
+        /// Makes room for that many entries.
         void reserve(std::size_t entries);
         /// Whether there was such a key.
         bool remove(std::string_view key);
@@ -66,6 +73,8 @@ class QVCT_API PropertyList {
         std::vector<Entry> entries_;
     };
 
+    /// @{
+    /// The value as a property list. Unsigned integers that fit are held signed.
     PropertyList(bool value) : value_(value) {}
     PropertyList(int value) : value_(std::int64_t{value}) {}
     PropertyList(std::int64_t value) : value_(value) {}
@@ -79,7 +88,9 @@ class QVCT_API PropertyList {
     PropertyList(Data value) : value_(std::move(value)) {}
     PropertyList(Date value) : value_(value) {}
     PropertyList(Uid value) : value_(value) {}
+    /// @}
 
+    /// @{
     /// The value if it is of that type, else null.
     const Dictionary* dictionary() const { return std::get_if<Dictionary>(&value_); }
     Dictionary* dictionary() { return std::get_if<Dictionary>(&value_); }
@@ -94,6 +105,7 @@ class QVCT_API PropertyList {
     const std::int64_t* signedInteger() const { return std::get_if<std::int64_t>(&value_); }
     const std::uint64_t* unsignedInteger() const { return std::get_if<std::uint64_t>(&value_); }
     const double* real() const { return std::get_if<double>(&value_); }
+    /// @}
 
     /// Whether it is an integer, a real or a boolean.
     bool isNumber() const;

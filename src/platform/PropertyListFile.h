@@ -12,22 +12,26 @@
 
 namespace qvct {
 
-/// Reading and writing property lists, XML and binary.
-///
-/// What is read is bounded before anything is built from it: the nesting by kDeepestPropertyList, the values
-/// that a binary list's shared references expand to by its size. Everything that a property list can hold
-/// survives a read and a write in either encoding, in its order; dates lose fractions of a second in XML.
+// Reading and writing property lists, XML and binary.
+//
+// What is read is bounded before anything is built from it: the nesting by kDeepestPropertyList, the values
+// that a binary list's shared references expand to by its size. Everything that a property list can hold
+// survives a read and a write in either encoding, in its order; dates lose fractions of a second in XML.
 
+/// How deep a property list may nest; deeper ones are refused as too large.
 inline constexpr int kDeepestPropertyList = 512;
 
+/// The two encodings of a property list.
 enum class PropertyListFormat { xml, binary };
 
+/// @{
 /// The value that the bytes hold in either encoding, or nothing and an error with the byte offset where
 /// known.
 /// @cost  O(size); memory at most proportional to the size.
 QVCT_API std::optional<PropertyList> parsePropertyList(std::span<const std::uint8_t> bytes,
                                                        Error* error = nullptr);
 QVCT_API std::optional<PropertyList> parsePropertyList(std::string_view bytes, Error* error = nullptr);
+/// @}
 
 /// XML with header, document type and tabs, or binary format 1.0. Empty on failure, which only values that
 /// no property list can hold bring about (a text with a NUL character).

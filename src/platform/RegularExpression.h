@@ -17,6 +17,7 @@ namespace qvct {
 /// without end is given up after about a second and counts as no match.
 class QVCT_API RegularExpression {
   public:
+    /// Whether capitals and small letters differ.
     enum class Case { sensitive, insensitive };
     /// A match: UTF-16 offsets of the whole (first) and of each capture group.
     struct Range {
@@ -28,8 +29,11 @@ class QVCT_API RegularExpression {
     static std::optional<RegularExpression> compile(std::string_view pattern, Case caseMode,
                                                     Error* error = nullptr);
 
+    /// @{
+    /// What was moved from can only be assigned to or destroyed.
     RegularExpression(RegularExpression&&) noexcept;
     RegularExpression& operator=(RegularExpression&&) noexcept;
+    /// @}
     ~RegularExpression();
 
     /// Whether the pattern occurs anywhere in the text.

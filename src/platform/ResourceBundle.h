@@ -11,8 +11,9 @@ namespace qvct {
 /// Where resource files may lie that replace the compiled-in copies.
 ///
 /// Looked into, in this order: the folder set here, the folder that the environment variable QVCT_RESOURCES
-/// names, the resource folder of the installation. Setting is for start-up, before the first look-up of
-/// another thread.
+/// names, the resource folder of the installation: share/qvcontenttagging/resources beside the folder in
+/// which the library lies, or the program that it is part of, wherever these were moved to. Setting is for
+/// start-up, before the first look-up of another thread.
 class QVCT_API ResourceBundle {
   public:
     /// An empty path sets nothing again.

@@ -3,15 +3,18 @@
 #include <cstdint>
 #include <string_view>
 
-/// Keys, labels, codes and levels that files and hosts share.
+// Keys, labels, codes and levels that files and hosts share.
 namespace qvct {
 
-// Dictionary of one tagging.
+/// @{
+/// Key of the dictionary of one tagging.
 inline constexpr std::string_view QVContentTaggingLabelKeyName = "Name";
 inline constexpr std::string_view QVContentTaggingWeightKeyName = "Weight";
 inline constexpr std::string_view QVContentTaggingAutoTaggingKeyName = "AutoTagging";
+/// @}
 
-// Metadata record.
+/// @{
+/// Key of a metadata record.
 inline constexpr std::string_view QVContentTaggingKeyName = "Tagging";
 inline constexpr std::string_view QVContentInfoKey = "ContentInfo";
 inline constexpr std::string_view QVContentKeyValueDataKey = "KeyValueData";
@@ -19,20 +22,24 @@ inline constexpr std::string_view QVContentTaggingTypeKeyName = "Type";
 inline constexpr std::string_view QVContentTaggingSubTypeKeyName = "SubType";
 inline constexpr std::string_view QVContentTaggingDisplayKeyName = "DisplayName";
 inline constexpr std::string_view QVContentTaggingUUIDKeyName = "UUID";
+/// @}
 
-// Content info.
+/// @{
+/// Key of a content info.
 inline constexpr std::string_view QVContentInfoDependenciesKey = "Dependencies";
 inline constexpr std::string_view QVContentInfoApplicationInfosKey = "ApplicationInfos";
 inline constexpr std::string_view QVContentInfoAppIdentifierKey = "AppIdentifier";
 inline constexpr std::string_view QVContentInfoMinimumVersionKey = "MinimumVersion";
 inline constexpr std::string_view QVContentInfoLegacyKey = "Legacy";
+/// @}
 
 /// The property list inside a bundle that holds its metadata record.
 inline constexpr std::string_view QVContentTaggingTagsPlistName = "tags.plist";
 /// What the names of a bundle's intermediate cache files begin with.
 inline constexpr std::string_view kProductPrefix = "org.qvcontenttagging";
 
-// Key values of a record.
+/// @{
+/// Key of a record's key value.
 inline constexpr std::string_view QVContentKeyLengthInSeconds = "LengthInSeconds";
 inline constexpr std::string_view QVContentKeyBeatCount = "BeatCount";
 inline constexpr std::string_view QVContentKeyTavioLoopType = "TavioLoopType";
@@ -40,8 +47,10 @@ inline constexpr std::string_view QVContentKeyMidiRootNote = "MidiRootNote";
 inline constexpr std::string_view QVContentKeyKeyType = "KeyType";
 inline constexpr std::string_view QVContentKeySignatureTop = "SignatureTop";
 inline constexpr std::string_view QVContentKeySignatureBottom = "SignatureBottom";
+/// @}
 
-// Categories of the default taxonomy.
+/// @{
+/// Identifier of a category of the default taxonomy.
 inline constexpr std::string_view QVCategorySoundpackIdentifier = "Soundpack";
 inline constexpr std::string_view QVCategoryContentTypeIdentifier = "Content Type";
 inline constexpr std::string_view QVCategoryGenresIdentifier = "Genres";
@@ -49,8 +58,10 @@ inline constexpr std::string_view QVCategorySourceIdentifier = "Source";
 inline constexpr std::string_view QVCategoryEffectsIdentifier = "Effects";
 inline constexpr std::string_view QVCategoryPlugInsIdentifier = "PlugIns";
 inline constexpr std::string_view QVCategoryLoopSpecificsIdentifier = "Loop Specifics";
+/// @}
 
-// Tags of the default taxonomy.
+/// @{
+/// Label of a tag of the default taxonomy.
 inline constexpr std::string_view QVTagPatch = "Patch";
 inline constexpr std::string_view QVTagAudioPatch = "Audio Patch";
 inline constexpr std::string_view QVTagAuxPatch = "Aux Patch";
@@ -85,12 +96,15 @@ inline constexpr std::string_view QVTagGSharpKey = "GSharp";
 inline constexpr std::string_view QVTagAKey = "A";
 inline constexpr std::string_view QVTagASharpKey = "ASharp";
 inline constexpr std::string_view QVTagBKey = "B";
+/// @}
 
-/// The four levels of a person's rating, as weights in [0, 1].
+/// @{
+/// One of the four levels of a person's rating, a weight in [0, 1].
 inline constexpr float kTaggingLevel1 = 0.25F;
 inline constexpr float kTaggingLevel2 = 0.5F;
 inline constexpr float kTaggingLevel3 = 0.75F;
 inline constexpr float kTaggingLevel4 = 1.0F;
+/// @}
 
 /// What kind of content a file is.
 enum FileType : std::int64_t {

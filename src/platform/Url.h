@@ -32,7 +32,9 @@ class QVCT_API URL {
     /// The extension in lower case, for comparing.
     std::string lowercasePathExtension() const;
     std::string lastPathComponentWithoutExtension() const;
+    /// The URL of what has that name inside this one.
     URL URLByAppendingPathComponent(std::string_view component) const;
+    /// The same with "." and the extension behind the last component.
     URL URLByAppendingPathExtension(std::string_view extension) const;
     URL URLByDeletingLastPathComponent() const;
 

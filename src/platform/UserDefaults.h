@@ -10,7 +10,9 @@ namespace qvct {
 /// QVCT_DEFAULT_<name> ("1", "yes", "true"), else false. Safe from every thread.
 class QVCT_API UserDefaults {
   public:
+    /// The setting's value.
     static bool boolForKey(std::string_view key);
+    /// Sets it for this process; nothing is stored.
     static void setBool(bool value, std::string_view key);
 };
 

@@ -35,6 +35,7 @@ class QVCT_API TGRTCategory : public Object,
                               public QVContentTaggingCategory,
                               public std::enable_shared_from_this<TGRTCategory> {
   public:
+    /// An empty category.
     static std::shared_ptr<TGRTCategory> initWithIdentifier(std::string identifier);
 
     const std::string& identifier() const override { return identifier_; }
@@ -44,8 +45,11 @@ class QVCT_API TGRTCategory : public Object,
     /// by the hash of its identifier.
     static bool anyWasRenamed() { return anyWasRenamed_; }
 
+    /// Lets the tag join; its children do not come along. Null is ignored.
     void addTag(const std::shared_ptr<TGRTTag>& tag);
+    /// Takes the tag out; its children stay. Null is ignored.
     void removeTag(const std::shared_ptr<TGRTTag>& tag);
+    /// Whether an equal tag is here, at any depth.
     bool doesContain(const TGRTTag& tag) const { return tags_.contains(tag); }
     const ObjectSet<TGRTTag>& tags() const override { return tags_; }
     /// All tags in the order in which they joined.
@@ -62,6 +66,7 @@ class QVCT_API TGRTCategory : public Object,
 
     /// A label with its hash, made once for a search in several categories.
     struct LabelKey {
+        /// The label must live as long as the key.
         explicit LabelKey(std::string_view label) : text(label), hash(stringHash(label)) {}
         std::string_view text;
         std::size_t hash;
@@ -72,6 +77,7 @@ class QVCT_API TGRTCategory : public Object,
         TGRTTag* only = nullptr;
         bool exact = false;
     };
+    /// What the index knows of the label. @cost O(1)
     IndexAnswer tagsWithLabel(const LabelKey& label) const;
     /// Counts changes, for whoever keeps something that he derived from the tags.
     std::uint64_t revision() const { return revision_; }

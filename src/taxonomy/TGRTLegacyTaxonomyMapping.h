@@ -30,6 +30,7 @@ class QVCT_API TGRTLegacyTaxonomyMapping {
     static std::shared_ptr<const TGRTLegacyTaxonomyMapping> legacyVorthalTaxonomyMapping();
     /// The resource file with the table; nothing leaves it to the compiled-in copy.
     static std::optional<URL> defaultLegacyLoopTaxonomyMappingURL();
+    /// The same for the table of synth presets.
     static std::optional<URL> defaultLegacyVorthalTaxonomyMappingURL();
 
     /// The mapping that a table file (UTF-8) holds. Null when there is none, and when its header or the

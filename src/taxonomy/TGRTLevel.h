@@ -26,6 +26,7 @@ class QVCT_API TGRTLevel : public Object {
     std::string description() const override;
 
   protected:
+    /// As `levelWithWeight`.
     explicit TGRTLevel(double weight);
 
   private:

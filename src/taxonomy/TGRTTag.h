@@ -65,12 +65,14 @@ class QVCT_API TGRTTag : public Object,
     const ObjectSet<TGRTTag>& children() const override { return children_; }
     /// Takes the child over from its current parent's children. The child's own link upward stays as it is.
     void addChild(const std::shared_ptr<TGRTTag>& tag);
+    /// Takes the child out. Null is ignored.
     void removeChild(const std::shared_ptr<TGRTTag>& tag);
 
     /// The parent first, then its ancestors.
     std::vector<std::shared_ptr<TGRTTag>> ancestors() const;
     /// The children, then the descendants of each in turn.
     std::vector<std::shared_ptr<TGRTTag>> descendants() const;
+    /// The last of its ancestors; itself when it has none.
     std::shared_ptr<TGRTTag> rootTag();
 
     /// The label with its marker written back. Bipolar poles come out as named steps in braces.
@@ -80,6 +82,7 @@ class QVCT_API TGRTTag : public Object,
 
     /// Null for a plain tag: it has no level of its own.
     std::shared_ptr<TGRTLevel> defaultLevel() const { return defaultLevelForValueType(valueType_); }
+    /// The default level of tags of a TagValueType.
     static std::shared_ptr<TGRTLevel> defaultLevelForValueType(std::int64_t valueType);
     std::int64_t type() const override;
     /// The identifier of the content pack that this tag stands for; nothing in other categories.

@@ -34,12 +34,16 @@ class QVCT_API TGRTTaggingCollection {
 
     /// Replaces what the node has.
     void setTaggings(const Taggings& taggings, const Node& forNode);
+    /// Adds those that the node does not have yet.
     void addTaggings(const Taggings& taggings, const Node& forNode);
+    /// Takes out those that the node has.
     void removeTaggings(const Taggings& taggings, const Node& forNode);
-    // The same for each of several nodes.
+    /// @{
+    /// The same for each of several nodes.
     void setTaggings(const Taggings& taggings, const std::vector<Node>& forNodes);
     void addTaggings(const Taggings& taggings, const std::vector<Node>& forNodes);
     void removeTaggings(const Taggings& taggings, const std::vector<Node>& forNodes);
+    /// @}
 
     /// The taggings of all nodes.
     Taggings taggings() const;

@@ -38,6 +38,7 @@ class QVCT_API QVContentTaggingTaxonomy {
     virtual const ObjectSet<TGRTCategory>& categories() const = 0;
     virtual Localization localizationDictionary() const = 0;
     virtual std::string localizedStrings() const = 0;
+    /// Writes the property list. False, and an error, when it cannot be written.
     virtual bool writeToURL(const URL& url, Error* error = nullptr) const = 0;
     virtual std::string serializedTaxonomyData() const = 0;
 };
@@ -64,18 +65,24 @@ class QVCT_API TGRTTaxonomy : public Object, public QVContentTaggingTaxonomy {
     static std::shared_ptr<TGRTTaxonomy> mutableDefaultTaxonomy();
     /// Writable, a new one each time.
     static std::shared_ptr<TGRTTaxonomy> testingTaxonomy();
+    /// The retired vocabulary of synth presets; read-only, shared.
     static std::shared_ptr<TGRTTaxonomy> legacyVorthalTaxonomy();
+    /// The retired vocabulary of loops; read-only, shared.
     static std::shared_ptr<TGRTTaxonomy> legacyLoopTaxonomy();
     /// From the resource file of the type where there is one, else from the compiled-in copy.
     static std::shared_ptr<TGRTTaxonomy> newTaxonomyOfType(std::int64_t type, bool readonly, bool useCache);
+    /// The resource file of the type; nothing leaves it to the compiled-in copy.
     static std::optional<URL> taxonomyURLForType(std::int64_t type);
+    /// The property list that `newTaxonomyOfType` builds from; nothing for a type without one.
     static std::optional<PropertyList::Dictionary> taxonomyDictionaryForType(std::int64_t type);
     /// An empty taxonomy, and an error, when the file cannot be read.
     static std::shared_ptr<TGRTTaxonomy> taxonomyWithContentsOfURL(const URL& url, Error* error = nullptr);
     /// Null, and an error, when the bytes are no property list; null alone when they are no dictionary.
     static std::shared_ptr<TGRTTaxonomy> taxonomyWithData(std::span<const std::uint8_t> data,
                                                           Error* error = nullptr);
+    /// The taxonomy of a property list's dictionary. What is not of its type is passed over; never null.
     static std::shared_ptr<TGRTTaxonomy> taxonomyWithDictionary(const PropertyList::Dictionary& dictionary);
+    /// An empty, writable one.
     static std::shared_ptr<TGRTTaxonomy> init();
     /// Drops the cached taxonomies, as a host does when memory runs short.
     static void evictCache();
@@ -87,9 +94,11 @@ class QVCT_API TGRTTaxonomy : public Object, public QVContentTaggingTaxonomy {
     static std::vector<TagPointer> tagsFromDictionary(const PropertyList::Dictionary& dictionary,
                                                       const TagPointer& parentTag,
                                                       const CategoryPointer& category);
+    /// Creates a tag for each string of the array, without children; otherwise as above.
     static std::vector<TagPointer> tagsFromArray(const PropertyList::Array& array,
                                                  const TagPointer& parentTag,
                                                  const CategoryPointer& category);
+    /// The raw labels in the order of siblings: by their sorting prefix, then as the user's locale sorts.
     static std::vector<std::string> sortedTagLabelsFromArray(std::vector<std::string> labels);
 
     bool readOnly() const { return readOnly_; }
@@ -97,31 +106,42 @@ class QVCT_API TGRTTaxonomy : public Object, public QVContentTaggingTaxonomy {
     const ObjectSet<TGRTCategory>& categories() const override { return categories_; }
     /// Ignored when read-only.
     void addCategory(const CategoryPointer& category);
+    /// The category, made when it is not there. Null when it would have to be made in a read-only taxonomy.
     CategoryPointer findOrCreateCategoryWithIdentifier(std::string_view identifier,
                                                        bool overwriteReadonly = false);
+    /// @{
     /// The tag with that label in the category, wherever it hangs; else a new one below the parent label (a
     /// root tag when no such parent is found). Null when it would have to be made in a read-only taxonomy.
     TagPointer findOrCreateTagWithLabel(std::string_view label, std::string_view categoryIdentifier);
     TagPointer findOrCreateTagWithLabel(std::string_view label, OptionalLabel parentLabel,
                                         std::string_view categoryIdentifier, bool overwriteReadonly = false);
+    /// @}
     /// Adds the content pack even to a read-only taxonomy. Null for an empty identifier.
     TagPointer findOrCreateSoundPackTagWithIdentifier(std::string_view identifier);
 
     // Finding. @cost O(1) for a label that its category has once; a walk over the tree for others.
 
+    /// The category, or null.
     CategoryPointer findCategoryWithIdentifier(std::string_view identifier) const;
+    /// @{
+    /// The first tag with the label: below the parent with that label, in the category, or anywhere. Null
+    /// when there is none.
     TagPointer findTagForLabel(std::string_view label) const;
     TagPointer findTagForLabel(std::string_view label, std::string_view categoryIdentifier) const;
     TagPointer findTagForLabel(std::string_view label, OptionalLabel parentLabel,
                                std::string_view categoryIdentifier) const;
+    /// @}
     /// Depth first, in order; a tag with the label under another parent is passed over with its children.
     static TagPointer findTagWithLabel(std::string_view label, OptionalLabel parentLabel,
                                        const ObjectSet<TGRTTag>& tags);
+    /// Whether the tag's category has an equal tag. False for null.
     bool doesContainTag(const TagPointer& tag) const;
     std::vector<TagPointer> allTags() const;
+    /// The tags of this taxonomy that the taggings name, in one category or in all.
     ObjectSet<TGRTTag> tagsForTaggings(const std::vector<std::shared_ptr<TGRTTagging>>& taggings,
                                        OptionalLabel categoryIdentifier,
                                        bool includingAncestors = false) const;
+    /// Adds the tag that the tagging names, if this taxonomy has it, and if asked for what it hangs below.
     void appendTagsOfTagging(const TGRTTagging& tagging, ObjectSet<TGRTTag>& set,
                              bool includingAncestors) const;
     /// Changes whenever a category or tag was added, moved or renamed.
@@ -140,6 +160,7 @@ class QVCT_API TGRTTaxonomy : public Object, public QVContentTaggingTaxonomy {
     std::string localizedStrings() const override;
     /// Rows, header first, from which a mapping of retired tags is filled in.
     std::vector<std::string> mappingExport() const;
+    /// The row for one tag.
     std::string mappingExportForTag(const TGRTTag& tag) const;
     std::string description() const override;
 

@@ -14,8 +14,10 @@ namespace qvct {
 /// Finds tags by what a user types, for suggestions.
 class QVCT_API TGRTTaxonomySearching {
   public:
-    /// The table is made once; after adding tags to the taxonomy, make it anew with `_updateSearchTable`.
+    /// Without a taxonomy it finds nothing. The table is made once; after adding tags to the taxonomy, make
+    /// it anew with `_updateSearchTable`.
     static std::shared_ptr<TGRTTaxonomySearching> initWithTaxonomy(std::shared_ptr<TGRTTaxonomy> taxonomy);
+    /// Makes the table anew from the taxonomy. Empty without one.
     void _updateSearchTable();
 
     /// The labels equal to the text, or (not exact) those that hold it, without regard to case and
@@ -26,6 +28,7 @@ class QVCT_API TGRTTaxonomySearching {
 
     const std::shared_ptr<TGRTTaxonomy>& taxonomy() const { return taxonomy_; }
     void setTaxonomy(std::shared_ptr<TGRTTaxonomy> taxonomy) { taxonomy_ = std::move(taxonomy); }
+    /// The tag of the table with that label, or null.
     std::shared_ptr<TGRTTag> tagForLabel(std::string_view label) const;
 
   private:

@@ -10,8 +10,8 @@
 
 namespace qvct {
 
-/// Reads the markers that raw tag labels carry: "Bright / Dark-+", "Distortion[Light,Heavy]", "Tempo$5",
-/// "Loudness%", "Featured!", and the sorting prefix "2^".
+// Reads the markers that raw tag labels carry: "Bright / Dark-+", "Distortion[Light,Heavy]", "Tempo$5",
+// "Loudness%", "Featured!", and the sorting prefix "2^".
 
 /// What kind of value a tag takes, as its raw label says.
 enum TagValueType : std::int64_t {
@@ -24,6 +24,7 @@ enum TagValueType : std::int64_t {
 
 /// The label for people: without markers, prefix and step names. Blanks stay.
 QVCT_API std::string normalizedTagString(std::string_view raw);
+/// What kind of value the raw label asks for.
 QVCT_API TagValueType tagValueType(std::string_view raw);
 /// The number behind "$", else how many steps are named.
 QVCT_API std::int64_t numberOfTagValueSteps(std::string_view raw);

@@ -9,11 +9,12 @@
 
 namespace qvct {
 
-/// Finding and replacing taggings of a set by their label.
+// Finding and replacing taggings of a set by their label.
 
 /// The first tagging with that label, or null.
 QVCT_API std::shared_ptr<TGRTTagging> anyTaggingForLabel(const ObjectSet<TGRTTagging>& taggings,
                                                          std::string_view label);
+/// Whether a tagging has that label.
 QVCT_API bool containsTagWithLabel(const ObjectSet<TGRTTagging>& taggings, std::string_view label);
 
 /// Replaces the tagging with a label by one of a new tag with the new label, which joins the old tag's parent

@@ -1,0 +1,235 @@
+// What hosts do that they should not, through the shared libraries and the headers as they are installed.
+
+#include "demo/AudioFiles.h"
+#include "demo/Library.h"
+#include "support/TemporaryFolder.h"
+
+#include <filesystem>
+#include <fstream>
+#include <iterator>
+#include <thread>
+
+#include <gmock/gmock.h>
+#include <qvcontenttagging/autotagging/QVTaggingAggregator.h>
+#include <qvcontenttagging/contentdb/Indexer.h>
+#include <qvcontenttagging/formats/ContentWalk.h>
+#include <qvcontenttagging/formats/TGRTFileNode.h>
+#include <qvcontenttagging/formats/TGRTMetaDataReaderFactory.h>
+#include <qvcontenttagging/formats/TGRTMetaDataWriterFactory.h>
+#include <qvcontenttagging/indexing/TGRTIndexableContentObject.h>
+#include <qvcontenttagging/taxonomy/TGRTLegacyTaxonomyMapping.h>
+#include <qvcontenttagging/taxonomy/TGRTTaxonomySearching.h>
+#include <qvcontenttagging/taxonomy/TaggingSetAdditions.h>
+
+namespace qvct {
+namespace {
+
+using test::TemporaryFolder;
+using testing::Each;
+using testing::HasSubstr;
+using testing::IsEmpty;
+using testing::Not;
+
+constexpr std::uint64_t kEverything = 0x3F8 | kReadLegacyTaggings | kReadMappedTaggings;
+
+std::vector<URL> writeDemoLibrary(const TemporaryFolder& folder) {
+    std::vector<URL> items;
+    for (const std::string& path : demo::writeLibrary(folder.path()))
+        items.push_back(URL::fileURLWithPath(folder.path(path)));
+    return items;
+}
+
+std::string bytesOf(const URL& url) {
+    std::ifstream file(url.path(), std::ios::binary);
+    return {std::istreambuf_iterator<char>(file), {}};
+}
+
+URL soundIn(const TemporaryFolder& folder) {
+    const URL url = URL::fileURLWithPath(folder.path("Deep House Beat.caf"));
+    demo::writeSound(url.path(), {.samples = std::vector<float>(4410, 0.25F)});
+    return url;
+}
+
+TEST(NullPointers, AreNoTaxonomyToReadWith) {
+    const TemporaryFolder folder;
+    const URL url = soundIn(folder);
+    EXPECT_EQ(TGRTMetaDataReaderFactory::metaDataReaderForURL(url, nullptr), nullptr);
+    EXPECT_EQ(TGRTBaseMetaDataReader::initWithTaxonomy(nullptr), nullptr);
+    Error error;
+    EXPECT_EQ(TGRTFileNode::nodeWithFileURL(url)->readMetaDataWithOptions(0, nullptr, &error), nullptr);
+    EXPECT_EQ(error.code, kErrorInvalidArgument);
+    EXPECT_THAT(error.message, HasSubstr(url.path()));
+    const auto searching = TGRTTaxonomySearching::initWithTaxonomy(nullptr);
+    EXPECT_THAT(searching->findTagsForString("House"), IsEmpty());
+    searching->setTaxonomy(nullptr);
+    searching->_updateSearchTable();
+    EXPECT_EQ(searching->tagForLabel("House"), nullptr);
+}
+
+TEST(NullPointers, AreNoTagsNoCategoriesAndNoTaggings) {
+    const auto taxonomy = TGRTTaxonomy::testingTaxonomy();
+    const std::size_t before = taxonomy->allTags().size();
+    taxonomy->addCategory(nullptr);
+    const auto category = taxonomy->findCategoryWithIdentifier("Genres");
+    category->addTag(nullptr);
+    category->removeTag(nullptr);
+    const auto tag = taxonomy->findTagForLabel("House");
+    tag->addChild(nullptr);
+    tag->removeChild(nullptr);
+    EXPECT_EQ(taxonomy->allTags().size(), before);
+    EXPECT_FALSE(taxonomy->doesContainTag(nullptr));
+    EXPECT_EQ(
+        taxonomy->tagsForTaggings({nullptr, TGRTTagging::initWithTag(tag, nullptr)}, std::nullopt).size(), 1);
+    EXPECT_EQ(TGRTTagging::initWithTag(nullptr, TGRTLevel::levelWithWeight(1)), nullptr);
+    ObjectSet<TGRTTagging> taggings{nullptr, TGRTTagging::initWithTag(tag, nullptr)};
+    EXPECT_FALSE(reassignTagWithLabel(taggings, "House", nullptr));
+    EXPECT_EQ(taggings.size(), 1);
+    EXPECT_THAT(TGRTTagging::taggingsWithTaggingDictionary(nullptr, *taxonomy), IsEmpty());
+    EXPECT_EQ(TGRTMetaData::metaDataFromDictionary(nullptr, *taxonomy), nullptr);
+    EXPECT_NE(TGRTTag::initWithLabel("Alone", nullptr, nullptr), nullptr);
+}
+
+TEST(NullPointers, WriteNothing) {
+    const TemporaryFolder folder;
+    const URL url = soundIn(folder);
+    const std::string before = bytesOf(url);
+    Error error;
+    EXPECT_FALSE(TGRTMetaDataWriterFactory::metaDataWriterForURL(url)->writeMetaData(nullptr, url, &error));
+    EXPECT_THAT(error.message, HasSubstr(url.path()));
+    EXPECT_FALSE(TGRTMetaDataWriterFactory::metaDataWriterForURL(url)->writeMetaData(nullptr, url));
+    EXPECT_EQ(bytesOf(url), before);
+}
+
+TEST(NullPointers, AreInputsThatAnItemDoesNotHave) {
+    const URL url = URL::fileURLWithPath("/Loops/Deep House.patch");
+    for (const auto& service :
+         QVTaggingAggregator::defaultTaggingServicesWithRules(std::nullopt, std::nullopt))
+        EXPECT_THAT(service->tagsWithContentsOfURL(url, nullptr, nullptr, nullptr, 0), IsEmpty());
+
+    struct Aggregator : QVTaggingAggregator {
+        Aggregator() : QVTaggingAggregator({nullptr, nullptr}) {}
+    } aggregator;
+    aggregator.setTaxonomy(nullptr);
+    EXPECT_THAT(aggregator.tagsWithContentsOfURL(url, kEverything), IsEmpty());
+}
+
+TEST(NullPointers, AreFunctionsThatNobodyCalls) {
+    const TemporaryFolder folder;
+    folder.write("Kick.wav", "no sound");
+    walkContent(folder.path(), nullptr, nullptr);
+    walkContent(folder.path("nowhere"), nullptr, nullptr);
+    Error error;
+    contentdb::IndexOptions options;
+    options.folders = {folder.path()};
+    options.database = folder.path("library.db");
+    EXPECT_EQ(contentdb::indexLibrary(options, nullptr, &error), std::nullopt);
+    EXPECT_EQ(error.code, kErrorInvalidArgument);
+    EXPECT_FALSE(std::filesystem::exists(options.database));
+}
+
+/// Everything that a tagging says of itself.
+std::vector<std::string> sayingsOf(const ObjectSet<TGRTTagging>& taggings) {
+    std::vector<std::string> texts;
+    for (const auto& tagging : taggings)
+        texts.push_back(tagging->category() + ">" + tagging->parentLabel() + ">" + tagging->label() + ":" +
+                        std::to_string(tagging->weightLevel()) + ":" + std::to_string(tagging->hash()));
+    return texts;
+}
+
+TEST(ReleasedTaxonomy, LeavesTaggingsWhatTheyAre) {
+    const URL url = URL::fileURLWithPath("/Loops/Bright Deep House Topper.caf");
+    const auto aggregator = QVTaggingAggregator::defaultTaggingAggregator();
+    auto taxonomy = TGRTTaxonomy::newTaxonomyOfType(kDefaultTaxonomy, true, false);
+    const auto taggings =
+        aggregator->taggingsWithContentsOfURL(url, *taxonomy, QVCTAutoTaggingOptionFilenameKeywords);
+    ASSERT_THAT(taggings, Not(IsEmpty()));
+    const auto before = sayingsOf(taggings);
+    const std::weak_ptr<TGRTTaxonomy> gone = taxonomy;
+    taxonomy.reset();
+    ASSERT_TRUE(gone.expired());
+
+    EXPECT_EQ(sayingsOf(taggings), before);
+    for (const auto& tagging : taggings) {
+        EXPECT_EQ(tagging->tag()->category(), nullptr);
+        EXPECT_EQ(tagging->type(), tagging->tag()->valueType() == kTagValueBipolar ? 1 : 0);
+        EXPECT_FALSE(TGRTTaxonomy::defaultTaxonomy()->doesContainTag(tagging->tag()));
+        EXPECT_NE(tagging->displayString(), "");
+    }
+    // They are still what a writer stores, and what a set compares.
+    EXPECT_THAT(TGRTTagging::taggingDictionaryForTaggings(taggings), Not(IsEmpty()));
+    EXPECT_EQ(taggings, aggregator->taggingsWithContentsOfURL(url, *TGRTTaxonomy::defaultTaxonomy(),
+                                                              QVCTAutoTaggingOptionFilenameKeywords));
+}
+
+TEST(ReleasedTaxonomy, IsMadeAnewAfterEviction) {
+    const auto held = TGRTTaxonomy::defaultTaxonomy();
+    TGRTTaxonomy::evictCache();
+    const auto anew = TGRTTaxonomy::defaultTaxonomy();
+    EXPECT_NE(held, anew);
+    EXPECT_TRUE(anew->doesContainTag(held->findTagForLabel("House")));
+}
+
+/// What one thread finds out about the items.
+std::vector<std::string> tagAll(const std::vector<URL>& items, QVTaggingAggregator& aggregator) {
+    const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
+    const auto searching = TGRTTaxonomySearching::initWithTaxonomy(taxonomy);
+    std::vector<std::string> results;
+    for (const URL& url : items) {
+        const auto taggings = aggregator.taggingsWithContentsOfURL(url, *taxonomy, kEverything);
+        const auto object = TGRTIndexableContentObject::indexableContentObjectForURL(
+            url, std::uint64_t{kReadMappedTaggings} | kIndexWithoutRecord);
+        std::string text = url.lastPathComponent();
+        for (const std::string& saying : sayingsOf(taggings)) text += " " + saying;
+        for (const std::string& saying : sayingsOf(object->taggingDatas())) text += " " + saying;
+        results.push_back(text + std::to_string(searching->findTagsForString(text.substr(0, 3)).size()));
+    }
+    return results;
+}
+
+/// Every fourth item stores a label of its own, so that reading makes taxonomies grow.
+void storeUnknownLabels(const std::vector<URL>& items) {
+    const auto taxonomy = TGRTTaxonomy::testingTaxonomy();
+    for (std::size_t i = 0; i < items.size(); i += 4) {
+        const auto tag = taxonomy->findOrCreateTagWithLabel("Label " + std::to_string(i), "Genres");
+        const auto writer = TGRTMetaDataWriterFactory::taggingWriterForURL(items[i]);
+        Error error;
+        ASSERT_TRUE(!writer ||
+                    writer->writeTaggings({TGRTTagging::initWithTag(tag, nullptr)}, items[i], &error))
+            << error.message;
+    }
+}
+
+TEST(Threads, TagTheSameItemsAtOnceWithAnAggregatorEach) {
+    const TemporaryFolder folder;
+    const std::vector<URL> items = writeDemoLibrary(folder);
+    storeUnknownLabels(items);
+    const auto expected = tagAll(items, *QVTaggingAggregator::independentTaggingAggregator());
+
+    // The shared taxonomies are made while all threads ask for them.
+    TGRTTaxonomy::evictCache();
+    constexpr std::size_t count = 4;
+    std::vector<std::vector<std::string>> results(count);
+    std::vector<std::thread> threads;
+    for (std::size_t i = 0; i < count; ++i) {
+        threads.emplace_back(
+            [&, i] { results[i] = tagAll(items, *QVTaggingAggregator::independentTaggingAggregator()); });
+    }
+    for (std::thread& thread : threads) thread.join();
+    EXPECT_THAT(results, Each(expected));
+}
+
+TEST(Threads, FindTheSameAsOneByOneInTheSharedTaxonomy) {
+    const TemporaryFolder folder;
+    const std::vector<URL> items = writeDemoLibrary(folder);
+    storeUnknownLabels(items);
+    const auto aggregator = QVTaggingAggregator::defaultTaggingAggregator();
+    const std::size_t before = TGRTTaxonomy::mutableDefaultTaxonomy()->allTags().size();
+    const auto independent = tagAll(items, *QVTaggingAggregator::independentTaggingAggregator());
+    // The independent one has left the shared taxonomy alone; the default one adds what it reads.
+    EXPECT_EQ(TGRTTaxonomy::mutableDefaultTaxonomy()->allTags().size(), before);
+    EXPECT_EQ(tagAll(items, *aggregator), independent);
+    EXPECT_GT(TGRTTaxonomy::mutableDefaultTaxonomy()->allTags().size(), before);
+}
+
+}  // namespace
+}  // namespace qvct
