@@ -148,7 +148,12 @@ std::unique_ptr<Connection> openDatabase(const std::string& path, Access access)
     // An interrupted creation is finished by SQLite itself, from its journal.
     if (!isNew && !isMarkedAsContentDatabase(path) && !fileExists(path + "-journal"))
         refuse(path, kErrorInvalidArgument, "not a content database, or one whose beginning is damaged");
-    if (access == Access::read) return openForReading(path);
+    if (access == Access::read) {
+        // A reader may not finish what a writer was interrupted in.
+        if (fileExists(path + "-journal"))
+            Connection(path, Connection::Access::create).number("PRAGMA schema_version");
+        return openForReading(path);
+    }
     auto connection = std::make_unique<Connection>(path, Connection::Access::create);
     prepare(*connection, isNew || connection->number("PRAGMA application_id") == 0, access);
     return connection;
