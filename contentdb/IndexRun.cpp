@@ -131,7 +131,7 @@ bool IndexRun::submit(const ListedItem& item, ItemId id, const std::shared_ptr<O
         if (!collect()) return false;
     }
     ++folder->remaining;
-    pending_[++lastTicket_] = {id != 0 ? id : nextId_++, folder};
+    pending_[++lastTicket_] = {id != 0 ? id : nextId_++, id == 0, folder};
     workers_.submit(lastTicket_, joined(folder->path, item.name), item.stamp);
     return true;
 }
@@ -191,7 +191,7 @@ void IndexRun::storeOne(const Described& described, Pending& pending) {
     } else {
         ++progress_.described;
     }
-    if (!isNewDatabase_ && !writer_.store().item(pending.id)) {
+    if (!isNewDatabase_ && pending.isNew) {
         if (const auto before = writer_.idOfMoved(item)) {
             writer_.addEarlierPath(*before, writer_.store().item(*before)->path);
             pending.id = *before;

@@ -36,6 +36,7 @@ class IndexRun {
     };
     struct Pending {
         ItemId id = 0;
+        bool isNew = false;
         std::shared_ptr<OpenFolder> folder;
     };
 

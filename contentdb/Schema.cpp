@@ -38,7 +38,7 @@ constexpr std::array kMigrations = {
            description BLOB NOT NULL
        );
        CREATE UNIQUE INDEX item_place ON item (folder, file);
-       CREATE INDEX item_payload ON item (payload) WHERE length(payload) > 0;
+       CREATE INDEX item_payload ON item (payload, inode) WHERE length(payload) > 0;
        CREATE INDEX item_failed ON item (id) WHERE failed = 1;
        CREATE TABLE earlier_path (item INTEGER, path BLOB, PRIMARY KEY (item, path)) WITHOUT ROWID;
        -- What items are found by, and for each term and chunk of 65,536 items the items that have it.

@@ -16,6 +16,16 @@ namespace {
 /// Most terms whose numbers are remembered; beyond that they are looked up again.
 constexpr std::size_t kMostCachedTerms = 200000;
 
+/// Most items of one payload that are asked whether they are gone.
+constexpr int kMostCandidates = 16;
+
+std::string candidatesWhere(std::string_view condition) {
+    return fmt::format(
+        "SELECT item.id, folder.path, item.file FROM item JOIN folder ON folder.id = item.folder "
+        "WHERE payload = ? AND length(payload) > 0 {} LIMIT {}",
+        condition, kMostCandidates);
+}
+
 }  // namespace
 
 StoreWriter::StoreWriter(Connection& connection)
@@ -24,6 +34,8 @@ StoreWriter::StoreWriter(Connection& connection)
       putTerm_(connection, "INSERT INTO term (value) VALUES (?) RETURNING id"),
       putPosting_(connection, "INSERT OR REPLACE INTO posting VALUES (?, ?)"),
       dropPosting_(connection, "DELETE FROM posting WHERE key = ?"),
+      sameFiles_(connection, candidatesWhere("AND inode = ?")),
+      samePayloads_(connection, candidatesWhere("")),
       folder_(connection, "SELECT id, digest, gone FROM folder WHERE path = ?"),
       putFolder_(connection, "INSERT INTO folder (path, digest, gone) VALUES (?, 0, 0) RETURNING id") {}
 
@@ -74,15 +86,21 @@ void StoreWriter::remove(ItemId id) {
 
 std::optional<ItemId> StoreWriter::idOfMoved(const IndexedItem& item) {
     if (item.payloadHash.empty()) return std::nullopt;
-    // Copies of one sound may be many; a few that are still where they were say enough.
-    Statement statement(store_.connection(),
-                        "SELECT id FROM item WHERE payload = ? AND length(payload) > 0 LIMIT 16");
-    for (statement.bind(1, item.payloadHash); statement.step();) {
-        const auto candidate = store_.item(statement.integer(0));
-        if (candidate && candidate->path != item.path && !fileExists(candidate->path))
-            return statement.integer(0);
-    }
-    return std::nullopt;
+    const auto firstGone = [&item](Statement& candidates) {
+        std::optional<ItemId> id;
+        while (!id && candidates.step()) {
+            const std::string folder(candidates.bytes(1));
+            const std::string path =
+                (folder == "/" ? folder : folder + "/") + std::string(candidates.bytes(2));
+            if (path != item.path && !fileExists(path)) id = candidates.integer(0);
+        }
+        candidates.reset();
+        return id;
+    };
+    // A file that was only moved is the same to the file system. Else, of the copies that one sound may have,
+    // a few that are still where they were say enough.
+    const auto same = firstGone(sameFiles_.bind(1, item.payloadHash).bind(2, item.stamp.inode));
+    return same ? same : firstGone(samePayloads_.bind(1, item.payloadHash));
 }
 
 void StoreWriter::addEarlierPath(ItemId id, std::string_view path) {

@@ -77,6 +77,8 @@ class StoreWriter {
     Statement putTerm_;
     Statement putPosting_;
     Statement dropPosting_;
+    Statement sameFiles_;
+    Statement samePayloads_;
     Statement folder_;
     Statement putFolder_;
 };

@@ -87,7 +87,14 @@ std::string textOf(const IndexedTagging& tagging) {
     return tagging.level ? fmt::format("{} {:.0f}%", tagging.label, *tagging.level * 100) : tagging.label;
 }
 
-/// A heading a folder, below it a line an item: its name and tags.
+std::optional<double> tempoOf(const IndexedItem& item) {
+    const auto hit = std::find_if(item.values.begin(), item.values.end(),
+                                  [](const IndexedValue& value) { return value.key == "Tempo"; });
+    const auto* tempo = hit == item.values.end() ? nullptr : std::get_if<double>(&hit->value);
+    return tempo == nullptr ? std::nullopt : std::optional(*tempo);
+}
+
+/// A heading a folder, below it a line an item: its name, tempo and tags.
 void printItems(const std::vector<const IndexedItem*>& items, const std::vector<std::string>& notes,
                 const Terminal& terminal) {
     constexpr std::size_t widest = 40;
@@ -102,6 +109,8 @@ void printItems(const std::vector<const IndexedItem*>& items, const std::vector<
         folder = its;
         std::vector<Word> words;
         if (!notes.empty()) words.push_back({notes[i], Color::strong});
+        if (const auto tempo = tempoOf(*items[i]))
+            words.push_back({fmt::format("{:g} bpm", *tempo), Color::faint});
         for (const IndexedTagging& tagging : items[i]->taggings)
             words.push_back({printable(textOf(tagging)), tagging.level ? Color::accent : Color::plain});
         fmt::print("  {}  {}\n", padded(printable(items[i]->name), width),

@@ -186,6 +186,20 @@ TEST_F(Indexing, KnowsAMovedFileAgain) {
     EXPECT_TRUE(database->check());
 }
 
+TEST_F(Indexing, KnowsAMovedFileAmongManyCopies) {
+    for (int i = 0; i < 60; ++i) write(fmt::format("{}/Kick.wav", i), "the same");
+    settle();
+    index();
+    const ItemId before = ContentDatabase::open(database())->item(library() + "/57/Kick.wav")->id;
+    std::filesystem::rename(library() + "/57", library() + "/moved");
+    settle();
+    EXPECT_EQ(index().moved, 1U);
+    EXPECT_EQ(ContentDatabase::open(database())->item(library() + "/moved/Kick.wav")->id, before);
+    write("copied/Kick.wav", "the same");
+    settle();
+    EXPECT_EQ(index().moved, 0U);
+}
+
 TEST_F(Indexing, LosesOneItemToEachThatFailsCrashesOrHangs) {
     std::vector<std::string> good;
     for (int i = 0; i < 300; ++i) {
