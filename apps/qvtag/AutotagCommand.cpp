@@ -116,14 +116,13 @@ void addAnyRhythm(const URL& url, const TGRTTaxonomy& taxonomy, ObjectSet<TGRTTa
 
 void run(const Options& options, ToolContext& context) {
     const auto bits = optionsForServices(options.services, context);
-    if (!bits) return;
     const auto aggregator =
         QVTaggingAggregator::initWithRules(settingsIn(options.rulesFile, "rules", context),
                                            settingsIn(options.keywordsFile, "keywords", context));
     const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
     std::vector<Item> items;
     for (const URL& url : context.contentItems(options.paths)) {
-        auto taggings = aggregator->taggingsWithContentsOfURL(url, *taxonomy, *bits);
+        auto taggings = aggregator->taggingsWithContentsOfURL(url, *taxonomy, bits);
         if (options.measuresAnyRhythm) addAnyRhythm(url, *taxonomy, taggings);
         items.push_back({url, sortedTaggings(taggings)});
     }

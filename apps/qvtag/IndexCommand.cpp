@@ -62,8 +62,8 @@ void printRun(const Json& run, const IndexProgress& progress, const ToolContext&
 
 void run(Options& options, ToolContext& context) {
     const auto services = optionsForServices(options.services, context);
-    if (!services) return;
-    const auto factory = [&services] { return std::make_unique<contentdb::ContentDescriber>(*services); };
+    if (context.exitStatus() != 0) return;  // half of the services would mark the items as done
+    const auto factory = [&services] { return std::make_unique<contentdb::ContentDescriber>(services); };
     Progress bar(context.quiet);
     IndexOptions& index = options.index;
     index.timeLimitPerItem = std::chrono::seconds(options.secondsPerItem);

@@ -26,7 +26,7 @@ void addServicesOption(CLI::App& command, std::vector<std::string>& names) {
         ->type_name("A,B");
 }
 
-std::optional<std::uint64_t> optionsForServices(const std::vector<std::string>& names, ToolContext& context) {
+std::uint64_t optionsForServices(const std::vector<std::string>& names, ToolContext& context) {
     if (names.empty()) return optionsForAllTaggingServices();
     std::uint64_t options = 0;
     for (const std::string& name : names) {
@@ -35,7 +35,7 @@ std::optional<std::uint64_t> optionsForServices(const std::vector<std::string>& 
                          [&name](const TaggingServiceName& service) { return service.name == name; });
         if (hit == kTaggingServiceNames.end()) {
             context.usageFailed(fmt::format("no service \"{}\"; there are: {}", printable(name), allNames()));
-            return std::nullopt;
+            continue;
         }
         options |= hit->option;
     }

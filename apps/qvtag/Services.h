@@ -3,7 +3,6 @@
 #include "ToolContext.h"
 
 #include <cstdint>
-#include <optional>
 #include <string>
 #include <vector>
 
@@ -16,8 +15,8 @@ namespace qvct::tool {
 /// Adds "--services": one list, behind which paths may follow.
 void addServicesOption(CLI::App& command, std::vector<std::string>& names);
 
-/// The options of the services by name; of all of them when none is named. Nothing after a wrong name, which
-/// is reported.
-std::optional<std::uint64_t> optionsForServices(const std::vector<std::string>& names, ToolContext& context);
+/// The options of the services by name; of all of them when none is named. A wrong name is reported and left
+/// out.
+std::uint64_t optionsForServices(const std::vector<std::string>& names, ToolContext& context);
 
 }  // namespace qvct::tool
