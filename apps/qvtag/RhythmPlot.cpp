@@ -85,7 +85,7 @@ class Painter {
     void paintTitle() {
         text(kLeft, 24, plot_.title, " font-size=\"16\" font-weight=\"bold\"");
         text(kLeft, 44,
-             fmt::format("density {:.3f}   complexity {:.3f}   {} beats in {}/{} at {:.6g} a minute",
+             fmt::format("density {:.3f} · complexity {:.3f} · {} beats in {}/{} at {:.6g} a minute",
                          plot_.density, plot_.complexity, plot_.beatCount, plot_.signatureTop,
                          plot_.signatureBottom, plot_.tempo));
     }
@@ -159,7 +159,8 @@ class Painter {
         text(kLeft, kWeightTop - 6, "metric weight of each cell; red where an onset falls");
         std::set<std::size_t> hit;
         for (const double onset : plot_.onsets) {
-            if (isInside(onset)) hit.insert(static_cast<std::size_t>(onset * kCellsPerBeat));
+            // The nearest cell, as it is measured: an exact half falls back.
+            if (isInside(onset)) hit.insert(static_cast<std::size_t>(std::ceil(onset * kCellsPerBeat - 0.5)));
         }
         const std::size_t cells =
             std::min(plot_.metricWeights.size(), static_cast<std::size_t>(beats_ * kCellsPerBeat));

@@ -40,6 +40,21 @@ TEST(RhythmPlot, DrawsGridOnsetsWeightsAndLevels) {
     EXPECT_THAT(svg, testing::HasSubstr("0.750"));
 }
 
+TEST(RhythmPlot, MarksTheCellThatAnOnsetCountsFor) {
+    const auto marked = [](double onset) {
+        RhythmPlot plot = fourBeats();
+        plot.onsets = {onset};
+        const std::string svg = plot.svg(), colour = "fill=\"#d0342c\"";
+        const auto end = svg.find(colour);
+        return end == std::string::npos ? "" : svg.substr(svg.rfind('<', end), 16);
+    };
+    EXPECT_EQ(marked(0.4999), marked(0.5));
+    EXPECT_EQ(marked(0.5625), marked(0.5));
+    EXPECT_EQ(marked(0.563), marked(0.625));
+    EXPECT_NE(marked(0.5), marked(0.625));
+    EXPECT_EQ(marked(3.99), "") << "counts for the beat behind the loop";
+}
+
 TEST(RhythmPlot, DrawsAWaveformOrElseAPianoRoll) {
     RhythmPlot plot = fourBeats();
     plot.notes = {{0, 0.5, 36, 127}, {1, 0.5, 38, 64}, {9, 10, 40, 1}};
