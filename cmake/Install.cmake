@@ -4,7 +4,6 @@ include(CMakePackageConfigHelpers)
 
 # Headers include each other by paths from src/, which are too common to be found by everybody who has a
 # "platform/Error.h" of his own: installed they say <qvcontenttagging/platform/Error.h>.
-set(include_folder "${CMAKE_INSTALL_INCLUDEDIR}/qvcontenttagging")
 list(TRANSFORM QVCT_PUBLIC_HEADERS PREPEND "${PROJECT_SOURCE_DIR}/src/" OUTPUT_VARIABLE headers)
 list(TRANSFORM QVCT_PUBLIC_DATABASE_HEADERS PREPEND "${PROJECT_SOURCE_DIR}/" OUTPUT_VARIABLE database_headers)
 foreach(header IN LISTS headers database_headers)
@@ -18,9 +17,9 @@ foreach(header IN LISTS headers database_headers)
     DEPENDS "${header}" "${PROJECT_SOURCE_DIR}/cmake/InstalledHeader.cmake" VERBATIM
     COMMENT "Header ${folder}/${name} as it is installed")
   list(APPEND installed_headers "${installed}")
+  install(FILES "${installed}" DESTINATION "${CMAKE_INSTALL_INCLUDEDIR}/qvcontenttagging/${folder}")
 endforeach()
 add_custom_target(qvct_installed_headers ALL DEPENDS ${installed_headers})
-install(DIRECTORY "${PROJECT_BINARY_DIR}/include/qvcontenttagging" DESTINATION "${CMAKE_INSTALL_INCLUDEDIR}")
 
 # Two export sets, so that a host that loads the shared libraries needs none of what they are built on.
 set_target_properties(qvcontenttagging_shared PROPERTIES EXPORT_NAME qvcontenttagging)

@@ -50,12 +50,14 @@ set(QVCT_PUBLIC_HEADERS
   autotagging/QVSKXMLNode.h
   autotagging/QVTaggingAggregator.h
   autotagging/TagDictionary.h
+  autotagging/TaggingServiceNames.h
   indexing/QVContentTaggingIndexableContentObject.h
   indexing/TGRTIndexableContentObject.h)
 
 # Those of the content database, a library of its own.
 set(QVCT_PUBLIC_DATABASE_HEADERS
   contentdb/ContentDatabase.h
+  contentdb/ContentDescriber.h
   contentdb/IndexedItem.h
   contentdb/Indexer.h
   contentdb/Query.h

@@ -2,6 +2,7 @@
 
 #include "autotagging/TaggingServiceNames.h"
 #include "contentdb/IndexedItem.h"
+#include "platform/Export.h"
 
 #include <cstdint>
 #include <memory>
@@ -20,7 +21,7 @@ namespace qvct::contentdb {
 ///
 /// An item has failed when its record, or an audio file's header, cannot be read. One without record is
 /// described by its name and the services.
-class ContentDescriber : public ItemDescriber {
+class QVCT_API ContentDescriber : public ItemDescriber {
   public:
     /// `services`: a sum of QVCTAutoTaggingOptions.
     explicit ContentDescriber(std::uint64_t services = optionsForAllTaggingServices());

@@ -2,12 +2,12 @@
 //
 //   host FOLDER DATABASE QUERY
 
-#include "LibraryDescriber.h"
-
 #include <iostream>
 
 #include <qvcontenttagging/autotagging/QVTaggingAggregator.h>
 #include <qvcontenttagging/contentdb/ContentDatabase.h>
+#include <qvcontenttagging/contentdb/ContentDescriber.h>
+#include <qvcontenttagging/contentdb/Indexer.h>
 #include <qvcontenttagging/formats/ContentWalk.h>
 #include <qvcontenttagging/formats/TGRTMetaDataReaderFactory.h>
 #include <qvcontenttagging/formats/TGRTMetaDataWriterFactory.h>
@@ -87,7 +87,8 @@ int main(int argc, char** argv) {
     IndexOptions options;
     options.folders = {argv[1]};
     options.database = argv[2];
-    const auto run = indexLibrary(options, makeLibraryDescriber, &error);
+    const auto run = indexLibrary(
+        options, [] { return std::make_unique<ContentDescriber>(); }, &error);
     if (!run) return fail(error.message);
     std::cout << run->described << " read, " << run->failed << " failed\n";
 

@@ -186,16 +186,20 @@ std::vector<std::string> tagAll(const std::vector<URL>& items, QVTaggingAggregat
     return results;
 }
 
-/// Every fourth item stores a label of its own, so that reading makes taxonomies grow.
+/// Every item stores labels of its own, so many that a taxonomy grows all the time while they are read.
 void storeUnknownLabels(const std::vector<URL>& items) {
     const auto taxonomy = TGRTTaxonomy::testingTaxonomy();
-    for (std::size_t i = 0; i < items.size(); i += 4) {
-        const auto tag = taxonomy->findOrCreateTagWithLabel("Label " + std::to_string(i), "Genres");
-        const auto writer = TGRTMetaDataWriterFactory::taggingWriterForURL(items[i]);
+    int number = 0;
+    for (const URL& url : items) {
+        ObjectSet<TGRTTagging> taggings;
+        for (int i = 0; i < 100; ++i) {
+            const auto tag =
+                taxonomy->findOrCreateTagWithLabel("Label " + std::to_string(++number), "Genres");
+            taggings.insert(TGRTTagging::initWithTag(tag, nullptr));
+        }
+        const auto writer = TGRTMetaDataWriterFactory::taggingWriterForURL(url);
         Error error;
-        ASSERT_TRUE(!writer ||
-                    writer->writeTaggings({TGRTTagging::initWithTag(tag, nullptr)}, items[i], &error))
-            << error.message;
+        ASSERT_TRUE(writer && writer->writeTaggings(taggings, url, &error)) << url.path() << error.message;
     }
 }
 
