@@ -74,7 +74,8 @@ class ItemGenerator {
             if (!its.parent.empty()) tagging.ancestors.emplace_back(its.parent);
             if (pick(3) == 0) tagging.level = static_cast<float>(pick(11)) / 10.0F;
             tagging.provenance = static_cast<contentdb::Provenance>(pick(3));
-            if (tagging.provenance == contentdb::Provenance::automatic) tagging.service = pick(2) == 0 ? "keywords" : "rhythm";
+            if (tagging.provenance == contentdb::Provenance::automatic)
+                tagging.service = pick(2) == 0 ? "keywords" : "rhythm";
             tagging.isAuto = pick(2) == 0;
             item.taggings.push_back(std::move(tagging));
         }
