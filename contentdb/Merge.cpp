@@ -47,6 +47,9 @@ class Merge {
         writer_.begin();
         for (const auto& [path, parts] : folders()) addFolder(parts);
         writer_.commit();
+        // Closing writes the log into the file as well, but does not tell when that fails.
+        if (connection_->number("PRAGMA wal_checkpoint(TRUNCATE)") != 0)
+            connection_->fail("cannot write the log into the file");
     }
 
   private:

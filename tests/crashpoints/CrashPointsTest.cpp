@@ -11,6 +11,7 @@
 
 #include <chrono>
 #include <cstdio>
+#include <cstdlib>
 #include <functional>
 #include <map>
 #include <optional>
@@ -160,24 +161,38 @@ void expectOldOrNew(const Item& item, const Files& after, const std::string& fol
     EXPECT_TRUE(outcome == Outcome::died || filesIn(folder, true).empty()) << "a file was left behind";
 }
 
+std::size_t cutTagWrite(const Item& item, bool (*write)(const std::string&)) {
+    SCOPED_TRACE(item.name);
+    const Act act = [&](const std::string& folder) { return write(folder + "/" + item.name); };
+    const TemporaryFolder folder;
+    const std::string path = restored(folder, item.files);
+    const auto hash = audioHash(path + "/" + item.name);
+    EXPECT_TRUE(act(path));
+    EXPECT_EQ(audioHash(path + "/" + item.name), hash);
+    const Files after = filesIn(path);
+    EXPECT_NE(after, item.files);
+    return cutEveryCall(folder, item.files, act, [&](const std::string& where, Outcome outcome) {
+        expectOldOrNew(item, after, where, outcome);
+        EXPECT_EQ(audioHash(where + "/" + item.name), hash);
+    });
+}
+
+/// The item with a record in it, which the next write has to replace.
+Item described(const Item& item) {
+    const TemporaryFolder folder;
+    const std::string path = restored(folder, item.files);
+    const auto writer = TGRTFileNode::nodeWithFileURL(urlOf(path + "/" + item.name))
+                            ->taggingWriterForFileURL(urlOf(path + "/" + item.name));
+    EXPECT_TRUE(writer->writeTaggings(taggingsOf({{"Descriptors", "Dry"}}, 0.25),
+                                      urlOf(path + "/" + item.name), nullptr));
+    return {item.name, filesIn(path)};
+}
+
 std::size_t cutTagWrites() {
     std::size_t cuts = 0;
     for (const Item& item : itemsOfEveryKind()) {
-        for (const auto& write : {writeTaggings, writeRecord}) {
-            SCOPED_TRACE(item.name);
-            const Act act = [&](const std::string& folder) { return write(folder + "/" + item.name); };
-            const TemporaryFolder folder;
-            const std::string path = restored(folder, item.files);
-            const auto hash = audioHash(path + "/" + item.name);
-            EXPECT_TRUE(act(path));
-            EXPECT_EQ(audioHash(path + "/" + item.name), hash);
-            const Files after = filesIn(path);
-            EXPECT_NE(after, item.files);
-            cuts += cutEveryCall(folder, item.files, act, [&](const std::string& where, Outcome outcome) {
-                expectOldOrNew(item, after, where, outcome);
-                EXPECT_EQ(audioHash(where + "/" + item.name), hash);
-            });
-        }
+        for (const auto& write : {writeTaggings, writeRecord})
+            cuts += cutTagWrite(item, write) + cutTagWrite(described(item), write);
     }
     return cuts;
 }
@@ -216,45 +231,101 @@ std::vector<std::string> namesIndexed(const std::string& folder) {
     return names;
 }
 
-/// A library, the database of what it was before two of its files went and others came.
-Files changedLibrary(const TemporaryFolder& folder, std::size_t before, std::size_t after) {
+/// What an index run finds: a library whose database knows `known` items, two of which have gone since, and
+/// `added` new ones.
+struct Change {
+    std::size_t known;
+    std::size_t added;
+    bool isDamaged = false;
+
+    std::size_t gone() const { return std::min<std::size_t>(known, 2); }
+    std::size_t items() const { return known - gone() + added; }
+};
+
+Files changedLibrary(const TemporaryFolder& folder, const Change& change) {
     const std::string path = restored(folder, {});
-    for (std::size_t i = 0; i < before; ++i) folder.write(fmt::format("user/library/Old {}.wav", i), "old");
-    EXPECT_TRUE(before == 0 || indexFolder(path));
-    for (std::size_t i = 0; i < std::min<std::size_t>(before, 2); ++i)
+    for (std::size_t i = 0; i < change.known; ++i)
+        folder.write(fmt::format("user/library/Old {}.wav", i), "old");
+    EXPECT_TRUE(change.known == 0 || indexFolder(path));
+    for (std::size_t i = 0; i < change.gone(); ++i)
         fs::remove(folder.path(fmt::format("user/library/Old {}.wav", i)));
-    for (std::size_t i = 0; i < after; ++i) folder.write(fmt::format("user/library/New {}.wav", i), "new");
+    for (std::size_t i = 0; i < change.added; ++i)
+        folder.write(fmt::format("user/library/New {}.wav", i), "new");
+    if (change.isDamaged) {
+        constexpr std::size_t intact = 8192;
+        std::string database = readAll(path + "/db");
+        database.replace(intact, std::string::npos, std::string(database.size() - intact, 'x'));
+        folder.write("user/db", database);
+    }
     return filesIn(path);
 }
 
 std::size_t cutIndexRuns() {
     std::size_t cuts = 0;
-    for (const auto& [before, after] : {std::pair<std::size_t, std::size_t>{0, 8}, {8, 6}}) {
-        SCOPED_TRACE(fmt::format("index of {} items, then {} new ones", before, after));
+    for (const Change& change : {Change{0, 8}, Change{8, 6}, Change{8, 6, true}}) {
+        SCOPED_TRACE(fmt::format("index of {} items, then {} new ones", change.known, change.added));
         const TemporaryFolder folder;
-        const Files files = changedLibrary(folder, before, after);
-        const std::size_t items = after + before - std::min<std::size_t>(before, 2);
-        const bool isNew = before == 0;
+        const Files files = changedLibrary(folder, change);
+        // Before its first commit a database holds nothing yet that could be opened.
+        const bool hasOpened = change.known > 0 && !change.isDamaged;
         cuts += cutEveryCall(folder, files, indexFolder, [&](const std::string& path, Outcome /*outcome*/) {
-            // Before its first commit a database holds nothing yet that could be opened.
-            if (!isNew) namesIndexed(path);
+            if (hasOpened) namesIndexed(path);
             EXPECT_TRUE(indexFolder(path)) << "cannot be continued";
-            EXPECT_EQ(namesIndexed(path).size(), items);
+            EXPECT_EQ(namesIndexed(path).size(), change.items());
         });
     }
     return cuts;
 }
 
-TEST(CrashPoints, OfTagWritesLoseNothing) {
-    const std::size_t cuts = cutTagWrites();
-    std::printf("crash points of tag writes: %zu\n", cuts);
-    EXPECT_GE(cuts, 400U);
+bool mergeSlices(const std::string& folder) {
+    return contentdb::mergeDatabases({folder + "/slice1", folder + "/slice2"}, folder + "/db");
 }
 
-TEST(CrashPoints, OfIndexRunsLoseNothing) {
+std::size_t cutMerges() {
+    const TemporaryFolder folder;
+    const std::size_t itemsOfSlice = 12;
+    for (const char* slice : {"slice1", "slice2"}) {
+        const std::string path = restored(folder, {});
+        for (std::size_t i = 0; i < itemsOfSlice; ++i)
+            folder.write(fmt::format("user/library/{} {}.wav", slice, i), "sound");
+        EXPECT_TRUE(indexFolder(path));
+        fs::copy_file(path + "/db", folder.path(slice));
+    }
+    const Files slices{{"slice1", readAll(folder.path("slice1"))},
+                       {"slice2", readAll(folder.path("slice2"))}};
+    return cutEveryCall(folder, slices, mergeSlices, [&](const std::string& path, Outcome outcome) {
+        const bool isThere = fs::exists(path + "/db");
+        EXPECT_TRUE(isThere || outcome != Outcome::succeeded);
+        EXPECT_TRUE(isThere || mergeSlices(path)) << "cannot be repeated";
+        EXPECT_EQ(namesIndexed(path).size(), 2 * itemsOfSlice);
+        for (const auto& [name, contents] : slices) EXPECT_EQ(readAll(path + "/" + name), contents);
+    });
+}
+
+/// In memory, where flushing costs nothing, on systems that keep files there.
+class CrashPoints : public testing::Test {
+  protected:
+    static void SetUpTestSuite() {
+        if (fs::is_directory("/dev/shm")) ::setenv("TMPDIR", "/dev/shm", 0);
+    }
+};
+
+TEST_F(CrashPoints, OfTagWritesLoseNothing) {
+    const std::size_t cuts = cutTagWrites();
+    std::printf("crash points of tag writes: %zu\n", cuts);
+    EXPECT_GE(cuts, 900U);
+}
+
+TEST_F(CrashPoints, OfIndexRunsLoseNothing) {
     const std::size_t cuts = cutIndexRuns();
     std::printf("crash points of index runs: %zu\n", cuts);
-    EXPECT_GE(cuts, 200U);
+    EXPECT_GE(cuts, 800U);
+}
+
+TEST_F(CrashPoints, OfMergesLoseNothing) {
+    const std::size_t cuts = cutMerges();
+    std::printf("crash points of merges: %zu\n", cuts);
+    EXPECT_GE(cuts, 350U);
 }
 
 }  // namespace
