@@ -39,8 +39,10 @@ void keep(const T& value) {
     asm volatile("" : : "g"(&value) : "memory");
 }
 
+/// One row of the table that `bench/run` gathers: what, how much, and what it should be (or nothing). Two
+/// blanks in front say that a row belongs to the one above it.
 inline void printRow(std::string_view what, std::string_view measured, std::string_view target) {
-    fmt::print("{:<58} {:>24}   {}\n", what, measured, target);
+    fmt::print("{:<62} | {:>28} | {}\n", what, measured, target);
 }
 
 }  // namespace qvct::bench

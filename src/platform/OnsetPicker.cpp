@@ -6,7 +6,7 @@
 namespace qvct {
 namespace {
 
-constexpr double kBefore = 0.010, kAfter = 0.010;              // seconds
+constexpr double kBefore = 0.010, kAfter = 0.005;              // seconds
 constexpr double kMedianBefore = 0.100, kMedianAfter = 0.050;  // seconds
 constexpr double kDistance = 0.030;                            // seconds
 constexpr float kThreshold = 0.12F, kMedianFactor = 1.75F;

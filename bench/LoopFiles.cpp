@@ -2,6 +2,7 @@
 // AIFF files beside TagLib's open with properties, and writing a tag beside a copy of the file.
 //
 //   loopfile_bench [folder of sounds] [folder to write in]
+#include "Measure.h"
 #include "platform/LCFileParser.h"
 #include "platform/LCFileWriter.h"
 
@@ -95,11 +96,12 @@ void benchReading(const fs::path& folder) {
 #endif
     readOurs(files);  // warm
     const auto times = medians(201, works);
-    fmt::print("read {} WAV and AIFF files, warm: {:.2f} µs a file", files.size(), times[0] * perFile);
-    if (times.size() > 1) {
-        fmt::print("; TagLib {:.2f} µs, {:.2f} times ours", times[1] * perFile, times[1] / times[0]);
-    }
-    fmt::print("\n");
+    bench::printRow(fmt::format("{} WAV and AIFF files read, warm", files.size()),
+                    fmt::format("{:.2f} µs a file", times[0] * perFile), "");
+    if (times.size() == 1) return;
+    bench::printRow("  opened with properties by TagLib", fmt::format("{:.2f} µs a file", times[1] * perFile),
+                    "");
+    bench::printRow("  ratio", fmt::format("{:.2f}", times[1] / times[0]), "at least 2");
 }
 
 void flush(const fs::path& file) {
@@ -158,12 +160,14 @@ void benchWriting(const fs::path& folder) {
                                             flush(other);
                                         },
                                         [&] { copyByTool(file, other); }});
-        fmt::print(
-            "write a tag into {:.1f} MB: {:.2f} ms; flushed copy {:.2f} ms ({:.2f} of it), cp and flush "
-            "{:.2f} ms ({:.2f} of "
-            "it), cp alone {:.2f} ms\n",
-            frames * 4e-6, times[0] * 1e3, times[1] * 1e3, times[0] / times[1], times[2] * 1e3,
-            times[0] / times[2], times[3] * 1e3);
+        const auto compared = [&](std::size_t other) {
+            return fmt::format("{:.2f} ms, {:.2f} of it", times[other] * 1e3, times[0] / times[other]);
+        };
+        bench::printRow(fmt::format("a tag written into a file of {:.1f} MB", frames * 4e-6),
+                        fmt::format("{:.2f} ms", times[0] * 1e3), "");
+        bench::printRow("  a copy by us, flushed", compared(1), "at most 1");
+        bench::printRow("  a copy by cp, flushed", compared(2), "at most 1");
+        bench::printRow("  a copy by cp, not flushed", compared(3), "");
     }
     fs::remove(file);
     fs::remove(other);

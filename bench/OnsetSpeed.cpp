@@ -1,7 +1,8 @@
 // How fast onsets are found, decoding included: a stereo file of 16 bits at 44.1 kHz, beside aubioonset on
-// the same file, both in processor time of one core. Usage: onset_speed [minutes]
+// the same file, both in processor time of one core. Usage: bench_onset_speed [minutes]
 #include "Aubio.h"
 #include "Corpus.h"
+#include "Measure.h"
 #include "WavFile.h"
 #include "platform/AudioDecoder.h"
 #include "platform/OnsetDetector.h"
@@ -38,9 +39,10 @@ std::vector<float> stereoGrooves(const DrumCorpus& corpus, double minutes) {
     return stereo;
 }
 
-void report(const char* name, double audio, double processor, std::size_t onsets) {
-    fmt::print("{:12} {:8.3f} s for {:.0f} s: {:6.0f} times real time, {} onsets\n", name, processor, audio,
-               audio / processor, onsets);
+void report(const char* name, double audio, double processor, std::size_t onsets, const char* target) {
+    printRow(fmt::format("onsets of {:.0f} s of stereo, decoded and found by {}", audio, name),
+             fmt::format("{:.3f} s = {:.0f} times real time", processor, audio / processor), target);
+    printRow("  onsets", fmt::format("{}", onsets), "");
 }
 
 }  // namespace
@@ -64,7 +66,7 @@ int main(int count, char** arguments) {
         const auto decoder = qvct::AudioDecoder::open(std::string(wav));
         const auto onsets = qvct::OnsetDetector::detect(*decoder);
         ours = std::min(ours, processorSeconds(RUSAGE_SELF) - start);
-        if (round == 2) report("ours", minutes * 60, ours, onsets.size());
+        if (round == 2) report("us", minutes * 60, ours, onsets.size(), "1,250 times");
     }
     double theirs = 1e300;
     for (int round = 0; round < 3; ++round) {
@@ -76,8 +78,8 @@ int main(int count, char** arguments) {
         }
         theirs = std::min(theirs, processorSeconds(RUSAGE_CHILDREN) - start);
         if (round == 2) {
-            report("aubioonset", minutes * 60, theirs, onsets->size());
-            fmt::print("ratio        {:.2f}\n", theirs / ours);
+            report("aubioonset", minutes * 60, theirs, onsets->size(), "");
+            printRow("  ratio", fmt::format("{:.2f}", theirs / ours), "at least 5");
         }
     }
     ::unlink(wav);

@@ -1,8 +1,9 @@
 // How well onsets are found: grooves played by people, rendered with the one-shots of drum machines, so that
-// every true onset is known; beside aubioonset on the same files. Usage: onset_accuracy [seconds of each
-// groove]
+// every true onset is known; beside aubioonset on the same files. Usage: bench_onset_accuracy [seconds of
+// each groove]
 #include "Aubio.h"
 #include "Corpus.h"
+#include "Measure.h"
 #include "OnsetScore.h"
 #include "WavFile.h"
 #include "platform/AudioDecoder.h"
@@ -32,10 +33,6 @@ struct Scores {
         tight.add(truth, found);
         loose.add(truth, found);
     }
-    std::string text() const {
-        return fmt::format("{:.3f} {:.3f}  {:.3f}/{:.3f}  {:+5.2f} ms", tight.f(), loose.f(),
-                           loose.precision(), loose.recall(), loose.meanOffset() * 1000);
-    }
 };
 
 std::vector<double> ourOnsets(const std::string& path) {
@@ -58,7 +55,18 @@ void measure(const DrumCorpus& corpus, const Setting& setting, double seconds, c
         hasAubio = theirs.has_value();
         if (theirs) aubio.add(rendering.onsets, *theirs);
     }
-    fmt::print("{:18} {}   {}\n", setting.name, ours.text(), hasAubio ? aubio.text() : "not installed");
+    const auto compare = [&](const char* what, const OnsetScore& score, const OnsetScore& theirs) {
+        printRow(fmt::format("{}: F at ±{}", setting.name, what),
+                 hasAubio ? fmt::format("{:.3f}, aubioonset {:.3f}", score.f(), theirs.f())
+                          : fmt::format("{:.3f}", score.f()),
+                 "0.06 above");
+    };
+    compare("10 ms", ours.tight, aubio.tight);
+    compare("25 ms", ours.loose, aubio.loose);
+    printRow("  precision, recall, mean offset",
+             fmt::format("{:.3f}, {:.3f}, {:+.2f} ms", ours.loose.precision(), ours.loose.recall(),
+                         ours.loose.meanOffset() * 1000),
+             "offset within 2 ms");
     std::fflush(stdout);
 }
 
@@ -75,8 +83,6 @@ int main(int count, char** arguments) {
     }
     char wav[] = "/tmp/qvct-onsets-XXXXXX";
     ::close(::mkstemp(wav));
-    fmt::print("{:18} {:36} {}\n{:18} {}   {}\n", "", "ours", "aubioonset", "",
-               "F±10  F±25   prec./recall  offset  ", "F±10  F±25   prec./recall  offset");
     for (const Setting& setting : kSettings) measure(corpus, setting, seconds, wav);
     ::unlink(wav);
 }
