@@ -156,7 +156,7 @@ class Walk {
         open_.push_back(identity);
         bool goesOn = true;
         for (const std::string& name : folders) {
-            if (goesOn) goesOn = folder(path == "/" ? "/" + name : path + "/" + name);
+            if (goesOn) goesOn = folder(fmt::format("{}/{}", path == "/" ? "" : path, name));
         }
         open_.pop_back();
         return goesOn;

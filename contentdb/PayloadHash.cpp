@@ -117,7 +117,7 @@ bool addFolder(Payload& payload, const fs::path& folder, std::size_t& budget, st
 
 bool addContent(Payload& payload, const URL& url, const LCFileData* audio) {
     constexpr std::size_t mostFiles = 10000;
-    const std::string path = url.path();
+    const std::string& path = url.path();
     std::size_t budget = mostFiles;
     switch (QVContentTaggingTypes::fallBackFileTypeForURL(url)) {
         case kFileTypePatch:

@@ -109,6 +109,7 @@ std::int64_t countMatches(ContentStore& store, const Query& query) {
 std::vector<Facet> facets(ContentStore& store, const Query& query) {
     const std::vector<ContentStore::Tag> tags = store.tags();
     std::vector<Facet> result;
+    result.reserve(tags.size());
     for (const ContentStore::Tag& tag : tags) result.push_back({tag.label, tag.category, 0});
     Evaluation evaluation(store, query);
     evaluation.forEachChunk([&](std::int64_t chunk, const Bounds& bounds) {

@@ -75,7 +75,7 @@ std::string textOfTagging(const TGRTTagging& tagging) {
 
 std::string pathOfTag(const TGRTTag& tag) {
     std::string path = tag.label();
-    for (const auto& ancestor : tag.ancestors()) path = ancestor->label() + " > " + path;
+    for (const auto& ancestor : tag.ancestors()) path.insert(0, ancestor->label() + " > ");
     return tag.categoryIdentifier() + " > " + path;
 }
 

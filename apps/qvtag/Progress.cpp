@@ -1,6 +1,7 @@
 #include "Progress.h"
 
 #include <algorithm>
+#include <cmath>
 #include <cstdio>
 #include <string>
 
@@ -11,7 +12,7 @@ namespace qvct::tool {
 namespace {
 
 std::string duration(double seconds) {
-    const auto whole = static_cast<std::int64_t>(seconds + 0.5);
+    const auto whole = static_cast<std::int64_t>(std::llround(seconds));
     constexpr std::int64_t minute = 60;
     if (whole >= minute * minute)
         return fmt::format("{} h {:02} min", whole / minute / minute, whole / minute % minute);

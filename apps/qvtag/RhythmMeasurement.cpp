@@ -64,7 +64,7 @@ std::vector<Note> notesOf(const MidiSequence& sequence) {
     return notes;
 }
 
-std::optional<RhythmResult> measured(const URL& url, std::vector<Note> notes, const Metre& metre,
+std::optional<RhythmResult> measured(const URL& url, const std::vector<Note>& notes, const Metre& metre,
                                      Error* error) {
     if (notes.empty()) {
         failFor(error, url, "nothing sounds in it");

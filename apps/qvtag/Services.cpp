@@ -13,6 +13,7 @@ namespace {
 
 std::string allNames() {
     std::vector<std::string> names;
+    names.reserve(std::size(kTaggingServiceNames));
     for (const TaggingServiceName& service : kTaggingServiceNames) names.emplace_back(service.name);
     return join(names, ", ");
 }

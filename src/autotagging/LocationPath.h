@@ -7,8 +7,8 @@
 #include <variant>
 #include <vector>
 
-struct _xmlDoc;
-struct _xmlNode;
+struct _xmlDoc;   // NOLINT(bugprone-reserved-identifier): libxml2's name
+struct _xmlNode;  // NOLINT(bugprone-reserved-identifier): libxml2's name
 
 namespace qvct {
 

@@ -5,7 +5,7 @@
 #include <memory>
 #include <string>
 
-struct _xmlNode;
+struct _xmlNode;  // NOLINT(bugprone-reserved-identifier): libxml2's name
 
 namespace qvct {
 

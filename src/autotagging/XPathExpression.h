@@ -9,9 +9,9 @@
 #include <string_view>
 #include <vector>
 
-struct _xmlNode;
-struct _xmlXPathCompExpr;
-struct _xmlXPathContext;
+struct _xmlNode;           // NOLINT(bugprone-reserved-identifier): libxml2's name
+struct _xmlXPathCompExpr;  // NOLINT(bugprone-reserved-identifier): libxml2's name
+struct _xmlXPathContext;   // NOLINT(bugprone-reserved-identifier): libxml2's name
 
 namespace qvct {
 
