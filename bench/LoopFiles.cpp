@@ -160,8 +160,8 @@ void benchWriting(const fs::path& folder) {
                                             flush(other);
                                         },
                                         [&] { copyByTool(file, other); }});
-        const auto compared = [&](std::size_t other) {
-            return fmt::format("{:.2f} ms, {:.2f} of it", times[other] * 1e3, times[0] / times[other]);
+        const auto compared = [&](std::size_t which) {
+            return fmt::format("{:.2f} ms, {:.2f} of it", times[which] * 1e3, times[0] / times[which]);
         };
         bench::printRow(fmt::format("a tag written into a file of {:.1f} MB", frames * 4e-6),
                         fmt::format("{:.2f} ms", times[0] * 1e3), "");

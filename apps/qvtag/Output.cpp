@@ -69,8 +69,9 @@ std::vector<std::shared_ptr<TGRTTagging>> sortedTaggings(const ObjectSet<TGRTTag
 }
 
 std::string textOfTagging(const TGRTTagging& tagging) {
-    if (!tagging.level()) return tagging.label();
-    return fmt::format("{} {}%", tagging.label(), std::lround(tagging.level()->weight() * 100));
+    const std::string label = printable(tagging.label());
+    if (!tagging.level()) return label;
+    return fmt::format("{} {}%", label, std::lround(tagging.level()->weight() * 100));
 }
 
 std::string pathOfTag(const TGRTTag& tag) {

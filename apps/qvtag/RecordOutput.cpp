@@ -19,7 +19,7 @@ void printTaggings(const Terminal& terminal, const ObjectSet<TGRTTagging>& taggi
     std::vector<Word> words;
     std::string category;
     const auto flush = [&] {
-        printField(terminal, category, words);
+        printField(terminal, printable(category), words);
         words.clear();
     };
     for (const auto& tagging : sortedTaggings(taggings)) {

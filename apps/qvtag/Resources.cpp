@@ -34,9 +34,15 @@ constexpr std::array<Resource, 9> kResources = {{{"DefaultTaxonomy", "plist", "c
 bool isUsablePropertyList(const std::string& path, std::string_view requiredKey, Error& error) {
     const auto dictionary = readDictionaryFile(path, &error);
     if (!dictionary) return false;
-    if (requiredKey.empty() || dictionary->value(requiredKey) != nullptr) return true;
-    return fail(&error, kErrorMalformed,
-                fmt::format("{}: there is no key \"{}\"", printable(path), requiredKey));
+    if (requiredKey.empty()) return true;
+    const PropertyList* value = dictionary->value(requiredKey);
+    const bool isList = requiredKey == "DefaultRules";
+    if (value != nullptr && (isList ? value->array() != nullptr : value->dictionary() != nullptr))
+        return true;
+    return fail(
+        &error, kErrorMalformed,
+        fmt::format("{}: {} \"{}\"", printable(path),
+                    value == nullptr ? "there is no key" : "there are no entries under", requiredKey));
 }
 
 bool isUsable(const Resource& resource, const std::string& path, Error& error) {

@@ -51,6 +51,7 @@ bool isOfTag(const TGRTTagging& tagging, std::string_view category, std::string_
 std::optional<TagArgument> TagArgument::parse(std::string_view text, bool takesLevel) {
     const std::size_t slash = text.find('/');
     if (slash == std::string_view::npos || slash == 0) return std::nullopt;
+    if (!isValidUtf8(text)) return std::nullopt;
     TagArgument argument{std::string(text.substr(0, slash)), std::string(text.substr(slash + 1)), {}};
     const std::size_t equals = argument.label.rfind('=');
     if (takesLevel && equals != std::string::npos) {
@@ -80,14 +81,27 @@ std::optional<TaggingEdit> TaggingEdit::make(const std::vector<std::string>& add
             continue;
         }
         const auto tag = taxonomy->findOrCreateTagWithLabel(argument->label, argument->category);
-        edit.added_.push_back(TGRTTagging::initWithTag(
-            tag, argument->level ? TGRTLevel::levelWithWeight(*argument->level) : nullptr));
-        if (!edit.added_.back()) refuse(fmt::format("\"{}\" is no label", printable(argument->label)));
+        auto tagging = TGRTTagging::initWithTag(
+            tag, argument->level ? TGRTLevel::levelWithWeight(*argument->level) : nullptr);
+        if (!tagging) {
+            refuse(fmt::format("\"{}\" is no label", printable(argument->label)));
+            continue;
+        }
+        // Of several levels for one tag the last counts.
+        std::erase_if(edit.added_, [&](const auto& earlier) {
+            return isOfTag(*earlier, tagging->category(), tagging->label());
+        });
+        edit.added_.push_back(std::move(tagging));
     }
     for (const std::string& text : remove) {
         const auto argument = TagArgument::parse(text, false);
         if (argument) edit.removed_.push_back(*argument);
         if (!argument) refuse(fmt::format("\"{}\" is no Category/Label", printable(text)));
+        const bool isAdded =
+            argument && std::any_of(edit.added_.begin(), edit.added_.end(), [&](const auto& added) {
+                return isOfTag(*added, argument->category, argument->label);
+            });
+        if (isAdded) refuse(fmt::format("\"{}\" is both added and removed", printable(text)));
     }
     return isRight ? std::optional(edit) : std::nullopt;
 }

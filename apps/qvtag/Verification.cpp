@@ -10,6 +10,18 @@
 namespace qvct::tool {
 namespace {
 
+/// What a preset holds besides its record, also within the sections of the record.
+std::string untouchedText(PresetText& preset) {
+    std::string text = textWithoutRecord(preset);
+    setTaggings(preset, {});
+    setDescription(preset, *TGRTMetaData::init());
+    for (const PresetText::Section& section : preset.sections()) {
+        for (const PresetText::Item& item : section.items)
+            text += fmt::format("\n<{}> {} = {}", section.name, item.key, item.value);
+    }
+    return text;
+}
+
 /// The bytes of an item that no write may change.
 std::optional<std::string> untouchedBytes(const URL& url, Error* error) {
     if (isDirectory(url.path())) return std::string{};
@@ -18,10 +30,7 @@ std::optional<std::string> untouchedBytes(const URL& url, Error* error) {
     std::string text(bytes->begin(), bytes->end());
     if (QVContentTaggingTypes::fallBackFileTypeForURL(url) != kFileTypeSynthPreset) return text;
     auto preset = PresetText::parse(text, error);
-    if (!preset) return std::nullopt;
-    setTaggings(*preset, {});
-    setDescription(*preset, *TGRTMetaData::init());
-    return preset->text();
+    return preset ? std::optional(untouchedText(*preset)) : std::nullopt;
 }
 
 bool isAudio(const URL& url) {

@@ -159,9 +159,9 @@ Json jsonOfChange(const Change& change) {
 void printChange(const Change& change, const Terminal& terminal) {
     fmt::print("{}\n", colored(terminal, Color::strong, printable(change.url.path())));
     for (const auto& tagging : sortedTaggings(change.removed))
-        fmt::print("  - {}/{}\n", tagging->category(), textOfTagging(*tagging));
+        fmt::print("  - {}/{}\n", printable(tagging->category()), textOfTagging(*tagging));
     for (const auto& tagging : sortedTaggings(change.added))
-        fmt::print("  + {}/{}\n", tagging->category(), textOfTagging(*tagging));
+        fmt::print("  + {}/{}\n", printable(tagging->category()), textOfTagging(*tagging));
     if (change.newName)
         fmt::print("  name \"{}\" becomes \"{}\"\n", printable(change.oldName), printable(*change.newName));
     if (change.isNone()) fmt::print("  {}\n", colored(terminal, Color::faint, "nothing to change"));
@@ -174,6 +174,8 @@ void run(const Options& options, ToolContext& context) {
     if (!edit) return;
     if (edit->isEmpty() && !options.name)
         return context.usageFailed("nothing to write: --add, --remove or --name");
+    if (options.name && !isValidUtf8(*options.name))
+        return context.usageFailed(fmt::format("the name \"{}\" is not UTF-8", printable(*options.name)));
     Json json = Json::array();
     std::size_t written = 0;
     std::size_t unchanged = 0;

@@ -13,6 +13,7 @@
 #include <utility>
 
 #include <fmt/format.h>
+#include <libxml/SAX2.h>
 #include <libxml/parser.h>
 #include <libxml/tree.h>
 
@@ -21,6 +22,13 @@ namespace {
 
 /// Most JSON text that a document keeps for the next script, in bytes.
 constexpr std::size_t kMostKeptJson = std::size_t{1} << 20;
+
+/// Largest text that is turned into JSON for a script, which cannot be stopped in the middle of it.
+constexpr std::size_t kLargestForJson = std::size_t{16} << 20;
+
+/// Most elements and attributes of a document, whose tree takes up to a gigabyte then; large patches have
+/// 10,000.
+constexpr int kMostNodes = 1000000;
 
 /// Most messages about one document; damaged ones may cause one for each line.
 constexpr int kMostMessages = 5;
@@ -34,13 +42,17 @@ struct DocumentCloser {
 };
 using Document = std::unique_ptr<xmlDoc, DocumentCloser>;
 
-/// Passes the XML library's messages to the log.
-class Messages {
+/// Passes the XML library's messages to the log, and ends the parsing of what grows too large.
+class ParserGuard {
   public:
-    explicit Messages(std::string_view name) : name_(printable(name)) {}
+    ParserGuard(xmlParserCtxt& parser, std::string_view name) : name_(printable(name)) {
+        parser._private = this;
+        parser.sax->serror = receive;
+        parser.sax->startElementNs = startElement;
+    }
 
     static void receive(void* context, xmlErrorPtr error) {
-        auto& self = *static_cast<Messages*>(static_cast<xmlParserCtxt*>(context)->_private);
+        auto& self = of(context);
         const std::string_view reason = error->message == nullptr ? "unknown fault" : error->message;
         if (++self.count_ > kMostMessages) return;
         log(fmt::format("{}, line {}: {}", self.name_, error->line, trimBlanksAndLineBreaks(reason)));
@@ -51,20 +63,37 @@ class Messages {
     }
 
   private:
+    static ParserGuard& of(void* context) {
+        return *static_cast<ParserGuard*>(static_cast<xmlParserCtxt*>(context)->_private);
+    }
+
+    static void startElement(void* context, const xmlChar* name, const xmlChar* prefix, const xmlChar* uri,
+                             int nameSpaceCount, const xmlChar** nameSpaces, int attributeCount,
+                             int defaultedCount, const xmlChar** attributes) {
+        auto& self = of(context);
+        self.nodes_ += 1 + attributeCount;
+        if (self.nodes_ <= kMostNodes) {
+            return xmlSAX2StartElementNs(context, name, prefix, uri, nameSpaceCount, nameSpaces,
+                                         attributeCount, defaultedCount, attributes);
+        }
+        log(fmt::format("{}: more than {} elements and attributes; the rest is left out", self.name_,
+                        kMostNodes));
+        xmlStopParser(static_cast<xmlParserCtxt*>(context));
+    }
+
     std::string name_;
     int count_ = 0;
+    int nodes_ = 0;
 };
 
 Document parse(std::string_view text, std::string_view name) {
     static const bool isInitialized = (xmlInitParser(), true);  // before several threads parse at once
     const std::unique_ptr<xmlParserCtxt, ParserCloser> context(isInitialized ? xmlNewParserCtxt() : nullptr);
     if (!context || text.size() > static_cast<std::size_t>(std::numeric_limits<int>::max())) return nullptr;
-    Messages messages(name);
-    context->_private = &messages;
-    context->sax->serror = Messages::receive;
+    ParserGuard guard(*context, name);
     Document document(xmlCtxtReadMemory(context.get(), text.data(), static_cast<int>(text.size()), nullptr,
                                         nullptr, XML_PARSE_RECOVER | XML_PARSE_NONET));
-    messages.logOmitted();
+    guard.logOmitted();
     return document;
 }
 
@@ -178,6 +207,10 @@ std::string QVCTXMLDocument::XMLData() const {
 
 std::optional<std::string> QVCTXMLDocument::JSONStringWithData(std::string_view data) {
     if (data.empty()) return std::nullopt;
+    if (data.size() > kLargestForJson) {
+        log(fmt::format("JSON of {} bytes of XML is refused (at most {})", data.size(), kLargestForJson));
+        return std::nullopt;
+    }
     auto dictionary = QVCTXMLParser::dictionaryForXMLData(data);
     if (!dictionary) return std::nullopt;
     return jsonText(PropertyList(std::move(*dictionary)), JsonStyle::pretty);

@@ -16,6 +16,7 @@ extern "C" {
 using JSShouldTerminateCallback = bool (*)(JSContextRef, void*);
 void JSContextGroupSetExecutionTimeLimit(JSContextGroupRef, double seconds, JSShouldTerminateCallback, void*);
 void JSContextGroupClearExecutionTimeLimit(JSContextGroupRef);
+void JSGlobalContextSetEvalEnabled(JSGlobalContextRef, bool isEnabled, JSStringRef message);
 JSObjectRef JSGetMemoryUsageStatistics(JSContextRef);
 }
 
@@ -71,6 +72,24 @@ void setProperty(JSContextRef context, JSObjectRef object, std::string_view name
 
 JSValueRef property(JSContextRef context, JSObjectRef object, std::string_view name, JSValueRef* exception) {
     return JSObjectGetProperty(context, object, scriptString(name).get(), exception);
+}
+
+bool isPartOfWord(char c) {
+    return (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9') || c == '_' || c == '$';
+}
+
+/// The first of the words that stands in the text, not as a part of a longer one.
+std::optional<std::string_view> firstWordOf(std::initializer_list<std::string_view> words,
+                                            std::string_view text) {
+    for (const std::string_view word : words) {
+        for (std::size_t at = text.find(word); at != std::string_view::npos; at = text.find(word, at + 1)) {
+            const std::size_t end = at + word.size();
+            const bool isWhole =
+                (at == 0 || !isPartOfWord(text[at - 1])) && (end == text.size() || !isPartOfWord(text[end]));
+            if (isWhole) return word;
+        }
+    }
+    return std::nullopt;
 }
 
 }  // namespace
@@ -159,6 +178,7 @@ struct ScriptContext::Implementation {
     }
 
     void defineLog();
+    void removePromises();
     void installGuard();
 
     static JSClassRef documentClass();
@@ -205,6 +225,15 @@ void ScriptContext::Implementation::defineLog() {
     }
     setProperty(context, global(), "console", console);
     setProperty(context, global(), "__log", logFunction);
+}
+
+/// Promises are settled when the script has ended, each in a call of its own, so that no limit of time ever
+/// stops them. Rules have nothing to wait for: what makes promises is taken away, and `evaluate` refuses the
+/// syntax.
+void ScriptContext::Implementation::removePromises() {
+    JSGlobalContextSetEvalEnabled(context, false, scriptString("not available to rules").get());
+    for (const char* name : {"Promise", "WebAssembly"})
+        JSObjectDeleteProperty(context, global(), scriptString(name).get(), nullptr);
 }
 
 /// Puts every use of a regular expression under the guard: all methods of texts and expressions go through
@@ -292,6 +321,7 @@ ScriptContext::~ScriptContext() = default;
 std::shared_ptr<ScriptContext> ScriptContext::make(const ScriptLimits& limits) {
     auto implementation = std::make_unique<Implementation>(limits);
     implementation->defineLog();
+    implementation->removePromises();
     implementation->installGuard();
     return std::shared_ptr<ScriptContext>(new ScriptContext(std::move(implementation)));
 }
@@ -305,6 +335,10 @@ void ScriptContext::exposeDocument(const QVCTXMLDocument& document) {
 
 bool ScriptContext::evaluate(std::string_view script) {
     Implementation& self = *implementation_;
+    if (const auto word = firstWordOf({"async", "import"}, script)) {
+        Implementation::logProblem(fmt::format("\"{}\" is not available to rules", *word));
+        return false;
+    }
     const ScriptString text = scriptString(script);
     JSValueRef exception = nullptr;
     const bool ran = self.run([&] {

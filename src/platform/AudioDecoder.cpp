@@ -1,5 +1,8 @@
 #include "platform/AudioDecoder.h"
 
+#include "platform/FileAccess.h"
+#include "platform/FileDescriptor.h"
+
 #include <algorithm>
 #include <cstdio>
 #include <cstring>
@@ -52,6 +55,7 @@ SF_VIRTUAL_IO memoryAccess() {
 
 struct AudioDecoder::State {
     MemoryFile memory;
+    FileDescriptor descriptor{-1};
     SF_INFO info{};
     SNDFILE* file = nullptr;
     std::vector<short> shorts;
@@ -89,7 +93,9 @@ AudioDecoder::~AudioDecoder() = default;
 
 std::unique_ptr<AudioDecoder> AudioDecoder::open(const std::string& path, Error* error) {
     auto state = std::make_unique<State>();
-    state->file = sf_open(path.c_str(), SFM_READ, &state->info);
+    state->descriptor = openRegularFile(path, error);
+    if (!state->descriptor.isOpen()) return nullptr;
+    state->file = sf_open_fd(state->descriptor.number(), SFM_READ, &state->info, SF_FALSE);
     if (!state->isUsable(path, error)) return nullptr;
     return std::unique_ptr<AudioDecoder>(new AudioDecoder(std::move(state)));
 }

@@ -44,20 +44,27 @@ bool isRegularFile(const std::string& path) {
     return statOf(path, status) && S_ISREG(status.st_mode);
 }
 
+FileDescriptor openRegularFile(const std::string& path, Error* error, struct stat* status) {
+    // Without O_NONBLOCK, opening a named pipe would wait for a writer for ever.
+    FileDescriptor descriptor(::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
+    struct stat own {};
+    if (status == nullptr) status = &own;
+    if (!descriptor.isOpen() || ::fstat(descriptor.number(), status) != 0) {
+        failWithErrno(error, kErrorUnreadable, path);
+    } else if (!S_ISREG(status->st_mode)) {
+        failFor(error, kErrorUnreadable, path,
+                S_ISDIR(status->st_mode) ? "is a folder" : "is not a regular file");
+    } else {
+        return descriptor;
+    }
+    return FileDescriptor(-1);
+}
+
 std::optional<std::vector<std::uint8_t>> readFile(const std::string& path, Error* error,
                                                   std::uint64_t limit) {
-    // Without O_NONBLOCK, opening a named pipe would wait for a writer for ever.
-    const FileDescriptor descriptor(::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
     struct stat status {};
-    if (!descriptor.isOpen() || ::fstat(descriptor.number(), &status) != 0) {
-        failWithErrno(error, kErrorUnreadable, path);
-        return std::nullopt;
-    }
-    if (!S_ISREG(status.st_mode)) {
-        failFor(error, kErrorUnreadable, path,
-                S_ISDIR(status.st_mode) ? "is a folder" : "is not a regular file");
-        return std::nullopt;
-    }
+    const FileDescriptor descriptor = openRegularFile(path, error, &status);
+    if (!descriptor.isOpen()) return std::nullopt;
     const auto size = static_cast<std::uint64_t>(status.st_size);
     if (size > limit) {
         failFor(error, kErrorTooLarge, path, fmt::format("{} bytes are over the limit of {}", size, limit));

@@ -13,6 +13,10 @@ class FileDescriptor {
     FileDescriptor(FileDescriptor&& other) noexcept : number_(std::exchange(other.number_, -1)) {}
     FileDescriptor(const FileDescriptor&) = delete;
     FileDescriptor& operator=(const FileDescriptor&) = delete;
+    FileDescriptor& operator=(FileDescriptor&& other) noexcept {
+        std::swap(number_, other.number_);
+        return *this;
+    }
     ~FileDescriptor() {
         if (number_ >= 0) ::close(number_);
     }

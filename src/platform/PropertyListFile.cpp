@@ -236,16 +236,29 @@ bool holdsOnlyValidLeaves(const PropertyList& value, Error* error) {
     return true;
 }
 
-/// The library takes texts that end at their first NUL.
-bool holdsNul(const PropertyList& value) {
-    constexpr char nul = '\0';
-    if (const std::string* text = value.string()) return text->find(nul) != std::string::npos;
-    if (const PropertyList::Array* items = value.array())
-        return std::any_of(items->begin(), items->end(), holdsNul);
+/// Whether the text can be read back: the library ends texts at their first NUL and does not mind what is not
+/// Unicode, nor that XML knows no other control characters than tab and line ends and neither U+FFFE nor
+/// U+FFFF.
+bool isTextStorable(std::string_view text, PropertyListFormat format) {
+    if (text.find('\0') != std::string_view::npos || !isValidUtf8(text)) return false;
+    if (format == PropertyListFormat::binary) return true;
+    const bool hasControl = std::any_of(text.begin(), text.end(), [](char c) {
+        return static_cast<unsigned char>(c) < 0x20 && c != '\t' && c != '\n' && c != '\r';
+    });
+    return !hasControl && text.find("\xEF\xBF\xBE") == std::string_view::npos &&
+           text.find("\xEF\xBF\xBF") == std::string_view::npos;
+}
+
+bool isStorable(const PropertyList& value, PropertyListFormat format) {
+    if (const std::string* text = value.string()) return isTextStorable(*text, format);
+    if (const PropertyList::Array* items = value.array()) {
+        return std::all_of(items->begin(), items->end(),
+                           [format](const PropertyList& item) { return isStorable(item, format); });
+    }
     const PropertyList::Dictionary* entries = value.dictionary();
-    return entries != nullptr &&
-           std::any_of(entries->begin(), entries->end(), [](const PropertyList::Entry& entry) {
-               return entry.key.find(nul) != std::string::npos || holdsNul(entry.value);
+    return entries == nullptr ||
+           std::all_of(entries->begin(), entries->end(), [format](const PropertyList::Entry& entry) {
+               return isTextStorable(entry.key, format) && isStorable(entry.value, format);
            });
 }
 
@@ -286,7 +299,7 @@ std::optional<PropertyList> parsePropertyList(std::string_view bytes, Error* err
 }
 
 std::string serializePropertyList(const PropertyList& value, PropertyListFormat format) {
-    if (holdsNul(value)) return {};
+    if (!isStorable(value, format)) return {};
     const Node node = nodeOf(value, format);
     return format == PropertyListFormat::xml ? xml(node.get()) : binary(node.get());
 }

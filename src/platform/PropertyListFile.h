@@ -33,8 +33,9 @@ QVCT_API std::optional<PropertyList> parsePropertyList(std::span<const std::uint
 QVCT_API std::optional<PropertyList> parsePropertyList(std::string_view bytes, Error* error = nullptr);
 /// @}
 
-/// XML with header, document type and tabs, or binary format 1.0. Empty on failure, which only values that
-/// no property list can hold bring about (a text with a NUL character).
+/// XML with header, document type and tabs, or binary format 1.0. Empty on failure, which only texts bring
+/// about that could not be read back: not UTF-8, with a NUL character or, in XML, with a character that XML
+/// forbids.
 QVCT_API std::string serializePropertyList(const PropertyList& value, PropertyListFormat format);
 
 /// The value in a file; errors name the path.

@@ -8,7 +8,7 @@ namespace qvct {
 
 FileType QVContentTaggingTypes::fallBackFileTypeForURL(const URL& url) {
     using Row = std::pair<std::string_view, FileType>;
-    constexpr std::array<Row, 12> types = {{{"patch", kFileTypePatch},
+    constexpr std::array<Row, 13> types = {{{"patch", kFileTypePatch},
                                             {"loopdata", kFileTypeLoop},
                                             {"vcp", kFileTypeSynthPreset},
                                             {"sxv", kFileTypeSamplerSettings},
@@ -17,6 +17,7 @@ FileType QVContentTaggingTypes::fallBackFileTypeForURL(const URL& url) {
                                             {"cst", kFileTypeChannelStrip},
                                             {"aif", kFileTypeAudioFile},
                                             {"aiff", kFileTypeAudioFile},
+                                            {"aifc", kFileTypeAudioFile},
                                             {"caf", kFileTypeAudioFile},
                                             {"wav", kFileTypeAudioFile},
                                             {"ostrax", kFileTypeProject}}};

@@ -140,6 +140,25 @@ TEST(Script, WithoutEndIsStoppedAndTheNextOneRuns) {
     }
 }
 
+TEST(Script, CannotGoOnAfterItsEnd) {
+    const struct {
+        const char* script;
+        const char* message;
+    } rows[] = {{"async function main() { for (;;) await 1 }", "\"async\" is not available to rules"},
+                {"import('x')", "\"import\" is not available to rules"},
+                {"function f() { return Promise.resolve().then(f) } function main() { f(); return [1] }",
+                 "ReferenceError: Can't find variable: Promise"},
+                {"function main() { return eval('as' + 'ync function f() { for (;;) await 1 } f()') }",
+                 "EvalError: not available to rules"},
+                {"function main() { return new Function('return 1') }", "EvalError: not available to rules"}};
+    for (const auto& row : rows) {
+        const test::CapturedLog log;
+        EXPECT_EQ(resultOf(row.script), "nil") << row.script;
+        EXPECT_THAT(log.messages(), testing::Contains(HasSubstr(row.message))) << row.script;
+    }
+    EXPECT_EQ(resultOfMain("var asynchronous = 1, important = 2; return [asynchronous]"), "[1]");
+}
+
 TEST(Script, RecursionWithoutEndIsAnException) {
     const test::CapturedLog log;
     EXPECT_EQ(resultOfMain("return main()"), "nil");

@@ -303,5 +303,30 @@ TEST(LocationPath, LeavesOtherFormsToTheLibrary) {
     }
 }
 
+TEST(XMLDocument, TooLargeForMemoryIsCutShort) {
+    const test::CapturedLog log;
+    std::string xml = "<P><first/>";
+    for (int i = 0; i < 340000; ++i) xml += "<a b='' c=''/>";
+    const auto document = QVCTXMLDocument::initWithXMLData(xml + "<last/></P>", "huge.xml");
+    EXPECT_TRUE(document->isMatchingXPath("/P/first"));
+    EXPECT_TRUE(document->isMatchingXPath("/P/a[333332]"));
+    EXPECT_FALSE(document->isMatchingXPath("/P/a[333333]"));
+    EXPECT_FALSE(document->isMatchingXPath("/P/last"));
+    EXPECT_THAT(log.messages(),
+                testing::Contains(testing::HasSubstr("huge.xml: more than 1000000 elements")));
+}
+
+TEST(XMLDocument, TooLargeForAScriptHasNoJson) {
+    const test::CapturedLog log;
+    const auto document =
+        QVCTXMLDocument::initWithXMLData("<P>" + std::string(std::size_t{9} << 20, 'x') + "<b>" +
+                                             std::string(std::size_t{9} << 20, 'y') + "</b></P>",
+                                         "long.xml");
+    EXPECT_EQ(document->JSONString(), std::nullopt);
+    EXPECT_EQ(document->JSONStringForXPath("/P"), std::nullopt);
+    EXPECT_NE(document->JSONStringForXPath("/P/b"), std::nullopt);
+    EXPECT_THAT(log.messages(), testing::Contains(testing::HasSubstr("is refused (at most 16777216)")));
+}
+
 }  // namespace
 }  // namespace qvct

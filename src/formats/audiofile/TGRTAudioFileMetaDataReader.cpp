@@ -2,8 +2,11 @@
 
 #include "formats/audiofile/TGRTAudioFileTypeValidator.h"
 #include "platform/LCFileParser.h"
+#include "platform/Text.h"
 
 #include <array>
+
+#include <fmt/format.h>
 
 namespace qvct {
 
@@ -15,7 +18,11 @@ bool TGRTAudioFileMetaDataReader::supportsFileExtension(std::string_view extensi
 std::shared_ptr<TGRTMetaData> TGRTAudioFileMetaDataReader::readMetaDataFromURL(const URL& url,
                                                                                std::uint64_t options,
                                                                                Error* error) const {
-    if (TGRTAudioFileTypeValidator::isPrelistenFile(url)) return nullptr;
+    if (TGRTAudioFileTypeValidator::isPrelistenFile(url)) {
+        fail(error, kErrorUnreadable,
+             fmt::format("{}: is the recorded preview of another item", printable(url.path())));
+        return nullptr;
+    }
     const std::shared_ptr<const LCFileData> fileData =
         LCFileParser::fileParserForURL(url, false, kLCAllAudio)->enhancedFileData(error);
     if (!readSuccessForFileData(fileData, url)) return nullptr;

@@ -27,7 +27,10 @@ bool changePreset(const URL& url, const std::function<void(PresetText&)>& change
             return std::nullopt;
         }
         change(*preset);
-        return preset->text();
+        std::string text = preset->text();
+        if (isValidUtf8(text)) return text;
+        fail(reason, kErrorInvalidArgument, "the record holds a text that cannot be stored");
+        return std::nullopt;
     };
     return changeStoredFile(url.path(), changeText, error, options);
 }

@@ -192,6 +192,14 @@ std::vector<LCChunk> describeChunks(const Container& container) {
         }
         whole.children.push_back(std::move(shown));
     }
+    const std::uint64_t end = container.chunks().empty() ? whole.size : container.chunks().back().end;
+    if (end < whole.size) {
+        LCChunk rest;
+        rest.offset = end;
+        rest.size = whole.size - end;
+        rest.meaning = "bytes behind the last chunk";
+        whole.children.push_back(std::move(rest));
+    }
     return {std::move(whole)};
 }
 

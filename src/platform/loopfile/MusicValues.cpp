@@ -60,9 +60,14 @@ void setKeyText(LCAudioFacts& facts, std::string_view text) {
     constexpr int kMinor = 1;
     constexpr int kMajor = 2;
     if (text.empty() || text.front() < 'A' || text.front() > 'G') return;
-    facts.keyType = text.find('m') == std::string_view::npos || text.find("maj") != std::string_view::npos
-                        ? kMajor
-                        : kMinor;
+    text.remove_prefix(std::min(text.find_first_not_of("#b", 1), text.size()));
+    text.remove_prefix(std::min(text.find_first_not_of(" -"), text.size()));
+    const auto begins = [text](std::string_view word) {
+        return text.size() >= word.size() && std::equal(word.begin(), word.end(), text.begin(),
+                                                        [](char a, char b) { return a == (b | 0x20); });
+    };
+    if (text.empty() || text == "M" || begins("maj")) facts.keyType = kMajor;
+    if (text == "m" || begins("min")) facts.keyType = kMinor;
 }
 
 void setMidi(LCAudioFacts& facts, std::vector<std::uint8_t> bytes) {

@@ -1,12 +1,10 @@
 #include "platform/loopfile/RandomAccessReader.h"
 
-#include "platform/Text.h"
+#include "platform/FileAccess.h"
 
 #include <cerrno>
 #include <cstring>
 
-#include <fcntl.h>
-#include <fmt/format.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -19,17 +17,9 @@ bool MemoryReader::read(std::uint64_t offset, std::span<std::uint8_t> into) cons
 }
 
 std::shared_ptr<FileReader> FileReader::open(const std::string& path, Error* error) {
-    const auto refuse = [&](const char* reason) {
-        fail(error, kErrorUnreadable, fmt::format("{}: {}", printable(path), reason));
-        return nullptr;
-    };
-    // Without O_NONBLOCK, opening a named pipe would wait for a writer for ever.
-    FileDescriptor descriptor(::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
     struct stat status {};
-    if (!descriptor.isOpen() || ::fstat(descriptor.number(), &status) != 0) {
-        return refuse(std::strerror(errno));
-    }
-    if (!S_ISREG(status.st_mode)) return refuse("is not a regular file");
+    FileDescriptor descriptor = openRegularFile(path, error, &status);
+    if (!descriptor.isOpen()) return nullptr;
     return std::shared_ptr<FileReader>(new FileReader(std::move(descriptor), FileStamp::of(status)));
 }
 
