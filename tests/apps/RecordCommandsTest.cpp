@@ -1,5 +1,6 @@
 // qvtag read, write and inspect: one item of every kind, as a user has them.
 
+#include "formats/FormatsSupport.h"
 #include "support/AudioFixtures.h"
 #include "support/RunTool.h"
 
@@ -183,6 +184,73 @@ const json* partWithId(const json& parts, const std::string& id) {
         if (const json* child = partWithId(part["parts"], id)) return child;
     }
     return nullptr;
+}
+
+TEST(Write, StoresOnlyWhatCanBeReadBack) {
+    const Items items;
+    const std::set<std::string> house = {"Genres/House"};
+    ASSERT_EQ(runTool({"write", "--add", "Genres/House", items.folder.path()}).status, 0);
+    for (const char* text : {"a\x01"
+                             "b",
+                             "\xEF\xBF\xBE", "Caf\xc3\xa9", "two\nlines"}) {
+        runTool({"write", "--name", text, items.folder.path()});
+        const ToolResult result = runTool(items.arguments({"read", "--json"}));
+        EXPECT_EQ(result.status, 0) << result.errors;
+        for (const json& item : result.json()) EXPECT_EQ(tagsOf(item).count("Genres/House"), 1U) << item;
+    }
+    for (const std::vector<std::string>& wrong :
+         {std::vector<std::string>{"--name", "Caf\xe9"}, {"--create", "--add", "Genres/Caf\xe9"}})
+        EXPECT_EQ(runTool({"write", wrong[0], wrong[1], wrong.back(), items.folder.path()}).status, 2);
+}
+
+TEST(Write, VerifiesAPresetThatHadNoRecord) {
+    for (const char* contents : {"", "a = b", "a = b\n", "<tagging>\nAttribs = 4001\n</tagging>"}) {
+        const TemporaryFolder folder;
+        const std::string preset = folder.write("P.vcp", contents);
+        const ToolResult result =
+            runTool({"write", "--add", "Genres/House", "--name", "P", "--verify", preset});
+        EXPECT_EQ(result.status, 0) << contents << result.errors;
+    }
+}
+
+TEST(Write, OfSeveralLevelsTheLastCounts) {
+    const Items items;
+    const std::string path = items.folder.path("loop.wav");
+    EXPECT_EQ(runTool({"write", "--add", "Source/Bass=0.5", "--add", "Source/Bass=0.75", path}).status, 0);
+    EXPECT_THAT(tagsOf(runTool({"read", "--json", path}).json()[0]), ElementsAre("Source/Bass=0.75"));
+    const ToolResult both = runTool({"write", "--add", "Source/Bass", "--remove", "Source/Bass", path});
+    EXPECT_EQ(both.status, 2);
+    EXPECT_THAT(both.errors, HasSubstr("\"Source/Bass\" is both added and removed"));
+}
+
+TEST(Read, ShowsNoControlCharactersOfFiles) {
+    const TemporaryFolder folder;
+    const Wav wav;
+    const std::string record =
+        serializePropertyList(test::Dictionary{{"Tagging", taggingDictionary("Ca\x1b[32mt", "\x1b[31mRED")}},
+                              PropertyListFormat::binary);
+    const std::string path =
+        folder.write("red.wav", wav.file(wav.format() + wav.data() + wav.chunk("qvct", record)));
+    for (const char* command : {"read", "inspect", "autotag"}) {
+        const ToolResult result = runTool({command, path});
+        EXPECT_EQ(result.status, 0) << result.errors;
+        EXPECT_EQ(result.output.find('\x1b'), std::string::npos) << command << result.output;
+    }
+}
+
+TEST(Read, FindsEveryKindOfAudioInAFolderAndNamesPreviews) {
+    const TemporaryFolder folder;
+    const Wav wav;
+    folder.write("loop.wav", wav.file(wav.format() + wav.data()) + "what an editor left");
+    folder.write("shot.aifc", Aiff::file(Aiff::common() + Aiff::sound(), "AIFC"));
+    folder.write("Bass.cst", "settings");
+    const std::string preview = folder.write("Bass.cst.caf", Caf::file(Caf::description() + Caf::data()));
+    EXPECT_EQ(runTool({"read", "--json", folder.path()}).json().size(), 3U);
+    const ToolResult named = runTool({"read", preview});
+    EXPECT_EQ(named.status, 1);
+    EXPECT_THAT(named.errors, HasSubstr("is the recorded preview of another item"));
+    const json parts = runTool({"inspect", "--json", folder.path("loop.wav")}).json()[0]["parts"];
+    EXPECT_THAT(parts.dump(), HasSubstr("bytes behind the last chunk"));
 }
 
 TEST(Inspect, ShowsWhatIsInEveryKindOfItem) {

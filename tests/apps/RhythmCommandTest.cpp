@@ -6,6 +6,7 @@
 #include <cmath>
 
 #include <gmock/gmock.h>
+#include <sys/stat.h>
 
 namespace qvct::test {
 namespace {
@@ -196,6 +197,15 @@ TEST(RhythmCommand, EveryMidiFileOfTheCorpusGivesWhatCanBeReadOrAReason) {
         expectSound(result.json()[0], file);
     }
     EXPECT_GT(measured, files.size() / 3);
+}
+
+TEST(Rhythm, DoesNotWaitForAPipe) {
+    const TemporaryFolder folder;
+    const std::string pipe = folder.path("pipe.wav");
+    ASSERT_EQ(::mkfifo(pipe.c_str(), 0600), 0);
+    const ToolResult result = runTool({"rhythm", "--beats", "4", pipe}, "timeout 20");
+    EXPECT_EQ(result.status, 1);
+    EXPECT_THAT(result.errors, testing::HasSubstr("is not a regular file"));
 }
 
 TEST(Autotag, GradesTheRhythmOfEveryLoopOnRequest) {

@@ -119,6 +119,22 @@ TEST(LoopFileRead, TakesTheMusicOfCafFilesWhoseLoopsNobodyAuthored) {
     EXPECT_EQ(data->tavioLoopType(), 1);
 }
 
+TEST(LoopFileRead, TellsMinorFromMajorInKeySignatures) {
+    struct {
+        const char* text;
+        int keyType;
+    } const cases[] = {{"A minor", 1}, {"A Minor", 1}, {"F#m", 1},    {"Bb min", 1},      {"C", 2},
+                       {"CM", 2},      {"D MAJOR", 2}, {"Eb-maj", 2}, {"G mixolydian", 0}};
+    for (const auto& c : cases) {
+        const std::string information = big(1, 4) + "key signature" + '\0' + c.text + '\0';
+        const auto data =
+            parserOf(Caf::file(Caf::description() + Caf::chunk("info", information) + Caf::data()))
+                ->fileData();
+        ASSERT_TRUE(data);
+        EXPECT_EQ(data->facts().keyType, c.keyType) << c.text;
+    }
+}
+
 TEST(LoopFileRead, DerivesOnlyWhatThePlainDataDoesNotSay) {
     struct {
         unsigned beats;
