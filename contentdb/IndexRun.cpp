@@ -66,6 +66,7 @@ bool IndexRun::walk(const std::string& folder) {
 }
 
 bool IndexRun::visit(const std::string& path, const std::vector<ListedItem>& all) {
+    if (!shown_.insert(path).second) return true;  // below an earlier root
     std::vector<ListedItem> part;
     if (options_.parts > 1) part = itemsOfPart(path, all);
     const std::vector<ListedItem>& items = options_.parts > 1 ? part : all;

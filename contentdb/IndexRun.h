@@ -71,6 +71,7 @@ class IndexRun {
     std::size_t termsInBatch_ = 0;
     std::vector<std::shared_ptr<OpenFolder>> complete_;  // to be stored with the batch
     std::vector<std::string> roots_;
+    std::unordered_set<std::string> shown_;     // folders, by path
     std::unordered_set<std::int64_t> visited_;  // folders, by number
     std::set<std::string, std::less<>> unreadable_;
     std::vector<ItemId> gone_;

@@ -26,7 +26,7 @@ struct IndexProgress {
 
 /// What a run is to do. Only `folders` and `database` have to be given.
 struct IndexOptions {
-    /// Folders to walk.
+    /// Folders to walk. One that lies in another is walked once.
     std::vector<std::string> folders;
     /// Path of the database; made when there is none.
     std::string database;

@@ -57,6 +57,8 @@ void StoreWriter::put(ItemId id, const IndexedItem& item, const std::vector<std:
             kErrorTooLarge,
             fmt::format("{}: more than {} items", printable(store_.connection().path()), kLastItemId));
     }
+    const auto replaced = store_.idOfPath(item.path);
+    if (replaced && *replaced != id) remove(*replaced);
     std::vector<std::string> before;
     if (const auto old = store_.item(id)) before = termsOf(*old);
     std::vector<std::string> difference;

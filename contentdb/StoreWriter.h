@@ -37,7 +37,8 @@ class StoreWriter {
     void begin();
     void commit();
 
-    /// Stores the item under `id`, new or known. `terms` are its terms, sorted (see termsOf).
+    /// Stores the item under `id`, new or known; it replaces another that is in its place. `terms` are its
+    /// terms, sorted (see termsOf).
     void put(ItemId id, const IndexedItem& item, const std::vector<std::string>& terms);
     void remove(ItemId id);
     /// A known item of the same payload whose file is no longer there: the same item, moved.

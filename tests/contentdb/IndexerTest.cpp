@@ -154,6 +154,20 @@ TEST_F(Indexing, ReadsAgainWhatChangedWhileItWasRead) {
     EXPECT_EQ(index().described, 0U);
 }
 
+TEST_F(Indexing, TakesAFolderOnceThatSeveralRootsShow) {
+    for (const char* name : {"Kick.wav", "sub/Snare.wav", "sub/Hat.wav"}) write(name, name);
+    settle();
+    const auto overlapping = [this](IndexOptions& options) {
+        options.folders = {library(), library() + "/sub", library()};
+    };
+    EXPECT_EQ(index(overlapping).described, 3U);
+    write("sub/Clap.wav", "a new sound");
+    settle();
+    EXPECT_EQ(index(overlapping).seen, 4U);
+    EXPECT_EQ(names().size(), 4U);
+    EXPECT_TRUE(ContentDatabase::open(database())->check());
+}
+
 TEST_F(Indexing, ForgetsMissingFilesOnlyWhenTold) {
     for (const char* name : {"Kick.wav", "gone/Snare.wav", "gone/deep/Hat.wav", "Clap.wav"})
         write(name, name);
