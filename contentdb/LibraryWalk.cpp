@@ -10,8 +10,10 @@
 #include <array>
 #include <cerrno>
 #include <cstring>
+#include <deque>
 #include <map>
 #include <memory>
+#include <set>
 #include <utility>
 
 #include <dirent.h>
@@ -149,31 +151,37 @@ class Walk {
     Walk(const FolderVisitor& visit, const std::function<void(const std::string&, const Error&)>& failed)
         : visit_(visit), failed_(failed) {}
 
-    bool folder(const std::string& path) {
-        std::vector<std::string> folders;
-        Identity identity;
-        if (!list(path, identity, folders)) return false;
-        open_.push_back(identity);
-        bool goesOn = true;
-        for (const std::string& name : folders) {
-            if (goesOn) goesOn = folder(fmt::format("{}/{}", path == "/" ? "" : path, name));
-        }
-        open_.pop_back();
+    /// Links come last, so that a folder has the path where it lies, whatever points to it.
+    bool start(const std::string& path) {
+        bool goesOn = folder(path, 0);
+        for (; goesOn && !links_.empty(); links_.pop_front()) goesOn = folder(links_.front(), 0);
         return goesOn;
     }
 
   private:
+    bool folder(const std::string& path, std::size_t depth) {
+        std::vector<std::string> folders;
+        if (!list(path, folders)) return false;
+        bool goesOn = true;
+        for (const std::string& name : folders) {
+            if (goesOn && depth < kDeepest) goesOn = folder(joined(path, name), depth + 1);
+        }
+        return goesOn;
+    }
+
+    static std::string joined(const std::string& path, std::string_view name) {
+        return fmt::format("{}/{}", path == "/" ? "" : path, name);
+    }
+
     /// Shows the folder's items to the visitor; what lies in it is entered later, when it is closed again.
-    bool list(const std::string& path, Identity& identity, std::vector<std::string>& folders) {
+    bool list(const std::string& path, std::vector<std::string>& folders) {
         const Folder folder(::opendir(path.c_str()), ::closedir);
         struct stat status {};
         if (!folder || ::fstat(::dirfd(folder.get()), &status) != 0) {
             fail(path);
             return true;
         }
-        identity = {status.st_dev, status.st_ino};
-        if (open_.size() >= kDeepest || std::find(open_.begin(), open_.end(), identity) != open_.end())
-            return true;
+        if (!entered_.insert({status.st_dev, status.st_ino}).second) return true;
         const Listing listing(folder.get());
         std::vector<ListedItem> items;
         for (const Listing::Entry& entry : listing.entries())
@@ -201,7 +209,11 @@ class Walk {
             return;
         }
         if (S_ISDIR(status.st_mode) && kind != Kind::bundle) {
-            folders.emplace_back(name);
+            if (isLink(folder, name, entry.kind)) {
+                links_.push_back(joined(path, name));
+            } else {
+                folders.emplace_back(name);
+            }
             return;
         }
         const bool isContent =
@@ -225,10 +237,17 @@ class Walk {
         }
     }
 
+    static bool isLink(int folder, std::string_view name, unsigned char kind) {
+        struct stat status {};
+        if (kind != DT_UNKNOWN) return kind == DT_LNK;
+        return ::fstatat(folder, name.data(), &status, AT_SYMLINK_NOFOLLOW) == 0 && S_ISLNK(status.st_mode);
+    }
+
     const FolderVisitor& visit_;
     const std::function<void(const std::string&, const Error&)>& failed_;
     NameKinds kinds_;
-    std::vector<Identity> open_;  // the folders from the start down to where we are
+    std::set<Identity> entered_;
+    std::deque<std::string> links_;  // to folders, to be entered when the others were
 };
 
 std::uint64_t countBelow(const std::string& path, NameKinds& kinds, std::size_t depth) {
@@ -250,7 +269,7 @@ std::uint64_t countBelow(const std::string& path, NameKinds& kinds, std::size_t 
 
 bool walkLibrary(const std::string& folder, const FolderVisitor& visit,
                  const std::function<void(const std::string& path, const Error& error)>& failed) {
-    return Walk(visit, failed).folder(folder);
+    return Walk(visit, failed).start(folder);
 }
 
 std::uint64_t countContentNames(const std::string& folder) {

@@ -129,6 +129,23 @@ TEST_F(LibraryCommands, TagByTheNamedServicesAndTakeTheFoldersBehind) {
     EXPECT_THAT(wrong.errors, HasSubstr("no service \"magic\""));
 }
 
+TEST_F(LibraryCommands, WalkFoldersThatLinkToEachOtherOnce) {
+    const std::vector<std::string> folders = {"a", "b", "c", "d", "e"};
+    for (const std::string& a : folders) {
+        folder_.write("linked/" + a + "/Kick.wav", Wav().file(Wav().format() + Wav().data()));
+        for (const std::string& b : folders) {
+            if (a != b)
+                std::filesystem::create_directory_symlink("../" + b, folder_.path("linked/" + a + "/" + b));
+        }
+    }
+    std::vector<std::string> paths;
+    for (const json& item : runTool({"autotag", "--json", folder_.path("linked")}).json())
+        paths.push_back(item["path"]);
+    std::vector<std::string> expected;
+    for (const std::string& a : folders) expected.push_back(folder_.path("linked/" + a + "/Kick.wav"));
+    EXPECT_EQ(paths, expected);
+}
+
 TEST_F(LibraryCommands, NameWhatCannotBeRead) {
     folder_.write("sounds/broken.wav", "RIFF");
     const ToolResult result = index();

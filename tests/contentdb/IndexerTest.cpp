@@ -404,5 +404,25 @@ TEST_F(Indexing, TakesAnyNameAndCirclesOfLinks) {
     EXPECT_EQ(index().described, 0U);
 }
 
+TEST_F(Indexing, EntersFoldersThatLinkToEachOtherOnceAndByTheirOwnNames) {
+    const std::string letters = "abcdef";
+    folder_.write("elsewhere/Far.wav", "far");
+    for (const char a : letters) {
+        write(fmt::format("{}/Kick.wav", a), "");
+        for (const char b : letters) {
+            if (a != b)
+                std::filesystem::create_directory_symlink(library() + "/" + b,
+                                                          fmt::format("{}/{}/{}", library(), a, b));
+        }
+        std::filesystem::create_directory_symlink(folder_.path("elsewhere"),
+                                                  fmt::format("{}/{}/far", library(), a));
+    }
+    settle();
+    EXPECT_EQ(index().seen, letters.size() + 1);
+    const auto database = ContentDatabase::open(this->database());
+    for (const char a : letters) EXPECT_TRUE(database->item(fmt::format("{}/{}/Kick.wav", library(), a)));
+    EXPECT_TRUE(database->item(library() + "/a/far/Far.wav"));
+}
+
 }  // namespace
 }  // namespace qvct::test
