@@ -54,6 +54,7 @@ IndexRun::IndexRun(const IndexOptions& options, Connection& connection, WorkerPo
       lastReport_(lastFlush_) {}
 
 bool IndexRun::walk(const std::string& folder) {
+    if (isStopped_) return areWorkersInOrder_;
     roots_.push_back(folder);
     walkLibrary(
         folder,
@@ -83,8 +84,13 @@ bool IndexRun::visit(const std::string& path, const std::vector<ListedItem>& all
         if (!submitChanged(folder, known.id, items)) return false;
         if (--folder->remaining == 0) complete_.push_back(folder);
     }
+    stopIfCancelled();
     report();
     return !isStopped_;
+}
+
+void IndexRun::stopIfCancelled() {
+    if (options_.isCancelled && options_.isCancelled()) isStopped_ = true;
 }
 
 std::vector<ListedItem> IndexRun::itemsOfPart(const std::string& path,
@@ -142,7 +148,7 @@ bool IndexRun::collect() {
         termsInBatch_ += described.terms.size();
         batch_.push_back(std::move(described));
     });
-    if (options_.isCancelled && options_.isCancelled()) isStopped_ = true;
+    stopIfCancelled();
     flushIfDue();
     report();
     return areWorkersInOrder_ && !isStopped_;
@@ -212,6 +218,7 @@ void IndexRun::storeFolder(const OpenFolder& folder) {
 }
 
 bool IndexRun::finish() {
+    stopIfCancelled();
     while (areWorkersInOrder_ && !isStopped_ && workers_.isBusy()) collect();
     flush();
     if (options_.prune && areWorkersInOrder_ && !isStopped_) prune();

@@ -45,6 +45,7 @@ class IndexRun {
     bool submitChanged(const std::shared_ptr<OpenFolder>& folder, std::int64_t folderId,
                        const std::vector<ListedItem>& items);
     bool submit(const ListedItem& item, ItemId id, const std::shared_ptr<OpenFolder>& folder);
+    void stopIfCancelled();
     bool collect();
     void store(std::vector<Described>& batch);
     void storeOne(const Described& described, Pending& pending);

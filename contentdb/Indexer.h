@@ -50,7 +50,8 @@ struct IndexOptions {
     std::function<void(const Error&)> failed;
     /// Told when a damaged database was put aside ("<database>.damaged") and is built anew.
     std::function<void(const std::string& message)> note;
-    /// Asked now and then; true ends the run early, with all that was read so far stored.
+    /// Asked after each folder and while items are read; true ends the run early, with all that was read so
+    /// far stored and nothing taken out.
     std::function<bool()> isCancelled;
 };
 

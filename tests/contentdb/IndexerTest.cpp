@@ -278,6 +278,23 @@ TEST_F(Indexing, GoesOnWhereItWasKilled) {
     EXPECT_TRUE(ContentDatabase::open(database())->check());
 }
 
+TEST_F(Indexing, StopsWhenToldThoughNothingIsNew) {
+    for (const char* name : {"Kick 0.wav", "Kick 1.wav", "Kick 2.wav", "Snare.wav", "a/Hat.wav"})
+        write(name, name);
+    settle();
+    index();
+    for (unsigned folders = 0; folders <= 2; ++folders) {
+        std::filesystem::remove(fmt::format("{}/Kick {}.wav", library(), folders));
+        const IndexProgress progress = index([folders](IndexOptions& options) {
+            options.prune = true;
+            options.isCancelled = [folders, asked = 0U]() mutable { return asked++ >= folders; };
+        });
+        EXPECT_EQ(progress.seen, 3 - folders + (folders == 0 ? 0 : 1)) << folders;
+        EXPECT_EQ(progress.pruned, 0U) << folders;
+    }
+    EXPECT_EQ(names().size(), 5U);
+}
+
 TEST_F(Indexing, OfPartsUnitesToTheSameContent) {
     for (int i = 0; i < 500; ++i) write(fmt::format("{}/{}/Kick {}.wav", i % 5, i % 3, i), std::to_string(i));
     write("2/A fails.wav", "");
