@@ -30,7 +30,7 @@ using Folder = std::unique_ptr<DIR, int (*)(DIR*)>;
 /// Deepest that folders are entered: no path that the system takes holds more.
 constexpr std::size_t kDeepest = 2000;
 
-enum class Kind : unsigned char { other, file, settings, bundle };
+enum class Kind : unsigned char { other, file, bundle };
 
 /// The kind of content that a name promises, remembered by extension.
 class NameKinds {
@@ -61,11 +61,6 @@ class NameKinds {
             case kFileTypePatch:
             case kFileTypeProject:
                 return Kind::bundle;
-            case kFileTypeSynthPreset:
-            case kFileTypeSamplerSettings:
-            case kFileTypePlugInSettings:
-            case kFileTypeChannelStrip:
-                return Kind::settings;
             default:
                 return Kind::file;
         }
@@ -96,10 +91,13 @@ class Listing {
 
     const std::vector<Entry>& entries() const { return entries_; }
     std::string_view name(const Entry& entry) const { return {names_.data() + entry.start, entry.size}; }
-    bool contains(std::string_view wanted) const {
-        const auto hit = std::lower_bound(entries_.begin(), entries_.end(), wanted,
-                                          [this](const Entry& a, std::string_view b) { return name(a) < b; });
-        return hit != entries_.end() && name(*hit) == wanted;
+    /// Calls `visit` with the end of each name that begins so.
+    template <typename Visit>
+    void forEachThatBegins(std::string_view start, Visit visit) const {
+        auto hit = std::lower_bound(entries_.begin(), entries_.end(), start,
+                                    [this](const Entry& a, std::string_view b) { return name(a) < b; });
+        for (; hit != entries_.end() && name(*hit).starts_with(start); ++hit)
+            visit(name(*hit).substr(start.size()));
     }
 
   private:
@@ -220,7 +218,7 @@ class Walk {
             kind == Kind::bundle ? S_ISDIR(status.st_mode) : kind != Kind::other && S_ISREG(status.st_mode);
         if (!isContent) return;
         ListedItem item{name, stampOf(status)};
-        if (kind == Kind::settings) includeCompanions(folder, listing, item);
+        includeCompanions(folder, listing, item);
         if (kind == Kind::bundle) {
             std::size_t budget = 10000;
             includeContents(folder, name.data(), item.stamp, budget, 0);
@@ -228,13 +226,17 @@ class Walk {
         items.push_back(item);
     }
 
+    /// The record, description and preview that lie beside an item. The size stays the item's own.
     static void includeCompanions(int folder, const Listing& listing, ListedItem& item) {
-        for (const char* ending : {".plist", ".caf"}) {
-            const std::string companion = std::string(item.name) + ending;
+        const std::uint64_t size = item.stamp.size;
+        listing.forEachThatBegins(std::string(item.name) + ".", [&](std::string_view ending) {
+            constexpr std::array<std::string_view, 4> endings = {"plist", "zxml", "xml", "caf"};
             struct stat status {};
-            if (listing.contains(companion) && ::fstatat(folder, companion.c_str(), &status, 0) == 0)
-                include(item.stamp, stampOf(status));
-        }
+            if (std::find(endings.begin(), endings.end(), ending) == endings.end()) return;
+            const char* companion = ending.data() - item.name.size() - 1;
+            if (::fstatat(folder, companion, &status, 0) == 0) include(item.stamp, stampOf(status));
+        });
+        item.stamp.size = size;
     }
 
     static bool isLink(int folder, std::string_view name, unsigned char kind) {

@@ -13,7 +13,8 @@ namespace qvct::contentdb {
 /// A content item as a folder lists it.
 struct ListedItem {
     std::string_view name;
-    /// Of a bundle: of all that lies in it. Of a settings file: also of the record and preview beside it.
+    /// Tells changes of the record, description and preview beside it as well, and of all that lies in a
+    /// bundle.
     FileStamp stamp;
 };
 

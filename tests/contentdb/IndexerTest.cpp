@@ -143,6 +143,31 @@ TEST_F(Indexing, ReadsWhatHasChangedOnly) {
     EXPECT_EQ(index().described, 0U);
 }
 
+TEST_F(Indexing, ReadsAnItemAgainWhenWhatLiesBesideItChanges) {
+    for (const char* name : {"Kick.wav", "Kick.wav-2.wav", "Pad.cst", "Bell.patch/data"})
+        write(name, "sound");
+    settle();
+    index();
+    for (const std::string beside : {"Kick.wav.zxml", "Kick.wav.xml", "Kick.wav.caf", "Pad.cst.plist",
+                                     "Pad.cst.zxml", "Pad.cst.caf", "Bell.patch.xml", "Bell.patch.caf"}) {
+        // A sound is an item of its own as well, unless its name says that it is a preview of settings.
+        const bool isItem = beside.ends_with(".caf") && beside != "Pad.cst.caf";
+        for (const char* bytes : {"one", "another"}) {
+            write(beside, bytes);
+            settle();
+            EXPECT_EQ(index().described, isItem ? 2U : 1U) << beside;
+        }
+        std::filesystem::remove(library() + "/" + beside);
+        EXPECT_EQ(index().described, 1U) << beside;
+    }
+    write("Kick.wav.txt", "of no account");
+    write("Kick.wav.caf", "a preview");
+    settle();
+    index();
+    EXPECT_EQ(ContentDatabase::open(database())->item(library() + "/Kick.wav")->item.stamp.size, 5U);
+    EXPECT_EQ(index().described, 0U);
+}
+
 TEST_F(Indexing, ReadsAgainWhatChangedWhileItWasRead) {
     write("Kick rewritten.wav", "before");
     settle();
