@@ -75,10 +75,10 @@ bool IndexRun::visit(const std::string& path, const std::vector<ListedItem>& all
     const FolderRecord known = writer_.folder(path);
     if (known.id != 0) visited_.insert(known.id);
     const std::uint64_t digest = digestOf(items);
-    const bool isUnchanged = known.digest == digest && !(options_.prune && known.gone > 0);
+    // What is missing may have turned up elsewhere.
+    const bool isUnchanged = known.digest == digest && known.gone == 0;
     if ((isUnchanged && !options_.retryFailed) || (known.id == 0 && items.empty())) {
         progress_.unchanged += items.size();
-        progress_.missing += static_cast<std::uint64_t>(known.gone);
     } else {
         const auto folder = std::make_shared<OpenFolder>(OpenFolder{path, digest, 0, 1});
         if (!submitChanged(folder, known.id, items)) return false;
@@ -127,9 +127,8 @@ bool IndexRun::submitChanged(const std::shared_ptr<OpenFolder>& folder, std::int
     for (const auto& [name, file] : known) {
         ++progress_.missing;
         ++folder->gone;
-        if (options_.prune) gone_.push_back(file.id);
+        missing_.insert(file.id);
     }
-    if (options_.prune) folder->gone = 0;
     return true;
 }
 
@@ -203,6 +202,7 @@ void IndexRun::storeOne(const Described& described, Pending& pending) {
             writer_.addEarlierPath(*before, writer_.store().item(*before)->path);
             pending.id = *before;
             ++progress_.moved;
+            progress_.missing -= missing_.erase(*before);
         }
     }
     writer_.put(pending.id, item, described.terms);
@@ -228,7 +228,7 @@ bool IndexRun::finish() {
 
 void IndexRun::prune() {
     writer_.begin();
-    for (const ItemId id : gone_) removeIfGone(id);
+    for (const ItemId id : missing_) removeIfGone(id);
     writer_.commit();
     for (const std::string& root : roots_) pruneUnvisited(root);
 }

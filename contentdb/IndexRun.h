@@ -75,7 +75,7 @@ class IndexRun {
     std::unordered_set<std::string> shown_;     // folders, by path
     std::unordered_set<std::int64_t> visited_;  // folders, by number
     std::set<std::string, std::less<>> unreadable_;
-    std::vector<ItemId> gone_;
+    std::set<ItemId> missing_;  // of the folders that were visited
     std::chrono::steady_clock::time_point lastFlush_;
     std::chrono::steady_clock::time_point lastReport_;
 };

@@ -225,6 +225,30 @@ TEST_F(Indexing, KnowsAMovedFileAgain) {
     EXPECT_TRUE(database->check());
 }
 
+TEST_F(Indexing, MissesWhatIsGoneButNotWhatWasMoved) {
+    for (const char* name : {"a/Kick.wav", "a/Snare.wav", "a/Hat.wav", "z/Clap.wav", "z/Tom.wav"})
+        write(name, name);
+    settle();
+    index();
+    std::filesystem::rename(library() + "/a/Kick.wav", library() + "/z/Kick.wav");
+    std::filesystem::rename(library() + "/z/Clap.wav", library() + "/a/Clap.wav");
+    std::filesystem::remove(library() + "/a/Hat.wav");
+    settle();
+    for (const std::uint64_t moved : {2U, 0U, 0U}) {
+        const IndexProgress progress = index();
+        EXPECT_EQ(progress.moved, moved);
+        EXPECT_EQ(progress.missing, 1U);
+    }
+    // Found again when it was missing already.
+    write("z/Hat.wav", "a/Hat.wav");
+    settle();
+    for (const std::uint64_t moved : {1U, 0U}) {
+        const IndexProgress progress = index();
+        EXPECT_EQ(progress.moved, moved);
+        EXPECT_EQ(progress.missing, 0U);
+    }
+}
+
 TEST_F(Indexing, KnowsAMovedFileAmongManyCopies) {
     for (int i = 0; i < 60; ++i) write(fmt::format("{}/Kick.wav", i), "the same");
     settle();
