@@ -97,9 +97,13 @@ std::vector<ListedItem> IndexRun::itemsOfPart(const std::string& path,
                                               const std::vector<ListedItem>& items) const {
     std::vector<ListedItem> part;
     for (const ListedItem& item : items) {
-        if (stringHash(joined(path, item.name)) % options_.parts == options_.part - 1) part.push_back(item);
+        if (isOfPart(path, item.name)) part.push_back(item);
     }
     return part;
+}
+
+bool IndexRun::isOfPart(const std::string& path, std::string_view name) const {
+    return options_.parts == 1 || stringHash(joined(path, name)) % options_.parts == options_.part - 1;
 }
 
 bool IndexRun::submitChanged(const std::shared_ptr<OpenFolder>& folder, std::int64_t folderId,
@@ -125,6 +129,7 @@ bool IndexRun::submitChanged(const std::shared_ptr<OpenFolder>& folder, std::int
         }
     }
     for (const auto& [name, file] : known) {
+        if (!isOfPart(folder->path, name)) continue;
         ++progress_.missing;
         ++folder->gone;
         missing_.insert(file.id);

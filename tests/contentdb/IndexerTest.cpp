@@ -375,6 +375,22 @@ TEST_F(Indexing, OfPartsUnitesToTheSameContent) {
     EXPECT_THAT(error.message, HasSubstr("exists already"));
 }
 
+TEST_F(Indexing, OfPartsInOneDatabaseMissesNothingOfTheOthers) {
+    for (int i = 0; i < 40; ++i) write(fmt::format("Kick {}.wav", i), std::to_string(i));
+    settle();
+    const auto part = [this](unsigned number) {
+        return index([number](IndexOptions& options) {
+            options.prune = true;
+            options.part = number;
+            options.parts = 2;
+        });
+    };
+    EXPECT_EQ(part(1).missing + part(2).missing + part(1).missing, 0U);
+    std::filesystem::remove(library() + "/Kick 7.wav");
+    EXPECT_EQ(part(1).pruned + part(2).pruned, 1U);
+    EXPECT_EQ(names().size(), 39U);
+}
+
 TEST_F(Indexing, RebuildsADamagedDatabaseAndKeepsTheOld) {
     for (int i = 0; i < 300; ++i) write(fmt::format("Kick {}.wav", i), "");
     settle();
