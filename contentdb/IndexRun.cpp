@@ -5,12 +5,10 @@
 #include "platform/Text.h"
 
 #include <algorithm>
-#include <cerrno>
 #include <ctime>
 #include <utility>
 
 #include <fmt/format.h>
-#include <sys/stat.h>
 
 namespace qvct::contentdb {
 namespace {
@@ -31,11 +29,6 @@ std::int64_t wallNanoseconds() {
     ::clock_gettime(CLOCK_REALTIME, &now);
     constexpr std::int64_t second = 1'000'000'000;
     return now.tv_sec * second + now.tv_nsec;
-}
-
-bool isGone(const std::string& path) {
-    struct stat status {};
-    return ::lstat(path.c_str(), &status) != 0 && (errno == ENOENT || errno == ENOTDIR);
 }
 
 std::string joined(const std::string& folder, std::string_view name) {

@@ -3,12 +3,13 @@
 #include "contentdb/ItemCodec.h"
 #include "contentdb/Terms.h"
 #include "contentdb/Words.h"
-#include "platform/FileAccess.h"
 #include "platform/Text.h"
 
 #include <algorithm>
+#include <cerrno>
 
 #include <fmt/format.h>
+#include <sys/stat.h>
 
 namespace qvct::contentdb {
 namespace {
@@ -27,6 +28,11 @@ std::string candidatesWhere(std::string_view condition) {
 }
 
 }  // namespace
+
+bool isGone(const std::string& path) {
+    struct stat status {};
+    return ::lstat(path.c_str(), &status) != 0 && (errno == ENOENT || errno == ENOTDIR);
+}
 
 StoreWriter::StoreWriter(Connection& connection)
     : store_(connection),
@@ -94,7 +100,7 @@ std::optional<ItemId> StoreWriter::idOfMoved(const IndexedItem& item) {
             const std::string folder(candidates.bytes(1));
             const std::string path =
                 (folder == "/" ? folder : folder + "/") + std::string(candidates.bytes(2));
-            if (path != item.path && !fileExists(path)) id = candidates.integer(0);
+            if (path != item.path && isGone(path)) id = candidates.integer(0);
         }
         candidates.reset();
         return id;

@@ -27,6 +27,9 @@ struct FileRecord {
     bool hasFailed = false;
 };
 
+/// Whether nothing lies at the path. What only cannot be looked at is not gone.
+bool isGone(const std::string& path);
+
 /// Changes items and the index in batches: what lies between `begin` and `commit` is written whole or not at
 /// all. Every operation throws DatabaseFailure; a writer that has thrown is of no more use.
 class StoreWriter {

@@ -263,6 +263,19 @@ TEST_F(Indexing, KnowsAMovedFileAmongManyCopies) {
     EXPECT_EQ(index().moved, 0U);
 }
 
+TEST_F(Indexing, TakesNothingForMovedThatOnlyCannotBeLookedAt) {
+    write("a/Kick.wav", "Kick");
+    settle();
+    index();
+    std::filesystem::rename(library() + "/a", folder_.path("aside"));
+    std::filesystem::create_symlink("a", library() + "/a");
+    write("z/Kick.wav", "Kick");
+    settle();
+    const IndexProgress progress = index([](IndexOptions& options) { options.prune = true; });
+    EXPECT_EQ(progress.moved + progress.pruned, 0U);
+    EXPECT_EQ(names().size(), 2U);
+}
+
 TEST_F(Indexing, LosesOneItemToEachThatFailsCrashesOrHangs) {
     std::vector<std::string> good;
     for (int i = 0; i < 300; ++i) {
