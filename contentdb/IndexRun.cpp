@@ -44,7 +44,9 @@ IndexRun::IndexRun(const IndexOptions& options, Connection& connection, WorkerPo
       nextId_(writer_.store().lastId() + 1),
       isNewDatabase_(nextId_ == 1),
       lastFlush_(Clock::now()),
-      lastReport_(lastFlush_) {}
+      lastReport_(lastFlush_) {
+    writer_.setDescriber(options.describer);
+}
 
 bool IndexRun::walk(const std::string& folder) {
     if (isStopped_) return areWorkersInOrder_;

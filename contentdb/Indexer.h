@@ -30,6 +30,9 @@ struct IndexOptions {
     std::vector<std::string> folders;
     /// Path of the database; made when there is none.
     std::string database;
+    /// A number for what describes items, such as `ContentDescriber::digest`. The database keeps it; when it
+    /// is another than before, every item counts as changed, also those that only a later run comes to.
+    std::uint64_t describer = 0;
     /// Takes items out of the index whose files are gone.
     bool prune = false;
     /// Reads items again that failed before, though they have not changed.
@@ -57,9 +60,10 @@ struct IndexOptions {
 
 /// Brings the database up to date with the folders, making it if there is none.
 ///
-/// Only items that are new or whose size, times or inode have changed are read, each in a worker process (see
-/// WorkerPool). Batches of items are stored whole or not at all: a run that was interrupted at any point is
-/// continued by the next. An item with the payload of one that is gone is that item, moved.
+/// Only items that are new, whose size, times or inode have changed (or those of what lies beside them:
+/// record, description, preview), or that another describer has described are read, each in a worker process
+/// (see WorkerPool). Batches of items are stored whole or not at all: a run that was interrupted at any point
+/// is continued by the next. An item with the payload of one that is gone is that item, moved.
 ///
 /// Nothing, and an error, when there is no such folder, the database cannot be written, or another run is
 /// going on. What was stored until then stays.
@@ -68,7 +72,8 @@ QVCT_API std::optional<IndexProgress> indexLibrary(const IndexOptions& options,
                                                    const DescriberFactory& factory, Error* error = nullptr);
 
 /// Unites the databases into a new one with the content that one run over everything would have made. The
-/// first database that has an item counts.
+/// first database that has an item counts. Unless one describer described them all, the next run with one
+/// reads every item again.
 /// False, and an error, when one cannot be read or `target` exists already; then no new database is left.
 QVCT_API bool mergeDatabases(const std::vector<std::string>& databases, const std::string& target,
                              Error* error = nullptr);

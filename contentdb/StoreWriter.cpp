@@ -118,6 +118,16 @@ void StoreWriter::addEarlierPath(ItemId id, std::string_view path) {
         .execute();
 }
 
+void StoreWriter::setDescriber(std::uint64_t describer) {
+    if (store_.describer() == describer) return;
+    begin();
+    store_.connection().run("UPDATE item SET changed = 0; UPDATE folder SET digest = 0");
+    Statement(store_.connection(), "INSERT OR REPLACE INTO setting VALUES ('describer', ?)")
+        .bind(1, describer)
+        .execute();
+    commit();
+}
+
 FolderRecord StoreWriter::folder(std::string_view path) {
     FolderRecord record;
     if (folder_.bind(1, path).step())

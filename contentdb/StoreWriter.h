@@ -48,6 +48,10 @@ class StoreWriter {
     std::optional<ItemId> idOfMoved(const IndexedItem& item);
     void addEarlierPath(ItemId id, std::string_view path);
 
+    /// Notes what describes items from now on. What another has described counts as changed. A batch of its
+    /// own.
+    void setDescriber(std::uint64_t describer);
+
     FolderRecord folder(std::string_view path);
     std::map<std::string, FileRecord, std::less<>> files(std::int64_t folder);
     void setFolder(const FolderRecord& folder);

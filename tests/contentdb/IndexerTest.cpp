@@ -357,6 +357,28 @@ TEST_F(Indexing, StopsWhenToldThoughNothingIsNew) {
     EXPECT_EQ(names().size(), 5U);
 }
 
+TEST_F(Indexing, ReadsAgainWhatAnotherDescriberDescribed) {
+    constexpr std::uint64_t count = 300;
+    for (std::uint64_t i = 0; i < count; ++i) write(fmt::format("slow {}.wav", i), std::to_string(i));
+    write("elsewhere/Kick.wav", "");
+    settle();
+    index();
+    // A database of the first form, which did not keep who described.
+    Connection(database(), Connection::Access::readWrite).run("DROP TABLE setting; PRAGMA user_version = 1");
+    const auto second = [](IndexOptions& options) { options.describer = 2; };
+    const IndexProgress interrupted = index([](IndexOptions& options) {
+        options.describer = 2;
+        options.longestBatch = std::chrono::milliseconds(0);
+        options.isCancelled = [asked = 0]() mutable { return ++asked > 2; };
+    });
+    EXPECT_GT(interrupted.described, 0U);
+    EXPECT_LT(interrupted.described, count);
+    EXPECT_EQ(index(second).described, count + 1 - interrupted.described);
+    EXPECT_EQ(index(second).described, 0U);
+    EXPECT_EQ(index().described, count + 1);
+    EXPECT_EQ(names().size(), count + 1);
+}
+
 TEST_F(Indexing, OfPartsUnitesToTheSameContent) {
     for (int i = 0; i < 500; ++i) write(fmt::format("{}/{}/Kick {}.wav", i % 5, i % 3, i), std::to_string(i));
     write("2/A fails.wav", "");
