@@ -2,13 +2,17 @@
 
 #include "autotagging/QVCTXMLDocument.h"
 #include "autotagging/QVTaggingAggregator.h"
+#include "contentdb/Digest.h"
 #include "contentdb/PayloadHash.h"
 #include "formats/TGRTMetaDataReaderFactory.h"
 #include "indexing/TGRTIndexableContentObject.h"
+#include "platform/FileAccess.h"
 #include "platform/LCFileData.h"
 #include "platform/QVContentTaggingTypes.h"
 #include "platform/RegularExpression.h"
+#include "platform/ResourceBundle.h"
 #include "platform/Text.h"
+#include "platform/Version.h"
 
 #include <array>
 #include <cmath>
@@ -147,6 +151,31 @@ ContentDescriber::ContentDescriber(std::uint64_t services)
     : implementation_(std::make_unique<Implementation>(services)) {}
 
 ContentDescriber::~ContentDescriber() = default;
+
+std::uint64_t ContentDescriber::digest(std::uint64_t services) {
+    constexpr std::pair<std::string_view, std::string_view> resources[] = {
+        {"DefaultTaxonomy", "plist"},
+        {"DefaultRules", "plist"},
+        {"DefaultKeywordMapping", "plist"},
+        {"LegacyLoopTaxonomy", "plist"},
+        {"LegacyLoopTaxonomyMapping", "csv"},
+        {"LegacyVorthalTaxonomy", "plist"},
+        {"LegacyVorthalTaxonomyMapping", "csv"},
+        {"PackDisplayNames", "csv"},
+        {"QVSearchKit", "js"},
+        {"ExtractSoftwareInstrumentsRule", "js"}};
+    Digest digest;
+    digest.add(services);
+    digest.add(version());
+    for (const auto& [name, extension] : resources) {
+        const auto path = ResourceBundle::pathForResource(name, extension);
+        const auto bytes = path ? readFile(*path) : std::nullopt;
+        if (!bytes) continue;
+        digest.add(name);
+        digest.add({reinterpret_cast<const char*>(bytes->data()), bytes->size()});
+    }
+    return digest.value();
+}
 
 std::optional<IndexedItem> ContentDescriber::describe(const std::string& path, Error* error) {
     Implementation& its = *implementation_;

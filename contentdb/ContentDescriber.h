@@ -27,6 +27,11 @@ class QVCT_API ContentDescriber : public ItemDescriber {
     explicit ContentDescriber(std::uint64_t services = optionsForAllTaggingServices());
     ~ContentDescriber() override;
 
+    /// A number that changes with what descriptions depend on besides the item: the services, the files that
+    /// replace resources, the version of the library. For `IndexOptions::describer`.
+    /// @cost  Reads the files that replace resources.
+    static std::uint64_t digest(std::uint64_t services);
+
     std::optional<IndexedItem> describe(const std::string& path, Error* error) override;
 
   private:

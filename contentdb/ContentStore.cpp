@@ -72,6 +72,11 @@ std::int64_t ContentStore::countOfFailures() {
     return connection_.number("SELECT count(*) FROM item WHERE failed = 1");
 }
 
+std::uint64_t ContentStore::describer() {
+    return static_cast<std::uint64_t>(
+        connection_.number("SELECT value FROM setting WHERE name = 'describer'"));
+}
+
 void ContentStore::forEachFailure(const std::function<bool(const IndexedItem&)>& visit) {
     Statement statement(connection_, std::string(kItemColumns) + "WHERE failed = 1 ORDER BY item.id");
     while (statement.step() && visit(readItem(statement, connection_))) {

@@ -37,6 +37,8 @@ class ContentStore {
     ItemId lastId();
     std::int64_t countOfItems();
     std::int64_t countOfFailures();
+    /// What described the items, see IndexOptions; 0 when that is not known.
+    std::uint64_t describer();
     /// Paths and reasons, in the order of items, until `visit` answers false.
     void forEachFailure(const std::function<bool(const IndexedItem&)>& visit);
 

@@ -5,12 +5,10 @@
 #include "platform/Text.h"
 
 #include <algorithm>
-#include <cerrno>
 #include <ctime>
 #include <utility>
 
 #include <fmt/format.h>
-#include <sys/stat.h>
 
 namespace qvct::contentdb {
 namespace {
@@ -33,11 +31,6 @@ std::int64_t wallNanoseconds() {
     return now.tv_sec * second + now.tv_nsec;
 }
 
-bool isGone(const std::string& path) {
-    struct stat status {};
-    return ::lstat(path.c_str(), &status) != 0 && (errno == ENOENT || errno == ENOTDIR);
-}
-
 std::string joined(const std::string& folder, std::string_view name) {
     return (folder == "/" ? folder : folder + "/") + std::string(name);
 }
@@ -51,9 +44,12 @@ IndexRun::IndexRun(const IndexOptions& options, Connection& connection, WorkerPo
       nextId_(writer_.store().lastId() + 1),
       isNewDatabase_(nextId_ == 1),
       lastFlush_(Clock::now()),
-      lastReport_(lastFlush_) {}
+      lastReport_(lastFlush_) {
+    writer_.setDescriber(options.describer);
+}
 
 bool IndexRun::walk(const std::string& folder) {
+    if (isStopped_) return areWorkersInOrder_;
     roots_.push_back(folder);
     walkLibrary(
         folder,
@@ -66,6 +62,7 @@ bool IndexRun::walk(const std::string& folder) {
 }
 
 bool IndexRun::visit(const std::string& path, const std::vector<ListedItem>& all) {
+    if (!shown_.insert(path).second) return true;  // below an earlier root
     std::vector<ListedItem> part;
     if (options_.parts > 1) part = itemsOfPart(path, all);
     const std::vector<ListedItem>& items = options_.parts > 1 ? part : all;
@@ -73,26 +70,35 @@ bool IndexRun::visit(const std::string& path, const std::vector<ListedItem>& all
     const FolderRecord known = writer_.folder(path);
     if (known.id != 0) visited_.insert(known.id);
     const std::uint64_t digest = digestOf(items);
-    const bool isUnchanged = known.digest == digest && !(options_.prune && known.gone > 0);
+    // What is missing may have turned up elsewhere.
+    const bool isUnchanged = known.digest == digest && known.gone == 0;
     if ((isUnchanged && !options_.retryFailed) || (known.id == 0 && items.empty())) {
         progress_.unchanged += items.size();
-        progress_.missing += static_cast<std::uint64_t>(known.gone);
     } else {
         const auto folder = std::make_shared<OpenFolder>(OpenFolder{path, digest, 0, 1});
         if (!submitChanged(folder, known.id, items)) return false;
         if (--folder->remaining == 0) complete_.push_back(folder);
     }
+    stopIfCancelled();
     report();
     return !isStopped_;
+}
+
+void IndexRun::stopIfCancelled() {
+    if (options_.isCancelled && options_.isCancelled()) isStopped_ = true;
 }
 
 std::vector<ListedItem> IndexRun::itemsOfPart(const std::string& path,
                                               const std::vector<ListedItem>& items) const {
     std::vector<ListedItem> part;
     for (const ListedItem& item : items) {
-        if (stringHash(joined(path, item.name)) % options_.parts == options_.part - 1) part.push_back(item);
+        if (isOfPart(path, item.name)) part.push_back(item);
     }
     return part;
+}
+
+bool IndexRun::isOfPart(const std::string& path, std::string_view name) const {
+    return options_.parts == 1 || stringHash(joined(path, name)) % options_.parts == options_.part - 1;
 }
 
 bool IndexRun::submitChanged(const std::shared_ptr<OpenFolder>& folder, std::int64_t folderId,
@@ -118,11 +124,11 @@ bool IndexRun::submitChanged(const std::shared_ptr<OpenFolder>& folder, std::int
         }
     }
     for (const auto& [name, file] : known) {
+        if (!isOfPart(folder->path, name)) continue;
         ++progress_.missing;
         ++folder->gone;
-        if (options_.prune) gone_.push_back(file.id);
+        missing_.insert(file.id);
     }
-    if (options_.prune) folder->gone = 0;
     return true;
 }
 
@@ -141,7 +147,7 @@ bool IndexRun::collect() {
         termsInBatch_ += described.terms.size();
         batch_.push_back(std::move(described));
     });
-    if (options_.isCancelled && options_.isCancelled()) isStopped_ = true;
+    stopIfCancelled();
     flushIfDue();
     report();
     return areWorkersInOrder_ && !isStopped_;
@@ -196,6 +202,7 @@ void IndexRun::storeOne(const Described& described, Pending& pending) {
             writer_.addEarlierPath(*before, writer_.store().item(*before)->path);
             pending.id = *before;
             ++progress_.moved;
+            progress_.missing -= missing_.erase(*before);
         }
     }
     writer_.put(pending.id, item, described.terms);
@@ -211,6 +218,7 @@ void IndexRun::storeFolder(const OpenFolder& folder) {
 }
 
 bool IndexRun::finish() {
+    stopIfCancelled();
     while (areWorkersInOrder_ && !isStopped_ && workers_.isBusy()) collect();
     flush();
     if (options_.prune && areWorkersInOrder_ && !isStopped_) prune();
@@ -220,7 +228,7 @@ bool IndexRun::finish() {
 
 void IndexRun::prune() {
     writer_.begin();
-    for (const ItemId id : gone_) removeIfGone(id);
+    for (const ItemId id : missing_) removeIfGone(id);
     writer_.commit();
     for (const std::string& root : roots_) pruneUnvisited(root);
 }

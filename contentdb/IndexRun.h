@@ -42,9 +42,11 @@ class IndexRun {
 
     bool visit(const std::string& path, const std::vector<ListedItem>& items);
     std::vector<ListedItem> itemsOfPart(const std::string& path, const std::vector<ListedItem>& items) const;
+    bool isOfPart(const std::string& path, std::string_view name) const;
     bool submitChanged(const std::shared_ptr<OpenFolder>& folder, std::int64_t folderId,
                        const std::vector<ListedItem>& items);
     bool submit(const ListedItem& item, ItemId id, const std::shared_ptr<OpenFolder>& folder);
+    void stopIfCancelled();
     bool collect();
     void store(std::vector<Described>& batch);
     void storeOne(const Described& described, Pending& pending);
@@ -71,9 +73,10 @@ class IndexRun {
     std::size_t termsInBatch_ = 0;
     std::vector<std::shared_ptr<OpenFolder>> complete_;  // to be stored with the batch
     std::vector<std::string> roots_;
+    std::unordered_set<std::string> shown_;     // folders, by path
     std::unordered_set<std::int64_t> visited_;  // folders, by number
     std::set<std::string, std::less<>> unreadable_;
-    std::vector<ItemId> gone_;
+    std::set<ItemId> missing_;  // of the folders that were visited
     std::chrono::steady_clock::time_point lastFlush_;
     std::chrono::steady_clock::time_point lastReport_;
 };

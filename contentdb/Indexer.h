@@ -26,10 +26,13 @@ struct IndexProgress {
 
 /// What a run is to do. Only `folders` and `database` have to be given.
 struct IndexOptions {
-    /// Folders to walk.
+    /// Folders to walk. One that lies in another is walked once.
     std::vector<std::string> folders;
     /// Path of the database; made when there is none.
     std::string database;
+    /// A number for what describes items, such as `ContentDescriber::digest`. The database keeps it; when it
+    /// is another than before, every item counts as changed, also those that only a later run comes to.
+    std::uint64_t describer = 0;
     /// Takes items out of the index whose files are gone.
     bool prune = false;
     /// Reads items again that failed before, though they have not changed.
@@ -50,15 +53,17 @@ struct IndexOptions {
     std::function<void(const Error&)> failed;
     /// Told when a damaged database was put aside ("<database>.damaged") and is built anew.
     std::function<void(const std::string& message)> note;
-    /// Asked now and then; true ends the run early, with all that was read so far stored.
+    /// Asked after each folder and while items are read; true ends the run early, with all that was read so
+    /// far stored and nothing taken out.
     std::function<bool()> isCancelled;
 };
 
 /// Brings the database up to date with the folders, making it if there is none.
 ///
-/// Only items that are new or whose size, times or inode have changed are read, each in a worker process (see
-/// WorkerPool). Batches of items are stored whole or not at all: a run that was interrupted at any point is
-/// continued by the next. An item with the payload of one that is gone is that item, moved.
+/// Only items that are new, whose size, times or inode have changed (or those of what lies beside them:
+/// record, description, preview), or that another describer has described are read, each in a worker process
+/// (see WorkerPool). Batches of items are stored whole or not at all: a run that was interrupted at any point
+/// is continued by the next. An item with the payload of one that is gone is that item, moved.
 ///
 /// Nothing, and an error, when there is no such folder, the database cannot be written, or another run is
 /// going on. What was stored until then stays.
@@ -67,7 +72,8 @@ QVCT_API std::optional<IndexProgress> indexLibrary(const IndexOptions& options,
                                                    const DescriberFactory& factory, Error* error = nullptr);
 
 /// Unites the databases into a new one with the content that one run over everything would have made. The
-/// first database that has an item counts.
+/// first database that has an item counts. Unless one describer described them all, the next run with one
+/// reads every item again.
 /// False, and an error, when one cannot be read or `target` exists already; then no new database is left.
 QVCT_API bool mergeDatabases(const std::vector<std::string>& databases, const std::string& target,
                              Error* error = nullptr);

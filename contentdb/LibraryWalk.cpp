@@ -10,8 +10,10 @@
 #include <array>
 #include <cerrno>
 #include <cstring>
+#include <deque>
 #include <map>
 #include <memory>
+#include <set>
 #include <utility>
 
 #include <dirent.h>
@@ -28,7 +30,7 @@ using Folder = std::unique_ptr<DIR, int (*)(DIR*)>;
 /// Deepest that folders are entered: no path that the system takes holds more.
 constexpr std::size_t kDeepest = 2000;
 
-enum class Kind : unsigned char { other, file, settings, bundle };
+enum class Kind : unsigned char { other, file, bundle };
 
 /// The kind of content that a name promises, remembered by extension.
 class NameKinds {
@@ -59,11 +61,6 @@ class NameKinds {
             case kFileTypePatch:
             case kFileTypeProject:
                 return Kind::bundle;
-            case kFileTypeSynthPreset:
-            case kFileTypeSamplerSettings:
-            case kFileTypePlugInSettings:
-            case kFileTypeChannelStrip:
-                return Kind::settings;
             default:
                 return Kind::file;
         }
@@ -94,10 +91,13 @@ class Listing {
 
     const std::vector<Entry>& entries() const { return entries_; }
     std::string_view name(const Entry& entry) const { return {names_.data() + entry.start, entry.size}; }
-    bool contains(std::string_view wanted) const {
-        const auto hit = std::lower_bound(entries_.begin(), entries_.end(), wanted,
-                                          [this](const Entry& a, std::string_view b) { return name(a) < b; });
-        return hit != entries_.end() && name(*hit) == wanted;
+    /// Calls `visit` with the end of each name that begins so.
+    template <typename Visit>
+    void forEachThatBegins(std::string_view start, Visit visit) const {
+        auto hit = std::lower_bound(entries_.begin(), entries_.end(), start,
+                                    [this](const Entry& a, std::string_view b) { return name(a) < b; });
+        for (; hit != entries_.end() && name(*hit).starts_with(start); ++hit)
+            visit(name(*hit).substr(start.size()));
     }
 
   private:
@@ -149,31 +149,37 @@ class Walk {
     Walk(const FolderVisitor& visit, const std::function<void(const std::string&, const Error&)>& failed)
         : visit_(visit), failed_(failed) {}
 
-    bool folder(const std::string& path) {
-        std::vector<std::string> folders;
-        Identity identity;
-        if (!list(path, identity, folders)) return false;
-        open_.push_back(identity);
-        bool goesOn = true;
-        for (const std::string& name : folders) {
-            if (goesOn) goesOn = folder(fmt::format("{}/{}", path == "/" ? "" : path, name));
-        }
-        open_.pop_back();
+    /// Links come last, so that a folder has the path where it lies, whatever points to it.
+    bool start(const std::string& path) {
+        bool goesOn = folder(path, 0);
+        for (; goesOn && !links_.empty(); links_.pop_front()) goesOn = folder(links_.front(), 0);
         return goesOn;
     }
 
   private:
+    bool folder(const std::string& path, std::size_t depth) {
+        std::vector<std::string> folders;
+        if (!list(path, folders)) return false;
+        bool goesOn = true;
+        for (const std::string& name : folders) {
+            if (goesOn && depth < kDeepest) goesOn = folder(joined(path, name), depth + 1);
+        }
+        return goesOn;
+    }
+
+    static std::string joined(const std::string& path, std::string_view name) {
+        return fmt::format("{}/{}", path == "/" ? "" : path, name);
+    }
+
     /// Shows the folder's items to the visitor; what lies in it is entered later, when it is closed again.
-    bool list(const std::string& path, Identity& identity, std::vector<std::string>& folders) {
+    bool list(const std::string& path, std::vector<std::string>& folders) {
         const Folder folder(::opendir(path.c_str()), ::closedir);
         struct stat status {};
         if (!folder || ::fstat(::dirfd(folder.get()), &status) != 0) {
             fail(path);
             return true;
         }
-        identity = {status.st_dev, status.st_ino};
-        if (open_.size() >= kDeepest || std::find(open_.begin(), open_.end(), identity) != open_.end())
-            return true;
+        if (!entered_.insert({status.st_dev, status.st_ino}).second) return true;
         const Listing listing(folder.get());
         std::vector<ListedItem> items;
         for (const Listing::Entry& entry : listing.entries())
@@ -201,14 +207,18 @@ class Walk {
             return;
         }
         if (S_ISDIR(status.st_mode) && kind != Kind::bundle) {
-            folders.emplace_back(name);
+            if (isLink(folder, name, entry.kind)) {
+                links_.push_back(joined(path, name));
+            } else {
+                folders.emplace_back(name);
+            }
             return;
         }
         const bool isContent =
             kind == Kind::bundle ? S_ISDIR(status.st_mode) : kind != Kind::other && S_ISREG(status.st_mode);
         if (!isContent) return;
         ListedItem item{name, stampOf(status)};
-        if (kind == Kind::settings) includeCompanions(folder, listing, item);
+        includeCompanions(folder, listing, item);
         if (kind == Kind::bundle) {
             std::size_t budget = 10000;
             includeContents(folder, name.data(), item.stamp, budget, 0);
@@ -216,19 +226,30 @@ class Walk {
         items.push_back(item);
     }
 
+    /// The record, description and preview that lie beside an item. The size stays the item's own.
     static void includeCompanions(int folder, const Listing& listing, ListedItem& item) {
-        for (const char* ending : {".plist", ".caf"}) {
-            const std::string companion = std::string(item.name) + ending;
+        const std::uint64_t size = item.stamp.size;
+        listing.forEachThatBegins(std::string(item.name) + ".", [&](std::string_view ending) {
+            constexpr std::array<std::string_view, 4> endings = {"plist", "zxml", "xml", "caf"};
             struct stat status {};
-            if (listing.contains(companion) && ::fstatat(folder, companion.c_str(), &status, 0) == 0)
-                include(item.stamp, stampOf(status));
-        }
+            if (std::find(endings.begin(), endings.end(), ending) == endings.end()) return;
+            const char* companion = ending.data() - item.name.size() - 1;
+            if (::fstatat(folder, companion, &status, 0) == 0) include(item.stamp, stampOf(status));
+        });
+        item.stamp.size = size;
+    }
+
+    static bool isLink(int folder, std::string_view name, unsigned char kind) {
+        struct stat status {};
+        if (kind != DT_UNKNOWN) return kind == DT_LNK;
+        return ::fstatat(folder, name.data(), &status, AT_SYMLINK_NOFOLLOW) == 0 && S_ISLNK(status.st_mode);
     }
 
     const FolderVisitor& visit_;
     const std::function<void(const std::string&, const Error&)>& failed_;
     NameKinds kinds_;
-    std::vector<Identity> open_;  // the folders from the start down to where we are
+    std::set<Identity> entered_;
+    std::deque<std::string> links_;  // to folders, to be entered when the others were
 };
 
 std::uint64_t countBelow(const std::string& path, NameKinds& kinds, std::size_t depth) {
@@ -250,7 +271,7 @@ std::uint64_t countBelow(const std::string& path, NameKinds& kinds, std::size_t 
 
 bool walkLibrary(const std::string& folder, const FolderVisitor& visit,
                  const std::function<void(const std::string& path, const Error& error)>& failed) {
-    return Walk(visit, failed).folder(folder);
+    return Walk(visit, failed).start(folder);
 }
 
 std::uint64_t countContentNames(const std::string& folder) {

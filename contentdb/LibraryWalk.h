@@ -13,7 +13,8 @@ namespace qvct::contentdb {
 /// A content item as a folder lists it.
 struct ListedItem {
     std::string_view name;
-    /// Of a bundle: of all that lies in it. Of a settings file: also of the record and preview beside it.
+    /// Tells changes of the record, description and preview beside it as well, and of all that lies in a
+    /// bundle.
     FileStamp stamp;
 };
 
@@ -22,8 +23,8 @@ struct ListedItem {
 using FolderVisitor = std::function<bool(const std::string& folder, const std::vector<ListedItem>& items)>;
 
 /// Walks the folder and all below it, a folder's items first and then its folders, each by name. The same
-/// names are content as for `walkContent`; links are followed, but a folder that lies inside itself is
-/// entered once.
+/// names are content as for `walkContent`; links are followed, after all else, to folders that were not
+/// entered yet: each is entered once.
 ///
 /// `failed` is told the path and reason of what cannot be read; the walk goes on.
 /// @return  False when the visitor stopped it.

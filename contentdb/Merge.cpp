@@ -9,6 +9,7 @@
 #include <filesystem>
 #include <map>
 #include <memory>
+#include <set>
 
 #include <fmt/format.h>
 
@@ -44,6 +45,7 @@ class Merge {
     }
 
     void run() {
+        writer_.setDescriber(describer());
         writer_.begin();
         for (const auto& [path, parts] : folders()) addFolder(parts);
         writer_.commit();
@@ -58,6 +60,13 @@ class Merge {
         std::int64_t folder;
     };
     using Folders = std::map<std::string, std::vector<Part>, WalkOrder>;
+
+    /// Of all the sources; 0 when they differ, so that the next run reads everything again.
+    std::uint64_t describer() {
+        std::set<std::uint64_t> describers;
+        for (const Source& source : sources_) describers.insert(source.reader->store().describer());
+        return describers.size() == 1 ? *describers.begin() : 0;
+    }
 
     Folders folders() {
         Folders folders;

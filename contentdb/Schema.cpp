@@ -46,7 +46,8 @@ constexpr std::array kMigrations = {
        CREATE TABLE posting (key INTEGER PRIMARY KEY, ids BLOB NOT NULL);
        -- Tags as they are written, and the categories and number fields that a query may name.
        CREATE TABLE tag (term INTEGER PRIMARY KEY, label BLOB NOT NULL, category BLOB NOT NULL);
-       CREATE TABLE field (isNumber INTEGER, name BLOB, PRIMARY KEY (isNumber, name)) WITHOUT ROWID;)"};
+       CREATE TABLE field (isNumber INTEGER, name BLOB, PRIMARY KEY (isNumber, name)) WITHOUT ROWID;)",
+    "CREATE TABLE setting (name TEXT PRIMARY KEY, value INTEGER NOT NULL) WITHOUT ROWID;"};
 
 /// The first bytes of the file, or fewer if it is shorter.
 std::string header(const std::string& path) {

@@ -3,12 +3,13 @@
 #include "contentdb/ItemCodec.h"
 #include "contentdb/Terms.h"
 #include "contentdb/Words.h"
-#include "platform/FileAccess.h"
 #include "platform/Text.h"
 
 #include <algorithm>
+#include <cerrno>
 
 #include <fmt/format.h>
+#include <sys/stat.h>
 
 namespace qvct::contentdb {
 namespace {
@@ -27,6 +28,11 @@ std::string candidatesWhere(std::string_view condition) {
 }
 
 }  // namespace
+
+bool isGone(const std::string& path) {
+    struct stat status {};
+    return ::lstat(path.c_str(), &status) != 0 && (errno == ENOENT || errno == ENOTDIR);
+}
 
 StoreWriter::StoreWriter(Connection& connection)
     : store_(connection),
@@ -57,6 +63,8 @@ void StoreWriter::put(ItemId id, const IndexedItem& item, const std::vector<std:
             kErrorTooLarge,
             fmt::format("{}: more than {} items", printable(store_.connection().path()), kLastItemId));
     }
+    const auto replaced = store_.idOfPath(item.path);
+    if (replaced && *replaced != id) remove(*replaced);
     std::vector<std::string> before;
     if (const auto old = store_.item(id)) before = termsOf(*old);
     std::vector<std::string> difference;
@@ -92,7 +100,7 @@ std::optional<ItemId> StoreWriter::idOfMoved(const IndexedItem& item) {
             const std::string folder(candidates.bytes(1));
             const std::string path =
                 (folder == "/" ? folder : folder + "/") + std::string(candidates.bytes(2));
-            if (path != item.path && !fileExists(path)) id = candidates.integer(0);
+            if (path != item.path && isGone(path)) id = candidates.integer(0);
         }
         candidates.reset();
         return id;
@@ -108,6 +116,16 @@ void StoreWriter::addEarlierPath(ItemId id, std::string_view path) {
         .bind(1, id)
         .bind(2, path)
         .execute();
+}
+
+void StoreWriter::setDescriber(std::uint64_t describer) {
+    if (store_.describer() == describer) return;
+    begin();
+    store_.connection().run("UPDATE item SET changed = 0; UPDATE folder SET digest = 0");
+    Statement(store_.connection(), "INSERT OR REPLACE INTO setting VALUES ('describer', ?)")
+        .bind(1, describer)
+        .execute();
+    commit();
 }
 
 FolderRecord StoreWriter::folder(std::string_view path) {

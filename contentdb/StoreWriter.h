@@ -27,6 +27,9 @@ struct FileRecord {
     bool hasFailed = false;
 };
 
+/// Whether nothing lies at the path. What only cannot be looked at is not gone.
+bool isGone(const std::string& path);
+
 /// Changes items and the index in batches: what lies between `begin` and `commit` is written whole or not at
 /// all. Every operation throws DatabaseFailure; a writer that has thrown is of no more use.
 class StoreWriter {
@@ -37,12 +40,17 @@ class StoreWriter {
     void begin();
     void commit();
 
-    /// Stores the item under `id`, new or known. `terms` are its terms, sorted (see termsOf).
+    /// Stores the item under `id`, new or known; it replaces another that is in its place. `terms` are its
+    /// terms, sorted (see termsOf).
     void put(ItemId id, const IndexedItem& item, const std::vector<std::string>& terms);
     void remove(ItemId id);
     /// A known item of the same payload whose file is no longer there: the same item, moved.
     std::optional<ItemId> idOfMoved(const IndexedItem& item);
     void addEarlierPath(ItemId id, std::string_view path);
+
+    /// Notes what describes items from now on. What another has described counts as changed. A batch of its
+    /// own.
+    void setDescriber(std::uint64_t describer);
 
     FolderRecord folder(std::string_view path);
     std::map<std::string, FileRecord, std::less<>> files(std::int64_t folder);

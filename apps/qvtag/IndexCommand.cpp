@@ -66,6 +66,7 @@ void run(Options& options, ToolContext& context) {
     const auto factory = [&services] { return std::make_unique<contentdb::ContentDescriber>(services); };
     Progress bar(context.quiet);
     IndexOptions& index = options.index;
+    index.describer = contentdb::ContentDescriber::digest(services);
     index.timeLimitPerItem = std::chrono::seconds(options.secondsPerItem);
     std::uint64_t total = 0;
     if (bar.isShown()) {

@@ -7,7 +7,9 @@
 #include <algorithm>
 #include <cerrno>
 #include <cstring>
+#include <deque>
 #include <memory>
+#include <set>
 #include <utility>
 #include <vector>
 
@@ -41,6 +43,7 @@ class Walk {
         if (::stat(url.path().c_str(), &status) != 0) return fail(url);
         if (!S_ISDIR(status.st_mode) || isBundleName(url)) return item(url);
         folder(url, {status.st_dev, status.st_ino});
+        for (; !links_.empty(); links_.pop_front()) folder(links_.front().first, links_.front().second);
     }
 
   private:
@@ -55,13 +58,11 @@ class Walk {
     }
 
     void folder(const URL& url, Identity identity) {
-        if (std::find(open_.begin(), open_.end(), identity) != open_.end()) return;
+        if (!entered_.insert(identity).second) return;
         std::vector<FolderEntry> entries;
         if (!list(url, entries)) return fail(url);
-        open_.push_back(identity);
         for (const FolderEntry& entry : entries)
             visit(url.URLByAppendingPathComponent(entry.name), entry.kind);
-        open_.pop_back();
     }
 
     static bool list(const URL& url, std::vector<FolderEntry>& entries) {
@@ -85,13 +86,24 @@ class Walk {
             return;
         }
         const bool isFolder = !isKnown && S_ISDIR(status.st_mode);
-        if (isFolder && !isBundleName(url)) return folder(url, {status.st_dev, status.st_ino});
+        if (isFolder && !isBundleName(url)) {
+            const Identity identity = {status.st_dev, status.st_ino};
+            return isLink(url, kind) ? void(links_.emplace_back(url, identity)) : folder(url, identity);
+        }
         if (isContentName(url) && isFolder == isBundleName(url)) item(url);
+    }
+
+    static bool isLink(const URL& url, unsigned char kind) {
+        struct stat status {};
+        if (kind != DT_UNKNOWN) return kind == DT_LNK;
+        return ::lstat(url.path().c_str(), &status) == 0 && S_ISLNK(status.st_mode);
     }
 
     const std::function<void(const URL&)>& item_;
     const std::function<void(const Error&)>& failed_;
-    std::vector<Identity> open_;  // the folders from the start down to where we are
+    std::set<Identity> entered_;
+    // To folders: entered when all others were, so that a folder has the path where it lies.
+    std::deque<std::pair<URL, Identity>> links_;
 };
 
 }  // namespace

@@ -18,9 +18,10 @@ QVCT_API bool isContentName(const URL& url);
 
 /// Calls `item` for every content item at or below `path`, in the order of names.
 ///
-/// Folders are walked; a bundle is an item, what lies inside it is not. Links are followed, but a folder that
-/// lies inside itself is entered once. A path that names a file itself is an item whatever its name.
-/// What cannot be read is reported to `failed`, and the walk goes on. Either function may be empty.
+/// Folders are walked; a bundle is an item, what lies inside it is not. Links are followed, after all else,
+/// to folders that were not entered yet: each is entered once. A path that names a file itself is an item
+/// whatever its name. What cannot be read is reported to `failed`, and the walk goes on. Either function may
+/// be empty.
 /// @cost  One listing a folder; files are looked at only where the file system does not tell their kind.
 QVCT_API void walkContent(const std::string& path, const std::function<void(const URL& item)>& item,
                           const std::function<void(const Error& error)>& failed);

@@ -129,6 +129,44 @@ TEST_F(LibraryCommands, TagByTheNamedServicesAndTakeTheFoldersBehind) {
     EXPECT_THAT(wrong.errors, HasSubstr("no service \"magic\""));
 }
 
+TEST_F(LibraryCommands, WalkFoldersThatLinkToEachOtherOnce) {
+    const std::vector<std::string> folders = {"a", "b", "c", "d", "e"};
+    for (const std::string& a : folders) {
+        folder_.write("linked/" + a + "/Kick.wav", Wav().file(Wav().format() + Wav().data()));
+        for (const std::string& b : folders) {
+            if (a != b)
+                std::filesystem::create_directory_symlink("../" + b, folder_.path("linked/" + a + "/" + b));
+        }
+    }
+    std::vector<std::string> paths;
+    for (const json& item : runTool({"autotag", "--json", folder_.path("linked")}).json())
+        paths.push_back(item["path"]);
+    std::vector<std::string> expected;
+    for (const std::string& a : folders) expected.push_back(folder_.path("linked/" + a + "/Kick.wav"));
+    EXPECT_EQ(paths, expected);
+}
+
+TEST_F(LibraryCommands, ReadAgainWhenOtherServicesOrResourcesDescribe) {
+    const auto indexed = [this](const std::vector<std::string>& more) {
+        const json run = index(more).json();
+        EXPECT_EQ(run["indexed"].get<int>() + run["unchanged"].get<int>(), 5);
+        return run["indexed"].get<int>();
+    };
+    const std::vector<std::string> resources = {"--resources", folder_.path("resources")};
+    EXPECT_EQ(indexed({"--services", "content-type"}), 5);
+    EXPECT_EQ(indexed({"--services", "content-type"}), 0);
+    EXPECT_EQ(indexed({}), 5);
+    EXPECT_EQ(names("source:drums").size(), 3U);
+    for (const char* names : {"1,One\n", "1,Two\n"}) {
+        folder_.write("resources/PackDisplayNames.csv", names);
+        EXPECT_EQ(indexed(resources), 5);
+        EXPECT_EQ(indexed(resources), 0);
+    }
+    EXPECT_EQ(indexed({}), 5);
+    EXPECT_EQ(names("").size(), 5U);
+    EXPECT_EQ(runTool({"db", "check", folder_.path("db")}).status, 0);
+}
+
 TEST_F(LibraryCommands, NameWhatCannotBeRead) {
     folder_.write("sounds/broken.wav", "RIFF");
     const ToolResult result = index();
@@ -160,6 +198,17 @@ TEST_F(LibraryCommands, PartsMergeToTheWhole) {
     EXPECT_EQ(merged.json()["items"], 5);
     EXPECT_EQ(names("", "all"), names(""));
     EXPECT_EQ(runTool({"db", "check", folder_.path("all")}).status, 0);
+    EXPECT_EQ(index({}, "all").json()["unchanged"], 5);
+    // Of parts that different services described no word holds for all.
+    const std::vector<std::string> byUser = {"--services", "user"};
+    index({"--part", "1", "--parts", "2", "--services", "user"}, "other");
+    for (const std::vector<std::string>& services : {std::vector<std::string>(), byUser}) {
+        const std::string mixed = services.empty() ? "mixed" : "mixed too";
+        const ToolResult merging = runTool(
+            {"db", "merge", folder_.path("other"), folder_.path("part2"), "--db", folder_.path(mixed)});
+        EXPECT_EQ(merging.status, 0) << merging.errors;
+        EXPECT_EQ(index(services, mixed).json()["indexed"], 5) << mixed;
+    }
 }
 
 TEST_F(LibraryCommands, PointAtTheFaultOfAQuery) {

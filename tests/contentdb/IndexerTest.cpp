@@ -143,6 +143,31 @@ TEST_F(Indexing, ReadsWhatHasChangedOnly) {
     EXPECT_EQ(index().described, 0U);
 }
 
+TEST_F(Indexing, ReadsAnItemAgainWhenWhatLiesBesideItChanges) {
+    for (const char* name : {"Kick.wav", "Kick.wav-2.wav", "Pad.cst", "Bell.patch/data"})
+        write(name, "sound");
+    settle();
+    index();
+    for (const std::string beside : {"Kick.wav.zxml", "Kick.wav.xml", "Kick.wav.caf", "Pad.cst.plist",
+                                     "Pad.cst.zxml", "Pad.cst.caf", "Bell.patch.xml", "Bell.patch.caf"}) {
+        // A sound is an item of its own as well, unless its name says that it is a preview of settings.
+        const bool isItem = beside.ends_with(".caf") && beside != "Pad.cst.caf";
+        for (const char* bytes : {"one", "another"}) {
+            write(beside, bytes);
+            settle();
+            EXPECT_EQ(index().described, isItem ? 2U : 1U) << beside;
+        }
+        std::filesystem::remove(library() + "/" + beside);
+        EXPECT_EQ(index().described, 1U) << beside;
+    }
+    write("Kick.wav.txt", "of no account");
+    write("Kick.wav.caf", "a preview");
+    settle();
+    index();
+    EXPECT_EQ(ContentDatabase::open(database())->item(library() + "/Kick.wav")->item.stamp.size, 5U);
+    EXPECT_EQ(index().described, 0U);
+}
+
 TEST_F(Indexing, ReadsAgainWhatChangedWhileItWasRead) {
     write("Kick rewritten.wav", "before");
     settle();
@@ -152,6 +177,20 @@ TEST_F(Indexing, ReadsAgainWhatChangedWhileItWasRead) {
     const auto item = ContentDatabase::open(database())->item(library() + "/Kick rewritten.wav");
     EXPECT_EQ(item->item.payloadHash, "after!");
     EXPECT_EQ(index().described, 0U);
+}
+
+TEST_F(Indexing, TakesAFolderOnceThatSeveralRootsShow) {
+    for (const char* name : {"Kick.wav", "sub/Snare.wav", "sub/Hat.wav"}) write(name, name);
+    settle();
+    const auto overlapping = [this](IndexOptions& options) {
+        options.folders = {library(), library() + "/sub", library()};
+    };
+    EXPECT_EQ(index(overlapping).described, 3U);
+    write("sub/Clap.wav", "a new sound");
+    settle();
+    EXPECT_EQ(index(overlapping).seen, 4U);
+    EXPECT_EQ(names().size(), 4U);
+    EXPECT_TRUE(ContentDatabase::open(database())->check());
 }
 
 TEST_F(Indexing, ForgetsMissingFilesOnlyWhenTold) {
@@ -186,6 +225,30 @@ TEST_F(Indexing, KnowsAMovedFileAgain) {
     EXPECT_TRUE(database->check());
 }
 
+TEST_F(Indexing, MissesWhatIsGoneButNotWhatWasMoved) {
+    for (const char* name : {"a/Kick.wav", "a/Snare.wav", "a/Hat.wav", "z/Clap.wav", "z/Tom.wav"})
+        write(name, name);
+    settle();
+    index();
+    std::filesystem::rename(library() + "/a/Kick.wav", library() + "/z/Kick.wav");
+    std::filesystem::rename(library() + "/z/Clap.wav", library() + "/a/Clap.wav");
+    std::filesystem::remove(library() + "/a/Hat.wav");
+    settle();
+    for (const std::uint64_t moved : {2U, 0U, 0U}) {
+        const IndexProgress progress = index();
+        EXPECT_EQ(progress.moved, moved);
+        EXPECT_EQ(progress.missing, 1U);
+    }
+    // Found again when it was missing already.
+    write("z/Hat.wav", "a/Hat.wav");
+    settle();
+    for (const std::uint64_t moved : {1U, 0U}) {
+        const IndexProgress progress = index();
+        EXPECT_EQ(progress.moved, moved);
+        EXPECT_EQ(progress.missing, 0U);
+    }
+}
+
 TEST_F(Indexing, KnowsAMovedFileAmongManyCopies) {
     for (int i = 0; i < 60; ++i) write(fmt::format("{}/Kick.wav", i), "the same");
     settle();
@@ -198,6 +261,19 @@ TEST_F(Indexing, KnowsAMovedFileAmongManyCopies) {
     write("copied/Kick.wav", "the same");
     settle();
     EXPECT_EQ(index().moved, 0U);
+}
+
+TEST_F(Indexing, TakesNothingForMovedThatOnlyCannotBeLookedAt) {
+    write("a/Kick.wav", "Kick");
+    settle();
+    index();
+    std::filesystem::rename(library() + "/a", folder_.path("aside"));
+    std::filesystem::create_symlink("a", library() + "/a");
+    write("z/Kick.wav", "Kick");
+    settle();
+    const IndexProgress progress = index([](IndexOptions& options) { options.prune = true; });
+    EXPECT_EQ(progress.moved + progress.pruned, 0U);
+    EXPECT_EQ(names().size(), 2U);
 }
 
 TEST_F(Indexing, LosesOneItemToEachThatFailsCrashesOrHangs) {
@@ -264,6 +340,45 @@ TEST_F(Indexing, GoesOnWhereItWasKilled) {
     EXPECT_TRUE(ContentDatabase::open(database())->check());
 }
 
+TEST_F(Indexing, StopsWhenToldThoughNothingIsNew) {
+    for (const char* name : {"Kick 0.wav", "Kick 1.wav", "Kick 2.wav", "Snare.wav", "a/Hat.wav"})
+        write(name, name);
+    settle();
+    index();
+    for (unsigned folders = 0; folders <= 2; ++folders) {
+        std::filesystem::remove(fmt::format("{}/Kick {}.wav", library(), folders));
+        const IndexProgress progress = index([folders](IndexOptions& options) {
+            options.prune = true;
+            options.isCancelled = [folders, asked = 0U]() mutable { return asked++ >= folders; };
+        });
+        EXPECT_EQ(progress.seen, 3 - folders + (folders == 0 ? 0 : 1)) << folders;
+        EXPECT_EQ(progress.pruned, 0U) << folders;
+    }
+    EXPECT_EQ(names().size(), 5U);
+}
+
+TEST_F(Indexing, ReadsAgainWhatAnotherDescriberDescribed) {
+    constexpr std::uint64_t count = 300;
+    for (std::uint64_t i = 0; i < count; ++i) write(fmt::format("slow {}.wav", i), std::to_string(i));
+    write("elsewhere/Kick.wav", "");
+    settle();
+    index();
+    // A database of the first form, which did not keep who described.
+    Connection(database(), Connection::Access::readWrite).run("DROP TABLE setting; PRAGMA user_version = 1");
+    const auto second = [](IndexOptions& options) { options.describer = 2; };
+    const IndexProgress interrupted = index([](IndexOptions& options) {
+        options.describer = 2;
+        options.longestBatch = std::chrono::milliseconds(0);
+        options.isCancelled = [asked = 0]() mutable { return ++asked > 2; };
+    });
+    EXPECT_GT(interrupted.described, 0U);
+    EXPECT_LT(interrupted.described, count);
+    EXPECT_EQ(index(second).described, count + 1 - interrupted.described);
+    EXPECT_EQ(index(second).described, 0U);
+    EXPECT_EQ(index().described, count + 1);
+    EXPECT_EQ(names().size(), count + 1);
+}
+
 TEST_F(Indexing, OfPartsUnitesToTheSameContent) {
     for (int i = 0; i < 500; ++i) write(fmt::format("{}/{}/Kick {}.wav", i % 5, i % 3, i), std::to_string(i));
     write("2/A fails.wav", "");
@@ -293,6 +408,22 @@ TEST_F(Indexing, OfPartsUnitesToTheSameContent) {
     for (const Found& found : *all) EXPECT_EQ(united->item(found.item.path)->item, found.item);
     EXPECT_FALSE(mergeDatabases(parts, merged, &error));
     EXPECT_THAT(error.message, HasSubstr("exists already"));
+}
+
+TEST_F(Indexing, OfPartsInOneDatabaseMissesNothingOfTheOthers) {
+    for (int i = 0; i < 40; ++i) write(fmt::format("Kick {}.wav", i), std::to_string(i));
+    settle();
+    const auto part = [this](unsigned number) {
+        return index([number](IndexOptions& options) {
+            options.prune = true;
+            options.part = number;
+            options.parts = 2;
+        });
+    };
+    EXPECT_EQ(part(1).missing + part(2).missing + part(1).missing, 0U);
+    std::filesystem::remove(library() + "/Kick 7.wav");
+    EXPECT_EQ(part(1).pruned + part(2).pruned, 1U);
+    EXPECT_EQ(names().size(), 39U);
 }
 
 TEST_F(Indexing, RebuildsADamagedDatabaseAndKeepsTheOld) {
@@ -388,6 +519,26 @@ TEST_F(Indexing, TakesAnyNameAndCirclesOfLinks) {
     EXPECT_THAT(names("%"), ElementsAre("100%_*"));
     EXPECT_THAT(names("raw"), ElementsAre("raw \xff\xfe"));
     EXPECT_EQ(index().described, 0U);
+}
+
+TEST_F(Indexing, EntersFoldersThatLinkToEachOtherOnceAndByTheirOwnNames) {
+    const std::string letters = "abcdef";
+    folder_.write("elsewhere/Far.wav", "far");
+    for (const char a : letters) {
+        write(fmt::format("{}/Kick.wav", a), "");
+        for (const char b : letters) {
+            if (a != b)
+                std::filesystem::create_directory_symlink(library() + "/" + b,
+                                                          fmt::format("{}/{}/{}", library(), a, b));
+        }
+        std::filesystem::create_directory_symlink(folder_.path("elsewhere"),
+                                                  fmt::format("{}/{}/far", library(), a));
+    }
+    settle();
+    EXPECT_EQ(index().seen, letters.size() + 1);
+    const auto database = ContentDatabase::open(this->database());
+    for (const char a : letters) EXPECT_TRUE(database->item(fmt::format("{}/{}/Kick.wav", library(), a)));
+    EXPECT_TRUE(database->item(library() + "/a/far/Far.wav"));
 }
 
 }  // namespace

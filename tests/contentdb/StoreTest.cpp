@@ -57,6 +57,22 @@ TEST(Store, FindsAnItemByItsNewFactsOnly) {
     EXPECT_TRUE(ContentDatabase::open(path)->check());
 }
 
+TEST(Store, HasOneItemInOnePlace) {
+    const TemporaryFolder folder;
+    const std::string path = folder.path("db");
+    const std::vector<IndexedItem> items = generatedItems(4, 10);
+    store(path, items);
+    {
+        const auto connection = openDatabase(path, Access::write);
+        StoreWriter writer(*connection);
+        writer.begin();
+        writer.put(11, items[3], termsOf(items[3]));
+        writer.commit();
+    }
+    EXPECT_EQ(foundNames(path, "").size(), 10U);
+    EXPECT_TRUE(ContentDatabase::open(path)->check());
+}
+
 TEST(Store, IsNotThereBeforeTheBatchIsWhole) {
     const TemporaryFolder folder;
     const std::string path = folder.path("db");
