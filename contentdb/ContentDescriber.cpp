@@ -13,6 +13,7 @@
 #include "platform/ResourceBundle.h"
 #include "platform/Text.h"
 #include "platform/Version.h"
+#include "resources/ResourceFiles.h"
 
 #include <array>
 #include <cmath>
@@ -153,21 +154,10 @@ ContentDescriber::ContentDescriber(std::uint64_t services)
 ContentDescriber::~ContentDescriber() = default;
 
 std::uint64_t ContentDescriber::digest(std::uint64_t services) {
-    constexpr std::pair<std::string_view, std::string_view> resources[] = {
-        {"DefaultTaxonomy", "plist"},
-        {"DefaultRules", "plist"},
-        {"DefaultKeywordMapping", "plist"},
-        {"LegacyLoopTaxonomy", "plist"},
-        {"LegacyLoopTaxonomyMapping", "csv"},
-        {"LegacyVorthalTaxonomy", "plist"},
-        {"LegacyVorthalTaxonomyMapping", "csv"},
-        {"PackDisplayNames", "csv"},
-        {"QVSearchKit", "js"},
-        {"ExtractSoftwareInstrumentsRule", "js"}};
     Digest digest;
     digest.add(services);
     digest.add(version());
-    for (const auto& [name, extension] : resources) {
+    for (const auto& [name, extension] : kResourceFiles) {
         const auto path = ResourceBundle::pathForResource(name, extension);
         const auto bytes = path ? readFile(*path) : std::nullopt;
         if (!bytes) continue;
