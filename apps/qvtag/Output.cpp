@@ -69,7 +69,7 @@ std::vector<std::shared_ptr<TGRTTagging>> sortedTaggings(const ObjectSet<TGRTTag
 }
 
 std::string textOfTagging(const TGRTTagging& tagging) {
-    const std::string label = printable(tagging.label());
+    std::string label = printable(tagging.label());
     if (!tagging.level()) return label;
     return fmt::format("{} {}%", label, std::lround(tagging.level()->weight() * 100));
 }

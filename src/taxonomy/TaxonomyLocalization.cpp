@@ -40,7 +40,7 @@ std::string shown(const std::string& text, bool reversed) {
 }
 
 void addTag(Localization& strings, const TGRTTag& tag, bool reversed) {
-    const std::string label = tag.label();
+    const std::string& label = tag.label();
     strings[label] = shown(label, reversed);
     for (std::size_t i = 0; i < tag.valueStepLabels().size(); ++i) {
         strings[fmt::format("{}_{}", label, i)] = shown(tag.valueStepLabels()[i], reversed);
