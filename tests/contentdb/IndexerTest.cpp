@@ -358,18 +358,21 @@ TEST_F(Indexing, StopsWhenToldThoughNothingIsNew) {
 }
 
 TEST_F(Indexing, ReadsAgainWhatAnotherDescriberDescribed) {
-    constexpr std::uint64_t count = 300;
-    for (std::uint64_t i = 0; i < count; ++i) write(fmt::format("slow {}.wav", i), std::to_string(i));
+    constexpr std::uint64_t count = 1000;
+    for (std::uint64_t i = 0; i < count; ++i) write(fmt::format("Kick {}.wav", i), std::to_string(i));
     write("elsewhere/Kick.wav", "");
+    write("Kick 2 fails.wav", "");  // after more than a hundred, before more than the workers' queues hold
     settle();
     index();
     // A database of the first form, which did not keep who described.
     Connection(database(), Connection::Access::readWrite).run("DROP TABLE setting; PRAGMA user_version = 1");
     const auto second = [](IndexOptions& options) { options.describer = 2; };
-    const IndexProgress interrupted = index([](IndexOptions& options) {
+    bool hasFailed = false;
+    const IndexProgress interrupted = index([&](IndexOptions& options) {
         options.describer = 2;
         options.longestBatch = std::chrono::milliseconds(0);
-        options.isCancelled = [asked = 0]() mutable { return ++asked > 2; };
+        options.failed = [&](const Error&) { hasFailed = true; };
+        options.isCancelled = [&] { return hasFailed; };
     });
     EXPECT_GT(interrupted.described, 0U);
     EXPECT_LT(interrupted.described, count);
