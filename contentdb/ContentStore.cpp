@@ -1,6 +1,7 @@
 #include "contentdb/ContentStore.h"
 
 #include "contentdb/ItemCodec.h"
+#include "contentdb/Paths.h"
 #include "platform/Text.h"
 
 #include <fmt/format.h>
@@ -14,7 +15,7 @@ constexpr std::string_view kItemColumns =
 
 IndexedItem readItem(const Statement& row, const Connection& connection) {
     IndexedItem item;
-    item.path = std::string(row.bytes(0)) + (row.bytes(0) == "/" ? "" : "/") + std::string(row.bytes(1));
+    item.path = pathIn(row.bytes(0), row.bytes(1));
     item.stamp = {row.unsignedInteger(2), row.integer(3), row.integer(4), row.unsignedInteger(5)};
     item.payloadHash = row.bytes(6);
     if (!decodeDescription(row.bytes(7), item)) {

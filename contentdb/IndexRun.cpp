@@ -1,5 +1,6 @@
 #include "contentdb/IndexRun.h"
 
+#include "contentdb/Paths.h"
 #include "contentdb/Terms.h"
 #include "platform/Object.h"
 #include "platform/Text.h"
@@ -29,10 +30,6 @@ std::int64_t wallNanoseconds() {
     ::clock_gettime(CLOCK_REALTIME, &now);
     constexpr std::int64_t second = 1'000'000'000;
     return now.tv_sec * second + now.tv_nsec;
-}
-
-std::string joined(const std::string& folder, std::string_view name) {
-    return (folder == "/" ? folder : folder + "/") + std::string(name);
 }
 
 }  // namespace
@@ -98,7 +95,7 @@ std::vector<ListedItem> IndexRun::itemsOfPart(const std::string& path,
 }
 
 bool IndexRun::isOfPart(const std::string& path, std::string_view name) const {
-    return options_.parts == 1 || stringHash(joined(path, name)) % options_.parts == options_.part - 1;
+    return options_.parts == 1 || stringHash(pathIn(path, name)) % options_.parts == options_.part - 1;
 }
 
 bool IndexRun::submitChanged(const std::shared_ptr<OpenFolder>& folder, std::int64_t folderId,
@@ -138,7 +135,7 @@ bool IndexRun::submit(const ListedItem& item, ItemId id, const std::shared_ptr<O
     }
     ++folder->remaining;
     pending_[++lastTicket_] = {id != 0 ? id : nextId_++, id == 0, folder};
-    workers_.submit(lastTicket_, joined(folder->path, item.name), item.stamp);
+    workers_.submit(lastTicket_, pathIn(folder->path, item.name), item.stamp);
     return true;
 }
 

@@ -1,6 +1,7 @@
 #include "contentdb/LibraryWalk.h"
 
 #include "contentdb/Digest.h"
+#include "contentdb/Paths.h"
 #include "formats/ContentWalk.h"
 #include "platform/QVContentTaggingTypes.h"
 #include "platform/Text.h"
@@ -162,13 +163,9 @@ class Walk {
         if (!list(path, folders)) return false;
         bool goesOn = true;
         for (const std::string& name : folders) {
-            if (goesOn && depth < kDeepest) goesOn = folder(joined(path, name), depth + 1);
+            if (goesOn && depth < kDeepest) goesOn = folder(pathIn(path, name), depth + 1);
         }
         return goesOn;
-    }
-
-    static std::string joined(const std::string& path, std::string_view name) {
-        return fmt::format("{}/{}", path == "/" ? "" : path, name);
     }
 
     /// Shows the folder's items to the visitor; what lies in it is entered later, when it is closed again.
@@ -208,7 +205,7 @@ class Walk {
         }
         if (S_ISDIR(status.st_mode) && kind != Kind::bundle) {
             if (isLink(folder, name, entry.kind)) {
-                links_.push_back(joined(path, name));
+                links_.push_back(pathIn(path, name));
             } else {
                 folders.emplace_back(name);
             }

@@ -1,6 +1,7 @@
 #include "contentdb/StoreWriter.h"
 
 #include "contentdb/ItemCodec.h"
+#include "contentdb/Paths.h"
 #include "contentdb/Terms.h"
 #include "contentdb/Words.h"
 #include "platform/Text.h"
@@ -97,9 +98,7 @@ std::optional<ItemId> StoreWriter::idOfMoved(const IndexedItem& item) {
     const auto firstGone = [&item](Statement& candidates) {
         std::optional<ItemId> id;
         while (!id && candidates.step()) {
-            const std::string folder(candidates.bytes(1));
-            const std::string path =
-                (folder == "/" ? folder : folder + "/") + std::string(candidates.bytes(2));
+            const std::string path = pathIn(candidates.bytes(1), candidates.bytes(2));
             if (path != item.path && isGone(path)) id = candidates.integer(0);
         }
         candidates.reset();
