@@ -38,7 +38,7 @@ constexpr std::array kMigrations = {
            description BLOB NOT NULL
        );
        CREATE UNIQUE INDEX item_place ON item (folder, file);
-       CREATE INDEX item_payload ON item (payload, inode) WHERE length(payload) > 0;
+       CREATE INDEX item_payload ON item (payload) WHERE length(payload) > 0;
        CREATE INDEX item_failed ON item (id) WHERE failed = 1;
        CREATE TABLE earlier_path (item INTEGER, path BLOB, PRIMARY KEY (item, path)) WITHOUT ROWID;
        -- What items are found by, and for each term and chunk of 65,536 items the items that have it.
@@ -47,7 +47,10 @@ constexpr std::array kMigrations = {
        -- Tags as they are written, and the categories and number fields that a query may name.
        CREATE TABLE tag (term INTEGER PRIMARY KEY, label BLOB NOT NULL, category BLOB NOT NULL);
        CREATE TABLE field (isNumber INTEGER, name BLOB, PRIMARY KEY (isNumber, name)) WITHOUT ROWID;)",
-    "CREATE TABLE setting (name TEXT PRIMARY KEY, value INTEGER NOT NULL) WITHOUT ROWID;"};
+    // Of many copies the one of the same inode is found at once.
+    R"(CREATE TABLE setting (name TEXT PRIMARY KEY, value INTEGER NOT NULL) WITHOUT ROWID;
+       DROP INDEX item_payload;
+       CREATE INDEX item_payload ON item (payload, inode) WHERE length(payload) > 0;)"};
 
 /// The first bytes of the file, or fewer if it is shorter.
 std::string header(const std::string& path) {
