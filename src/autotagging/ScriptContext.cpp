@@ -232,8 +232,9 @@ void ScriptContext::Implementation::defineLog() {
 /// syntax.
 void ScriptContext::Implementation::removePromises() {
     JSGlobalContextSetEvalEnabled(context, false, scriptString("not available to rules").get());
+    // Written over: deleting them takes twice as long.
     for (const char* name : {"Promise", "WebAssembly"})
-        JSObjectDeleteProperty(context, global(), scriptString(name).get(), nullptr);
+        setProperty(context, global(), name, JSValueMakeUndefined(context));
 }
 
 /// Puts every use of a regular expression under the guard: all methods of texts and expressions go through

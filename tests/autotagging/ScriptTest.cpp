@@ -147,7 +147,7 @@ TEST(Script, CannotGoOnAfterItsEnd) {
     } rows[] = {{"async function main() { for (;;) await 1 }", "\"async\" is not available to rules"},
                 {"import('x')", "\"import\" is not available to rules"},
                 {"function f() { return Promise.resolve().then(f) } function main() { f(); return [1] }",
-                 "ReferenceError: Can't find variable: Promise"},
+                 "TypeError: undefined is not an object (evaluating 'Promise.resolve')"},
                 {"function main() { return eval('as' + 'ync function f() { for (;;) await 1 } f()') }",
                  "EvalError: not available to rules"},
                 {"function main() { return new Function('return 1') }", "EvalError: not available to rules"}};
