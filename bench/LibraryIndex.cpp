@@ -153,7 +153,7 @@ void benchIndex(std::size_t count, const std::string& folder) {
     command("sync");
     const auto items = static_cast<double>(count);
     const double bareRead = processorSeconds([&] { readHeaders(library); });
-    bench::printRow("  headers read alone, processor time",
+    bench::printRow(fmt::format("headers of {} files read alone, processor time", count),
                     fmt::format("{:.1f} us each", bareRead * 1e6 / items), "");
     IndexProgress progress;
     double first = 0;
