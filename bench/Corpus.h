@@ -4,18 +4,22 @@
 #include "platform/MidiSequence.h"
 
 #include <algorithm>
+#include <cstdlib>
 #include <filesystem>
 #include <string>
 #include <vector>
 
+#include <fmt/format.h>
+
 namespace qvct::bench {
 
-/// The drum kits and played grooves that the onset programs work with; both empty where the corpus is absent.
+/// The drum kits and played grooves that the onset programs work with.
 struct DrumCorpus {
     std::vector<Kit> kits;
     std::vector<MidiSequence> grooves;
 
-    static DrumCorpus load(const std::string& root) {
+    /// Ends the program where the corpus is absent.
+    static DrumCorpus loadOrExit(const std::string& root) {
         DrumCorpus corpus;
         for (const std::string& folder : entriesOf(root + "/audio/drum-machines")) {
             if (!std::filesystem::is_directory(folder)) continue;
@@ -26,10 +30,11 @@ struct DrumCorpus {
             auto groove = MidiSequence::read(file);
             if (groove && !groove->tracks().empty()) corpus.grooves.push_back(std::move(*groove));
         }
-        return corpus;
+        if (!corpus.kits.empty() && !corpus.grooves.empty()) return corpus;
+        fmt::print(stderr, "no grooves or drum machines below {}\n", root);
+        std::exit(EXIT_FAILURE);
     }
 
-    bool isEmpty() const { return kits.empty() || grooves.empty(); }
     /// The kit that plays a groove.
     const Kit& kitFor(std::size_t groove, const Setting& setting) const {
         return kits[(groove + static_cast<std::size_t>(setting.kitShift)) % kits.size()];

@@ -1,9 +1,8 @@
 // A library of many small files, from its first indexing to searches in it: rates and times, each beside the
 // bare work that it is measured against.
 //
-//   bench_library index FILES [FOLDER]   makes a library in FOLDER, indexes it, indexes it again beside a
-//   bare walk bench_library search ITEMS [FILE]    fills a database, searches it beside SQLite's own text
-//   index
+//   bench_library index FILES [FOLDER]   makes a library in FOLDER, indexes it, and again beside a bare walk
+//   bench_library search ITEMS [FILE]    fills a database, searches it beside SQLite's own text index
 
 #include "Measure.h"
 #include "contentdb/ContentDatabase.h"
@@ -17,7 +16,6 @@
 #include "support/ItemGenerator.h"
 
 #include <algorithm>
-#include <chrono>
 #include <cstdlib>
 #include <filesystem>
 #include <string>
@@ -36,39 +34,9 @@ using namespace qvct;
 using namespace qvct::contentdb;
 namespace fs = std::filesystem;
 
-/// Seconds on the clock: workers, disk and all.
 template <typename Work>
-double seconds(Work work) {
-    const auto start = std::chrono::steady_clock::now();
-    work();
-    return std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
-}
-
-/// Seconds of processor time, of workers that have ended too: what does not depend on who else is busy.
-template <typename Work>
-double processorSeconds(Work work) {
-    const auto now = [] {
-        double sum = 0;
-        for (const int who : {RUSAGE_SELF, RUSAGE_CHILDREN}) {
-            rusage usage{};
-            ::getrusage(who, &usage);
-            for (const timeval& time : {usage.ru_utime, usage.ru_stime})
-                sum += static_cast<double>(time.tv_sec) + static_cast<double>(time.tv_usec) * 1e-6;
-        }
-        return sum;
-    };
-    const double start = now();
-    work();
-    return now() - start;
-}
-
-template <typename Work>
-double median(Work work, std::size_t repetitions = 5) {
-    std::vector<double> times;
-    for (std::size_t i = 0; i < repetitions; ++i) times.push_back(seconds(work));
-    std::nth_element(times.begin(), times.begin() + static_cast<std::ptrdiff_t>(repetitions / 2),
-                     times.end());
-    return times[repetitions / 2];
+double clockMedian(Work work) {
+    return bench::medianSeconds(work, 5, bench::clockTime);
 }
 
 void touch(const std::string& path, std::string_view bytes) {
@@ -152,13 +120,14 @@ void benchIndex(std::size_t count, const std::string& folder) {
     const std::vector<std::string> paths = makeLibrary(library, count);
     command("sync");
     const auto items = static_cast<double>(count);
-    const double bareRead = processorSeconds([&] { readHeaders(library); });
+    const double bareRead = bench::secondsOf([&] { readHeaders(library); }, bench::processorTime);
     bench::printRow(fmt::format("headers of {} files read alone, processor time", count),
                     fmt::format("{:.1f} us each", bareRead * 1e6 / items), "");
     IndexProgress progress;
     double first = 0;
     const double ofProcessor =
-        processorSeconds([&] { first = seconds([&] { progress = index(library, database); }); });
+        bench::secondsOf([&] { first = bench::secondsOf([&] { progress = index(library, database); }); },
+                         bench::processorTime);
     bench::printRow(
         fmt::format("{} files indexed ({} processors)", progress.described, ::sysconf(_SC_NPROCESSORS_ONLN)),
         fmt::format("{:.1f} s, {:.0f}/s", first, items / first), "15,000/s on 2");
@@ -167,10 +136,10 @@ void benchIndex(std::size_t count, const std::string& folder) {
         fmt::format("{:.1f} us each; {:.0f}/s", ofProcessor * 1e6 / items, 2 * items / ofProcessor),
         "15,000/s on 2");
     touch(folder + "/mark", {});
-    const double bare = median([&] {
+    const double bare = clockMedian([&] {
         bench::keep(command(fmt::format("find '{}' -newer '{}' > /dev/null", library, folder + "/mark")));
     });
-    const double again = median([&] { progress = index(library, database); });
+    const double again = clockMedian([&] { progress = index(library, database); });
     bench::printRow("  walk with a look at every file (find -newer)", fmt::format("{:.3f} s", bare), "");
     bench::printRow(fmt::format("  indexed again, {} read", progress.described),
                     fmt::format("{:.3f} s", again), "");
@@ -178,7 +147,7 @@ void benchIndex(std::size_t count, const std::string& folder) {
     test::ItemGenerator generator(2);
     for (const std::string& path : paths) touch(path, sound(generator));
     ::usleep(50000);
-    const double changed = seconds([&] { progress = index(library, database); });
+    const double changed = bench::secondsOf([&] { progress = index(library, database); });
     bench::printRow(fmt::format("  {} changes", progress.described),
                     fmt::format("{:.2f} s more, {:.2f} ms each", changed - again,
                                 (changed - again) * 1e3 / static_cast<double>(paths.size())),
@@ -280,7 +249,7 @@ void printTimes(std::string_view what, const std::vector<Wanted>& wanted, std::s
     std::size_t full = 0;
     for (const Wanted& one : wanted) {
         std::size_t found = 0;
-        times.push_back(seconds([&] { found = run(one); }) * 1e3);
+        times.push_back(bench::secondsOf([&] { found = run(one); }) * 1e3);
         if (found == 50) ++full;
     }
     std::sort(times.begin(), times.end());
@@ -291,7 +260,7 @@ void printTimes(std::string_view what, const std::vector<Wanted>& wanted, std::s
 }
 
 void benchSearch(std::size_t count, const std::string& path) {
-    const double filling = seconds([&] { fill(path, count); });
+    const double filling = bench::secondsOf([&] { fill(path, count); });
     bench::printRow(fmt::format("{} items stored by one process", count),
                     fmt::format("{:.0f} s, {:.0f}/s", filling, static_cast<double>(count) / filling), "");
     const auto database = ContentDatabase::open(path);

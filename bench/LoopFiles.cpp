@@ -1,13 +1,12 @@
 // Speed of the loop-file library beside its baselines in the same run: reading the metadata of real WAV and
 // AIFF files beside TagLib's open with properties, and writing a tag beside a copy of the file.
 //
-//   loopfile_bench [folder of sounds] [folder to write in]
+//   bench_loop_files [folder of sounds] [folder to write in]
 #include "Measure.h"
 #include "platform/LCFileParser.h"
 #include "platform/LCFileWriter.h"
 
 #include <algorithm>
-#include <chrono>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
@@ -28,25 +27,14 @@ namespace {
 using namespace qvct;
 namespace fs = std::filesystem;
 
-double seconds(const std::function<void()>& work) {
-    const auto start = std::chrono::steady_clock::now();
-    work();
-    return std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
-}
-
-double median(std::vector<double> values) {
-    std::sort(values.begin(), values.end());
-    return values[values.size() / 2];
-}
-
 /// Medians of several works, run in turn so that the machine's moods meet all of them alike.
 std::vector<double> medians(int rounds, const std::vector<std::function<void()>>& works) {
     std::vector<std::vector<double>> times(works.size());
     for (int round = 0; round < rounds; ++round) {
-        for (std::size_t i = 0; i < works.size(); ++i) times[i].push_back(seconds(works[i]));
+        for (std::size_t i = 0; i < works.size(); ++i) times[i].push_back(bench::secondsOf(works[i]));
     }
     std::vector<double> result;
-    for (auto& each : times) result.push_back(median(std::move(each)));
+    for (auto& each : times) result.push_back(bench::medianOf(std::move(each)));
     return result;
 }
 

@@ -12,7 +12,6 @@
 #include <cstdlib>
 
 #include <fmt/format.h>
-#include <unistd.h>
 
 namespace qvct::bench {
 namespace {
@@ -76,13 +75,7 @@ void measure(const DrumCorpus& corpus, const Setting& setting, double seconds, c
 int main(int count, char** arguments) {
     using namespace qvct::bench;
     const double seconds = count > 1 ? std::atof(arguments[1]) : 30;
-    const DrumCorpus corpus = DrumCorpus::load(QVCT_CORPUS);
-    if (corpus.isEmpty() || seconds <= 0) {
-        fmt::print(stderr, "no grooves or drum machines below {}\n", QVCT_CORPUS);
-        return 1;
-    }
-    char wav[] = "/tmp/qvct-onsets-XXXXXX";
-    ::close(::mkstemp(wav));
-    for (const Setting& setting : kSettings) measure(corpus, setting, seconds, wav);
-    ::unlink(wav);
+    const DrumCorpus corpus = DrumCorpus::loadOrExit(QVCT_CORPUS);
+    const TemporaryFile wav;
+    for (const Setting& setting : kSettings) measure(corpus, setting, seconds, wav.path());
 }

@@ -10,20 +10,9 @@
 #include <cstdlib>
 
 #include <fmt/format.h>
-#include <sys/resource.h>
-#include <unistd.h>
 
 namespace qvct::bench {
 namespace {
-
-double processorSeconds(int who) {
-    rusage usage{};
-    ::getrusage(who, &usage);
-    const auto seconds = [](const timeval& time) {
-        return double(time.tv_sec) + double(time.tv_usec) * 1e-6;
-    };
-    return seconds(usage.ru_utime) + seconds(usage.ru_stime);
-}
 
 std::vector<float> stereoGrooves(const DrumCorpus& corpus, double minutes) {
     const Setting plain{"dry", 1, 0, 0, false, 0};
@@ -51,36 +40,30 @@ void report(const char* name, double audio, double processor, std::size_t onsets
 int main(int count, char** arguments) {
     using namespace qvct::bench;
     const double minutes = count > 1 ? std::atof(arguments[1]) : 10;
-    const DrumCorpus corpus = DrumCorpus::load(QVCT_CORPUS);
-    if (corpus.isEmpty() || minutes <= 0) {
-        fmt::print(stderr, "no grooves or drum machines below {}\n", QVCT_CORPUS);
-        return 1;
-    }
-    char wav[] = "/tmp/qvct-onsets-XXXXXX";
-    ::close(::mkstemp(wav));
-    writeWav(wav, stereoGrooves(corpus, minutes), kRate, 2);
+    const DrumCorpus corpus = DrumCorpus::loadOrExit(QVCT_CORPUS);
+    const TemporaryFile wav;
+    writeWav(wav.path(), stereoGrooves(corpus, minutes), kRate, 2);
 
     double ours = 1e300;  // the best of three, as other programs share the machine
     for (int round = 0; round < 3; ++round) {
-        const double start = processorSeconds(RUSAGE_SELF);
-        const auto decoder = qvct::AudioDecoder::open(std::string(wav));
+        const double start = processorTime();
+        const auto decoder = qvct::AudioDecoder::open(wav.path());
         const auto onsets = qvct::OnsetDetector::detect(*decoder);
-        ours = std::min(ours, processorSeconds(RUSAGE_SELF) - start);
+        ours = std::min(ours, processorTime() - start);
         if (round == 2) report("us", minutes * 60, ours, onsets.size(), "1,250 times");
     }
     double theirs = 1e300;
     for (int round = 0; round < 3; ++round) {
-        const double start = processorSeconds(RUSAGE_CHILDREN);
-        const auto onsets = aubioOnsets(wav);
+        const double start = processorTime();
+        const auto onsets = aubioOnsets(wav.path());
         if (!onsets) {
             fmt::print("aubioonset is not installed\n");
             break;
         }
-        theirs = std::min(theirs, processorSeconds(RUSAGE_CHILDREN) - start);
+        theirs = std::min(theirs, processorTime() - start);
         if (round == 2) {
             report("aubioonset", minutes * 60, theirs, onsets->size(), "");
             printRow("  ratio", fmt::format("{:.2f}", theirs / ours), "at least 5");
         }
     }
-    ::unlink(wav);
 }

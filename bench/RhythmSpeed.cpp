@@ -6,7 +6,6 @@
 #include "analysis/QVCTMidiAnalysis.h"
 #include "platform/FileAccess.h"
 
-#include <chrono>
 #include <random>
 
 #include <fmt/format.h>
@@ -14,17 +13,13 @@
 namespace qvct::bench {
 namespace {
 
-double secondsSince(std::chrono::steady_clock::time_point start) {
-    return std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
-}
-
 // Four bars of a groove, as a loop of a library has them.
 double secondsForLoop(const std::vector<std::uint8_t>& bytes, std::size_t& notes) {
     constexpr int kBeats = 16;
     constexpr int kRounds = 20;
     double best = 1e300;
     for (int round = 0; round < kRounds; ++round) {
-        const auto start = std::chrono::steady_clock::now();
+        const double start = clockTime();
         const auto sequence = MidiSequence::parse(bytes);
         const auto analysis = QVCTMidiAnalysis::initWithTempo(120, kBeats, 4, 4);
         for (const MidiNote& note : sequence->tracks()[0].notes) {
@@ -33,7 +28,7 @@ double secondsForLoop(const std::vector<std::uint8_t>& bytes, std::size_t& notes
         notes = analysis->notes().size();
         volatile float level = analysis->computeRhythmicComplexity() + analysis->computeRhythmicDensity();
         static_cast<void>(level);
-        best = std::min(best, secondsSince(start));
+        best = std::min(best, clockTime() - start);
     }
     return best;
 }
@@ -62,11 +57,11 @@ void measureClustering() {
         std::uniform_real_distribution<double> time(0, beats);
         std::vector<Note> notes;
         for (int i = 0; i < 10000; ++i) notes.push_back({time(random), 0, 60, 100});
-        const auto start = std::chrono::steady_clock::now();
+        const double start = clockTime();
         AgglomerativeClustering clustering(notes);
         clustering.setThreshold(0.125);
         clustering.runAnalysis(AgglomerativeClustering::kStartInThreshold);
-        const double seconds = secondsSince(start);
+        const double seconds = clockTime() - start;
         printRow(
             fmt::format("10,000 notes over {:.0f} beats in {} clusters", beats, clustering.clusters().size()),
             fmt::format("{:.2f} ms", seconds * 1e3), "under 50 ms");

@@ -3,11 +3,27 @@
 #include <algorithm>
 #include <cmath>
 #include <cstdint>
+#include <cstdlib>
 #include <fstream>
 #include <span>
 #include <string>
 
+#include <unistd.h>
+
 namespace qvct::bench {
+
+/// An empty file of its own, gone with this object.
+class TemporaryFile {
+  public:
+    TemporaryFile() { ::close(::mkstemp(path_.data())); }
+    TemporaryFile(const TemporaryFile&) = delete;
+    TemporaryFile& operator=(const TemporaryFile&) = delete;
+    ~TemporaryFile() { ::unlink(path_.c_str()); }
+    const std::string& path() const { return path_; }
+
+  private:
+    std::string path_ = "/tmp/qvct-bench-XXXXXX";
+};
 
 /// Writes 16-bit samples in [-1, 1], interleaved.
 inline void writeWav(const std::string& path, std::span<const float> samples, std::uint32_t rate,
