@@ -27,11 +27,15 @@ namespace {
 using namespace qvct;
 namespace fs = std::filesystem;
 
-/// Medians of several works, run in turn so that the machine's moods meet all of them alike.
+/// Medians of several works, run in turn so that the machine's moods meet all of them alike. None begins
+/// while what an earlier one wrote is still on its way to the disk.
 std::vector<double> medians(int rounds, const std::vector<std::function<void()>>& works) {
     std::vector<std::vector<double>> times(works.size());
     for (int round = 0; round < rounds; ++round) {
-        for (std::size_t i = 0; i < works.size(); ++i) times[i].push_back(bench::secondsOf(works[i]));
+        for (std::size_t i = 0; i < works.size(); ++i) {
+            ::sync();
+            times[i].push_back(bench::secondsOf(works[i]));
+        }
     }
     std::vector<double> result;
     for (auto& each : times) result.push_back(bench::medianOf(std::move(each)));
