@@ -50,68 +50,119 @@ std::string textOf(const PropertyList& number) {
     return fmt::format("{}", number.doubleValue().value_or(0));
 }
 
+std::optional<PropertyList> flagOf(std::string_view text) {
+    if (text != kTrue && text != kFalse) return std::nullopt;
+    return PropertyList(text == kTrue);
+}
+
+/// What the items of a section say, and which of them say it: the others make no sense where they stand, and
+/// stay there.
+template <typename Value>
+struct Reading {
+    Value value;
+    std::vector<bool> isRead;
+};
+
 /// Category → entries, as a tagging dictionary has them.
-PropertyList::Dictionary taggingDictionary(const PresetText& preset) {
+Reading<PropertyList::Dictionary> readTaggings(const PresetText& preset) {
+    Reading<PropertyList::Dictionary> reading;
     std::vector<std::pair<std::string, PropertyList::Array>> categories;
     std::unordered_map<std::string, std::size_t> places;
     PropertyList::Array* current = nullptr;
     for (auto& [key, value] : preset.items(kTagging)) {
+        const bool isOfTag = current != nullptr && !current->empty();
+        std::optional<PropertyList> number;
+        bool isRead = true;
         if (key == kCategory) {
             const auto [place, isNew] = places.try_emplace(value, categories.size());
             if (isNew) categories.emplace_back(value, PropertyList::Array{});
             current = &categories[place->second].second;
         } else if (current != nullptr && key == QVContentTaggingLabelKeyName) {
             current->emplace_back(PropertyList::Dictionary{{key, std::move(value)}});
-        } else if (current != nullptr && !current->empty() && key == QVContentTaggingWeightKeyName) {
-            if (auto weight = numberOf(value)) current->back().dictionary()->set(key, std::move(*weight));
-        } else if (current != nullptr && !current->empty() && key == QVContentTaggingAutoTaggingKeyName) {
-            current->back().dictionary()->set(key, value == kTrue);
+        } else if (isOfTag && key == QVContentTaggingWeightKeyName && (number = numberOf(value))) {
+            current->back().dictionary()->set(key, std::move(*number));
+        } else if (isOfTag && key == QVContentTaggingAutoTaggingKeyName && (number = flagOf(value))) {
+            current->back().dictionary()->set(key, std::move(*number));
+        } else {
+            isRead = false;
         }
+        reading.isRead.push_back(isRead);
     }
-    PropertyList::Dictionary dictionary;
-    for (auto& [category, entries] : categories) dictionary.append(category, std::move(entries));
-    return dictionary;
+    for (auto& [category, entries] : categories) reading.value.append(category, std::move(entries));
+    return reading;
 }
 
-PropertyList::Dictionary contentInfoDictionary(const PresetText& preset) {
-    PropertyList::Array applications;
+Reading<PropertyList::Array> readApplications(const PresetText& preset) {
+    Reading<PropertyList::Array> reading;
     for (auto& [key, value] : preset.items(kApplicationInfo)) {
+        const bool isOfApplication = !reading.value.empty();
+        std::optional<PropertyList> flag;
+        bool isRead = true;
         if (key == QVContentInfoAppIdentifierKey) {
-            applications.emplace_back(PropertyList::Dictionary{{key, std::move(value)}});
-        } else if (!applications.empty() && key == QVContentInfoMinimumVersionKey) {
-            applications.back().dictionary()->set(key, std::move(value));
-        } else if (!applications.empty() && key == QVContentInfoLegacyKey) {
-            applications.back().dictionary()->set(key, value == kTrue);
+            reading.value.emplace_back(PropertyList::Dictionary{{key, std::move(value)}});
+        } else if (isOfApplication && key == QVContentInfoMinimumVersionKey) {
+            reading.value.back().dictionary()->set(key, std::move(value));
+        } else if (isOfApplication && key == QVContentInfoLegacyKey && (flag = flagOf(value))) {
+            reading.value.back().dictionary()->set(key, std::move(*flag));
+        } else {
+            isRead = false;
         }
+        reading.isRead.push_back(isRead);
     }
-    PropertyList::Array paths;
-    for (auto& [key, value] : preset.items(kAssetDependencies)) {
-        if (key == kPath) paths.emplace_back(std::move(value));
-    }
-    return {{std::string(QVContentInfoApplicationInfosKey), std::move(applications)},
-            {std::string(QVContentInfoDependenciesKey), std::move(paths)}};
+    return reading;
 }
 
-/// Display name, sub type and key values.
-void readDescription(const PresetText& preset, TGRTMetaData& record) {
-    ObjectSet<TGRTKeyValue> keyValues;
-    std::string currentKey;
-    for (auto& [key, value] : preset.items(kMetaData)) {
-        if (key == QVContentTaggingDisplayKeyName) {
-            record.setDisplayName(std::move(value));
-        } else if (key == QVContentTaggingSubTypeKeyName) {
-            const auto number = numberOf(value);
-            record.setSubFileType(number ? number->integerValue().value_or(0) : 0);
-        } else if (key == kKey) {
-            currentKey = std::move(value);
-        } else if (key == kText) {
-            keyValues.insert(TGRTKeyValue::initWithKeyStringValue(currentKey, std::move(value)));
-        } else if (key == kNumber) {
-            if (auto number = numberOf(value))
-                keyValues.insert(TGRTKeyValue::initWithKeyNumberValue(currentKey, std::move(*number)));
-        }
+Reading<PropertyList::Array> readDependencies(const PresetText& preset) {
+    Reading<PropertyList::Array> reading;
+    for (auto& [key, value] : preset.items(kAssetDependencies)) {
+        reading.isRead.push_back(key == kPath);
+        if (key == kPath) reading.value.emplace_back(std::move(value));
     }
-    record.setKeyValues(std::move(keyValues));
+    return reading;
+}
+
+struct Description {
+    std::optional<std::string> displayName;
+    std::int64_t subType = 0;
+    ObjectSet<TGRTKeyValue> keyValues;
+};
+
+Reading<Description> readDescription(const PresetText& preset) {
+    Reading<Description> reading;
+    std::optional<std::string> current;
+    std::size_t keyAt = 0;  // its item counts as read when a value of it was, and none was not
+    bool hasStrangeValue = false;
+    for (auto& [key, value] : preset.items(kMetaData)) {
+        std::optional<PropertyList> number;
+        bool isRead = true;
+        bool isValue = false;
+        if (key == QVContentTaggingDisplayKeyName) {
+            reading.value.displayName = std::move(value);
+        } else if (key == QVContentTaggingSubTypeKeyName && (number = numberOf(value))) {
+            reading.value.subType = number->integerValue().value_or(0);
+        } else if (current && key == kText) {
+            isValue = true;
+            reading.value.keyValues.insert(TGRTKeyValue::initWithKeyStringValue(*current, std::move(value)));
+        } else if (current && key == kNumber && (number = numberOf(value))) {
+            isValue = true;
+            reading.value.keyValues.insert(
+                TGRTKeyValue::initWithKeyNumberValue(*current, std::move(*number)));
+        } else {
+            isRead = false;
+        }
+        if (key == kKey) {
+            current = std::move(value);
+            keyAt = reading.isRead.size();
+            hasStrangeValue = false;
+        } else if (current && key == kNumber && !isRead) {
+            hasStrangeValue = true;
+            reading.isRead[keyAt] = false;
+        } else if (isValue && !hasStrangeValue) {
+            reading.isRead[keyAt] = true;
+        }
+        reading.isRead.push_back(isRead);
+    }
+    return reading;
 }
 
 void addItem(PresetText::Items& items, std::string_view key, std::string value) {
@@ -122,11 +173,16 @@ void addItem(PresetText::Items& items, std::string_view key, std::string value) 
 
 std::shared_ptr<TGRTMetaData> recordOfPreset(const PresetText& preset, TGRTTaxonomy& taxonomy) {
     auto record = TGRTMetaData::init();
-    readDescription(preset, *record);
+    Description description = readDescription(preset).value;
+    record->setDisplayName(std::move(description.displayName));
+    record->setSubFileType(description.subType);
+    record->setKeyValues(std::move(description.keyValues));
     record->setFileType(kFileTypeSynthPreset);
-    const PropertyList taggings(taggingDictionary(preset));
+    const PropertyList taggings(readTaggings(preset).value);
     record->setTaggings(TGRTTagging::taggingsWithTaggingDictionary(&taggings, taxonomy));
-    const PropertyList contentInfo(contentInfoDictionary(preset));
+    const PropertyList contentInfo(PropertyList::Dictionary{
+        {std::string(QVContentInfoApplicationInfosKey), readApplications(preset).value},
+        {std::string(QVContentInfoDependenciesKey), readDependencies(preset).value}});
     record->setContentInfo(TGRTContentInfo::initWithDictionary(&contentInfo));
     return record;
 }
@@ -144,8 +200,11 @@ void setTaggings(PresetText& preset, const ObjectSet<TGRTTagging>& taggings) {
     preset.setItems(kTagging,
                     {kCategory, QVContentTaggingLabelKeyName, QVContentTaggingWeightKeyName,
                      QVContentTaggingAutoTaggingKeyName},
-                    items);
-    preset.setItems(kMetaData, {QVContentTaggingUUIDKeyName}, {});
+                    readTaggings(preset).isRead, items);
+    std::vector<bool> isUuid;
+    for (const auto& item : preset.items(kMetaData))
+        isUuid.push_back(item.key == QVContentTaggingUUIDKeyName);
+    preset.setItems(kMetaData, {}, isUuid, {});
 }
 
 void setContentInfo(PresetText& preset, const TGRTContentInfo& contentInfo) {
@@ -161,17 +220,20 @@ void setContentInfo(PresetText& preset, const TGRTContentInfo& contentInfo) {
     for (const std::string& path : contentInfo.assetDependencyPaths()) addItem(paths, kPath, path);
     preset.setItems(kApplicationInfo,
                     {QVContentInfoAppIdentifierKey, QVContentInfoMinimumVersionKey, QVContentInfoLegacyKey},
-                    applications);
-    preset.setItems(kAssetDependencies, {kPath}, paths);
+                    readApplications(preset).isRead, applications);
+    preset.setItems(kAssetDependencies, {kPath}, readDependencies(preset).isRead, paths);
 }
 
 void setDescription(PresetText& preset, const TGRTMetaData& record) {
     PresetText::Items items;
-    std::vector<std::string_view> owned = {QVContentTaggingDisplayKeyName, kKey, kText, kNumber};
+    std::vector<bool> isReplaced = readDescription(preset).isRead;
     if (record.displayName()) addItem(items, QVContentTaggingDisplayKeyName, *record.displayName());
     if (record.subFileType() != 0) {
-        owned.push_back(QVContentTaggingSubTypeKeyName);
         addItem(items, QVContentTaggingSubTypeKeyName, fmt::format("{}", record.subFileType()));
+    } else {
+        const PresetText::Items present = preset.items(kMetaData);
+        for (std::size_t i = 0; i < present.size(); ++i)
+            if (present[i].key == QVContentTaggingSubTypeKeyName) isReplaced[i] = false;
     }
     for (const auto& keyValue : record.keyValues()) {
         addItem(items, kKey, keyValue->key());
@@ -181,7 +243,7 @@ void setDescription(PresetText& preset, const TGRTMetaData& record) {
             addItem(items, kNumber, textOf(*keyValue->numberValue()));
         }
     }
-    preset.setItems(kMetaData, owned, items);
+    preset.setItems(kMetaData, {kKey, kText, kNumber}, isReplaced, items);
 }
 
 std::string textWithoutRecord(const PresetText& preset) {

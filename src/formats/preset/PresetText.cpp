@@ -141,18 +141,21 @@ std::string PresetText::lineOf(const Item& item) const {
     return escaped(item.key) + std::string(kSeparator) + escaped(item.value) + lineEnd_;
 }
 
-void PresetText::setItems(std::string_view section, const std::vector<std::string_view>& owned,
-                          const Items& replacement) {
+void PresetText::setItems(std::string_view section, const std::vector<std::string_view>& keys,
+                          const std::vector<bool>& isReplaced, const Items& replacement) {
     std::vector<Line> lines;
+    std::size_t index = 0;
     std::optional<std::size_t> place;
     std::optional<std::size_t> end;  // of the section's first occurrence
     for (Line& line : lines_) {
         const bool isInside = line.section == section;
         if (isInside && line.role == Line::closing && !end) end = lines.size();
         const auto item = isInside && line.role == Line::inside ? itemOfLine(line.bytes) : std::nullopt;
-        const bool isOwned = item && std::find(owned.begin(), owned.end(), item->key) != owned.end();
-        if (isOwned && !place) place = lines.size();
-        if (!isOwned) lines.push_back(std::move(line));
+        const bool isGone = item && isReplaced[index++];
+        if (isGone && !place) place = lines.size();
+        if (isGone) continue;
+        lines.push_back(std::move(line));
+        if (item && std::find(keys.begin(), keys.end(), item->key) != keys.end()) place = lines.size();
     }
     lines_ = std::move(lines);
     if (!place) place = end;

@@ -39,11 +39,12 @@ class PresetText {
     };
     std::vector<Section> sections() const;
 
-    /// Replaces those items of a section whose keys are `owned` by `replacement`, which takes the place of
-    /// the first of them, or follows the section's last line. A section that is not there is added at the
-    /// end, unless there is nothing to put into it.
-    void setItems(std::string_view section, const std::vector<std::string_view>& owned,
-                  const Items& replacement);
+    /// Replaces the items of a section that are marked (`isReplaced` has one entry for each of `items`) by
+    /// `replacement`, which takes the place of the first of them, or follows the section's last line; but it
+    /// follows all other items that have one of the `keys`, lest these be read as parts of it. A section that
+    /// is not there is added at the end, unless there is nothing to put into it.
+    void setItems(std::string_view section, const std::vector<std::string_view>& keys,
+                  const std::vector<bool>& isReplaced, const Items& replacement);
 
     /// The line of the first section that is not closed; such a text cannot be rewritten with certainty.
     std::optional<std::size_t> firstUnclosedSection() const { return firstUnclosed_; }

@@ -79,6 +79,36 @@ TEST(Presets, ChangeTheirOwnLinesOnly) {
                 HasSubstr("<applicationinfo>\n</applicationinfo>\n<assetdependencies>\n</"));
 }
 
+TEST(Presets, KeepLinesThatMakeNoSenseWhereTheyStand) {
+    const TemporaryFolder folder;
+    struct {
+        std::string before;
+        std::string after;
+    } const cases[] = {
+        {"<tagging>\nName = Orphan\nCategory = A\nName = B\nWeight = abc\nAutoTagging = yes\n</tagging>\n",
+         "<tagging>\nName = Orphan\nWeight = abc\nAutoTagging = yes\nCategory = A\nName = B\n</tagging>\n"},
+        {"<tagging>\nCategory = Genres\nName = House\nCategory = Source\nWeight = 0.5\n</tagging>\n",
+         "<tagging>\nWeight = 0.5\nCategory = Genres\nName = House\n</tagging>\n"},
+        {"<metadata>\nText = orphan\nKey = Tempo\nNumber = 120,5\nText = fast\nKey = Empty\nKey = Key\n"
+         "Number = 1e999\nKey = Beats\nNumber = 8\n</metadata>\n",
+         "<metadata>\nText = orphan\nKey = Tempo\nNumber = 120,5\nKey = Empty\nKey = Key\n"
+         "Number = 1e999\nKey = Tempo\nText = fast\nKey = Beats\nNumber = 8\n</metadata>\n"},
+        {"<applicationinfo>\nMinimumVersion = 3\nAppIdentifier = org.a\nLegacy = 1\n</applicationinfo>\n",
+         "<applicationinfo>\nMinimumVersion = 3\nLegacy = 1\nAppIdentifier = org.a\n</applicationinfo>\n"},
+    };
+    for (const auto& c : cases) {
+        const std::string path = folder.write("a.vcp", c.before);
+        const auto record = read(path);
+        ASSERT_TRUE(TGRTVorthalPresetMetaDataWriter().writeMetaData(record, urlOf(path)));
+        EXPECT_EQ(readTextFile(path), c.after);
+        const auto again = read(path);
+        EXPECT_EQ(again->taggings(), record->taggings());
+        EXPECT_EQ(again->keyValues(), record->keyValues());
+        ASSERT_TRUE(TGRTVorthalPresetMetaDataWriter().writeMetaData(again, urlOf(path)));
+        EXPECT_EQ(readTextFile(path), c.after) << "a second write changes nothing";
+    }
+}
+
 TEST(Presets, KeepEveryTextThatARecordHolds) {
     const TemporaryFolder folder;
     const std::string awkward = "a = b\\n \\= \r\n</tagging>\nAttribs = 4001 \xe2\x99\xab ";
