@@ -7,6 +7,7 @@
 #include "platform/Text.h"
 
 #include <string>
+#include <unordered_map>
 #include <utility>
 
 #include <fmt/format.h>
@@ -74,22 +75,36 @@ JSValueRef property(JSContextRef context, JSObjectRef object, std::string_view n
     return JSObjectGetProperty(context, object, scriptString(name).get(), exception);
 }
 
-bool isPartOfWord(char c) {
-    return (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9') || c == '_' || c == '$';
+/// Writes the first letter of a word as an escape, wherever the word stands: in texts, expressions and names
+/// it stays the same, but no keyword may be written so. What follows a backslash is no keyword anyway.
+std::string withoutKeyword(std::string text, std::string_view word) {
+    const std::string escape = fmt::format("\\u{:04x}", static_cast<unsigned char>(word.front()));
+    for (std::size_t at = text.find(word); at != std::string::npos; at = text.find(word, at + 1)) {
+        if (at > 0 && text[at - 1] == '\\') continue;
+        text.replace(at, 1, escape);
+        at += escape.size();
+    }
+    return text;
 }
 
-/// The first of the words that stands in the text, not as a part of a longer one.
-std::optional<std::string_view> firstWordOf(std::initializer_list<std::string_view> words,
-                                            std::string_view text) {
-    for (const std::string_view word : words) {
-        for (std::size_t at = text.find(word); at != std::string_view::npos; at = text.find(word, at + 1)) {
-            const std::size_t end = at + word.size();
-            const bool isWhole =
-                (at == 0 || !isPartOfWord(text[at - 1])) && (end == text.size() || !isPartOfWord(text[end]));
-            if (isWhole) return word;
-        }
-    }
-    return std::nullopt;
+/// A rule's text as the engine gets it: "async" and "import", which would go on after the script's end, are
+/// keywords no more. Kept for this thread, since the same rules are evaluated for each item.
+const ScriptString& prepared(std::string_view script) {
+    constexpr std::size_t mostKept = 64;
+    thread_local std::unordered_map<std::string, ScriptString> kept;
+    std::string key(script);
+    if (const auto hit = kept.find(key); hit != kept.end()) return hit->second;
+    if (kept.size() >= mostKept) kept.clear();
+    const std::string text = withoutKeyword(withoutKeyword(key, "async"), "import");
+    return kept.emplace(std::move(key), scriptString(text)).first->second;
+}
+
+/// The engine's words, and why it does not know what every other engine does.
+std::string withReason(std::string problem, std::string_view script) {
+    const bool mayMissKeyword =
+        problem.starts_with("SyntaxError") &&
+        (script.find("async") != std::string_view::npos || script.find("import") != std::string_view::npos);
+    return mayMissKeyword ? problem + " (\"async\" and \"import\" are not available to rules)" : problem;
 }
 
 }  // namespace
@@ -128,8 +143,9 @@ struct ScriptContext::Implementation {
 
     JSObjectRef global() const { return JSContextGetGlobalObject(context); }
 
-    void logException(JSValueRef thrown) {
-        if (stop == Stop::none && thrown != nullptr) logProblem(textOf(context, thrown, nullptr));
+    void logException(JSValueRef thrown, std::string_view script = {}) {
+        if (stop == Stop::none && thrown != nullptr)
+            logProblem(withReason(textOf(context, thrown, nullptr), script));
         if (stop != Stop::none) logStop();
     }
 
@@ -228,7 +244,7 @@ void ScriptContext::Implementation::defineLog() {
 }
 
 /// Promises are settled when the script has ended, each in a call of its own, so that no limit of time ever
-/// stops them. Rules have nothing to wait for: what makes promises is taken away, and `evaluate` refuses the
+/// stops them. Rules have nothing to wait for: what makes promises is taken away, and `prepared` takes the
 /// syntax.
 void ScriptContext::Implementation::removePromises() {
     JSGlobalContextSetEvalEnabled(context, false, scriptString("not available to rules").get());
@@ -336,15 +352,10 @@ void ScriptContext::exposeDocument(const QVCTXMLDocument& document) {
 
 bool ScriptContext::evaluate(std::string_view script) {
     Implementation& self = *implementation_;
-    if (const auto word = firstWordOf({"async", "import"}, script)) {
-        Implementation::logProblem(fmt::format("\"{}\" is not available to rules", *word));
-        return false;
-    }
-    const ScriptString text = scriptString(script);
     JSValueRef exception = nullptr;
     const bool ran = self.run([&] {
-        JSEvaluateScript(self.context, text.get(), nullptr, nullptr, 1, &exception);
-        if (exception != nullptr) self.logException(exception);
+        JSEvaluateScript(self.context, prepared(script).get(), nullptr, nullptr, 1, &exception);
+        if (exception != nullptr) self.logException(exception, script);
     });
     return ran && exception == nullptr;
 }
@@ -380,12 +391,12 @@ bool ScriptContext::checkSyntax(std::string_view script, Error* error) {
     const auto context = make({});
     const JSGlobalContextRef reference = context->implementation_->context;
     JSValueRef exception = nullptr;
-    if (JSCheckScriptSyntax(reference, scriptString(script).get(), nullptr, 1, &exception)) return true;
+    if (JSCheckScriptSyntax(reference, prepared(script).get(), nullptr, 1, &exception)) return true;
     const JSValueRef line =
         property(reference, JSValueToObject(reference, exception, nullptr), "line", nullptr);
     return fail(error, kErrorMalformed,
                 fmt::format("script, line {}: {}", textOf(reference, line, nullptr),
-                            textOf(reference, exception, nullptr)));
+                            withReason(textOf(reference, exception, nullptr), script)));
 }
 
 }  // namespace qvct

@@ -144,19 +144,34 @@ TEST(Script, CannotGoOnAfterItsEnd) {
     const struct {
         const char* script;
         const char* message;
-    } rows[] = {{"async function main() { for (;;) await 1 }", "\"async\" is not available to rules"},
-                {"import('x')", "\"import\" is not available to rules"},
-                {"function f() { return Promise.resolve().then(f) } function main() { f(); return [1] }",
-                 "TypeError: undefined is not an object (evaluating 'Promise.resolve')"},
-                {"function main() { return eval('as' + 'ync function f() { for (;;) await 1 } f()') }",
-                 "EvalError: not available to rules"},
-                {"function main() { return new Function('return 1') }", "EvalError: not available to rules"}};
+    } rows[] = {
+        {"async function main() { for (;;) await 1 }", "\"async\" and \"import\" are not available"},
+        {"async  function main() {}", "are not available"},
+        {"function main() { (async () => { for (;;) await 1 })(); return [1] }", "are not available"},
+        {"function main() { (async x => { for (;;) await 1 })(); return [1] }", "are not available"},
+        {"function main() { ({async f() { for (;;) await 1 }}).f(); return [1] }", "are not available"},
+        {"class A { async f() {} } function main() { return [1] }", "are not available"},
+        {"class A { static async *f() {} } function main() { return [1] }", "are not available"},
+        {"import('x')", "are not available"},
+        {"function main() { return [`${import('x')}`] }", "are not available"},
+        {"/'/; async function f() {} /'/; function main() { return [1] }", "are not available"},
+        {"\\u0061sync function main() { return [1] }", "SyntaxError"},
+        {"function f() { return Promise.resolve().then(f) } function main() { f(); return [1] }",
+         "TypeError: undefined is not an object (evaluating 'Promise.resolve')"},
+        {"function main() { return eval('as' + 'ync function f() { for (;;) await 1 } f()') }",
+         "EvalError: not available to rules"},
+        {"function main() { return new Function('return 1') }", "EvalError: not available to rules"}};
     for (const auto& row : rows) {
         const test::CapturedLog log;
         EXPECT_EQ(resultOf(row.script), "nil") << row.script;
         EXPECT_THAT(log.messages(), testing::Contains(HasSubstr(row.message))) << row.script;
     }
-    EXPECT_EQ(resultOfMain("var asynchronous = 1, important = 2; return [asynchronous]"), "[1]");
+    const test::CapturedLog log;
+    EXPECT_EQ(resultOfMain(
+                  "/* import */ var asynchronous = 1, o = {async: 2, import: 3}; // async\n"
+                  "return [asynchronous, o.async, o['import'], /^async$/.test('async'), '\\async', `async`]"),
+              "[1,2,3,true,\"async\",\"async\"]");
+    EXPECT_THAT(log.messages(), testing::IsEmpty());
 }
 
 TEST(Script, RecursionWithoutEndIsAnException) {
