@@ -1,4 +1,5 @@
 #include "Commands.h"
+#include "Resources.h"
 #include "RhythmMeasurement.h"
 #include "Services.h"
 #include "analysis/QVCTRhythmicTaggingService.h"
@@ -31,14 +32,22 @@ struct Item {
     std::vector<std::shared_ptr<TGRTTagging>> taggings;
 };
 
+using Settings = QVTaggingAggregator::Settings;
+
 /// The settings in a file; none, and a line on standard error, when it is not one.
-QVTaggingAggregator::Settings settingsIn(const std::string& file, std::string_view what,
-                                         ToolContext& context) {
+template <typename Read>
+Settings settingsIn(const std::string& file, std::string_view what, Read read, ToolContext& context) {
     if (file.empty()) return std::nullopt;
     Error error;
-    auto settings = readDictionaryFile(file, &error);
+    Settings settings = read(file, &error);
     if (!settings) context.itemFailed(fmt::format("{} (using the built-in {})", error.message, what));
     return settings;
+}
+
+Settings keywordsIn(const std::string& file, ToolContext& context) {
+    Settings keywords = settingsIn(file, "keywords", readDictionaryFile, context);
+    if (keywords) checkKeywords(*keywords, context);
+    return keywords;
 }
 
 /// What the item's record says that it is, else its name.
@@ -117,8 +126,8 @@ void addAnyRhythm(const URL& url, const TGRTTaxonomy& taxonomy, ObjectSet<TGRTTa
 void run(const Options& options, ToolContext& context) {
     const auto bits = optionsForServices(options.services, context);
     const auto aggregator =
-        QVTaggingAggregator::initWithRules(settingsIn(options.rulesFile, "rules", context),
-                                           settingsIn(options.keywordsFile, "keywords", context));
+        QVTaggingAggregator::initWithRules(settingsIn(options.rulesFile, "rules", readRules, context),
+                                           keywordsIn(options.keywordsFile, context));
     const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
     std::vector<Item> items;
     for (const URL& url : context.contentItems(options.paths)) {

@@ -1,11 +1,14 @@
 #include "Resources.h"
 
 #include "ToolContext.h"
+#include "autotagging/QVCTKeywordExtractor.h"
 #include "platform/FileAccess.h"
 #include "platform/PropertyListFile.h"
 #include "platform/ResourceBundle.h"
 #include "platform/Text.h"
 #include "resources/ResourceFiles.h"
+#include "taxonomy/LegacyMappingTable.h"
+#include "taxonomy/TGRTLegacyTaxonomyMapping.h"
 
 #include <string_view>
 
@@ -14,34 +17,57 @@
 namespace qvct::tool {
 namespace {
 
+constexpr std::string_view kRulesKey = "DefaultRules";
+
 /// The key without which a property list is not the resource; empty where any dictionary will do.
 std::string_view requiredKey(std::string_view resource) {
-    if (resource == "DefaultRules") return resource;
+    if (resource == kRulesKey) return resource;
     return resource.ends_with("Taxonomy") ? "categories" : "";
 }
 
-bool isUsablePropertyList(const std::string& path, std::string_view key, Error& error) {
-    const auto dictionary = readDictionaryFile(path, &error);
-    if (!dictionary) return false;
-    if (key.empty()) return true;
+std::optional<PropertyList::Dictionary> readDictionaryWith(std::string_view key, const std::string& path,
+                                                           Error* error) {
+    auto dictionary = readDictionaryFile(path, error);
+    if (!dictionary || key.empty()) return dictionary;
     const PropertyList* value = dictionary->value(key);
-    const bool isList = key == "DefaultRules";
+    const bool isList = key == kRulesKey;
     if (value != nullptr && (isList ? value->array() != nullptr : value->dictionary() != nullptr))
-        return true;
-    return fail(&error, kErrorMalformed,
-                fmt::format("{}: {} \"{}\"", printable(path),
-                            value == nullptr ? "there is no key" : "there are no entries under", key));
+        return dictionary;
+    fail(error, kErrorMalformed,
+         fmt::format("{}: {} \"{}\"", printable(path),
+                     value == nullptr ? "there is no key" : "there are no entries under", key));
+    return std::nullopt;
 }
 
-bool isUsable(const ResourceFile& resource, const std::string& path, Error& error) {
-    if (resource.extension == "plist") return isUsablePropertyList(path, requiredKey(resource.name), error);
-    return readTextFile(path, &error).has_value();
+bool isMappingTable(std::string_view text, const std::string& path, Error* error) {
+    const auto lines = split(replaceAll(text, "\r\n", "\n"), "\n");
+    if (lines.front() != kLegacyMappingHeader)
+        return fail(error, kErrorMalformed, fmt::format("{}, line 1: is not the header", printable(path)));
+    for (std::size_t i = 1; i < lines.size(); ++i) {
+        if (lines[i].empty() || TGRTLegacyTaxonomyMapping::correctFormatForLine(lines[i])) continue;
+        return fail(error, kErrorMalformed,
+                    fmt::format("{}, line {}: has not {} fields", printable(path), i + 1,
+                                std::size_t{kLegacyMappingFieldCount}));
+    }
+    return true;
+}
+
+bool isUsableText(const ResourceFile& resource, const std::string& path, Error* error) {
+    const auto text = readTextFile(path, error);
+    return text && (!resource.name.ends_with("TaxonomyMapping") || isMappingTable(*text, path, error));
+}
+
+bool isUsable(const ResourceFile& resource, const std::string& path, ToolContext& context, Error* error) {
+    if (resource.extension != "plist") return isUsableText(resource, path, error);
+    const auto dictionary = readDictionaryWith(requiredKey(resource.name), path, error);
+    if (dictionary && resource.name == "DefaultKeywordMapping") checkKeywords(*dictionary, context);
+    return dictionary.has_value();
 }
 
 void checkResource(const ResourceFile& resource, ToolContext& context) {
     const auto path = ResourceBundle::pathForResource(resource.name, resource.extension);
     Error error;
-    if (!path || isUsable(resource, *path, error)) return;
+    if (!path || isUsable(resource, *path, context, &error)) return;
     context.itemFailed(fmt::format("{} (using the built-in one)", error.message));
     ResourceBundle::setPathForResource(resource.name, resource.extension, std::nullopt);
 }
@@ -56,6 +82,16 @@ void useResources(const std::string& directory, const std::string& taxonomyFile,
     }
     if (!taxonomyFile.empty()) ResourceBundle::setPathForResource("DefaultTaxonomy", "plist", taxonomyFile);
     for (const ResourceFile& resource : kResourceFiles) checkResource(resource, context);
+}
+
+std::optional<PropertyList::Dictionary> readRules(const std::string& path, Error* error) {
+    return readDictionaryWith(kRulesKey, path, error);
+}
+
+void checkKeywords(const PropertyList::Dictionary& mapping, ToolContext& context) {
+    for (const auto& [keyword, _] : mapping) {
+        if (!QVCTKeywordExtractor::regexForKeyword(keyword)) context.loggedFailure();
+    }
 }
 
 }  // namespace qvct::tool

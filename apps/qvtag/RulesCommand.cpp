@@ -1,12 +1,11 @@
 #include "Commands.h"
+#include "Resources.h"
 #include "autotagging/QVCTXMLDocument.h"
 #include "autotagging/QVCTXMLRulesTaggingService.h"
 #include "formats/QVContentEditorFileUtilities.h"
-#include "platform/PropertyListFile.h"
 #include "platform/Text.h"
 
 #include <algorithm>
-#include <map>
 #include <memory>
 
 #include <CLI/CLI.hpp>
@@ -24,7 +23,7 @@ struct Options {
 
 /// What one rule did to all items.
 struct Tally {
-    std::string type;
+    RuleDescription rule;
     std::size_t matches = 0;
     std::chrono::nanoseconds time{0};
 };
@@ -86,17 +85,10 @@ void printMatches(const URL& url, const std::vector<RuleOutcome>& matches, const
 Service serviceWith(const std::string& rulesFile, ToolContext& context) {
     if (rulesFile.empty()) return QVCTXMLRulesTaggingService::init();
     Error error;
-    auto rules = readDictionaryFile(rulesFile, &error);
-    if (!rules) {
-        context.itemFailed(error.message);
-        return nullptr;
-    }
-    const PropertyList* list = rules->value("DefaultRules");
-    if (list == nullptr || list->array() == nullptr) {
-        context.itemFailed(fmt::format("{}: there is no array under \"DefaultRules\"", printable(rulesFile)));
-        return nullptr;
-    }
-    return QVCTXMLRulesTaggingService::initWithRules(std::move(rules));
+    auto rules = readRules(rulesFile, &error);
+    if (rules) return QVCTXMLRulesTaggingService::initWithRules(std::move(rules));
+    context.itemFailed(error.message);
+    return nullptr;
 }
 
 void show(const Options& options, ToolContext& context) {
@@ -116,37 +108,54 @@ void show(const Options& options, ToolContext& context) {
     if (context.format != Format::table) printJson(items, context.format);
 }
 
-std::map<std::size_t, Tally> tallyOver(const std::vector<URL>& items, const Service& service) {
-    std::map<std::size_t, Tally> tallies;
+/// A tally of each rule, and a line on standard error for each that can never match.
+std::vector<Tally> emptyTallies(const Service& service, const std::string& rulesFile, ToolContext& context) {
+    std::vector<Tally> tallies;
+    for (RuleDescription& rule : service->rules()) {
+        if (!rule.problem.empty()) {
+            context.itemFailed(
+                fmt::format("{}: rule {}: {}", printable(rulesFile), rule.number, rule.problem));
+        }
+        tallies.push_back({std::move(rule)});
+    }
+    return tallies;
+}
+
+void count(const std::vector<URL>& items, const Service& service, std::vector<Tally>& tallies) {
     for (const URL& url : items) {
         for (const RuleOutcome& outcome : service->outcomesForXMLDocument(documentOf(url))) {
-            Tally& tally = tallies[outcome.number];
-            tally.type = outcome.type;
+            Tally& tally = tallies[outcome.number - 1];
             tally.matches += outcome.tags.empty() ? 0 : 1;
             tally.time += outcome.time;
         }
     }
-    return tallies;
 }
 
 double microseconds(std::chrono::nanoseconds time) {
     return std::chrono::duration<double, std::micro>(time).count();
 }
 
-void printTallies(const std::map<std::size_t, Tally>& tallies, std::size_t items, ToolContext& context) {
+void printTallies(const std::vector<Tally>& tallies, std::size_t items, ToolContext& context) {
     if (context.format != Format::table) {
         Json rules = Json::array();
-        for (const auto& [number, tally] : tallies) {
-            rules.push_back({{"number", number},
-                             {"type", tally.type},
-                             {"matches", tally.matches},
-                             {"microseconds", microseconds(tally.time)}});
+        for (const Tally& tally : tallies) {
+            Json json{{"number", tally.rule.number},
+                      {"type", tally.rule.type},
+                      {"matches", tally.matches},
+                      {"microseconds", microseconds(tally.time)}};
+            if (!tally.rule.problem.empty()) json["problem"] = tally.rule.problem;
+            rules.push_back(std::move(json));
         }
         return printJson(Json{{"items", items}, {"rules", rules}}, context.format);
     }
     fmt::print("rule  type        matches of {:<5}  time an item\n", items);
-    for (const auto& [number, tally] : tallies) {
-        fmt::print("{:>4}  {:<10}  {:>16}  {:>9.1f} us\n", number, tally.type, tally.matches,
+    for (const Tally& tally : tallies) {
+        if (!tally.rule.problem.empty()) {
+            fmt::print("{:>4}  {:<10}  {:>16}\n", tally.rule.number, printable(tally.rule.type),
+                       "never matches");
+            continue;
+        }
+        fmt::print("{:>4}  {:<10}  {:>16}  {:>9.1f} us\n", tally.rule.number, tally.rule.type, tally.matches,
                    microseconds(tally.time) / static_cast<double>(std::max<std::size_t>(items, 1)));
     }
 }
@@ -154,12 +163,10 @@ void printTallies(const std::map<std::size_t, Tally>& tallies, std::size_t items
 void test(const Options& options, ToolContext& context) {
     const Service service = serviceWith(options.rulesFile, context);
     if (!service) return;
-    for (const RuleProblem& problem : service->problems()) {
-        context.itemFailed(
-            fmt::format("{}: rule {}: {}", printable(options.rulesFile), problem.number, problem.reason));
-    }
+    std::vector<Tally> tallies = emptyTallies(service, options.rulesFile, context);
     const std::vector<URL> items = context.contentItems(options.paths);
-    printTallies(tallyOver(items, service), items.size(), context);
+    count(items, service, tallies);
+    printTallies(tallies, items.size(), context);
 }
 
 }  // namespace

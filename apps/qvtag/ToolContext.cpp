@@ -45,6 +45,10 @@ void ToolContext::prepare() {
 
 void ToolContext::itemFailed(std::string_view message) {
     printLine(message);
+    loggedFailure();
+}
+
+void ToolContext::loggedFailure() {
     exitStatus_ = std::max(exitStatus_, 1);
 }
 

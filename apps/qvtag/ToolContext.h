@@ -28,6 +28,8 @@ class ToolContext {
 
     /// One line on standard error; the tool will say by its exit status that some items failed.
     void itemFailed(std::string_view message);
+    /// The same when the log has named it already.
+    void loggedFailure();
     /// The same for a wrong word on the command line, when the rest is done all the same.
     void usageFailed(std::string_view message);
     /// A line on standard error that is no failure; nothing when quiet.

@@ -151,9 +151,9 @@ std::vector<RuleOutcome> QVCTXMLRulesTaggingService::outcomesForXMLDocument(
     std::vector<RuleOutcome> outcomes;
     if (!document) return outcomes;
     for (const Rule& rule : rules_) {
-        if (rule.type != kXPathType && rule.type != kScriptType) continue;
+        if (problemOf(rule)) continue;
+        const LogScope scope(fmt::format("rule {}: ", rule.number));
         const std::string text = resolvedText(rule.text);
-        if (text.empty()) continue;
         RuleOutcome outcome{rule.number, rule.type, {}, {}, {}};
         const auto start = std::chrono::steady_clock::now();
         outcome.tags = evaluate(rule.type, text, rule.tag, document, &outcome.evidence);
@@ -171,7 +171,7 @@ std::optional<std::string> QVCTXMLRulesTaggingService::problemOf(const Rule& rul
     if (rule.type == kXPathType) {
         if (!rule.tag) return "there is no text under \"tag\"";
         if (text == rule.text && text.starts_with(kFileScheme)) return pathOfRule(text) + ": no such file";
-        return XPathExpression::compile(text, &error) ? std::nullopt : std::optional(error.message);
+        return XPathExpression::cached(text, &error) ? std::nullopt : std::optional(error.message);
     }
     if (rule.type == kScriptType) {
         return ScriptContext::checkSyntax(text, &error) ? std::nullopt : std::optional(error.message);
@@ -179,12 +179,11 @@ std::optional<std::string> QVCTXMLRulesTaggingService::problemOf(const Rule& rul
     return fmt::format("unknown type \"{}\" (XPath or JavaScript)", printable(rule.type));
 }
 
-std::vector<RuleProblem> QVCTXMLRulesTaggingService::problems() const {
-    std::vector<RuleProblem> problems;
-    for (const Rule& rule : rules_) {
-        if (auto reason = problemOf(rule)) problems.push_back({rule.number, *std::move(reason)});
-    }
-    return problems;
+std::vector<RuleDescription> QVCTXMLRulesTaggingService::rules() const {
+    std::vector<RuleDescription> descriptions;
+    for (const Rule& rule : rules_)
+        descriptions.push_back({rule.number, rule.type, problemOf(rule).value_or("")});
+    return descriptions;
 }
 
 }  // namespace qvct

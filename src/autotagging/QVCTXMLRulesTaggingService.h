@@ -12,6 +12,14 @@
 
 namespace qvct {
 
+/// A rule of a rule set, as it stands there.
+struct RuleDescription {
+    std::size_t number = 0;  ///< From 1, in the order of the rule set.
+    std::string type;        ///< "XPath", "JavaScript", or whatever else was written.
+    /// What keeps the rule from ever giving a tag; empty when nothing does.
+    std::string problem;
+};
+
 /// What one rule made of one document.
 struct RuleOutcome {
     std::size_t number = 0;  ///< From 1, in the order of the rule set.
@@ -22,18 +30,12 @@ struct RuleOutcome {
     std::chrono::nanoseconds time{0};
 };
 
-/// What keeps a rule from ever giving a tag.
-struct RuleProblem {
-    std::size_t number = 0;
-    std::string reason;
-};
-
 /// Tags an item by rules that look into its XML description.
 ///
 /// A rule set is a dictionary whose "DefaultRules" is an array of rules, each a dictionary: "rule" (an XPath
 /// expression or a script, or "file://" and the path of a file that holds it), "tag" (the label that an XPath
 /// rule gives) and "type" ("XPath", which may be left out, or "JavaScript"; anything else disables the rule).
-/// Rules without effect are passed over silently; `problems` tells why.
+/// Rules without effect are passed over silently; `rules` tells why.
 ///
 /// Immutable: safe from every thread, each with documents of its own.
 class QVCT_API QVCTXMLRulesTaggingService : public QVCTAutoTaggingService {
@@ -55,11 +57,12 @@ class QVCT_API QVCTXMLRulesTaggingService : public QVCTAutoTaggingService {
                                            const std::shared_ptr<LCFileData>& fileData,
                                            std::uint64_t options) override;
 
-    /// The outcome of every rule that can be evaluated, whether it gives tags or not.
-    std::vector<RuleOutcome> outcomesForXMLDocument(const std::shared_ptr<QVCTXMLDocument>& document) const;
+    /// All rules, with syntax errors, missing tags and files, unknown types: for the authors of rules.
+    std::vector<RuleDescription> rules() const;
 
-    /// Syntax errors, missing tags and files, unknown types: for the authors of rules.
-    std::vector<RuleProblem> problems() const;
+    /// The outcome of every rule without a problem, whether it gives tags or not. What the log says meanwhile
+    /// begins with the rule's number.
+    std::vector<RuleOutcome> outcomesForXMLDocument(const std::shared_ptr<QVCTXMLDocument>& document) const;
 
   private:
     struct Rule {

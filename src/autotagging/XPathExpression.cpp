@@ -1,8 +1,10 @@
 #include "autotagging/XPathExpression.h"
 
+#include "autotagging/XPathNames.h"
 #include "platform/Log.h"
 #include "platform/Text.h"
 
+#include <algorithm>
 #include <string>
 #include <unordered_map>
 
@@ -60,11 +62,19 @@ std::string shortened(std::string_view text) {
     return printable(text.substr(0, kLongest)) + (text.size() > kLongest ? "..." : "");
 }
 
+/// The offset is in bytes, the error counts characters from 1.
+Error syntaxError(std::string_view text, std::size_t offset, std::string_view reason) {
+    const std::string_view before = text.substr(0, offset);
+    const auto character =
+        1 + std::count_if(before.begin(), before.end(), [](char c) { return (c & 0xC0) != 0x80; });
+    return {std::string(QVCTErrorDomain), kErrorMalformed,
+            fmt::format("XPath \"{}\", character {}: {}", shortened(text), character, reason)};
+}
+
 void keepSyntaxError(void* target, xmlErrorPtr raised) {
     const std::string_view text = raised->str1 == nullptr ? std::string_view{} : raised->str1;
-    *static_cast<Error*>(target) = {
-        std::string(QVCTErrorDomain), kErrorMalformed,
-        fmt::format("XPath \"{}\", character {}: {}", shortened(text), raised->int1, reasonOf(raised->code))};
+    const auto offset = static_cast<std::size_t>(std::max(raised->int1, 0));
+    *static_cast<Error*>(target) = syntaxError(text, offset, reasonOf(raised->code));
 }
 
 void logEvaluationError(void* text, xmlErrorPtr raised) {
@@ -110,7 +120,10 @@ std::shared_ptr<const XPathExpression> XPathExpression::compile(std::string_view
     expression->text_ = text;
     expression->compiled_.reset(
         xmlXPathCtxtCompile(context.get(), reinterpret_cast<const xmlChar*>(expression->text_.c_str())));
-    if (!expression->compiled_) {
+    // The library finds these when it comes to them, in some documents and not in others.
+    const auto unknown = expression->compiled_ ? unknownXPathName(text) : std::nullopt;
+    if (unknown) raised = syntaxError(text, unknown->offset, unknown->reason);
+    if (!expression->compiled_ || unknown) {
         if (error != nullptr) *error = std::move(raised);
         return nullptr;
     }
@@ -118,14 +131,19 @@ std::shared_ptr<const XPathExpression> XPathExpression::compile(std::string_view
     return expression;
 }
 
-std::shared_ptr<const XPathExpression> XPathExpression::cached(std::string_view text) {
+std::shared_ptr<const XPathExpression> XPathExpression::cached(std::string_view text, Error* error) {
     thread_local std::unordered_map<std::string, std::shared_ptr<const XPathExpression>> cache;
     std::string key(text);
-    if (const auto hit = cache.find(key); hit != cache.end()) return hit->second;
+    const auto hit = cache.find(key);
+    if (hit != cache.end() && (hit->second || error == nullptr)) return hit->second;
     if (cache.size() >= kMostCachedExpressions) cache.clear();
-    Error error;
-    std::shared_ptr<const XPathExpression> expression = compile(text, &error);
-    if (!expression) log(error.message);
+    Error reason;
+    std::shared_ptr<const XPathExpression> expression = compile(text, &reason);
+    if (!expression && error != nullptr) {
+        *error = std::move(reason);
+    } else if (!expression) {
+        log(reason.message);
+    }
     return cache.emplace(std::move(key), std::move(expression)).first->second;
 }
 

@@ -33,8 +33,9 @@ class XPathExpression {
     /// Nothing and an error with the character where the expression goes wrong.
     static std::shared_ptr<const XPathExpression> compile(std::string_view text, Error* error = nullptr);
 
-    /// The same from this thread's cache, so that a rule is compiled once, and a wrong one logged once.
-    static std::shared_ptr<const XPathExpression> cached(std::string_view text);
+    /// The same from this thread's cache, so that a rule is compiled once, and a wrong one told once: by the
+    /// error, or by the log where none is asked for.
+    static std::shared_ptr<const XPathExpression> cached(std::string_view text, Error* error = nullptr);
 
     /// The selected nodes in document order; empty when the result is no node set or the limit was reached.
     std::vector<_xmlNode*> nodes(_xmlXPathContext& context) const;

@@ -12,6 +12,7 @@ namespace qvct {
 namespace {
 
 std::mutex handlerMutex;
+thread_local std::string prefix;
 
 LogHandler& currentHandler() {
     static LogHandler handler;
@@ -47,7 +48,7 @@ std::string onOneLine(std::string_view message) {
 }  // namespace
 
 void log(std::string_view message) {
-    const std::string line = onOneLine(message);
+    const std::string line = prefix + onOneLine(message);
     LogHandler handler;
     {
         const std::lock_guard lock(handlerMutex);
@@ -63,6 +64,14 @@ void log(std::string_view message) {
 LogHandler setLogHandler(LogHandler handler) {
     const std::lock_guard lock(handlerMutex);
     return std::exchange(currentHandler(), std::move(handler));
+}
+
+LogScope::LogScope(std::string text) {
+    prefix = std::move(text);
+}
+
+LogScope::~LogScope() {
+    prefix.clear();
 }
 
 }  // namespace qvct

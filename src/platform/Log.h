@@ -3,6 +3,7 @@
 #include "platform/Export.h"
 
 #include <functional>
+#include <string>
 #include <string_view>
 
 namespace qvct {
@@ -18,5 +19,14 @@ QVCT_API void log(std::string_view message);
 /// Sends all further messages to `handler`; an empty one brings standard error back.
 /// Answers the handler that was set before, so that it can be restored.
 QVCT_API LogHandler setLogHandler(LogHandler handler);
+
+/// While it lives, messages of its thread begin with its prefix. Scopes do not nest.
+class QVCT_API LogScope {
+  public:
+    explicit LogScope(std::string prefix);
+    LogScope(const LogScope&) = delete;
+    LogScope& operator=(const LogScope&) = delete;
+    ~LogScope();
+};
 
 }  // namespace qvct

@@ -47,6 +47,8 @@ class QVCT_API TGRTLegacyTaxonomyMapping {
 
     // For whoever keeps the tables.
 
+    /// Whether a line has as many fields as a row of a table.
+    static bool correctFormatForLine(std::string_view line);
     /// Whether the table has a row for the tag, be it one that names nothing.
     bool hasRowForLegacyTag(const TGRTTag& tag) const { return rows_.contains(mappingKeyForTag(tag)); }
     /// Type, keyword and sub-keyword, separated by ";", of the rows whose retired tag does not exist.
@@ -59,7 +61,6 @@ class QVCT_API TGRTLegacyTaxonomyMapping {
         : newTaxonomy_(std::move(newTaxonomy)) {}
 
     static bool validFormatForLines(const Lines& lines);
-    static bool correctFormatForLine(std::string_view line);
     static std::string mappingKeyForTag(const TGRTTag& tag);
 
     void mappingWithLines(const Lines& lines, const TGRTTaxonomy& taxonomy);

@@ -110,7 +110,12 @@ TEST_F(RulesCommand, NamesTheRuleThatIsWrong) {
     const struct {
         std::string rule, reason;
     } rows[] = {
-        {xPathRule("/a["), "rule 2: XPath \"/a[\", character 3: "},
+        {xPathRule("/a["), "rule 2: XPath \"/a[\", character 4: "},
+        {xPathRule("/Patch/\xc3\xa9["), "character 10: "},
+        {xPathRule("/a[contain(@b, 'c')]"), "character 4: unknown function \"contain\""},
+        {xPathRule("/a | b:c"), "character 6: undefined prefix \"b\""},
+        {xPathRule("/a['$b' = $b]"), "character 11: undefined variable"},
+        {scriptRule("async function main() {}"), "are not available to rules"},
         {xPathRule(parentheses), "rule 2: XPath \"((("},
         {xPathRule("file://" + folder_.path("none.xpath")), "none.xpath: no such file"},
         {xPathRule(latin), "latin.xpath: is not UTF-8 text"},
@@ -124,10 +129,18 @@ TEST_F(RulesCommand, NamesTheRuleThatIsWrong) {
         const ToolResult result = tryRules(ruleList({xPathRule("/Patch"), row.rule}));
         EXPECT_EQ(result.status, 1);
         EXPECT_EQ(result.json()["rules"][0]["matches"], 1) << row.reason;
-        const std::string first = result.errors.substr(0, result.errors.find('\n'));
-        EXPECT_THAT(first, AllOf(HasSubstr("r.plist: rule 2: "), HasSubstr(row.reason)));
+        EXPECT_THAT(result.errors, AllOf(HasSubstr("r.plist: rule 2: "), HasSubstr(row.reason)));
+        EXPECT_EQ(lines(result.errors), 1) << result.errors;
         EXPECT_LT(result.errors.size(), 1500U) << row.reason;
+        EXPECT_THAT(result.json()["rules"][1]["problem"].get<std::string>(),
+                    testing::Not(testing::IsEmpty()));
     }
+    const std::string rules =
+        folder_.write("r.plist", ruleList({xPathRule("/a["), xPathRule("//comment() and (1)")}));
+    const ToolResult result = runTool({"rules", "test", rules, folder_.write("Kick.wav", "")});
+    EXPECT_THAT(result.output,
+                HasSubstr("   1  XPath          never matches\n   2  XPath                      0 "))
+        << "also where no item has a description";
 }
 
 TEST_F(RulesCommand, ScriptsThatFailCostOnlyThemselves) {
@@ -138,7 +151,7 @@ TEST_F(RulesCommand, ScriptsThatFailCostOnlyThemselves) {
         const ToolResult result = tryRules(ruleList({scriptRule(script), xPathRule("/Patch")}));
         EXPECT_EQ(result.json()["rules"][0]["matches"], 0) << script;
         EXPECT_EQ(result.json()["rules"][1]["matches"], 1) << script;
-        EXPECT_THAT(result.errors, HasSubstr("JavaScript Exception: ")) << script;
+        EXPECT_THAT(result.errors, HasSubstr("rule 1: JavaScript Exception: ")) << script;
         EXPECT_EQ(lines(result.errors), 1) << script << result.errors;
     }
 }
@@ -151,6 +164,8 @@ TEST_F(RulesCommand, RefusesWhatIsNoRuleFileAndAutotagGoesOnWithout) {
         {folder_.path(), ": is a folder"},
         {folder_.write("latin.plist", "<plist><dict><key>\xe9</key></dict></plist>"), "latin.plist: XML"},
         {folder_.write("list.plist", "<plist version=\"1.0\"><array/></plist>"), "not a dictionary"},
+        {folder_.write("other.plist", "<plist version=\"1.0\"><dict><key>Rules</key><array/></dict></plist>"),
+         "there is no key \"DefaultRules\""},
     };
     for (const auto& row : rows) {
         for (const ToolResult& result : {runTool({"rules", "test", row.path, patch_}),
@@ -166,8 +181,6 @@ TEST_F(RulesCommand, RefusesWhatIsNoRuleFileAndAutotagGoesOnWithout) {
         EXPECT_THAT(tagged.errors, AllOf(HasSubstr(row.reason), HasSubstr("using the built-in rules")));
         EXPECT_EQ(tagged.json()[0]["taggings"].size(), 2U) << row.path;
     }
-    EXPECT_THAT(tryRules("<plist version=\"1.0\"><dict/></plist>").errors,
-                HasSubstr("r.plist: there is no array under \"DefaultRules\""));
     EXPECT_EQ(runTool({"rules"}).status, 2);
     EXPECT_EQ(runTool({"rules", "test", folder_.path("r.plist")}).status, 2);
 }

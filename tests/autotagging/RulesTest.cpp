@@ -173,7 +173,7 @@ TEST(DefaultRules, TheTestRuleSpeaksOnlyWhenDebugged) {
     const test::CapturedLog log;
     EXPECT_EQ(tagsOfRule(*QVCTXMLRulesTaggingService::initWithRules(rules), 19, xml),
               R"([{"label":"Autotagging Test"}])");
-    EXPECT_THAT(log.messages(), testing::Contains("JavaScript: Autotagging JS is working4"));
+    EXPECT_THAT(log.messages(), testing::Contains("rule 19: JavaScript: Autotagging JS is working4"));
     EXPECT_THAT(log.messages(), testing::Contains(HasSubstr("\"name\": \"Echo\"")));
 }
 
@@ -219,22 +219,26 @@ TEST(Rules, AreTakenByExactTypeAndFromFiles) {
     EXPECT_EQ(tagsFor(rule("file://~/x y.xpath")), given);
 }
 
+std::vector<std::string> problemsOf(const QVCTXMLRulesTaggingService& service) {
+    std::vector<std::string> problems;
+    for (const RuleDescription& rule : service.rules()) {
+        if (!rule.problem.empty()) problems.push_back(std::to_string(rule.number) + ": " + rule.problem);
+    }
+    return problems;
+}
+
 TEST(Rules, ProblemsNameTheRuleAndTheReason) {
     const auto service =
         serviceFor({rule("/a"), rule("/a["), PropertyList(7), rule("/a", "Lua"), rule("/a", nullptr, nullptr),
                     rule("var x = ;", "JavaScript"), rule("file:///missing"), rule(""),
                     rule("function main() {}", "JavaScript")});
-    std::vector<std::string> problems;
-    for (const RuleProblem& problem : service->problems()) {
-        problems.push_back(std::to_string(problem.number) + ": " + problem.reason);
-    }
     EXPECT_THAT(
-        problems,
-        ElementsAre(HasSubstr("2: XPath \"/a[\", character 3"),
+        problemsOf(*service),
+        ElementsAre(HasSubstr("2: XPath \"/a[\", character 4"),
                     HasSubstr("3: there is no text under \"rule\""), HasSubstr("4: unknown type \"Lua\""),
                     HasSubstr("5: there is no text under \"tag\""), HasSubstr("6: script, line 1: "),
                     HasSubstr("7: /missing: no such file"), HasSubstr("8: ")));
-    EXPECT_THAT(QVCTXMLRulesTaggingService::init()->problems(), IsEmpty());
+    EXPECT_THAT(problemsOf(*QVCTXMLRulesTaggingService::init()), IsEmpty());
 }
 
 TEST(SoftwareInstruments, EveryActiveOneGivesItsTag) {

@@ -159,7 +159,7 @@ TEST(XmlDocument, WrongExpressionsSelectNothingAndAreLoggedOnce) {
         EXPECT_THAT(xml->nodesForXPath(wrong), IsEmpty());
     }
     EXPECT_EQ(log.messages().size(), 5U);
-    EXPECT_THAT(log.messages()[0], HasSubstr("XPath \"/a[\", character 3: "));
+    EXPECT_THAT(log.messages()[0], HasSubstr("XPath \"/a[\", character 4: "));
 }
 
 TEST(XmlDocument, HostileExpressionsEnd) {
