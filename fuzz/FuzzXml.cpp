@@ -25,5 +25,12 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     const auto json = document->JSONString();
     fuzz::require(!json || isValidUtf8(*json));
     fuzz::require(!dictionary || document->hasContent());
+    // Whether an element is told to the parser from the tree or from its text makes no difference.
+    fuzz::require(json == QVCTXMLDocument::JSONStringWithData(document->XMLData()));
+    for (const char* path : {"/*", "//*[2]", "//*[@*]"}) {
+        const auto node = document->firstNodeForXPath(path);
+        fuzz::require(!node || document->JSONStringForXPath(path) ==
+                                   QVCTXMLDocument::JSONStringWithData(node->XMLData()));
+    }
     return 0;
 }

@@ -86,13 +86,21 @@ class ParserGuard {
     int nodes_ = 0;
 };
 
-Document parse(std::string_view text, std::string_view name) {
+/// Whether elements can be told to a parser as they stand in the tree: what was mended may have no text that
+/// is well-formed, entities are replaced only in text, and longer texts may be too long for JSON.
+bool isPlain(const xmlParserCtxt& parser, const xmlDoc& document, std::string_view text) {
+    constexpr std::size_t longest = kLargestForJson / 8;  // a character becomes six bytes of text at most
+    return parser.wellFormed != 0 && document.intSubset == nullptr && text.size() <= longest;
+}
+
+Document parse(std::string_view text, std::string_view name, bool& isPlainTree) {
     static const bool isInitialized = (xmlInitParser(), true);  // before several threads parse at once
     const std::unique_ptr<xmlParserCtxt, ParserCloser> context(isInitialized ? xmlNewParserCtxt() : nullptr);
     if (!context || text.size() > static_cast<std::size_t>(std::numeric_limits<int>::max())) return nullptr;
     ParserGuard guard(*context, name);
     Document document(xmlCtxtReadMemory(context.get(), text.data(), static_cast<int>(text.size()), nullptr,
                                         nullptr, XML_PARSE_RECOVER | XML_PARSE_NONET));
+    isPlainTree = document != nullptr && isPlain(*context, *document, text);
     guard.logOmitted();
     return document;
 }
@@ -105,12 +113,14 @@ std::string_view textOf(const std::vector<std::uint8_t>& bytes) {
 
 struct QVCTXMLDocument::Implementation {
     Document document;
+    bool isPlain = false;
     XPathContext context;  // after the document, on which it depends
     /// By expression: the scripts of a rule set ask for the same plug-ins.
     std::unordered_map<std::string, std::optional<std::string>> keptJson;
     std::size_t keptBytes = 0;
 
-    explicit Implementation(Document parsed) : document(std::move(parsed)) {
+    Implementation(std::string_view text, std::string_view name) {
+        if (!text.empty()) document = parse(text, name, isPlain);
         if (document) context = makeXPathContext(document.get());
     }
 
@@ -118,6 +128,15 @@ struct QVCTXMLDocument::Implementation {
         if (!context || expression.empty()) return nullptr;
         const auto compiled = XPathExpression::cached(expression);
         return compiled ? compiled->firstNode(*context) : nullptr;
+    }
+
+    /// The JSON of the element's text, which is written and read only where that may make a difference.
+    std::optional<std::string> jsonOf(xmlNode* node) const {
+        if (!isPlain || node->type != XML_ELEMENT_NODE)
+            return QVCTXMLDocument::JSONStringWithData(QVSKXMLNode::initWithXMLNode(node)->XMLData());
+        QVCTXMLParser parser;
+        parser.didFindElement(*node);
+        return jsonText(PropertyList(parser.takeObject()), JsonStyle::pretty);
     }
 };
 
@@ -127,8 +146,8 @@ QVCTXMLDocument::~QVCTXMLDocument() = default;
 
 std::shared_ptr<QVCTXMLDocument> QVCTXMLDocument::initWithXMLData(std::string_view text,
                                                                   std::string_view name) {
-    auto implementation = std::make_unique<Implementation>(text.empty() ? nullptr : parse(text, name));
-    return std::shared_ptr<QVCTXMLDocument>(new QVCTXMLDocument(std::move(implementation)));
+    return std::shared_ptr<QVCTXMLDocument>(
+        new QVCTXMLDocument(std::make_unique<Implementation>(text, name)));
 }
 
 std::shared_ptr<QVCTXMLDocument> QVCTXMLDocument::initWithContentsOfURL(const URL& url) {
@@ -181,8 +200,8 @@ std::optional<std::string> QVCTXMLDocument::JSONStringForXPath(std::string_view 
     Implementation& self = *implementation_;
     std::string key(expression);
     if (const auto kept = self.keptJson.find(key); kept != self.keptJson.end()) return kept->second;
-    const auto node = firstNodeForXPath(expression);
-    std::optional<std::string> json = node ? JSONStringWithData(node->XMLData()) : std::nullopt;
+    xmlNode* node = self.firstNode(expression);
+    std::optional<std::string> json = node != nullptr ? self.jsonOf(node) : std::nullopt;
     const std::size_t bytes = key.size() + (json ? json->size() : 0);
     if (self.keptBytes + bytes <= kMostKeptJson) {
         self.keptBytes += bytes;
@@ -192,7 +211,9 @@ std::optional<std::string> QVCTXMLDocument::JSONStringForXPath(std::string_view 
 }
 
 std::optional<std::string> QVCTXMLDocument::JSONString() const {
-    return JSONStringWithData(XMLData());
+    xmlNode* root = hasContent() ? xmlDocGetRootElement(implementation_->document.get()) : nullptr;
+    return implementation_->isPlain && root != nullptr ? implementation_->jsonOf(root)
+                                                       : JSONStringWithData(XMLData());
 }
 
 std::string QVCTXMLDocument::XMLData() const {

@@ -72,6 +72,32 @@ xmlSAXHandler handlers() {
     return sax;
 }
 
+/// The name as it is written.
+std::string nameOf(const xmlNs* nameSpace, const xmlChar* name) {
+    const bool hasPrefix = nameSpace != nullptr && nameSpace->prefix != nullptr;
+    return hasPrefix ? fmt::format("{}:{}", viewOf(nameSpace->prefix), viewOf(name))
+                     : std::string(viewOf(name));
+}
+
+/// Namespace declarations first, as the library writes them.
+QVCTXMLParser::Attributes attributesOf(const xmlNode& element) {
+    QVCTXMLParser::Attributes attributes;
+    attributes.reserve(kUsualMembers);
+    for (const xmlNs* declared = element.nsDef; declared != nullptr; declared = declared->next) {
+        const std::string_view prefix = viewOf(declared->prefix);
+        if (prefix == "xml") continue;  // declared by itself
+        attributes.emplace_back(prefix.empty() ? std::string("xmlns") : fmt::format("xmlns:{}", prefix),
+                                viewOf(declared->href));
+    }
+    for (const xmlAttr* attribute = element.properties; attribute != nullptr; attribute = attribute->next) {
+        std::string value;
+        for (const xmlNode* text = attribute->children; text != nullptr; text = text->next)
+            value += viewOf(text->content);
+        attributes.emplace_back(nameOf(attribute->ns, attribute->name), std::move(value));
+    }
+    return attributes;
+}
+
 struct ContextCloser {
     void operator()(xmlParserCtxt* context) const {
         xmlFreeDoc(context->myDoc);  // holds the declared entities only
@@ -136,7 +162,19 @@ std::optional<PropertyList::Dictionary> QVCTXMLParser::objectWithData(std::strin
         parseErrorOccurred(errorOf(*context));
         return std::nullopt;
     }
-    return elements_.front().takeDictionary();
+    return takeObject();
+}
+
+void QVCTXMLParser::didFindElement(const xmlNode& element) {
+    didStartElement(nameOf(element.ns, element.name), attributesOf(element));
+    for (const xmlNode* child = element.children; child != nullptr; child = child->next) {
+        if (child->type == XML_ELEMENT_NODE) {
+            didFindElement(*child);
+        } else if (child->type == XML_TEXT_NODE || child->type == XML_CDATA_SECTION_NODE) {
+            foundCharacters(viewOf(child->content));
+        }
+    }
+    didEndElement();
 }
 
 void QVCTXMLParser::didStartElement(std::string name, Attributes attributes) {

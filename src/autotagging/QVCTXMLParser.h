@@ -10,6 +10,8 @@
 #include <utility>
 #include <vector>
 
+struct _xmlNode;  // NOLINT(bugprone-reserved-identifier): libxml2's name
+
 namespace qvct {
 
 /// Turns XML text into the tree of dictionaries that scripts are given as JSON.
@@ -41,6 +43,12 @@ class QVCTXMLParser {
     void didEndElement();
     void foundCharacters(std::string_view characters) { cdata_ += characters; }
     void parseErrorOccurred(Error error) { error_ = std::move(error); }
+
+    /// The events that the element's own text would cause, without writing and reading it. Only for trees
+    /// whose text would be well-formed and holds no references to entities, nested as deep as a parser reads.
+    void didFindElement(const _xmlNode& element);
+    /// Takes the container with all that the events told.
+    PropertyList::Dictionary takeObject() { return elements_.front().takeDictionary(); }
 
   private:
     /// An open element: its members in their order, found by name in constant time, since hostile documents
