@@ -56,7 +56,8 @@ void measure(const DrumCorpus& corpus, const Setting& setting, double seconds, c
     }
     const auto compare = [&](const char* what, const OnsetScore& score, const OnsetScore& theirs) {
         printRow(fmt::format("{}: F at ±{}", setting.name, what),
-                 hasAubio ? fmt::format("{:.3f}, aubioonset {:.3f}", score.f(), theirs.f())
+                 hasAubio ? fmt::format("{:.3f}, aubioonset {:.3f}, {:+.3f}", score.f(), theirs.f(),
+                                        score.f() - theirs.f())
                           : fmt::format("{:.3f}", score.f()),
                  "0.06 above");
     };
