@@ -100,7 +100,7 @@ const ScriptString& prepared(std::string_view script) {
 }
 
 /// The engine's words, and why it does not know what every other engine does.
-std::string withReason(std::string problem, std::string_view script) {
+std::string withReason(const std::string& problem, std::string_view script) {
     const bool mayMissKeyword =
         problem.starts_with("SyntaxError") &&
         (script.find("async") != std::string_view::npos || script.find("import") != std::string_view::npos);

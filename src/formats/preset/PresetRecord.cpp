@@ -55,6 +55,18 @@ std::optional<PropertyList> flagOf(std::string_view text) {
     return PropertyList(text == kTrue);
 }
 
+/// What an item says of the tag before it; nothing for other items and for values that make no sense.
+std::optional<PropertyList> propertyOfTag(const PresetText::Item& item) {
+    if (item.key == QVContentTaggingWeightKeyName) return numberOf(item.value);
+    return item.key == QVContentTaggingAutoTaggingKeyName ? flagOf(item.value) : std::nullopt;
+}
+
+/// The same for the application before it.
+std::optional<PropertyList> propertyOfApplication(const PresetText::Item& item) {
+    if (item.key == QVContentInfoMinimumVersionKey) return PropertyList(item.value);
+    return item.key == QVContentInfoLegacyKey ? flagOf(item.value) : std::nullopt;
+}
+
 /// What the items of a section say, and which of them say it: the others make no sense where they stand, and
 /// stay there.
 template <typename Value>
@@ -69,24 +81,20 @@ Reading<PropertyList::Dictionary> readTaggings(const PresetText& preset) {
     std::vector<std::pair<std::string, PropertyList::Array>> categories;
     std::unordered_map<std::string, std::size_t> places;
     PropertyList::Array* current = nullptr;
-    for (auto& [key, value] : preset.items(kTagging)) {
+    for (const PresetText::Item& item : preset.items(kTagging)) {
         const bool isOfTag = current != nullptr && !current->empty();
-        std::optional<PropertyList> number;
-        bool isRead = true;
-        if (key == kCategory) {
-            const auto [place, isNew] = places.try_emplace(value, categories.size());
-            if (isNew) categories.emplace_back(value, PropertyList::Array{});
+        auto property = isOfTag ? propertyOfTag(item) : std::nullopt;
+        const bool isLabel = current != nullptr && item.key == QVContentTaggingLabelKeyName;
+        if (item.key == kCategory) {
+            const auto [place, isNew] = places.try_emplace(item.value, categories.size());
+            if (isNew) categories.emplace_back(item.value, PropertyList::Array{});
             current = &categories[place->second].second;
-        } else if (current != nullptr && key == QVContentTaggingLabelKeyName) {
-            current->emplace_back(PropertyList::Dictionary{{key, std::move(value)}});
-        } else if (isOfTag && key == QVContentTaggingWeightKeyName && (number = numberOf(value))) {
-            current->back().dictionary()->set(key, std::move(*number));
-        } else if (isOfTag && key == QVContentTaggingAutoTaggingKeyName && (number = flagOf(value))) {
-            current->back().dictionary()->set(key, std::move(*number));
-        } else {
-            isRead = false;
+        } else if (isLabel) {
+            current->emplace_back(PropertyList::Dictionary{{item.key, item.value}});
+        } else if (property) {
+            current->back().dictionary()->set(item.key, *property);
         }
-        reading.isRead.push_back(isRead);
+        reading.isRead.push_back(item.key == kCategory || isLabel || property);
     }
     for (auto& [category, entries] : categories) reading.value.append(category, std::move(entries));
     return reading;
@@ -94,20 +102,12 @@ Reading<PropertyList::Dictionary> readTaggings(const PresetText& preset) {
 
 Reading<PropertyList::Array> readApplications(const PresetText& preset) {
     Reading<PropertyList::Array> reading;
-    for (auto& [key, value] : preset.items(kApplicationInfo)) {
-        const bool isOfApplication = !reading.value.empty();
-        std::optional<PropertyList> flag;
-        bool isRead = true;
-        if (key == QVContentInfoAppIdentifierKey) {
-            reading.value.emplace_back(PropertyList::Dictionary{{key, std::move(value)}});
-        } else if (isOfApplication && key == QVContentInfoMinimumVersionKey) {
-            reading.value.back().dictionary()->set(key, std::move(value));
-        } else if (isOfApplication && key == QVContentInfoLegacyKey && (flag = flagOf(value))) {
-            reading.value.back().dictionary()->set(key, std::move(*flag));
-        } else {
-            isRead = false;
-        }
-        reading.isRead.push_back(isRead);
+    for (const PresetText::Item& item : preset.items(kApplicationInfo)) {
+        const bool isApplication = item.key == QVContentInfoAppIdentifierKey;
+        auto property = reading.value.empty() ? std::nullopt : propertyOfApplication(item);
+        if (isApplication) reading.value.emplace_back(PropertyList::Dictionary{{item.key, item.value}});
+        if (property) reading.value.back().dictionary()->set(item.key, *property);
+        reading.isRead.push_back(isApplication || property);
     }
     return reading;
 }
@@ -132,33 +132,29 @@ Reading<Description> readDescription(const PresetText& preset) {
     std::optional<std::string> current;
     std::size_t keyAt = 0;  // its item counts as read when a value of it was, and none was not
     bool hasStrangeValue = false;
-    for (auto& [key, value] : preset.items(kMetaData)) {
-        std::optional<PropertyList> number;
-        bool isRead = true;
-        bool isValue = false;
+    for (const auto& [key, value] : preset.items(kMetaData)) {
+        const bool isNumber = key == kNumber || key == QVContentTaggingSubTypeKeyName;
+        const auto number = isNumber ? numberOf(value) : std::nullopt;
+        const bool isValue = current && (key == kText || key == kNumber);
+        bool isRead = key == QVContentTaggingDisplayKeyName || (isValue && key == kText);
         if (key == QVContentTaggingDisplayKeyName) {
-            reading.value.displayName = std::move(value);
-        } else if (key == QVContentTaggingSubTypeKeyName && (number = numberOf(value))) {
-            reading.value.subType = number->integerValue().value_or(0);
-        } else if (current && key == kText) {
-            isValue = true;
-            reading.value.keyValues.insert(TGRTKeyValue::initWithKeyStringValue(*current, std::move(value)));
-        } else if (current && key == kNumber && (number = numberOf(value))) {
-            isValue = true;
-            reading.value.keyValues.insert(
-                TGRTKeyValue::initWithKeyNumberValue(*current, std::move(*number)));
-        } else {
-            isRead = false;
-        }
-        if (key == kKey) {
-            current = std::move(value);
+            reading.value.displayName = value;
+        } else if (key == kKey) {
+            current = value;
             keyAt = reading.isRead.size();
             hasStrangeValue = false;
-        } else if (current && key == kNumber && !isRead) {
-            hasStrangeValue = true;
-            reading.isRead[keyAt] = false;
-        } else if (isValue && !hasStrangeValue) {
-            reading.isRead[keyAt] = true;
+        } else if (key == QVContentTaggingSubTypeKeyName && number) {
+            reading.value.subType = number->integerValue().value_or(0);
+            isRead = true;
+        } else if (isValue && key == kText) {
+            reading.value.keyValues.insert(TGRTKeyValue::initWithKeyStringValue(*current, value));
+        } else if (isValue && number) {
+            reading.value.keyValues.insert(TGRTKeyValue::initWithKeyNumberValue(*current, *number));
+            isRead = true;
+        }
+        if (isValue) {
+            hasStrangeValue = hasStrangeValue || !isRead;
+            reading.isRead[keyAt] = !hasStrangeValue;
         }
         reading.isRead.push_back(isRead);
     }
