@@ -429,6 +429,44 @@ TEST_F(Indexing, OfPartsInOneDatabaseMissesNothingOfTheOthers) {
     EXPECT_EQ(names().size(), 39U);
 }
 
+TEST_F(Indexing, OfAPartHidesNothingMissingFromOtherRuns) {
+    const auto run = [this](unsigned part) {
+        return index([part](IndexOptions& options) {
+            options.prune = true;
+            options.part = std::max(part, 1U);
+            options.parts = part == 0 ? 1 : 2;
+        });
+    };
+    for (const unsigned next : {0U, 2U}) {
+        for (int i = 0; i < 40; ++i) write(fmt::format("{}/Kick {}.wav", next, i), std::to_string(i));
+        settle();
+        run(0);
+        std::filesystem::remove_all(fmt::format("{}/{}", library(), next));
+        std::filesystem::create_directory(fmt::format("{}/{}", library(), next));
+        const std::uint64_t pruned = run(1).pruned;
+        EXPECT_GT(pruned, 0U);
+        EXPECT_LT(pruned, 40U);
+        EXPECT_EQ(run(1).missing, 0U);
+        EXPECT_EQ(run(next).pruned, 40 - pruned);
+        EXPECT_THAT(names(), testing::IsEmpty());
+    }
+    // What only the other part lacks.
+    for (int i = 0; i < 6; ++i) write(fmt::format("Kick {}.wav", i), std::to_string(i));
+    settle();
+    run(0);
+    const std::string other = folder_.path("only");
+    index([&other](IndexOptions& options) {
+        options.database = other;
+        options.part = 2;
+        options.parts = 2;
+    });
+    const std::vector<std::string> ofOther = names("", other);
+    ASSERT_FALSE(ofOther.empty());
+    for (const std::string& name : ofOther) std::filesystem::remove(library() + "/" + name + ".wav");
+    EXPECT_EQ(run(1).missing, 0U);
+    EXPECT_EQ(run(0).pruned, ofOther.size());
+}
+
 TEST_F(Indexing, RebuildsADamagedDatabaseAndKeepsTheOld) {
     for (int i = 0; i < 300; ++i) write(fmt::format("Kick {}.wav", i), "");
     settle();
