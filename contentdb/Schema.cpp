@@ -143,6 +143,13 @@ bool isMarkedAsContentDatabase(const std::string& path) {
            bytes.compare(place, 4, "QVCD") == 0;
 }
 
+void removeDatabase(const std::string& path) {
+    for (const char* part : {"", "-wal", "-shm", "-journal"}) {
+        std::error_code ignored;
+        std::filesystem::remove(path + part, ignored);
+    }
+}
+
 std::unique_ptr<Connection> openDatabase(const std::string& path, Access access) {
     std::error_code ignored;
     const bool exists = fileExists(path);
@@ -151,7 +158,9 @@ std::unique_ptr<Connection> openDatabase(const std::string& path, Access access)
     const bool isNew = !exists || std::filesystem::file_size(path, ignored) == 0;
     // An interrupted creation is finished by SQLite itself, from its journal.
     if (!isNew && !isMarkedAsContentDatabase(path) && !fileExists(path + "-journal"))
-        refuse(path, kErrorInvalidArgument, "not a content database, or one whose beginning is damaged");
+        refuse(path, kErrorInvalidArgument,
+               "not a content database, or one whose beginning is damaged; if it was one, move it away and "
+               "index again");
     if (access == Access::read) {
         // A reader may not finish what a writer was interrupted in.
         if (fileExists(path + "-journal"))

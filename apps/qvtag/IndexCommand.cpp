@@ -105,6 +105,9 @@ void addIndexCommand(CLI::App& app, ToolContext& context) {
         ->type_name("FILE");
     command->add_flag("--prune", index.prune, "Take items out whose files are gone");
     command->add_flag("--retry", index.retryFailed, "Read items again that failed before");
+    command->add_flag("--check", index.check,
+                      "Read the database whole first; what is damaged is built anew. Without, only its pages "
+                      "are held against their checksums");
     addServicesOption(*command, options->services);
     auto* part = command->add_option("--part", index.part, "Index only part I of the items")->type_name("I");
     auto* parts = command->add_option("--parts", index.parts, "Into how many parts the items are divided")
