@@ -1,5 +1,6 @@
 #include "Commands.h"
 #include "contentdb/ContentDatabase.h"
+#include "contentdb/Decimal.h"
 #include "platform/QVContentTaggingTypes.h"
 #include "platform/Text.h"
 #include "platform/Url.h"
@@ -41,7 +42,7 @@ std::string_view nameOf(Provenance provenance) {
 
 /// In tenths; the tag's default level stands in where the tagging has none.
 std::int64_t weightLevelOf(const IndexedTagging& tagging) {
-    const auto level = tagging.level ? TGRTLevel::levelWithWeight(*tagging.level) : nullptr;
+    const auto level = tagging.level ? TGRTLevel::levelWithWeight(decimalOf(*tagging.level)) : nullptr;
     const auto tag = TGRTTaxonomy::defaultTaxonomy()->findTagForLabel(tagging.label, tagging.category);
     const auto known = TGRTTagging::initWithTag(tag, level);
     constexpr float tenths = 10;
@@ -53,7 +54,7 @@ Json jsonOf(const IndexedTagging& tagging) {
     json["label"] = tagging.label;
     json["parent"] = tagging.ancestors.empty() ? Json() : Json(tagging.ancestors[0]);
     json["category"] = tagging.category;
-    json["level"] = tagging.level ? Json(*tagging.level) : Json();
+    json["level"] = tagging.level ? Json(decimalOf(*tagging.level)) : Json();
     json["auto"] = tagging.isAuto;
     json["weightLevel"] = weightLevelOf(tagging);
     json["provenance"] = nameOf(tagging.provenance);

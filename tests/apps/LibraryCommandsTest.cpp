@@ -189,6 +189,20 @@ TEST_F(LibraryCommands, CountTagsAndFindSimilar) {
     EXPECT_EQ(similar[0]["displayName"], "Techno Kick");
 }
 
+TEST_F(LibraryCommands, FindNumbersAsTheyAreWritten) {
+    folder_.write("sounds/Odd.wav",
+                  Wav().file(Wav().format() + Wav().acid(0, 60, 7, 86.6F) + Wav().data(5000)));
+    EXPECT_EQ(runTool({"write", "--add", "Sound Descriptors/Cold / Warm=0.3", folder_.path("sounds/Odd.wav")})
+                  .status,
+              0);
+    settle();
+    index();
+    const json found = run({"search", "bpm:86.6 level:\"Cold / Warm\"=0.3"}).json();
+    ASSERT_EQ(found.size(), 1U);
+    EXPECT_EQ(found[0]["keyValues"]["Tempo"], 86.6);
+    EXPECT_EQ(found[0]["taggings"][0]["level"], 0.3);
+}
+
 TEST_F(LibraryCommands, PartsMergeToTheWhole) {
     index();
     for (const char* part : {"1", "2"}) index({"--part", part, "--parts", "2"}, std::string("part") + part);
