@@ -11,6 +11,7 @@
 #include <fstream>
 
 #include <fmt/format.h>
+#include <unistd.h>
 
 namespace qvct::contentdb {
 namespace {
@@ -126,7 +127,15 @@ std::unique_ptr<Connection> openForReading(const std::string& path) {
         return connection;
     } catch (const DatabaseFailure& failure) {
         // In a folder that cannot be written the shared state of the log cannot be made.
-        if (failure.code() != kErrorUnreadable || fileExists(path + "-wal")) throw;
+        const bool isOfFolder = failure.code() == kErrorUnreadable || failure.code() == kErrorUnwritable;
+        std::error_code ignored;
+        const std::string folder = std::filesystem::absolute(path, ignored).parent_path().string();
+        if (!isOfFolder || ::access(path.c_str(), R_OK) != 0 || ::access(folder.c_str(), W_OK) == 0) throw;
+    }
+    if (fileExists(path + "-wal") && std::filesystem::file_size(path + "-wal") > 0) {
+        refuse(path, kErrorUnreadable,
+               "its last changes are still in the log beside it, and taking them in needs the right to write "
+               "to its folder; one search by its owner does it");
     }
     auto connection = std::make_unique<Connection>(immutableUri(path), Connection::Access::readOnly);
     prepare(*connection, false, Access::read);
