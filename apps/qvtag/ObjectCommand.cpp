@@ -1,3 +1,4 @@
+#include "CommandLine.h"
 #include "Commands.h"
 #include "PropertyListOutput.h"
 #include "RecordOutput.h"
@@ -94,7 +95,8 @@ void addObjectCommand(CLI::App& app, ToolContext& context) {
                      "Sum of 1: tags of retired vocabularies, and what loop keywords among them are called "
                      "today; 2: what retired tags are called today; 4: tags that the taxonomy does not "
                      "know; 256: items that store nothing")
-        ->type_name("N");
+        ->type_name("N")
+        ->check(CLI::Validator(refuseNegative, ""));
     command->footer("Example:\n  qvtag object --json --options 258 Loops");
     command->callback([options, &context] { run(*options, context); });
 }

@@ -1,3 +1,4 @@
+#include "CommandLine.h"
 #include "Commands.h"
 #include "contentdb/ContentDatabase.h"
 #include "contentdb/Decimal.h"
@@ -224,7 +225,9 @@ CLI::App* addCommand(CLI::App& app, const char* name, const char* what,
 void addSearchCommands(CLI::App& app, ToolContext& context) {
     const auto options = std::make_shared<Options>();
     const auto addLimit = [&options](CLI::App* command) {
-        command->add_option("--limit", options->limit, "Most items to show")->capture_default_str();
+        command->add_option("--limit", options->limit, "Most items to show")
+            ->capture_default_str()
+            ->check(CLI::Validator(refuseNegative, ""));
     };
     auto* searching = addCommand(app, "search", "Finds items in a database", options, context, searchItems);
     searching->add_option("query", options->words, "What to find; a query that begins with - goes behind --");

@@ -225,6 +225,25 @@ TEST_F(LibraryCommands, PartsMergeToTheWhole) {
     }
 }
 
+TEST_F(LibraryCommands, RefuseNumbersOutOfRange) {
+    index();
+    const std::string kick = folder_.path("sounds/Drums/Dark Kick 01.wav");
+    const struct {
+        std::vector<std::string> command;
+        std::string reason;
+    } cases[] = {
+        {{"search", "--db", folder_.path("db"), "--limit", "-3"}, "-3 is less than 0"},
+        {{"similar", "--db", folder_.path("db"), "--limit=-1", kick}, "-1 is less than 0"},
+        {{"object", "--options", "-1", kick}, "-1 is less than 0"},
+        {{"index", "--db", folder_.path("db"), "--time-limit", "0", "."}, "0 not in range 1 to 86400"},
+        {{"index", "--db", folder_.path("db"), "--workers", "-1", "."}, "-1 not in range 0 to 1024"}};
+    for (const auto& [command, reason] : cases) {
+        const ToolResult result = runTool(command);
+        EXPECT_EQ(result.status, 2) << reason;
+        EXPECT_THAT(result.errors, HasSubstr(reason));
+    }
+}
+
 TEST_F(LibraryCommands, PointAtTheFaultOfAQuery) {
     index();
     const ToolResult result = run({"search", "kick colour:red"});
