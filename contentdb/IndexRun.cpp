@@ -197,10 +197,7 @@ void IndexRun::storeOne(const Described& described, Pending& pending) {
     if (!item.failure.empty()) {
         ++progress_.failed;
         if (options_.failed) {
-            options_.failed({std::string(QVCTErrorDomain), kErrorUnreadable,
-                             item.failure.find(item.path) != std::string::npos
-                                 ? item.failure
-                                 : fmt::format("{}: {}", printable(item.path), item.failure)});
+            options_.failed({std::string(QVCTErrorDomain), kErrorUnreadable, messageOfFailure(item)});
         }
     } else {
         ++progress_.described;

@@ -83,7 +83,9 @@ std::optional<IndexProgress> indexLibrary(const IndexOptions& options, const Des
     for (const std::string& folder : options.folders) {
         folders.push_back(URL::fileURLWithPath(folder).path());
         if (!isDirectory(folders.back()))
-            return refuse(kErrorUnreadable, fmt::format("{}: no such folder", printable(folder)));
+            return refuse(kErrorUnreadable,
+                          fmt::format("{}: {}", printable(folder),
+                                      fileExists(folder) ? "is a file, not a folder" : "no such folder"));
     }
     const auto lock = RunLock::acquire(options.database, error);
     if (!lock) return std::nullopt;

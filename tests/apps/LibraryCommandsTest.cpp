@@ -173,7 +173,12 @@ TEST_F(LibraryCommands, NameWhatCannotBeRead) {
     EXPECT_EQ(result.status, 1);
     EXPECT_THAT(result.errors, HasSubstr("broken.wav"));
     EXPECT_EQ(result.json()["failed"], 1);
-    EXPECT_THAT(runTool({"db", "check", folder_.path("db")}).output, HasSubstr("broken.wav"));
+    const std::string check = runTool({"db", "check", folder_.path("db")}).output;
+    EXPECT_THAT(check, testing::StartsWith(folder_.path("sounds/broken.wav: ")));
+    EXPECT_EQ(check.find("broken.wav"), check.rfind("broken.wav"));
+    const ToolResult ofFile =
+        runTool({"index", "--db", folder_.path("db"), folder_.path("sounds/broken.wav")});
+    EXPECT_THAT(ofFile.errors, HasSubstr("broken.wav: is a file, not a folder"));
 }
 
 TEST_F(LibraryCommands, CountTagsAndFindSimilar) {
@@ -264,6 +269,13 @@ TEST_F(LibraryCommands, TellWhatIsWrongWithADatabase) {
     }
     const ToolResult rebuilt = index();
     EXPECT_THAT(rebuilt.errors, HasSubstr("built anew"));
+    // A page that does not hold what it should.
+    bytes = readAll(folder_.path("db"));
+    bytes[3 * 8192 + 100] = static_cast<char>(bytes[3 * 8192 + 100] ^ 4);
+    folder_.write("broken", bytes);
+    const std::string check = runTool({"db", "check", folder_.path("broken")}).errors;
+    EXPECT_EQ(std::count(check.begin(), check.end(), '\n'), 1) << check;
+    EXPECT_THAT(check, testing::Not(HasSubstr("***")));
     EXPECT_EQ(rebuilt.json()["indexed"], 5);
     EXPECT_EQ(run({"search", "kick"}, "none").status, 1);
 }
