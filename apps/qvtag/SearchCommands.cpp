@@ -76,8 +76,11 @@ Json jsonOf(ContentDatabase& database, ItemId id, const IndexedItem& item) {
     json["taggings"] = Json::array();
     for (const IndexedTagging& tagging : item.taggings) json["taggings"].push_back(jsonOf(tagging));
     json["keyValues"] = Json::object();
-    for (const IndexedValue& value : item.values)
-        std::visit([&](const auto& its) { json["keyValues"][value.key] = its; }, value.value);
+    for (const IndexedValue& value : item.values) {
+        const auto* number = std::get_if<double>(&value.value);
+        json["keyValues"][value.key] =
+            number != nullptr ? jsonOfNumber(*number) : Json(std::get<std::string>(value.value));
+    }
     json["packages"] = item.packs;
     json["dependencies"] = Json::array();
     for (const IndexedDependency& dependency : item.dependencies)
