@@ -78,6 +78,13 @@ std::optional<std::vector<Similar>> ContentDatabase::similar(std::string_view pa
                                                              Error* error) {
     const auto found = item(path, error);
     if (!found) return std::nullopt;
+    const auto refuse = [&](const std::string& reason) {
+        fail(error, kErrorInvalidArgument, fmt::format("{}: {}", printable(path), reason));
+        return std::nullopt;
+    };
+    if (!found->item.failure.empty()) return refuse("could not be read when it was indexed");
+    if (!isComparable(found->item))
+        return refuse("no tags, rhythm or tempo by which others could be similar");
     return implementation_->read(error,
                                  [&] { return similarItems(implementation_->store, found->id, limit); });
 }

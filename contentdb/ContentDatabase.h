@@ -38,7 +38,8 @@ class QVCT_API ContentDatabase {
     std::optional<std::int64_t> count(const Query& query, Error* error = nullptr);
     /// How many of the found items have each tag, the most frequent first.
     std::optional<std::vector<Facet>> facets(const Query& query, Error* error = nullptr);
-    /// The items nearest to the one at the path, best first.
+    /// The items nearest to the one at the path, best first. Nothing and an error when that one could not be
+    /// read, or has no tags, rhythm or tempo.
     std::optional<std::vector<Similar>> similar(std::string_view path, std::size_t limit,
                                                 Error* error = nullptr);
     /// The item at the path; nothing and an error when there is none.

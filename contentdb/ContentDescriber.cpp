@@ -2,6 +2,7 @@
 
 #include "autotagging/QVCTXMLDocument.h"
 #include "autotagging/QVTaggingAggregator.h"
+#include "contentdb/Decimal.h"
 #include "contentdb/Digest.h"
 #include "contentdb/PayloadHash.h"
 #include "formats/TGRTMetaDataReaderFactory.h"
@@ -87,7 +88,7 @@ bool hasValue(const IndexedItem& item, std::string_view key) {
 
 void addNumber(IndexedItem& item, std::string_view key, double number) {
     if (std::isfinite(number) && !isUnknown(key, number) && !hasValue(item, key))
-        item.values.push_back({std::string(key), number});
+        item.values.push_back({std::string(key), decimalOf(number)});
 }
 
 void addValues(IndexedItem& item, const ObjectSet<TGRTKeyValue>& values) {
@@ -154,9 +155,12 @@ ContentDescriber::ContentDescriber(std::uint64_t services)
 ContentDescriber::~ContentDescriber() = default;
 
 std::uint64_t ContentDescriber::digest(std::uint64_t services) {
+    // Raised when items are described otherwise than by the same version before.
+    constexpr std::uint64_t edition = 2;
     Digest digest;
     digest.add(services);
     digest.add(version());
+    digest.add(edition);
     for (const auto& [name, extension] : kResourceFiles) {
         const auto path = ResourceBundle::pathForResource(name, extension);
         const auto bytes = path ? readFile(*path) : std::nullopt;

@@ -40,6 +40,7 @@ ContentStore::ContentStore(Connection& connection)
 
 std::optional<IndexedItem> ContentStore::item(ItemId id) {
     std::optional<IndexedItem> result;
+    item_.reset();  // after a record that could not be decoded
     item_.bind(1, id);
     if (item_.step()) result = readItem(item_, connection_);
     item_.reset();

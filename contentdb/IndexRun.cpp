@@ -1,5 +1,6 @@
 #include "contentdb/IndexRun.h"
 
+#include "contentdb/Digest.h"
 #include "contentdb/Paths.h"
 #include "contentdb/Terms.h"
 #include "platform/Object.h"
@@ -66,7 +67,7 @@ bool IndexRun::visit(const std::string& path, const std::vector<ListedItem>& all
     progress_.seen += items.size();
     const FolderRecord known = writer_.folder(path);
     if (known.id != 0) visited_.insert(known.id);
-    const std::uint64_t digest = digestOf(items);
+    const std::uint64_t digest = digestOfPart(items);
     // What is missing may have turned up elsewhere.
     const bool isUnchanged = known.digest == digest && known.gone == 0;
     if ((isUnchanged && !options_.retryFailed) || (known.id == 0 && items.empty())) {
@@ -96,6 +97,16 @@ std::vector<ListedItem> IndexRun::itemsOfPart(const std::string& path,
 
 bool IndexRun::isOfPart(const std::string& path, std::string_view name) const {
     return options_.parts == 1 || stringHash(pathIn(path, name)) % options_.parts == options_.part - 1;
+}
+
+std::uint64_t IndexRun::digestOfPart(const std::vector<ListedItem>& items) const {
+    const std::uint64_t digest = digestOf(items);
+    if (options_.parts == 1) return digest;
+    // What is missing was counted in this part only: the folder counts as unchanged for this part alone.
+    Digest mixed;
+    for (const std::uint64_t word : {digest, std::uint64_t{options_.part}, std::uint64_t{options_.parts}})
+        mixed.add(word);
+    return mixed.value();
 }
 
 bool IndexRun::submitChanged(const std::shared_ptr<OpenFolder>& folder, std::int64_t folderId,
@@ -186,10 +197,7 @@ void IndexRun::storeOne(const Described& described, Pending& pending) {
     if (!item.failure.empty()) {
         ++progress_.failed;
         if (options_.failed) {
-            options_.failed({std::string(QVCTErrorDomain), kErrorUnreadable,
-                             item.failure.find(item.path) != std::string::npos
-                                 ? item.failure
-                                 : fmt::format("{}: {}", printable(item.path), item.failure)});
+            options_.failed({std::string(QVCTErrorDomain), kErrorUnreadable, messageOfFailure(item)});
         }
     } else {
         ++progress_.described;

@@ -43,6 +43,7 @@ class IndexRun {
     bool visit(const std::string& path, const std::vector<ListedItem>& items);
     std::vector<ListedItem> itemsOfPart(const std::string& path, const std::vector<ListedItem>& items) const;
     bool isOfPart(const std::string& path, std::string_view name) const;
+    std::uint64_t digestOfPart(const std::vector<ListedItem>& items) const;
     bool submitChanged(const std::shared_ptr<OpenFolder>& folder, std::int64_t folderId,
                        const std::vector<ListedItem>& items);
     bool submit(const ListedItem& item, ItemId id, const std::shared_ptr<OpenFolder>& folder);

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "platform/Error.h"
+#include "platform/Export.h"
 
 #include <cstdint>
 #include <functional>
@@ -85,6 +86,9 @@ struct IndexedItem {
 
     bool operator==(const IndexedItem&) const = default;
 };
+
+/// One line that says which item could not be read, and why.
+QVCT_API std::string messageOfFailure(const IndexedItem& item);
 
 /// Describes one item at a time: a pure function of what lies at the path.
 class ItemDescriber {

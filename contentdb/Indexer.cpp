@@ -2,6 +2,7 @@
 
 #include "contentdb/IndexRun.h"
 #include "contentdb/RunLock.h"
+#include "contentdb/Salvage.h"
 #include "contentdb/Schema.h"
 #include "platform/FileAccess.h"
 #include "platform/Text.h"
@@ -22,18 +23,32 @@ std::string nameForDamaged(const std::string& database) {
     return name;
 }
 
-/// Puts a damaged database aside with its log.
-void putAside(const IndexOptions& options, const DatabaseFailure& failure) {
-    const std::string aside = nameForDamaged(options.database);
+/// Moves a database with its log.
+void moveDatabase(const std::string& from, const std::string& to) {
     for (const char* part : {"", "-wal", "-shm"}) {
         std::error_code ignored;
-        if (*part == '\0' || fileExists(options.database + part))
-            std::filesystem::rename(options.database + part, aside + part, ignored);
+        if (fileExists(from + part)) std::filesystem::rename(from + part, to + part, ignored);
     }
+}
+
+/// Puts a damaged database aside and what can be read of it into its place. Answers the folders that may have
+/// lost items.
+std::vector<std::string> replaceDamaged(const IndexOptions& options, const DatabaseFailure& failure) {
+    const std::string unfinished = options.database + ".unfinished";
+    removeDatabase(unfinished);
+    Salvage saved = salvage(options.database, unfinished);
+    const std::string aside = nameForDamaged(options.database);
+    moveDatabase(options.database, aside);
+    moveDatabase(unfinished, options.database);
     if (options.note) {
-        options.note(
-            fmt::format("{}; it was put aside as {} and is built anew", failure.what(), printable(aside)));
+        const std::string rest = saved.folders.empty()
+                                     ? "; which other folders were in it could not be read"
+                                     : fmt::format(", with {} items that could be read", saved.items);
+        options.note(fmt::format("{}; it was put aside as {} and is built anew{}", failure.what(),
+                                 printable(aside), rest));
     }
+    std::erase_if(saved.folders, [](const std::string& folder) { return !isDirectory(folder); });
+    return std::move(saved.folders);
 }
 
 IndexProgress runOnce(const IndexOptions& options, const std::vector<std::string>& folders,
@@ -42,6 +57,8 @@ IndexProgress runOnce(const IndexOptions& options, const std::vector<std::string
     WorkerPool workers(factory,
                        {options.workers != 0 ? options.workers : processors, options.timeLimitPerItem});
     const auto connection = openDatabase(options.database, Access::write);
+    connection->checkPages();
+    if (options.check) ContentStore(*connection).checkAll();
     IndexRun run(options, *connection, workers);
     bool isInOrder = true;
     for (const std::string& folder : folders) isInOrder = isInOrder && run.walk(folder);
@@ -66,7 +83,9 @@ std::optional<IndexProgress> indexLibrary(const IndexOptions& options, const Des
     for (const std::string& folder : options.folders) {
         folders.push_back(URL::fileURLWithPath(folder).path());
         if (!isDirectory(folders.back()))
-            return refuse(kErrorUnreadable, fmt::format("{}: no such folder", printable(folder)));
+            return refuse(kErrorUnreadable,
+                          fmt::format("{}: {}", printable(folder),
+                                      fileExists(folder) ? "is a file, not a folder" : "no such folder"));
     }
     const auto lock = RunLock::acquire(options.database, error);
     if (!lock) return std::nullopt;
@@ -77,7 +96,10 @@ std::optional<IndexProgress> indexLibrary(const IndexOptions& options, const Des
             const bool isOurs =
                 failure.code() == kErrorMalformed && isMarkedAsContentDatabase(options.database);
             if (!isOurs) throw;
-            putAside(options, failure);
+            IndexOptions others = options;
+            others.prune = false;
+            others.folders = replaceDamaged(options, failure);
+            if (!others.folders.empty()) runOnce(others, others.folders, factory);
         }
         return runOnce(options, folders, factory);
     });

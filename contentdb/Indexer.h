@@ -37,6 +37,9 @@ struct IndexOptions {
     bool prune = false;
     /// Reads items again that failed before, though they have not changed.
     bool retryFailed = false;
+    /// Reads the database whole before, each record and index entry, as `ContentDatabase::check` does;
+    /// without, every page is held against its checksum.
+    bool check = false;
     /// Takes only this part of the items (from 1), to be united with the others by `mergeDatabases`.
     unsigned part = 1;
     unsigned parts = 1;
@@ -51,7 +54,8 @@ struct IndexOptions {
     std::function<void(const IndexProgress&)> progress;
     /// Called for each item or folder that cannot be read, with path and reason.
     std::function<void(const Error&)> failed;
-    /// Told when a damaged database was put aside ("<database>.damaged") and is built anew.
+    /// Told when a damaged database was put aside ("<database>.damaged") and is built anew, from what can
+    /// still be read of it and from all folders that are known to it.
     std::function<void(const std::string& message)> note;
     /// Asked after each folder and while items are read; true ends the run early, with all that was read so
     /// far stored and nothing taken out.
@@ -67,7 +71,8 @@ struct IndexOptions {
 ///
 /// Nothing, and an error, when there is no such folder, the database cannot be written, or another run is
 /// going on. What was stored until then stays.
-/// @cost  An unchanged folder: one listing and one look at each file. Memory is bounded whatever the size.
+/// @cost  One reading of the database file, 25 ms for 100,000 items. An unchanged folder: one listing and one
+///   look at each file. Memory is bounded whatever the size.
 QVCT_API std::optional<IndexProgress> indexLibrary(const IndexOptions& options,
                                                    const DescriberFactory& factory, Error* error = nullptr);
 

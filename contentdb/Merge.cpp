@@ -114,13 +114,7 @@ bool mergeDatabases(const std::vector<std::string>& databases, const std::string
         return fail(error, kErrorInvalidArgument, fmt::format("{}: exists already", printable(target)));
     // Built beside its place, so that a merge that was interrupted leaves no half database there.
     const std::string unfinished = target + ".unfinished";
-    const auto discard = [&unfinished] {
-        for (const char* part : {"", "-wal", "-shm", "-journal"}) {
-            std::error_code ignored;
-            std::filesystem::remove(unfinished + part, ignored);
-        }
-    };
-    discard();
+    removeDatabase(unfinished);
     const bool isDone = guarded(error, false, [&] {
         Merge(databases, unfinished).run();
         return true;
@@ -128,7 +122,7 @@ bool mergeDatabases(const std::vector<std::string>& databases, const std::string
     std::error_code failure;
     if (isDone) std::filesystem::rename(unfinished, target, failure);
     if (failure) fail(error, kErrorUnwritable, fmt::format("{}: {}", printable(target), failure.message()));
-    if (!isDone || failure) discard();
+    if (!isDone || failure) removeDatabase(unfinished);
     return isDone && !failure;
 }
 

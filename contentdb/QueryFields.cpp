@@ -110,6 +110,13 @@ std::vector<std::string> keyLabels(std::string_view text) {
     return labels;
 }
 
+std::set<std::string> keyTerms() {
+    std::set<std::string> terms;
+    for (const std::string_view label : kKeyTags)
+        terms.insert(tagTerm(label, QVCategoryLoopSpecificsIdentifier));
+    return terms;
+}
+
 std::optional<std::int64_t> typeNamed(std::string_view word) {
     const std::string bare = bareName(word);
     for (std::int64_t type = kFileTypeNone; type <= kFileTypeProject; ++type) {

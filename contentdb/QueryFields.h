@@ -3,6 +3,7 @@
 #include "contentdb/Query.h"
 
 #include <optional>
+#include <set>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -14,6 +15,8 @@ std::optional<Field> fieldNamed(std::string_view word, const Vocabulary& vocabul
 
 /// Labels of the tags that a musical key consists of ("A", "C#", "Bbm", "A minor"); empty when it is no key.
 std::vector<std::string> keyLabels(std::string_view text);
+/// The terms of the tags that are keys.
+std::set<std::string> keyTerms();
 /// The file type that a word names.
 std::optional<std::int64_t> typeNamed(std::string_view word);
 

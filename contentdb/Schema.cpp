@@ -11,6 +11,7 @@
 #include <fstream>
 
 #include <fmt/format.h>
+#include <unistd.h>
 
 namespace qvct::contentdb {
 namespace {
@@ -126,7 +127,15 @@ std::unique_ptr<Connection> openForReading(const std::string& path) {
         return connection;
     } catch (const DatabaseFailure& failure) {
         // In a folder that cannot be written the shared state of the log cannot be made.
-        if (failure.code() != kErrorUnreadable || fileExists(path + "-wal")) throw;
+        const bool isOfFolder = failure.code() == kErrorUnreadable || failure.code() == kErrorUnwritable;
+        std::error_code ignored;
+        const std::string folder = std::filesystem::absolute(path, ignored).parent_path().string();
+        if (!isOfFolder || ::access(path.c_str(), R_OK) != 0 || ::access(folder.c_str(), W_OK) == 0) throw;
+    }
+    if (fileExists(path + "-wal") && std::filesystem::file_size(path + "-wal") > 0) {
+        refuse(path, kErrorUnreadable,
+               "its last changes are still in the log beside it, and taking them in needs the right to write "
+               "to its folder; one search by its owner does it");
     }
     auto connection = std::make_unique<Connection>(immutableUri(path), Connection::Access::readOnly);
     prepare(*connection, false, Access::read);
@@ -143,6 +152,13 @@ bool isMarkedAsContentDatabase(const std::string& path) {
            bytes.compare(place, 4, "QVCD") == 0;
 }
 
+void removeDatabase(const std::string& path) {
+    for (const char* part : {"", "-wal", "-shm", "-journal"}) {
+        std::error_code ignored;
+        std::filesystem::remove(path + part, ignored);
+    }
+}
+
 std::unique_ptr<Connection> openDatabase(const std::string& path, Access access) {
     std::error_code ignored;
     const bool exists = fileExists(path);
@@ -151,7 +167,9 @@ std::unique_ptr<Connection> openDatabase(const std::string& path, Access access)
     const bool isNew = !exists || std::filesystem::file_size(path, ignored) == 0;
     // An interrupted creation is finished by SQLite itself, from its journal.
     if (!isNew && !isMarkedAsContentDatabase(path) && !fileExists(path + "-journal"))
-        refuse(path, kErrorInvalidArgument, "not a content database, or one whose beginning is damaged");
+        refuse(path, kErrorInvalidArgument,
+               "not a content database, or one whose beginning is damaged; if it was one, move it away and "
+               "index again");
     if (access == Access::read) {
         // A reader may not finish what a writer was interrupted in.
         if (fileExists(path + "-journal"))

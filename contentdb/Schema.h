@@ -14,6 +14,9 @@ enum class Access { read, write };
 /// @throws DatabaseFailure: kErrorMalformed when it is a content database that is damaged.
 std::unique_ptr<Connection> openDatabase(const std::string& path, Access access);
 
+/// Removes what there is of a database and its logs.
+void removeDatabase(const std::string& path);
+
 /// Whether the file carries the mark of a content database, damaged or not.
 bool isMarkedAsContentDatabase(const std::string& path);
 

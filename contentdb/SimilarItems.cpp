@@ -5,157 +5,287 @@
 #include <algorithm>
 #include <array>
 #include <cmath>
+#include <map>
 #include <set>
+#include <utility>
 
 namespace qvct::contentdb {
 namespace {
 
-/// The terms of an item's tags and of those above them.
-std::set<std::string> tagTerms(const IndexedItem& item) {
-    std::set<std::string> terms;
-    for (const IndexedTagging& tagging : item.taggings) {
-        terms.insert(tagTerm(tagging.label, tagging.category));
-        for (const std::string& ancestor : tagging.ancestors)
-            terms.insert(tagTerm(ancestor, tagging.category));
+/// The numbers that count, and how far apart two of them are half alike.
+struct Measure {
+    const char* field;
+    bool isOfLevel;
+    bool isRatio;  // counted in octaves
+    double half;
+};
+constexpr std::array<Measure, 3> kMeasures = {{{"Rhythmic Density", true, false, 0.2},
+                                               {"Rhythmic Complexity", true, false, 0.2},
+                                               {"tempo", false, true, 0.1375}}};  // ten percent
+
+std::string fieldOf(const Measure& measure) {
+    return measure.isOfLevel ? levelField(measure.field) : measure.field;
+}
+
+/// What an item is compared by.
+struct Facts {
+    std::set<std::string> tags;  // and those above them, as terms
+    std::set<std::string> key;   // of these
+    std::array<std::optional<double>, kMeasures.size()> numbers;
+
+    bool isEmpty() const {
+        return tags.empty() &&
+               std::none_of(numbers.begin(), numbers.end(), [](const auto& number) { return number; });
     }
-    return terms;
-}
-
-/// How close two numbers are: 1 when equal, falling to half at `half` apart. Nothing when either is unknown.
-std::optional<double> closeness(const std::vector<double>& a, const std::vector<double>& b, double half) {
-    if (a.empty() || b.empty()) return std::nullopt;
-    return 1 / (1 + std::abs(a[0] - b[0]) / half);
-}
-
-std::vector<double> octaves(std::vector<double> numbers) {
-    std::erase_if(numbers, [](double number) { return number <= 0; });
-    for (double& number : numbers) number = std::log2(number);
-    return numbers;
-}
-
-/// Mean of what is known of both: tags weigh half, rhythm, tempo and key the rest. Unknown facts neither
-/// speak for an item nor against it.
-double similarity(const IndexedItem& a, const IndexedItem& b, double tagSimilarity) {
-    struct Aspect {
-        std::optional<double> closeness;
-        double weight;
-    };
-    const auto level = [](const IndexedItem& item, const char* label) {
-        return numbersInField(item, {Field::Kind::level, label});
-    };
-    const auto tempo = [](const IndexedItem& item) {
-        return octaves(numbersInField(item, {Field::Kind::number, "tempo"}));
-    };
-    const std::vector<std::string> keyOfA = textsInField(a, {Field::Kind::key, {}});
-    const std::vector<std::string> keyOfB = textsInField(b, {Field::Kind::key, {}});
-    std::optional<double> key;
-    if (!keyOfA.empty() && !keyOfB.empty()) key = keyOfA == keyOfB ? 1 : 0;
-    constexpr double fifthOfRange = 0.2;
-    constexpr double tenPercent = 0.1375;  // octaves
-    const std::array<Aspect, 5> aspects = {
-        {{tagSimilarity, 4},
-         {closeness(level(a, "Rhythmic Density"), level(b, "Rhythmic Density"), fifthOfRange), 1},
-         {closeness(level(a, "Rhythmic Complexity"), level(b, "Rhythmic Complexity"), fifthOfRange), 1},
-         {closeness(tempo(a), tempo(b), tenPercent), 1},
-         {key, 1}}};
-    double sum = 0;
-    double weights = 0;
-    for (const Aspect& aspect : aspects) {
-        if (!aspect.closeness) continue;
-        sum += *aspect.closeness * aspect.weight;
-        weights += aspect.weight;
-    }
-    return sum / weights;
-}
-
-/// For each tag of the item how much it tells: the fewer items have it, the more.
-struct WeighedTag {
-    TermId term;
-    double weight;
 };
 
-std::vector<WeighedTag> weighedTags(ContentStore& store, const IndexedItem& item, std::int64_t lastChunk) {
-    const double items = static_cast<double>(std::max<std::int64_t>(store.countOfItems(), 1));
-    std::vector<WeighedTag> result;
-    for (const std::string& value : tagTerms(item)) {
-        const auto id = store.term(value);
-        if (!id) continue;
-        double count = 0;
-        for (std::int64_t chunk = 0; chunk <= lastChunk; ++chunk) {
-            IdSet ids;
-            store.addPosting(*id, chunk, ids);
-            count += ids.count();
-        }
-        result.push_back({*id, std::log2(1 + items / std::max(count, 1.0))});
+Facts factsOf(const IndexedItem& item) {
+    Facts facts;
+    for (const IndexedTagging& tagging : item.taggings) {
+        facts.tags.insert(tagTerm(tagging.label, tagging.category));
+        for (const std::string& ancestor : tagging.ancestors)
+            facts.tags.insert(tagTerm(ancestor, tagging.category));
+    }
+    for (const std::string& key : keyTerms()) {
+        if (facts.tags.contains(key)) facts.key.insert(key);
+    }
+    const auto numbers = numbersOf(item);
+    for (std::size_t i = 0; i < kMeasures.size(); ++i) {
+        const auto hit = std::find_if(numbers.begin(), numbers.end(), [&](const auto& number) {
+            return number.first == fieldOf(kMeasures[i]) && (!kMeasures[i].isRatio || number.second > 0);
+        });
+        if (hit != numbers.end()) facts.numbers[i] = hit->second;
+    }
+    return facts;
+}
+
+/// 1 when equal, falling to half.
+double closeness(const Measure& measure, double a, double b) {
+    const double distance = measure.isRatio ? std::log2(a) - std::log2(b) : a - b;
+    return 1 / (1 + std::abs(distance) / measure.half);
+}
+
+/// Stands for how alike two items are in what one of them does not have.
+constexpr double kUnknown = -1;
+using Closenesses = std::array<double, kMeasures.size()>;
+constexpr Closenesses kAllUnknown = {kUnknown, kUnknown, kUnknown};
+
+/// In which respects two items are alike, and how much: 0 to 1.
+struct Likeness {
+    double tags = kUnknown;
+    double key = kUnknown;
+    Closenesses numbers = kAllUnknown;
+
+    /// Tags weigh half, rhythm, tempo and key the rest. Unknown facts neither speak for an item nor against
+    /// it.
+    double mean() const {
+        double sum = 0;
+        double weights = 0;
+        const auto add = [&](double closeness, double weight) {
+            if (closeness < 0) return;
+            sum += closeness * weight;
+            weights += weight;
+        };
+        constexpr double weightOfTags = 4;
+        add(tags, weightOfTags);
+        for (const double number : numbers) add(number, 1);
+        add(key, 1);
+        return weights > 0 ? sum / weights : 0;
+    }
+};
+
+/// The tags of an item with what each tells: the fewer items have it, the more.
+class WeighedTags {
+  public:
+    WeighedTags(ContentStore& store, const Facts& facts, std::int64_t lastChunk) {
+        const auto countOf = [&](const std::string& value) {
+            double count = 0;
+            const auto id = store.term(value);
+            for (std::int64_t chunk = 0; id && chunk <= lastChunk; ++chunk) {
+                IdSet ids;
+                store.addPosting(*id, chunk, ids);
+                count += ids.count();
+            }
+            return std::max(count, 1.0);
+        };
+        const double items = countOf(term(TermKind::everything));
+        for (const std::string& tag : facts.tags) all_ += weights_[tag] = std::log2(1 + items / countOf(tag));
+    }
+
+    double weight(std::string_view tag) const {
+        const auto hit = weights_.find(tag);
+        return hit == weights_.end() ? 0 : hit->second;
+    }
+    /// How alike are the tags of an item that has so many, and of these in common what weighs so much.
+    double likeness(double shared, std::size_t tagsOfOther) const {
+        if (weights_.empty()) return kUnknown;
+        const double meanWeight = all_ / static_cast<double>(weights_.size());
+        // What the other has beyond the common tags counts as so many tags of middling weight.
+        const double beyond = std::max(0.0, static_cast<double>(tagsOfOther) - shared / meanWeight);
+        return std::min(1.0, shared / (all_ + beyond * meanWeight));
+    }
+
+  private:
+    std::map<std::string, double, std::less<>> weights_;
+    double all_ = 0;
+};
+
+Likeness likeness(const Facts& item, const WeighedTags& tags, const Facts& other) {
+    Likeness result;
+    double shared = 0;
+    for (const std::string& tag : other.tags) shared += tags.weight(tag);
+    result.tags = tags.likeness(shared, other.tags.size());
+    if (!item.key.empty() && !other.key.empty()) result.key = item.key == other.key ? 1 : 0;
+    for (std::size_t i = 0; i < kMeasures.size(); ++i) {
+        if (item.numbers[i] && other.numbers[i])
+            result.numbers[i] = closeness(kMeasures[i], *item.numbers[i], *other.numbers[i]);
     }
     return result;
 }
 
-struct Candidate {
-    double shared;  // weight of the tags in common
-    ItemId id;
-};
+/// What the index says of likeness, without reading items: tags and keys as they are, of numbers the most
+/// that is possible in their group.
+class LikenessIndex {
+  public:
+    LikenessIndex(ContentStore& store, const Facts& item, const WeighedTags& tags)
+        : store_(store),
+          item_(item),
+          tags_(tags),
+          everything_(store.term(term(TermKind::everything)).value_or(0)) {
+        const std::set<std::string> keys = keyTerms();
+        const std::string start = term(TermKind::tag);
+        store.forEachTerm(start, {"u", 1}, [&](TermId id, std::string_view value) {
+            tagTerms_.push_back({id, tags.weight(value), keys.contains(std::string(value)),
+                                 item.key.contains(std::string(value))});
+        });
+        for (std::size_t i = 0; i < kMeasures.size(); ++i) addGroups(i);
+    }
 
-/// The items that share most, best first.
-std::vector<Candidate> candidates(ContentStore& store, const std::vector<WeighedTag>& tags, ItemId self,
-                                  std::int64_t lastChunk, std::size_t count) {
-    const auto isBetter = [](const Candidate& a, const Candidate& b) {
-        return a.shared > b.shared || (a.shared == b.shared && a.id < b.id);
-    };
-    std::vector<Candidate> best;
-    std::vector<double> shared(kChunkSize);
-    for (std::int64_t chunk = 0; chunk <= lastChunk; ++chunk) {
-        std::fill(shared.begin(), shared.end(), 0);
-        for (const WeighedTag& tag : tags) {
-            IdSet ids;
-            store.addPosting(tag.term, chunk, ids);
-            ids.forEach([&](std::uint16_t id) {
-                shared[id] += tag.weight;
-                return true;
+    /// Calls `visit` with the most likeness that each item of the chunk can have.
+    template <typename Visit>
+    void forEachBound(std::int64_t chunk, Visit visit) {
+        entries_.assign(kChunkSize, {});
+        for (const TagOfIndex& tag : tagTerms_) {
+            forEachOf(tag.id, chunk, [&tag](Entry& entry) {
+                ++entry.tags;
+                entry.shared += tag.weight;
+                if (tag.isKey) ++entry.keys;
+                if (tag.isKeyOfItem) ++entry.commonKeys;
             });
         }
-        for (std::uint32_t id = 0; id < kChunkSize; ++id) {
-            const Candidate candidate{shared[id], chunk << kChunkBits | id};
-            if (candidate.shared <= 0 || candidate.id == self) continue;
-            if (best.size() == count && !isBetter(candidate, best.front())) continue;
-            best.push_back(candidate);
-            std::push_heap(best.begin(), best.end(), isBetter);
-            if (best.size() <= count) continue;
-            std::pop_heap(best.begin(), best.end(), isBetter);
-            best.pop_back();
+        for (const Group& group : groups_) {
+            forEachOf(group.id, chunk, [&group](Entry& entry) {
+                double& number = entry.numbers[group.measure];
+                number = std::max(number, group.closeness);
+            });
         }
+        IdSet all;
+        store_.addPosting(everything_, chunk, all);
+        all.forEach([&](std::uint16_t id) {
+            visit(chunk << kChunkBits | id, bound(entries_[id]));
+            return true;
+        });
     }
-    std::sort_heap(best.begin(), best.end(), isBetter);
-    return best;
-}
+
+  private:
+    struct TagOfIndex {
+        TermId id;
+        double weight;
+        bool isKey;
+        bool isKeyOfItem;
+    };
+    struct Group {
+        TermId id;
+        std::size_t measure;
+        double closeness;
+    };
+    /// Small, since a chunk has 65,536 of them.
+    struct Entry {
+        double shared = 0;
+        Closenesses numbers = kAllUnknown;
+        std::uint32_t tags = 0;
+        std::uint8_t keys = 0;
+        std::uint8_t commonKeys = 0;
+    };
+
+    void addGroups(std::size_t measure) {
+        const auto number = item_.numbers[measure];
+        if (!number) return;
+        const std::string field = term(TermKind::fineNumber, fieldOf(kMeasures[measure]));
+        store_.forEachTerm(field + '\0', field + '\1', [&](TermId id, std::string_view value) {
+            const NumberGroup group = numberGroupOfTerm(value);
+            if (kMeasures[measure].isRatio && group.last <= 0) return;
+            const double nearest = std::clamp(*number, group.first, group.last);
+            groups_.push_back({id, measure, closeness(kMeasures[measure], *number, nearest)});
+        });
+    }
+
+    template <typename Change>
+    void forEachOf(TermId term, std::int64_t chunk, Change change) {
+        IdSet ids;
+        store_.addPosting(term, chunk, ids);
+        ids.forEach([&](std::uint16_t id) {
+            change(entries_[id]);
+            return true;
+        });
+    }
+
+    double bound(const Entry& entry) const {
+        Likeness most{tags_.likeness(entry.shared, entry.tags), kUnknown, entry.numbers};
+        if (!item_.key.empty() && entry.keys > 0) {
+            const bool isSame = entry.keys == entry.commonKeys && entry.keys == item_.key.size();
+            most.key = isSame ? 1 : 0;
+        }
+        return most.mean();
+    }
+
+    ContentStore& store_;
+    const Facts& item_;
+    const WeighedTags& tags_;
+    TermId everything_;
+    std::vector<TagOfIndex> tagTerms_;
+    std::vector<Group> groups_;
+    std::vector<Entry> entries_;
+};
+
+/// By falling likeness, then by number.
+using Rank = std::pair<double, ItemId>;
 
 }  // namespace
 
+bool isComparable(const IndexedItem& item) {
+    return !factsOf(item).isEmpty();
+}
+
 std::vector<Similar> similarItems(ContentStore& store, ItemId id, std::size_t limit) {
-    std::vector<Similar> result;
     const auto item = store.item(id);
-    if (!item || limit == 0) return result;
-    // Those that share most tags are looked at closely; rhythm, tempo and key only put them in order.
-    constexpr std::size_t pool = 500;
+    if (!item || limit == 0) return {};
+    const Facts facts = factsOf(*item);
     const std::int64_t lastChunk = store.lastId() >> kChunkBits;
-    const std::vector<WeighedTag> tags = weighedTags(store, *item, lastChunk);
-    double own = 0;
-    for (const WeighedTag& tag : tags) own += tag.weight;
-    for (const Candidate& candidate : candidates(store, tags, id, lastChunk, std::max(pool, limit))) {
-        auto other = store.item(candidate.id);
-        if (!other) continue;
-        const auto tagsOfOther = static_cast<double>(tagTerms(*other).size());
-        const double meanWeight = own / static_cast<double>(tags.size());
-        // What the other has beyond the common tags counts as so many tags of middling weight.
-        const double sharedTags = candidate.shared / meanWeight;
-        const double beyond = std::max(0.0, tagsOfOther - sharedTags) * meanWeight;
-        const double tagSimilarity = std::min(1.0, candidate.shared / (own + beyond));
-        const double value = similarity(*item, *other, tagSimilarity);
-        result.push_back({candidate.id, std::move(*other), value});
+    const WeighedTags tags(store, facts, lastChunk);
+    LikenessIndex index(store, facts, tags);
+    std::vector<Rank> candidates;
+    for (std::int64_t chunk = 0; chunk <= lastChunk; ++chunk) {
+        index.forEachBound(chunk, [&](ItemId candidate, double bound) {
+            if (bound > 0 && candidate != id) candidates.emplace_back(-bound, candidate);
+        });
     }
-    std::stable_sort(result.begin(), result.end(),
-                     [](const Similar& a, const Similar& b) { return a.similarity > b.similarity; });
-    if (result.size() > limit) result.resize(limit);
+    // Items are read in the order of their bounds until none that is left can come before those that were.
+    std::make_heap(candidates.begin(), candidates.end(), std::greater<>());
+    std::map<Rank, IndexedItem> best;
+    while (!candidates.empty()) {
+        const Rank next = candidates.front();
+        if (best.size() == limit && best.rbegin()->first < next) break;
+        std::pop_heap(candidates.begin(), candidates.end(), std::greater<>());
+        candidates.pop_back();
+        auto other = store.item(next.second);
+        const double value = other ? likeness(facts, tags, factsOf(*other)).mean() : 0;
+        if (value <= 0) continue;
+        best.emplace(Rank{-value, next.second}, std::move(*other));
+        if (best.size() > limit) best.erase(std::prev(best.end()));
+    }
+    std::vector<Similar> result;
+    for (auto& [rank, other] : best) result.push_back({rank.second, std::move(other), -rank.first});
     return result;
 }
 

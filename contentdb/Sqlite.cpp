@@ -3,6 +3,8 @@
 #include "contentdb/ChecksumVfs.h"
 #include "platform/Text.h"
 
+#include <array>
+
 #include <fmt/format.h>
 #include <sqlite3.h>
 
@@ -29,6 +31,7 @@ ErrorCode codeOf(int result) {
 
 std::string_view reasonOf(int result, std::string_view otherwise) {
     if (result == SQLITE_IOERR_DATA) return "the database is damaged: a page does not match its checksum";
+    if (result == SQLITE_IOERR_SHORT_READ) return "the database is damaged: its end is missing";
     if ((result & 0xff) == SQLITE_CORRUPT) return "the database is damaged";
     if ((result & 0xff) == SQLITE_NOTADB) return "not a content database, or a damaged one";
     if ((result & 0xff) == SQLITE_BUSY) return "another process is writing to the database";
@@ -74,6 +77,21 @@ std::int64_t Connection::number(const char* sql) {
 std::string Connection::text(const char* sql) {
     Statement statement(*this, sql);
     return statement.step() ? std::string(statement.bytes(0)) : std::string();
+}
+
+void Connection::checkPages() {
+    // A page whose writing was interrupted by a power failure is whole in the log.
+    run("PRAGMA wal_checkpoint(PASSIVE)");
+    sqlite3_file* file = nullptr;
+    sqlite3_file_control(handle_, "main", SQLITE_FCNTL_FILE_POINTER, &file);
+    std::array<char, kPageSize> page{};
+    sqlite3_int64 size = 0;
+    int result = file->pMethods->xFileSize(file, &size);
+    for (sqlite3_int64 at = 0; result == SQLITE_OK && at < size; at += kPageSize)
+        result = file->pMethods->xRead(file, page.data(), kPageSize, at);
+    if (result == SQLITE_OK) return;
+    throw DatabaseFailure(codeOf(result),
+                          fmt::format("{}: {}", printable(path_), reasonOf(result, sqlite3_errstr(result))));
 }
 
 bool Connection::isInTransaction() const {

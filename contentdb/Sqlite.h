@@ -41,6 +41,9 @@ class Connection {
     /// The one number that a statement answers; 0 when it answers none.
     std::int64_t number(const char* sql);
     std::string text(const char* sql);
+    /// Reads every page of the file, so that each is held against its checksum; for a writer, as it takes
+    /// what the log has into the file before. @cost  That of reading the file.
+    void checkPages();
     [[noreturn]] void fail(std::string_view doing) const;
     const std::string& path() const { return path_; }
     bool isInTransaction() const;
@@ -93,13 +96,15 @@ class Transaction {
     bool isOpen_ = true;
 };
 
-/// Runs `work` and answers its result; a failure becomes the error and `otherwise` the result.
+/// Runs `work` and answers its result; a failure becomes the error and `otherwise` the result. That of a
+/// damaged database names the remedy.
 template <typename Result, typename Work>
 Result guarded(Error* error, Result otherwise, Work work) {
     try {
         return work();
     } catch (const DatabaseFailure& failure) {
-        qvct::fail(error, failure.code(), failure.what());
+        const char* remedy = failure.code() == kErrorMalformed ? "; `index --check` builds it anew" : "";
+        qvct::fail(error, failure.code(), std::string(failure.what()) + remedy);
         return otherwise;
     }
 }

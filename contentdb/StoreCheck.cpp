@@ -31,7 +31,9 @@ void ContentStore::checkAll() {
                                                            printable(connection_.path()), what));
     };
     const std::string verdict = connection_.text("PRAGMA integrity_check(1)");
-    if (verdict != "ok") damaged(verdict);
+    // Of several lines the last one says what is wrong, and where.
+    if (verdict != "ok")
+        damaged(fmt::format("its pages do not fit together ({})", verdict.substr(verdict.rfind('\n') + 1)));
     Tally said;
     for (ItemId id = 1, last = lastId(); id <= last; ++id) {
         const auto its = item(id);

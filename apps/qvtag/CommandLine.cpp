@@ -43,6 +43,10 @@ void append(const CommandDescription& command, std::vector<const CommandDescript
 
 }  // namespace
 
+std::string refuseNegative(const std::string& text) {
+    return text.starts_with('-') ? text + " is less than 0" : "";
+}
+
 CommandDescription describeCommandLine(const CLI::App& app) {
     return describe(app, {});
 }

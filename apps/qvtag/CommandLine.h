@@ -29,6 +29,9 @@ struct CommandDescription {
     std::vector<CommandDescription> commands;
 };
 
+/// Accepts whole numbers from 0, also hexadecimal ones (0x100); the parser alone takes -1 for the largest.
+std::string refuseNegative(const std::string& text);
+
 /// Hidden commands and options are left out.
 CommandDescription describeCommandLine(const CLI::App& app);
 

@@ -43,8 +43,7 @@ void check(const Options& options, ToolContext& context) {
         }
         Json failures = Json::array();
         database->forEachFailure([&](const IndexedItem& item) {
-            if (context.format == Format::table)
-                fmt::print("{}: {}\n", printable(item.path), printable(item.failure));
+            if (context.format == Format::table) fmt::print("{}\n", messageOfFailure(item));
             failures.push_back({{"path", item.path}, {"reason", item.failure}});
             return true;
         });

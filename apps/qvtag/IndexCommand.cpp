@@ -105,15 +105,22 @@ void addIndexCommand(CLI::App& app, ToolContext& context) {
         ->type_name("FILE");
     command->add_flag("--prune", index.prune, "Take items out whose files are gone");
     command->add_flag("--retry", index.retryFailed, "Read items again that failed before");
+    command->add_flag("--check", index.check,
+                      "Read the database whole first; what is damaged is built anew. Without, only its pages "
+                      "are held against their checksums");
     addServicesOption(*command, options->services);
-    auto* part = command->add_option("--part", index.part, "Index only part I of the items")->type_name("I");
+    auto* part = command->add_option("--part", index.part, "Index only part I of the items")
+                     ->type_name("I")
+                     ->check(CLI::Range(1, 1000000));
     auto* parts = command->add_option("--parts", index.parts, "Into how many parts the items are divided")
-                      ->type_name("N");
+                      ->type_name("N")
+                      ->check(CLI::Range(1, 1000000));
     part->needs(parts);
     parts->needs(part);
-    command->add_option("--workers", index.workers, "Processes that read items (default: one a processor)");
+    command->add_option("--workers", index.workers, "Processes that read items (default: one a processor)")
+        ->check(CLI::Range(0, 1024));
     command->add_option("--time-limit", options->secondsPerItem, "Seconds that one item may take")
-        ->check(CLI::PositiveNumber);
+        ->check(CLI::Range(1, 86400));
     command->footer(
         "Example:\n  qvtag index ~/Music/Loops --db loops.db\n"
         "  qvtag index /sounds --db part2.db --part 2 --parts 4");

@@ -1,7 +1,9 @@
+#include "CommandLine.h"
 #include "Commands.h"
 #include "PropertyListOutput.h"
 #include "RecordOutput.h"
 #include "indexing/TGRTIndexableContentObject.h"
+#include "platform/QVContentTaggingTypes.h"
 #include "platform/Text.h"
 
 #include <memory>
@@ -23,17 +25,21 @@ Json jsonOfObject(const URL& url, const ContentObject& object) {
     Json json;
     json["path"] = url.path();
     json["displayName"] = object.displayName();
+    json["type"] = QVContentTaggingTypes::nameForFileType(object.fileType());
     json["fileType"] = object.fileType();
     json["subFileType"] = object.subFileType();
     json["previewAvailable"] = object.previewAvailable();
-    json["packageIdentifiers"] = object.packageIdentifiers();
-    json["dependencyItems"] = Json::array();
+    json["packages"] = object.packageIdentifiers();
+    json["dependencies"] = Json::array();
     for (const auto& item : object.dependencyItems())
-        json["dependencyItems"].push_back({{"UUID", item->UUID()}, {"path", item->path()}});
+        json["dependencies"].push_back({{"uuid", item->UUID()}, {"path", item->path()}});
     json["taggings"] = Json::array();
     for (const auto& tagging : sortedTaggings(object.taggingDatas()))
         json["taggings"].push_back(jsonOfTagging(*tagging));
-    json["values"] = jsonOfPropertyList(TGRTKeyValue::keyValueDictionaryForKeyValues(object.valueDatas()));
+    json["keyValues"] = Json::object();
+    const PropertyList values = TGRTKeyValue::keyValueDictionaryForKeyValues(object.valueDatas());
+    for (const auto& [key, value] : *values.dictionary())
+        json["keyValues"][key] = value.real() ? jsonOfNumber(*value.real()) : jsonOfPropertyList(value);
     return json;
 }
 
@@ -94,7 +100,8 @@ void addObjectCommand(CLI::App& app, ToolContext& context) {
                      "Sum of 1: tags of retired vocabularies, and what loop keywords among them are called "
                      "today; 2: what retired tags are called today; 4: tags that the taxonomy does not "
                      "know; 256: items that store nothing")
-        ->type_name("N");
+        ->type_name("N")
+        ->check(CLI::Validator(refuseNegative, ""));
     command->footer("Example:\n  qvtag object --json --options 258 Loops");
     command->callback([options, &context] { run(*options, context); });
 }

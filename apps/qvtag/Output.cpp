@@ -1,5 +1,6 @@
 #include "Output.h"
 
+#include "contentdb/Decimal.h"
 #include "platform/Text.h"
 
 #include <algorithm>
@@ -45,6 +46,12 @@ void printJson(const Json& items, Format format) {
         return;
     }
     for (const Json& item : items) fmt::print("{}\n", jsonText(item, true));
+}
+
+Json jsonOfNumber(double number) {
+    constexpr double exact = 9007199254740992;  // up to which every whole number has its own double
+    if (std::trunc(number) == number && std::abs(number) <= exact) return static_cast<std::int64_t>(number);
+    return contentdb::decimalOf(number);
 }
 
 Json jsonOfTagging(const TGRTTagging& tagging) {

@@ -33,6 +33,8 @@ std::string jsonText(const Json& value, bool onOneLine);
 /// Prints the items: as an array, or one a line.
 void printJson(const Json& items, Format format);
 
+/// A number as it was meant: whole ones without a fraction, those of single precision as their decimal.
+Json jsonOfNumber(double number);
 /// {"label","parent","category","level","auto","weightLevel"}, null where absent.
 Json jsonOfTagging(const TGRTTagging& tagging);
 /// Sorted by category, label and level, for output that is the same in every run.

@@ -1,5 +1,7 @@
+#include "CommandLine.h"
 #include "Commands.h"
 #include "contentdb/ContentDatabase.h"
+#include "contentdb/Decimal.h"
 #include "platform/QVContentTaggingTypes.h"
 #include "platform/Text.h"
 #include "platform/Url.h"
@@ -41,7 +43,7 @@ std::string_view nameOf(Provenance provenance) {
 
 /// In tenths; the tag's default level stands in where the tagging has none.
 std::int64_t weightLevelOf(const IndexedTagging& tagging) {
-    const auto level = tagging.level ? TGRTLevel::levelWithWeight(*tagging.level) : nullptr;
+    const auto level = tagging.level ? TGRTLevel::levelWithWeight(decimalOf(*tagging.level)) : nullptr;
     const auto tag = TGRTTaxonomy::defaultTaxonomy()->findTagForLabel(tagging.label, tagging.category);
     const auto known = TGRTTagging::initWithTag(tag, level);
     constexpr float tenths = 10;
@@ -53,7 +55,7 @@ Json jsonOf(const IndexedTagging& tagging) {
     json["label"] = tagging.label;
     json["parent"] = tagging.ancestors.empty() ? Json() : Json(tagging.ancestors[0]);
     json["category"] = tagging.category;
-    json["level"] = tagging.level ? Json(*tagging.level) : Json();
+    json["level"] = tagging.level ? Json(decimalOf(*tagging.level)) : Json();
     json["auto"] = tagging.isAuto;
     json["weightLevel"] = weightLevelOf(tagging);
     json["provenance"] = nameOf(tagging.provenance);
@@ -74,8 +76,11 @@ Json jsonOf(ContentDatabase& database, ItemId id, const IndexedItem& item) {
     json["taggings"] = Json::array();
     for (const IndexedTagging& tagging : item.taggings) json["taggings"].push_back(jsonOf(tagging));
     json["keyValues"] = Json::object();
-    for (const IndexedValue& value : item.values)
-        std::visit([&](const auto& its) { json["keyValues"][value.key] = its; }, value.value);
+    for (const IndexedValue& value : item.values) {
+        const auto* number = std::get_if<double>(&value.value);
+        json["keyValues"][value.key] =
+            number != nullptr ? jsonOfNumber(*number) : Json(std::get<std::string>(value.value));
+    }
     json["packages"] = item.packs;
     json["dependencies"] = Json::array();
     for (const IndexedDependency& dependency : item.dependencies)
@@ -223,7 +228,9 @@ CLI::App* addCommand(CLI::App& app, const char* name, const char* what,
 void addSearchCommands(CLI::App& app, ToolContext& context) {
     const auto options = std::make_shared<Options>();
     const auto addLimit = [&options](CLI::App* command) {
-        command->add_option("--limit", options->limit, "Most items to show")->capture_default_str();
+        command->add_option("--limit", options->limit, "Most items to show")
+            ->capture_default_str()
+            ->check(CLI::Validator(refuseNegative, ""));
     };
     auto* searching = addCommand(app, "search", "Finds items in a database", options, context, searchItems);
     searching->add_option("query", options->words, "What to find; a query that begins with - goes behind --");

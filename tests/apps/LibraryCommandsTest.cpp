@@ -173,7 +173,12 @@ TEST_F(LibraryCommands, NameWhatCannotBeRead) {
     EXPECT_EQ(result.status, 1);
     EXPECT_THAT(result.errors, HasSubstr("broken.wav"));
     EXPECT_EQ(result.json()["failed"], 1);
-    EXPECT_THAT(runTool({"db", "check", folder_.path("db")}).output, HasSubstr("broken.wav"));
+    const std::string check = runTool({"db", "check", folder_.path("db")}).output;
+    EXPECT_THAT(check, testing::StartsWith(folder_.path("sounds/broken.wav: ")));
+    EXPECT_EQ(check.find("broken.wav"), check.rfind("broken.wav"));
+    const ToolResult ofFile =
+        runTool({"index", "--db", folder_.path("db"), folder_.path("sounds/broken.wav")});
+    EXPECT_THAT(ofFile.errors, HasSubstr("broken.wav: is a file, not a folder"));
 }
 
 TEST_F(LibraryCommands, CountTagsAndFindSimilar) {
@@ -187,6 +192,20 @@ TEST_F(LibraryCommands, CountTagsAndFindSimilar) {
         run({"similar", folder_.path("sounds/Drums/Dark Kick 01.wav"), "--limit", "1"}).json();
     ASSERT_EQ(similar.size(), 1U);
     EXPECT_EQ(similar[0]["displayName"], "Techno Kick");
+}
+
+TEST_F(LibraryCommands, FindNumbersAsTheyAreWritten) {
+    folder_.write("sounds/Odd.wav",
+                  Wav().file(Wav().format() + Wav().acid(0, 60, 7, 86.6F) + Wav().data(5000)));
+    EXPECT_EQ(runTool({"write", "--add", "Sound Descriptors/Cold / Warm=0.3", folder_.path("sounds/Odd.wav")})
+                  .status,
+              0);
+    settle();
+    index();
+    const json found = run({"search", "bpm:86.6 level:\"Cold / Warm\"=0.3"}).json();
+    ASSERT_EQ(found.size(), 1U);
+    EXPECT_EQ(found[0]["keyValues"]["Tempo"], 86.6);
+    EXPECT_EQ(found[0]["taggings"][0]["level"], 0.3);
 }
 
 TEST_F(LibraryCommands, PartsMergeToTheWhole) {
@@ -211,6 +230,25 @@ TEST_F(LibraryCommands, PartsMergeToTheWhole) {
     }
 }
 
+TEST_F(LibraryCommands, RefuseNumbersOutOfRange) {
+    index();
+    const std::string kick = folder_.path("sounds/Drums/Dark Kick 01.wav");
+    const struct {
+        std::vector<std::string> command;
+        std::string reason;
+    } cases[] = {
+        {{"search", "--db", folder_.path("db"), "--limit", "-3"}, "-3 is less than 0"},
+        {{"similar", "--db", folder_.path("db"), "--limit=-1", kick}, "-1 is less than 0"},
+        {{"object", "--options", "-1", kick}, "-1 is less than 0"},
+        {{"index", "--db", folder_.path("db"), "--time-limit", "0", "."}, "0 not in range 1 to 86400"},
+        {{"index", "--db", folder_.path("db"), "--workers", "-1", "."}, "-1 not in range 0 to 1024"}};
+    for (const auto& [command, reason] : cases) {
+        const ToolResult result = runTool(command);
+        EXPECT_EQ(result.status, 2) << reason;
+        EXPECT_THAT(result.errors, HasSubstr(reason));
+    }
+}
+
 TEST_F(LibraryCommands, PointAtTheFaultOfAQuery) {
     index();
     const ToolResult result = run({"search", "kick colour:red"});
@@ -227,9 +265,17 @@ TEST_F(LibraryCommands, TellWhatIsWrongWithADatabase) {
     for (const ToolResult& result : {run({"search", "kick"}), runTool({"db", "check", folder_.path("db")})}) {
         EXPECT_EQ(result.status, 1);
         EXPECT_THAT(result.errors, HasSubstr("damaged"));
+        EXPECT_THAT(result.errors, HasSubstr("`index --check` builds it anew"));
     }
     const ToolResult rebuilt = index();
     EXPECT_THAT(rebuilt.errors, HasSubstr("built anew"));
+    // A page that does not hold what it should.
+    bytes = readAll(folder_.path("db"));
+    bytes[3 * 8192 + 100] = static_cast<char>(bytes[3 * 8192 + 100] ^ 4);
+    folder_.write("broken", bytes);
+    const std::string check = runTool({"db", "check", folder_.path("broken")}).errors;
+    EXPECT_EQ(std::count(check.begin(), check.end(), '\n'), 1) << check;
+    EXPECT_THAT(check, testing::Not(HasSubstr("***")));
     EXPECT_EQ(rebuilt.json()["indexed"], 5);
     EXPECT_EQ(run({"search", "kick"}, "none").status, 1);
 }

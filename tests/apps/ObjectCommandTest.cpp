@@ -1,3 +1,4 @@
+#include "support/AudioFixtures.h"
 #include "support/RunTool.h"
 
 #include <set>
@@ -35,10 +36,10 @@ TEST(ObjectCommand, PrintsOneObjectAnItem) {
     EXPECT_EQ(object["fileType"], 6);
     EXPECT_EQ(object["subFileType"], 0);
     EXPECT_EQ(object["previewAvailable"], false);
-    EXPECT_EQ(object["packageIdentifiers"], json({"0010_toybox"}));
-    EXPECT_EQ(object["dependencyItems"][0]["path"], "/a.wav");
-    EXPECT_EQ(object["dependencyItems"][0]["UUID"].get<std::string>().size(), 36U);
-    EXPECT_EQ(object["values"], json({{"Tempo", 120}}));
+    EXPECT_EQ(object["packages"], json({"0010_toybox"}));
+    EXPECT_EQ(object["dependencies"][0]["path"], "/a.wav");
+    EXPECT_EQ(object["dependencies"][0]["uuid"].get<std::string>().size(), 36U);
+    EXPECT_EQ(object["keyValues"], json({{"Tempo", 120}}));
     ASSERT_EQ(object["taggings"].size(), 2U);
     EXPECT_EQ(object["taggings"][0]["label"], "CST");
 
@@ -47,6 +48,34 @@ TEST(ObjectCommand, PrintsOneObjectAnItem) {
     const std::string table = runTool({"object", path}).output;
     for (const char* text : {"Vocal", "0010_toybox", "/a.wav", "Tempo 120", "CST"})
         EXPECT_THAT(table, HasSubstr(text));
+}
+
+TEST(ObjectCommand, SaysTheSameAsASearch) {
+    const TemporaryFolder folder;
+    const std::string strip = folder.write("sounds/Vox.cst", "settings");
+    folder.write("sounds/Vox.cst.plist", kStripRecord);
+    const std::string loop = folder.write(
+        "sounds/Odd.wav", Wav().file(Wav().format() + Wav().acid(2, 57, 7, 86.6F) + Wav().data(5000)));
+    EXPECT_EQ(runTool({"write", "--add", "Sound Descriptors/Cold / Warm=0.3", loop}).status, 0);
+    runTool({"index", "--services", "content-type", folder.path("sounds"), "--db", folder.path("db")});
+    const json found = runTool({"search", "", "--json", "--db", folder.path("db")}).json();
+    const json objects = runTool({"object", "--json", loop, strip}).json();
+    ASSERT_EQ(found.size(), 2U);
+    for (std::size_t i = 0; i < 2; ++i) {
+        json expected = found[i];
+        for (const char* ofDatabaseOnly : {"id", "earlierPaths", "taggings"}) expected.erase(ofDatabaseOnly);
+        json object = objects[i];
+        object.erase("taggings");
+        expected["keyValues"].erase("Tempo");  // the index takes one from the sound, too
+        object["keyValues"].erase("Tempo");
+        for (json* its : {&expected, &object}) {
+            for (json& dependency : (*its)["dependencies"])
+                EXPECT_EQ(dependency.erase("uuid"), 1U);  // made anew
+        }
+        EXPECT_EQ(expected.dump(), object.dump());
+    }
+    EXPECT_EQ(found[1]["keyValues"]["Tempo"].dump(), "120");
+    EXPECT_EQ(found[1]["dependencies"].size(), 1U);
 }
 
 TEST(ObjectCommand, NamesWhatFails) {

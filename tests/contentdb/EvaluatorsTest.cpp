@@ -2,6 +2,8 @@
 
 #include <algorithm>
 #include <cmath>
+#include <map>
+#include <set>
 
 #include <fmt/format.h>
 #include <gmock/gmock.h>
@@ -161,6 +163,141 @@ TEST(Evaluators, CountTagsOfTheMatchesAsASearchForThemWould) {
         EXPECT_EQ(inMemory(*query, items, items.size()).size(), static_cast<std::size_t>(facet.count))
             << text;
     }
+}
+
+using Tags = std::set<std::pair<std::string, std::string>>;
+
+Tags tagsOf(const IndexedItem& item) {
+    Tags tags;
+    for (const IndexedTagging& tagging : item.taggings) {
+        tags.emplace(tagging.label, tagging.category);
+        for (const std::string& above : tagging.ancestors) tags.emplace(above, tagging.category);
+    }
+    return tags;
+}
+
+Tags keysOf(Tags tags) {
+    std::erase_if(tags, [](const auto& tag) { return tag.first != "A" && tag.first != "CSharp"; });
+    return tags;
+}
+
+std::optional<double> levelOf(const IndexedItem& item, const char* label) {
+    for (const IndexedTagging& tagging : item.taggings) {
+        if (tagging.label == label && tagging.level) return *tagging.level;
+    }
+    return std::nullopt;
+}
+
+std::optional<double> octaveOf(const IndexedItem& item) {
+    for (const IndexedValue& value : item.values) {
+        if (value.key == "Tempo") return std::log2(std::get<double>(value.value));
+    }
+    return std::nullopt;
+}
+
+/// How similar each item is to the one, by comparing it with all.
+std::vector<double> similarities(const std::vector<IndexedItem>& items, const IndexedItem& one) {
+    std::map<std::pair<std::string, std::string>, double> counts;
+    double described = 0;
+    for (const IndexedItem& item : items) {
+        if (!item.failure.empty()) continue;
+        ++described;
+        for (const auto& tag : tagsOf(item)) ++counts[tag];
+    }
+    const auto weight = [&](const auto& tag) { return std::log2(1 + described / counts[tag]); };
+    const Tags tags = tagsOf(one);
+    double own = 0;
+    for (const auto& tag : tags) own += weight(tag);
+    std::vector<double> result;
+    for (const IndexedItem& other : items) {
+        double sum = 0;
+        double weights = 0;
+        const auto add = [&](std::optional<double> a, std::optional<double> b, double half) {
+            if (!a || !b) return;
+            sum += 1 / (1 + std::abs(*a - *b) / half);
+            ++weights;
+        };
+        add(levelOf(one, "Rhythmic Density"), levelOf(other, "Rhythmic Density"), 0.2);
+        add(levelOf(one, "Rhythmic Complexity"), levelOf(other, "Rhythmic Complexity"), 0.2);
+        add(octaveOf(one), octaveOf(other), 0.1375);
+        const Tags tagsOfOther = tagsOf(other);
+        if (!tags.empty()) {
+            double shared = 0;
+            for (const auto& tag : tagsOfOther) shared += tags.contains(tag) ? weight(tag) : 0;
+            const double mean = own / static_cast<double>(tags.size());
+            const double beyond = static_cast<double>(tagsOfOther.size()) * mean - shared;
+            sum += 4 * std::min(1.0, shared / (own + std::max(0.0, beyond)));
+            weights += 4;
+        }
+        if (!keysOf(tags).empty() && !keysOf(tagsOfOther).empty()) {
+            sum += keysOf(tags) == keysOf(tagsOfOther) ? 1 : 0;
+            ++weights;
+        }
+        result.push_back(&other == &one || weights == 0 || !other.failure.empty() ? 0 : sum / weights);
+    }
+    return result;
+}
+
+void expectNearest(ContentDatabase& database, const std::vector<IndexedItem>& items, std::size_t at,
+                   std::size_t limit) {
+    const std::vector<double> all = similarities(items, items[at]);
+    std::vector<double> best = all;
+    std::sort(best.rbegin(), best.rend());
+    best.resize(std::min(limit, best.size()));
+    std::erase_if(best, [](double similarity) { return similarity <= 0; });
+    const auto found = database.similar(items[at].path, limit);
+    ASSERT_TRUE(found);
+    ASSERT_EQ(found->size(), best.size());
+    std::pair<double, ItemId> before{-2, 0};
+    for (std::size_t rank = 0; rank < best.size(); ++rank) {
+        const Similar& one = (*found)[rank];
+        EXPECT_NEAR(one.similarity, best[rank], 1e-6) << rank;
+        EXPECT_NEAR(one.similarity, all[static_cast<std::size_t>(one.id - 1)], 1e-6) << rank;
+        EXPECT_LT(before, std::pair(-one.similarity, one.id)) << rank;
+        before = {-one.similarity, one.id};
+    }
+}
+
+TEST(Evaluators, FindTheSimilarItemsThatComparingAllWouldFind) {
+    const TemporaryFolder folder;
+    std::vector<IndexedItem> items = generatedItems(9, 700);
+    // Tempos that stand in one group of the index and are as far from another as to decide.
+    for (std::size_t i = 0; i < items.size(); i += 2) {
+        items[i].taggings.resize(std::min<std::size_t>(items[i].taggings.size(), 1));
+        items[i].values = {{"Tempo", 120 + 0.01 * static_cast<double>(i * 37 % 100)}};
+    }
+    items[7].failure = "cannot be read";
+    items[8].taggings.clear();
+    items[8].values = {{"Tempo", 126.5}};
+    items[9].taggings.clear();
+    items[9].values.clear();
+    store(folder.path("db"), items);
+    const auto database = ContentDatabase::open(folder.path("db"));
+    for (std::size_t at = 8; at < 120; at += at == 8 ? 2 : 1) {
+        if (tagsOf(items[at]).empty() && !octaveOf(items[at])) continue;
+        for (const std::size_t limit : {std::size_t{1}, std::size_t{20}, items.size()})
+            expectNearest(*database, items, at, limit);
+    }
+    Error error;
+    EXPECT_FALSE(database->similar(items[7].path, 5, &error));
+    EXPECT_THAT(error.message, testing::HasSubstr("could not be read when it was indexed"));
+    EXPECT_FALSE(database->similar(items[9].path, 5, &error));
+    EXPECT_THAT(error.message, testing::HasSubstr("no tags, rhythm or tempo"));
+}
+
+TEST(Evaluators, FindTheSimilarItemsAmongManyOfTheSameTags) {
+    const TemporaryFolder folder;
+    std::vector<IndexedItem> items = generatedItems(2, 900);
+    for (std::size_t i = 0; i < items.size(); ++i) {
+        items[i].taggings = {{"Kick", "Source", {"Drums"}, {}, Provenance::stored, {}}};
+        items[i].values = {{"Tempo", i % 45 == 44 ? 140.0 : 90.0}};
+    }
+    store(folder.path("db"), items);
+    const auto database = ContentDatabase::open(folder.path("db"));
+    const auto found = database->similar(items[89].path, 19);
+    ASSERT_TRUE(found);
+    for (const Similar& one : *found) EXPECT_EQ(one.id % 45, 0) << one.id;
+    expectNearest(*database, items, 89, 19);
 }
 
 }  // namespace

@@ -429,6 +429,44 @@ TEST_F(Indexing, OfPartsInOneDatabaseMissesNothingOfTheOthers) {
     EXPECT_EQ(names().size(), 39U);
 }
 
+TEST_F(Indexing, OfAPartHidesNothingMissingFromOtherRuns) {
+    const auto run = [this](unsigned part) {
+        return index([part](IndexOptions& options) {
+            options.prune = true;
+            options.part = std::max(part, 1U);
+            options.parts = part == 0 ? 1 : 2;
+        });
+    };
+    for (const unsigned next : {0U, 2U}) {
+        for (int i = 0; i < 40; ++i) write(fmt::format("{}/Kick {}.wav", next, i), std::to_string(i));
+        settle();
+        run(0);
+        std::filesystem::remove_all(fmt::format("{}/{}", library(), next));
+        std::filesystem::create_directory(fmt::format("{}/{}", library(), next));
+        const std::uint64_t pruned = run(1).pruned;
+        EXPECT_GT(pruned, 0U);
+        EXPECT_LT(pruned, 40U);
+        EXPECT_EQ(run(1).missing, 0U);
+        EXPECT_EQ(run(next).pruned, 40 - pruned);
+        EXPECT_THAT(names(), testing::IsEmpty());
+    }
+    // What only the other part lacks.
+    for (int i = 0; i < 6; ++i) write(fmt::format("Kick {}.wav", i), std::to_string(i));
+    settle();
+    run(0);
+    const std::string other = folder_.path("only");
+    index([&other](IndexOptions& options) {
+        options.database = other;
+        options.part = 2;
+        options.parts = 2;
+    });
+    const std::vector<std::string> ofOther = names("", other);
+    ASSERT_FALSE(ofOther.empty());
+    for (const std::string& name : ofOther) std::filesystem::remove(library() + "/" + name + ".wav");
+    EXPECT_EQ(run(1).missing, 0U);
+    EXPECT_EQ(run(0).pruned, ofOther.size());
+}
+
 TEST_F(Indexing, RebuildsADamagedDatabaseAndKeepsTheOld) {
     for (int i = 0; i < 300; ++i) write(fmt::format("Kick {}.wav", i), "");
     settle();
@@ -440,6 +478,59 @@ TEST_F(Indexing, RebuildsADamagedDatabaseAndKeepsTheOld) {
     EXPECT_EQ(names().size(), 300U);
     EXPECT_THAT(notes_, ElementsAre(HasSubstr("built anew")));
     EXPECT_EQ(readAll(database() + ".damaged"), bytes);
+}
+
+TEST_F(Indexing, FindsDamageOnAnyPageAndKeepsAllFolders) {
+    for (int i = 0; i < 150; ++i) {
+        write(fmt::format("{}/Kick {}.wav", i % 3, i), std::to_string(i));
+        folder_.write(fmt::format("elsewhere/{}/Snare {}.wav", i % 3, i), std::to_string(-i - 1));
+    }
+    settle();
+    index([this](IndexOptions& options) { options.folders.push_back(folder_.path("elsewhere")); });
+    std::filesystem::rename(library() + "/0/Kick 0.wav", library() + "/1/Moved.wav");
+    settle();
+    EXPECT_EQ(index().moved, 1U);
+    const std::string intact = readAll(database());
+    const std::vector<std::string> all = names();
+    const std::size_t pages = intact.size() / 8192;
+    ASSERT_GT(pages, 15U);
+    std::size_t withHistory = 0;
+    for (std::size_t page = 1; page < pages; ++page) {
+        std::string bytes = intact;
+        bytes[page * 8192 + 4000] = static_cast<char>(bytes[page * 8192 + 4000] ^ 1);
+        folder_.write("db", bytes);
+        notes_.clear();
+        const IndexProgress progress = index([](IndexOptions& options) { options.prune = true; });
+        EXPECT_THAT(notes_, ElementsAre(HasSubstr("built anew, with"))) << page;
+        EXPECT_LT(progress.described, 150U) << page;
+        EXPECT_THAT(names(), testing::UnorderedElementsAreArray(all)) << page;
+        const auto rebuilt = ContentDatabase::open(database());
+        EXPECT_TRUE(rebuilt->check()) << page;
+        withHistory += rebuilt->earlierPaths(rebuilt->item(library() + "/1/Moved.wav")->id)->size();
+    }
+    EXPECT_GT(withHistory, pages - 6);
+    // The first page says what all others are.
+    folder_.write("db", intact.substr(0, 4000) + "?" + intact.substr(4001));
+    notes_.clear();
+    index();
+    EXPECT_THAT(notes_, ElementsAre(HasSubstr("which other folders were in it could not be read")));
+    EXPECT_EQ(names("kick,moved").size(), 150U);
+}
+
+TEST_F(Indexing, ReadsTheDatabaseWholeWhenTold) {
+    for (int i = 0; i < 20; ++i) write(fmt::format("Kick {}.wav", i), std::to_string(i));
+    settle();
+    index();
+    // Nothing that a checksum would tell.
+    Connection(database(), Connection::Access::readWrite).run("DELETE FROM posting WHERE key % 7 = 3");
+    Error error;
+    EXPECT_FALSE(ContentDatabase::open(database())->check(&error));
+    EXPECT_THAT(error.message,
+                HasSubstr("the index does not say what the items say; `index --check` builds"));
+    index([](IndexOptions& options) { options.check = true; });
+    EXPECT_THAT(notes_, ElementsAre(HasSubstr("built anew")));
+    EXPECT_TRUE(ContentDatabase::open(database())->check());
+    EXPECT_EQ(names("kick").size(), 20U);
 }
 
 TEST_F(Indexing, RefusesASecondRunAForeignFileAndAMissingFolder) {

@@ -3,8 +3,11 @@
 
 #include <filesystem>
 #include <fstream>
+#include <functional>
 
 #include <gmock/gmock.h>
+#include <sys/wait.h>
+#include <unistd.h>
 
 namespace qvct::test {
 namespace {
@@ -84,6 +87,53 @@ TEST(Store, IsNotThereBeforeTheBatchIsWhole) {
         for (ItemId id = 1; id <= 10; ++id) writer.remove(id);
     }
     EXPECT_EQ(foundNames(path, "").size(), 10U);
+}
+
+/// What `work` answers in a process of a user who may write nowhere here.
+std::string asStranger(const std::function<std::string()>& work) {
+    int ends[2];
+    EXPECT_EQ(::pipe(ends), 0);
+    const pid_t child = ::fork();
+    if (child == 0) {
+        constexpr unsigned nobody = 65534;
+        const bool isStranger = ::setgid(nobody) == 0 && ::setuid(nobody) == 0;
+        const std::string answer = isStranger ? work() : "cannot become another";
+        ::_exit(::write(ends[1], answer.data(), answer.size()) > 0 ? 0 : 1);
+    }
+    ::close(ends[1]);
+    std::string answer(4096, '\0');
+    answer.resize(
+        static_cast<std::size_t>(std::max<ssize_t>(0, ::read(ends[0], answer.data(), answer.size()))));
+    ::close(ends[0]);
+    ::waitpid(child, nullptr, 0);
+    return answer;
+}
+
+TEST(Store, IsReadByOneWhoMayNotWriteThere) {
+    if (::geteuid() != 0) GTEST_SKIP() << "only root can become another user";
+    const TemporaryFolder folder;
+    const std::string path = folder.path("read-only/db");
+    std::filesystem::create_directory(folder.path("read-only"));
+    store(path, generatedItems(4, 10));
+    for (const std::string& each : {folder.path(), folder.path("read-only")})
+        std::filesystem::permissions(each, std::filesystem::perms(0555));
+    const auto count = [&path] {
+        Error error;
+        const auto database = ContentDatabase::open(path, &error);
+        const auto totals = database ? database->totals(&error) : std::nullopt;
+        return totals && database->check(&error) ? std::to_string(totals->items) : error.message;
+    };
+    EXPECT_EQ(asStranger(count), "10");
+    // What is only in the log is not passed over.
+    {
+        const auto writing = openDatabase(path, Access::write);
+        writing->run("INSERT INTO setting VALUES ('other', 1)");
+        std::filesystem::copy(path, path + "2");
+        std::filesystem::copy(path + "-wal", path + "2-wal");
+    }
+    for (const char* part : {"", "-wal"}) std::filesystem::rename(path + "2" + part, path + part);
+    EXPECT_THAT(asStranger(count), HasSubstr("its last changes are still in the log beside it"));
+    EXPECT_EQ(count(), "10");
 }
 
 TEST(Store, RefusesWhatIsNoContentDatabaseOfThisVersion) {
