@@ -269,6 +269,32 @@ TEST(LoopFileRead, HostileAndDamagedFiles) {
     }
 }
 
+TEST(LoopFileRead, CountsTheFramesOfPackedAiffAudio) {
+    struct {
+        const char* coding;
+        unsigned channels;
+        std::uint32_t inHeader;
+        std::size_t bytes;
+        std::uint64_t frames;
+    } const cases[] = {
+        {"ima4", 1, 690, 690 * 34, 690ULL * 64},   // packets
+        {"ima4", 2, 345, 1380 * 34, 690ULL * 64},  // half of them
+        {"ima4", 1, 690, 100 * 34 + 5, 6400},      // cut off
+        {"GSM ", 1, 44100, 276 * 33, 44100},       // the last packet is not full
+        {"GSM ", 1, 44100, 10 * 33, 1600},         //
+        {"DWVW", 1, 44100, 70000, 44100},          // packets of any size
+        {"42ni", 2, 44100, 6000, 1000},            //
+        {"MAC6", 1, 7350, 7350, 0},                // unknown, not wrong
+    };
+    for (const auto& c : cases) {
+        const std::string common = Aiff::common(c.channels, c.inHeader, 16, Aiff::rate(44100), c.coding);
+        const auto data = parserOf(Aiff::file(common + Aiff::sound(c.bytes), "AIFC"))->enhancedFileData();
+        ASSERT_TRUE(data) << c.coding;
+        EXPECT_EQ(data->frameCount(), c.frames) << c.coding << " of " << c.bytes << " bytes";
+        EXPECT_FLOAT_EQ(data->lengthInSeconds(), static_cast<float>(c.frames) / 44100);
+    }
+}
+
 TEST(LoopFileRead, ListsEveryChunkWithItsPlaceAndWhatIsWrongWithIt) {
     const Wav wav;
     const std::string file = wav.file(wav.format() + wav.chunk("\x86\x01te", "abcd") + wav.data(401) +
