@@ -314,6 +314,26 @@ TEST(LoopFileRead, ListsEveryChunkWithItsPlaceAndWhatIsWrongWithIt) {
     EXPECT_EQ(chunks[3].children[0].meaning, "title \"Sea\"");
 }
 
+TEST(LoopFileRead, ListsOurRecordWithTheSizeThatStandsInTheFile) {
+    const Wav wav;
+    const std::string record = "bplist00 or not";
+    const std::string uuid = "\x5C\xE5\x4F\x6C\x9A\x0B\x4D\x5F\x8D\x3E\x71\x63\x76\x74\x2E\x31";
+    struct {
+        std::string file;
+        std::size_t size;
+    } const cases[] = {
+        {wav.file(wav.format() + wav.data() + wav.chunk("qvct", record)), 15},
+        {Aiff::file(Aiff::common() + Aiff::sound() + Aiff::chunk("APPL", "qvct" + record)), 19},
+        {Caf::file(Caf::description() + Caf::data() + Caf::chunk("uuid", uuid + record)), 31},
+    };
+    for (const auto& c : cases) {
+        const auto chunks = parserOf(c.file)->chunks()[0].children;
+        ASSERT_EQ(chunks.size(), 3U);
+        EXPECT_EQ(chunks[2].meaning, "our record, unreadable");
+        EXPECT_EQ(chunks[2].size, c.size) << chunks[2].id;
+    }
+}
+
 /// A file of zeros but for its head and tail, which counts what is read; it may break off.
 class SparseReader : public RandomAccessReader {
   public:
