@@ -1,4 +1,5 @@
 #include "platform/LCFileParser.h"
+#include "platform/PropertyListFile.h"
 #include "platform/TaggingTypes.h"
 #include "platform/loopfile/RandomAccessReader.h"
 #include "support/AudioFixtures.h"
@@ -399,8 +400,7 @@ TEST(LoopFileRead, ValuesOfAWrongTypeInARecordCountAsAbsent) {
     facts.displayName = "from the file";
     using Array = PropertyList::Array;
     const LCFileData data(facts, PropertyList::Dictionary{{"BeatCount", "many"},
-                                                          {"Tempo", std::nan("")},
-                                                          {"SignatureTop", 1e300},
+                                                          {"Tempo", "fast"},
                                                           {"DisplayName", 7},
                                                           {"Tagging", Array{}},
                                                           {"ContentInfo", "x"},
@@ -408,14 +408,77 @@ TEST(LoopFileRead, ValuesOfAWrongTypeInARecordCountAsAbsent) {
                                                           {"TransientMarkers", Array{9, -1, "x", 3}},
                                                           {"MidiData", 1}});
     EXPECT_EQ(data.beatCount(), 8);
-    EXPECT_EQ(data.bpm(), 0);
-    EXPECT_EQ(data.signatureTop(), INT32_MAX);
+    EXPECT_EQ(data.bpm(), 99);
     EXPECT_EQ(data.displayName(), "from the file");
     EXPECT_TRUE(data.taggingDictionary().empty());
     EXPECT_EQ(data.contentInfoDictionary(), nullptr);
     EXPECT_THAT(data.descriptors(), ElementsAre("Dark"));
     EXPECT_THAT(data.transientMarkers(), ElementsAre(3, 9));
     EXPECT_TRUE(data.midiData().empty());
+}
+
+TEST(LoopFileRead, NumbersOutOfRangeInARecordCountAsAbsent) {
+    LCAudioFacts facts;
+    facts.frameCount = 1000;
+    facts.isLoop = true;
+    facts.beatCount = 8;
+    facts.bpm = 99;
+    facts.midiRootNote = 48;
+    facts.keyType = 2;
+    facts.signatureTop = 3;
+    facts.signatureBottom = 8;
+    const auto values = [&facts](const char* key, const PropertyList& value) {
+        const LCFileData data(facts, PropertyList::Dictionary{{key, value}});
+        return std::vector<double>{
+            double(data.tavioLoopType()),   double(data.beatCount()),      double(data.bpm()),
+            double(data.midiRootNote()),    double(data.keyType()),        double(data.signatureTop()),
+            double(data.signatureBottom()), double(data.lengthInSeconds())};
+    };
+    constexpr std::int64_t huge = std::int64_t{1} << 40;
+    const std::vector<double> untouched = {0, 8, 99, 48, 2, 3, 8, 0};
+    struct {
+        const char* key;
+        std::size_t place;
+        std::vector<PropertyList> absent;
+        std::vector<double> present;
+    } const cases[] = {
+        {"TavioLoopType", 0, {-2, huge}, {-1, 0, 7}},
+        {"BeatCount", 1, {-1, 1'000'001, huge}, {0, 1'000'000}},
+        {"Tempo", 2, {-1, 1000.5, 1e300}, {0, 1000}},
+        {"MidiRootNote", 3, {-2, 128, huge}, {-1, 0, 127}},
+        {"KeyType", 4, {-1, 5, huge}, {0, 4}},
+        {"SignatureTop", 5, {-1, 65, 1e300}, {0, 64}},
+        {"SignatureBottom", 6, {-4, 3, 128}, {0, 1, 64}},
+        {"LengthInSeconds", 7, {-1, 1e300}, {0, 1e9}},
+    };
+    for (const auto& c : cases) {
+        std::vector<PropertyList> absent = c.absent;
+        absent.insert(absent.end(), {std::nan(""), -INFINITY, INFINITY, UINT64_MAX});
+        for (const PropertyList& value : absent)
+            EXPECT_EQ(values(c.key, value), untouched) << c.key << " " << value.doubleValue().value();
+        for (const double value : c.present) EXPECT_EQ(values(c.key, value)[c.place], value) << c.key;
+    }
+    const LCFileData marked(
+        facts, PropertyList::Dictionary{{"TransientMarkers", PropertyList::Array{1000, 1001, 0, huge, -1}}});
+    EXPECT_THAT(marked.transientMarkers(), ElementsAre(0, 1000));
+}
+
+TEST(LoopFileRead, TheLengthOfTheAudioCountsBeforeTheRecords) {
+    const Wav wav;
+    const std::string record = serializePropertyList(PropertyList::Dictionary{{"LengthInSeconds", 99.0}},
+                                                     PropertyListFormat::binary);
+    struct {
+        std::size_t bytes;
+        float expected;
+    } const cases[] = {{32000, 4}, {0, 99}};
+    for (const auto& c : cases) {
+        const std::string file = wav.file(wav.format(1, 8000, 8) + wav.acid(0, 0, 4, 0) + wav.data(c.bytes) +
+                                          wav.chunk("qvct", record));
+        const auto data = parserOf(file)->enhancedFileData();
+        ASSERT_TRUE(data);
+        EXPECT_EQ(data->lengthInSeconds(), c.expected);
+        EXPECT_FLOAT_EQ(data->bpm(), 240 / c.expected);
+    }
 }
 
 }  // namespace

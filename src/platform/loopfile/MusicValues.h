@@ -11,6 +11,10 @@ namespace qvct {
 
 /// Bounds of what chunks of other makers may say; anything outside counts as not said.
 inline constexpr std::uint64_t kMostMarkers = 100'000;
+inline constexpr double kFastestTempo = 1000;
+inline constexpr double kLongestSeconds = 1e9;
+inline constexpr std::uint64_t kMostBeats = 1'000'000;
+inline constexpr unsigned kLargestSignature = 64;
 inline constexpr std::uint64_t kLargestText = 4096;
 inline constexpr std::uint64_t kLargestMidi = 16ULL << 20U;
 
