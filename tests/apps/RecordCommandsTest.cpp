@@ -140,7 +140,15 @@ TEST(Write, RefusesWrongWordsBeforeAnythingIsTouched) {
         {{"--add", "Genres/Huose"}, "no tag \"Huose\" in Genres"},
         {{"--add", "Genre/House"}, "no category \"Genre\"; there are: Artist"},
         {{"--add", "House"}, "\"House\" is no Category/Label"},
-        {{"--add", "Genres/House=1.5"}, "no tag \"House=1.5\""},
+        {{"--create", "--add", "Genres/House=1.5"}, "\"Genres/House=1.5\": the level is out of range"},
+        {{"--create", "--add", "Genres/House=150%"}, "the level is out of range, which is 0 to 1, or 0% to"},
+        {{"--create", "--add", "Genres/House=-1"}, "out of range"},
+        {{"--create", "--add", "Genres/House=.5.5"}, "out of range"},
+        {{"--create", "--add", "Genres/House="}, "out of range"},
+        {{"--create", "--add", "Genres/House=%"}, "out of range"},
+        {{"--create", "--add", "Genres/House= NaN"}, "out of range"},
+        {{"--add", "Genres/House=inf"}, "out of range"},
+        {{"--remove", "Genres/%!"}, "\"%!\" is no label"},
         {{"--remove", "/House"}, "\"/House\" is no Category/Label"},
         {{}, "nothing to write"},
         {{""}, "an empty path names nothing"},  // and not all of the current folder
@@ -154,8 +162,22 @@ TEST(Write, RefusesWrongWordsBeforeAnythingIsTouched) {
         EXPECT_THAT(result.errors, HasSubstr(c.message));
         EXPECT_FALSE(std::filesystem::exists(item + ".plist"));
     }
-    EXPECT_EQ(runTool({"write", item, "--create", "--add", "Custom/Huose/x"}).status, 0);
-    EXPECT_THAT(tagsOf(runTool({"read", "--json", item}).json()[0]), ElementsAre("Custom/Huose/x"));
+    EXPECT_EQ(runTool({"write", item, "--create", "--add", "Custom/Huose/x", "--add", "Custom/A=B"}).status,
+              0);
+    EXPECT_THAT(tagsOf(runTool({"read", "--json", item}).json()[0]),
+                ElementsAre("Custom/A=B", "Custom/Huose/x"));
+}
+
+TEST(Write, RemovesALabelAsItWasAdded) {
+    const Items items;
+    const std::string item = items.folder.path("Bass.cst");
+    const std::string label = "Genres/My%Tag!";
+    EXPECT_EQ(runTool({"write", item, "--create", "--add", label}).status, 0);
+    const ToolResult both = runTool({"write", item, "--create", "--add", label, "--remove", label});
+    EXPECT_THAT(both.errors, HasSubstr("is both added and removed"));
+    EXPECT_THAT(tagsOf(runTool({"read", "--json", item}).json()[0]), ElementsAre("Genres/MyTag"));
+    EXPECT_EQ(runTool({"write", item, "--remove", label}).status, 0);
+    EXPECT_THAT(tagsOf(runTool({"read", "--json", item}).json()[0]), IsEmpty());
 }
 
 TEST(Write, NamesWhatFailsAndDoesTheRest) {
