@@ -189,11 +189,15 @@ TEST(Write, NamesWhatFailsAndDoesTheRest) {
     items.folder.write("Pad.patch/tags.plist",
                        "<plist version=\"1.0\"><dict><key>Mine</key><true/></dict></plist>");
     const std::string patch = items.folder.path("Pad.patch");
-    const ToolResult result = runTool(
-        {"write", "--json", "--name", "New", broken, text, sad, patch, items.folder.path("Bass.cst")});
+    const std::string data = items.folder.write("d.data", "");
+    const std::string inner = items.folder.write("Pad.patch/#Root.cst", "");
+    const ToolResult result = runTool({"write", "--json", "--name", "New", broken, text, sad, patch, data,
+                                       inner, items.folder.path("Bass.cst")});
     EXPECT_EQ(result.status, 1);
     EXPECT_EQ(result.json().size(), 1U);
-    for (const std::string& message : {broken, text + ": no kind of content", list, patch + ": not renamed"})
+    for (const std::string& message : {broken, text + ": no kind of content", list, patch + ": not renamed",
+                                       data + ": data files are never written\n",
+                                       inner + ": belongs to the patch it lies in, " + patch + "\n"})
         EXPECT_THAT(result.errors, HasSubstr(message));
     EXPECT_EQ(readAll(list), "no list");
     EXPECT_EQ(runTool({"write", "--add", "Genres/House", patch}).status, 0);
@@ -316,6 +320,10 @@ TEST(Inspect, ShowsWhatIsInEveryKindOfItem) {
     const ToolResult data = runTool({"inspect", items.folder.path("bits.data")});
     EXPECT_EQ(data.status, 1);
     EXPECT_THAT(data.errors, HasSubstr("bits.data: the property list at byte 2 has no end"));
+    const ToolResult once = runTool({"read", items.folder.path("bits.data")});
+    EXPECT_EQ(once.status, 1);
+    EXPECT_EQ(once.errors,
+              "qvtag: " + items.folder.path("bits.data") + ": the property list at byte 2 has no end\n");
 }
 
 }  // namespace
