@@ -130,6 +130,31 @@ TEST(RhythmCommand, DrawsAPlot) {
     const ToolResult lost = runTool({"rhythm", file, "--plot", folder.path("no/p.svg")});
     EXPECT_EQ(lost.status, 1);
     EXPECT_THAT(lost.errors, HasSubstr("no/p.svg: cannot make a file beside it: No such file"));
+
+    struct {
+        std::string target;
+        const char* reason;
+    } const refused[] = {
+        {file, "is to be read"},
+        {folder.path("hard.svg"), "is to be read"},
+        {folder.write("other.mid", midi({0})), "is no SVG"},
+        {folder.write("words.svg", "words"), "is no SVG"},
+        {folder.write("drawing.txt", "<svg "), "is no SVG"},
+        {folder.path(), "is no SVG"},
+    };
+    std::filesystem::create_hard_link(file, refused[1].target);
+    for (const auto& c : refused) {
+        const std::string before = std::filesystem::is_directory(c.target) ? "" : readAll(c.target);
+        const ToolResult result = runTool({"rhythm", file, "--plot", c.target});
+        EXPECT_EQ(result.status, 2) << c.target;
+        EXPECT_THAT(result.errors, HasSubstr(c.target + ": " + c.reason));
+        EXPECT_EQ(result.output, "");
+        if (!before.empty()) {
+            EXPECT_EQ(readAll(c.target), before) << c.target;
+        }
+    }
+    for (const std::string& target : {plot, folder.write("x.SVG", "<?xml version=\"1.0\"?><svg/>")})
+        EXPECT_EQ(runTool({"rhythm", file, "--plot", target}).status, 0) << target;
 }
 
 TEST(RhythmCommand, NamesWhatCannotBeMeasuredAndDoesTheRest) {
