@@ -23,10 +23,12 @@ constexpr std::int32_t kMostBeats = QVCTMidiAnalysis::kLongestLoop;
 
 /// Tempo, length and signature, as far as they are known.
 struct Metre {
-    double tempo = 0;
-    std::int32_t beats = 0;
+    double tempo = 0;        // quarter notes a minute
+    std::int32_t beats = 0;  // of the signature's lower number
     std::int32_t top = 0;
     std::int32_t bottom = 0;
+
+    double beatsPerQuarter() const { return bottom / 4.0; }
 };
 
 bool failFor(Error* error, const URL& url, std::string_view reason) {
@@ -41,9 +43,10 @@ void applyRequest(const RhythmRequest& request, Metre& metre) {
 }
 
 /// Beats up to the end, rounded up to whole bars.
-std::int32_t wholeBars(double end, std::int32_t top) {
-    const double bars = std::max(1.0, std::ceil(end / top));
-    return static_cast<std::int32_t>(std::min(bars * top, static_cast<double>(kMostBeats) + 1));
+std::int32_t wholeBars(double quarters, const Metre& metre) {
+    constexpr double tolerance = 1e-4;  // durations are in single precision
+    const double bars = std::max(1.0, std::ceil(quarters * metre.beatsPerQuarter() / metre.top - tolerance));
+    return static_cast<std::int32_t>(std::min(bars * metre.top, static_cast<double>(kMostBeats) + 1));
 }
 
 Metre metreOf(const LCFileData* data) {
@@ -52,12 +55,13 @@ Metre metreOf(const LCFileData* data) {
             data->signatureBottom()};
 }
 
-/// Every note of every track, in the order of their starts.
-std::vector<Note> notesOf(const MidiSequence& sequence) {
+/// Every note of every track, in the order of their starts, in beats.
+std::vector<Note> notesOf(const MidiSequence& sequence, double beatsPerQuarter) {
     std::vector<Note> notes;
     for (const MidiTrack& track : sequence.tracks()) {
         for (const MidiNote& note : track.notes)
-            notes.push_back({note.start, note.end(), note.pitch, note.velocity});
+            notes.push_back(
+                {note.start * beatsPerQuarter, note.end() * beatsPerQuarter, note.pitch, note.velocity});
     }
     std::stable_sort(notes.begin(), notes.end(),
                      [](const Note& a, const Note& b) { return a.startTime < b.startTime; });
@@ -112,8 +116,8 @@ std::optional<RhythmResult> measureMidi(const URL& url, const MidiSequence& sequ
         metre.bottom = sequence.meters().front().denominator;
     }
     applyRequest(request, metre);
-    if (metre.beats == 0) metre.beats = wholeBars(sequence.endOfNotes(), metre.top);
-    return measured(url, notesOf(sequence), metre, error);
+    if (metre.beats == 0) metre.beats = wholeBars(sequence.endOfNotes(), metre);
+    return measured(url, notesOf(sequence, metre.beatsPerQuarter()), metre, error);
 }
 
 /// The lowest and highest sample of equal slices of the file.
@@ -146,12 +150,13 @@ std::optional<RhythmResult> measureAudio(const URL& url, Metre metre, const Rhyt
     const double minutes = static_cast<double>(frames) / decoder->sampleRate() / 60;
     applyRequest(request, metre);
     if (metre.beats == 0)
-        metre.beats = static_cast<std::int32_t>(std::lround(std::min(metre.tempo * minutes, 1e6)));
+        metre.beats = static_cast<std::int32_t>(
+            std::lround(std::min(metre.tempo * minutes * metre.beatsPerQuarter(), 1e6)));
     if (metre.beats == 0) {
         failFor(error, url, "its length in beats is unknown; say --beats or --tempo");
         return std::nullopt;
     }
-    if (metre.tempo == 0) metre.tempo = metre.beats / minutes;
+    if (metre.tempo == 0) metre.tempo = metre.beats / minutes / metre.beatsPerQuarter();
     auto result =
         measured(url, notesOfOnsets(OnsetDetector::detect(*decoder), frames, metre.beats), metre, error);
     if (result) result->plot.waveform = waveformOf(url.path());

@@ -12,8 +12,8 @@ namespace qvct::tool {
 
 /// What a user knows better than the file.
 struct RhythmRequest {
-    std::optional<double> tempo;
-    std::optional<std::int32_t> beats;
+    std::optional<double> tempo;        ///< Quarter notes a minute.
+    std::optional<std::int32_t> beats;  ///< Of the signature's lower number, as all beats here.
     std::optional<std::int32_t> signatureTop;
     std::optional<std::int32_t> signatureBottom;
 };
@@ -23,7 +23,7 @@ struct RhythmResult {
     float complexity = 0;
     std::vector<double> onsets;  ///< Beats.
     std::int32_t beatCount = 0;
-    double tempo = 0;
+    double tempo = 0;  ///< Quarter notes a minute.
     std::int32_t signatureTop = 4;
     std::int32_t signatureBottom = 4;
     RhythmPlot plot;

@@ -70,7 +70,7 @@ std::set<std::string> wordsOfName(const std::string& path) {
     return words;
 }
 
-/// Tempo counts quarter notes, and so do beats.
+/// Tempo counts quarter notes, beats are notes of the meter's lower number.
 void derive(LCAudioFacts& facts, const LCFileData& data) {
     if (facts.sampleRate > 0) {
         facts.lengthInSeconds = static_cast<float>(static_cast<double>(facts.frameCount) / facts.sampleRate);
@@ -78,12 +78,13 @@ void derive(LCAudioFacts& facts, const LCFileData& data) {
     const double minutes =
         double{facts.lengthInSeconds > 0 ? facts.lengthInSeconds : data.lengthInSeconds()} / 60;
     if (minutes <= 0) return;
+    const double beatsPerQuarter = data.signatureBottom() > 0 ? data.signatureBottom() / 4.0 : 1;
     if (data.bpm() == 0 && data.beatCount() > 0) {
-        const double bpm = data.beatCount() / minutes;
+        const double bpm = data.beatCount() / minutes / beatsPerQuarter;
         if (bpm <= kFastestTempo) facts.bpm = static_cast<float>(bpm);
     }
     if (data.beatCount() == 0 && data.bpm() > 0) {
-        const double beats = double{data.bpm()} * minutes;
+        const double beats = double{data.bpm()} * minutes * beatsPerQuarter;
         constexpr double kTolerance = 0.02;  // a loop is cut to the frame, its tempo often to 2 decimals
         const bool isWhole = std::abs(beats - std::round(beats)) <= kTolerance;
         if (beats > 0.5 && beats < double{kMostBeats} && isWhole)

@@ -87,6 +87,41 @@ TEST(RhythmCommand, TakesTempoMetreAndLengthFromAMidiFileOrTheOptions) {
     EXPECT_THAT(runTool({"rhythm", file}).output, HasSubstr("4 onsets in 6 beats of 3/4 at 100 bpm\n"));
 }
 
+TEST(RhythmCommand, ABarPlayedSeveralTimesIsAsDenseAsOnce) {
+    const TemporaryFolder folder;
+    struct {
+        unsigned top, bottom;
+        std::vector<unsigned> sixteenths;  // of a bar
+    } const cases[] = {{4, 4, {0, 3, 6, 10}},
+                       {3, 4, {0, 4, 11}},
+                       {6, 8, {0, 2, 6, 11}},
+                       {3, 8, {0, 4}},
+                       {2, 2, {0, 6, 8, 15}}};
+    for (const auto& c : cases) {
+        const std::string facts = std::string("\0\xFF\x58\x04", 4) + big(c.top, 1) +
+                                  big(static_cast<unsigned>(std::countr_zero(c.bottom)), 1) + "\x18\x08";
+        json once;
+        for (unsigned bars = 1; bars <= 4; ++bars) {
+            std::vector<unsigned> starts;
+            for (unsigned bar = 0; bar < bars; ++bar) {
+                for (const unsigned start : c.sixteenths)
+                    starts.push_back(bar * 16 * c.top / c.bottom + start);
+            }
+            const json item = rhythm({folder.write("a.mid", midi(starts, facts))}).json()[0];
+            if (bars == 1) once = item;
+            const std::string what = once["signature"].get<std::string>() + " x " + std::to_string(bars);
+            EXPECT_EQ(item["beatCount"], bars * c.top) << what;
+            ASSERT_EQ(item["onsets"].size(), starts.size()) << what;
+            EXPECT_EQ(item["onsets"].back(), starts.back() * c.bottom / 16.0) << what;
+            EXPECT_NEAR(item["density"].get<double>(), once["density"].get<double>(), 1e-6) << what;
+        }
+    }
+    // The same of a sound: two seconds of 6/8 at 90 quarter notes a minute.
+    const std::string sound = folder.write("c.wav", clicks({11025, 33075}));
+    EXPECT_EQ(rhythm({sound, "--tempo", "90", "--signature", "6/8"}).json()[0]["beatCount"], 6);
+    EXPECT_EQ(rhythm({sound, "--beats", "6", "--signature", "6/8"}).json()[0]["tempo"], 90.0);
+}
+
 TEST(RhythmCommand, ReadsTheNotesInALoopAndListensToOthers) {
     const TemporaryFolder folder;
     demo::writeLibrary(folder.path());

@@ -164,6 +164,22 @@ TEST(LoopFileRead, DerivesOnlyWhatThePlainDataDoesNotSay) {
     }
 }
 
+TEST(LoopFileRead, CountsBeatsInNotesOfTheLowerNumberAndTempoInQuarters) {
+    struct {
+        const char* signature;
+        int beats;
+    } const cases[] = {{"4/4", 4}, {"6/8", 8}, {"2/2", 2}};
+    for (const auto& c : cases) {
+        const std::string facts =
+            big(2, 4) + std::string("tempo\000120\0time signature\0", 25) + c.signature + '\0';
+        const std::string file =
+            Caf::file(Caf::description(1000) + Caf::chunk("info", facts) + Caf::data(8000));
+        const auto data = parserOf(file)->enhancedFileData();
+        ASSERT_TRUE(data);
+        EXPECT_EQ(data->beatCount(), c.beats) << c.signature << ", two seconds";
+    }
+}
+
 TEST(LoopFileRead, AdmitsTheKindsThatAreAskedFor) {
     const Wav wav;
     const std::string plain = wav.file(wav.format() + wav.data());
