@@ -124,6 +124,8 @@ void run(Options options, ToolContext& context) {
             context.itemFailed(error.message);
             continue;
         }
+        for (const std::string& damage : result->problems)
+            context.note(fmt::format("{}: {}", printable(path), damage));
         writePlot(options, *result, context);
         if (context.format == Format::table) {
             printRow(path, *result);

@@ -117,7 +117,14 @@ std::optional<RhythmResult> measureMidi(const URL& url, const MidiSequence& sequ
     }
     applyRequest(request, metre);
     if (metre.beats == 0) metre.beats = wholeBars(sequence.endOfNotes(), metre);
-    return measured(url, notesOf(sequence, metre.beatsPerQuarter()), metre, error);
+    const auto notes = notesOf(sequence, metre.beatsPerQuarter());
+    if (notes.empty() && !sequence.problems().empty()) {
+        failFor(error, url, "nothing sounds in it: " + join(sequence.problems(), "; "));
+        return std::nullopt;
+    }
+    auto result = measured(url, notes, metre, error);
+    if (result) result->problems = sequence.problems();
+    return result;
 }
 
 /// The lowest and highest sample of equal slices of the file.
@@ -166,8 +173,7 @@ std::optional<RhythmResult> measureAudio(const URL& url, Metre metre, const Rhyt
 }  // namespace
 
 std::optional<RhythmResult> measureRhythm(const URL& url, const RhythmRequest& request, Error* error) {
-    const std::string extension = url.lowercasePathExtension();
-    if (extension == "mid" || extension == "midi") {
+    if (MidiSequence::supportsFileExtension(url.pathExtension())) {
         const auto sequence = MidiSequence::read(url.path(), error);
         return sequence ? measureMidi(url, *sequence, {}, request, error) : std::nullopt;
     }

@@ -6,6 +6,7 @@
 
 #include <cstdint>
 #include <optional>
+#include <string>
 #include <vector>
 
 namespace qvct::tool {
@@ -26,6 +27,7 @@ struct RhythmResult {
     double tempo = 0;  ///< Quarter notes a minute.
     std::int32_t signatureTop = 4;
     std::int32_t signatureBottom = 4;
+    std::vector<std::string> problems;  ///< What is damaged in the MIDI, and was left out.
     RhythmPlot plot;
 };
 

@@ -326,5 +326,18 @@ TEST(Inspect, ShowsWhatIsInEveryKindOfItem) {
               "qvtag: " + items.folder.path("bits.data") + ": the property list at byte 2 has no end\n");
 }
 
+TEST(Inspect, ListsTheTracksOfMidiFiles) {
+    const TemporaryFolder folder;
+    const std::string notes = emptyMidi();
+    const ToolResult midi = runTool({"inspect", "--json", folder.write("a.mid", notes)});
+    EXPECT_EQ(midi.status, 0) << midi.errors;
+    const json parts = midi.json()[0]["parts"];
+    const json* track = partWithId(parts, "track 1");
+    ASSERT_NE(track, nullptr) << midi.output;
+    EXPECT_EQ((*track)["meaning"], "0 notes, 0 beats");
+    const ToolResult cut = runTool({"inspect", folder.write("cut.mid", notes.substr(0, notes.size() - 2))});
+    EXPECT_THAT(cut.output, HasSubstr("FAULT: "));
+}
+
 }  // namespace
 }  // namespace qvct::test

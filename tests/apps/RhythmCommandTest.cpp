@@ -241,6 +241,20 @@ TEST(RhythmCommand, LengthsThatDoNotFitGiveNumbersAllTheSame) {
     EXPECT_THAT(rhythm({notes, "--beats", "20000"}).errors, HasSubstr("20000 beats cannot be measured"));
 }
 
+TEST(RhythmCommand, TellsWhatIsDamagedInAMidiFile) {
+    const TemporaryFolder folder;
+    const std::string whole = midi({0, 4});
+    const std::string cut = folder.write("cut.mid", whole.substr(0, whole.size() - 6));
+    const ToolResult partly = rhythm({cut});
+    EXPECT_EQ(partly.status, 0);
+    EXPECT_EQ(partly.json()[0]["onsets"].size(), 2U);
+    EXPECT_THAT(partly.errors, HasSubstr("cut.mid: byte "));
+    EXPECT_EQ(rhythm({cut, "--quiet"}).errors, "");
+    const ToolResult nothing = rhythm({folder.write("none.mid", emptyMidi().substr(0, 24))});
+    EXPECT_EQ(nothing.status, 1);
+    EXPECT_THAT(nothing.errors, HasSubstr("none.mid: nothing sounds in it: byte "));
+}
+
 TEST(RhythmCommand, EveryMidiFileOfTheCorpusGivesWhatCanBeReadOrAReason) {
     QVCT_SKIP_WITHOUT(corpus("midi/test-files"));
     const std::vector<std::string> files = filesBelow(corpus("midi/test-files"));
