@@ -147,7 +147,7 @@ void addRhythmCommand(CLI::App& app, ToolContext& context) {
     command->add_option("--tempo", options->request.tempo, "Quarter notes a minute")
         ->check(CLI::Range(1.0, 1000.0) & CLI::Validator(refuseNotANumber, ""));
     command->add_option("--beats", options->request.beats, "Length in beats, 6 a bar of 6/8")
-        ->check(CLI::Range(1, 100000));
+        ->check(CLI::Range(1, kMostBeats));
     command->add_option("--signature", options->signature, "Time signature, such as 6/8");
     command->add_option("--plot", options->plotFile, "Draw the rhythm, and what gave it its numbers")
         ->type_name("FILE.svg");

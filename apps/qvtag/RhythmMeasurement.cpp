@@ -2,7 +2,6 @@
 
 #include "analysis/AudioTransientComplexity.h"
 #include "analysis/MetricWeights.h"
-#include "analysis/QVCTMidiAnalysis.h"
 #include "platform/AudioDecoder.h"
 #include "platform/LCFileParser.h"
 #include "platform/MidiSequence.h"
@@ -18,8 +17,6 @@ namespace qvct::tool {
 namespace {
 
 constexpr double kUsualTempo = 120;
-/// No loop is longer; what claims to be is a mistake.
-constexpr std::int32_t kMostBeats = QVCTMidiAnalysis::kLongestLoop;
 
 /// Tempo, length and signature, as far as they are known.
 struct Metre {
@@ -46,7 +43,7 @@ void applyRequest(const RhythmRequest& request, Metre& metre) {
 std::int32_t wholeBars(double quarters, const Metre& metre) {
     constexpr double tolerance = 1e-4;  // durations are in single precision
     const double bars = std::max(1.0, std::ceil(quarters * metre.beatsPerQuarter() / metre.top - tolerance));
-    return static_cast<std::int32_t>(std::min(bars * metre.top, static_cast<double>(kMostBeats) + 1));
+    return static_cast<std::int32_t>(std::min(bars * metre.top, 1e9));
 }
 
 Metre metreOf(const LCFileData* data) {
@@ -70,12 +67,13 @@ std::vector<Note> notesOf(const MidiSequence& sequence, double beatsPerQuarter) 
 
 std::optional<RhythmResult> measured(const URL& url, const std::vector<Note>& notes, const Metre& metre,
                                      Error* error) {
-    if (notes.empty()) {
-        failFor(error, url, "nothing sounds in it");
+    if (metre.beats < 1 || metre.beats > kMostBeats) {
+        failFor(error, url,
+                fmt::format("a loop of {} beats cannot be measured; 1 to {} can", metre.beats, kMostBeats));
         return std::nullopt;
     }
-    if (metre.beats < 1 || metre.beats > kMostBeats) {
-        failFor(error, url, fmt::format("a loop of {} beats cannot be measured", metre.beats));
+    if (notes.empty()) {
+        failFor(error, url, "nothing sounds in it");
         return std::nullopt;
     }
     const auto analysis = QVCTMidiAnalysis::initWithTempo(static_cast<float>(metre.tempo), metre.beats,
@@ -154,13 +152,19 @@ std::optional<RhythmResult> measureAudio(const URL& url, Metre metre, const Rhyt
     const auto decoder = AudioDecoder::open(url.path(), error);
     if (!decoder) return std::nullopt;
     const std::int64_t frames = decoder->frames();
+    if (frames <= 0) {
+        failFor(error, url, "it has no samples");
+        return std::nullopt;
+    }
     const double minutes = static_cast<double>(frames) / decoder->sampleRate() / 60;
     applyRequest(request, metre);
     if (metre.beats == 0)
         metre.beats = static_cast<std::int32_t>(
             std::lround(std::min(metre.tempo * minutes * metre.beatsPerQuarter(), 1e6)));
     if (metre.beats == 0) {
-        failFor(error, url, "its length in beats is unknown; say --beats or --tempo");
+        failFor(error, url,
+                metre.tempo > 0 ? "it is shorter than half a beat; say --beats"
+                                : "its length in beats is unknown; say --beats or --tempo");
         return std::nullopt;
     }
     if (metre.tempo == 0) metre.tempo = metre.beats / minutes / metre.beatsPerQuarter();

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "RhythmPlot.h"
+#include "analysis/QVCTMidiAnalysis.h"
 #include "platform/Error.h"
 #include "platform/Url.h"
 
@@ -10,6 +11,9 @@
 #include <vector>
 
 namespace qvct::tool {
+
+/// No loop is longer; what claims to be is a mistake.
+inline constexpr std::int32_t kMostBeats = QVCTMidiAnalysis::kLongestLoop;
 
 /// What a user knows better than the file.
 struct RhythmRequest {

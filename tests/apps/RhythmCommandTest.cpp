@@ -152,6 +152,14 @@ TEST(RhythmCommand, AsksForTheLengthThatASoundDoesNotTell) {
     ASSERT_EQ(told["onsets"].size(), 3U);
     for (std::size_t i = 0; i < 3; ++i) EXPECT_NEAR(told["onsets"][i], 0.5 + static_cast<double>(i), 0.01);
     EXPECT_EQ(rhythm({file, "--tempo", "60"}).json()[0]["beatCount"], 2);
+    const Wav wav;
+    const std::string empty = folder.write("e.wav", wav.file(wav.format(1) + wav.chunk("data", "")));
+    const std::string brief = folder.write("s.wav", wav.file(wav.format(1) + wav.data(2000)));
+    for (const char* tempo : {"120", "60"}) {
+        EXPECT_THAT(rhythm({empty, "--tempo", tempo}).errors, HasSubstr("e.wav: it has no samples\n"));
+        EXPECT_THAT(rhythm({brief, "--tempo", tempo}).errors,
+                    HasSubstr("s.wav: it is shorter than half a beat; say --beats\n"));
+    }
 }
 
 TEST(RhythmCommand, DrawsAPlot) {
@@ -198,16 +206,16 @@ TEST(RhythmCommand, NamesWhatCannotBeMeasuredAndDoesTheRest) {
     const Wav wav;
     const struct {
         std::string path, reason;
-    } rows[] = {
-        {folder.path("none.mid"), "none.mid: No such file"},
-        {folder.path("none.wav"), "none.wav: "},
-        {folder.write("text.mid", "no notes"), "text.mid: "},
-        {folder.write("text.wav", "no sound"), "text.wav: "},
-        {folder.write("d.mid", "MThd" + big(6, 4) + big(0, 2) + big(1, 2) + big(0, 2)), "d.mid: "},
-        {folder.write("empty.mid", emptyMidi()), "empty.mid: nothing sounds in it"},
-        {folder.write("silence.wav", clicks({})), "silence.wav: nothing sounds in it"},
-        {folder.write("nothing.wav", wav.file(wav.format(1) + wav.chunk("data", ""))), "nothing.wav: "},
-        {folder.path(), folder.path() + ": "}};
+    } rows[] = {{folder.path("none.mid"), "none.mid: No such file"},
+                {folder.path("none.wav"), "none.wav: "},
+                {folder.write("text.mid", "no notes"), "text.mid: "},
+                {folder.write("text.wav", "no sound"), "text.wav: "},
+                {folder.write("d.mid", "MThd" + big(6, 4) + big(0, 2) + big(1, 2) + big(0, 2)), "d.mid: "},
+                {folder.write("empty.mid", emptyMidi()), "empty.mid: nothing sounds in it"},
+                {folder.write("silence.wav", clicks({})), "silence.wav: nothing sounds in it"},
+                {folder.write("nothing.wav", wav.file(wav.format(1) + wav.chunk("data", ""))),
+                 "nothing.wav: it has no samples"},
+                {folder.path(), folder.path() + ": "}};
     for (const auto& row : rows) {
         const ToolResult result = rhythm({row.path, good, "--beats", "4"});
         EXPECT_EQ(result.status, 1) << row.path;
@@ -217,6 +225,7 @@ TEST(RhythmCommand, NamesWhatCannotBeMeasuredAndDoesTheRest) {
     }
     for (const std::vector<std::string>& words : {std::vector<std::string>{"--beats", "0"},
                                                   {"--beats", "-4"},
+                                                  {"--beats", "16385"},
                                                   {"--tempo", "0"},
                                                   {"--tempo", "nan"},
                                                   {"--signature", "0/4"},
@@ -238,7 +247,12 @@ TEST(RhythmCommand, LengthsThatDoNotFitGiveNumbersAllTheSame) {
             for (const json& item : result.json()) expectSound(item, std::string(beats) + signature);
         }
     }
-    EXPECT_THAT(rhythm({notes, "--beats", "20000"}).errors, HasSubstr("20000 beats cannot be measured"));
+    EXPECT_THAT(rhythm({sound, "--beats", "100000"}).errors,
+                HasSubstr("--beats: Value 100000 not in range 1 to 16384"));
+    std::vector<unsigned> starts;
+    for (unsigned i = 0; i < 100; ++i) starts.push_back(680 * i);
+    EXPECT_THAT(rhythm({folder.write("long.mid", midi(starts))}).errors,
+                HasSubstr("a loop of 16832 beats cannot be measured; 1 to 16384 can"));
 }
 
 TEST(RhythmCommand, TellsWhatIsDamagedInAMidiFile) {
