@@ -304,11 +304,13 @@ TEST(LoopFileRead, CountsTheFramesOfPackedAiffAudio) {
         {"MAC6", 1, 7350, 7350, 0},                // unknown, not wrong
     };
     for (const auto& c : cases) {
-        const std::string common = Aiff::common(c.channels, c.inHeader, 16, Aiff::rate(44100), c.coding);
+        const std::string common = Aiff::common(c.channels, c.inHeader, 16, Aiff::rate(44100), c.coding) +
+                                   Aiff::chunk("MARK", big(1, 2) + big(1, 2) + big(900, 4) + big(0, 2));
         const auto data = parserOf(Aiff::file(common + Aiff::sound(c.bytes), "AIFC"))->enhancedFileData();
         ASSERT_TRUE(data) << c.coding;
         EXPECT_EQ(data->frameCount(), c.frames) << c.coding << " of " << c.bytes << " bytes";
         EXPECT_FLOAT_EQ(data->lengthInSeconds(), static_cast<float>(c.frames) / 44100);
+        EXPECT_THAT(data->transientMarkers(), ElementsAre(900)) << c.coding;
     }
 }
 

@@ -79,7 +79,8 @@ void setMarkers(LCAudioFacts& facts, std::vector<std::int64_t> frames) {
     std::sort(frames.begin(), frames.end());
     frames.erase(std::unique(frames.begin(), frames.end()), frames.end());
     std::erase_if(frames, [&](std::int64_t frame) {
-        return frame < 0 || static_cast<std::uint64_t>(frame) > facts.frameCount;
+        const bool isBehind = facts.frameCount > 0 && static_cast<std::uint64_t>(frame) > facts.frameCount;
+        return frame < 0 || isBehind;
     });
     facts.transientMarkers = std::move(frames);
 }

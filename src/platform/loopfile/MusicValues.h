@@ -34,7 +34,7 @@ void setSignatureText(LCAudioFacts& facts, std::string_view text);
 void setKeyText(LCAudioFacts& facts, std::string_view text);
 /// Only bytes that begin as a standard MIDI file does; such a file makes a loop.
 void setMidi(LCAudioFacts& facts, std::vector<std::uint8_t> bytes);
-/// Sorts them, drops doubles and those outside of the audio.
+/// Sorts them, drops doubles and those outside of audio whose length is known.
 void setMarkers(LCAudioFacts& facts, std::vector<std::int64_t> frames);
 
 }  // namespace qvct
