@@ -1,6 +1,7 @@
 #include "CommandLine.h"
 #include "platform/Text.h"
 
+#include <algorithm>
 #include <functional>
 #include <set>
 
@@ -34,6 +35,14 @@ std::vector<CommandOption> optionsOf(const CommandDescription& command, const Co
     return options;
 }
 
+/// Whether a word that is no option may be a file: of a command that takes some, or that has nothing below
+/// it.
+bool offersFiles(const CommandDescription& command) {
+    return command.commands.empty() ||
+           std::any_of(command.arguments.begin(), command.arguments.end(),
+                       [](const CommandOption& argument) { return argument.takesFile; });
+}
+
 std::string patternOfCommands(const CommandDescription& tool) {
     std::vector<std::string> paths;
     for (const CommandDescription* command : allCommands(tool)) {
@@ -62,9 +71,9 @@ std::string bashBranch(const CommandDescription& command, const CommandDescripti
         auto& list = option.takesFile ? filesBehind : valuesBehind;
         if (!option.value.empty()) list.insert(list.end(), option.names.begin(), option.names.end());
     }
-    return fmt::format("commands={} options={} files={} values={}", quoted(join(commands, " ")),
+    return fmt::format("commands={} options={} files={} values={} takesfiles={}", quoted(join(commands, " ")),
                        quoted(join(options, " ")), quoted(join(filesBehind, " ")),
-                       quoted(join(valuesBehind, " ")));
+                       quoted(join(valuesBehind, " ")), offersFiles(command) ? "yes" : "");
 }
 
 std::string zshPair(const std::string& name, const std::string& description) {
@@ -79,13 +88,14 @@ std::string zshBranch(const CommandDescription& command, const CommandDescriptio
     for (const CommandOption& option : optionsOf(command, tool)) {
         for (const std::string& name : option.names) options += zshPair(name, option.description);
     }
-    return fmt::format("commands=({} ) options=({} )", commands, options);
+    return fmt::format("commands=({} ) options=({} ) takesfiles={}", commands, options,
+                       offersFiles(command) ? "yes" : "");
 }
 
 std::string fishLines(const CommandDescription& command, const CommandDescription& tool) {
     const std::string here =
         fmt::format("complete -c qvtag -n 'test (__qvtag_command) = \"{}\"'", command.path);
-    std::string text = command.commands.empty() ? "" : here + " -f\n";
+    std::string text = offersFiles(command) ? "" : here + " -f\n";
     for (const CommandDescription& below : command.commands)
         text += fmt::format("{} -a {} -d {}\n", here, below.name, quotedForFish(below.description));
     for (const CommandOption& option : optionsOf(command, tool)) {
@@ -104,7 +114,7 @@ std::string fishLines(const CommandDescription& command, const CommandDescriptio
 
 std::string bashCompletion(const CommandDescription& tool) {
     return R"(_qvtag() {
-  local command=qvtag word commands options files values current=${COMP_WORDS[COMP_CWORD]}
+  local command=qvtag word commands options files values takesfiles current=${COMP_WORDS[COMP_CWORD]}
   for word in "${COMP_WORDS[@]:1:COMP_CWORD-1}"; do
     case "$command $word" in )" +
            patternOfCommands(tool) + R"() command="$command $word" ;; esac
@@ -116,8 +126,9 @@ std::string bashCompletion(const CommandDescription& tool) {
   if [[ " $files " == *"$before"* ]]; then compopt -o filenames; mapfile -t COMPREPLY < <(compgen -f -- "$current")
   elif [[ " $values " == *"$before"* ]]; then COMPREPLY=()
   elif [[ $current == -* ]]; then mapfile -t COMPREPLY < <(compgen -W "$options" -- "$current")
-  elif [[ -n $commands ]]; then mapfile -t COMPREPLY < <(compgen -W "$commands" -- "$current")
-  else compopt -o filenames; mapfile -t COMPREPLY < <(compgen -f -- "$current")
+  else
+    mapfile -t COMPREPLY < <(compgen -W "$commands" -- "$current")
+    if [[ -n $takesfiles ]]; then compopt -o filenames; mapfile -t -O ${#COMPREPLY[@]} COMPREPLY < <(compgen -f -- "$current"); fi
   fi
 }
 complete -F _qvtag qvtag
@@ -127,7 +138,7 @@ complete -F _qvtag qvtag
 std::string zshCompletion(const CommandDescription& tool) {
     return R"(#compdef qvtag
 _qvtag() {
-  local command=qvtag word
+  local command=qvtag word takesfiles
   local -a commands options
   for word in "${(@)words[2,CURRENT-1]}"; do
     case "$command $word" in )" +
@@ -137,8 +148,9 @@ _qvtag() {
 )" + branches(tool, [&](const auto& command) { return zshBranch(command, tool); }) +
            R"(  esac
   if [[ $PREFIX == -* ]]; then _describe option options
-  elif (( $#commands )); then _describe command commands
-  else _files
+  else
+    (( $#commands )) && _describe command commands
+    [[ -n $takesfiles ]] && _files
   fi
 }
 _qvtag "$@"

@@ -9,6 +9,7 @@
 #include "formats/settings/TGRTSettingsHeaderReader.h"
 #include "platform/FileAccess.h"
 #include "platform/LCFileParser.h"
+#include "platform/MidiSequence.h"
 #include "platform/PropertyListFile.h"
 #include "platform/QVContentTaggingTypes.h"
 #include "platform/Text.h"
@@ -153,6 +154,24 @@ Parts dataParts(const URL& url, Error* error) {
     return parts;
 }
 
+Parts midiParts(const URL& url, Error* error) {
+    const auto sequence = MidiSequence::read(url.path(), error);
+    if (!sequence) return {};
+    InspectedPart file{"MIDI", {}, {}, fmt::format("standard MIDI file, format {}", sequence->format()),
+                       {},     {}};
+    for (const MidiTrack& track : sequence->tracks()) {
+        file.children.push_back({fmt::format("track {}", file.children.size() + 1),
+                                 {},
+                                 {},
+                                 fmt::format("{} notes, {:g} beats", track.notes.size(), track.length),
+                                 {},
+                                 {}});
+    }
+    for (const std::string& problem : sequence->problems())
+        file.children.push_back({"", {}, {}, "", problem, {}});
+    return {std::move(file)};
+}
+
 }  // namespace
 
 std::vector<InspectedPart> partsOfItem(const URL& url, Error* error) {
@@ -168,9 +187,10 @@ std::vector<InspectedPart> partsOfItem(const URL& url, Error* error) {
         case kFileTypeChannelStrip:
             return settingsParts(url, error);
         default:
-            return TGRTBinaryFileMetaDataReader::supportsFileExtension(url.pathExtension())
-                       ? dataParts(url, error)
-                       : audioParts(url, error);
+            if (TGRTBinaryFileMetaDataReader::supportsFileExtension(url.pathExtension()))
+                return dataParts(url, error);
+            return MidiSequence::supportsFileExtension(url.pathExtension()) ? midiParts(url, error)
+                                                                            : audioParts(url, error);
     }
 }
 

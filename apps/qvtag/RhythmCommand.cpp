@@ -5,6 +5,8 @@
 
 #include <charconv>
 #include <cmath>
+#include <filesystem>
+#include <fstream>
 #include <memory>
 
 #include <CLI/CLI.hpp>
@@ -77,6 +79,27 @@ void printRow(const std::string& path, const RhythmResult& result) {
         result.beatCount, result.signatureTop, result.signatureBottom, rounded(result.tempo));
 }
 
+bool beginsLikeSvg(const std::string& path) {
+    if (!isRegularFile(path)) return false;
+    std::string start(5, '\0');
+    std::ifstream(path, std::ios::binary).read(start.data(), static_cast<std::streamsize>(start.size()));
+    return start.starts_with("<svg") || start == "<?xml";
+}
+
+/// Why a picture must not be put there, since something else would be lost; empty when it may.
+std::string problemOfPlot(const std::string& target, const std::vector<std::string>& inputs) {
+    namespace fs = std::filesystem;
+    std::error_code ignored;
+    if (!fs::exists(target, ignored)) return {};
+    const std::string place = printable(target) + ": ";
+    for (const std::string& input : inputs) {
+        if (fs::equivalent(target, input, ignored)) return place + "is to be read, and not to be drawn over";
+    }
+    const bool isSvg =
+        URL::fileURLWithPath(target).lowercasePathExtension() == "svg" && beginsLikeSvg(target);
+    return isSvg ? std::string{} : place + "is no SVG, and is not replaced by one";
+}
+
 void writePlot(const Options& options, const RhythmResult& result, ToolContext& context) {
     if (options.plotFile.empty()) return;
     Error error;
@@ -91,6 +114,8 @@ void run(Options options, ToolContext& context) {
     if (!options.plotFile.empty() && options.paths.size() != 1) {
         return context.usageFailed("--plot draws one file; name only one");
     }
+    const std::string problem = problemOfPlot(options.plotFile, options.paths);
+    if (!problem.empty()) return context.usageFailed(problem);
     Json items = Json::array();
     for (const std::string& path : options.paths) {
         Error error;
@@ -99,6 +124,8 @@ void run(Options options, ToolContext& context) {
             context.itemFailed(error.message);
             continue;
         }
+        for (const std::string& damage : result->problems)
+            context.note(fmt::format("{}: {}", printable(path), damage));
         writePlot(options, *result, context);
         if (context.format == Format::table) {
             printRow(path, *result);
@@ -119,7 +146,8 @@ void addRhythmCommand(CLI::App& app, ToolContext& context) {
         ->type_name("FILE");
     command->add_option("--tempo", options->request.tempo, "Quarter notes a minute")
         ->check(CLI::Range(1.0, 1000.0) & CLI::Validator(refuseNotANumber, ""));
-    command->add_option("--beats", options->request.beats, "Length in beats")->check(CLI::Range(1, 100000));
+    command->add_option("--beats", options->request.beats, "Length in beats, 6 a bar of 6/8")
+        ->check(CLI::Range(1, kMostBeats));
     command->add_option("--signature", options->signature, "Time signature, such as 6/8");
     command->add_option("--plot", options->plotFile, "Draw the rhythm, and what gave it its numbers")
         ->type_name("FILE.svg");

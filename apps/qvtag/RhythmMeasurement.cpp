@@ -2,7 +2,6 @@
 
 #include "analysis/AudioTransientComplexity.h"
 #include "analysis/MetricWeights.h"
-#include "analysis/QVCTMidiAnalysis.h"
 #include "platform/AudioDecoder.h"
 #include "platform/LCFileParser.h"
 #include "platform/MidiSequence.h"
@@ -18,15 +17,15 @@ namespace qvct::tool {
 namespace {
 
 constexpr double kUsualTempo = 120;
-/// No loop is longer; what claims to be is a mistake.
-constexpr std::int32_t kMostBeats = QVCTMidiAnalysis::kLongestLoop;
 
 /// Tempo, length and signature, as far as they are known.
 struct Metre {
-    double tempo = 0;
-    std::int32_t beats = 0;
+    double tempo = 0;        // quarter notes a minute
+    std::int32_t beats = 0;  // of the signature's lower number
     std::int32_t top = 0;
     std::int32_t bottom = 0;
+
+    double beatsPerQuarter() const { return bottom / 4.0; }
 };
 
 bool failFor(Error* error, const URL& url, std::string_view reason) {
@@ -41,9 +40,10 @@ void applyRequest(const RhythmRequest& request, Metre& metre) {
 }
 
 /// Beats up to the end, rounded up to whole bars.
-std::int32_t wholeBars(double end, std::int32_t top) {
-    const double bars = std::max(1.0, std::ceil(end / top));
-    return static_cast<std::int32_t>(std::min(bars * top, static_cast<double>(kMostBeats) + 1));
+std::int32_t wholeBars(double quarters, const Metre& metre) {
+    constexpr double tolerance = 1e-4;  // durations are in single precision
+    const double bars = std::max(1.0, std::ceil(quarters * metre.beatsPerQuarter() / metre.top - tolerance));
+    return static_cast<std::int32_t>(std::min(bars * metre.top, 1e9));
 }
 
 Metre metreOf(const LCFileData* data) {
@@ -52,12 +52,13 @@ Metre metreOf(const LCFileData* data) {
             data->signatureBottom()};
 }
 
-/// Every note of every track, in the order of their starts.
-std::vector<Note> notesOf(const MidiSequence& sequence) {
+/// Every note of every track, in the order of their starts, in beats.
+std::vector<Note> notesOf(const MidiSequence& sequence, double beatsPerQuarter) {
     std::vector<Note> notes;
     for (const MidiTrack& track : sequence.tracks()) {
         for (const MidiNote& note : track.notes)
-            notes.push_back({note.start, note.end(), note.pitch, note.velocity});
+            notes.push_back(
+                {note.start * beatsPerQuarter, note.end() * beatsPerQuarter, note.pitch, note.velocity});
     }
     std::stable_sort(notes.begin(), notes.end(),
                      [](const Note& a, const Note& b) { return a.startTime < b.startTime; });
@@ -66,12 +67,13 @@ std::vector<Note> notesOf(const MidiSequence& sequence) {
 
 std::optional<RhythmResult> measured(const URL& url, const std::vector<Note>& notes, const Metre& metre,
                                      Error* error) {
-    if (notes.empty()) {
-        failFor(error, url, "nothing sounds in it");
+    if (metre.beats < 1 || metre.beats > kMostBeats) {
+        failFor(error, url,
+                fmt::format("a loop of {} beats cannot be measured; 1 to {} can", metre.beats, kMostBeats));
         return std::nullopt;
     }
-    if (metre.beats < 1 || metre.beats > kMostBeats) {
-        failFor(error, url, fmt::format("a loop of {} beats cannot be measured", metre.beats));
+    if (notes.empty()) {
+        failFor(error, url, "nothing sounds in it");
         return std::nullopt;
     }
     const auto analysis = QVCTMidiAnalysis::initWithTempo(static_cast<float>(metre.tempo), metre.beats,
@@ -112,8 +114,15 @@ std::optional<RhythmResult> measureMidi(const URL& url, const MidiSequence& sequ
         metre.bottom = sequence.meters().front().denominator;
     }
     applyRequest(request, metre);
-    if (metre.beats == 0) metre.beats = wholeBars(sequence.endOfNotes(), metre.top);
-    return measured(url, notesOf(sequence), metre, error);
+    if (metre.beats == 0) metre.beats = wholeBars(sequence.endOfNotes(), metre);
+    const auto notes = notesOf(sequence, metre.beatsPerQuarter());
+    if (notes.empty() && !sequence.problems().empty()) {
+        failFor(error, url, "nothing sounds in it: " + join(sequence.problems(), "; "));
+        return std::nullopt;
+    }
+    auto result = measured(url, notes, metre, error);
+    if (result) result->problems = sequence.problems();
+    return result;
 }
 
 /// The lowest and highest sample of equal slices of the file.
@@ -143,15 +152,22 @@ std::optional<RhythmResult> measureAudio(const URL& url, Metre metre, const Rhyt
     const auto decoder = AudioDecoder::open(url.path(), error);
     if (!decoder) return std::nullopt;
     const std::int64_t frames = decoder->frames();
+    if (frames <= 0) {
+        failFor(error, url, "it has no samples");
+        return std::nullopt;
+    }
     const double minutes = static_cast<double>(frames) / decoder->sampleRate() / 60;
     applyRequest(request, metre);
     if (metre.beats == 0)
-        metre.beats = static_cast<std::int32_t>(std::lround(std::min(metre.tempo * minutes, 1e6)));
+        metre.beats = static_cast<std::int32_t>(
+            std::lround(std::min(metre.tempo * minutes * metre.beatsPerQuarter(), 1e6)));
     if (metre.beats == 0) {
-        failFor(error, url, "its length in beats is unknown; say --beats or --tempo");
+        failFor(error, url,
+                metre.tempo > 0 ? "it is shorter than half a beat; say --beats"
+                                : "its length in beats is unknown; say --beats or --tempo");
         return std::nullopt;
     }
-    if (metre.tempo == 0) metre.tempo = metre.beats / minutes;
+    if (metre.tempo == 0) metre.tempo = metre.beats / minutes / metre.beatsPerQuarter();
     auto result =
         measured(url, notesOfOnsets(OnsetDetector::detect(*decoder), frames, metre.beats), metre, error);
     if (result) result->plot.waveform = waveformOf(url.path());
@@ -161,8 +177,7 @@ std::optional<RhythmResult> measureAudio(const URL& url, Metre metre, const Rhyt
 }  // namespace
 
 std::optional<RhythmResult> measureRhythm(const URL& url, const RhythmRequest& request, Error* error) {
-    const std::string extension = url.lowercasePathExtension();
-    if (extension == "mid" || extension == "midi") {
+    if (MidiSequence::supportsFileExtension(url.pathExtension())) {
         const auto sequence = MidiSequence::read(url.path(), error);
         return sequence ? measureMidi(url, *sequence, {}, request, error) : std::nullopt;
     }

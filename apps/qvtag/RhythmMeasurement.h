@@ -1,19 +1,24 @@
 #pragma once
 
 #include "RhythmPlot.h"
+#include "analysis/QVCTMidiAnalysis.h"
 #include "platform/Error.h"
 #include "platform/Url.h"
 
 #include <cstdint>
 #include <optional>
+#include <string>
 #include <vector>
 
 namespace qvct::tool {
 
+/// No loop is longer; what claims to be is a mistake.
+inline constexpr std::int32_t kMostBeats = QVCTMidiAnalysis::kLongestLoop;
+
 /// What a user knows better than the file.
 struct RhythmRequest {
-    std::optional<double> tempo;
-    std::optional<std::int32_t> beats;
+    std::optional<double> tempo;        ///< Quarter notes a minute.
+    std::optional<std::int32_t> beats;  ///< Of the signature's lower number, as all beats here.
     std::optional<std::int32_t> signatureTop;
     std::optional<std::int32_t> signatureBottom;
 };
@@ -23,9 +28,10 @@ struct RhythmResult {
     float complexity = 0;
     std::vector<double> onsets;  ///< Beats.
     std::int32_t beatCount = 0;
-    double tempo = 0;
+    double tempo = 0;  ///< Quarter notes a minute.
     std::int32_t signatureTop = 4;
     std::int32_t signatureBottom = 4;
+    std::vector<std::string> problems;  ///< What is damaged in the MIDI, and was left out.
     RhythmPlot plot;
 };
 

@@ -3,9 +3,11 @@
 #include "ToolContext.h"
 #include "platform/Text.h"
 #include "taxonomy/TGRTTaxonomySearching.h"
+#include "taxonomy/TagNormalization.h"
 
 #include <algorithm>
 #include <charconv>
+#include <utility>
 
 #include <fmt/format.h>
 
@@ -22,6 +24,13 @@ std::optional<double> levelOf(std::string_view text) {
     return level >= 0 && level <= 1 ? std::optional(level) : std::nullopt;
 }
 
+/// Whether whoever typed it meant a level, right or wrong.
+bool isMeantAsLevel(std::string_view text) {
+    const std::string word = lowercase(text);
+    return text.empty() || std::string_view("+-.%0123456789").find(text.front()) != std::string_view::npos ||
+           word == "nan" || word == "inf" || word == "infinity";
+}
+
 std::string knownCategories(const TGRTTaxonomy& taxonomy) {
     std::vector<std::string> names;
     for (const auto& category : taxonomy.categories()) names.push_back(category->identifier());
@@ -29,7 +38,14 @@ std::string knownCategories(const TGRTTaxonomy& taxonomy) {
 }
 
 /// What is wrong with adding the tag; empty when nothing is.
-std::string problemOf(const TagArgument& argument) {
+std::string problemOf(std::string_view text, const std::optional<TagArgument>& read, bool creates) {
+    if (!read) return fmt::format("\"{}\" is no Category/Label", printable(text));
+    const TagArgument& argument = *read;
+    if (argument.hasWrongLevel) {
+        return fmt::format("\"{}\": the level is out of range, which is 0 to 1, or 0% to 100%",
+                           printable(text));
+    }
+    if (creates) return {};
     const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
     if (!taxonomy->findCategoryWithIdentifier(argument.category)) {
         return fmt::format("no category \"{}\"; there are: {}", printable(argument.category),
@@ -55,55 +71,54 @@ std::optional<TagArgument> TagArgument::parse(std::string_view text, bool takesL
     TagArgument argument{std::string(text.substr(0, slash)), std::string(text.substr(slash + 1)), {}};
     const std::size_t equals = argument.label.rfind('=');
     if (takesLevel && equals != std::string::npos) {
-        argument.level = levelOf(std::string_view(argument.label).substr(equals + 1));
+        const std::string_view level =
+            trimBlanksAndLineBreaks(std::string_view(argument.label).substr(equals + 1));
+        argument.level = levelOf(level);
+        argument.hasWrongLevel = !argument.level && isMeantAsLevel(level);
         if (argument.level) argument.label.resize(equals);
     }
     return argument.label.empty() ? std::nullopt : std::optional(argument);
+}
+
+std::string TaggingEdit::add(const std::string& text, bool creates) {
+    const auto argument = TagArgument::parse(text, true);
+    std::string problem = problemOf(text, argument, creates);
+    if (!problem.empty()) return problem;
+    const auto tag =
+        TGRTTaxonomy::mutableDefaultTaxonomy()->findOrCreateTagWithLabel(argument->label, argument->category);
+    auto tagging = TGRTTagging::initWithTag(
+        tag, argument->level ? TGRTLevel::levelWithWeight(*argument->level) : nullptr);
+    if (!tagging) return fmt::format("\"{}\" is no label", printable(argument->label));
+    // Of several levels for one tag the last counts.
+    std::erase_if(added_, [&](const auto& earlier) {
+        return isOfTag(*earlier, tagging->category(), tagging->label());
+    });
+    added_.push_back(std::move(tagging));
+    return {};
+}
+
+std::string TaggingEdit::remove(const std::string& text) {
+    auto argument = TagArgument::parse(text, false);
+    if (!argument) return fmt::format("\"{}\" is no Category/Label", printable(text));
+    const std::string typed = std::exchange(argument->label, normalizedTagString(argument->label));
+    if (argument->label.empty()) return fmt::format("\"{}\" is no label", printable(typed));
+    removed_.push_back(*argument);
+    const bool isAdded = std::any_of(added_.begin(), added_.end(), [&](const auto& added) {
+        return isOfTag(*added, argument->category, argument->label);
+    });
+    return isAdded ? fmt::format("\"{}\" is both added and removed", printable(text)) : "";
 }
 
 std::optional<TaggingEdit> TaggingEdit::make(const std::vector<std::string>& add,
                                              const std::vector<std::string>& remove, bool creates,
                                              ToolContext& context) {
     TaggingEdit edit;
-    bool isRight = true;
-    const auto refuse = [&](const std::string& message) {
-        context.usageFailed(message);
-        isRight = false;
-    };
-    const auto taxonomy = TGRTTaxonomy::mutableDefaultTaxonomy();
-    for (const std::string& text : add) {
-        const auto argument = TagArgument::parse(text, true);
-        const std::string problem = !argument ? fmt::format("\"{}\" is no Category/Label", printable(text))
-                                    : creates ? std::string{}
-                                              : problemOf(*argument);
-        if (!problem.empty()) {
-            refuse(problem);
-            continue;
-        }
-        const auto tag = taxonomy->findOrCreateTagWithLabel(argument->label, argument->category);
-        auto tagging = TGRTTagging::initWithTag(
-            tag, argument->level ? TGRTLevel::levelWithWeight(*argument->level) : nullptr);
-        if (!tagging) {
-            refuse(fmt::format("\"{}\" is no label", printable(argument->label)));
-            continue;
-        }
-        // Of several levels for one tag the last counts.
-        std::erase_if(edit.added_, [&](const auto& earlier) {
-            return isOfTag(*earlier, tagging->category(), tagging->label());
-        });
-        edit.added_.push_back(std::move(tagging));
-    }
-    for (const std::string& text : remove) {
-        const auto argument = TagArgument::parse(text, false);
-        if (argument) edit.removed_.push_back(*argument);
-        if (!argument) refuse(fmt::format("\"{}\" is no Category/Label", printable(text)));
-        const bool isAdded =
-            argument && std::any_of(edit.added_.begin(), edit.added_.end(), [&](const auto& added) {
-                return isOfTag(*added, argument->category, argument->label);
-            });
-        if (isAdded) refuse(fmt::format("\"{}\" is both added and removed", printable(text)));
-    }
-    return isRight ? std::optional(edit) : std::nullopt;
+    std::vector<std::string> problems;
+    for (const std::string& text : add) problems.push_back(edit.add(text, creates));
+    for (const std::string& text : remove) problems.push_back(edit.remove(text));
+    std::erase(problems, "");
+    for (const std::string& problem : problems) context.usageFailed(problem);
+    return problems.empty() ? std::optional(edit) : std::nullopt;
 }
 
 ObjectSet<TGRTTagging> TaggingEdit::apply(const ObjectSet<TGRTTagging>& taggings) const {

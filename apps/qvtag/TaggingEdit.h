@@ -20,6 +20,7 @@ struct TagArgument {
     std::string category;
     std::string label;
     std::optional<double> level;
+    bool hasWrongLevel = false;  ///< What follows the last "=" is meant as a level, and is none.
 
     /// Nothing when there is no category or no label.
     static std::optional<TagArgument> parse(std::string_view text, bool takesLevel);
@@ -39,6 +40,10 @@ class TaggingEdit {
     ObjectSet<TGRTTagging> apply(const ObjectSet<TGRTTagging>& taggings) const;
 
   private:
+    /// Each answers what is wrong; nothing when nothing is.
+    std::string add(const std::string& text, bool creates);
+    std::string remove(const std::string& text);
+
     std::vector<std::shared_ptr<TGRTTagging>> added_;
     std::vector<TagArgument> removed_;
 };

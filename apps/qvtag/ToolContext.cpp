@@ -22,21 +22,33 @@ void printLine(std::string_view message) {
     fmt::print(stderr, "qvtag: {}\n", message);
 }
 
-/// The library logs a broken keyword or rule for every item that it meets; a person wants to read it once.
-LogHandler printOnce() {
-    const auto seen = std::make_shared<std::set<std::string, std::less<>>>();
-    const auto mutex = std::make_shared<std::mutex>();
-    return [seen, mutex](std::string_view message) {
-        constexpr std::size_t enough = 1000;
-        const std::lock_guard lock(*mutex);
-        if (seen->size() < enough && seen->emplace(message).second) printLine(message);
-    };
-}
-
 }  // namespace
 
-ToolContext::ToolContext() : terminal_(Terminal::ofStandardOutput()) {
-    setLogHandler(printOnce());
+/// What the library logged; it does so for every item that meets a broken keyword or rule, and a person wants
+/// to read it once.
+class ToolContext::LoggedLines {
+  public:
+    void print(std::string_view message) {
+        constexpr std::string_view kOfDataFiles = "Indexing ";
+        if (message.starts_with(kOfDataFiles)) message.remove_prefix(kOfDataFiles.size());
+        const std::lock_guard lock(mutex_);
+        if (lines_.size() < kEnough && lines_.emplace(message).second) printLine(message);
+    }
+    bool contain(std::string_view message) {
+        const std::lock_guard lock(mutex_);
+        return lines_.contains(message);
+    }
+
+  private:
+    static constexpr std::size_t kEnough = 1000;
+
+    std::mutex mutex_;
+    std::set<std::string, std::less<>> lines_;
+};
+
+ToolContext::ToolContext()
+    : terminal_(Terminal::ofStandardOutput()), logged_(std::make_shared<LoggedLines>()) {
+    setLogHandler([logged = logged_](std::string_view message) { logged->print(message); });
 }
 
 void ToolContext::prepare() {
@@ -44,7 +56,7 @@ void ToolContext::prepare() {
 }
 
 void ToolContext::itemFailed(std::string_view message) {
-    printLine(message);
+    if (!logged_->contain(message)) printLine(message);
     loggedFailure();
 }
 

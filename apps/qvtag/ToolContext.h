@@ -26,7 +26,8 @@ class ToolContext {
     void prepare();
     const Terminal& terminal() const { return terminal_; }
 
-    /// One line on standard error; the tool will say by its exit status that some items failed.
+    /// One line on standard error, unless the library logged the same; the tool will say by its exit status
+    /// that some items failed.
     void itemFailed(std::string_view message);
     /// The same when the log has named it already.
     void loggedFailure();
@@ -42,7 +43,10 @@ class ToolContext {
     std::vector<URL> contentItems(const std::vector<std::string>& paths);
 
   private:
+    class LoggedLines;
+
     Terminal terminal_;
+    std::shared_ptr<LoggedLines> logged_;
     int exitStatus_ = 0;
 };
 

@@ -3,6 +3,8 @@
 #include "Verification.h"
 #include "formats/TGRTFileNode.h"
 #include "formats/bundle/TGRTBundleMetaDataReader.h"
+#include "formats/bundle/TGRTBundleTypeValidators.h"
+#include "formats/settings/TGRTBinaryFileMetaDataReader.h"
 #include "platform/FileAccess.h"
 #include "platform/PropertyListFile.h"
 #include "platform/Text.h"
@@ -63,6 +65,20 @@ std::vector<std::string> foreignEntries(const URL& url) {
     return keys;
 }
 
+/// Why nothing can be written to an item of a kind that is none of those with writers.
+std::string reasonNotWritten(const URL& url) {
+    const std::string path = printable(url.path());
+    if (TGRTBinaryFileMetaDataReader::supportsFileExtension(url.pathExtension()))
+        return path + ": data files are never written";
+    Error error;
+    TGRTFileNode::nodeWithFileURL(url)->readMetaDataWithOptions(0, &error);
+    if (!error.message.empty()) return error.message;
+    const URL folder = url.URLByDeletingLastPathComponent();
+    return TGRTPatchTypeValidator().isValidContentTypeAtFileURL(folder)
+               ? fmt::format("{}: belongs to the patch it lies in, {}", path, printable(folder.path()))
+               : path + ": cannot be written";
+}
+
 std::optional<Change> changeOfItem(const URL& url, const TaggingEdit& edit, const Options& options,
                                    ToolContext& context) {
     const auto node = TGRTFileNode::nodeWithFileURL(url);
@@ -70,9 +86,7 @@ std::optional<Change> changeOfItem(const URL& url, const TaggingEdit& edit, cons
     Error error;
     Change change{.url = url};
     if (!node->validator()) {
-        node->readMetaDataWithOptions(0, &error);
-        const std::string reason = error.message.empty() ? path + ": cannot be written" : error.message;
-        context.itemFailed(reason);
+        context.itemFailed(reasonNotWritten(url));
         return std::nullopt;
     }
     change.record = node->readMetaDataWithOptions(0, &error);

@@ -1,9 +1,10 @@
 #include "platform/LCFileData.h"
 
 #include "platform/TaggingTypes.h"
+#include "platform/loopfile/MusicValues.h"
 
 #include <algorithm>
-#include <cmath>
+#include <bit>
 #include <limits>
 #include <utility>
 
@@ -19,6 +20,8 @@ constexpr std::string_view kGenre = "Genre";
 constexpr std::string_view kMidiData = "MidiData";
 constexpr std::string_view kTransientMarkers = "TransientMarkers";
 
+constexpr int kLargest = std::numeric_limits<int>::max();
+
 }  // namespace
 
 LCFileData::LCFileData(LCAudioFacts facts, std::optional<Dictionary> record)
@@ -32,24 +35,23 @@ std::shared_ptr<LCFileData> LCFileData::withFacts(LCAudioFacts facts) const {
     return result;
 }
 
-int LCFileData::integer(std::string_view key, int otherwise) const {
+std::optional<double> LCFileData::number(std::string_view key, double lowest, double highest) const {
     const PropertyList* value = record_.value(key);
-    if (value == nullptr || !value->isNumber()) return otherwise;
-    using Limits = std::numeric_limits<int>;
-    return static_cast<int>(
-        std::clamp<std::int64_t>(value->integerValue().value_or(otherwise), Limits::min(), Limits::max()));
+    if (value == nullptr || !value->isNumber()) return std::nullopt;
+    const std::optional<double> number = value->doubleValue();
+    return number && *number >= lowest && *number <= highest ? number : std::nullopt;
+}
+
+int LCFileData::integer(std::string_view key, int lowest, int highest, int otherwise) const {
+    return static_cast<int>(number(key, lowest, highest).value_or(otherwise));
 }
 
 void LCFileData::setInteger(std::string_view key, int value, int current) {
     if (value != current) record_.set(key, value);
 }
 
-float LCFileData::real(std::string_view key, float otherwise) const {
-    const PropertyList* value = record_.value(key);
-    const double number =
-        value == nullptr || !value->isNumber() ? otherwise : value->doubleValue().value_or(0);
-    return number >= 0 && number <= double{std::numeric_limits<float>::max()} ? static_cast<float>(number)
-                                                                              : 0;
+float LCFileData::real(std::string_view key, double highest, float otherwise) const {
+    return static_cast<float>(number(key, 0, highest).value_or(otherwise));
 }
 
 std::optional<std::string> LCFileData::text(std::string_view key) const {
@@ -68,7 +70,7 @@ void LCFileData::setText(std::string_view key, std::optional<std::string> value)
 }
 
 bool LCFileData::hasLoopTypeChunks() const {
-    return facts_.isLoop || integer(QVContentKeyTavioLoopType, -1) >= 0;
+    return facts_.isLoop || integer(QVContentKeyTavioLoopType, -1, kLargest, -1) >= 0;
 }
 
 const LCFileData::Dictionary& LCFileData::taggingDictionary() const {
@@ -102,7 +104,7 @@ void LCFileData::setDisplayName(std::string_view value) {
 
 int LCFileData::tavioLoopType() const {
     const int withoutRecord = !facts_.isLoop ? -1 : midiData().empty() ? 0 : 1;
-    return integer(QVContentKeyTavioLoopType, withoutRecord);
+    return integer(QVContentKeyTavioLoopType, -1, kLargest, withoutRecord);
 }
 
 void LCFileData::setTavioLoopType(int value) {
@@ -110,7 +112,7 @@ void LCFileData::setTavioLoopType(int value) {
 }
 
 int LCFileData::beatCount() const {
-    return integer(QVContentKeyBeatCount, facts_.beatCount);
+    return integer(QVContentKeyBeatCount, 0, kMostBeats, facts_.beatCount);
 }
 
 void LCFileData::setBeatCount(int value) {
@@ -118,7 +120,7 @@ void LCFileData::setBeatCount(int value) {
 }
 
 int LCFileData::midiRootNote() const {
-    return integer(QVContentKeyMidiRootNote, facts_.midiRootNote);
+    return integer(QVContentKeyMidiRootNote, -1, 127, facts_.midiRootNote);
 }
 
 void LCFileData::setMidiRootNote(int value) {
@@ -126,7 +128,7 @@ void LCFileData::setMidiRootNote(int value) {
 }
 
 int LCFileData::keyType() const {
-    return integer(QVContentKeyKeyType, facts_.keyType);
+    return integer(QVContentKeyKeyType, 0, 4, facts_.keyType);
 }
 
 void LCFileData::setKeyType(int value) {
@@ -134,7 +136,7 @@ void LCFileData::setKeyType(int value) {
 }
 
 int LCFileData::signatureTop() const {
-    return integer(QVContentKeySignatureTop, facts_.signatureTop);
+    return integer(QVContentKeySignatureTop, 0, kLargestSignature, facts_.signatureTop);
 }
 
 void LCFileData::setSignatureTop(int value) {
@@ -142,7 +144,9 @@ void LCFileData::setSignatureTop(int value) {
 }
 
 int LCFileData::signatureBottom() const {
-    return integer(QVContentKeySignatureBottom, facts_.signatureBottom);
+    const int bottom = integer(QVContentKeySignatureBottom, 0, kLargestSignature, facts_.signatureBottom);
+    const bool isNoteValue = bottom == 0 || std::has_single_bit(static_cast<unsigned>(bottom));
+    return isNoteValue ? bottom : facts_.signatureBottom;
 }
 
 void LCFileData::setSignatureBottom(int value) {
@@ -150,7 +154,7 @@ void LCFileData::setSignatureBottom(int value) {
 }
 
 float LCFileData::bpm() const {
-    return real(kTempo, facts_.bpm);
+    return real(kTempo, kFastestTempo, facts_.bpm);
 }
 
 void LCFileData::setBpm(float value) {
@@ -158,7 +162,8 @@ void LCFileData::setBpm(float value) {
 }
 
 float LCFileData::lengthInSeconds() const {
-    return real(QVContentKeyLengthInSeconds, facts_.lengthInSeconds);
+    if (facts_.lengthInSeconds > 0) return facts_.lengthInSeconds;
+    return real(QVContentKeyLengthInSeconds, kLongestSeconds, 0);
 }
 
 void LCFileData::setLengthInSeconds(float value) {
@@ -218,11 +223,12 @@ std::vector<std::int64_t> LCFileData::transientMarkers() const {
     const PropertyList* value = record_.value(kTransientMarkers);
     const PropertyList::Array* items = value == nullptr ? nullptr : value->array();
     if (items == nullptr) return facts_.transientMarkers;
+    const bool isLengthKnown = facts_.frameCount > 0;
+    const std::int64_t lastFrame = isLengthKnown ? static_cast<std::int64_t>(facts_.frameCount) : INT64_MAX;
     std::vector<std::int64_t> frames;
     for (const PropertyList& item : *items) {
-        if (const std::int64_t* frame = item.signedInteger(); frame != nullptr && *frame >= 0) {
-            frames.push_back(*frame);
-        }
+        const std::int64_t* frame = item.signedInteger();
+        if (frame != nullptr && *frame >= 0 && *frame <= lastFrame) frames.push_back(*frame);
     }
     std::sort(frames.begin(), frames.end());
     return frames;

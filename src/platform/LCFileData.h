@@ -41,8 +41,8 @@ struct LCAudioFacts {
 ///
 /// A setter that changes a value writes it into the record; one that sets the value which is there anyway
 /// leaves the record as it is, so that a rewrite does not freeze what other makers' chunks say. Keys of the
-/// record that this class does not know survive, and so does the order of the keys. Values of a wrong type in
-/// a record count as absent. Not thread-safe while it is changed.
+/// record that this class does not know survive, and so does the order of the keys. Values of a wrong type or
+/// out of range in a record count as absent. Not thread-safe while it is changed.
 class LCFileData {
   public:
     using Dictionary = PropertyList::Dictionary;
@@ -69,6 +69,7 @@ class LCFileData {
     /// -1 no loop, 0 a loop of audio only, above 0 a loop that holds MIDI.
     int tavioLoopType() const;
     void setTavioLoopType(int value);
+    /// 0 is unknown.
     int beatCount() const;
     void setBeatCount(int value);
     /// 0 to 127; -1 is unknown.
@@ -85,7 +86,8 @@ class LCFileData {
     /// Quarter notes a minute; 0 is unknown. Always finite.
     float bpm() const;
     void setBpm(float value);
-    /// Plain file data knows it from the record only, enhanced data from the file's header too; 0 is unknown.
+    /// Plain file data knows it from the record only, enhanced data from the file's header, which counts
+    /// before the record; 0 is unknown.
     float lengthInSeconds() const;
     void setLengthInSeconds(float value);
 
@@ -117,9 +119,10 @@ class LCFileData {
     std::shared_ptr<LCFileData> withFacts(LCAudioFacts facts) const;
 
   private:
-    int integer(std::string_view key, int otherwise) const;
+    std::optional<double> number(std::string_view key, double lowest, double highest) const;
+    int integer(std::string_view key, int lowest, int highest, int otherwise) const;
     void setInteger(std::string_view key, int value, int current);
-    float real(std::string_view key, float otherwise) const;
+    float real(std::string_view key, double highest, float otherwise) const;
     std::optional<std::string> text(std::string_view key) const;
     void setText(std::string_view key, std::optional<std::string> value);
 

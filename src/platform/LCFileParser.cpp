@@ -5,6 +5,7 @@
 #include "platform/Text.h"
 #include "platform/loopfile/ChunkMeanings.h"
 #include "platform/loopfile/Container.h"
+#include "platform/loopfile/MusicValues.h"
 
 #include <cmath>
 #include <optional>
@@ -69,25 +70,24 @@ std::set<std::string> wordsOfName(const std::string& path) {
     return words;
 }
 
-/// Tempo counts quarter notes, and so do beats.
+/// Tempo counts quarter notes, beats are notes of the meter's lower number.
 void derive(LCAudioFacts& facts, const LCFileData& data) {
     if (facts.sampleRate > 0) {
         facts.lengthInSeconds = static_cast<float>(static_cast<double>(facts.frameCount) / facts.sampleRate);
     }
     const double minutes =
-        double{data.lengthInSeconds() > 0 ? data.lengthInSeconds() : facts.lengthInSeconds} / 60;
+        double{facts.lengthInSeconds > 0 ? facts.lengthInSeconds : data.lengthInSeconds()} / 60;
     if (minutes <= 0) return;
+    const double beatsPerQuarter = data.signatureBottom() > 0 ? data.signatureBottom() / 4.0 : 1;
     if (data.bpm() == 0 && data.beatCount() > 0) {
-        const double bpm = data.beatCount() / minutes;
-        constexpr double kFastest = 1000;
-        if (bpm <= kFastest) facts.bpm = static_cast<float>(bpm);
+        const double bpm = data.beatCount() / minutes / beatsPerQuarter;
+        if (bpm <= kFastestTempo) facts.bpm = static_cast<float>(bpm);
     }
     if (data.beatCount() == 0 && data.bpm() > 0) {
-        const double beats = double{data.bpm()} * minutes;
-        constexpr double kMostBeats = 1e6;
+        const double beats = double{data.bpm()} * minutes * beatsPerQuarter;
         constexpr double kTolerance = 0.02;  // a loop is cut to the frame, its tempo often to 2 decimals
         const bool isWhole = std::abs(beats - std::round(beats)) <= kTolerance;
-        if (beats > 0.5 && beats < kMostBeats && isWhole)
+        if (beats > 0.5 && beats < double{kMostBeats} && isWhole)
             facts.beatCount = static_cast<int>(std::lround(beats));
     }
 }

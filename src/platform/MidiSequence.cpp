@@ -2,6 +2,7 @@
 
 #include "platform/FileAccess.h"
 #include "platform/MidiTrackReader.h"
+#include "platform/Text.h"
 
 #include <algorithm>
 #include <cstddef>
@@ -189,6 +190,11 @@ class MidiSequenceBuilder {
     std::vector<MidiTrackEvents> tracks_;
     MidiSequence sequence_;
 };
+
+bool MidiSequence::supportsFileExtension(std::string_view extension) {
+    const std::string lowercased = lowercase(extension);
+    return lowercased == "mid" || lowercased == "midi";
+}
 
 std::optional<MidiSequence> MidiSequence::parse(std::span<const std::uint8_t> bytes, Error* error) {
     if (bytes.size() > kLargestFile) {

@@ -6,6 +6,7 @@
 #include <optional>
 #include <span>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace qvct {
@@ -51,6 +52,9 @@ class MidiSequence {
   public:
     /// Largest file that is read: 16 MB.
     static constexpr std::uint64_t kLargestFile = 16ULL << 20;
+
+    /// "mid" and "midi", in capitals too.
+    static bool supportsFileExtension(std::string_view extension);
 
     /// Nothing, and an error, when the bytes do not begin with a usable header or are too many.
     ///

@@ -58,6 +58,10 @@ TGRTCategory::IndexAnswer TGRTCategory::tagsWithLabel(const LabelKey& label) con
     return {hit->second, hit->second != nullptr};
 }
 
+bool TGRTCategory::doesContain(const TGRTTag& tag) const {
+    return tags_.contains(tag);
+}
+
 ObjectSet<TGRTTag> TGRTCategory::rootTags() const {
     ObjectSet<TGRTTag> roots;
     for (const auto& tag : tags_) {

@@ -50,7 +50,7 @@ class QVCT_API TGRTCategory : public Object,
     /// Takes the tag out; its children stay. Null is ignored.
     void removeTag(const std::shared_ptr<TGRTTag>& tag);
     /// Whether an equal tag is here, at any depth.
-    bool doesContain(const TGRTTag& tag) const { return tags_.contains(tag); }
+    bool doesContain(const TGRTTag& tag) const;
     const ObjectSet<TGRTTag>& tags() const override { return tags_; }
     /// All tags in the order in which they joined.
     const std::vector<std::shared_ptr<TGRTTag>>& orderedTags() const { return tags_.ordered(); }

@@ -140,7 +140,15 @@ TEST(Write, RefusesWrongWordsBeforeAnythingIsTouched) {
         {{"--add", "Genres/Huose"}, "no tag \"Huose\" in Genres"},
         {{"--add", "Genre/House"}, "no category \"Genre\"; there are: Artist"},
         {{"--add", "House"}, "\"House\" is no Category/Label"},
-        {{"--add", "Genres/House=1.5"}, "no tag \"House=1.5\""},
+        {{"--create", "--add", "Genres/House=1.5"}, "\"Genres/House=1.5\": the level is out of range"},
+        {{"--create", "--add", "Genres/House=150%"}, "the level is out of range, which is 0 to 1, or 0% to"},
+        {{"--create", "--add", "Genres/House=-1"}, "out of range"},
+        {{"--create", "--add", "Genres/House=.5.5"}, "out of range"},
+        {{"--create", "--add", "Genres/House="}, "out of range"},
+        {{"--create", "--add", "Genres/House=%"}, "out of range"},
+        {{"--create", "--add", "Genres/House= NaN"}, "out of range"},
+        {{"--add", "Genres/House=inf"}, "out of range"},
+        {{"--remove", "Genres/%!"}, "\"%!\" is no label"},
         {{"--remove", "/House"}, "\"/House\" is no Category/Label"},
         {{}, "nothing to write"},
         {{""}, "an empty path names nothing"},  // and not all of the current folder
@@ -154,8 +162,22 @@ TEST(Write, RefusesWrongWordsBeforeAnythingIsTouched) {
         EXPECT_THAT(result.errors, HasSubstr(c.message));
         EXPECT_FALSE(std::filesystem::exists(item + ".plist"));
     }
-    EXPECT_EQ(runTool({"write", item, "--create", "--add", "Custom/Huose/x"}).status, 0);
-    EXPECT_THAT(tagsOf(runTool({"read", "--json", item}).json()[0]), ElementsAre("Custom/Huose/x"));
+    EXPECT_EQ(runTool({"write", item, "--create", "--add", "Custom/Huose/x", "--add", "Custom/A=B"}).status,
+              0);
+    EXPECT_THAT(tagsOf(runTool({"read", "--json", item}).json()[0]),
+                ElementsAre("Custom/A=B", "Custom/Huose/x"));
+}
+
+TEST(Write, RemovesALabelAsItWasAdded) {
+    const Items items;
+    const std::string item = items.folder.path("Bass.cst");
+    const std::string label = "Genres/My%Tag!";
+    EXPECT_EQ(runTool({"write", item, "--create", "--add", label}).status, 0);
+    const ToolResult both = runTool({"write", item, "--create", "--add", label, "--remove", label});
+    EXPECT_THAT(both.errors, HasSubstr("is both added and removed"));
+    EXPECT_THAT(tagsOf(runTool({"read", "--json", item}).json()[0]), ElementsAre("Genres/MyTag"));
+    EXPECT_EQ(runTool({"write", item, "--remove", label}).status, 0);
+    EXPECT_THAT(tagsOf(runTool({"read", "--json", item}).json()[0]), IsEmpty());
 }
 
 TEST(Write, NamesWhatFailsAndDoesTheRest) {
@@ -167,11 +189,15 @@ TEST(Write, NamesWhatFailsAndDoesTheRest) {
     items.folder.write("Pad.patch/tags.plist",
                        "<plist version=\"1.0\"><dict><key>Mine</key><true/></dict></plist>");
     const std::string patch = items.folder.path("Pad.patch");
-    const ToolResult result = runTool(
-        {"write", "--json", "--name", "New", broken, text, sad, patch, items.folder.path("Bass.cst")});
+    const std::string data = items.folder.write("d.data", "");
+    const std::string inner = items.folder.write("Pad.patch/#Root.cst", "");
+    const ToolResult result = runTool({"write", "--json", "--name", "New", broken, text, sad, patch, data,
+                                       inner, items.folder.path("Bass.cst")});
     EXPECT_EQ(result.status, 1);
     EXPECT_EQ(result.json().size(), 1U);
-    for (const std::string& message : {broken, text + ": no kind of content", list, patch + ": not renamed"})
+    for (const std::string& message : {broken, text + ": no kind of content", list, patch + ": not renamed",
+                                       data + ": data files are never written\n",
+                                       inner + ": belongs to the patch it lies in, " + patch + "\n"})
         EXPECT_THAT(result.errors, HasSubstr(message));
     EXPECT_EQ(readAll(list), "no list");
     EXPECT_EQ(runTool({"write", "--add", "Genres/House", patch}).status, 0);
@@ -294,6 +320,23 @@ TEST(Inspect, ShowsWhatIsInEveryKindOfItem) {
     const ToolResult data = runTool({"inspect", items.folder.path("bits.data")});
     EXPECT_EQ(data.status, 1);
     EXPECT_THAT(data.errors, HasSubstr("bits.data: the property list at byte 2 has no end"));
+    const ToolResult once = runTool({"read", items.folder.path("bits.data")});
+    EXPECT_EQ(once.status, 1);
+    EXPECT_EQ(once.errors,
+              "qvtag: " + items.folder.path("bits.data") + ": the property list at byte 2 has no end\n");
+}
+
+TEST(Inspect, ListsTheTracksOfMidiFiles) {
+    const TemporaryFolder folder;
+    const std::string notes = emptyMidi();
+    const ToolResult midi = runTool({"inspect", "--json", folder.write("a.mid", notes)});
+    EXPECT_EQ(midi.status, 0) << midi.errors;
+    const json parts = midi.json()[0]["parts"];
+    const json* track = partWithId(parts, "track 1");
+    ASSERT_NE(track, nullptr) << midi.output;
+    EXPECT_EQ((*track)["meaning"], "0 notes, 0 beats");
+    const ToolResult cut = runTool({"inspect", folder.write("cut.mid", notes.substr(0, notes.size() - 2))});
+    EXPECT_THAT(cut.output, HasSubstr("FAULT: "));
 }
 
 }  // namespace

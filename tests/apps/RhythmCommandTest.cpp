@@ -87,6 +87,41 @@ TEST(RhythmCommand, TakesTempoMetreAndLengthFromAMidiFileOrTheOptions) {
     EXPECT_THAT(runTool({"rhythm", file}).output, HasSubstr("4 onsets in 6 beats of 3/4 at 100 bpm\n"));
 }
 
+TEST(RhythmCommand, ABarPlayedSeveralTimesIsAsDenseAsOnce) {
+    const TemporaryFolder folder;
+    struct {
+        unsigned top, bottom;
+        std::vector<unsigned> sixteenths;  // of a bar
+    } const cases[] = {{4, 4, {0, 3, 6, 10}},
+                       {3, 4, {0, 4, 11}},
+                       {6, 8, {0, 2, 6, 11}},
+                       {3, 8, {0, 4}},
+                       {2, 2, {0, 6, 8, 15}}};
+    for (const auto& c : cases) {
+        const std::string facts = std::string("\0\xFF\x58\x04", 4) + big(c.top, 1) +
+                                  big(static_cast<unsigned>(std::countr_zero(c.bottom)), 1) + "\x18\x08";
+        json once;
+        for (unsigned bars = 1; bars <= 4; ++bars) {
+            std::vector<unsigned> starts;
+            for (unsigned bar = 0; bar < bars; ++bar) {
+                for (const unsigned start : c.sixteenths)
+                    starts.push_back(bar * 16 * c.top / c.bottom + start);
+            }
+            const json item = rhythm({folder.write("a.mid", midi(starts, facts))}).json()[0];
+            if (bars == 1) once = item;
+            const std::string what = once["signature"].get<std::string>() + " x " + std::to_string(bars);
+            EXPECT_EQ(item["beatCount"], bars * c.top) << what;
+            ASSERT_EQ(item["onsets"].size(), starts.size()) << what;
+            EXPECT_EQ(item["onsets"].back(), starts.back() * c.bottom / 16.0) << what;
+            EXPECT_NEAR(item["density"].get<double>(), once["density"].get<double>(), 1e-6) << what;
+        }
+    }
+    // The same of a sound: two seconds of 6/8 at 90 quarter notes a minute.
+    const std::string sound = folder.write("c.wav", clicks({11025, 33075}));
+    EXPECT_EQ(rhythm({sound, "--tempo", "90", "--signature", "6/8"}).json()[0]["beatCount"], 6);
+    EXPECT_EQ(rhythm({sound, "--beats", "6", "--signature", "6/8"}).json()[0]["tempo"], 90.0);
+}
+
 TEST(RhythmCommand, ReadsTheNotesInALoopAndListensToOthers) {
     const TemporaryFolder folder;
     demo::writeLibrary(folder.path());
@@ -117,6 +152,14 @@ TEST(RhythmCommand, AsksForTheLengthThatASoundDoesNotTell) {
     ASSERT_EQ(told["onsets"].size(), 3U);
     for (std::size_t i = 0; i < 3; ++i) EXPECT_NEAR(told["onsets"][i], 0.5 + static_cast<double>(i), 0.01);
     EXPECT_EQ(rhythm({file, "--tempo", "60"}).json()[0]["beatCount"], 2);
+    const Wav wav;
+    const std::string empty = folder.write("e.wav", wav.file(wav.format(1) + wav.chunk("data", "")));
+    const std::string brief = folder.write("s.wav", wav.file(wav.format(1) + wav.data(2000)));
+    for (const char* tempo : {"120", "60"}) {
+        EXPECT_THAT(rhythm({empty, "--tempo", tempo}).errors, HasSubstr("e.wav: it has no samples\n"));
+        EXPECT_THAT(rhythm({brief, "--tempo", tempo}).errors,
+                    HasSubstr("s.wav: it is shorter than half a beat; say --beats\n"));
+    }
 }
 
 TEST(RhythmCommand, DrawsAPlot) {
@@ -130,6 +173,31 @@ TEST(RhythmCommand, DrawsAPlot) {
     const ToolResult lost = runTool({"rhythm", file, "--plot", folder.path("no/p.svg")});
     EXPECT_EQ(lost.status, 1);
     EXPECT_THAT(lost.errors, HasSubstr("no/p.svg: cannot make a file beside it: No such file"));
+
+    struct {
+        std::string target;
+        const char* reason;
+    } const refused[] = {
+        {file, "is to be read"},
+        {folder.path("hard.svg"), "is to be read"},
+        {folder.write("other.mid", midi({0})), "is no SVG"},
+        {folder.write("words.svg", "words"), "is no SVG"},
+        {folder.write("drawing.txt", "<svg "), "is no SVG"},
+        {folder.path(), "is no SVG"},
+    };
+    std::filesystem::create_hard_link(file, refused[1].target);
+    for (const auto& c : refused) {
+        const std::string before = std::filesystem::is_directory(c.target) ? "" : readAll(c.target);
+        const ToolResult result = runTool({"rhythm", file, "--plot", c.target});
+        EXPECT_EQ(result.status, 2) << c.target;
+        EXPECT_THAT(result.errors, HasSubstr(c.target + ": " + c.reason));
+        EXPECT_EQ(result.output, "");
+        if (!before.empty()) {
+            EXPECT_EQ(readAll(c.target), before) << c.target;
+        }
+    }
+    for (const std::string& target : {plot, folder.write("x.SVG", "<?xml version=\"1.0\"?><svg/>")})
+        EXPECT_EQ(runTool({"rhythm", file, "--plot", target}).status, 0) << target;
 }
 
 TEST(RhythmCommand, NamesWhatCannotBeMeasuredAndDoesTheRest) {
@@ -138,16 +206,16 @@ TEST(RhythmCommand, NamesWhatCannotBeMeasuredAndDoesTheRest) {
     const Wav wav;
     const struct {
         std::string path, reason;
-    } rows[] = {
-        {folder.path("none.mid"), "none.mid: No such file"},
-        {folder.path("none.wav"), "none.wav: "},
-        {folder.write("text.mid", "no notes"), "text.mid: "},
-        {folder.write("text.wav", "no sound"), "text.wav: "},
-        {folder.write("d.mid", "MThd" + big(6, 4) + big(0, 2) + big(1, 2) + big(0, 2)), "d.mid: "},
-        {folder.write("empty.mid", emptyMidi()), "empty.mid: nothing sounds in it"},
-        {folder.write("silence.wav", clicks({})), "silence.wav: nothing sounds in it"},
-        {folder.write("nothing.wav", wav.file(wav.format(1) + wav.chunk("data", ""))), "nothing.wav: "},
-        {folder.path(), folder.path() + ": "}};
+    } rows[] = {{folder.path("none.mid"), "none.mid: No such file"},
+                {folder.path("none.wav"), "none.wav: "},
+                {folder.write("text.mid", "no notes"), "text.mid: "},
+                {folder.write("text.wav", "no sound"), "text.wav: "},
+                {folder.write("d.mid", "MThd" + big(6, 4) + big(0, 2) + big(1, 2) + big(0, 2)), "d.mid: "},
+                {folder.write("empty.mid", emptyMidi()), "empty.mid: nothing sounds in it"},
+                {folder.write("silence.wav", clicks({})), "silence.wav: nothing sounds in it"},
+                {folder.write("nothing.wav", wav.file(wav.format(1) + wav.chunk("data", ""))),
+                 "nothing.wav: it has no samples"},
+                {folder.path(), folder.path() + ": "}};
     for (const auto& row : rows) {
         const ToolResult result = rhythm({row.path, good, "--beats", "4"});
         EXPECT_EQ(result.status, 1) << row.path;
@@ -157,6 +225,7 @@ TEST(RhythmCommand, NamesWhatCannotBeMeasuredAndDoesTheRest) {
     }
     for (const std::vector<std::string>& words : {std::vector<std::string>{"--beats", "0"},
                                                   {"--beats", "-4"},
+                                                  {"--beats", "16385"},
                                                   {"--tempo", "0"},
                                                   {"--tempo", "nan"},
                                                   {"--signature", "0/4"},
@@ -178,7 +247,26 @@ TEST(RhythmCommand, LengthsThatDoNotFitGiveNumbersAllTheSame) {
             for (const json& item : result.json()) expectSound(item, std::string(beats) + signature);
         }
     }
-    EXPECT_THAT(rhythm({notes, "--beats", "20000"}).errors, HasSubstr("20000 beats cannot be measured"));
+    EXPECT_THAT(rhythm({sound, "--beats", "100000"}).errors,
+                HasSubstr("--beats: Value 100000 not in range 1 to 16384"));
+    std::vector<unsigned> starts;
+    for (unsigned i = 0; i < 100; ++i) starts.push_back(680 * i);
+    EXPECT_THAT(rhythm({folder.write("long.mid", midi(starts))}).errors,
+                HasSubstr("a loop of 16832 beats cannot be measured; 1 to 16384 can"));
+}
+
+TEST(RhythmCommand, TellsWhatIsDamagedInAMidiFile) {
+    const TemporaryFolder folder;
+    const std::string whole = midi({0, 4});
+    const std::string cut = folder.write("cut.mid", whole.substr(0, whole.size() - 6));
+    const ToolResult partly = rhythm({cut});
+    EXPECT_EQ(partly.status, 0);
+    EXPECT_EQ(partly.json()[0]["onsets"].size(), 2U);
+    EXPECT_THAT(partly.errors, HasSubstr("cut.mid: byte "));
+    EXPECT_EQ(rhythm({cut, "--quiet"}).errors, "");
+    const ToolResult nothing = rhythm({folder.write("none.mid", emptyMidi().substr(0, 24))});
+    EXPECT_EQ(nothing.status, 1);
+    EXPECT_THAT(nothing.errors, HasSubstr("none.mid: nothing sounds in it: byte "));
 }
 
 TEST(RhythmCommand, EveryMidiFileOfTheCorpusGivesWhatCanBeReadOrAReason) {

@@ -1,4 +1,5 @@
 #include "platform/LCFileParser.h"
+#include "platform/PropertyListFile.h"
 #include "platform/TaggingTypes.h"
 #include "platform/loopfile/RandomAccessReader.h"
 #include "support/AudioFixtures.h"
@@ -163,6 +164,22 @@ TEST(LoopFileRead, DerivesOnlyWhatThePlainDataDoesNotSay) {
     }
 }
 
+TEST(LoopFileRead, CountsBeatsInNotesOfTheLowerNumberAndTempoInQuarters) {
+    struct {
+        const char* signature;
+        int beats;
+    } const cases[] = {{"4/4", 4}, {"6/8", 8}, {"2/2", 2}};
+    for (const auto& c : cases) {
+        const std::string facts =
+            big(2, 4) + std::string("tempo\000120\0time signature\0", 25) + c.signature + '\0';
+        const std::string file =
+            Caf::file(Caf::description(1000) + Caf::chunk("info", facts) + Caf::data(8000));
+        const auto data = parserOf(file)->enhancedFileData();
+        ASSERT_TRUE(data);
+        EXPECT_EQ(data->beatCount(), c.beats) << c.signature << ", two seconds";
+    }
+}
+
 TEST(LoopFileRead, AdmitsTheKindsThatAreAskedFor) {
     const Wav wav;
     const std::string plain = wav.file(wav.format() + wav.data());
@@ -269,6 +286,34 @@ TEST(LoopFileRead, HostileAndDamagedFiles) {
     }
 }
 
+TEST(LoopFileRead, CountsTheFramesOfPackedAiffAudio) {
+    struct {
+        const char* coding;
+        unsigned channels;
+        std::uint32_t inHeader;
+        std::size_t bytes;
+        std::uint64_t frames;
+    } const cases[] = {
+        {"ima4", 1, 690, 690 * 34, 690ULL * 64},   // packets
+        {"ima4", 2, 345, 1380 * 34, 690ULL * 64},  // half of them
+        {"ima4", 1, 690, 100 * 34 + 5, 6400},      // cut off
+        {"GSM ", 1, 44100, 276 * 33, 44100},       // the last packet is not full
+        {"GSM ", 1, 44100, 10 * 33, 1600},         //
+        {"DWVW", 1, 44100, 70000, 44100},          // packets of any size
+        {"42ni", 2, 44100, 6000, 1000},            //
+        {"MAC6", 1, 7350, 7350, 0},                // unknown, not wrong
+    };
+    for (const auto& c : cases) {
+        const std::string common = Aiff::common(c.channels, c.inHeader, 16, Aiff::rate(44100), c.coding) +
+                                   Aiff::chunk("MARK", big(1, 2) + big(1, 2) + big(900, 4) + big(0, 2));
+        const auto data = parserOf(Aiff::file(common + Aiff::sound(c.bytes), "AIFC"))->enhancedFileData();
+        ASSERT_TRUE(data) << c.coding;
+        EXPECT_EQ(data->frameCount(), c.frames) << c.coding << " of " << c.bytes << " bytes";
+        EXPECT_FLOAT_EQ(data->lengthInSeconds(), static_cast<float>(c.frames) / 44100);
+        EXPECT_THAT(data->transientMarkers(), ElementsAre(900)) << c.coding;
+    }
+}
+
 TEST(LoopFileRead, ListsEveryChunkWithItsPlaceAndWhatIsWrongWithIt) {
     const Wav wav;
     const std::string file = wav.file(wav.format() + wav.chunk("\x86\x01te", "abcd") + wav.data(401) +
@@ -286,6 +331,26 @@ TEST(LoopFileRead, ListsEveryChunkWithItsPlaceAndWhatIsWrongWithIt) {
     EXPECT_EQ(chunks[3].offset, 458U);
     EXPECT_EQ(chunks[3].children[0].offset, 470U);
     EXPECT_EQ(chunks[3].children[0].meaning, "title \"Sea\"");
+}
+
+TEST(LoopFileRead, ListsOurRecordWithTheSizeThatStandsInTheFile) {
+    const Wav wav;
+    const std::string record = "bplist00 or not";
+    const std::string uuid = "\x5C\xE5\x4F\x6C\x9A\x0B\x4D\x5F\x8D\x3E\x71\x63\x76\x74\x2E\x31";
+    struct {
+        std::string file;
+        std::size_t size;
+    } const cases[] = {
+        {wav.file(wav.format() + wav.data() + wav.chunk("qvct", record)), 15},
+        {Aiff::file(Aiff::common() + Aiff::sound() + Aiff::chunk("APPL", "qvct" + record)), 19},
+        {Caf::file(Caf::description() + Caf::data() + Caf::chunk("uuid", uuid + record)), 31},
+    };
+    for (const auto& c : cases) {
+        const auto chunks = parserOf(c.file)->chunks()[0].children;
+        ASSERT_EQ(chunks.size(), 3U);
+        EXPECT_EQ(chunks[2].meaning, "our record, unreadable");
+        EXPECT_EQ(chunks[2].size, c.size) << chunks[2].id;
+    }
 }
 
 /// A file of zeros but for its head and tail, which counts what is read; it may break off.
@@ -353,8 +418,7 @@ TEST(LoopFileRead, ValuesOfAWrongTypeInARecordCountAsAbsent) {
     facts.displayName = "from the file";
     using Array = PropertyList::Array;
     const LCFileData data(facts, PropertyList::Dictionary{{"BeatCount", "many"},
-                                                          {"Tempo", std::nan("")},
-                                                          {"SignatureTop", 1e300},
+                                                          {"Tempo", "fast"},
                                                           {"DisplayName", 7},
                                                           {"Tagging", Array{}},
                                                           {"ContentInfo", "x"},
@@ -362,14 +426,77 @@ TEST(LoopFileRead, ValuesOfAWrongTypeInARecordCountAsAbsent) {
                                                           {"TransientMarkers", Array{9, -1, "x", 3}},
                                                           {"MidiData", 1}});
     EXPECT_EQ(data.beatCount(), 8);
-    EXPECT_EQ(data.bpm(), 0);
-    EXPECT_EQ(data.signatureTop(), INT32_MAX);
+    EXPECT_EQ(data.bpm(), 99);
     EXPECT_EQ(data.displayName(), "from the file");
     EXPECT_TRUE(data.taggingDictionary().empty());
     EXPECT_EQ(data.contentInfoDictionary(), nullptr);
     EXPECT_THAT(data.descriptors(), ElementsAre("Dark"));
     EXPECT_THAT(data.transientMarkers(), ElementsAre(3, 9));
     EXPECT_TRUE(data.midiData().empty());
+}
+
+TEST(LoopFileRead, NumbersOutOfRangeInARecordCountAsAbsent) {
+    LCAudioFacts facts;
+    facts.frameCount = 1000;
+    facts.isLoop = true;
+    facts.beatCount = 8;
+    facts.bpm = 99;
+    facts.midiRootNote = 48;
+    facts.keyType = 2;
+    facts.signatureTop = 3;
+    facts.signatureBottom = 8;
+    const auto values = [&facts](const char* key, const PropertyList& value) {
+        const LCFileData data(facts, PropertyList::Dictionary{{key, value}});
+        return std::vector<double>{
+            double(data.tavioLoopType()),   double(data.beatCount()),      double(data.bpm()),
+            double(data.midiRootNote()),    double(data.keyType()),        double(data.signatureTop()),
+            double(data.signatureBottom()), double(data.lengthInSeconds())};
+    };
+    constexpr std::int64_t huge = std::int64_t{1} << 40;
+    const std::vector<double> untouched = {0, 8, 99, 48, 2, 3, 8, 0};
+    struct {
+        const char* key;
+        std::size_t place;
+        std::vector<PropertyList> absent;
+        std::vector<double> present;
+    } const cases[] = {
+        {"TavioLoopType", 0, {-2, huge}, {-1, 0, 7}},
+        {"BeatCount", 1, {-1, 1'000'001, huge}, {0, 1'000'000}},
+        {"Tempo", 2, {-1, 1000.5, 1e300}, {0, 1000}},
+        {"MidiRootNote", 3, {-2, 128, huge}, {-1, 0, 127}},
+        {"KeyType", 4, {-1, 5, huge}, {0, 4}},
+        {"SignatureTop", 5, {-1, 65, 1e300}, {0, 64}},
+        {"SignatureBottom", 6, {-4, 3, 128}, {0, 1, 64}},
+        {"LengthInSeconds", 7, {-1, 1e300}, {0, 1e9}},
+    };
+    for (const auto& c : cases) {
+        std::vector<PropertyList> absent = c.absent;
+        absent.insert(absent.end(), {std::nan(""), -INFINITY, INFINITY, UINT64_MAX});
+        for (const PropertyList& value : absent)
+            EXPECT_EQ(values(c.key, value), untouched) << c.key << " " << value.doubleValue().value();
+        for (const double value : c.present) EXPECT_EQ(values(c.key, value)[c.place], value) << c.key;
+    }
+    const LCFileData marked(
+        facts, PropertyList::Dictionary{{"TransientMarkers", PropertyList::Array{1000, 1001, 0, huge, -1}}});
+    EXPECT_THAT(marked.transientMarkers(), ElementsAre(0, 1000));
+}
+
+TEST(LoopFileRead, TheLengthOfTheAudioCountsBeforeTheRecords) {
+    const Wav wav;
+    const std::string record = serializePropertyList(PropertyList::Dictionary{{"LengthInSeconds", 99.0}},
+                                                     PropertyListFormat::binary);
+    struct {
+        std::size_t bytes;
+        float expected;
+    } const cases[] = {{32000, 4}, {0, 99}};
+    for (const auto& c : cases) {
+        const std::string file = wav.file(wav.format(1, 8000, 8) + wav.acid(0, 0, 4, 0) + wav.data(c.bytes) +
+                                          wav.chunk("qvct", record));
+        const auto data = parserOf(file)->enhancedFileData();
+        ASSERT_TRUE(data);
+        EXPECT_EQ(data->lengthInSeconds(), c.expected);
+        EXPECT_FLOAT_EQ(data->bpm(), 240 / c.expected);
+    }
 }
 
 }  // namespace

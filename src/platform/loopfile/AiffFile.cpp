@@ -20,31 +20,52 @@ double readExtended(BoundedCursor& cursor) {
     return std::ldexp(static_cast<double>(mantissa), exponent - 63);
 }
 
-/// Bytes of one sample in the codings whose samples have a fixed size; 0 for others.
-std::uint32_t bytesPerSample(std::uint32_t coding, std::uint32_t bits) {
+/// How a coding lays out one channel of the audio.
+struct Packing {
+    std::uint32_t bytes = 0;   ///< Of a packet; 0 where that varies or is not known.
+    std::uint32_t frames = 1;  ///< In a packet.
+};
+
+Packing packingOf(std::uint32_t coding, std::uint32_t bits) {
     switch (coding) {
         case fourCC("NONE"):
         case fourCC("twos"):
         case fourCC("sowt"):
-            return (bits + 7U) / 8U;
+            return {(bits + 7U) / 8U};
         case fourCC("fl32"):
         case fourCC("FL32"):
         case fourCC("in32"):
-            return 4;
+        case fourCC("23ni"):
+            return {4};
         case fourCC("fl64"):
         case fourCC("FL64"):
-            return 8;
+            return {8};
         case fourCC("in24"):
-            return 3;
+        case fourCC("42ni"):
+            return {3};
         case fourCC("alaw"):
         case fourCC("ALAW"):
         case fourCC("ulaw"):
         case fourCC("ULAW"):
         case fourCC("raw "):
-            return 1;
+            return {1};
+        case fourCC("ima4"):
+            return {34, 64};
+        case fourCC("GSM "):
+            return {33, 160};
         default:
-            return 0;
+            return {};
     }
+}
+
+/// Writers put frames, packets or a share of the packets into the header, depending on the coding: what it
+/// says counts only where it is known to mean frames.
+std::uint64_t framesOf(std::uint32_t coding, const LCAudioFacts& header, std::uint64_t bytes) {
+    const Packing packing = packingOf(coding, header.bitsPerSample);
+    const std::uint64_t packet = std::uint64_t{packing.bytes} * header.channelCount;
+    if (packet == 0) return coding == fourCC("DWVW") ? header.frameCount : 0;
+    const std::uint64_t held = bytes / packet * packing.frames;
+    return coding == fourCC("ima4") ? held : std::min(header.frameCount, held);
 }
 
 }  // namespace
@@ -76,20 +97,17 @@ bool AiffFile::readFacts(LCAudioFacts& facts, Error* error) const {
     facts.bitsPerSample = header.u16();
     facts.sampleRate = readExtended(header);
     if (header.failed()) return failAt(error, *common, "is too short");
-    const std::uint32_t coding = form_ == fourCC("AIFC") ? header.fourCC() : fourCC("NONE");
+    const bool saysCoding = form_ == fourCC("AIFC") && header.remaining() >= 4;
+    const std::uint32_t coding = saysCoding ? header.fourCC() : fourCC("NONE");
     if (!checkFormat(facts, *common, error)) return false;
     const Chunk* sound = find(Chunk::Role::audio);
     if (sound == nullptr && facts.frameCount > 0) {
         return fail(error, kErrorMalformed, "has no chunk 'SSND' (bytes 12 to the end)");
     }
-    const std::uint64_t frameSize =
-        std::uint64_t{bytesPerSample(coding, facts.bitsPerSample)} * facts.channelCount;
-    if (frameSize > 0) {
-        constexpr std::uint64_t kSoundHeader = 8;
-        const std::uint64_t bytes =
-            sound == nullptr || sound->size < kSoundHeader ? 0 : sound->size - kSoundHeader;
-        facts.frameCount = std::min(facts.frameCount, bytes / frameSize);
-    }
+    constexpr std::uint64_t kSoundHeader = 8;
+    const std::uint64_t bytes =
+        sound == nullptr || sound->size < kSoundHeader ? 0 : sound->size - kSoundHeader;
+    facts.frameCount = framesOf(coding, facts, bytes);
     readAiffMusic(*this, facts);
     return true;
 }

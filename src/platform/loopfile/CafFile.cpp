@@ -54,11 +54,7 @@ void CafFile::walk() {
         }
         if (header.failed()) chunk.fault = "cannot be read; the file became shorter";
         if (isAudio) chunk.role = Chunk::Role::audio;
-        if (isRecord(chunk)) {
-            chunk.role = Chunk::Role::record;
-            chunk.contents += kRecordUuid.size();
-            chunk.size -= kRecordUuid.size();
-        }
+        if (isRecord(chunk)) chunk.becomeRecord(kRecordUuid.size());
         at = chunk.end;
         chunks_.push_back(chunk);
     }

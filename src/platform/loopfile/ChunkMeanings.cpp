@@ -184,7 +184,7 @@ std::vector<LCChunk> describeChunks(const Container& container) {
         LCChunk shown;
         shown.id = textOfCode(chunk.id);
         shown.offset = chunk.offset;
-        shown.size = chunk.size;
+        shown.size = chunk.signature + chunk.size;
         shown.meaning = describe(container, chunk);
         if (chunk.fault != nullptr) shown.fault = chunk.fault;
         if (chunk.id == fourCC("LIST")) {

@@ -31,12 +31,21 @@ struct Chunk {
 
     std::uint32_t id = 0;
     Role role = Role::other;
-    std::uint64_t offset = 0;    ///< Of its header.
-    std::uint64_t contents = 0;  ///< Offset of its contents; of a record, behind our signature.
-    std::uint64_t size = 0;      ///< Of the contents, as far as the file reaches.
-    std::uint64_t end = 0;       ///< Offset behind it and its pad byte.
+    std::uint64_t offset = 0;     ///< Of its header.
+    std::uint64_t contents = 0;   ///< Offset of its contents; of a record, behind our signature.
+    std::uint64_t size = 0;       ///< Of the contents, as far as the file reaches.
+    std::uint64_t signature = 0;  ///< Bytes of our signature before the contents of a record.
+    std::uint64_t end = 0;        ///< Offset behind it and its pad byte.
     const char* fault =
         nullptr;  ///< Why a file with this chunk is not rewritten; null when nothing is wrong.
+
+    /// Its contents begin behind our signature of so many bytes.
+    void becomeRecord(std::uint64_t signatureSize) {
+        role = Role::record;
+        signature = signatureSize;
+        contents += signatureSize;
+        size -= signatureSize;
+    }
 };
 
 /// The pieces of a file to be made, with neighbouring ranges of the old one joined.

@@ -66,11 +66,7 @@ void IffFile::walk(std::uint64_t formSize, bool isOpenEnded) {
             chunk.end = formEnd_;
         }
         if (isAudio(chunk.id)) chunk.role = Chunk::Role::audio;
-        if (const auto signature = signatureOf(chunk)) {
-            chunk.role = Chunk::Role::record;
-            chunk.contents += *signature;
-            chunk.size -= *signature;
-        }
+        if (const auto signature = signatureOf(chunk)) chunk.becomeRecord(*signature);
         at = chunk.end;
         chunks_.push_back(chunk);
     }

@@ -27,19 +27,18 @@ std::string textOfField(std::string_view bytes) {
 }
 
 void setTempo(LCAudioFacts& facts, double bpm) {
-    constexpr double kFastest = 1000;
-    if (bpm > 0 && bpm <= kFastest) facts.bpm = static_cast<float>(bpm);
+    if (bpm > 0 && bpm <= kFastestTempo) facts.bpm = static_cast<float>(bpm);
 }
 
 void setSignature(LCAudioFacts& facts, unsigned top, unsigned bottom) {
-    if (top < 1 || top > 64 || bottom > 64 || !std::has_single_bit(bottom)) return;
+    if (top < 1 || top > kLargestSignature || bottom > kLargestSignature || !std::has_single_bit(bottom))
+        return;
     facts.signatureTop = static_cast<int>(top);
     facts.signatureBottom = static_cast<int>(bottom);
 }
 
 void setBeats(LCAudioFacts& facts, std::uint64_t beats) {
-    constexpr std::uint64_t kMost = 1'000'000;
-    if (beats <= kMost) facts.beatCount = static_cast<int>(beats);
+    if (beats <= kMostBeats) facts.beatCount = static_cast<int>(beats);
 }
 
 void setRootNote(LCAudioFacts& facts, unsigned note) {
@@ -80,7 +79,8 @@ void setMarkers(LCAudioFacts& facts, std::vector<std::int64_t> frames) {
     std::sort(frames.begin(), frames.end());
     frames.erase(std::unique(frames.begin(), frames.end()), frames.end());
     std::erase_if(frames, [&](std::int64_t frame) {
-        return frame < 0 || static_cast<std::uint64_t>(frame) > facts.frameCount;
+        const bool isBehind = facts.frameCount > 0 && static_cast<std::uint64_t>(frame) > facts.frameCount;
+        return frame < 0 || isBehind;
     });
     facts.transientMarkers = std::move(frames);
 }

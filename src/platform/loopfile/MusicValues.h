@@ -11,6 +11,10 @@ namespace qvct {
 
 /// Bounds of what chunks of other makers may say; anything outside counts as not said.
 inline constexpr std::uint64_t kMostMarkers = 100'000;
+inline constexpr double kFastestTempo = 1000;
+inline constexpr double kLongestSeconds = 1e9;
+inline constexpr std::uint64_t kMostBeats = 1'000'000;
+inline constexpr unsigned kLargestSignature = 64;
 inline constexpr std::uint64_t kLargestText = 4096;
 inline constexpr std::uint64_t kLargestMidi = 16ULL << 20U;
 
@@ -30,7 +34,7 @@ void setSignatureText(LCAudioFacts& facts, std::string_view text);
 void setKeyText(LCAudioFacts& facts, std::string_view text);
 /// Only bytes that begin as a standard MIDI file does; such a file makes a loop.
 void setMidi(LCAudioFacts& facts, std::vector<std::uint8_t> bytes);
-/// Sorts them, drops doubles and those outside of the audio.
+/// Sorts them, drops doubles and those outside of audio whose length is known.
 void setMarkers(LCAudioFacts& facts, std::vector<std::int64_t> frames);
 
 }  // namespace qvct
