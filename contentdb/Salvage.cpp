@@ -34,9 +34,10 @@ auto readable(Read read) -> decltype(read()) {
 template <typename Visit>
 void forEachNumber(Connection& connection, const char* table, Visit visit) {
     const std::string sql = fmt::format("SELECT max(id) FROM {}", table);
-    const std::int64_t last = readable([&] { return connection.number(sql.c_str()); });
-    const std::int64_t rows = connection.number("PRAGMA page_count") * kPageSize / kShortestRow;
-    const std::int64_t mostMisses = std::min(rows, kMostMisses);
+    const std::int64_t bytes = connection.number("PRAGMA page_count") * kPageSize;
+    // Numbers far beyond what the file has room for are nobody's, whatever it says.
+    const std::int64_t last = std::min(bytes, readable([&] { return connection.number(sql.c_str()); }));
+    const std::int64_t mostMisses = std::min(bytes / kShortestRow, kMostMisses);
     std::int64_t misses = 0;
     for (std::int64_t id = 1; last != 0 ? id <= last : misses < mostMisses; ++id)
         misses = visit(id) ? 0 : misses + 1;
@@ -93,8 +94,11 @@ std::int64_t copyItems(ContentStore& from, const std::string& target) {
 Salvage salvage(const std::string& damaged, const std::string& target) {
     Salvage saved;
     const auto connection = readable([&] { return openDatabase(damaged, Access::read); });
-    const auto store =
-        readable([&] { return connection ? std::make_unique<ContentStore>(*connection) : nullptr; });
+    std::unique_ptr<ContentStore> store;
+    readable([&] {
+        if (connection) store = std::make_unique<ContentStore>(*connection);
+        return true;
+    });
     if (!store) return saved;
     saved.items = copyItems(*store, target);
     const std::set<std::string> folders = knownFolders(*connection);

@@ -285,6 +285,7 @@ std::vector<Similar> similarItems(ContentStore& store, ItemId id, std::size_t li
         if (best.size() > limit) best.erase(std::prev(best.end()));
     }
     std::vector<Similar> result;
+    result.reserve(best.size());
     for (auto& [rank, other] : best) result.push_back({rank.second, std::move(other), -rank.first});
     return result;
 }

@@ -114,6 +114,7 @@ std::optional<TaggingEdit> TaggingEdit::make(const std::vector<std::string>& add
                                              ToolContext& context) {
     TaggingEdit edit;
     std::vector<std::string> problems;
+    problems.reserve(add.size() + remove.size());
     for (const std::string& text : add) problems.push_back(edit.add(text, creates));
     for (const std::string& text : remove) problems.push_back(edit.remove(text));
     std::erase(problems, "");
