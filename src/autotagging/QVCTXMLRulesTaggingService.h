@@ -50,7 +50,7 @@ class QVCT_API QVCTXMLRulesTaggingService : public QVCTAutoTaggingService {
     static PropertyList::Dictionary defaultRules();
 
     /// The tags of all rules in their order. Only the XML document is looked at.
-    /// @cost  Default rules: about half a millisecond for an ordinary patch, mostly for the five scripts.
+    /// @cost  Default rules: about a millisecond for an ordinary patch, mostly for the five scripts.
     TagDictionarySet tagsWithContentsOfURL(const URL& url,
                                            const std::shared_ptr<QVCTXMLDocument>& xmlDocument,
                                            const std::shared_ptr<TGRTMetaData>& metaData,
