@@ -23,11 +23,16 @@ std::string nameForDamaged(const std::string& database) {
     return name;
 }
 
-/// Moves a database with its log.
+/// Moves a database with its log; the log first, which nobody may take for that of another database.
+/// @throws DatabaseFailure when a part cannot be moved: nothing may come into its place then.
 void moveDatabase(const std::string& from, const std::string& to) {
-    for (const char* part : {"", "-wal", "-shm"}) {
-        std::error_code ignored;
-        if (fileExists(from + part)) std::filesystem::rename(from + part, to + part, ignored);
+    for (const char* part : {"-shm", "-wal", ""}) {
+        std::error_code failure;
+        if (fileExists(from + part)) std::filesystem::rename(from + part, to + part, failure);
+        if (failure) {
+            throw DatabaseFailure(kErrorUnwritable,
+                                  fmt::format("{}: cannot be moved: {}", printable(from), failure.message()));
+        }
     }
 }
 
