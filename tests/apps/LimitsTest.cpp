@@ -1,6 +1,7 @@
 // What one file may cost, whatever is in it: time and memory in proportion to its size.
 
 #include "demo/Library.h"
+#include "support/Places.h"
 #include "support/TemporaryFolder.h"
 
 #include <algorithm>

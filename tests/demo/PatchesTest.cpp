@@ -1,6 +1,7 @@
 #include "demo/Library.h"
 #include "demo/Patches.h"
 #include "platform/PropertyListFile.h"
+#include "support/Places.h"
 #include "support/TemporaryFolder.h"
 
 #include <filesystem>

@@ -1,6 +1,7 @@
 #include "platform/Log.h"
 #include "resources/EmbeddedFiles.h"
 #include "resources/QVCTCompiledResources.h"
+#include "support/Places.h"
 
 #include <fstream>
 #include <iterator>

@@ -1,5 +1,7 @@
 #pragma once
 
+#include "support/Places.h"
+
 #include <algorithm>
 #include <filesystem>
 #include <string>

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "support/Places.h"
 #include "support/TemporaryFolder.h"
 
 #include <cstdio>
