@@ -184,7 +184,7 @@ std::string replaceNonAlphanumerics(std::string_view text, std::string_view kept
         const int32_t start = i;
         const UChar32 c = nextCharacter(text, i, length);
         const bool isKept =
-            c >= 0 && (u_isalnum(c) || u_charType(c) == U_NON_SPACING_MARK ||
+            c >= 0 && ((U_GET_GC_MASK(c) & (U_GC_L_MASK | U_GC_M_MASK | U_GC_N_MASK)) != 0 ||
                        (c < 0x80 && kept.find(static_cast<char>(c)) != std::string_view::npos));
         result += isKept ? text.substr(static_cast<std::size_t>(start), static_cast<std::size_t>(i - start))
                          : replacement;

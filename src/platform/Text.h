@@ -26,7 +26,8 @@ std::string foldCase(std::string_view text);
 std::string lowercase(std::string_view text);
 /// The user-perceived characters in reverse order.
 std::string reversedString(std::string_view text);
-/// Replaces each character that is neither alphanumeric nor listed in `kept` (ASCII) by `replacement`.
+/// Replaces each character that is neither a letter, a combining mark, a number nor listed in `kept` (ASCII)
+/// by `replacement`.
 std::string replaceNonAlphanumerics(std::string_view text, std::string_view kept,
                                     std::string_view replacement);
 

@@ -27,14 +27,10 @@ void TGRTCategory::addTag(const std::shared_ptr<TGRTTag>& tag) {
     // A root tag that equals one that is here changes nothing.
     if (!tag->parent() && tag->children().empty() && tags_.contains(*tag)) return;
     const auto parent = tag->parent();
-    const bool isOfThisTree = !parent || parent->category().get() == this;
+    const bool isOfThisTree = tag->category().get() == this && (!parent || parent->category().get() == this);
     // A tag that equals another one is only found below its own parent, and one from elsewhere brings a tree
-    // along.
-    if (!tags_.insert(tag) || !isOfThisTree || !tag->children().empty()) {
-        treeChanged();
-        if (parent && parent->category()) parent->category()->treeChanged();
-        return;
-    }
+    // along, which may grow without this category being told.
+    if (!tags_.insert(tag) || !isOfThisTree || !tag->children().empty()) return treeChanged();
     const auto [entry, isNew] = byLabel_.try_emplace(tag->label(), tag.get());
     if (!isNew) entry->second = nullptr;
 }

@@ -4,6 +4,7 @@
 #include "platform/Text.h"
 #include "taxonomy/TGRTCategory.h"
 
+#include <algorithm>
 #include <utility>
 
 #include <fmt/format.h>
@@ -30,12 +31,14 @@ std::shared_ptr<TGRTTag> TGRTTag::initWithLabel(std::string_view rawLabel,
     tag->parent_ = parentTag;
     tag->hash_ = stringHash(fmt::format("{}||{}||{}", tag->label_, labelOrNone(parentTag),
                                         category ? category->identifier() : std::string{}));
+    tag->category_ = category;
     if (parentTag) {
         // Of two equal children the later one stays.
         parentTag->children_.erase(*tag);
         parentTag->children_.insert(tag);
+        // The own category learns of it below.
+        if (parentTag->category() != category) parentTag->tellCategory();
     }
-    tag->category_ = category;
     if (category) category->addTag(tag);
     return tag;
 }
@@ -46,7 +49,7 @@ std::shared_ptr<TGRTTag> TGRTTag::initWithDictionary(const PropertyList::Diction
 
 void TGRTTag::setLabel(std::string label) {
     label_ = std::move(label);
-    if (const auto owner = category()) owner->treeChanged();
+    tellCategory();
 }
 
 std::string TGRTTag::categoryIdentifier() const {
@@ -54,16 +57,24 @@ std::string TGRTTag::categoryIdentifier() const {
     return owner ? owner->identifier() : std::string{};
 }
 
-void TGRTTag::addChild(const std::shared_ptr<TGRTTag>& tag) {
-    if (!tag) return;
+void TGRTTag::addChild(std::shared_ptr<TGRTTag> tag) {
+    if (!tag || tag.get() == this) return;
+    const auto below = tag->descendants();
+    const bool makesCycle =
+        std::any_of(below.begin(), below.end(), [this](const auto& other) { return other.get() == this; });
+    if (makesCycle) return;
     if (const auto formerParent = tag->parent()) formerParent->removeChild(tag);
-    children_.insert(tag);
-    if (const auto owner = category()) owner->treeChanged();
+    children_.insert(std::move(tag));
+    tellCategory();
 }
 
 void TGRTTag::removeChild(const std::shared_ptr<TGRTTag>& tag) {
     if (!tag) return;
     children_.erase(*tag);
+    tellCategory();
+}
+
+void TGRTTag::tellCategory() const {
     if (const auto owner = category()) owner->treeChanged();
 }
 
@@ -74,10 +85,14 @@ std::vector<std::shared_ptr<TGRTTag>> TGRTTag::ancestors() const {
 }
 
 std::vector<std::shared_ptr<TGRTTag>> TGRTTag::descendants() const {
-    std::vector<std::shared_ptr<TGRTTag>> result(children_.begin(), children_.end());
-    for (const auto& child : children_) {
-        const auto below = child->descendants();
-        result.insert(result.end(), below.begin(), below.end());
+    std::vector<std::shared_ptr<TGRTTag>> result;
+    std::vector<const TGRTTag*> pending = {this};
+    while (!pending.empty()) {
+        const auto& children = pending.back()->children_.ordered();
+        pending.pop_back();
+        result.insert(result.end(), children.begin(), children.end());
+        for (auto child = children.rbegin(); child != children.rend(); ++child)
+            pending.push_back(child->get());
     }
     return result;
 }

@@ -64,7 +64,9 @@ class QVCT_API TGRTTag : public Object,
     std::string categoryIdentifier() const;
     const ObjectSet<TGRTTag>& children() const override { return children_; }
     /// Takes the child over from its current parent's children. The child's own link upward stays as it is.
-    void addChild(const std::shared_ptr<TGRTTag>& tag);
+    /// Ignored: null, and a tag that this one is or lies below, since trees have no cycles.
+    /// @cost  O(descendants of the child).
+    void addChild(std::shared_ptr<TGRTTag> tag);
     /// Takes the child out. Null is ignored.
     void removeChild(const std::shared_ptr<TGRTTag>& tag);
 
@@ -94,6 +96,8 @@ class QVCT_API TGRTTag : public Object,
 
   private:
     TGRTTag() = default;
+    /// Tells the category that the tree below this tag is no longer the one that was created.
+    void tellCategory() const;
 
     std::string label_;
     TagValueType valueType_ = kTagValuePlain;

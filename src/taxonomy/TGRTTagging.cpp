@@ -107,15 +107,20 @@ ObjectSet<TGRTTagging> TGRTTagging::taggingsWithTaggingDictionary(const Property
 }
 
 PropertyList::Dictionary TGRTTagging::taggingDictionaryForTaggings(const ObjectSet<TGRTTagging>& taggings) {
-    std::vector<std::shared_ptr<TGRTTagging>> sorted(taggings.begin(), taggings.end());
-    std::stable_sort(sorted.begin(), sorted.end(), [](const auto& a, const auto& b) {
+    return taggingDictionaryForTaggings(taggings.ordered());
+}
+
+PropertyList::Dictionary TGRTTagging::taggingDictionaryForTaggings(
+    std::vector<std::shared_ptr<TGRTTagging>> taggings) {
+    std::erase(taggings, nullptr);
+    std::stable_sort(taggings.begin(), taggings.end(), [](const auto& a, const auto& b) {
         return std::tie(a->category_, a->label_) < std::tie(b->category_, b->label_);
     });
     PropertyList::Dictionary result;
-    for (auto first = sorted.begin(); first != sorted.end();) {
+    for (auto first = taggings.begin(); first != taggings.end();) {
         const std::string& category = (*first)->category_;
         PropertyList::Array entries;
-        for (; first != sorted.end() && (*first)->category_ == category; ++first) {
+        for (; first != taggings.end() && (*first)->category_ == category; ++first) {
             entries.emplace_back(entryForTagging(**first));
         }
         result.append(category, std::move(entries));

@@ -68,6 +68,9 @@ class QVCT_API TGRTTagging : public Object, public QVContentTaggingIndexableTagg
     static ObjectSet<TGRTTagging> taggingsWithTaggingDictionary(const PropertyList* dictionary);
     /// Category identifier → entries by label, as files store them.
     static PropertyList::Dictionary taggingDictionaryForTaggings(const ObjectSet<TGRTTagging>& taggings);
+    /// The same of an array: equal taggings each get an entry, in their order. Null ones are ignored.
+    static PropertyList::Dictionary taggingDictionaryForTaggings(
+        std::vector<std::shared_ptr<TGRTTagging>> taggings);
 
     bool isEqual(const Object& other) const override;
     std::size_t hash() const override { return hash_; }

@@ -156,7 +156,7 @@ class QVCT_API TGRTTaxonomy : public Object, public QVContentTaggingTaxonomy {
     /// Keys and display strings for a host's translation. With the user default "fakeLocalization" most
     /// strings are reversed, so that untranslated ones stand out.
     Localization localizationDictionary() const override;
-    /// The same as the text of a strings table.
+    /// The same as the text of a strings table. Quotes, backslashes and line breaks are escaped.
     std::string localizedStrings() const override;
     /// Rows, header first, from which a mapping of retired tags is filled in.
     std::vector<std::string> mappingExport() const;

@@ -2,8 +2,6 @@
 
 #include "platform/Text.h"
 
-#include <algorithm>
-
 namespace qvct {
 
 std::shared_ptr<TGRTTaxonomySearching> TGRTTaxonomySearching::initWithTaxonomy(
@@ -14,20 +12,34 @@ std::shared_ptr<TGRTTaxonomySearching> TGRTTaxonomySearching::initWithTaxonomy(
 }
 
 void TGRTTaxonomySearching::_updateSearchTable() {
-    labels_.clear();
-    tagsTable_.clear();
-    if (!taxonomy_) return;
-    for (const auto& tag : taxonomy_->allTags()) {
-        if (tagsTable_.insert_or_assign(tag->label(), tag).second) labels_.push_back(tag->label());
+    TagsTable table;
+    if (taxonomy_) {
+        for (const auto& tag : taxonomy_->allTags()) table.emplace_back(tag->label(), tag);
     }
+    setTagsTable(table);
+}
+
+void TGRTTaxonomySearching::setTagsTable(const TagsTable& table) {
+    TagsTable rows;
+    rowOfLabel_.clear();
+    for (const auto& [label, tag] : table) {
+        const auto [row, isNew] = rowOfLabel_.try_emplace(label, rows.size());
+        if (isNew) {
+            rows.emplace_back(label, tag);
+        } else {
+            rows[row->second].second = tag;
+        }
+    }
+    tagsTable_ = std::move(rows);
 }
 
 std::vector<std::string> TGRTTaxonomySearching::findTagLabelsForString(std::string_view text,
                                                                        bool exactMatch) const {
     std::vector<std::string> found;
-    std::copy_if(labels_.begin(), labels_.end(), std::back_inserter(found), [&](const std::string& label) {
-        return exactMatch ? label == text : containsIgnoringCaseAndDiacritics(label, text);
-    });
+    for (const auto& [label, _] : tagsTable_) {
+        if (exactMatch ? label == text : containsIgnoringCaseAndDiacritics(label, text))
+            found.push_back(label);
+    }
     return found;
 }
 
@@ -38,8 +50,8 @@ std::vector<std::shared_ptr<TGRTTag>> TGRTTaxonomySearching::findTagsForString(s
 }
 
 std::shared_ptr<TGRTTag> TGRTTaxonomySearching::tagForLabel(std::string_view label) const {
-    const auto hit = tagsTable_.find(std::string(label));
-    return hit == tagsTable_.end() ? nullptr : hit->second;
+    const auto hit = rowOfLabel_.find(std::string(label));
+    return hit == rowOfLabel_.end() ? nullptr : tagsTable_[hit->second].second;
 }
 
 }  // namespace qvct

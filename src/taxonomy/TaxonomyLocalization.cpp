@@ -53,6 +53,15 @@ void addTag(Localization& strings, const TGRTTag& tag, bool reversed) {
         poles.size() > 1 ? poles[1] : poles[0];
 }
 
+/// A string as a strings table quotes it.
+std::string quoted(std::string text) {
+    // The backslash first: the others bring some along.
+    constexpr std::array<std::pair<const char*, const char*>, 4> escapes = {
+        {{"\\", "\\\\"}, {"\"", "\\\""}, {"\n", "\\n"}, {"\r", "\\r"}}};
+    for (const auto& [plain, escaped] : escapes) text = replaceAll(text, plain, escaped);
+    return '"' + text + '"';
+}
+
 }  // namespace
 
 std::string QVTagIdentifierUtility::localizationKeyForJingJangTagLabel(std::string_view label,
@@ -81,7 +90,7 @@ Localization TGRTTaxonomy::localizationDictionary() const {
 std::string TGRTTaxonomy::localizedStrings() const {
     std::string table;
     for (const auto& [key, value] : localizationDictionary())
-        table += fmt::format("\"{}\" = \"{}\";\n\n", key, value);
+        table += fmt::format("{} = {};\n\n", quoted(key), quoted(value));
     return table;
 }
 

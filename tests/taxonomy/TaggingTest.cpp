@@ -89,6 +89,15 @@ TEST(TaggingDictionary, SurvivesBeingWrittenAndReadBack) {
     EXPECT_TRUE(read.find(*automatic)->isAutoTagging());
 }
 
+TEST(TaggingDictionary, OfAnArrayHasAnEntryForEachOfEqualTaggings) {
+    const std::vector<std::shared_ptr<TGRTTagging>> taggings = {taggingOf("House"), nullptr,
+                                                                taggingOf("Bass", 1.0), taggingOf("House")};
+    const PropertyList expected =
+        Dictionary{{"Genres", Array{Dictionary{{"Name", "House"}}, Dictionary{{"Name", "House"}}}},
+                   {"Source", Array{Dictionary{{"Name", "Bass"}, {"Weight", 1.0}}}}};
+    EXPECT_EQ(PropertyList(TGRTTagging::taggingDictionaryForTaggings(taggings)), expected);
+}
+
 TEST(TaggingDictionary, SkipsWhatIsNotAsItShouldBe) {
     const auto taxonomy = TGRTTaxonomy::testingTaxonomy();
     const PropertyList list =
@@ -204,6 +213,17 @@ TEST(TaggingSet, RenamesWithinParentAndCategory) {
     EXPECT_EQ(taxonomy->findTagForLabel("Deeper House", "House", "Genres"), renamed->tag());
     EXPECT_TRUE(renameTagWithLabel(taggings, "Deeper House", "Deeper House"));
     EXPECT_TRUE(containsTagWithLabel(taggings, "Deeper House"));
+}
+
+TEST(TaggingSet, RenamedOntoATagWithChildrenTheTagTakesItsPlaceWithoutThem) {
+    const auto taxonomy = TGRTTaxonomy::taxonomyWithDictionary(Dictionary{
+        {"categories",
+         Dictionary{{"G", Dictionary{{"House", Dictionary{{"a", Array{}}, {"b", Array{"below"}}}}}}}}});
+    Taggings taggings = {TGRTTagging::initWithTag(taxonomy->findTagForLabel("a"), nullptr)};
+    EXPECT_TRUE(renameTagWithLabel(taggings, "a", "b"));
+    const Dictionary empty;
+    EXPECT_EQ(PropertyList(taxonomy->findTagForLabel("House")->dictionary()),
+              PropertyList(Dictionary{{"a", empty}, {"b", empty}}));
 }
 
 TEST(TaggingSet, Reassigns) {

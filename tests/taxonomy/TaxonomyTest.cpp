@@ -17,7 +17,9 @@ namespace {
 using testing::Contains;
 using testing::ElementsAre;
 using testing::IsEmpty;
+using testing::Pair;
 using Dictionary = PropertyList::Dictionary;
+using Localization = TGRTTaxonomy::Localization;
 using TagPointer = std::shared_ptr<TGRTTag>;
 
 std::shared_ptr<TGRTTaxonomy> taxonomyOf(Dictionary categories) {
@@ -81,6 +83,9 @@ TEST(Tag, MakesPackageIdentifiersOfContentPacksOnly) {
     };
     EXPECT_EQ(identifier(" Essential Hip  Hop? "), "essential_hip_hop_");
     EXPECT_EQ(identifier("\xc3\x84rger & 808s"), "\xc3\xa4rger_808s");
+    // Spacing and enclosing marks, and numbers that are no digits, belong to words, too.
+    EXPECT_EQ(identifier("\u0939\u093f\u0928\u094d\u0926\u0940 E\u0301 \u2167\u00bd 1\u20dd"),
+              "\u0939\u093f\u0928\u094d\u0926\u0940_e\u0301_\u2177\u00bd_1\u20dd");
     EXPECT_EQ(TGRTTag::initWithLabel("x", nullptr, nullptr)->packageIdentifier(), std::nullopt);
 }
 
@@ -178,49 +183,115 @@ TEST(Taxonomy, FindsByParent) {
     EXPECT_EQ(taxonomy->findTagForLabel("Bright / Dark-+"), nullptr);
 }
 
-/// What the search over the tree answers, without any index.
-TagPointer searched(const TGRTTaxonomy& taxonomy, const std::string& label,
-                    TGRTTaxonomy::OptionalLabel parent, const std::string& category) {
-    const auto found = taxonomy.findCategoryWithIdentifier(category);
-    return found ? TGRTTaxonomy::findTagWithLabel(label, parent, found->tags()) : nullptr;
+TEST(Tag, TakesOverAChildNamedByAReferenceIntoTheOldList) {
+    const auto category = TGRTCategory::initWithIdentifier("Genres");
+    const auto parent = TGRTTag::initWithLabel("House", nullptr, category);
+    for (const char* label : {"a", "b", "c"}) TGRTTag::initWithLabel(label, parent, category);
+    parent->addChild(parent->children().ordered()[0]);
+    EXPECT_THAT(labels(parent->children()), ElementsAre("b", "c", "a"));
 }
 
-TEST(Taxonomy, TheIndexAnswersAsTheSearchWouldAfterAnyChange) {
+TEST(Tag, RefusesToLieBelowItself) {
+    const auto top = TGRTTag::initWithLabel("top", nullptr, nullptr);
+    const auto middle = TGRTTag::initWithLabel("middle", top, nullptr);
+    const auto low = TGRTTag::initWithLabel("low", middle, nullptr);
+    for (const auto& tag : {top, middle, low}) low->addChild(tag);
+    top->addChild(top);
+    EXPECT_THAT(labels(top->descendants()), ElementsAre("middle", "low"));
+    EXPECT_THAT(low->children(), IsEmpty());
+}
+
+/// What a walk over the tree finds, without the library's search and index.
+TagPointer walked(const std::string& label, TGRTTaxonomy::OptionalLabel parent, const auto& tags) {
+    for (const TagPointer& tag : tags) {
+        if (tag->label() != label) {
+            if (const auto below = walked(label, parent, tag->children())) return below;
+        } else if (!parent || (tag->parent() && tag->parent()->label() == *parent)) {
+            return tag;
+        }
+    }
+    return nullptr;
+}
+
+/// One change of two categories and their tags: mostly new tags, below any parent.
+void changeAtRandom(TGRTTaxonomy& taxonomy, std::vector<TagPointer>& tags, bool onlyCreates,
+                    const std::vector<std::string>& names, const auto& pick) {
+    const auto category = taxonomy.findOrCreateCategoryWithIdentifier(pick(4) == 0 ? "Y" : "X");
+    const auto any = [&] { return tags[pick(tags.size())]; };
+    const std::size_t what = onlyCreates ? 0 : pick(12);
+    if (what <= 5 || tags.empty()) {
+        const auto parent = tags.empty() || pick(3) == 0 ? nullptr : any();
+        const bool hasCategory = onlyCreates || pick(8) != 0;
+        tags.push_back(
+            TGRTTag::initWithLabel(names[pick(names.size())], parent, hasCategory ? category : nullptr));
+    } else if (what == 6) {
+        any()->setLabel(names[pick(names.size())]);
+    } else if (what == 7) {
+        category->removeTag(any());
+    } else if (what == 8) {
+        any()->removeChild(any());
+    } else if (what == 9) {
+        any()->addChild(any());
+    } else {
+        category->addTag(any());
+    }
+}
+
+TEST(Taxonomy, TheIndexAnswersAsAWalkOverTheTreeAfterAnyChange) {
     std::mt19937 random(7);
     const auto pick = [&random](std::size_t count) {
         return std::uniform_int_distribution<std::size_t>(0, count - 1)(random);
     };
     const std::vector<std::string> names = {"a", "b", "c", "d", "e"};
-    for (int round = 0; round < 300; ++round) {
+    int lookups = 0;
+    int differences = 0;
+    for (int round = 0; lookups < 256000; ++round) {
         const auto taxonomy = TGRTTaxonomy::init();
         std::vector<TagPointer> tags;
         for (int step = 0; step < 14; ++step) {
-            const auto category = taxonomy->findOrCreateCategoryWithIdentifier(pick(4) == 0 ? "Y" : "X");
-            const std::size_t what = round < 150 ? 0 : pick(8);
-            if (what <= 4 || tags.empty()) {
-                tags.push_back(TGRTTag::initWithLabel(
-                    names[pick(5)], tags.empty() || pick(3) == 0 ? nullptr : tags[pick(tags.size())],
-                    category));
-            } else if (what == 5) {
-                tags[pick(tags.size())]->setLabel(names[pick(5)]);
-            } else if (what == 6) {
-                category->removeTag(tags[pick(tags.size())]);
-            } else {
-                const auto& parent = tags[pick(tags.size())];
-                parent->removeChild(tags[pick(tags.size())]);
-            }
-            for (const std::string& label : names) {
-                for (const char* home : {"X", "Y"}) {
-                    ASSERT_EQ(taxonomy->findTagForLabel(label, home),
-                              searched(*taxonomy, label, std::nullopt, home));
-                    for (const std::string& parent : names) {
-                        ASSERT_EQ(taxonomy->findTagForLabel(label, parent, home),
-                                  searched(*taxonomy, label, parent, home));
+            changeAtRandom(*taxonomy, tags, round % 2 == 0, names, pick);
+            for (const auto& category : taxonomy->categories()) {
+                for (const std::string& label : names) {
+                    std::vector<TGRTTaxonomy::OptionalLabel> parents(names.begin(), names.end());
+                    parents.emplace_back();
+                    for (const auto& parent : parents) {
+                        const auto found = taxonomy->findTagForLabel(label, parent, category->identifier());
+                        differences += found == walked(label, parent, category->tags()) ? 0 : 1;
+                        ++lookups;
                     }
                 }
             }
         }
     }
+    EXPECT_EQ(differences, 0) << "of " << lookups;
+}
+
+/// The pairs of a strings table, escapes resolved.
+Localization stringsIn(const std::string& table) {
+    std::vector<std::string> texts;
+    bool isOpen = false;
+    for (std::size_t i = 0; i < table.size(); ++i) {
+        if (table[i] == '"') {
+            isOpen = !isOpen;
+            if (isOpen) texts.emplace_back();
+        } else if (isOpen && table[i] == '\\') {
+            const char c = table[++i];
+            texts.back() += c == 'n' ? '\n' : c == 'r' ? '\r' : c;
+        } else if (isOpen && table[i] != '\n' && table[i] != '\r') {
+            texts.back() += table[i];
+        }
+    }
+    Localization strings;
+    for (std::size_t i = 0; i + 1 < texts.size(); i += 2) strings[texts[i]] = texts[i + 1];
+    return strings;
+}
+
+TEST(Taxonomy, StringsTablesHoldAnyLabel) {
+    const auto taxonomy = TGRTTaxonomy::testingTaxonomy();
+    for (const char* label : {"12\" Mix", "Back\\slash\\", "Two\r\nLines", "a\" = \"b\\n"}) {
+        taxonomy->findOrCreateTagWithLabel(label, "Custom");
+    }
+    EXPECT_EQ(stringsIn(taxonomy->localizedStrings()), taxonomy->localizationDictionary());
 }
 
 TEST(Taxonomy, LocalizesPacksKeysAndPoles) {
@@ -268,6 +339,24 @@ TEST(TaxonomySearching, FindsPartsWithoutRegardToCaseAndDiacritics) {
     EXPECT_THAT(searching->findTagLabelsForString("", false), IsEmpty());
     EXPECT_THAT(labels(searching->findTagsForString("reggae")),
                 ElementsAre("Reggaeton", "Reggae & Ska", "Roots Reggae"));
+}
+
+TEST(TaxonomySearching, SearchesTheTableThatItIsGiven) {
+    const auto taxonomy =
+        taxonomyOf(Dictionary{{"A", Dictionary{{"Pop", Dictionary{}}, {"Rock", Dictionary{}}}},
+                              {"B", Dictionary{{"Pop", Dictionary{}}}}});
+    const auto searching = TGRTTaxonomySearching::initWithTaxonomy(taxonomy);
+    const TagPointer rock = taxonomy->findTagForLabel("Rock");
+    const TagPointer firstPop = taxonomy->findTagForLabel("Pop", "A");
+    const TagPointer lastPop = taxonomy->findTagForLabel("Pop", "B");
+    EXPECT_THAT(searching->tagsTable(), ElementsAre(Pair("Pop", lastPop), Pair("Rock", rock)));
+    searching->setTagsTable({{"x", rock}, {"Pop", lastPop}, {"x", firstPop}});
+    EXPECT_THAT(searching->tagsTable(), ElementsAre(Pair("x", firstPop), Pair("Pop", lastPop)));
+    EXPECT_EQ(searching->tagForLabel("x"), firstPop);
+    EXPECT_EQ(searching->tagForLabel("Rock"), nullptr);
+    EXPECT_THAT(searching->findTagLabelsForString("X", false), ElementsAre("x"));
+    searching->_updateSearchTable();
+    EXPECT_THAT(searching->findTagLabelsForString("o", false), ElementsAre("Pop", "Rock"));
 }
 
 TEST(ObjectSet, ForgetsTheRightOneOfTwoWithTheSameHash) {
