@@ -2,6 +2,7 @@
 #include "Resources.h"
 #include "RhythmMeasurement.h"
 #include "Services.h"
+#include "StandardStreams.h"
 #include "analysis/QVCTRhythmicTaggingService.h"
 #include "autotagging/QVTaggingAggregator.h"
 #include "formats/TGRTFileNode.h"
@@ -76,8 +77,8 @@ void printTable(const std::vector<Item>& items, const Terminal& terminal) {
     for (const Item& item : items) {
         const std::string itsFolder = item.url.URLByDeletingLastPathComponent().path();
         if (itsFolder != folder) {
-            fmt::print("{}{}\n", folder.empty() ? "" : "\n",
-                       colored(terminal, Color::strong, printable(itsFolder)));
+            print("{}{}\n", folder.empty() ? "" : "\n",
+                  colored(terminal, Color::strong, printable(itsFolder)));
             folder = itsFolder;
         }
         std::vector<Word> words;
@@ -85,8 +86,8 @@ void printTable(const std::vector<Item>& items, const Terminal& terminal) {
             words.push_back({textOfTagging(*tagging), tagging->level() ? Color::accent : Color::plain});
         }
         if (words.empty()) words.push_back({"no tags", Color::faint});
-        fmt::print("  {}  {}\n", padded(printable(item.url.lastPathComponent()), width),
-                   wrapped(terminal, words, width + 4));
+        print("  {}  {}\n", padded(printable(item.url.lastPathComponent()), width),
+              wrapped(terminal, words, width + 4));
     }
 }
 

@@ -1,11 +1,11 @@
 #include "Commands.h"
+#include "StandardStreams.h"
 #include "contentdb/ContentDatabase.h"
 #include "platform/Text.h"
 
 #include <memory>
 
 #include <CLI/CLI.hpp>
-#include <fmt/format.h>
 
 namespace qvct::tool {
 namespace {
@@ -24,7 +24,7 @@ void merge(const Options& options, ToolContext& context) {
     const auto totals = merged ? merged->totals(&error) : std::nullopt;
     if (!totals) return context.itemFailed(error.message);
     if (context.format == Format::table)
-        return fmt::print("{} items, {} of them failed\n", totals->items, totals->failures);
+        return print("{} items, {} of them failed\n", totals->items, totals->failures);
     printJson(Json{{"database", options.target}, {"items", totals->items}, {"failed", totals->failures}},
               context.format);
 }
@@ -43,13 +43,13 @@ void check(const Options& options, ToolContext& context) {
         }
         Json failures = Json::array();
         database->forEachFailure([&](const IndexedItem& item) {
-            if (context.format == Format::table) fmt::print("{}\n", messageOfFailure(item));
+            if (context.format == Format::table) print("{}\n", messageOfFailure(item));
             failures.push_back({{"path", item.path}, {"reason", item.failure}});
             return true;
         });
         if (context.format == Format::table)
-            fmt::print("{}: intact, {} items, {} of them failed\n", printable(path), totals->items,
-                       totals->failures);
+            print("{}: intact, {} items, {} of them failed\n", printable(path), totals->items,
+                  totals->failures);
         json.push_back(
             {{"database", path}, {"intact", true}, {"items", totals->items}, {"failures", failures}});
     }

@@ -1,11 +1,11 @@
 #include "CommandLine.h"
 #include "Commands.h"
+#include "StandardStreams.h"
 
 #include <map>
 #include <memory>
 
 #include <CLI/CLI.hpp>
-#include <fmt/format.h>
 
 namespace qvct::tool {
 
@@ -17,7 +17,7 @@ void addGenerateCommand(CLI::App& app) {
     auto* command = app.add_subcommand("generate", "Completions for a shell, or the manual page");
     command->group("");  // for the build, not for people
     command->add_option("kind", *kind)->required()->check(CLI::IsMember(writers));
-    command->callback([kind, &app] { fmt::print("{}", writers.at(*kind)(describeCommandLine(app))); });
+    command->callback([kind, &app] { printText(writers.at(*kind)(describeCommandLine(app))); });
 }
 
 }  // namespace qvct::tool

@@ -1,6 +1,7 @@
 #include "Commands.h"
 #include "Progress.h"
 #include "Services.h"
+#include "StandardStreams.h"
 #include "contentdb/ContentDatabase.h"
 #include "contentdb/ContentDescriber.h"
 #include "contentdb/LibraryWalk.h"
@@ -11,7 +12,6 @@
 #include <memory>
 
 #include <CLI/CLI.hpp>
-#include <fmt/format.h>
 
 namespace qvct::tool {
 namespace {
@@ -52,12 +52,10 @@ Json jsonOfRun(const IndexOptions& options, const IndexProgress& progress, doubl
 
 void printRun(const Json& run, const IndexProgress& progress, const ToolContext& context) {
     if (context.format != Format::table) return printJson(run, context.format);
-    fmt::print("{} items: {} indexed ({} of them moved), {} unchanged, {} failed", progress.seen,
-               progress.described, progress.moved, progress.unchanged, progress.failed);
-    if (progress.missing > 0)
-        fmt::print(", {} missing of which {} pruned", progress.missing, progress.pruned);
-    fmt::print("; {:.1f} s, {:.0f} a second\n", run["seconds"].get<double>(),
-               run["itemsPerSecond"].get<double>());
+    print("{} items: {} indexed ({} of them moved), {} unchanged, {} failed", progress.seen,
+          progress.described, progress.moved, progress.unchanged, progress.failed);
+    if (progress.missing > 0) print(", {} missing of which {} pruned", progress.missing, progress.pruned);
+    print("; {:.1f} s, {:.0f} a second\n", run["seconds"].get<double>(), run["itemsPerSecond"].get<double>());
 }
 
 void run(Options& options, ToolContext& context) {

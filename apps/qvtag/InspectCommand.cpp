@@ -1,5 +1,6 @@
 #include "Commands.h"
 #include "InspectedParts.h"
+#include "StandardStreams.h"
 #include "platform/Text.h"
 
 #include <memory>
@@ -30,21 +31,22 @@ void printPart(const InspectedPart& part, const Terminal& terminal, std::size_t 
     const std::string place = part.offset ? fmt::format("{}", *part.offset) : "";
     const std::string size = part.size ? fmt::format("{}", *part.size) : "";
     const std::string label = std::string(2 * depth, ' ') + printable(part.id);
-    fmt::print("{:>10} {:>10}  {}  {}{}\n", place, size, padded(label, 20), printable(part.meaning),
-               part.fault.empty() ? "" : "  " + colored(terminal, Color::accent, "FAULT: " + part.fault));
+    print("{:>10} {:>10}  {}  {}{}\n", place, size, padded(label, 20), printable(part.meaning),
+          part.fault.empty() ? "" : "  " + colored(terminal, Color::accent, "FAULT: " + part.fault));
     for (const InspectedPart& child : part.children) printPart(child, terminal, depth + 1);
 }
 
 void run(const Options& options, ToolContext& context) {
     Json json = Json::array();
     for (const URL& url : context.contentItems(options.paths)) {
+        if (isOutputLost()) break;
         Error error;
         const auto parts = partsOfItem(url, &error);
         if (!error.message.empty()) context.itemFailed(error.message);
         if (parts.empty() && !error.message.empty()) continue;
         if (context.format == Format::table) {
-            fmt::print("{}\n", colored(context.terminal(), Color::strong, printable(url.path())));
-            fmt::print("{}\n", colored(context.terminal(), Color::faint, "    offset       size  what"));
+            print("{}\n", colored(context.terminal(), Color::strong, printable(url.path())));
+            print("{}\n", colored(context.terminal(), Color::faint, "    offset       size  what"));
             for (const InspectedPart& part : parts) printPart(part, context.terminal(), 0);
             continue;
         }

@@ -1,4 +1,5 @@
 #include "Commands.h"
+#include "StandardStreams.h"
 #include "autotagging/QVCTKeywordExtractor.h"
 #include "platform/Text.h"
 
@@ -18,7 +19,7 @@ struct Options {
 void printTable(const CountedSet& found) {
     std::size_t width = 0;
     for (const auto& [label, _] : found) width = std::max(width, displayWidth(label));
-    for (const auto& [label, count] : found) fmt::print("{}  {}\n", padded(label, width), count);
+    for (const auto& [label, count] : found) print("{}  {}\n", padded(label, width), count);
 }
 
 void run(const Options& options, ToolContext& context) {

@@ -1,4 +1,5 @@
 #include "Commands.h"
+#include "StandardStreams.h"
 #include "platform/Text.h"
 #include "taxonomy/TGRTLegacyTaxonomyMapping.h"
 #include "taxonomy/TGRTTaxonomySearching.h"
@@ -73,9 +74,9 @@ void printTranslations(const std::vector<Translation>& translations, const Termi
     for (const auto& [_, tag, taggings] : translations)
         width = std::max(width, displayWidth(pathOfTag(*tag)));
     for (const auto& [vocabulary, tag, taggings] : translations) {
-        fmt::print("{}  {}  {}\n", padded(vocabulary, 5), padded(pathOfTag(*tag), width),
-                   taggings->empty() ? colored(terminal, Color::faint, "(nothing)")
-                                     : colored(terminal, Color::accent, textOfTaggings(*taggings)));
+        print("{}  {}  {}\n", padded(vocabulary, 5), padded(pathOfTag(*tag), width),
+              taggings->empty() ? colored(terminal, Color::faint, "(nothing)")
+                                : colored(terminal, Color::accent, textOfTaggings(*taggings)));
     }
 }
 
@@ -151,8 +152,8 @@ Json jsonOfCoverage(const Coverage& coverage) {
 
 void printList(std::string_view heading, const std::vector<std::string>& lines) {
     if (lines.empty()) return;
-    fmt::print("  {} ({})\n", heading, lines.size());
-    for (const std::string& line : lines) fmt::print("    {}\n", line);
+    print("  {} ({})\n", heading, lines.size());
+    for (const std::string& line : lines) print("    {}\n", line);
 }
 
 void printCoverage(const Coverage& coverage, const Terminal& terminal) {
@@ -163,8 +164,8 @@ void printCoverage(const Coverage& coverage, const Terminal& terminal) {
         return lines;
     };
     const std::size_t mapped = coverage.tags - coverage.withEmptyRow.size() - coverage.withoutRow.size();
-    fmt::print("{}  {} of {} tags have a mapping\n", colored(terminal, Color::strong, coverage.vocabulary),
-               mapped, coverage.tags);
+    print("{}  {} of {} tags have a mapping\n", colored(terminal, Color::strong, coverage.vocabulary), mapped,
+          coverage.tags);
     printList("rows that name no new tag", paths(coverage.withEmptyRow));
     printList("tags without a row", paths(coverage.withoutRow));
     printList("new labels that the taxonomy does not know", coverage.unknownLabels);

@@ -2,6 +2,7 @@
 #include "Commands.h"
 #include "PropertyListOutput.h"
 #include "RecordOutput.h"
+#include "StandardStreams.h"
 #include "indexing/TGRTIndexableContentObject.h"
 #include "platform/QVContentTaggingTypes.h"
 #include "platform/Text.h"
@@ -44,7 +45,7 @@ Json jsonOfObject(const URL& url, const ContentObject& object) {
 }
 
 void printObject(const URL& url, const ContentObject& object, const Terminal& terminal) {
-    fmt::print("{}\n", colored(terminal, Color::strong, printable(url.path())));
+    print("{}\n", colored(terminal, Color::strong, printable(url.path())));
     printKind(terminal, object.fileType(), object.subFileType());
     printField(terminal, "name", {{printable(object.displayName()), Color::plain}});
     printField(terminal, "preview", {{object.previewAvailable() ? "yes" : "no", Color::plain}});
@@ -64,6 +65,7 @@ void run(const Options& options, ToolContext& context) {
     Json json = Json::array();
     std::size_t withoutRecord = 0;
     for (const URL& url : context.contentItems(options.paths)) {
+        if (isOutputLost()) break;
         Error error;
         const auto object =
             TGRTIndexableContentObject::indexableContentObjectForURL(url, options.bits, &error);

@@ -1,5 +1,6 @@
 #include "Output.h"
 
+#include "StandardStreams.h"
 #include "contentdb/Decimal.h"
 #include "platform/Text.h"
 
@@ -38,14 +39,14 @@ std::string jsonText(const Json& value, bool onOneLine) {
 
 void printJson(const Json& items, Format format) {
     if (format == Format::json) {
-        fmt::print("{}\n", jsonText(items, false));
+        printText(jsonText(items, false) + "\n");
         return;
     }
     if (!items.is_array()) {
-        fmt::print("{}\n", jsonText(items, true));
+        printText(jsonText(items, true) + "\n");
         return;
     }
-    for (const Json& item : items) fmt::print("{}\n", jsonText(item, true));
+    for (const Json& item : items) printText(jsonText(item, true) + "\n");
 }
 
 Json jsonOfNumber(double number) {

@@ -1,8 +1,9 @@
 #include "Progress.h"
 
+#include "StandardStreams.h"
+
 #include <algorithm>
 #include <cmath>
-#include <cstdio>
 #include <string>
 
 #include <fmt/format.h>
@@ -40,15 +41,13 @@ void Progress::show(std::uint64_t done, std::uint64_t total) {
                            rate);
         if (rate > 0) line += fmt::format(", {} left", duration(static_cast<double>(total - done) / rate));
     }
-    fmt::print(stderr, "\r\x1b[K{}", line);
-    std::fflush(stderr);
+    printError("\r\x1b[K{}", line);
     hasLine_ = true;
 }
 
 void Progress::hide() {
     if (!hasLine_) return;
-    fmt::print(stderr, "\r\x1b[K");
-    std::fflush(stderr);
+    printErrorText("\r\x1b[K");
     hasLine_ = false;
 }
 

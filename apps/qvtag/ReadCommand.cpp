@@ -1,6 +1,7 @@
 #include "Commands.h"
 #include "PropertyListOutput.h"
 #include "RecordOutput.h"
+#include "StandardStreams.h"
 #include "formats/TGRTFileNode.h"
 #include "platform/QVContentTaggingTypes.h"
 #include "platform/Text.h"
@@ -50,7 +51,7 @@ Json jsonOfRecord(const URL& url, const TGRTMetaData& record) {
 }
 
 void printRecord(const URL& url, const TGRTMetaData& record, const Terminal& terminal) {
-    fmt::print("{}\n", colored(terminal, Color::strong, printable(url.path())));
+    print("{}\n", colored(terminal, Color::strong, printable(url.path())));
     printKind(terminal, record.fileType(), record.subFileType());
     const std::string name = record.displayName().value_or("");
     if (!name.empty()) printField(terminal, "name", {{printable(name), Color::plain}});
@@ -74,6 +75,7 @@ void run(const Options& options, ToolContext& context) {
                                (options.mapped ? std::uint64_t{kReadMappedTaggings} : 0);
     Json json = Json::array();
     for (const URL& url : context.contentItems(options.paths)) {
+        if (isOutputLost()) break;
         const auto record = readRecord(url, bits, context);
         if (!record) continue;
         if (context.format == Format::table) {

@@ -1,6 +1,7 @@
 #include "RecordOutput.h"
 
 #include "PropertyListOutput.h"
+#include "StandardStreams.h"
 #include "platform/QVContentTaggingTypes.h"
 #include "platform/Text.h"
 
@@ -11,8 +12,8 @@ namespace qvct::tool {
 void printField(const Terminal& terminal, std::string_view name, const std::vector<Word>& words) {
     constexpr std::size_t width = 22;
     if (words.empty()) return;
-    fmt::print("  {}{}\n", colored(terminal, Color::faint, padded(name, width - 2)),
-               wrapped(terminal, words, width));
+    print("  {}{}\n", colored(terminal, Color::faint, padded(name, width - 2)),
+          wrapped(terminal, words, width));
 }
 
 void printTaggings(const Terminal& terminal, const ObjectSet<TGRTTagging>& taggings) {

@@ -1,5 +1,6 @@
 #include "Commands.h"
 #include "RhythmMeasurement.h"
+#include "StandardStreams.h"
 #include "platform/FileAccess.h"
 #include "platform/Text.h"
 
@@ -72,11 +73,10 @@ std::string bar(float value) {
 }
 
 void printRow(const std::string& path, const RhythmResult& result) {
-    fmt::print(
-        "{}\n  density {} {:3.0f}%   complexity {} {:3.0f}%   {} onsets in {} beats of {}/{} at {:g} bpm\n",
-        printable(path), bar(result.density), static_cast<double>(result.density) * 100,
-        bar(result.complexity), static_cast<double>(result.complexity) * 100, result.onsets.size(),
-        result.beatCount, result.signatureTop, result.signatureBottom, rounded(result.tempo));
+    print("{}\n  density {} {:3.0f}%   complexity {} {:3.0f}%   {} onsets in {} beats of {}/{} at {:g} bpm\n",
+          printable(path), bar(result.density), static_cast<double>(result.density) * 100,
+          bar(result.complexity), static_cast<double>(result.complexity) * 100, result.onsets.size(),
+          result.beatCount, result.signatureTop, result.signatureBottom, rounded(result.tempo));
 }
 
 bool beginsLikeSvg(const std::string& path) {
@@ -118,6 +118,7 @@ void run(Options options, ToolContext& context) {
     if (!problem.empty()) return context.usageFailed(problem);
     Json items = Json::array();
     for (const std::string& path : options.paths) {
+        if (isOutputLost()) break;
         Error error;
         const auto result = measureRhythm(URL::fileURLWithPath(path), options.request, &error);
         if (!result) {

@@ -1,5 +1,6 @@
 #include "Commands.h"
 #include "Resources.h"
+#include "StandardStreams.h"
 #include "autotagging/QVCTXMLDocument.h"
 #include "autotagging/QVCTXMLRulesTaggingService.h"
 #include "formats/QVContentEditorFileUtilities.h"
@@ -70,14 +71,14 @@ std::vector<RuleOutcome> matchesOf(const Service& service, const URL& url, ToolC
 
 void printMatches(const URL& url, const std::vector<RuleOutcome>& matches, const Terminal& terminal) {
     constexpr std::size_t evidenceShown = 160;
-    fmt::print("{}\n", colored(terminal, Color::strong, printable(url.path())));
+    print("{}\n", colored(terminal, Color::strong, printable(url.path())));
     for (const RuleOutcome& match : matches) {
         std::vector<std::string> tags;
         for (const TagDictionary& tag : match.tags) tags.push_back(textOf(tag));
-        fmt::print("  {:>2}  {:<10}  {}\n", match.number, match.type, join(tags, "  "));
+        print("  {:>2}  {:<10}  {}\n", match.number, match.type, join(tags, "  "));
         std::string evidence = printable(match.evidence);
         if (evidence.size() > evidenceShown) evidence = evidence.substr(0, evidenceShown) + "...";
-        fmt::print("      {}\n", colored(terminal, Color::faint, evidence));
+        print("      {}\n", colored(terminal, Color::faint, evidence));
     }
 }
 
@@ -96,6 +97,7 @@ void show(const Options& options, ToolContext& context) {
     if (!service) return;
     Json items = Json::array();
     for (const URL& url : context.contentItems(options.paths)) {
+        if (isOutputLost()) break;
         const auto matches = matchesOf(service, url, context);
         if (context.format == Format::table) {
             printMatches(url, matches, context.terminal());
@@ -148,15 +150,14 @@ void printTallies(const std::vector<Tally>& tallies, std::size_t items, ToolCont
         }
         return printJson(Json{{"items", items}, {"rules", rules}}, context.format);
     }
-    fmt::print("rule  type        matches of {:<5}  time an item\n", items);
+    print("rule  type        matches of {:<5}  time an item\n", items);
     for (const Tally& tally : tallies) {
         if (!tally.rule.problem.empty()) {
-            fmt::print("{:>4}  {:<10}  {:>16}\n", tally.rule.number, printable(tally.rule.type),
-                       "never matches");
+            print("{:>4}  {:<10}  {:>16}\n", tally.rule.number, printable(tally.rule.type), "never matches");
             continue;
         }
-        fmt::print("{:>4}  {:<10}  {:>16}  {:>9.1f} us\n", tally.rule.number, tally.rule.type, tally.matches,
-                   microseconds(tally.time) / static_cast<double>(std::max<std::size_t>(items, 1)));
+        print("{:>4}  {:<10}  {:>16}  {:>9.1f} us\n", tally.rule.number, tally.rule.type, tally.matches,
+              microseconds(tally.time) / static_cast<double>(std::max<std::size_t>(items, 1)));
     }
 }
 

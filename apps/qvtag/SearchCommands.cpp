@@ -1,5 +1,6 @@
 #include "CommandLine.h"
 #include "Commands.h"
+#include "StandardStreams.h"
 #include "contentdb/ContentDatabase.h"
 #include "contentdb/Decimal.h"
 #include "platform/QVContentTaggingTypes.h"
@@ -110,7 +111,7 @@ void printItems(const std::vector<const IndexedItem*>& items, const std::vector<
     for (std::size_t i = 0; i < items.size(); ++i) {
         const std::string its = URL::fileURLWithPath(items[i]->path).URLByDeletingLastPathComponent().path();
         if (its != folder)
-            fmt::print("{}{}\n", i == 0 ? "" : "\n", colored(terminal, Color::strong, printable(its)));
+            print("{}{}\n", i == 0 ? "" : "\n", colored(terminal, Color::strong, printable(its)));
         folder = its;
         std::vector<Word> words;
         if (!notes.empty()) words.push_back({notes[i], Color::strong});
@@ -118,8 +119,7 @@ void printItems(const std::vector<const IndexedItem*>& items, const std::vector<
             words.push_back({fmt::format("{:g} bpm", *tempo), Color::faint});
         for (const IndexedTagging& tagging : items[i]->taggings)
             words.push_back({printable(textOf(tagging)), tagging.level ? Color::accent : Color::plain});
-        fmt::print("  {}  {}\n", padded(printable(items[i]->name), width),
-                   wrapped(terminal, words, width + 4));
+        print("  {}  {}\n", padded(printable(items[i]->name), width), wrapped(terminal, words, width + 4));
     }
 }
 
@@ -186,8 +186,8 @@ void countTags(const Options& options, ToolContext& context) {
     std::map<std::string, std::vector<const Facet*>> categories;
     for (const Facet& facet : *found) categories[facet.category].push_back(&facet);
     for (const auto& [category, tags] : categories) {
-        fmt::print("{}\n", colored(context.terminal(), Color::strong, printable(category)));
-        for (const Facet* facet : tags) fmt::print("  {:>9}  {}\n", facet->count, printable(facet->label));
+        print("{}\n", colored(context.terminal(), Color::strong, printable(category)));
+        for (const Facet* facet : tags) print("  {:>9}  {}\n", facet->count, printable(facet->label));
     }
 }
 

@@ -1,4 +1,5 @@
 #include "Commands.h"
+#include "StandardStreams.h"
 #include "platform/PropertyListFile.h"
 #include "platform/Text.h"
 #include "taxonomy/TGRTTaxonomy.h"
@@ -59,8 +60,8 @@ Json jsonOfTag(const TGRTTag& tag) {
 void printTree(const TGRTTag& tag, const Terminal& terminal, std::size_t depth) {
     std::string remark = tag.valueType() == kTagValuePlain ? "" : std::string(kindOf(tag));
     if (!tag.valueStepLabels().empty()) remark += ": " + join(tag.valueStepLabels(), ", ");
-    fmt::print("{}{}{}\n", std::string(2 * depth, ' '), tag.label(),
-               remark.empty() ? "" : "  " + colored(terminal, Color::faint, "(" + remark + ")"));
+    print("{}{}{}\n", std::string(2 * depth, ' '), tag.label(),
+          remark.empty() ? "" : "  " + colored(terminal, Color::faint, "(" + remark + ")"));
     for (const auto& child : tag.children()) printTree(*child, terminal, depth + 1);
 }
 
@@ -85,9 +86,8 @@ void show(const Options& options, ToolContext& context) {
     Json json = Json::array();
     for (const auto& category : chosenCategories(options.categories, *taxonomy, context)) {
         if (context.format == Format::table) {
-            fmt::print(
-                "{}  {}\n", colored(context.terminal(), Color::strong, category->identifier()),
-                colored(context.terminal(), Color::faint, fmt::format("{} tags", category->tags().size())));
+            print("{}  {}\n", colored(context.terminal(), Color::strong, category->identifier()),
+                  colored(context.terminal(), Color::faint, fmt::format("{} tags", category->tags().size())));
             for (const auto& tag : category->rootTags()) printTree(*tag, context.terminal(), 1);
             continue;
         }
@@ -121,7 +121,7 @@ void find(const Options& options, ToolContext& context) {
                                               similar.empty() ? "" : "; there are: " + join(similar, ", ")));
     }
     if (context.format != Format::table) return printJson(jsonOfTag(*tag), context.format);
-    fmt::print("{}\n", colored(context.terminal(), Color::faint, pathOfTag(*tag)));
+    print("{}\n", colored(context.terminal(), Color::faint, pathOfTag(*tag)));
     printTree(*tag, context.terminal(), 0);
 }
 
@@ -130,17 +130,17 @@ void search(const Options& options, ToolContext& context) {
     if (context.format != Format::table) {
         return printJson(Json(searching->findTagLabelsForString(options.text, false)), context.format);
     }
-    for (const auto& tag : searching->findTagsForString(options.text)) fmt::print("{}\n", pathOfTag(*tag));
+    for (const auto& tag : searching->findTagsForString(options.text)) print("{}\n", pathOfTag(*tag));
 }
 
 void exportTaxonomy(const Options& options, ToolContext& /*context*/) {
     const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
     if (options.what == "plist") {
-        fmt::print("{}", serializePropertyList(taxonomy->dictionary(), PropertyListFormat::xml));
+        printText(serializePropertyList(taxonomy->dictionary(), PropertyListFormat::xml));
     } else if (options.what == "strings") {
-        fmt::print("{}", taxonomy->localizedStrings());
+        printText(taxonomy->localizedStrings());
     } else {
-        fmt::print("{}\n", join(taxonomy->mappingExport(), "\n"));
+        print("{}\n", join(taxonomy->mappingExport(), "\n"));
     }
 }
 

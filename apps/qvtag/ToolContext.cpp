@@ -1,12 +1,12 @@
 #include "ToolContext.h"
 
 #include "Resources.h"
+#include "StandardStreams.h"
 #include "formats/ContentWalk.h"
 #include "platform/Log.h"
 #include "platform/Text.h"
 
 #include <algorithm>
-#include <cstdio>
 #include <memory>
 #include <mutex>
 #include <set>
@@ -17,9 +17,7 @@ namespace qvct::tool {
 namespace {
 
 void printLine(std::string_view message) {
-    // Standard output first, so that the two streams interleave as they were written.
-    std::fflush(stdout);
-    fmt::print(stderr, "qvtag: {}\n", message);
+    printError("qvtag: {}\n", message);
 }
 
 }  // namespace

@@ -1,4 +1,5 @@
 #include "Commands.h"
+#include "StandardStreams.h"
 #include "TaggingEdit.h"
 #include "Verification.h"
 #include "formats/TGRTFileNode.h"
@@ -171,16 +172,16 @@ Json jsonOfChange(const Change& change) {
 }
 
 void printChange(const Change& change, const Terminal& terminal) {
-    fmt::print("{}\n", colored(terminal, Color::strong, printable(change.url.path())));
+    print("{}\n", colored(terminal, Color::strong, printable(change.url.path())));
     for (const auto& tagging : sortedTaggings(change.removed))
-        fmt::print("  - {}/{}\n", printable(tagging->category()), textOfTagging(*tagging));
+        print("  - {}/{}\n", printable(tagging->category()), textOfTagging(*tagging));
     for (const auto& tagging : sortedTaggings(change.added))
-        fmt::print("  + {}/{}\n", printable(tagging->category()), textOfTagging(*tagging));
+        print("  + {}/{}\n", printable(tagging->category()), textOfTagging(*tagging));
     if (change.newName)
-        fmt::print("  name \"{}\" becomes \"{}\"\n", printable(change.oldName), printable(*change.newName));
-    if (change.isNone()) fmt::print("  {}\n", colored(terminal, Color::faint, "nothing to change"));
+        print("  name \"{}\" becomes \"{}\"\n", printable(change.oldName), printable(*change.newName));
+    if (change.isNone()) print("  {}\n", colored(terminal, Color::faint, "nothing to change"));
     if (change.verification)
-        fmt::print("  {}\n", colored(terminal, Color::faint, change.verification->description()));
+        print("  {}\n", colored(terminal, Color::faint, change.verification->description()));
 }
 
 void run(const Options& options, ToolContext& context) {

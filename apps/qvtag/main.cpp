@@ -1,15 +1,18 @@
 #include "Commands.h"
+#include "StandardStreams.h"
 #include "platform/Version.h"
 
+#include <algorithm>
 #include <exception>
+#include <sstream>
 #include <string>
 
 #include <CLI/CLI.hpp>
-#include <fmt/format.h>
 
 namespace {
 
-/// 0 done, 1 some items failed, 2 wrong usage.
+// Exit statuses beside 0, done.
+constexpr int kSomeFailed = 1;  // or output was lost
 constexpr int kWrongUsage = 2;
 
 void addSharedOptions(CLI::App& app, qvct::tool::ToolContext& context) {
@@ -65,7 +68,12 @@ int run(int argc, char** argv) {
     try {
         app.parse(argc, argv);
     } catch (const CLI::ParseError& error) {
-        return app.exit(error) == 0 ? 0 : kWrongUsage;
+        std::ostringstream output;
+        std::ostringstream errors;
+        const int status = app.exit(error, output, errors) == 0 ? 0 : kWrongUsage;
+        qvct::tool::printText(output.str());
+        qvct::tool::printErrorText(errors.str());
+        return status;
     }
     return context.exitStatus();
 }
@@ -73,10 +81,12 @@ int run(int argc, char** argv) {
 }  // namespace
 
 int main(int argc, char** argv) {
+    qvct::tool::prepareStandardStreams();
+    int status = kSomeFailed;
     try {
-        return run(argc, argv);
+        status = run(argc, argv);
     } catch (const std::exception& error) {
-        fmt::print(stderr, "qvtag: {}\n", error.what());
-        return 1;
+        qvct::tool::printError("qvtag: {}\n", error.what());
     }
+    return qvct::tool::finishOutput() ? status : std::max(status, kSomeFailed);
 }

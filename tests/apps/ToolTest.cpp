@@ -1,3 +1,4 @@
+#include "support/AudioFixtures.h"
 #include "support/RunTool.h"
 
 #include <filesystem>
@@ -246,6 +247,63 @@ TEST(Usage, WrongWordsEndWithTwo) {
     EXPECT_EQ(runTool({"--help"}).status, 0);
     for (const char* command : {"autotag", "inspect", "keywords", "read", "taxonomy", "write"}) {
         EXPECT_THAT(runTool({command, "--help"}).output, HasSubstr("Example:\n  qvtag ")) << command;
+    }
+}
+
+/// A stream that takes nothing, in the words of a shell.
+class BrokenStreams : public testing::Test {
+  protected:
+    BrokenStreams() {
+        int pipe[2];
+        EXPECT_EQ(::pipe(pipe), 0);
+        ::close(pipe[0]);
+        ::dup2(pipe[1], kPipe);
+        ::close(pipe[1]);
+    }
+    ~BrokenStreams() override { ::close(kPipe); }
+
+    /// The tool's exit status; -1 when it was killed.
+    static int run(const std::string& arguments, const std::string& streams) {
+        // The shell gives way to the tool, so that its end is seen as it is.
+        const int raw = std::system(("exec " + quoted(QVCT_TOOL) + " " + arguments + " " + streams).c_str());
+        return WIFEXITED(raw) ? WEXITSTATUS(raw) : -1;
+    }
+
+    static constexpr int kPipe = 9;  // whose reader has gone
+    const TemporaryFolder folder_;
+    const std::string sound_ = Wav().file(Wav().format() + Wav().data());
+};
+
+TEST_F(BrokenStreams, LostOutputIsAFailure) {
+    const std::string file = quoted(folder_.write("Dark Kick.wav", sound_));
+    for (const std::string& arguments :
+         {std::string("--help"), std::string("--version"), std::string("generate zsh"),
+          std::string("keywords Pad"), std::string("taxonomy show"), std::string("taxonomy export plist"),
+          std::string("taxonomy map Dark"), "read " + file, "autotag " + file, "autotag --jsonl " + file,
+          "inspect " + file, "object --options 256 " + file, "rules --json " + file,
+          "write --dry-run --add Source/Kick " + file}) {
+        for (const std::string stream : {"/dev/full", "&-", "&9"}) {
+            EXPECT_EQ(run(arguments, ">" + stream + " 2>" + folder_.path("err")), 1) << arguments << stream;
+            EXPECT_EQ(run(arguments, ">" + stream + " 2>" + stream), 1) << arguments << stream;
+            const bool isTold = readAll(folder_.path("err")).find("standard output: ") != std::string::npos;
+            EXPECT_EQ(isTold, stream != "&9") << arguments << stream;
+        }
+    }
+}
+
+TEST_F(BrokenStreams, ItemsAreWrittenAllTheSame) {
+    const auto write = [this](const std::string& streams) {
+        const std::string good = folder_.write("good.wav", sound_);
+        const std::string bad = folder_.write("bad.wav", "no sound");
+        EXPECT_EQ(run("write --add Source/Kick " + bad + " " + good + " " + bad, streams), 1) << streams;
+        return readAll(good);
+    };
+    const std::string written = write(">/dev/null 2>/dev/null");
+    ASSERT_NE(written, sound_);
+    for (const std::string stream : {"/dev/full", "&-", "&9"}) {
+        EXPECT_EQ(write(">/dev/null 2>" + stream), written) << stream;
+        EXPECT_EQ(write(">" + stream + " 2>/dev/null"), written) << stream;
+        EXPECT_EQ(write("<&- >" + stream + " 2>" + stream), written) << stream;
     }
 }
 
