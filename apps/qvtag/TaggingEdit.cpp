@@ -1,8 +1,8 @@
 #include "TaggingEdit.h"
 
+#include "SimilarTags.h"
 #include "ToolContext.h"
 #include "platform/Text.h"
-#include "taxonomy/TGRTTaxonomySearching.h"
 #include "taxonomy/TagNormalization.h"
 
 #include <algorithm>
@@ -52,10 +52,8 @@ std::string problemOf(std::string_view text, const std::optional<TagArgument>& r
                            knownCategories(*taxonomy));
     }
     if (taxonomy->findTagForLabel(argument.label, argument.category)) return {};
-    const auto similar =
-        TGRTTaxonomySearching::initWithTaxonomy(taxonomy)->findTagLabelsForString(argument.label, false);
     return fmt::format("no tag \"{}\" in {}{}", printable(argument.label), argument.category,
-                       similar.empty() ? "" : "; there are: " + join(similar, ", "));
+                       similarTags(argument.label, taxonomy));
 }
 
 bool isOfTag(const TGRTTagging& tagging, std::string_view category, std::string_view label) {

@@ -1,4 +1,5 @@
 #include "Commands.h"
+#include "SimilarTags.h"
 #include "StandardStreams.h"
 #include "platform/PropertyListFile.h"
 #include "platform/Text.h"
@@ -111,14 +112,20 @@ TagPointer findTag(const Options& options, const TGRTTaxonomy& taxonomy, ToolCon
     return nullptr;
 }
 
+/// " in Genres below House", as far as it was asked for.
+std::string placeOf(const Options& options) {
+    std::string place;
+    if (!options.category.empty()) place += " in " + printable(options.category);
+    if (!options.parent.empty()) place += " below " + printable(options.parent);
+    return place;
+}
+
 void find(const Options& options, ToolContext& context) {
     const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
     const TagPointer tag = findTag(options, *taxonomy, context);
     if (!tag) {
-        const auto searching = TGRTTaxonomySearching::initWithTaxonomy(taxonomy);
-        const auto similar = searching->findTagLabelsForString(options.label, false);
-        return context.itemFailed(fmt::format("no tag \"{}\"{}", printable(options.label),
-                                              similar.empty() ? "" : "; there are: " + join(similar, ", ")));
+        return context.itemFailed(fmt::format("no tag \"{}\"{}{}", printable(options.label), placeOf(options),
+                                              similarTags(options.label, taxonomy)));
     }
     if (context.format != Format::table) return printJson(jsonOfTag(*tag), context.format);
     print("{}\n", colored(context.terminal(), Color::faint, pathOfTag(*tag)));
@@ -126,11 +133,12 @@ void find(const Options& options, ToolContext& context) {
 }
 
 void search(const Options& options, ToolContext& context) {
-    const auto searching = TGRTTaxonomySearching::initWithTaxonomy(TGRTTaxonomy::defaultTaxonomy());
+    const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
     if (context.format != Format::table) {
+        const auto searching = TGRTTaxonomySearching::initWithTaxonomy(taxonomy);
         return printJson(Json(searching->findTagLabelsForString(options.text, false)), context.format);
     }
-    for (const auto& tag : searching->findTagsForString(options.text)) print("{}\n", pathOfTag(*tag));
+    for (const auto& tag : tagsHolding(options.text, taxonomy)) print("{}\n", pathOfTag(*tag));
 }
 
 void exportTaxonomy(const Options& options, ToolContext& /*context*/) {

@@ -138,6 +138,7 @@ TEST(Write, RefusesWrongWordsBeforeAnythingIsTouched) {
         const char* message;
     } const cases[] = {
         {{"--add", "Genres/Huose"}, "no tag \"Huose\" in Genres"},
+        {{"--add", "Source/House"}, "no tag \"House\" in Source; there are: Genres/House, "},
         {{"--add", "Genre/House"}, "no category \"Genre\"; there are: Artist"},
         {{"--add", "House"}, "\"House\" is no Category/Label"},
         {{"--create", "--add", "Genres/House=1.5"}, "\"Genres/House=1.5\": the level is out of range"},

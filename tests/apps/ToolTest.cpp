@@ -156,7 +156,11 @@ TEST(Taxonomy, ShowsFindsSearchesAndExports) {
     EXPECT_EQ(found["parent"], "House");
     const ToolResult lost = runTool({"taxonomy", "find", "deep house"});
     EXPECT_EQ(lost.status, 1);
-    EXPECT_THAT(lost.errors, HasSubstr("there are: Deep House"));
+    EXPECT_THAT(lost.errors, HasSubstr("there are: Genres/Deep House"));
+    EXPECT_THAT(runTool({"taxonomy", "find", "House", "--category", "Source", "--parent", "Bass"}).errors,
+                HasSubstr("no tag \"House\" in Source below Bass; there are: Genres/House, "));
+    EXPECT_THAT(runTool({"taxonomy", "search", "pop"}).output,
+                AllOf(HasSubstr("Aesthetic > Pop\n"), HasSubstr("Genres > Pop\n")));
     const ToolResult category = runTool({"taxonomy", "show", "Rhythm", "Nonsense"});
     EXPECT_EQ(category.status, 1);
     EXPECT_THAT(category.output, HasSubstr("Triplet"));
