@@ -3,6 +3,7 @@
 #include "platform/FileDescriptor.h"
 #include "platform/FileReplacement.h"
 #include "platform/Text.h"
+#include "platform/Url.h"
 
 #include <cerrno>
 #include <cstring>
@@ -24,7 +25,7 @@ bool failWithErrno(Error* error, ErrorCode code, std::string_view path) {
 }
 
 bool statOf(const std::string& path, struct stat& status) {
-    return ::stat(path.c_str(), &status) == 0;
+    return !isURLText(path) && ::stat(path.c_str(), &status) == 0;
 }
 
 }  // namespace
@@ -45,6 +46,10 @@ bool isRegularFile(const std::string& path) {
 }
 
 FileDescriptor openRegularFile(const std::string& path, Error* error, struct stat* status) {
+    if (isURLText(path)) {
+        failFor(error, kErrorInvalidArgument, path, "is no file URL");
+        return FileDescriptor(-1);
+    }
     // Without O_NONBLOCK, opening a named pipe would wait for a writer for ever.
     FileDescriptor descriptor(::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
     struct stat own {};

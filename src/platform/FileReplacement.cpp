@@ -2,6 +2,7 @@
 
 #include "platform/FileDescriptor.h"
 #include "platform/Text.h"
+#include "platform/Url.h"
 
 #include <algorithm>
 #include <cerrno>
@@ -281,6 +282,9 @@ FileStamp FileStamp::of(const struct stat& status) {
 
 bool replaceFileByPieces(const std::string& path, std::span<const FilePiece> pieces,
                          const FileReplacementOptions& options, Error* error) {
+    if (isURLText(path)) {
+        return fail(error, kErrorInvalidArgument, fmt::format("{}: is no file URL", printable(path)));
+    }
     return Replacement(path, options, error).run(pieces);
 }
 

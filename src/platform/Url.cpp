@@ -2,6 +2,7 @@
 
 #include "platform/Text.h"
 
+#include <algorithm>
 #include <filesystem>
 #include <utility>
 
@@ -121,6 +122,13 @@ URL URL::URLByDeletingLastPathComponent() const {
     const std::size_t slash = path_.rfind('/');
     std::string parent = slash == std::string::npos || slash == 0 ? "/" : path_.substr(0, slash);
     return {isFile_, isFile_ ? "" : text_.substr(0, text_.rfind('/')), std::move(parent)};
+}
+
+bool isURLText(std::string_view path) {
+    const std::size_t scheme = path.find("://");
+    return scheme != std::string_view::npos && scheme > 0 &&
+           std::all_of(path.begin(), path.begin() + static_cast<std::ptrdiff_t>(scheme),
+                       [](char c) { return isAsciiWordCharacter(c) || c == '+' || c == '-' || c == '.'; });
 }
 
 }  // namespace qvct

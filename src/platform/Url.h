@@ -19,8 +19,8 @@ class QVCT_API URL {
     static URL URLWithString(std::string_view text);
 
     bool isFileURL() const { return isFile_; }
-    /// The absolute path of a file URL; for others the text after the host.
-    const std::string& path() const { return path_; }
+    /// The absolute path of a file URL; for others their text, which reading and writing refuse as a path.
+    const std::string& path() const { return isFile_ ? path_ : text_; }
     /// "file://" and the percent-encoded path; for other URLs their text.
     std::string absoluteString() const;
     /// "file://" and the path as it is: `absoluteString` with the percent-encoding removed.
@@ -45,7 +45,11 @@ class QVCT_API URL {
 
     bool isFile_;
     std::string text_;  // of a URL that is no file URL
-    std::string path_;
+    std::string path_;  // of others the text after the host
 };
+
+/// Whether a path is the text of a URL, such as "https://host/Loop.wav", and so names nothing on this
+/// machine.
+bool isURLText(std::string_view path);
 
 }  // namespace qvct

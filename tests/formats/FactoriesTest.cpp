@@ -263,6 +263,38 @@ TEST(FileUtilities, LookForCompanionsInTheirOrder) {
     EXPECT_EQ(QVContentEditorFileUtilities::prelistenURLForURL(std::nullopt), std::nullopt);
 }
 
+TEST(ReadersAndWriters, TakeNoOtherURLForAPathOfThisMachine) {
+    const TemporaryFolder folder;
+    folder.write("a.wav", loopWav());
+    test::writeList(folder, "a.patch/tags.plist", {{"Type", 1}});
+    test::writeList(folder, "a.ostrax/Resources/tags.plist", {{"Type", 8}});
+    folder.write("a.cst", "x");
+    test::writeList(folder, "a.cst.plist", {{"Type", 6}});
+    folder.write("a.vcp", "<tagging>\n</tagging>\n");
+    for (const char* name : {"a.wav", "a.patch", "a.ostrax", "a.cst", "a.vcp"}) {
+        const URL local = urlOf(folder.path(name));
+        const URL remote = URL::URLWithString("http://host" + local.path());
+        Error error;
+        const auto reader = TGRTMetaDataReaderFactory::metaDataReaderForURL(local);
+        EXPECT_NE(reader->readMetaDataFromURL(local, 0), nullptr) << name;
+        EXPECT_EQ(reader->readMetaDataFromURL(remote, 0, &error), nullptr) << name;
+        EXPECT_THAT(error.message, testing::StartsWith("http://host/")) << name;
+        error = {};
+        const auto writer = TGRTMetaDataWriterFactory::taggingWriterForURL(local);
+        EXPECT_FALSE(writer->writeTaggings(test::taggingsOf({{"Genres", "House"}}), remote, &error)) << name;
+        EXPECT_THAT(error.message, testing::StartsWith("http://host/")) << name;
+        EXPECT_TRUE(reader->readMetaDataFromURL(local, 0)->taggings().empty()) << name;
+    }
+    const URL remote = URL::URLWithString("http://host" + folder.path("taxonomy.plist"));
+    Error error;
+    EXPECT_FALSE(TGRTTaxonomy::defaultTaxonomy()->writeToURL(remote, &error));
+    EXPECT_EQ(error.message, remote.absoluteString() + ": is no file URL");
+    EXPECT_FALSE(std::filesystem::exists(folder.path("taxonomy.plist")));
+    error = {};
+    TGRTTaxonomy::taxonomyWithContentsOfURL(remote, &error);
+    EXPECT_EQ(error.message, remote.absoluteString() + ": is no file URL");
+}
+
 TEST(Packages, GatherTheItemsThatNameThem) {
     const TemporaryFolder folder;
     std::vector<URL> items;

@@ -14,7 +14,7 @@ std::shared_ptr<TGRTMetaData> TGRTBundleMetaDataReader::readMetaDataFromURL(cons
                                                                             std::uint64_t /*options*/,
                                                                             Error* error) const {
     const std::string path = url.URLByAppendingPathComponent(plistPathComponent()).path();
-    if (!fileExists(path)) return nullptr;
+    if (url.isFileURL() && !fileExists(path)) return nullptr;
     const auto dictionary = readDictionaryFile(path, error);
     auto record = TGRTMetaData::metaDataFromDictionary(dictionary ? &*dictionary : nullptr, *taxonomy());
     if (record && record->fileType() == kFileTypeNone) record->setFileType(defaultFileType());

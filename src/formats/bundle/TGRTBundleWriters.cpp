@@ -13,7 +13,9 @@ namespace {
 std::string preparedPath(const URL& bundle, const std::string& plistPathComponent) {
     const URL list = bundle.URLByAppendingPathComponent(plistPathComponent);
     std::error_code ignored;
-    std::filesystem::create_directories(list.URLByDeletingLastPathComponent().path(), ignored);
+    if (list.isFileURL()) {
+        std::filesystem::create_directories(list.URLByDeletingLastPathComponent().path(), ignored);
+    }
     return list.path();
 }
 

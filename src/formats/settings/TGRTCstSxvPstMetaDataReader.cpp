@@ -17,7 +17,7 @@ std::shared_ptr<TGRTMetaData> TGRTCstSxvPstMetaDataReader::readMetaDataFromURL(c
                                                                                std::uint64_t /*options*/,
                                                                                Error* error) const {
     const std::string path = sideCarURLForURL(url).path();
-    if (!fileExists(path)) return nullptr;
+    if (url.isFileURL() && !fileExists(path)) return nullptr;
     const auto dictionary = readDictionaryFile(path, error);
     auto record = TGRTMetaData::metaDataFromDictionary(dictionary ? &*dictionary : nullptr, *taxonomy());
     if (record && record->fileType() == kFileTypeNone) {
