@@ -7,14 +7,12 @@
 #include "platform/Json.h"
 #include "platform/Log.h"
 #include "platform/Text.h"
+#include "platform/XmlParsing.h"
 
-#include <limits>
 #include <unordered_map>
 #include <utility>
 
 #include <fmt/format.h>
-#include <libxml/SAX2.h>
-#include <libxml/parser.h>
 #include <libxml/tree.h>
 
 namespace qvct {
@@ -23,86 +21,18 @@ namespace {
 /// Most JSON text that a document keeps for the next script, in bytes.
 constexpr std::size_t kMostKeptJson = std::size_t{1} << 20;
 
-/// Largest text that is turned into JSON for a script, which cannot be stopped in the middle of it.
-constexpr std::size_t kLargestForJson = std::size_t{16} << 20;
-
-/// Most elements and attributes of a document, whose tree takes up to a gigabyte then; large patches have
-/// 10,000.
-constexpr int kMostNodes = 1000000;
-
-/// Most messages about one document; damaged ones may cause one for each line.
-constexpr int kMostMessages = 5;
-
-struct ParserCloser {
-    void operator()(xmlParserCtxt* context) const { xmlFreeParserCtxt(context); }
-};
-
-struct DocumentCloser {
-    void operator()(xmlDoc* document) const { xmlFreeDoc(document); }
-};
-using Document = std::unique_ptr<xmlDoc, DocumentCloser>;
-
-/// Passes the XML library's messages to the log, and ends the parsing of what grows too large.
-class ParserGuard {
-  public:
-    ParserGuard(xmlParserCtxt& parser, std::string_view name) : name_(printable(name)) {
-        parser._private = this;
-        parser.sax->serror = receive;
-        parser.sax->startElementNs = startElement;
-    }
-
-    static void receive(void* context, xmlErrorPtr error) {
-        auto& self = of(context);
-        const std::string_view reason = error->message == nullptr ? "unknown fault" : error->message;
-        if (++self.count_ > kMostMessages) return;
-        log(fmt::format("{}, line {}: {}", self.name_, error->line, trimBlanksAndLineBreaks(reason)));
-    }
-
-    void logOmitted() const {
-        if (count_ > kMostMessages) log(fmt::format("{}: {} more faults", name_, count_ - kMostMessages));
-    }
-
-  private:
-    static ParserGuard& of(void* context) {
-        return *static_cast<ParserGuard*>(static_cast<xmlParserCtxt*>(context)->_private);
-    }
-
-    static void startElement(void* context, const xmlChar* name, const xmlChar* prefix, const xmlChar* uri,
-                             int nameSpaceCount, const xmlChar** nameSpaces, int attributeCount,
-                             int defaultedCount, const xmlChar** attributes) {
-        auto& self = of(context);
-        self.nodes_ += 1 + attributeCount;
-        if (self.nodes_ <= kMostNodes) {
-            return xmlSAX2StartElementNs(context, name, prefix, uri, nameSpaceCount, nameSpaces,
-                                         attributeCount, defaultedCount, attributes);
-        }
-        log(fmt::format("{}: more than {} elements and attributes; the rest is left out", self.name_,
-                        kMostNodes));
-        xmlStopParser(static_cast<xmlParserCtxt*>(context));
-    }
-
-    std::string name_;
-    int count_ = 0;
-    int nodes_ = 0;
-};
-
 /// Whether elements can be told to a parser as they stand in the tree: what was mended may have no text that
 /// is well-formed, entities are replaced only in text, and longer texts may be too long for JSON.
-bool isPlain(const xmlParserCtxt& parser, const xmlDoc& document, std::string_view text) {
+bool isPlain(const ParsedXml& parsed, std::string_view text) {
     constexpr std::size_t longest = kLargestForJson / 8;  // a character becomes six bytes of text at most
-    return parser.wellFormed != 0 && document.intSubset == nullptr && text.size() <= longest;
+    return parsed.isWellFormed && parsed.tree->intSubset == nullptr && text.size() <= longest;
 }
 
-Document parse(std::string_view text, std::string_view name, bool& isPlainTree) {
-    static const bool isInitialized = (xmlInitParser(), true);  // before several threads parse at once
-    const std::unique_ptr<xmlParserCtxt, ParserCloser> context(isInitialized ? xmlNewParserCtxt() : nullptr);
-    if (!context || text.size() > static_cast<std::size_t>(std::numeric_limits<int>::max())) return nullptr;
-    ParserGuard guard(*context, name);
-    Document document(xmlCtxtReadMemory(context.get(), text.data(), static_cast<int>(text.size()), nullptr,
-                                        nullptr, XML_PARSE_RECOVER | XML_PARSE_NONET));
-    isPlainTree = document != nullptr && isPlain(*context, *document, text);
-    guard.logOmitted();
-    return document;
+ParsedXml parse(std::string_view text, std::string_view name) {
+    ParsedXml parsed = parseXml(text);
+    for (const std::string& fault : parsed.faults) log(fmt::format("{}, {}", printable(name), fault));
+    if (parsed.moreFaults > 0) log(fmt::format("{}: {} more faults", printable(name), parsed.moreFaults));
+    return parsed;
 }
 
 std::string_view textOf(const std::vector<std::uint8_t>& bytes) {
@@ -112,16 +42,21 @@ std::string_view textOf(const std::vector<std::uint8_t>& bytes) {
 }  // namespace
 
 struct QVCTXMLDocument::Implementation {
-    Document document;
+    XmlTree document;
+    std::size_t textSize = 0;
     bool isPlain = false;
     XPathContext context;  // after the document, on which it depends
     /// By expression: the scripts of a rule set ask for the same plug-ins.
     std::unordered_map<std::string, std::optional<std::string>> keptJson;
     std::size_t keptBytes = 0;
 
-    Implementation(std::string_view text, std::string_view name) {
-        if (!text.empty()) document = parse(text, name, isPlain);
-        if (document) context = makeXPathContext(document.get());
+    Implementation(std::string_view text, std::string_view name) : textSize(text.size()) {
+        if (text.empty()) return;
+        ParsedXml parsed = parse(text, name);
+        if (!parsed.tree) return;
+        isPlain = qvct::isPlain(parsed, text);
+        document = std::move(parsed.tree);
+        context = makeXPathContext(document.get());
     }
 
     xmlNode* firstNode(std::string_view expression) const {
@@ -134,8 +69,12 @@ struct QVCTXMLDocument::Implementation {
     std::optional<std::string> jsonOf(xmlNode* node) const {
         if (!isPlain || node->type != XML_ELEMENT_NODE)
             return QVCTXMLDocument::JSONStringWithData(QVSKXMLNode::initWithXMLNode(node)->XMLData());
-        QVCTXMLParser parser;
+        QVCTXMLParser parser(QVCTXMLParser::largestJson(textSize));
         parser.didFindElement(*node);
+        if (parser.isTooLarge()) {
+            log("JSON grows too large");
+            return std::nullopt;
+        }
         return jsonText(PropertyList(parser.takeObject()), JsonStyle::pretty);
     }
 };
@@ -232,9 +171,11 @@ std::optional<std::string> QVCTXMLDocument::JSONStringWithData(std::string_view 
         log(fmt::format("JSON of {} bytes of XML is refused (at most {})", data.size(), kLargestForJson));
         return std::nullopt;
     }
-    auto dictionary = QVCTXMLParser::dictionaryForXMLData(data);
-    if (!dictionary) return std::nullopt;
-    return jsonText(PropertyList(std::move(*dictionary)), JsonStyle::pretty);
+    QVCTXMLParser parser(QVCTXMLParser::largestJson(data.size()));
+    auto dictionary = parser.objectWithData(data);
+    if (dictionary) return jsonText(PropertyList(std::move(*dictionary)), JsonStyle::pretty);
+    if (parser.isTooLarge()) log(parser.error().message);
+    return std::nullopt;
 }
 
 }  // namespace qvct

@@ -1,7 +1,9 @@
 #include "autotagging/QVCTXMLParser.h"
 
 #include "platform/Text.h"
+#include "platform/XmlParsing.h"
 
+#include <algorithm>
 #include <limits>
 #include <memory>
 
@@ -26,6 +28,10 @@ QVCTXMLParser& parserOf(void* context) {
     return *static_cast<QVCTXMLParser*>(static_cast<xmlParserCtxt*>(context)->_private);
 }
 
+void stopIfTooLarge(void* context) {
+    if (parserOf(context).isTooLarge()) xmlStopParser(static_cast<xmlParserCtxt*>(context));
+}
+
 void startElement(void* context, const xmlChar* name, const xmlChar** attributes) {
     QVCTXMLParser::Attributes members;
     members.reserve(kUsualMembers);
@@ -33,6 +39,7 @@ void startElement(void* context, const xmlChar* name, const xmlChar** attributes
         members.emplace_back(viewOf(attributes[0]), viewOf(attributes[1]));
     }
     parserOf(context).didStartElement(std::string(viewOf(name)), std::move(members));
+    stopIfTooLarge(context);
 }
 
 void endElement(void* context, const xmlChar* /*name*/) {
@@ -42,12 +49,15 @@ void endElement(void* context, const xmlChar* /*name*/) {
 void characters(void* context, const xmlChar* text, int length) {
     parserOf(context).foundCharacters(
         {reinterpret_cast<const char*>(text), static_cast<std::size_t>(length)});
+    stopIfTooLarge(context);
 }
 
 /// Keeps only entities whose text stands in the document, so that nothing outside is ever read.
 void declareEntity(void* context, const xmlChar* name, int type, const xmlChar* publicId,
                    const xmlChar* systemId, xmlChar* content) {
-    if (type == XML_INTERNAL_GENERAL_ENTITY) {
+    if (!hasFewAttributes(viewOf(content))) {
+        xmlStopParser(static_cast<xmlParserCtxt*>(context));
+    } else if (type == XML_INTERNAL_GENERAL_ENTITY) {
         xmlSAX2EntityDecl(context, name, type, publicId, systemId, content);
     }
 }
@@ -138,17 +148,34 @@ PropertyList::Dictionary QVCTXMLParser::Element::takeDictionary() {
     return dictionary;
 }
 
-QVCTXMLParser::QVCTXMLParser() {
+std::size_t QVCTXMLParser::largestJson(std::size_t xmlBytes) {
+    constexpr std::size_t always = std::size_t{1} << 20;
+    constexpr std::size_t usualGrowth = 8;  // indented, an attribute takes five times its place
+    return std::min(kLargestForJson, always + usualGrowth * std::min(xmlBytes, kLargestForJson));
+}
+
+QVCTXMLParser::QVCTXMLParser(std::size_t mostJson) : jsonLeft_(mostJson) {
     elements_.emplace_back();
 }
 
+bool QVCTXMLParser::takes(std::size_t jsonBytes) {
+    isTooLarge_ |= jsonBytes > jsonLeft_;
+    if (!isTooLarge_) jsonLeft_ -= jsonBytes;
+    return !isTooLarge_;
+}
+
 std::optional<PropertyList::Dictionary> QVCTXMLParser::dictionaryForXMLData(std::string_view data) {
-    return QVCTXMLParser().objectWithData(data);
+    return QVCTXMLParser(largestJson(data.size())).objectWithData(data);
 }
 
 std::optional<PropertyList::Dictionary> QVCTXMLParser::objectWithData(std::string_view data) {
     if (data.empty() || data.size() > static_cast<std::size_t>(std::numeric_limits<int>::max())) {
         parseErrorOccurred({std::string(QVCTErrorDomain), kErrorMalformed, "XML: no text, or far too much"});
+        return std::nullopt;
+    }
+    Error error;
+    if (!hasFewAttributes(data, &error)) {
+        parseErrorOccurred(std::move(error));
         return std::nullopt;
     }
     const std::unique_ptr<xmlParserCtxt, ContextCloser> context(
@@ -158,6 +185,12 @@ std::optional<PropertyList::Dictionary> QVCTXMLParser::objectWithData(std::strin
     *context->sax = handlers();
     context->_private = this;
     xmlParseDocument(context.get());
+    if (isTooLarge_) {
+        parseErrorOccurred(
+            {std::string(QVCTErrorDomain), kErrorTooLarge,
+             fmt::format("XML, line {}: its JSON grows too large", xmlSAX2GetLineNumber(context.get()))});
+        return std::nullopt;
+    }
     if (context->wellFormed == 0) {
         parseErrorOccurred(errorOf(*context));
         return std::nullopt;
@@ -167,7 +200,7 @@ std::optional<PropertyList::Dictionary> QVCTXMLParser::objectWithData(std::strin
 
 void QVCTXMLParser::didFindElement(const xmlNode& element) {
     didStartElement(nameOf(element.ns, element.name), attributesOf(element));
-    for (const xmlNode* child = element.children; child != nullptr; child = child->next) {
+    for (const xmlNode* child = element.children; child != nullptr && !isTooLarge_; child = child->next) {
         if (child->type == XML_ELEMENT_NODE) {
             didFindElement(*child);
         } else if (child->type == XML_TEXT_NODE || child->type == XML_CDATA_SECTION_NODE) {
@@ -178,10 +211,21 @@ void QVCTXMLParser::didFindElement(const xmlNode& element) {
 }
 
 void QVCTXMLParser::didStartElement(std::string name, Attributes attributes) {
+    constexpr std::size_t indentation = 4, punctuation = 8;
+    const std::size_t line = punctuation + indentation * elements_.size();
+    std::size_t json = 2 * line + name.size();  // it opens and closes
+    for (const auto& [key, value] : attributes)
+        json += line + indentation + key.size() + value.string()->size();
+    if (!takes(json)) return;
     elements_.push_back({std::move(name), std::move(attributes), {}});
 }
 
+void QVCTXMLParser::foundCharacters(std::string_view characters) {
+    if (takes(characters.size())) cdata_ += characters;
+}
+
 void QVCTXMLParser::didEndElement() {
+    if (isTooLarge_) return;
     Element element = std::move(elements_.back());
     elements_.pop_back();
     if (!cdata_.empty()) {

@@ -14,6 +14,9 @@ struct _xmlNode;  // NOLINT(bugprone-reserved-identifier): libxml2's name
 
 namespace qvct {
 
+/// Most XML that is turned into JSON for a script, and most JSON, in bytes.
+inline constexpr std::size_t kLargestForJson = std::size_t{16} << 20;
+
 /// Turns XML text into the tree of dictionaries that scripts are given as JSON.
 ///
 /// The container has one member, named after the root element. An element is a dictionary of its attributes
@@ -27,11 +30,16 @@ namespace qvct {
 /// Names are taken as written, prefixes and namespace declarations included. A parser is for one parse.
 class QVCTXMLParser {
   public:
-    /// The container, or nothing when the text is not well-formed XML. Entities are replaced within the
-    /// bounds of the XML library (declared ones only, none from outside), elements nest at most 256 deep.
+    /// The container, or nothing when the text is not well-formed XML or its JSON would be too large
+    /// (`largestJson`). Declared entities are replaced, none from outside; elements nest at most 256 deep.
     static std::optional<PropertyList::Dictionary> dictionaryForXMLData(std::string_view data);
 
-    QVCTXMLParser();
+    /// Most bytes of JSON, pretty printed and without escapes, that XML of so many bytes may become: entities
+    /// multiply, and deep nesting is mostly indentation.
+    static std::size_t largestJson(std::size_t xmlBytes);
+
+    /// For XML that becomes at most about so many bytes of JSON.
+    explicit QVCTXMLParser(std::size_t mostJson);
     std::optional<PropertyList::Dictionary> objectWithData(std::string_view data);
 
     /// The last error of the parse; code 0 when there was none.
@@ -41,12 +49,14 @@ class QVCTXMLParser {
     using Attributes = std::vector<std::pair<std::string, PropertyList>>;
     void didStartElement(std::string name, Attributes attributes);
     void didEndElement();
-    void foundCharacters(std::string_view characters) { cdata_ += characters; }
+    void foundCharacters(std::string_view characters);
     void parseErrorOccurred(Error error) { error_ = std::move(error); }
 
     /// The events that the element's own text would cause, without writing and reading it. Only for trees
     /// whose text would be well-formed and holds no references to entities, nested as deep as a parser reads.
     void didFindElement(const _xmlNode& element);
+    /// Whether the limit was reached: nothing was kept since.
+    bool isTooLarge() const { return isTooLarge_; }
     /// Takes the container with all that the events told.
     PropertyList::Dictionary takeObject() { return elements_.front().takeDictionary(); }
 
@@ -64,10 +74,13 @@ class QVCTXMLParser {
     };
 
     void addToParent(std::string name, PropertyList::Dictionary dictionary);
+    bool takes(std::size_t jsonBytes);
 
     Error error_;
     std::vector<Element> elements_;  // the first is the container
     std::string cdata_;
+    std::size_t jsonLeft_;
+    bool isTooLarge_ = false;
 };
 
 }  // namespace qvct

@@ -3,11 +3,9 @@
 #include "platform/Decompression.h"
 #include "platform/FileAccess.h"
 #include "platform/Text.h"
-
-#include <limits>
+#include "platform/XmlParsing.h"
 
 #include <fmt/format.h>
-#include <libxml/parser.h>
 #include <libxml/tree.h>
 #include <libxml/xpath.h>
 #include <libxml/xpathInternals.h>
@@ -16,8 +14,6 @@ namespace qvct {
 namespace {
 
 struct Closer {
-    void operator()(xmlParserCtxt* parser) const { xmlFreeParserCtxt(parser); }
-    void operator()(xmlDoc* document) const { xmlFreeDoc(document); }
     void operator()(xmlXPathContext* context) const { xmlXPathFreeContext(context); }
     void operator()(xmlXPathObject* result) const { xmlXPathFreeObject(result); }
     void operator()(xmlChar* text) const { xmlFree(text); }
@@ -39,7 +35,7 @@ const xmlChar* xmlText(const std::string& text) {
 }  // namespace
 
 struct XmlDocument::Implementation {
-    Owned<xmlDoc> document;
+    XmlTree document;
 };
 
 XmlDocument::XmlDocument(std::unique_ptr<Implementation> implementation)
@@ -59,23 +55,14 @@ std::shared_ptr<XmlDocument> XmlDocument::fromFile(const std::string& path, Erro
 
 std::shared_ptr<XmlDocument> XmlDocument::fromText(std::string_view text, std::string_view name,
                                                    Error* error) {
-    static const bool isInitialized = (xmlInitParser(), true);  // before several threads parse at once
-    const Owned<xmlParserCtxt> parser(isInitialized ? xmlNewParserCtxt() : nullptr);
-    if (!parser || text.size() > static_cast<std::size_t>(std::numeric_limits<int>::max())) {
-        fail(error, kErrorTooLarge, fmt::format("{}: too large to be parsed", printable(name)));
+    ParsedXml parsed = parseXml(text);
+    if (!parsed.tree) {
+        const std::string reason = parsed.faults.empty() ? "no XML" : parsed.faults.front();
+        fail(error, kErrorMalformed, fmt::format("{}, {}", printable(name), reason));
         return nullptr;
     }
-    constexpr int options = XML_PARSE_RECOVER | XML_PARSE_NONET | XML_PARSE_NOERROR | XML_PARSE_NOWARNING;
     auto implementation = std::make_unique<Implementation>();
-    implementation->document.reset(xmlCtxtReadMemory(parser.get(), text.data(), static_cast<int>(text.size()),
-                                                     nullptr, nullptr, options));
-    if (!implementation->document) {
-        const char* reason = parser->lastError.message == nullptr ? "no XML" : parser->lastError.message;
-        fail(error, kErrorMalformed,
-             fmt::format("{}, line {}: {}", printable(name), parser->lastError.line,
-                         trimBlanksAndLineBreaks(reason)));
-        return nullptr;
-    }
+    implementation->document = std::move(parsed.tree);
     return std::shared_ptr<XmlDocument>(new XmlDocument(std::move(implementation)));
 }
 

@@ -1,0 +1,201 @@
+#include "platform/XmlParsing.h"
+
+#include "platform/Text.h"
+
+#include <algorithm>
+#include <array>
+#include <limits>
+#include <optional>
+
+#include <fmt/format.h>
+#include <libxml/SAX2.h>
+#include <libxml/parser.h>
+#include <libxml/tree.h>
+
+namespace qvct {
+namespace {
+
+/// Damaged documents may cause a fault for each line.
+constexpr std::size_t kMostFaults = 5;
+
+struct ParserCloser {
+    void operator()(xmlParserCtxt* context) const { xmlFreeParserCtxt(context); }
+};
+
+/// Encodings that spell markup in ASCII, by how their names begin; zeros between the letters are skipped.
+constexpr std::array<std::string_view, 22> kAsciiEncodings = {
+    "utf-8",     "utf8",     "utf-16",  "utf16", "utf-32",    "ucs-2",   "ucs-4", "ascii",
+    "us-ascii",  "iso-8859", "iso8859", "latin", "windows-",  "cp125",   "gb",    "big5",
+    "shift_jis", "sjis",     "euc-",    "koi8-", "macintosh", "iso-2022"};
+
+bool isBlank(char c) {
+    return c == ' ' || c == '\t' || c == '\r' || c == '\n' || c == '\0';
+}
+
+/// The declared encoding in small letters, if there is one.
+std::optional<std::string> declaredEncoding(std::string_view text) {
+    constexpr std::size_t longestDeclaration = 1024;
+    std::string start(text.substr(0, longestDeclaration));
+    std::erase(start, '\0');
+    const std::size_t declaration = start.find("<?xml");
+    if (declaration == std::string::npos || declaration > 4) return std::nullopt;  // a byte order mark
+    const std::string inside = start.substr(declaration, start.find("?>") - declaration);
+    const std::size_t word = inside.find("encoding");
+    const std::size_t quote = word == std::string::npos ? word : inside.find_first_of("'\"", word);
+    if (quote == std::string::npos) return std::nullopt;
+    const std::string name = inside.substr(quote + 1);
+    return lowercase(name.substr(0, name.find(inside[quote])));
+}
+
+bool hasAsciiMarkup(std::string_view text, Error* error) {
+    constexpr std::string_view declarationInEbcdic = "\x4C\x6F\xA7\x94";
+    if (text.starts_with(declarationInEbcdic)) return fail(error, kErrorMalformed, "line 1: EBCDIC");
+    const std::optional<std::string> name = declaredEncoding(text);
+    const bool isKnown =
+        !name || std::any_of(kAsciiEncodings.begin(), kAsciiEncodings.end(),
+                             [&](std::string_view start) { return name->starts_with(start); });
+    return isKnown ||
+           fail(error, kErrorMalformed,
+                fmt::format("line 1: texts in the encoding \"{}\" are not read", printable(*name)));
+}
+
+std::size_t lineAt(std::string_view text, std::size_t offset) {
+    return 1 + static_cast<std::size_t>(
+                   std::count(text.begin(), text.begin() + static_cast<std::ptrdiff_t>(offset), '\n'));
+}
+
+/// Where the one attribute too many begins its value. No attribute goes on behind a "<", and each has a quote
+/// behind its "=": elsewhere too many are counted rather than too few.
+std::optional<std::size_t> attributeTooMany(std::string_view text) {
+    int count = 0;
+    for (std::size_t at = 0; at < text.size(); ++at) {
+        if (text[at] == '<') {
+            count = 0;
+        } else if (text[at] == '=') {
+            std::size_t next = at + 1;
+            while (next < text.size() && isBlank(text[next])) ++next;
+            const bool isValue = next < text.size() && (text[next] == '"' || text[next] == '\'');
+            if (isValue && ++count > kMostXmlAttributes) return at;
+            at = next - 1;
+        }
+    }
+    return std::nullopt;
+}
+
+/// Keeps the XML library's messages, and ends the parsing of what grows too large.
+class Parser {
+  public:
+    explicit Parser(std::string_view text)
+        : text_(text), mostNodes_(kMostXmlNodes + text.size() / kXmlBytesOfNode) {}
+
+    ParsedXml parse() {
+        static const bool isInitialized = (xmlInitParser(), true);  // before several threads parse at once
+        if (isInitialized) context_.reset(xmlNewParserCtxt());
+        if (!context_ || text_.size() > static_cast<std::size_t>(std::numeric_limits<int>::max())) {
+            result_.faults.emplace_back("too large to be parsed");
+            return std::move(result_);
+        }
+        Error error;
+        if (!hasFewAttributes(text_, &error)) {
+            result_.faults.push_back(std::move(error.message));
+            return std::move(result_);
+        }
+        context_->_private = this;
+        context_->sax->serror = [](void* context, xmlErrorPtr raised) {
+            of(context).addFault(raised->line,
+                                 raised->message == nullptr ? "unknown fault" : raised->message);
+        };
+        context_->sax->startElementNs = startElement;
+        context_->sax->entityDecl = declareEntity;
+        context_->sax->attributeDecl = declareAttribute;
+        result_.tree.reset(xmlCtxtReadMemory(context_.get(), text_.data(), static_cast<int>(text_.size()),
+                                             nullptr, nullptr, XML_PARSE_RECOVER | XML_PARSE_NONET));
+        result_.isWellFormed = result_.tree != nullptr && context_->wellFormed != 0 && !isStopped_;
+        return std::move(result_);
+    }
+
+  private:
+    static Parser& of(void* context) {
+        return *static_cast<Parser*>(static_cast<xmlParserCtxt*>(context)->_private);
+    }
+
+    void addFault(int line, std::string_view reason) {
+        if (result_.faults.size() == kMostFaults) {
+            ++result_.moreFaults;
+        } else {
+            result_.faults.push_back(fmt::format("line {}: {}", line, trimBlanksAndLineBreaks(reason)));
+        }
+    }
+
+    void stop(std::string_view reason) {
+        isStopped_ = true;
+        addFault(context_->input == nullptr ? 0 : context_->input->line, reason);
+        xmlStopParser(context_.get());
+    }
+
+    static void startElement(void* context, const xmlChar* name, const xmlChar* prefix, const xmlChar* uri,
+                             int nameSpaceCount, const xmlChar** nameSpaces, int attributeCount,
+                             int defaultedCount, const xmlChar** attributes) {
+        Parser& self = of(context);
+        self.nodes_ += 1 + static_cast<std::size_t>(attributeCount);
+        if (self.nodes_ > self.mostNodes_) {
+            return self.stop(
+                fmt::format("more than {} elements and attributes; the rest is left out", self.mostNodes_));
+        }
+        const int inScope = self.context_->nsNr / 2;  // a prefix and an address each
+        if (inScope > kMostXmlAttributes) {
+            return self.stop(
+                fmt::format("more than {} name spaces; the rest is left out", kMostXmlAttributes));
+        }
+        xmlSAX2StartElementNs(context, name, prefix, uri, nameSpaceCount, nameSpaces, attributeCount,
+                              defaultedCount, attributes);
+    }
+
+    /// What an entity holds is parsed as it stands here, character references replaced.
+    static void declareEntity(void* context, const xmlChar* name, int type, const xmlChar* publicId,
+                              const xmlChar* systemId, xmlChar* content) {
+        const auto* text = reinterpret_cast<const char*>(content);
+        if (text != nullptr && attributeTooMany(text)) {
+            return of(context).stop(fmt::format(
+                "an entity with more than {} attributes; the rest is left out", kMostXmlAttributes));
+        }
+        xmlSAX2EntityDecl(context, name, type, publicId, systemId, content);
+    }
+
+    static void declareAttribute(void* context, const xmlChar* element, const xmlChar* name, int type,
+                                 int standard, const xmlChar* value, xmlEnumerationPtr choices) {
+        Parser& self = of(context);
+        if (++self.declarations_ <= kMostXmlAttributes)
+            return xmlSAX2AttributeDecl(context, element, name, type, standard, value, choices);
+        xmlFreeEnumeration(choices);
+        self.stop(fmt::format("more than {} attributes declared; the rest is left out", kMostXmlAttributes));
+    }
+
+    std::string_view text_;
+    std::size_t mostNodes_;
+    std::unique_ptr<xmlParserCtxt, ParserCloser> context_;
+    ParsedXml result_;
+    std::size_t nodes_ = 0;
+    int declarations_ = 0;
+    bool isStopped_ = false;
+};
+
+}  // namespace
+
+void XmlTreeCloser::operator()(_xmlDoc* document) const {
+    xmlFreeDoc(document);
+}
+
+ParsedXml parseXml(std::string_view text) {
+    return Parser(text).parse();
+}
+
+bool hasFewAttributes(std::string_view text, Error* error) {
+    if (!hasAsciiMarkup(text, error)) return false;
+    const auto offset = attributeTooMany(text);
+    return !offset || fail(error, kErrorTooLarge,
+                           fmt::format("line {}: an element with more than {} attributes",
+                                       lineAt(text, *offset), kMostXmlAttributes));
+}
+
+}  // namespace qvct

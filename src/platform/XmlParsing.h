@@ -1,0 +1,47 @@
+#pragma once
+
+#include "platform/Error.h"
+
+#include <cstddef>
+#include <memory>
+#include <string>
+#include <string_view>
+#include <vector>
+
+struct _xmlDoc;  // NOLINT(bugprone-reserved-identifier): libxml2's name
+
+namespace qvct {
+
+/// Most attributes and name space declarations of one element, name spaces in scope, and attributes that a
+/// document type declares: the XML library compares each of them with all the others.
+inline constexpr int kMostXmlAttributes = 1000;
+/// Most elements and attributes of a document, and the bytes of text that stand for one more: a tree takes a
+/// hundred bytes and more for each. Large patches have 10,000, one for 20 bytes.
+inline constexpr std::size_t kMostXmlNodes = 100'000;
+inline constexpr std::size_t kXmlBytesOfNode = 40;
+
+struct XmlTreeCloser {
+    void operator()(_xmlDoc* document) const;
+};
+using XmlTree = std::unique_ptr<_xmlDoc, XmlTreeCloser>;
+
+/// A parsed text, malformed XML being recovered up to where it makes sense.
+struct ParsedXml {
+    XmlTree tree;                     ///< Null when there is nothing to recover, or too much.
+    bool isWellFormed = false;        ///< Whether the tree is all of the text.
+    std::vector<std::string> faults;  ///< The first few, each with its line.
+    std::size_t moreFaults = 0;       ///< Those behind.
+};
+
+/// Parses without reading anything outside the text: no network, no external entities or document types. The
+/// XML library's own bounds on depth, names and the growth of entities hold, and those above: an element with
+/// too many attributes, or a declaration of such, ends the document before it.
+/// @cost  O(bytes)
+ParsedXml parseXml(std::string_view text);
+
+/// Whether no element has too many attributes, counted without parsing; else false, and an error with its
+/// line. Texts in an encoding that does not spell markup in ASCII (apart from UTF-16 and UTF-32) are refused.
+/// @cost  O(bytes), a nanosecond each.
+bool hasFewAttributes(std::string_view text, Error* error = nullptr);
+
+}  // namespace qvct
