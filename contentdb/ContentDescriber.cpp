@@ -18,6 +18,7 @@
 
 #include <array>
 #include <cmath>
+#include <unordered_set>
 #include <utility>
 
 namespace qvct::contentdb {
@@ -86,19 +87,27 @@ bool hasValue(const IndexedItem& item, std::string_view key) {
                        [key](const IndexedValue& value) { return value.key == key; });
 }
 
+bool isKnown(std::string_view key, double number) {
+    return std::isfinite(number) && !isUnknown(key, number);
+}
+
 void addNumber(IndexedItem& item, std::string_view key, double number) {
-    if (std::isfinite(number) && !isUnknown(key, number) && !hasValue(item, key))
+    if (isKnown(key, number) && !hasValue(item, key))
         item.values.push_back({std::string(key), decimalOf(number)});
 }
 
+/// To an item that has no values yet. Records come with any number of them.
 void addValues(IndexedItem& item, const ObjectSet<TGRTKeyValue>& values) {
+    std::unordered_set<std::string> keys;
     for (const auto& keyValue : values) {
         const auto value = keyValue->value();
         if (!value) continue;
+        const auto number = value->doubleValue();
         if (value->string() != nullptr) {
+            keys.insert(keyValue->key());
             item.values.push_back({keyValue->key(), *value->string()});
-        } else if (const auto number = value->doubleValue()) {
-            addNumber(item, keyValue->key(), *number);
+        } else if (number && isKnown(keyValue->key(), *number) && keys.insert(keyValue->key()).second) {
+            item.values.push_back({keyValue->key(), decimalOf(*number)});
         }
     }
 }

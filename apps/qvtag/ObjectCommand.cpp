@@ -37,10 +37,11 @@ Json jsonOfObject(const URL& url, const ContentObject& object) {
     json["taggings"] = Json::array();
     for (const auto& tagging : sortedTaggings(object.taggingDatas()))
         json["taggings"].push_back(jsonOfTagging(*tagging));
-    json["keyValues"] = Json::object();
+    Json keyValues = Json::object();
     const PropertyList values = TGRTKeyValue::keyValueDictionaryForKeyValues(object.valueDatas());
     for (const auto& [key, value] : *values.dictionary())
-        json["keyValues"][key] = value.real() ? jsonOfNumber(*value.real()) : jsonOfPropertyList(value);
+        append(keyValues, key, value.real() ? jsonOfNumber(*value.real()) : jsonOfPropertyList(value));
+    json["keyValues"] = std::move(keyValues);
     return json;
 }
 

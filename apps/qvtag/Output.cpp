@@ -33,6 +33,10 @@ std::string colored(const Terminal& terminal, Color color, std::string_view text
     return fmt::format("\x1b[{}m{}\x1b[0m", code, text);
 }
 
+void append(Json& object, std::string key, Json value) {
+    object.get_ref<Json::object_t&>().emplace_back(std::move(key), std::move(value));
+}
+
 std::string jsonText(const Json& value, bool onOneLine) {
     return value.dump(onOneLine ? -1 : 2, ' ', false, Json::error_handler_t::replace);
 }

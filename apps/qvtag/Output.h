@@ -28,6 +28,8 @@ enum class Color { plain, strong, faint, accent };
 /// The text in a colour, where the terminal has any.
 std::string colored(const Terminal& terminal, Color color, std::string_view text);
 
+/// Adds a member whose key the object does not have yet, without looking for it.
+void append(Json& object, std::string key, Json value);
 /// A JSON text that stays valid whatever bytes are in its strings.
 std::string jsonText(const Json& value, bool onOneLine);
 /// Prints the items: as an array, or one a line.

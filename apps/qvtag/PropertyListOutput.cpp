@@ -34,7 +34,7 @@ std::string textOfDate(const PropertyList::Date& date) {
 Json jsonOfPropertyList(const PropertyList& value) {
     if (const auto* dictionary = value.dictionary()) {
         Json json = Json::object();
-        for (const auto& entry : *dictionary) json[entry.key] = jsonOfPropertyList(entry.value);
+        for (const auto& entry : *dictionary) append(json, entry.key, jsonOfPropertyList(entry.value));
         return json;
     }
     if (const auto* array = value.array()) {

@@ -14,6 +14,7 @@
 #include <functional>
 #include <map>
 #include <memory>
+#include <unordered_map>
 
 #include <CLI/CLI.hpp>
 #include <fmt/format.h>
@@ -64,6 +65,21 @@ Json jsonOf(const IndexedTagging& tagging) {
     return json;
 }
 
+/// Of a key that comes twice the last value.
+Json jsonOf(const std::vector<IndexedValue>& values) {
+    Json json = Json::object();
+    auto& members = json.get_ref<Json::object_t&>();
+    std::unordered_map<std::string_view, std::size_t> places;  // the object's own search is linear
+    for (const auto& [key, value] : values) {
+        const auto* number = std::get_if<double>(&value);
+        const auto [hit, isNew] = places.emplace(key, members.size());
+        if (isNew) members.emplace_back(key, Json());
+        (members.begin() + static_cast<std::ptrdiff_t>(hit->second))->second =
+            number != nullptr ? jsonOfNumber(*number) : Json(std::get<std::string>(value));
+    }
+    return json;
+}
+
 Json jsonOf(ContentDatabase& database, ItemId id, const IndexedItem& item) {
     Json json;
     json["id"] = id;
@@ -76,12 +92,7 @@ Json jsonOf(ContentDatabase& database, ItemId id, const IndexedItem& item) {
     json["previewAvailable"] = item.previewAvailable;
     json["taggings"] = Json::array();
     for (const IndexedTagging& tagging : item.taggings) json["taggings"].push_back(jsonOf(tagging));
-    json["keyValues"] = Json::object();
-    for (const IndexedValue& value : item.values) {
-        const auto* number = std::get_if<double>(&value.value);
-        json["keyValues"][value.key] =
-            number != nullptr ? jsonOfNumber(*number) : Json(std::get<std::string>(value.value));
-    }
+    json["keyValues"] = jsonOf(item.values);
     json["packages"] = item.packs;
     json["dependencies"] = Json::array();
     for (const IndexedDependency& dependency : item.dependencies)

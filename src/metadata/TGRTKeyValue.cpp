@@ -1,7 +1,8 @@
 #include "metadata/TGRTKeyValue.h"
 
-#include <unordered_set>
+#include <unordered_map>
 #include <utility>
+#include <vector>
 
 #include <fmt/format.h>
 
@@ -52,17 +53,21 @@ ObjectSet<TGRTKeyValue> TGRTKeyValue::keyValuesWithDictionary(const PropertyList
 
 PropertyList::Dictionary TGRTKeyValue::keyValueDictionaryForKeyValues(
     const ObjectSet<TGRTKeyValue>& keyValues) {
-    PropertyList::Dictionary result;
-    std::unordered_set<std::string_view> keys;
+    std::vector<PropertyList::Entry> entries;
+    std::unordered_map<std::string_view, std::size_t> places;
     for (const auto& item : keyValues) {
         auto value = item->value();
         if (!value) continue;
-        if (keys.insert(item->key_).second) {
-            result.append(item->key_, std::move(*value));
+        const auto [hit, isNew] = places.emplace(item->key_, entries.size());
+        if (isNew) {
+            entries.push_back({item->key_, *std::move(value)});
         } else {
-            result.set(item->key_, std::move(*value));
+            entries[hit->second].value = *std::move(value);
         }
     }
+    PropertyList::Dictionary result;
+    result.reserve(entries.size());
+    for (PropertyList::Entry& entry : entries) result.append(std::move(entry.key), std::move(entry.value));
     return result;
 }
 

@@ -70,9 +70,11 @@ std::vector<fs::path> itemsBelow(const fs::path& folder) {
     return items;
 }
 
-std::size_t expectWithinLimits(const fs::path& folder) {
-    // Between them they use every reader.
-    const std::vector<std::vector<std::string>> commands = {{"inspect"}, {"autotag", "--rhythm-any"}};
+using Commands = std::vector<std::vector<std::string>>;
+/// Between them they use every reader.
+const Commands kReaders = {{"inspect"}, {"autotag", "--rhythm-any"}};
+
+std::size_t expectWithinLimits(const fs::path& folder, const Commands& commands = kReaders) {
     const std::vector<fs::path> items = itemsBelow(folder);
     for (const fs::path& item : items) {
         for (const auto& command : commands) {
@@ -88,6 +90,49 @@ std::size_t expectWithinLimits(const fs::path& folder) {
         }
     }
     return items.size();
+}
+
+/// So many times `piece`, with its number where it says "#".
+std::string repeated(int count, std::string_view piece) {
+    std::string text;
+    const std::size_t place = std::min(piece.find('#'), piece.size());
+    for (int i = 0; i < count; ++i) {
+        text += piece.substr(0, place);
+        if (place == piece.size()) continue;
+        text += std::to_string(i);
+        text += piece.substr(place + 1);
+    }
+    return text;
+}
+
+/// Patches whose descriptions and records make libraries compare everything with everything, or multiply.
+void writeHostilePatches(const TemporaryFolder& folder) {
+    const auto description = [&](const std::string& name, const std::string& xml) {
+        folder.write(name + ".patch/org.qvcontenttagging.intermediate.cache.xml", xml);
+    };
+    const auto record = [&](const std::string& name, const std::string& xml) {
+        folder.write(name + ".patch/tags.plist", "<plist version=\"1.0\"><dict>" + xml + "</dict></plist>");
+    };
+    std::string nested;
+    for (int depth = 0; depth < 100; ++depth)
+        nested += "<b" + repeated(900, " xmlns:n" + std::to_string(depth) + "x#='u'") + ">";
+    description("attributes", "<P" + repeated(40000, " a#=''") + "/>");
+    description("name-spaces", "<P" + repeated(100000, " xmlns:a#='u'") + "/>");
+    description("name-spaces-in-scope", nested + repeated(50000, "<n0x0:c/>"));
+    description("attributes-in-entity",
+                "<!DOCTYPE P [<!ENTITY e \"&#60;b" + repeated(40000, " a#=''") + "/>\">]><P>&e;</P>");
+    description("elements", "<P>" + repeated(1000000, "<a/>") + "</P>");
+    record("key-values", "<key>KeyValueData</key><dict>" +
+                             repeated(50000, "<key>k#</key><integer>1</integer>") + "</dict>");
+}
+
+TEST(Limits, HoldForHostilePatches) {
+    const TemporaryFolder folder;
+    writeHostilePatches(folder);
+    Commands commands = kReaders;
+    commands.push_back({"--json", "read"});
+    commands.push_back({"--json", "object"});
+    EXPECT_GT(expectWithinLimits(folder.path(), commands), 5U);
 }
 
 TEST(Limits, HoldForContentOfEveryKind) {
