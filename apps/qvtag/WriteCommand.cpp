@@ -3,11 +3,8 @@
 #include "TaggingEdit.h"
 #include "Verification.h"
 #include "formats/TGRTFileNode.h"
-#include "formats/bundle/TGRTBundleMetaDataReader.h"
 #include "formats/bundle/TGRTBundleTypeValidators.h"
 #include "formats/settings/TGRTBinaryFileMetaDataReader.h"
-#include "platform/FileAccess.h"
-#include "platform/PropertyListFile.h"
 #include "platform/Text.h"
 
 #include <algorithm>
@@ -46,26 +43,6 @@ struct Change {
     bool isNone() const { return added.empty() && removed.empty() && !newName; }
 };
 
-/// The entries of a bundle's property list that a record cannot hold. Writing a whole record drops them.
-std::vector<std::string> foreignEntries(const URL& url) {
-    const auto reader = std::dynamic_pointer_cast<TGRTBundleMetaDataReader>(
-        TGRTFileNode::nodeWithFileURL(url)->metaDataReaderForFileURL(url));
-    if (!reader) return {};
-    const auto stored =
-        readDictionaryFile(url.URLByAppendingPathComponent(reader->plistPathComponent()).path());
-    auto record = TGRTMetaData::init();
-    record->setDisplayName("");
-    record->setSubFileType(1);
-    record->setContentInfo(TGRTContentInfo::init());
-    const auto known = record->prepareDictionaryForURL(url);
-    std::vector<std::string> keys;
-    for (const auto& entry : stored.value_or(PropertyList::Dictionary{})) {
-        const bool isKnown = known.value(entry.key) != nullptr || entry.key == QVContentTaggingUUIDKeyName;
-        if (!isKnown) keys.push_back(printable(entry.key));
-    }
-    return keys;
-}
-
 /// Why nothing can be written to an item of a kind that is none of those with writers.
 std::string reasonNotWritten(const URL& url) {
     const std::string path = printable(url.path());
@@ -83,7 +60,6 @@ std::string reasonNotWritten(const URL& url) {
 std::optional<Change> changeOfItem(const URL& url, const TaggingEdit& edit, const Options& options,
                                    ToolContext& context) {
     const auto node = TGRTFileNode::nodeWithFileURL(url);
-    const std::string path = printable(url.path());
     Error error;
     Change change{.url = url};
     if (!node->validator()) {
@@ -104,21 +80,24 @@ std::optional<Change> changeOfItem(const URL& url, const TaggingEdit& edit, cons
     if (options.name && *options.name != change.oldName) {
         change.newName = options.name;
         change.record->setDisplayName(*options.name);
-        const std::vector<std::string> lost = foreignEntries(url);
-        if (!lost.empty()) {
-            context.itemFailed(
-                fmt::format("{}: not renamed, since that would drop entries that are not ours: {}", path,
-                            join(lost, ", ")));
-            return std::nullopt;
-        }
     }
     return change;
+}
+
+/// A whole record stores the sub type that it holds: that of other tags must not stay in it.
+void updateSubType(const Change& change) {
+    const bool hasOtherTags = !change.added.empty() || !change.removed.empty();
+    const auto writer = std::dynamic_pointer_cast<TGRTBundleTaggingWriter>(
+        TGRTFileNode::nodeWithFileURL(change.url)->taggingWriterForFileURL(change.url));
+    if (hasOtherTags && writer)
+        change.record->setSubFileType(writer->subTypeFromTaggings(change.record->taggings()));
 }
 
 bool write(const Change& change, const Options& options, Error* error) {
     const ContentWriteOptions how{.keepsTimes = options.keepsTimes, .verifies = options.verifies};
     const auto node = TGRTFileNode::nodeWithFileURL(change.url);
     if (change.newName) {
+        updateSubType(change);
         const auto writer = node->metaDataWriterForFileURL(change.url);
         return writer && writer->writeMetaData(change.record, change.url, error, how);
     }

@@ -1,9 +1,13 @@
 #include "formats/StoredRecord.h"
 
+#include "metadata/StoredParts.h"
 #include "platform/FileAccess.h"
 #include "platform/FileReplacement.h"
 #include "platform/PropertyListFile.h"
+#include "platform/TaggingTypes.h"
 #include "platform/Text.h"
+
+#include <utility>
 
 #include <fmt/format.h>
 #include <sys/stat.h>
@@ -65,6 +69,17 @@ bool changeStoredDictionary(const std::string& path,
         return std::nullopt;
     };
     return changeStoredFile(path, changeBytes, error, options);
+}
+
+bool changeStoredContentInfo(const std::string& path,
+                             const std::shared_ptr<const TGRTContentInfo>& contentInfo, Error* error,
+                             const ContentWriteOptions& options) {
+    const auto change = [&contentInfo](PropertyList::Dictionary& stored) {
+        const PropertyList* value = std::as_const(stored).value(QVContentInfoKey);
+        stored.set(QVContentInfoKey,
+                   storedContentInfo(value, contentInfo ? *contentInfo : *TGRTContentInfo::init()));
+    };
+    return changeStoredDictionary(path, change, error, options);
 }
 
 bool failForMissingRecord(const std::string& path, Error* error) {

@@ -5,6 +5,7 @@
 #include "platform/PropertyList.h"
 
 #include <functional>
+#include <memory>
 #include <optional>
 #include <string>
 
@@ -25,6 +26,11 @@ bool changeStoredFile(
 bool changeStoredDictionary(const std::string& path,
                             const std::function<void(PropertyList::Dictionary&)>& change, Error* error,
                             const ContentWriteOptions& options);
+
+/// The same for its content info; null counts as an empty one.
+bool changeStoredContentInfo(const std::string& path,
+                             const std::shared_ptr<const TGRTContentInfo>& contentInfo, Error* error,
+                             const ContentWriteOptions& options);
 
 /// Fails because the caller handed in no record; names the path.
 bool failForMissingRecord(const std::string& path, Error* error);

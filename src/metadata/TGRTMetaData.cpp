@@ -1,11 +1,14 @@
 #include "metadata/TGRTMetaData.h"
 
+#include "metadata/StoredParts.h"
 #include "platform/FileAccess.h"
 #include "platform/PropertyListFile.h"
 #include "platform/TaggingTypes.h"
 #include "taxonomy/TGRTTaxonomy.h"
 
 #include <algorithm>
+#include <array>
+#include <utility>
 
 #include <fmt/format.h>
 
@@ -15,6 +18,25 @@ namespace {
 std::int64_t integerUnder(std::string_view key, const PropertyList::Dictionary& dictionary) {
     const PropertyList* value = dictionary.value(key);
     return value == nullptr ? 0 : value->integerValue().value_or(0);
+}
+
+const std::string* stringUnder(std::string_view key, const PropertyList::Dictionary& dictionary) {
+    const PropertyList* value = dictionary.value(key);
+    return value == nullptr ? nullptr : value->string();
+}
+
+/// A value that says the number already, in whatever type, stays.
+void setInteger(std::string_view key, std::int64_t number, PropertyList::Dictionary& dictionary) {
+    const PropertyList* value = std::as_const(dictionary).value(key);
+    if (value == nullptr || value->integerValue() != number) dictionary.set(key, number);
+}
+
+bool isKeyOfRecord(std::string_view key) {
+    constexpr std::array keys = {QVContentTaggingKeyName,        QVContentInfoKey,
+                                 QVContentKeyValueDataKey,       QVContentTaggingTypeKeyName,
+                                 QVContentTaggingSubTypeKeyName, QVContentTaggingDisplayKeyName,
+                                 QVContentTaggingUUIDKeyName};
+    return std::find(keys.begin(), keys.end(), key) != keys.end();
 }
 
 PropertyList::Dictionary storedDictionary(const URL& url, Error* error) {
@@ -38,19 +60,38 @@ std::optional<PropertyList> TGRTMetaData::valueForKey(std::string_view key) cons
     return hit == keyValues_.end() ? std::nullopt : (*hit)->value();
 }
 
+void TGRTMetaData::storeInto(PropertyList::Dictionary& stored) const {
+    const auto part = [&stored](std::string_view key) { return std::as_const(stored).value(key); };
+    stored.set(QVContentTaggingKeyName, storedTaggings(part(QVContentTaggingKeyName), taggings_));
+    if (contentInfo_) stored.set(QVContentInfoKey, storedContentInfo(part(QVContentInfoKey), *contentInfo_));
+    stored.set(QVContentKeyValueDataKey, storedKeyValues(part(QVContentKeyValueDataKey), keyValues_));
+    stored.remove(QVContentTaggingUUIDKeyName);
+    setInteger(QVContentTaggingTypeKeyName, fileType_, stored);
+    if (subFileType_ != 0) setInteger(QVContentTaggingSubTypeKeyName, subFileType_, stored);
+    if (displayName_) {
+        stored.set(QVContentTaggingDisplayKeyName, *displayName_);
+    } else if (stringUnder(QVContentTaggingDisplayKeyName, stored) != nullptr) {
+        stored.remove(QVContentTaggingDisplayKeyName);
+    }
+}
+
+void TGRTMetaData::storeOver(PropertyList::Dictionary& stored) const {
+    PropertyList::Dictionary kept;
+    kept.reserve(stored.size());
+    for (const auto& [key, value] : stored) {
+        const bool stays = isKeyOfRecord(key)
+                               ? (key != QVContentInfoKey || contentInfo_) &&
+                                     (key != QVContentTaggingSubTypeKeyName || subFileType_ != 0)
+                               : foreignKeys_.contains(key);
+        if (stays) kept.append(key, value);
+    }
+    stored = std::move(kept);
+    storeInto(stored);
+}
+
 PropertyList::Dictionary TGRTMetaData::prepareDictionaryForURL(const URL& url, Error* error) const {
     PropertyList::Dictionary result = storedDictionary(url, error);
-    result.set(QVContentTaggingKeyName, TGRTTagging::taggingDictionaryForTaggings(taggings_));
-    if (contentInfo_) result.set(QVContentInfoKey, contentInfo_->dictionary());
-    result.set(QVContentKeyValueDataKey, TGRTKeyValue::keyValueDictionaryForKeyValues(keyValues_));
-    result.remove(QVContentTaggingUUIDKeyName);
-    result.set(QVContentTaggingTypeKeyName, fileType_);
-    if (subFileType_ != 0) result.set(QVContentTaggingSubTypeKeyName, subFileType_);
-    if (displayName_) {
-        result.set(QVContentTaggingDisplayKeyName, *displayName_);
-    } else {
-        result.remove(QVContentTaggingDisplayKeyName);
-    }
+    storeInto(result);
     return result;
 }
 
@@ -58,13 +99,16 @@ std::shared_ptr<TGRTMetaData> TGRTMetaData::metaDataFromDictionary(const Propert
                                                                    TGRTTaxonomy& taxonomy) {
     if (dictionary == nullptr) return nullptr;
     auto record = init();
-    const PropertyList* name = dictionary->value(QVContentTaggingDisplayKeyName);
-    if (name != nullptr && name->string() != nullptr) record->displayName_ = *name->string();
+    if (const std::string* name = stringUnder(QVContentTaggingDisplayKeyName, *dictionary))
+        record->displayName_ = *name;
     record->fileType_ = integerUnder(QVContentTaggingTypeKeyName, *dictionary);
     record->subFileType_ = integerUnder(QVContentTaggingSubTypeKeyName, *dictionary);
     record->contentInfo_ = contentInfoFromDictionary(*dictionary);
     record->keyValues_ = keyValuesFromDictionary(*dictionary);
     record->taggings_ = taggingsFromDictionary(*dictionary, taxonomy);
+    for (const auto& entry : *dictionary) {
+        if (!isKeyOfRecord(entry.key)) record->foreignKeys_.insert(entry.key);
+    }
     return record;
 }
 

@@ -13,6 +13,7 @@
 #include <cstdint>
 #include <memory>
 #include <optional>
+#include <set>
 #include <string>
 #include <string_view>
 
@@ -50,13 +51,19 @@ class QVCT_API TGRTMetaData : public Object {
     /// The value of the key-value item with that key.
     std::optional<PropertyList> valueForKey(std::string_view key) const;
 
-    /// What to store at the URL: the property list that is stored there with this record's entries in place
-    /// of its own.
+    /// Puts the record into the dictionary that an item stores.
     ///
-    /// Entries that the record knows nothing of stay, where they stand; so do the sub-type when the record
-    /// has none, and the content info when it has none. A stored UUID is removed. When nothing is stored
-    /// there it starts empty. So it does when what is there cannot be read, but then the error says so:
-    /// whoever writes the result destroys what is there.
+    /// What the record knows nothing of stays where it stands, at every depth (see StoredParts.h); so do the
+    /// sub-type when the record has none, and the content info when it has none. A stored UUID is removed.
+    void storeInto(PropertyList::Dictionary& stored) const;
+    /// The same for an item whose dictionary is the record's alone: an entry beside those of a record goes,
+    /// unless this record was read from a dictionary with such an entry, and so do sub-type and content info
+    /// when the record has none.
+    void storeOver(PropertyList::Dictionary& stored) const;
+    /// What to store at the URL: this record put into the property list that is stored there, by `storeInto`.
+    ///
+    /// When nothing is stored there it starts empty. So it does when what is there cannot be read, but then
+    /// the error says so: whoever writes the result destroys what is there.
     PropertyList::Dictionary prepareDictionaryForURL(const URL& url, Error* error = nullptr) const;
 
     /// The record that a dictionary holds; null without dictionary. Entries that are not of their type count
@@ -83,6 +90,7 @@ class QVCT_API TGRTMetaData : public Object {
     ObjectSet<TGRTTagging> taggings_;
     ObjectSet<TGRTKeyValue> keyValues_;
     std::shared_ptr<TGRTContentInfo> contentInfo_;
+    std::set<std::string, std::less<>> foreignKeys_;  // of the dictionary that it was read from
 };
 
 }  // namespace qvct

@@ -195,14 +195,37 @@ TEST(Write, NamesWhatFailsAndDoesTheRest) {
     const ToolResult result = runTool({"write", "--json", "--name", "New", broken, text, sad, patch, data,
                                        inner, items.folder.path("Bass.cst")});
     EXPECT_EQ(result.status, 1);
-    EXPECT_EQ(result.json().size(), 1U);
-    for (const std::string& message : {broken, text + ": no kind of content", list, patch + ": not renamed",
-                                       data + ": data files are never written\n",
-                                       inner + ": belongs to the patch it lies in, " + patch + "\n"})
+    EXPECT_EQ(result.json().size(), 2U);
+    for (const std::string& message :
+         {broken, text + ": no kind of content", list, data + ": data files are never written\n",
+          inner + ": belongs to the patch it lies in, " + patch + "\n"})
         EXPECT_THAT(result.errors, HasSubstr(message));
     EXPECT_EQ(readAll(list), "no list");
     EXPECT_EQ(runTool({"write", "--add", "Genres/House", patch}).status, 0);
     EXPECT_THAT(readAll(patch + "/tags.plist"), HasSubstr("<key>Mine</key>"));
+}
+
+TEST(Write, ABundlesSubTypeIsThatOfItsTags) {
+    const TemporaryFolder folder;
+    folder.write("one.ostrax/Media/x", "");
+    const std::string project = folder.path("one.ostrax");
+    struct {
+        std::vector<std::string> arguments;
+        int subType;
+    } const steps[] = {
+        {{"--add", "Content Type/Demo Song", "--name", "A"}, 1},
+        {{"--remove", "Content Type/Demo Song", "--add", "Content Type/Remix Session", "--name", "B"}, 3},
+        {{"--name", "C"}, 3},
+        {{"--remove", "Content Type/Remix Session", "--name", "D"}, 0},
+    };
+    for (const auto& step : steps) {
+        std::vector<std::string> arguments = {"write", project};
+        arguments.insert(arguments.end(), step.arguments.begin(), step.arguments.end());
+        ASSERT_EQ(runTool(arguments).status, 0);
+        const json record = runTool({"read", "--json", project}).json()[0];
+        EXPECT_EQ(record["subFileType"], step.subType) << record;
+        EXPECT_EQ(record["displayName"], step.arguments.back());
+    }
 }
 
 const json* partWithId(const json& parts, const std::string& id) {

@@ -1,8 +1,10 @@
 #include "formats/audiofile/TGRTAudioFileWriters.h"
 
 #include "formats/StoredRecord.h"
+#include "metadata/StoredParts.h"
 #include "platform/LCFileParser.h"
 #include "platform/LCFileWriter.h"
+#include "platform/TaggingTypes.h"
 
 #include <functional>
 
@@ -20,26 +22,29 @@ bool changeFileData(const URL& url, bool isLoopType, const std::function<void(LC
     return LCFileWriter::fileWriterForURL(url, how)->writeFileData(fileData, error);
 }
 
-PropertyList::Dictionary dictionaryOf(const TGRTContentInfo* contentInfo) {
-    return contentInfo == nullptr ? PropertyList::Dictionary{} : contentInfo->dictionary();
+void setTaggings(LCFileData& fileData, const ObjectSet<TGRTTagging>& taggings) {
+    const auto changed = storedTaggings(fileData.record().value(QVContentTaggingKeyName), taggings);
+    if (changed.dictionary() != nullptr) fileData.setTaggingDictionary(*changed.dictionary());
+}
+
+void setContentInfo(LCFileData& fileData, const TGRTContentInfo* contentInfo) {
+    const auto changed = storedContentInfo(fileData.record().value(QVContentInfoKey),
+                                           contentInfo ? *contentInfo : *TGRTContentInfo::init());
+    if (changed.dictionary() != nullptr) fileData.setContentInfoDictionary(*changed.dictionary());
 }
 
 }  // namespace
 
 bool TGRTAudioFileTaggingWriter::writeTaggings(const ObjectSet<TGRTTagging>& taggings, const URL& url,
                                                Error* error, const ContentWriteOptions& options) const {
-    const auto change = [&taggings](LCFileData& fileData) {
-        fileData.setTaggingDictionary(TGRTTagging::taggingDictionaryForTaggings(taggings));
-    };
+    const auto change = [&taggings](LCFileData& fileData) { setTaggings(fileData, taggings); };
     return changeFileData(url, isLoopType(), change, error, options);
 }
 
 bool TGRTAudioFileContentInfoWriter::writeContentInfo(
     const std::shared_ptr<const TGRTContentInfo>& contentInfo, const URL& url, Error* error,
     const ContentWriteOptions& options) const {
-    const auto change = [&contentInfo](LCFileData& fileData) {
-        fileData.setContentInfoDictionary(dictionaryOf(contentInfo.get()));
-    };
+    const auto change = [&contentInfo](LCFileData& fileData) { setContentInfo(fileData, contentInfo.get()); };
     return changeFileData(url, isLoopType(), change, error, options);
 }
 
@@ -47,8 +52,10 @@ bool TGRTAudioFileMetaDataWriter::writeMetaData(const std::shared_ptr<TGRTMetaDa
                                                 Error* error, const ContentWriteOptions& options) const {
     if (!metaData) return failForMissingRecord(url.path(), error);
     const auto change = [&metaData](LCFileData& fileData) {
-        fileData.setTaggingDictionary(TGRTTagging::taggingDictionaryForTaggings(metaData->taggings()));
-        fileData.setContentInfoDictionary(dictionaryOf(metaData->contentInfo().get()));
+        setTaggings(fileData, metaData->taggings());
+        const TGRTContentInfo* contentInfo = metaData->contentInfo().get();
+        const bool hasSome = contentInfo != nullptr && !contentInfo->dictionary().empty();
+        if (hasSome || fileData.contentInfoDictionary() != nullptr) setContentInfo(fileData, contentInfo);
         fileData.setDisplayName(metaData->displayName().value_or(std::string{}));
     };
     return changeFileData(url, isLoopType(), change, error, options);

@@ -2,9 +2,11 @@
 
 #include "formats/StoredRecord.h"
 #include "formats/bundle/TGRTBundleMetaDataReader.h"
+#include "metadata/StoredParts.h"
 
 #include <filesystem>
 #include <system_error>
+#include <utility>
 
 namespace qvct {
 namespace {
@@ -28,7 +30,8 @@ std::int64_t TGRTBundleTaggingWriter::subTypeFromTaggings(const ObjectSet<TGRTTa
 bool TGRTBundleTaggingWriter::writeTaggings(const ObjectSet<TGRTTagging>& taggings, const URL& url,
                                             Error* error, const ContentWriteOptions& options) const {
     const auto change = [&](PropertyList::Dictionary& stored) {
-        stored.set(QVContentTaggingKeyName, TGRTTagging::taggingDictionaryForTaggings(taggings));
+        stored.set(QVContentTaggingKeyName,
+                   storedTaggings(std::as_const(stored).value(QVContentTaggingKeyName), taggings));
         stored.set(QVContentTaggingTypeKeyName, defaultFileType());
         stored.remove(QVContentTaggingUUIDKeyName);
         const std::int64_t subType = subTypeFromTaggings(taggings);
@@ -44,20 +47,14 @@ bool TGRTBundleTaggingWriter::writeTaggings(const ObjectSet<TGRTTagging>& taggin
 bool TGRTBundleContentInfoWriter::writeContentInfo(const std::shared_ptr<const TGRTContentInfo>& contentInfo,
                                                    const URL& url, Error* error,
                                                    const ContentWriteOptions& options) const {
-    const auto change = [&contentInfo](PropertyList::Dictionary& stored) {
-        stored.set(QVContentInfoKey, contentInfo ? contentInfo->dictionary() : PropertyList::Dictionary{});
-    };
-    return changeStoredDictionary(preparedPath(url, plistPathComponent()), change, error, options);
+    return changeStoredContentInfo(preparedPath(url, plistPathComponent()), contentInfo, error, options);
 }
 
 bool TGRTBundleMetaDataWriter::writeMetaData(const std::shared_ptr<TGRTMetaData>& metaData, const URL& url,
                                              Error* error, const ContentWriteOptions& options) const {
     if (!metaData) return failForMissingRecord(url.path(), error);
     if (metaData->fileType() == kFileTypeNone) metaData->setFileType(defaultFileType());
-    const auto change = [&](PropertyList::Dictionary& stored) {
-        // Of the bundle, where no property list can be: nothing of what is stored is taken over.
-        stored = metaData->prepareDictionaryForURL(url);
-    };
+    const auto change = [&](PropertyList::Dictionary& stored) { metaData->storeOver(stored); };
     return changeStoredDictionary(preparedPath(url, plistPathComponent()), change, error, options);
 }
 

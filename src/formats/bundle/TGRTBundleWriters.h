@@ -32,7 +32,8 @@ class TGRTBundleContentInfoWriter : public TGRTContentInfoWriter {
                           Error* error = nullptr, const ContentWriteOptions& options = {}) const override;
 };
 
-/// Writes the record over the property list: entries that no record has are lost.
+/// Writes the record over the property list: an entry that no record has is lost, unless the record was read
+/// from a list with such an entry.
 class TGRTBundleMetaDataWriter : public TGRTMetaDataWriter {
   public:
     virtual std::string plistPathComponent() const { return std::string(QVContentTaggingTagsPlistName); }

@@ -2,7 +2,10 @@
 
 #include "formats/StoredRecord.h"
 #include "formats/settings/TGRTCstSxvPstMetaDataReader.h"
+#include "metadata/StoredParts.h"
 #include "platform/QVContentTaggingTypes.h"
+
+#include <utility>
 
 namespace qvct {
 namespace {
@@ -16,7 +19,8 @@ URL sideCar(const URL& url) {
 bool TGRTCstSxvPstTaggingWriter::writeTaggings(const ObjectSet<TGRTTagging>& taggings, const URL& url,
                                                Error* error, const ContentWriteOptions& options) const {
     const auto change = [&](PropertyList::Dictionary& stored) {
-        stored.set(QVContentTaggingKeyName, TGRTTagging::taggingDictionaryForTaggings(taggings));
+        stored.set(QVContentTaggingKeyName,
+                   storedTaggings(std::as_const(stored).value(QVContentTaggingKeyName), taggings));
         stored.set(QVContentTaggingTypeKeyName,
                    std::int64_t{QVContentTaggingTypes::fallBackFileTypeForURL(url)});
         stored.remove(QVContentTaggingUUIDKeyName);
@@ -27,10 +31,7 @@ bool TGRTCstSxvPstTaggingWriter::writeTaggings(const ObjectSet<TGRTTagging>& tag
 bool TGRTCstSxvPstContentInfoWriter::writeContentInfo(
     const std::shared_ptr<const TGRTContentInfo>& contentInfo, const URL& url, Error* error,
     const ContentWriteOptions& options) const {
-    const auto change = [&contentInfo](PropertyList::Dictionary& stored) {
-        stored.set(QVContentInfoKey, contentInfo ? contentInfo->dictionary() : PropertyList::Dictionary{});
-    };
-    return changeStoredDictionary(sideCar(url).path(), change, error, options);
+    return changeStoredContentInfo(sideCar(url).path(), contentInfo, error, options);
 }
 
 bool TGRTCstSxvPstMetaDataWriter::writeMetaData(const std::shared_ptr<TGRTMetaData>& metaData, const URL& url,
@@ -39,9 +40,7 @@ bool TGRTCstSxvPstMetaDataWriter::writeMetaData(const std::shared_ptr<TGRTMetaDa
     if (metaData->fileType() == kFileTypeNone) {
         metaData->setFileType(QVContentTaggingTypes::fallBackFileTypeForURL(url));
     }
-    const auto change = [&](PropertyList::Dictionary& stored) {
-        stored = metaData->prepareDictionaryForURL(sideCar(url));
-    };
+    const auto change = [&](PropertyList::Dictionary& stored) { metaData->storeInto(stored); };
     return changeStoredDictionary(sideCar(url).path(), change, error, options);
 }
 
