@@ -1,9 +1,8 @@
 #include "contentdb/IndexRun.h"
 
-#include "contentdb/Digest.h"
 #include "contentdb/Paths.h"
 #include "contentdb/Terms.h"
-#include "platform/Object.h"
+#include "platform/FileAccess.h"
 #include "platform/Text.h"
 
 #include <algorithm>
@@ -11,6 +10,7 @@
 #include <utility>
 
 #include <fmt/format.h>
+#include <sys/stat.h>
 
 namespace qvct::contentdb {
 namespace {
@@ -33,10 +33,29 @@ std::int64_t wallNanoseconds() {
     return now.tv_sec * second + now.tv_nsec;
 }
 
+bool isAtOrBelow(std::string_view path, std::string_view folder) {
+    return path.starts_with(folder) &&
+           (path.size() == folder.size() || folder == "/" || path[folder.size()] == '/');
+}
+
+template <typename Folders>
+bool isBelow(std::string_view path, const Folders& folders) {
+    return std::any_of(folders.begin(), folders.end(),
+                       [path](const std::string& folder) { return isAtOrBelow(path, folder); });
+}
+
+/// Device and inode of a folder, links followed.
+std::optional<std::pair<std::uint64_t, std::uint64_t>> inodeOf(const std::string& path) {
+    struct stat status {};
+    if (::stat(path.c_str(), &status) != 0) return std::nullopt;
+    return std::pair<std::uint64_t, std::uint64_t>(status.st_dev, status.st_ino);
+}
+
 }  // namespace
 
 IndexRun::IndexRun(const IndexOptions& options, Connection& connection, WorkerPool& workers)
     : options_(options),
+      part_{options.part, options.parts},
       workers_(workers),
       writer_(connection),
       nextId_(writer_.store().lastId() + 1),
@@ -49,17 +68,23 @@ IndexRun::IndexRun(const IndexOptions& options, Connection& connection, WorkerPo
 bool IndexRun::walk(const std::string& folder) {
     if (isStopped_) return areWorkersInOrder_;
     roots_.push_back(folder);
-    walkLibrary(
-        folder,
-        [this](const std::string& path, const std::vector<ListedItem>& items) { return visit(path, items); },
-        [this](const std::string& path, const Error& error) {
-            unreadable_.insert(path);
-            if (options_.failed) options_.failed(error);
-        });
+    listed_ = 0;
+    if (isDirectory(folder))
+        walkLibrary(
+            folder,
+            [this](const std::string& path, const std::vector<ListedItem>& items) {
+                return visit(path, items);
+            },
+            [this](const std::string& path, const Error& error) {
+                unreadable_.insert(path);
+                if (options_.failed) options_.failed(error);
+            });
+    if (listed_ == 0 && !options_.pruneRoots) bareRoots_.emplace(folder, 0);
     return areWorkersInOrder_;
 }
 
 bool IndexRun::visit(const std::string& path, const std::vector<ListedItem>& all) {
+    listed_ += all.size();
     if (!shown_.insert(path).second) return true;  // below an earlier root
     std::vector<ListedItem> part;
     if (options_.parts > 1) part = itemsOfPart(path, all);
@@ -67,9 +92,9 @@ bool IndexRun::visit(const std::string& path, const std::vector<ListedItem>& all
     progress_.seen += items.size();
     const FolderRecord known = writer_.folder(path);
     if (known.id != 0) visited_.insert(known.id);
-    const std::uint64_t digest = digestOfPart(items);
+    const std::uint64_t digest = digestOf(items);
     // What is missing may have turned up elsewhere.
-    const bool isUnchanged = known.digest == digest && known.gone == 0;
+    const bool isUnchanged = known.digest == digest && known.part == part_ && known.gone == 0;
     if ((isUnchanged && !options_.retryFailed) || (known.id == 0 && items.empty())) {
         progress_.unchanged += items.size();
     } else {
@@ -90,23 +115,9 @@ std::vector<ListedItem> IndexRun::itemsOfPart(const std::string& path,
                                               const std::vector<ListedItem>& items) const {
     std::vector<ListedItem> part;
     for (const ListedItem& item : items) {
-        if (isOfPart(path, item.name)) part.push_back(item);
+        if (part_.holds(path, item.name)) part.push_back(item);
     }
     return part;
-}
-
-bool IndexRun::isOfPart(const std::string& path, std::string_view name) const {
-    return options_.parts == 1 || stringHash(pathIn(path, name)) % options_.parts == options_.part - 1;
-}
-
-std::uint64_t IndexRun::digestOfPart(const std::vector<ListedItem>& items) const {
-    const std::uint64_t digest = digestOf(items);
-    if (options_.parts == 1) return digest;
-    // What is missing was counted in this part only: the folder counts as unchanged for this part alone.
-    Digest mixed;
-    for (const std::uint64_t word : {digest, std::uint64_t{options_.part}, std::uint64_t{options_.parts}})
-        mixed.add(word);
-    return mixed.value();
 }
 
 bool IndexRun::submitChanged(const std::shared_ptr<OpenFolder>& folder, std::int64_t folderId,
@@ -132,7 +143,7 @@ bool IndexRun::submitChanged(const std::shared_ptr<OpenFolder>& folder, std::int
         }
     }
     for (const auto& [name, file] : known) {
-        if (!isOfPart(folder->path, name)) continue;
+        if (!part_.holds(folder->path, name)) continue;
         ++progress_.missing;
         ++folder->gone;
         missing_.insert(file.id);
@@ -194,6 +205,11 @@ void IndexRun::store(std::vector<Described>& batch) {
 
 void IndexRun::storeOne(const Described& described, Pending& pending) {
     const IndexedItem& item = described.item;
+    // What goes away while it waits to be read is missing, and not broken.
+    if (!item.failure.empty() && isGone(item.path)) {
+        pending.folder->digest = 0;
+        return;
+    }
     if (!item.failure.empty()) {
         ++progress_.failed;
         if (options_.failed) {
@@ -219,6 +235,7 @@ void IndexRun::storeFolder(const OpenFolder& folder) {
     visited_.insert(record.id);
     record.digest = folder.digest;
     record.gone = folder.gone;
+    record.part = part_;
     writer_.setFolder(record);
 }
 
@@ -236,34 +253,72 @@ void IndexRun::prune() {
     for (const ItemId id : missing_) removeIfGone(id);
     writer_.commit();
     for (const std::string& root : roots_) pruneUnvisited(root);
+    for (const auto& [root, missing] : bareRoots_) {
+        if (missing == 0 || !options_.failed) continue;
+        options_.failed(
+            {std::string(QVCTErrorDomain), kErrorUnreadable,
+             fmt::format(
+                 "{}: nothing is left in it, as when a disk is away; its {} items stay in the database "
+                 "(`--prune-roots` takes them out)",
+                 printable(root), missing)});
+    }
 }
 
 void IndexRun::pruneUnvisited(const std::string& root) {
-    std::vector<std::int64_t> folders;
+    std::vector<std::pair<FolderRecord, std::string>> folders;
     writer_.forEachFolder(root, [&](const FolderRecord& folder, std::string_view path) {
-        if (!visited_.contains(folder.id) && !isBelowFailed(path)) folders.push_back(folder.id);
+        if (!visited_.contains(folder.id) && !isBelow(path, unreadable_)) folders.emplace_back(folder, path);
     });
-    for (const std::int64_t folder : folders) {
+    for (const auto& [folder, path] : folders) {
         writer_.begin();
-        for (const auto& [name, file] : writer_.files(folder)) {
+        pruneFolder(folder, path);
+        writer_.commit();
+    }
+}
+
+void IndexRun::pruneFolder(const FolderRecord& folder, const std::string& path) {
+    const auto otherPath = otherPathOf(path);
+    for (const auto& [name, file] : writer_.files(folder.id)) {
+        if (!part_.holds(path, name)) continue;
+        const auto other = otherPath ? writer_.store().idOfPath(pathIn(*otherPath, name)) : std::nullopt;
+        if (other) {
+            writer_.addEarlierPath(*other, pathIn(path, name));
+            writer_.remove(file.id);
+        } else {
             ++progress_.missing;
             removeIfGone(file.id);
         }
-        writer_.commit();
     }
 }
 
 void IndexRun::removeIfGone(ItemId id) {
     const auto item = writer_.store().item(id);
-    if (!item || !isGone(item->path)) return;
+    if (!item || !isGone(item->path) || isSpared(item->path)) return;
     writer_.remove(id);
     ++progress_.pruned;
 }
 
-bool IndexRun::isBelowFailed(std::string_view path) const {
-    return std::any_of(unreadable_.begin(), unreadable_.end(), [path](const std::string& failed) {
-        return path == failed || path.starts_with(failed + "/");
-    });
+/// Whether the item stays because nothing at all is left where it was.
+bool IndexRun::isSpared(std::string_view path) {
+    for (auto& [root, missing] : bareRoots_) {
+        if (!isAtOrBelow(path, root)) continue;
+        ++missing;
+        return true;
+    }
+    return false;
+}
+
+/// The path by which the walk came to a folder, when it was not this one: through another link, or past one.
+std::optional<std::string> IndexRun::otherPathOf(const std::string& folder) {
+    const auto inode = inodeOf(folder);
+    if (!inode) return std::nullopt;
+    if (shownByInode_.empty()) {
+        for (const std::string& path : shown_) {
+            if (const auto its = inodeOf(path)) shownByInode_.emplace(*its, path);
+        }
+    }
+    const auto hit = shownByInode_.find(*inode);
+    return hit == shownByInode_.end() || hit->second == folder ? std::nullopt : std::optional(hit->second);
 }
 
 void IndexRun::report() {

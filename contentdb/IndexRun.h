@@ -7,7 +7,9 @@
 
 #include <chrono>
 #include <cstdint>
+#include <map>
 #include <memory>
+#include <optional>
 #include <set>
 #include <string>
 #include <unordered_map>
@@ -42,8 +44,6 @@ class IndexRun {
 
     bool visit(const std::string& path, const std::vector<ListedItem>& items);
     std::vector<ListedItem> itemsOfPart(const std::string& path, const std::vector<ListedItem>& items) const;
-    bool isOfPart(const std::string& path, std::string_view name) const;
-    std::uint64_t digestOfPart(const std::vector<ListedItem>& items) const;
     bool submitChanged(const std::shared_ptr<OpenFolder>& folder, std::int64_t folderId,
                        const std::vector<ListedItem>& items);
     bool submit(const ListedItem& item, ItemId id, const std::shared_ptr<OpenFolder>& folder);
@@ -56,11 +56,14 @@ class IndexRun {
     void flushIfDue();
     void prune();
     void pruneUnvisited(const std::string& root);
+    void pruneFolder(const FolderRecord& folder, const std::string& path);
     void removeIfGone(ItemId id);
-    bool isBelowFailed(std::string_view path) const;
+    bool isSpared(std::string_view path);
+    std::optional<std::string> otherPathOf(const std::string& folder);
     void report();
 
     const IndexOptions& options_;
+    const Part part_;
     WorkerPool& workers_;
     StoreWriter writer_;
     IndexProgress progress_;
@@ -73,9 +76,12 @@ class IndexRun {
     std::vector<Described> batch_;
     std::size_t termsInBatch_ = 0;
     std::vector<std::shared_ptr<OpenFolder>> complete_;  // to be stored with the batch
+    std::uint64_t listed_ = 0;                           // in the root at which the walk is, of all parts
     std::vector<std::string> roots_;
-    std::unordered_set<std::string> shown_;     // folders, by path
-    std::unordered_set<std::int64_t> visited_;  // folders, by number
+    std::map<std::string, std::uint64_t, std::less<>> bareRoots_;  // nothing is there; how much is missing
+    std::unordered_set<std::string> shown_;                        // folders, by path
+    std::unordered_set<std::int64_t> visited_;                     // folders, by number
+    std::map<std::pair<std::uint64_t, std::uint64_t>, std::string> shownByInode_;  // made when asked
     std::set<std::string, std::less<>> unreadable_;
     std::set<ItemId> missing_;  // of the folders that were visited
     std::chrono::steady_clock::time_point lastFlush_;

@@ -87,7 +87,8 @@ std::optional<IndexProgress> indexLibrary(const IndexOptions& options, const Des
     std::vector<std::string> folders;
     for (const std::string& folder : options.folders) {
         folders.push_back(URL::fileURLWithPath(folder).path());
-        if (!isDirectory(folders.back()))
+        const bool mayBeAway = options.prune && options.pruneRoots && !fileExists(folders.back());
+        if (!isDirectory(folders.back()) && !mayBeAway)
             return refuse(kErrorUnreadable,
                           fmt::format("{}: {}", printable(folder),
                                       fileExists(folder) ? "is a file, not a folder" : "no such folder"));

@@ -33,8 +33,11 @@ struct IndexOptions {
     /// A number for what describes items, such as `ContentDescriber::digest`. The database keeps it; when it
     /// is another than before, every item counts as changed, also those that only a later run comes to.
     std::uint64_t describer = 0;
-    /// Takes items out of the index whose files are gone.
+    /// Takes items out of the index whose files are gone, but for those below a folder of `folders` in which
+    /// nothing is left: a disk that is away looks like this. `failed` is told of it.
     bool prune = false;
+    /// With `prune`: takes those out as well, and those of a folder of `folders` that is not there.
+    bool pruneRoots = false;
     /// Reads items again that failed before, though they have not changed.
     bool retryFailed = false;
     /// Reads the database whole before, each record and index entry, as `ContentDatabase::check` does;

@@ -127,7 +127,9 @@ void include(FileStamp& stamp, const FileStamp& other) {
 /// Takes in all that lies in a bundle, up to a bound that no bundle reaches.
 void includeContents(int parent, const char* name, FileStamp& stamp, std::size_t& budget, std::size_t depth) {
     constexpr std::size_t deepest = 16;
-    const int file = ::openat(parent, name, O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC);
+    // The bundle itself may be a link; one within it is part of it as it stands.
+    const int links = depth == 0 ? 0 : O_NOFOLLOW;
+    const int file = ::openat(parent, name, O_RDONLY | O_DIRECTORY | links | O_CLOEXEC);
     if (file < 0 || depth > deepest) {
         if (file >= 0) ::close(file);
         return;

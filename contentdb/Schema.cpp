@@ -51,7 +51,12 @@ constexpr std::array kMigrations = {
     // Of many copies the one of the same inode is found at once.
     R"(CREATE TABLE setting (name TEXT PRIMARY KEY, value INTEGER NOT NULL) WITHOUT ROWID;
        DROP INDEX item_payload;
-       CREATE INDEX item_payload ON item (payload, inode) WHERE length(payload) > 0;)"};
+       CREATE INDEX item_payload ON item (payload, inode) WHERE length(payload) > 0;)",
+    // A digest speaks for the items of one part. Those of before may have outlived the items that they spoke
+    // for.
+    R"(ALTER TABLE folder ADD COLUMN part INTEGER NOT NULL DEFAULT 1;
+       ALTER TABLE folder ADD COLUMN parts INTEGER NOT NULL DEFAULT 1;
+       UPDATE folder SET digest = 0;)"};
 
 /// The first bytes of the file, or fewer if it is shorter.
 std::string header(const std::string& path) {

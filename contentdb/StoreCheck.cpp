@@ -1,6 +1,12 @@
 #include "contentdb/ContentStore.h"
+#include "contentdb/LibraryWalk.h"
+#include "contentdb/Part.h"
 #include "contentdb/Terms.h"
 #include "platform/Text.h"
+
+#include <deque>
+#include <optional>
+#include <vector>
 
 #include <fmt/format.h>
 
@@ -22,6 +28,30 @@ class Tally {
     std::uint64_t sum_ = 0;
     std::uint64_t count_ = 0;
 };
+
+/// The folder that does not hold what it is passed over for: its digest speaks of other items than it has.
+std::optional<std::string> misjudgedFolder(Connection& connection) {
+    Statement folder(connection,
+                     "SELECT id, path, digest, part, parts FROM folder WHERE digest <> 0 AND gone = 0");
+    Statement items(connection,
+                    "SELECT file, size, modified, changed, inode FROM item WHERE folder = ? ORDER BY file");
+    while (folder.step()) {
+        const std::string path(folder.bytes(1));
+        const Part part{static_cast<unsigned>(folder.integer(3)), static_cast<unsigned>(folder.integer(4))};
+        std::deque<std::string> names;
+        std::vector<ListedItem> listed;
+        for (items.bind(1, folder.integer(0)); items.step();) {
+            if (!part.holds(path, items.bytes(0))) continue;
+            names.emplace_back(items.bytes(0));
+            listed.push_back(
+                {names.back(),
+                 {items.unsignedInteger(1), items.integer(2), items.integer(3), items.unsignedInteger(4)}});
+        }
+        items.reset();
+        if (digestOf(listed) != folder.unsignedInteger(2)) return path;
+    }
+    return std::nullopt;
+}
 
 }  // namespace
 
@@ -55,6 +85,8 @@ void ContentStore::checkAll() {
         });
     }
     if (!(said == indexed)) damaged("the index does not say what the items say");
+    if (const auto folder = misjudgedFolder(connection_))
+        damaged(fmt::format("{} does not hold the items that it is known by", printable(*folder)));
 }
 
 }  // namespace qvct::contentdb

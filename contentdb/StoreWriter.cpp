@@ -4,7 +4,9 @@
 #include "contentdb/Paths.h"
 #include "contentdb/Terms.h"
 #include "contentdb/Words.h"
+#include "platform/QVContentTaggingTypes.h"
 #include "platform/Text.h"
+#include "platform/Url.h"
 
 #include <algorithm>
 #include <cerrno>
@@ -21,6 +23,13 @@ constexpr std::size_t kMostCachedTerms = 200000;
 /// Most items of one payload that are asked whether they are gone.
 constexpr int kMostCandidates = 16;
 
+/// Whether what lies there is of the kind that the name promises.
+bool isItem(const std::string& path, const struct stat& status) {
+    const auto type = QVContentTaggingTypes::fallBackFileTypeForURL(URL::fileURLWithPath(path));
+    return type == kFileTypePatch || type == kFileTypeProject ? S_ISDIR(status.st_mode)
+                                                              : S_ISREG(status.st_mode);
+}
+
 std::string candidatesWhere(std::string_view condition) {
     return fmt::format(
         "SELECT item.id, folder.path, item.file FROM item JOIN folder ON folder.id = item.folder "
@@ -28,11 +37,25 @@ std::string candidatesWhere(std::string_view condition) {
         condition, kMostCandidates);
 }
 
+FolderRecord folderIn(const Statement& row) {
+    return {row.integer(0), row.unsignedInteger(1), row.integer(2),
+            Part{static_cast<unsigned>(row.integer(3)), static_cast<unsigned>(row.integer(4))}};
+}
+
 }  // namespace
 
 bool isGone(const std::string& path) {
     struct stat status {};
-    return ::lstat(path.c_str(), &status) != 0 && (errno == ENOENT || errno == ENOTDIR);
+    if (::lstat(path.c_str(), &status) == 0)
+        return ::stat(path.c_str(), &status) == 0 && !isItem(path, status);
+    if (errno != ENOENT && errno != ENOTDIR) return false;
+    // What is nearest to it decides: a link there would lead to it, were there something behind it.
+    for (std::string_view above = placeOf(path).folder; !above.empty(); above = placeOf(above).folder) {
+        const std::string nearest(above);
+        if (::lstat(nearest.c_str(), &status) != 0) continue;
+        return !S_ISLNK(status.st_mode) || ::stat(nearest.c_str(), &status) == 0;
+    }
+    return true;
 }
 
 StoreWriter::StoreWriter(Connection& connection)
@@ -43,7 +66,7 @@ StoreWriter::StoreWriter(Connection& connection)
       dropPosting_(connection, "DELETE FROM posting WHERE key = ?"),
       sameFiles_(connection, candidatesWhere("AND inode = ?")),
       samePayloads_(connection, candidatesWhere("")),
-      folder_(connection, "SELECT id, digest, gone FROM folder WHERE path = ?"),
+      folder_(connection, "SELECT id, digest, gone, part, parts FROM folder WHERE path = ?"),
       putFolder_(connection, "INSERT INTO folder (path, digest, gone) VALUES (?, 0, 0) RETURNING id") {}
 
 StoreWriter::~StoreWriter() = default;
@@ -67,7 +90,10 @@ void StoreWriter::put(ItemId id, const IndexedItem& item, const std::vector<std:
     const auto replaced = store_.idOfPath(item.path);
     if (replaced && *replaced != id) remove(*replaced);
     std::vector<std::string> before;
-    if (const auto old = store_.item(id)) before = termsOf(*old);
+    if (const auto old = store_.item(id)) {
+        before = termsOf(*old);
+        if (old->path != item.path) leave(placeOf(old->path).folder);
+    }
     std::vector<std::string> difference;
     std::set_difference(before.begin(), before.end(), terms.begin(), terms.end(),
                         std::back_inserter(difference));
@@ -88,6 +114,7 @@ void StoreWriter::put(ItemId id, const IndexedItem& item, const std::vector<std:
 void StoreWriter::remove(ItemId id) {
     const auto old = store_.item(id);
     if (!old) return;
+    leave(placeOf(old->path).folder);
     for (const std::string& term : termsOf(*old)) change(id, term, false);
     for (const char* sql : {"DELETE FROM item WHERE id = ?", "DELETE FROM earlier_path WHERE item = ?"})
         Statement(store_.connection(), sql).bind(1, id).execute();
@@ -129,8 +156,7 @@ void StoreWriter::setDescriber(std::uint64_t describer) {
 
 FolderRecord StoreWriter::folder(std::string_view path) {
     FolderRecord record;
-    if (folder_.bind(1, path).step())
-        record = {folder_.integer(0), folder_.unsignedInteger(1), folder_.integer(2)};
+    if (folder_.bind(1, path).step()) record = folderIn(folder_);
     folder_.reset();
     return record;
 }
@@ -148,12 +174,21 @@ std::map<std::string, FileRecord, std::less<>> StoreWriter::files(std::int64_t f
     return files;
 }
 
-void StoreWriter::setFolder(const FolderRecord& folder) {
-    Statement(store_.connection(), "UPDATE folder SET digest = ?, gone = ? WHERE id = ?")
+void StoreWriter::setFolder(FolderRecord folder) {
+    if (left_.contains(folder.id)) folder.digest = 0;
+    Statement(store_.connection(), "UPDATE folder SET digest = ?, gone = ?, part = ?, parts = ? WHERE id = ?")
         .bind(1, folder.digest)
         .bind(2, folder.gone)
-        .bind(3, folder.id)
+        .bind(3, std::int64_t{folder.part.number})
+        .bind(4, std::int64_t{folder.part.count})
+        .bind(5, folder.id)
         .execute();
+}
+
+void StoreWriter::leave(std::string_view path) {
+    FolderRecord record = folder(path);
+    // Once is enough: from then on the digest stays open.
+    if (left_.insert(record.id).second) setFolder(record);
 }
 
 void StoreWriter::forEachFolder(std::string_view path,
@@ -162,11 +197,11 @@ void StoreWriter::forEachFolder(std::string_view path,
     const std::string_view base = path == "/" ? std::string_view() : path;
     const std::string below = std::string(base) + "/";
     const std::string behind = std::string(base) + "0";
-    Statement statement(
-        store_.connection(),
-        "SELECT id, digest, gone, path FROM folder WHERE path = ?1 OR (path >= ?2 AND path < ?3)");
+    Statement statement(store_.connection(),
+                        "SELECT id, digest, gone, part, parts, path FROM folder WHERE path = ?1 OR (path >= "
+                        "?2 AND path < ?3)");
     for (statement.bind(1, path).bind(2, below).bind(3, behind); statement.step();) {
-        visit({statement.integer(0), statement.unsignedInteger(1), statement.integer(2)}, statement.bytes(3));
+        visit(folderIn(statement), statement.bytes(5));
     }
 }
 

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "contentdb/ContentStore.h"
+#include "contentdb/Part.h"
 
 #include <cstdint>
 #include <map>
@@ -18,6 +19,8 @@ struct FolderRecord {
     std::int64_t id = 0;
     std::uint64_t digest = 0;
     std::int64_t gone = 0;
+    /// The share of its items that the digest speaks for.
+    Part part = {};
 };
 
 /// What the index remembers of a file in a folder.
@@ -27,7 +30,8 @@ struct FileRecord {
     bool hasFailed = false;
 };
 
-/// Whether nothing lies at the path. What only cannot be looked at is not gone.
+/// Whether no item lies at the path any more. What only cannot be looked at is not gone, nor what lies behind
+/// a link that leads nowhere at the moment: a disk may be away.
 bool isGone(const std::string& path);
 
 /// Changes items and the index in batches: what lies between `begin` and `commit` is written whole or not at
@@ -54,7 +58,8 @@ class StoreWriter {
 
     FolderRecord folder(std::string_view path);
     std::map<std::string, FileRecord, std::less<>> files(std::int64_t folder);
-    void setFolder(const FolderRecord& folder);
+    /// A folder that items have left since this writer was made keeps its digest open.
+    void setFolder(FolderRecord folder);
     /// Calls `visit` for every folder at or below the path.
     void forEachFolder(std::string_view path,
                        const std::function<void(const FolderRecord&, std::string_view)>& visit);
@@ -69,6 +74,7 @@ class StoreWriter {
     };
 
     std::int64_t folderId(std::string_view path);
+    void leave(std::string_view path);
     TermId termId(const std::string& value);
     void noteNames(const IndexedItem& item);
     void change(ItemId id, const std::string& term, bool isAdded);
@@ -81,6 +87,7 @@ class StoreWriter {
     std::unordered_set<std::string> names_;  // tags and fields known to be listed
     std::string lastFolder_;
     std::int64_t lastFolderId_ = 0;
+    std::unordered_set<std::int64_t> left_;  // folders that had items which now are elsewhere, or nowhere
     Statement put_;
     Statement putTerm_;
     Statement putPosting_;

@@ -101,7 +101,11 @@ void addIndexCommand(CLI::App& app, ToolContext& context) {
     command->add_option("--db", index.database, "The database; made if there is none")
         ->required()
         ->type_name("FILE");
-    command->add_flag("--prune", index.prune, "Take items out whose files are gone");
+    auto* prune = command->add_flag("--prune", index.prune, "Take items out whose files are gone");
+    command
+        ->add_flag("--prune-roots", index.pruneRoots,
+                   "Also where a named folder is empty or missing, as when its disk is away")
+        ->needs(prune);
     command->add_flag("--retry", index.retryFailed, "Read items again that failed before");
     command->add_flag("--check", index.check,
                       "Read the database whole first; what is damaged is built anew. Without, only its pages "

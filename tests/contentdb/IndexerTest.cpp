@@ -32,7 +32,8 @@ class NameDescriber : public ItemDescriber {
         const URL url = URL::fileURLWithPath(path);
         IndexedItem item;
         item.name = url.lastPathComponentWithoutExtension();
-        if (item.name.find("fails") != std::string::npos) {
+        if (item.name.find("vanishes") != std::string::npos) std::filesystem::remove(path);
+        if (item.name.find("fails") != std::string::npos || !std::filesystem::exists(path)) {
             qvct::fail(error, kErrorMalformed, "it is broken");
             return std::nullopt;
         }
@@ -170,8 +171,9 @@ TEST_F(Indexing, ReadsAnItemAgainWhenWhatLiesBesideItChanges) {
 
 TEST_F(Indexing, ReadsAgainWhatChangedWhileItWasRead) {
     write("Kick rewritten.wav", "before");
+    write("Snare vanishes.wav", "");
     settle();
-    index();
+    EXPECT_EQ(index().failed, 0U);
     settle();
     EXPECT_EQ(index().described, 1U);
     const auto item = ContentDatabase::open(database())->item(library() + "/Kick rewritten.wav");
@@ -205,6 +207,60 @@ TEST_F(Indexing, ForgetsMissingFilesOnlyWhenTold) {
     EXPECT_EQ(index([](IndexOptions& options) { options.prune = true; }).pruned, 3U);
     EXPECT_THAT(names(), ElementsAre("Kick"));
     EXPECT_TRUE(ContentDatabase::open(database())->check());
+}
+
+TEST_F(Indexing, ReadsAFolderThatComesBack) {
+    for (const char* name : {"a/x/Kick.wav", "a/x/Snare.wav", "a/Hat.wav", "Clap.wav"}) write(name, name);
+    settle();
+    index();
+    const auto prune = [](IndexOptions& options) { options.prune = true; };
+    std::filesystem::rename(library() + "/a", library() + "/c");
+    EXPECT_EQ(index().moved, 3U);
+    std::filesystem::rename(library() + "/c", library() + "/a");
+    EXPECT_EQ(index().moved, 3U);
+    EXPECT_EQ(index(prune).pruned, 0U);
+    EXPECT_EQ(names("path:\"/a/\"").size(), 3U);
+    std::filesystem::rename(library() + "/a", folder_.path("away"));
+    EXPECT_EQ(index(prune).pruned, 3U);
+    std::filesystem::rename(folder_.path("away"), library() + "/a");
+    EXPECT_EQ(index().described, 3U);
+    EXPECT_EQ(names().size(), 4U);
+}
+
+TEST_F(Indexing, TakesNothingOutWhileADiskMayBeAway) {
+    const std::string disk = folder_.path("disk");
+    const std::string mounted = folder_.path("mounted");
+    for (const char* name : {"Kick.wav", "a/Snare.wav"}) folder_.write(std::string("disk/") + name, name);
+    write("Hat.wav", "Hat");
+    std::filesystem::create_directory_symlink(mounted, library() + "/link");
+    folder_.write("mounted/Clap.wav", "Clap");
+    settle();
+    std::vector<std::string> failures;
+    const auto prunedWith = [&](bool roots) {
+        failures.clear();
+        return index([&](IndexOptions& options) {
+                   options.folders = {library(), disk};
+                   options.prune = true;
+                   options.pruneRoots = roots;
+                   options.failed = [&](const Error& error) { failures.push_back(error.message); };
+               })
+            .pruned;
+    };
+    EXPECT_EQ(prunedWith(false), 0U);
+    EXPECT_EQ(names().size(), 4U);
+    for (const std::string& place : {disk, mounted}) std::filesystem::rename(place, place + " away");
+    std::filesystem::create_directory(disk);
+    EXPECT_EQ(prunedWith(false), 0U);
+    EXPECT_THAT(
+        failures,
+        ElementsAre(HasSubstr(disk + ": nothing is left in it, as when a disk is away; its 2 items")));
+    std::filesystem::remove(disk);
+    EXPECT_EQ(prunedWith(true), 2U);
+    EXPECT_THAT(names(), UnorderedElementsAre("Hat", "Clap"));
+    for (const std::string& place : {disk, mounted}) std::filesystem::rename(place + " away", place);
+    EXPECT_EQ(prunedWith(false), 0U);
+    EXPECT_EQ(names().size(), 4U);
+    EXPECT_THAT(failures, testing::IsEmpty());
 }
 
 TEST_F(Indexing, KnowsAMovedFileAgain) {
@@ -365,7 +421,10 @@ TEST_F(Indexing, ReadsAgainWhatAnotherDescriberDescribed) {
     settle();
     index();
     // A database of the first form, which did not keep who described.
-    Connection(database(), Connection::Access::readWrite).run("DROP TABLE setting; PRAGMA user_version = 1");
+    Connection(database(), Connection::Access::readWrite)
+        .run(
+            "DROP TABLE setting; ALTER TABLE folder DROP COLUMN part; ALTER TABLE folder DROP COLUMN parts;"
+            "PRAGMA user_version = 1");
     const auto second = [](IndexOptions& options) { options.describer = 2; };
     bool hasFailed = false;
     const IndexProgress interrupted = index([&](IndexOptions& options) {
@@ -433,6 +492,7 @@ TEST_F(Indexing, OfAPartHidesNothingMissingFromOtherRuns) {
     const auto run = [this](unsigned part) {
         return index([part](IndexOptions& options) {
             options.prune = true;
+            options.pruneRoots = true;
             options.part = std::max(part, 1U);
             options.parts = part == 0 ? 1 : 2;
         });
@@ -522,15 +582,21 @@ TEST_F(Indexing, ReadsTheDatabaseWholeWhenTold) {
     settle();
     index();
     // Nothing that a checksum would tell.
-    Connection(database(), Connection::Access::readWrite).run("DELETE FROM posting WHERE key % 7 = 3");
-    Error error;
-    EXPECT_FALSE(ContentDatabase::open(database())->check(&error));
-    EXPECT_THAT(error.message,
-                HasSubstr("the index does not say what the items say; `index --check` builds"));
-    index([](IndexOptions& options) { options.check = true; });
-    EXPECT_THAT(notes_, ElementsAre(HasSubstr("built anew")));
-    EXPECT_TRUE(ContentDatabase::open(database())->check());
-    EXPECT_EQ(names("kick").size(), 20U);
+    const std::pair<const char*, std::string> cases[] = {
+        {"DELETE FROM posting WHERE key % 7 = 3", "the index does not say what the items say"},
+        {"UPDATE folder SET digest = digest + 1",
+         library() + " does not hold the items that it is known by"}};
+    for (const auto& [fault, reason] : cases) {
+        Connection(database(), Connection::Access::readWrite).run(fault);
+        Error error;
+        EXPECT_FALSE(ContentDatabase::open(database())->check(&error));
+        EXPECT_THAT(error.message, HasSubstr(reason + "; `index --check` builds"));
+        notes_.clear();
+        index([](IndexOptions& options) { options.check = true; });
+        EXPECT_THAT(notes_, ElementsAre(HasSubstr("built anew")));
+        EXPECT_TRUE(ContentDatabase::open(database())->check());
+        EXPECT_EQ(names("kick").size(), 20U);
+    }
 }
 
 TEST_F(Indexing, RefusesASecondRunAForeignFileAndAMissingFolder) {

@@ -11,8 +11,8 @@ namespace qvct::test {
 /// A folder of its own for one test, removed with all that is in it.
 class TemporaryFolder {
   public:
-    TemporaryFolder() {
-        std::string pattern = (std::filesystem::temp_directory_path() / "qvct-XXXXXX").string();
+    explicit TemporaryFolder(const std::filesystem::path& in = std::filesystem::temp_directory_path()) {
+        std::string pattern = (in / "qvct-XXXXXX").string();
         path_ = ::mkdtemp(pattern.data());
     }
     TemporaryFolder(const TemporaryFolder&) = delete;
