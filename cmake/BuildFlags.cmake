@@ -24,6 +24,7 @@ if(NOT QVCT_SANITIZERS)  # whose own symbols come with the program
 endif()
 find_program(CCACHE ccache)
 if(CCACHE)
-  set(CMAKE_CXX_COMPILER_LAUNCHER "${CCACHE}")
-  set(CMAKE_C_COMPILER_LAUNCHER "${CCACHE}")
+  # Paths of the project count as they lie within it, so that every clone on a machine has the others' objects.
+  set(CMAKE_CXX_COMPILER_LAUNCHER env "CCACHE_BASEDIR=${PROJECT_SOURCE_DIR}" CCACHE_NOHASHDIR=1 "${CCACHE}")
+  set(CMAKE_C_COMPILER_LAUNCHER "${CMAKE_CXX_COMPILER_LAUNCHER}")
 endif()
