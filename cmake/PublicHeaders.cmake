@@ -2,8 +2,10 @@
 # include/qvcontenttagging with the folders kept.
 set(QVCT_PUBLIC_HEADERS
   platform/CountedSet.h
+  platform/EditLock.h
   platform/Error.h
   platform/Export.h
+  platform/FileStamp.h
   platform/Log.h
   platform/Object.h
   platform/ObjectSet.h

@@ -5,6 +5,7 @@
 #include "formats/TGRTFileNode.h"
 #include "formats/bundle/TGRTBundleTypeValidators.h"
 #include "formats/settings/TGRTBinaryFileMetaDataReader.h"
+#include "platform/EditLock.h"
 #include "platform/Text.h"
 
 #include <algorithm>
@@ -37,6 +38,7 @@ struct Change {
     std::string oldName = {};
     std::optional<std::string> newName = {};
     bool isWritten = false;
+    FileStamp former = {};                          // of the file that holds the record, when that was read
     std::optional<Verification> verification = {};  // of what was written
     std::vector<std::string> faults = {};           // that it found
 
@@ -94,7 +96,8 @@ void updateSubType(const Change& change) {
 }
 
 bool write(const Change& change, const Options& options, Error* error) {
-    const ContentWriteOptions how{.keepsTimes = options.keepsTimes, .verifies = options.verifies};
+    const ContentWriteOptions how{
+        .keepsTimes = options.keepsTimes, .verifies = options.verifies, .expected = change.former};
     const auto node = TGRTFileNode::nodeWithFileURL(change.url);
     if (change.newName) {
         updateSubType(change);
@@ -105,27 +108,38 @@ bool write(const Change& change, const Options& options, Error* error) {
     return writer && writer->writeTaggings(change.record->taggings(), change.url, error, how);
 }
 
-/// Whether the item is as it should be now.
-bool carryOut(Change& change, const Options& options, ToolContext& context) {
-    Error error;
+/// Whether the item was written; what a verification finds afterwards is reported here.
+bool carryOut(Change& change, const Options& options, ToolContext& context, Error* error) {
     if (options.verifies) {
-        change.verification = Verification::before(change.url, &error);
-        if (!change.verification) {
-            context.itemFailed(error.message);
-            return false;
-        }
+        change.verification = Verification::before(change.url, error);
+        if (!change.verification) return false;
     }
-    change.isWritten = write(change, options, &error);
-    if (!change.isWritten) {
-        context.itemFailed(error.message.empty() ? printable(change.url.path()) + ": cannot be written"
-                                                 : error.message);
-        return false;
-    }
-    if (!change.verification) return true;
+    change.isWritten = write(change, options, error);
+    if (!change.isWritten || !change.verification) return change.isWritten;
     change.faults = change.verification->faultsAfterWriting(*change.record);
     for (const std::string& fault : change.faults)
         context.itemFailed(fmt::format("{}: {}", printable(change.url.path()), fault));
     return true;
+}
+
+/// Reads, changes and writes an item in its turn; once more when another program saves it meanwhile.
+std::optional<Change> editItem(const URL& url, const TaggingEdit& edit, const Options& options,
+                               ToolContext& context) {
+    Error error;
+    const auto turn = EditLock::acquire(url.path(), &error);
+    const std::string record = TGRTFileNode::nodeWithFileURL(url)->recordURL().path();
+    constexpr int kAttempts = 10;
+    for (int attempt = 0; turn && attempt < kAttempts; ++attempt) {
+        const FileStamp former = FileStamp::ofFile(record);
+        auto change = changeOfItem(url, edit, options, context);
+        if (!change || change->isNone() || options.isDryRun) return change;
+        change->former = former;
+        error = {};
+        if (carryOut(*change, options, context, &error)) return change;
+        if (FileStamp::ofFile(record) == former) break;
+    }
+    context.itemFailed(error.message.empty() ? printable(url.path()) + ": cannot be written" : error.message);
+    return std::nullopt;
 }
 
 Json jsonOfTaggings(const ObjectSet<TGRTTagging>& taggings) {
@@ -174,10 +188,9 @@ void run(const Options& options, ToolContext& context) {
     std::size_t written = 0;
     std::size_t unchanged = 0;
     for (const URL& url : context.contentItems(options.paths)) {
-        auto change = changeOfItem(url, *edit, options, context);
+        const auto change = editItem(url, *edit, options, context);
         if (!change) continue;
         unchanged += change->isNone() ? 1 : 0;
-        if (!change->isNone() && !options.isDryRun && !carryOut(*change, options, context)) continue;
         written += change->isWritten ? 1 : 0;
         if (context.format == Format::table) {
             printChange(*change, context.terminal());

@@ -1,5 +1,6 @@
 #include "Commands.h"
 #include "StandardStreams.h"
+#include "platform/UnfinishedFile.h"
 #include "platform/Version.h"
 
 #include <algorithm>
@@ -83,6 +84,7 @@ int run(int argc, char** argv) {
 int main(int argc, char** argv) {
     qvct::tool::prepareStandardStreams();
     int status = kSomeFailed;
+    qvct::removeUnfinishedFilesWhenEnded();
     try {
         status = run(argc, argv);
     } catch (const std::exception& error) {

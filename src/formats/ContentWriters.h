@@ -4,11 +4,13 @@
 #include "metadata/TGRTMetaData.h"
 #include "platform/Error.h"
 #include "platform/Export.h"
+#include "platform/FileStamp.h"
 #include "platform/ObjectSet.h"
 #include "platform/Url.h"
 #include "taxonomy/TGRTTagging.h"
 
 #include <memory>
+#include <optional>
 
 namespace qvct {
 
@@ -18,6 +20,9 @@ struct ContentWriteOptions {
     /// Audio files: the new file is compared with the old one before it takes its place, and abandoned when
     /// more than our record differs.
     bool verifies = false;
+    /// The state of the file that holds the record (`recordURL`) when what is written was decided; another
+    /// one is an error, and what another program saved stays. Without it, the state when the call begins.
+    std::optional<FileStamp> expected = std::nullopt;
 };
 
 // The writers of an item's parts. Each answers whether the file now holds what was written, and else fills

@@ -1,6 +1,7 @@
 #include "formats/StoredRecord.h"
 
 #include "metadata/StoredParts.h"
+#include "platform/EditLock.h"
 #include "platform/FileAccess.h"
 #include "platform/FileReplacement.h"
 #include "platform/PropertyListFile.h"
@@ -10,7 +11,6 @@
 #include <utility>
 
 #include <fmt/format.h>
-#include <sys/stat.h>
 
 namespace qvct {
 namespace {
@@ -29,15 +29,18 @@ std::optional<PropertyList::Dictionary> parseStoredDictionary(const std::string&
 }  // namespace
 
 bool changeStoredFile(
-    const std::string& path,
+    const URL& item, const std::string& path,
     const std::function<std::optional<std::string>(const std::string& stored, Error* error)>& change,
     Error* error, const ContentWriteOptions& options) {
-    struct stat status {};
+    const auto turn = EditLock::acquire(item.path(), error);
+    if (!turn) return false;
+    const FileStamp stamp = FileStamp::ofFile(path);
+    const bool isThere = stamp != FileStamp{};
     std::string stored;
     FileReplacementOptions how;
     how.keepsTimes = options.keepsTimes;
-    if (::stat(path.c_str(), &status) == 0) {
-        how.expected = FileStamp::of(status);
+    how.expected = options.expected.value_or(stamp);
+    if (isThere) {
         const auto bytes = readFile(path, error);
         if (!bytes) return false;
         stored.assign(bytes->begin(), bytes->end());
@@ -48,12 +51,12 @@ bool changeStoredFile(
         return fail(error, static_cast<ErrorCode>(reason.code),
                     fmt::format("{}: {}", printable(path), reason.message));
     }
-    if (how.expected && *changed == stored) return true;
+    if (isThere && *changed == stored) return true;
     const FilePiece whole{.bytes = std::move(*changed)};
     return replaceFileByPieces(path, {&whole, 1}, how, error);
 }
 
-bool changeStoredDictionary(const std::string& path,
+bool changeStoredDictionary(const URL& item, const std::string& path,
                             const std::function<void(PropertyList::Dictionary&)>& change, Error* error,
                             const ContentWriteOptions& options) {
     const auto changeBytes = [&change](const std::string& stored,
@@ -68,10 +71,10 @@ bool changeStoredDictionary(const std::string& path,
         fail(reason, kErrorInvalidArgument, "the record holds a text that cannot be stored");
         return std::nullopt;
     };
-    return changeStoredFile(path, changeBytes, error, options);
+    return changeStoredFile(item, path, changeBytes, error, options);
 }
 
-bool changeStoredContentInfo(const std::string& path,
+bool changeStoredContentInfo(const URL& item, const std::string& path,
                              const std::shared_ptr<const TGRTContentInfo>& contentInfo, Error* error,
                              const ContentWriteOptions& options) {
     const auto change = [&contentInfo](PropertyList::Dictionary& stored) {
@@ -79,7 +82,7 @@ bool changeStoredContentInfo(const std::string& path,
         stored.set(QVContentInfoKey,
                    storedContentInfo(value, contentInfo ? *contentInfo : *TGRTContentInfo::init()));
     };
-    return changeStoredDictionary(path, change, error, options);
+    return changeStoredDictionary(item, path, change, error, options);
 }
 
 bool failForMissingRecord(const std::string& path, Error* error) {

@@ -15,20 +15,22 @@ namespace qvct {
 // whole. A file that somebody else changes meanwhile is an error and stays as it is; nothing is written when
 // nothing changes.
 
+// Each holds the item's turn (`EditLock`) from the read to the write.
+
 /// `change` makes the new bytes of the old (none for a file that is not there), or fills the error.
 bool changeStoredFile(
-    const std::string& path,
+    const URL& item, const std::string& path,
     const std::function<std::optional<std::string>(const std::string& stored, Error* error)>& change,
     Error* error, const ContentWriteOptions& options);
 
 /// The same for a property list. Entries that `change` leaves alone stay, in their order. A new file is XML,
 /// one that is there keeps its encoding; one that cannot be read as a dictionary is not written over.
-bool changeStoredDictionary(const std::string& path,
+bool changeStoredDictionary(const URL& item, const std::string& path,
                             const std::function<void(PropertyList::Dictionary&)>& change, Error* error,
                             const ContentWriteOptions& options);
 
 /// The same for its content info; null counts as an empty one.
-bool changeStoredContentInfo(const std::string& path,
+bool changeStoredContentInfo(const URL& item, const std::string& path,
                              const std::shared_ptr<const TGRTContentInfo>& contentInfo, Error* error,
                              const ContentWriteOptions& options);
 

@@ -23,6 +23,9 @@ class QVCT_API TGRTBaseMetaDataReader : public TGRTMetaDataReader, public TGRTTa
         return std::shared_ptr<TGRTBaseMetaDataReader>(new TGRTBaseMetaDataReader(std::move(taxonomy)));
     }
 
+    /// The file that holds the record of the item at a URL: the item, unless its kind keeps it elsewhere.
+    virtual URL recordURLForURL(const URL& url) const { return url; }
+
     /// In which labels are resolved.
     const std::shared_ptr<TGRTTaxonomy>& taxonomy() const { return taxonomy_; }
 

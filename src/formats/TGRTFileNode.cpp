@@ -53,6 +53,12 @@ std::shared_ptr<TGRTMetaData> TGRTFileNode::readMetaDataWithOptions(
     return nullptr;
 }
 
+URL TGRTFileNode::recordURL() const {
+    const auto kind = std::dynamic_pointer_cast<const BaseTypeValidator>(validator());
+    const auto reader = kind ? kind->readerForFileURL(url_) : nullptr;
+    return reader ? reader->recordURLForURL(url_) : url_;
+}
+
 unsigned TGRTFileNode::itemActions() const {
     const auto kind = validator();
     return kind ? kind->itemActionsForFileURL(url_) : 0;

@@ -42,6 +42,10 @@ class QVCT_API TGRTFileNode : public Object, public FileURLNode {
                                                           const std::shared_ptr<TGRTTaxonomy>& taxonomy,
                                                           Error* error = nullptr) const;
 
+    /// The file that holds the item's record, whether it is there or not: the property list of a bundle or
+    /// beside settings, else the item. Its `FileStamp` tells whether a record is still the one that was read.
+    URL recordURL() const;
+
     /// ItemActions of this node.
     unsigned itemActions() const;
     std::optional<URL> prelistenURL() const;

@@ -1,20 +1,23 @@
 #include "platform/FileReplacement.h"
 
+#include "platform/FileCopy.h"
 #include "platform/FileDescriptor.h"
 #include "platform/Text.h"
+#include "platform/UnfinishedFile.h"
 #include "platform/Url.h"
 
 #include <algorithm>
 #include <cerrno>
-#include <climits>
 #include <cstring>
 #include <filesystem>
 #include <string_view>
-#include <vector>
 
 #include <fcntl.h>
 #include <fmt/format.h>
+#include <linux/magic.h>
+#include <sys/file.h>
 #include <sys/stat.h>
+#include <sys/vfs.h>
 #include <sys/xattr.h>
 #include <unistd.h>
 
@@ -27,67 +30,6 @@ bool failFor(Error* error, std::string_view path, std::string_view reason) {
 
 bool failWithErrno(Error* error, std::string_view path, std::string_view action) {
     return failFor(error, path, fmt::format("{}: {}", action, std::strerror(errno)));
-}
-
-bool writeAll(int descriptor, std::string_view bytes, std::uint64_t position) {
-    while (!bytes.empty()) {
-        const ssize_t written =
-            ::pwrite(descriptor, bytes.data(), bytes.size(), static_cast<off_t>(position));
-        if (written < 0 && errno == EINTR) continue;
-        if (written <= 0) return false;
-        bytes.remove_prefix(static_cast<std::size_t>(written));
-        position += static_cast<std::uint64_t>(written);
-    }
-    return true;
-}
-
-/// A stretch of one file, and where it goes in the other.
-struct Copy {
-    int from;
-    std::uint64_t offset;
-    std::uint64_t length;
-    int to;
-    std::uint64_t position;
-
-    void advance(std::uint64_t count) {
-        offset += count;
-        length -= count;
-        position += count;
-    }
-};
-
-/// Where the kernel cannot copy by itself, and where no whole block is left to share.
-bool copyThroughBuffer(Copy copy) {
-    std::vector<char> buffer(std::min<std::uint64_t>(copy.length, 1U << 18U));
-    while (copy.length > 0) {
-        const ssize_t got =
-            ::pread(copy.from, buffer.data(), std::min<std::uint64_t>(copy.length, buffer.size()),
-                    static_cast<off_t>(copy.offset));
-        if (got < 0 && errno == EINTR) continue;
-        if (got == 0) errno = ESTALE;  // the old file shrank
-        if (got <= 0) return false;
-        const auto count = static_cast<std::size_t>(got);
-        if (!writeAll(copy.to, {buffer.data(), count}, copy.position)) return false;
-        copy.advance(count);
-    }
-    return true;
-}
-
-/// By the kernel, which shares whole blocks that keep their place within a block where it can.
-bool copyRange(Copy copy) {
-    constexpr std::uint64_t kBlock = 4096;
-    while (copy.length >= kBlock) {
-        auto from = static_cast<off_t>(copy.offset);
-        auto to = static_cast<off_t>(copy.position);
-        const std::uint64_t step = std::min<std::uint64_t>(copy.length, SSIZE_MAX / 2) / kBlock * kBlock;
-        const ssize_t copied = ::copy_file_range(copy.from, &from, copy.to, &to, step, 0);
-        if (copied < 0 && errno == EINTR) continue;
-        const bool isFinal = errno == ENOSPC || errno == EFBIG || errno == EIO || errno == EDQUOT;
-        if (copied < 0 && isFinal) return false;
-        if (copied <= 0) break;
-        copy.advance(static_cast<std::uint64_t>(copied));
-    }
-    return copyThroughBuffer(copy);
 }
 
 std::uint64_t lengthOf(const FilePiece& piece) {
@@ -106,16 +48,6 @@ std::uint64_t endOfUnmoved(std::span<const FilePiece> pieces) {
         if (isRange) end = position;
     }
     return end;
-}
-
-/// Makes a file that nobody else has in the folder; its mode follows the process's mask.
-int makeFileIn(const std::string& folder, std::string& name) {
-    for (int attempt = 0; attempt < 100; ++attempt) {
-        name = fmt::format("{}.qvct-{}-{}.tmp", folder, ::getpid(), attempt);
-        const int descriptor = ::open(name.c_str(), O_RDWR | O_CREAT | O_EXCL | O_CLOEXEC, 0666);
-        if (descriptor >= 0 || errno != EEXIST) return descriptor;
-    }
-    return -1;
 }
 
 void flushFolder(const std::string& folder) {
@@ -146,13 +78,25 @@ bool takeOverAttributes(int from, int to) {
     return true;
 }
 
-/// The owner first, since changing it clears bits of the mode.
-bool takeOverOwnerAndMode(const struct stat& old, int to) {
-    mode_t mode = old.st_mode & 07777U;
-    const bool owned =
-        ::fchown(to, old.st_uid, old.st_gid) == 0 || ::fchown(to, static_cast<uid_t>(-1), old.st_gid) == 0;
+/// What members of the group could do, where the new file is another group's: no more than everybody could.
+mode_t withoutGroup(mode_t mode) {
+    const mode_t others = mode & 07U;
+    return (mode & ~mode_t{070}) | (mode & (others << 3U));
+}
+
+void takeOverOwner(const struct stat& old, int to) {
+    if (::fchown(to, old.st_uid, old.st_gid) == 0) return;
+    [[maybe_unused]] const int ignored = ::fchown(to, static_cast<uid_t>(-1), old.st_gid);
+}
+
+/// After the owner, since changing that clears bits of the mode, and the attributes, since some are about
+/// access, too.
+bool takeOverMode(const struct stat& old, int to) {
     struct stat now {};
-    if (!owned || ::fstat(to, &now) != 0 || now.st_uid != old.st_uid) mode &= 01777U;
+    if (::fstat(to, &now) != 0) return false;
+    mode_t mode = old.st_mode & 07777U;
+    if (now.st_uid != old.st_uid) mode &= 01777U;
+    if (now.st_gid != old.st_gid) mode = withoutGroup(mode & 01777U);
     return ::fchmod(to, mode) == 0;
 }
 
@@ -161,7 +105,18 @@ bool takeOverTimes(const struct stat& old, int to) {
     return ::futimens(to, times) == 0;
 }
 
-/// One replacement under way: the new file disappears unless it took its place.
+/// Whether the file system said that it has no such way to rename.
+bool isUnsupported(int reason) {
+    return reason == EINVAL || reason == ENOSYS || reason == ENOTSUP;
+}
+
+/// Whether a file keeps its number however often it is renamed.
+bool keepsInodes(int file) {
+    struct statfs system {};
+    return ::fstatfs(file, &system) != 0 || system.f_type != OVERLAYFS_SUPER_MAGIC;
+}
+
+/// One replacement under way.
 class Replacement {
   public:
     Replacement(const std::string& path, const FileReplacementOptions& options, Error* error)
@@ -172,30 +127,22 @@ class Replacement {
         const std::size_t slash = target_.rfind('/');
         folder_ = slash == std::string::npos ? "./" : target_.substr(0, slash + 1);
     }
-    Replacement(const Replacement&) = delete;
-    Replacement& operator=(const Replacement&) = delete;
-    ~Replacement() {
-        if (!temporary_.empty()) ::unlink(temporary_.c_str());
-    }
 
     bool run(std::span<const FilePiece> pieces) {
         if (!openOld()) return false;
-        const FileDescriptor created(makeFileIn(folder_, temporary_));
-        if (!created.isOpen()) {
-            temporary_.clear();
-            return failWithErrno(error_, path_, "cannot make a file beside it");
-        }
-        const int to = created.number();
-        return write(pieces, to) && takeOver(to) && finish(to);
+        removeLeftFiles(folder_);
+        UnfinishedFile made(folder_, old_ ? 0600 : 0666);
+        if (!made.isOpen()) return failWithErrno(error_, path_, "cannot make a file beside it");
+        if (!write(pieces, made.descriptor())) return false;
+        if (options_.check && !options_.check(made.path(), error_)) return false;
+        return takeOver(made) && takePlace(made);
     }
 
   private:
     /// False only when there is an old file that must not be replaced.
     bool openOld() {
         struct stat status {};
-        if (::stat(target_.c_str(), &status) != 0) {
-            return !options_.expected || failWithErrno(error_, path_, "cannot be opened");
-        }
+        if (::stat(target_.c_str(), &status) != 0) return isExpected({});
         if (!S_ISREG(status.st_mode)) return failFor(error_, path_, "is not a regular file");
         constexpr mode_t kAnyWrite = S_IWUSR | S_IWGRP | S_IWOTH;
         if ((status.st_mode & kAnyWrite) == 0 ||
@@ -206,14 +153,15 @@ class Replacement {
         if (!old_->isOpen() || ::fstat(old_->number(), &status_) != 0) {
             return failWithErrno(error_, path_, "cannot be opened");
         }
-        return isAsExpected();
+        return isExpected(FileStamp::of(status_));
     }
 
-    bool isAsExpected() const {
-        struct stat now {};
-        if (!options_.expected) return true;
-        return (::fstat(old_->number(), &now) == 0 && FileStamp::of(now) == *options_.expected) ||
-               failFor(error_, path_, "was changed by another program meanwhile");
+    bool isExpected(const FileStamp& stamp) const {
+        return !options_.expected || stamp == *options_.expected || failForOtherSave();
+    }
+
+    bool failForOtherSave() const {
+        return failFor(error_, path_, "was changed by another program meanwhile");
     }
 
     bool write(std::span<const FilePiece> pieces, int to) const {
@@ -228,7 +176,15 @@ class Replacement {
             if (!isRange && !writeAll(to, piece.bytes, position)) return failToWrite(position);
             position = end;
         }
-        return true;
+        return endsAt(position, to) || failToWrite(position);
+    }
+
+    /// A hole at the end is one only because the file is said to be that long.
+    static bool endsAt(std::uint64_t size, int to) {
+        struct stat status {};
+        if (::fstat(to, &status) != 0) return false;
+        return static_cast<std::uint64_t>(status.st_size) == size ||
+               ::ftruncate(to, static_cast<off_t>(size)) == 0;
     }
 
     bool copy(std::uint64_t offset, std::uint64_t length, int to, std::uint64_t position) const {
@@ -241,26 +197,94 @@ class Replacement {
                              fmt::format("cannot write the new contents at byte {}", position));
     }
 
-    bool takeOver(int to) const {
-        if (!old_) return true;
-        if (!takeOverOwnerAndMode(status_, to)) return failWithErrno(error_, path_, "cannot keep its mode");
+    bool takeOver(const UnfinishedFile& made) const {
+        const int to = made.descriptor();
+        if (!old_) {
+            return ::fchmod(to, made.modeAtCreation()) == 0 ||
+                   failWithErrno(error_, path_, "cannot be given its mode");
+        }
+        takeOverOwner(status_, to);
         if (!takeOverAttributes(old_->number(), to)) {
             return failWithErrno(error_, path_, "cannot keep its extended attributes");
         }
+        if (!takeOverMode(status_, to)) return failWithErrno(error_, path_, "cannot keep its mode");
         return !options_.keepsTimes || takeOverTimes(status_, to) ||
                failWithErrno(error_, path_, "cannot keep its times");
     }
 
-    bool finish(int to) {
-        if (::fsync(to) != 0) return failWithErrno(error_, path_, "cannot be flushed");
-        if (options_.check && !options_.check(temporary_, error_)) return false;
-        if (!isAsExpected()) return false;
-        if (::rename(temporary_.c_str(), target_.c_str()) != 0) {
+    bool takePlace(UnfinishedFile& made) const {
+        if (::fsync(made.descriptor()) != 0) return failWithErrno(error_, path_, "cannot be flushed");
+        if (options_.expected && !isExpected(FileStamp::ofFile(target_))) return false;
+        const EndingSignalsHeld held;
+        if (!options_.expected) return takePlaceOfAny(made);
+        return old_ ? exchange(made) : takeEmptyPlace(made);
+    }
+
+    bool takePlaceOfAny(UnfinishedFile& made) const {
+        if (::rename(made.path().c_str(), target_.c_str()) != 0) {
             return failWithErrno(error_, path_, "cannot be replaced");
         }
-        temporary_.clear();
+        made.release();
         flushFolder(folder_);
         return true;
+    }
+
+    bool takeEmptyPlace(UnfinishedFile& made) const {
+        const int done =
+            ::renameat2(AT_FDCWD, made.path().c_str(), AT_FDCWD, target_.c_str(), RENAME_NOREPLACE);
+        if (done != 0 && errno == EEXIST) return failForOtherSave();
+        if (done != 0 && isUnsupported(errno)) return takePlaceOfAny(made);
+        if (done != 0) return failWithErrno(error_, path_, "cannot be made");
+        made.release();
+        flushFolder(folder_);
+        return true;
+    }
+
+    bool exchange(UnfinishedFile& made) const {
+        ::flock(old_->number(), LOCK_SH | LOCK_NB);  // not left behind, while it has the other's name
+        if (!made.renameForExchangeWith(*options_.expected)) {
+            return failWithErrno(error_, path_, "cannot be replaced");
+        }
+        const FileStamp placed = FileStamp::ofFile(made.path());
+        if (!exchangeOnce(made)) {
+            if (errno == ENOENT) return failForOtherSave();
+            if (isUnsupported(errno)) return takePlaceOfAny(made);
+            return failWithErrno(error_, path_, "cannot be replaced");
+        }
+        if (!isOld(FileStamp::ofFile(made.path()))) return putBack(made, placed);
+        // The old file may go when the disk knows of the new one.
+        flushFolder(folder_);
+        return true;
+    }
+
+    bool exchangeOnce(const UnfinishedFile& made) const {
+        return ::renameat2(AT_FDCWD, made.path().c_str(), AT_FDCWD, target_.c_str(), RENAME_EXCHANGE) == 0;
+    }
+
+    bool isOld(FileStamp stamp) const {
+        if (!keepsInodes(old_->number())) {
+            stamp.device = options_.expected->device;
+            stamp.inode = options_.expected->inode;
+        }
+        return stamp == *options_.expected;
+    }
+
+    /// Puts what another program saved back to its place, until nothing newer of it comes out.
+    bool putBack(UnfinishedFile& made, FileStamp placed) const {
+        for (bool isDone = false; !isDone;) {
+            const FileStamp saved = FileStamp::ofFile(made.path());
+            if (!exchangeOnce(made)) {
+                failWithErrno(error_, path_,
+                              fmt::format("was changed by another program meanwhile, whose contents stand in "
+                                          "{} and cannot be put back",
+                                          printable(made.path())));
+                made.release();
+                return false;
+            }
+            isDone = FileStamp::ofFile(made.path()) == placed;
+            placed = saved;
+        }
+        return failForOtherSave();
     }
 
     const std::string& path_;
@@ -268,7 +292,6 @@ class Replacement {
     Error* error_;
     std::string target_;
     std::string folder_;
-    std::string temporary_;
     std::optional<FileDescriptor> old_;
     struct stat status_ {};
 };
@@ -278,6 +301,11 @@ class Replacement {
 FileStamp FileStamp::of(const struct stat& status) {
     return {status.st_dev, status.st_ino, static_cast<std::uint64_t>(status.st_size),
             std::int64_t{status.st_mtim.tv_sec} * 1'000'000'000 + status.st_mtim.tv_nsec};
+}
+
+FileStamp FileStamp::ofFile(const std::string& path) {
+    struct stat status {};
+    return ::stat(path.c_str(), &status) == 0 ? of(status) : FileStamp{};
 }
 
 bool replaceFileByPieces(const std::string& path, std::span<const FilePiece> pieces,

@@ -1,5 +1,6 @@
 #include "platform/LCFileWriter.h"
 
+#include "platform/EditLock.h"
 #include "platform/FileReplacement.h"
 #include "platform/PropertyListFile.h"
 #include "platform/Text.h"
@@ -59,7 +60,9 @@ bool makeLoopDataFile(const std::string& path, const std::string& record, Error*
                        {{}, kErrorInvalidArgument, "a loop data file cannot be without a record"});
     }
     const FilePiece whole{.bytes = record};
-    return replaceFileByPieces(path, {&whole, 1}, {}, error);
+    FileReplacementOptions options;
+    options.expected = FileStamp{};
+    return replaceFileByPieces(path, {&whole, 1}, options, error);
 }
 
 bool isMissing(const std::string& path) {
@@ -85,6 +88,8 @@ bool LCFileWriter::writeFileData(const std::shared_ptr<const LCFileData>& data, 
     if (record.empty() && !data->record().empty()) {
         return refuse({{}, kErrorInvalidArgument, "the record holds a value that cannot be stored"});
     }
+    const auto turn = EditLock::acquire(path_, error);
+    if (!turn) return false;
     if (LoopDataFile::isName(path_) && isMissing(path_)) return makeLoopDataFile(path_, record, error);
 
     const auto reader = FileReader::open(path_, error);
@@ -102,7 +107,7 @@ bool LCFileWriter::writeFileData(const std::shared_ptr<const LCFileData>& data, 
 
     FileReplacementOptions options;
     options.keepsTimes = options_.keepsTimes;
-    options.expected = reader->stamp();
+    options.expected = options_.expected.value_or(reader->stamp());
     if (options_.verifies) {
         const auto before = fingerprintOfReader(*reader, path_, error);
         if (!before) return false;

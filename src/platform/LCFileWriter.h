@@ -1,6 +1,7 @@
 #pragma once
 
 #include "platform/Error.h"
+#include "platform/FileStamp.h"
 #include "platform/LCFileData.h"
 #include "platform/Url.h"
 
@@ -21,6 +22,8 @@ struct LCWriteOptions {
     /// The new file is read back and compared with the old one before it takes its place: the audio, and
     /// every chunk that is not ours. Costs a read of both.
     bool verifies = false;
+    /// The state of the file that the data were read from; another one is an error.
+    std::optional<FileStamp> expected = std::nullopt;
 };
 
 /// Writes the record of file data into the file at a URL, and nothing else.

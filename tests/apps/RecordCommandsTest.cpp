@@ -6,8 +6,10 @@
 
 #include <filesystem>
 #include <map>
+#include <numeric>
 #include <set>
 
+#include <fmt/format.h>
 #include <gmock/gmock.h>
 #include <sys/stat.h>
 
@@ -71,6 +73,25 @@ TEST(Read, GivesOneRecordAnItem) {
                 ElementsAre("VorthalCategory/Bass", "VorthalTimbre/Bright"));
     EXPECT_THAT(tagsOf(runTool({"read", "--json", "--mapped", preset}).json()[0]),
                 testing::Contains(testing::StartsWith("Sound Descriptors/Bright / Dark=")));
+}
+
+TEST(Write, TwoAtOnceLoseNoTag) {
+    const Items items;
+    const std::string all = std::accumulate(items.names.begin(), items.names.end(), std::string(),
+                                            [&](const std::string& text, const std::string& name) {
+                                                return text + " " + items.folder.path(name);
+                                            });
+    for (int round = 0; round < 5; ++round) {
+        std::string command;
+        for (const char* tag : {"Genres/House", "Source/Bass", "Genres/Techno"})
+            command += fmt::format("{} write --quiet --add {}{} >/dev/null & ", quoted(QVCT_TOOL), tag, all);
+        ASSERT_EQ(std::system((command + "wait").c_str()), 0);
+        for (const json& record : runTool(items.arguments({"read", "--json"})).json())
+            EXPECT_THAT(tagsOf(record), testing::SizeIs(3)) << record["path"];
+        const ToolResult cleared = runTool(items.arguments(
+            {"write", "--remove", "Genres/House", "--remove", "Source/Bass", "--remove", "Genres/Techno"}));
+        ASSERT_EQ(cleared.status, 0) << cleared.errors;
+    }
 }
 
 TEST(Write, ChangesEveryKindOfItemAndVerifies) {

@@ -1,16 +1,19 @@
 #include "platform/FileAccess.h"
 #include "platform/FileReplacement.h"
+#include "platform/UnfinishedFile.h"
 #include "support/AudioFixtures.h"
 #include "support/Corpus.h"
 #include "support/TemporaryFolder.h"
 
 #include <csignal>
+#include <functional>
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <sys/mount.h>
 #include <sys/resource.h>
 #include <sys/stat.h>
+#include <sys/wait.h>
 #include <sys/xattr.h>
 #include <unistd.h>
 
@@ -182,26 +185,181 @@ TEST(FileReplacement, ALimitOnSizesIsAnErrorToo) {
     EXPECT_EQ(filesIn(folder), 1U);
 }
 
-TEST(FileReplacement, AFileThatChangedOrShrankMeanwhileIsLeftAlone) {
+TEST(FileReplacement, ARangeBehindTheEndIsAnError) {
     const TemporaryFolder folder;
     const std::string path = folder.write("file", "old contents");
-    const FileStamp stamp = FileStamp::of(statusOf(path));
     const FilePiece beyond{.bytes = {}, .offset = 4, .length = 100};
     Error error;
-    EXPECT_FALSE(replaceFileByPieces(path, {&beyond, 1}, {}, &error)) << "the range ends behind the file";
+    EXPECT_FALSE(replaceFileByPieces(path, {&beyond, 1}, {}, &error));
+    EXPECT_EQ(contentsOf(path), "old contents");
+}
+
+TEST(FileReplacement, WhatAnotherProgramSavedMeanwhileStays) {
+    struct Save {
+        const char* name;
+        bool isThereBefore;
+        std::function<void(const std::string& path)> save;
+        std::string contents;
+    };
+    const auto renameOver = [](const std::string& path) {
+        std::ofstream(path + ".saved") << "saved";
+        std::filesystem::rename(path + ".saved", path);
+    };
+    const Save saves[] = {
+        {"in place", true, [](const auto& path) { std::ofstream(path, std::ios::app) << "!"; }, "old!"},
+        {"by renaming", true, renameOver, "saved"},
+        {"by removing", true, [](const auto& path) { std::filesystem::remove(path); }, "unreadable"},
+        {"a new file", false, renameOver, "saved"},
+    };
+    for (const Save& each : saves) {
+        SCOPED_TRACE(each.name);
+        const TemporaryFolder folder;
+        const std::string path = folder.path("file");
+        if (each.isThereBefore) folder.write("file", "old");
+        FileReplacementOptions options;
+        options.expected = FileStamp::ofFile(path);
+        options.check = [&](const std::string&, Error*) {
+            each.save(path);
+            return true;
+        };
+        const FilePiece whole{.bytes = "new"};
+        for (int round = 0; round < 2; ++round) {  // the second time the state is an old one from the start
+            Error error;
+            EXPECT_FALSE(replaceFileByPieces(path, {&whole, 1}, options, &error));
+            EXPECT_THAT(error.message, HasSubstr("changed by another program"));
+            EXPECT_EQ(contentsOf(path), each.contents);
+            EXPECT_EQ(filesIn(folder), each.contents == "unreadable" ? 0U : 1U);
+        }
+    }
+}
+
+TEST(FileReplacement, NobodyElseCanReadTheNewFileBeforeItIsInPlace) {
+    const mode_t former = ::umask(022);
+    for (const mode_t mode : {0600U, 0644U, 0U}) {  // 0: there is no file yet
+        const TemporaryFolder folder;
+        const std::string path = folder.path("file");
+        if (mode != 0) ::chmod(folder.write("file", "old").c_str(), mode);
+        mode_t seen = 0;
+        FileReplacementOptions options;
+        options.check = [&seen](const std::string& newFile, Error*) {
+            seen = statusOf(newFile).st_mode & 07777U;
+            return true;
+        };
+        const FilePiece whole{.bytes = "new"};
+        EXPECT_TRUE(replaceFileByPieces(path, {&whole, 1}, options));
+        EXPECT_EQ(seen, 0600U);
+        EXPECT_EQ(statusOf(path).st_mode & 07777U, mode == 0 ? 0644U : mode);
+    }
+    ::umask(former);
+}
+
+TEST(FileReplacement, AnotherGroupMayDoNoMoreThanEverybody) {
+    if (::geteuid() != 0) GTEST_SKIP() << "no right to give files away";
+    const TemporaryFolder folder;
+    const std::string path = folder.write("file", "old");
+    ASSERT_EQ(::chown(path.c_str(), kNobody, 4321), 0);
+    ::chmod(path.c_str(), 0660);
+    ::chmod(folder.path().c_str(), 0777);
+    ASSERT_EQ(::seteuid(kNobody), 0);
+    const bool replaced = replaceFile(path, "new");
+    ASSERT_EQ(::seteuid(0), 0);
+    EXPECT_TRUE(replaced);
+    EXPECT_NE(statusOf(path).st_gid, 4321U);
+    EXPECT_EQ(statusOf(path).st_mode & 07777U, 0600U);
+}
+
+/// 8 MB with three holes, one of them at the end, and data between.
+std::string sparseFile(const TemporaryFolder& folder) {
+    constexpr std::uint64_t kSize = 8U << 20U;
+    const std::string path = folder.write("file", "head");
+    std::filesystem::resize_file(path, kSize);
+    std::fstream(path, std::ios::in | std::ios::out).seekp(kSize / 2) << test::noise(5000);
+    std::filesystem::resize_file(path, kSize + 1);
+    return path;
+}
+
+TEST(FileReplacement, HolesStayHoles) {
+    for (const bool isInFront : {false, true}) {
+        const TemporaryFolder folder;
+        const std::string path = sparseFile(folder);
+        if (statusOf(path).st_blocks > 1000) GTEST_SKIP() << "the file system knows no holes";
+        const std::string old = contentsOf(path);
+        std::vector<FilePiece> pieces{{.bytes = {}, .offset = 0, .length = old.size()}, {.bytes = "tag"}};
+        if (isInFront) std::swap(pieces[0], pieces[1]);
+        ASSERT_TRUE(replaceFileByPieces(path, pieces));
+        EXPECT_TRUE(contentsOf(path) == (isInFront ? "tag" + old : old + "tag"));
+        EXPECT_LT(statusOf(path).st_blocks, 100);
+    }
+    const TemporaryFolder folder;
+    const std::string path = sparseFile(folder);
+    const FilePiece head{.bytes = {}, .offset = 0, .length = 5U << 20U};
+    ASSERT_TRUE(replaceFileByPieces(path, {&head, 1}));
+    EXPECT_EQ(std::filesystem::file_size(path), head.length) << "ends in a hole";
+}
+
+/// Sends a signal to a process in the middle of writing `path`; how the process ended.
+int statusAfterSignal(const std::string& path, int signal, bool isIgnored = false) {
+    const pid_t child = ::fork();
+    if (child == 0) {
+        if (isIgnored) std::signal(signal, SIG_IGN);
+        removeUnfinishedFilesWhenEnded();
+        FileReplacementOptions options;
+        options.check = [signal](const std::string&, Error*) { return ::raise(signal) == 0; };
+        const FilePiece whole{.bytes = "new"};
+        ::_exit(replaceFileByPieces(path, {&whole, 1}, options) ? 0 : 1);
+    }
+    int status = 0;
+    ::waitpid(child, &status, 0);
+    return status;
+}
+
+TEST(FileReplacement, AUserWhoEndsTheProgramFindsNothingLeftBehind) {
+    for (const int signal : {SIGINT, SIGTERM, SIGHUP}) {
+        const TemporaryFolder folder;
+        const std::string path = folder.write("file", "old");
+        const int status = statusAfterSignal(path, signal);
+        EXPECT_TRUE(WIFSIGNALED(status) && WTERMSIG(status) == signal) << status;
+        EXPECT_EQ(filesIn(folder), 1U);
+        EXPECT_EQ(contentsOf(path), "old");
+        EXPECT_EQ(statusAfterSignal(path, signal, true), 0) << "an ignored signal ended it";
+        EXPECT_EQ(contentsOf(path), "new");
+    }
+}
+
+TEST(FileReplacement, WhatAKilledProcessLeftIsRemovedByTheNextWriteAndNothingElse) {
+    const TemporaryFolder folder;
+    const std::string path = folder.write("file", "old");
+    const std::vector<std::string> kept = {".qvct-mine.tmp",         ".qvct-1-0.tmp.bak", "qvct-1-0.tmp",
+                                           ".qvct-1-0-a0-b0.tmp",    ".qvct-1.tmp",       ".qvct--1-0.tmp",
+                                           ".qvct-1-0-a0-b0-c0.tmp", ".qvct-1-0x1.tmp"};
+    for (const std::string& name : kept) folder.write(name, "user's");
+    const std::string victim = folder.write("victim", "user's");
+    std::filesystem::create_symlink(victim, folder.path(".qvct-2-0.tmp"));
+    std::filesystem::create_directory(folder.path(".qvct-2-1.tmp"));
+    ::mkfifo(folder.path(".qvct-2-2.tmp").c_str(), 0600);
+    const std::string foreign = folder.write(".qvct-2-3.tmp", "another user's");
+    const bool isRoot = ::chown(foreign.c_str(), kNobody, kNobody) == 0;
+    for (int i = 0; i < 2; ++i) statusAfterSignal(path, SIGKILL);
+    const auto entries = [&] {
+        const std::filesystem::directory_iterator all(folder.path());
+        return static_cast<std::size_t>(std::distance(begin(all), end(all)));
+    };
+    const std::size_t others = kept.size() + 6;
+    EXPECT_EQ(entries(), others + 1) << "each removes what the one before left";
+    EXPECT_EQ(contentsOf(path), "old");
 
     FileReplacementOptions options;
-    options.expected = stamp;
-    options.check = [&](const std::string&, Error*) {
-        std::ofstream(path, std::ios::app) << " and more";
-        return true;
+    options.check = [&](const std::string& newFile, Error*) {
+        EXPECT_EQ(entries(), others + (isRoot ? 1 : 0));
+        // Another write meanwhile, that looks through the folder as well.
+        ::usleep(1'100'000);
+        EXPECT_TRUE(replaceFile(victim, "user's"));
+        return std::filesystem::exists(newFile);
     };
     const FilePiece whole{.bytes = "new"};
-    EXPECT_FALSE(replaceFileByPieces(path, {&whole, 1}, options, &error));
-    EXPECT_THAT(error.message, HasSubstr("changed by another program"));
-    EXPECT_EQ(contentsOf(path), "old contents and more");
-    EXPECT_FALSE(replaceFileByPieces(path, {&whole, 1}, options, &error)) << "the stamp is an old one";
-    EXPECT_EQ(filesIn(folder), 1U);
+    EXPECT_TRUE(replaceFileByPieces(path, {&whole, 1}, options)) << "a living writer's file was removed";
+    EXPECT_EQ(entries(), others - (isRoot ? 0 : 1));
+    for (const std::string& name : kept) EXPECT_EQ(contentsOf(folder.path(name)), "user's") << name;
 }
 
 TEST(FileReplacement, ACheckSeesTheWholeNewFileAndCanAbandonIt) {

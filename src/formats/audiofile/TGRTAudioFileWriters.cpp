@@ -2,6 +2,7 @@
 
 #include "formats/StoredRecord.h"
 #include "metadata/StoredParts.h"
+#include "platform/EditLock.h"
 #include "platform/LCFileParser.h"
 #include "platform/LCFileWriter.h"
 #include "platform/TaggingTypes.h"
@@ -14,11 +15,16 @@ namespace {
 /// Changes what the file says and writes it back.
 bool changeFileData(const URL& url, bool isLoopType, const std::function<void(LCFileData&)>& change,
                     Error* error, const ContentWriteOptions& options) {
+    const auto turn = EditLock::acquire(url.path(), error);
+    if (!turn) return false;
+    const FileStamp stamp = FileStamp::ofFile(url.path());
     const auto fileData = LCFileParser::fileParserForURL(url, false, kLCAllAudio)->fileData(error);
     if (!fileData) return false;
     change(*fileData);
     fileData->setTavioLoopType(isLoopType ? fileData->tavioLoopType() : -1);
-    const LCWriteOptions how{.keepsTimes = options.keepsTimes, .verifies = options.verifies};
+    const LCWriteOptions how{.keepsTimes = options.keepsTimes,
+                             .verifies = options.verifies,
+                             .expected = options.expected.value_or(stamp)};
     return LCFileWriter::fileWriterForURL(url, how)->writeFileData(fileData, error);
 }
 

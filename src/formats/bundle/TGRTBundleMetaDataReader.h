@@ -24,6 +24,9 @@ class TGRTBundleMetaDataReader : public TGRTBaseMetaDataReader {
                                                       Error* error = nullptr) const override;
     /// Where the property list lies in the bundle.
     virtual std::string plistPathComponent() const { return std::string(QVContentTaggingTagsPlistName); }
+    URL recordURLForURL(const URL& url) const override {
+        return url.URLByAppendingPathComponent(plistPathComponent());
+    }
     std::int64_t defaultFileType() const override { return kFileTypePatch; }
 
     /// The sub type that tags of the content type imply: of patches 1 instrument, 2 audio, 3 auxiliary,

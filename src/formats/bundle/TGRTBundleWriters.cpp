@@ -41,13 +41,13 @@ bool TGRTBundleTaggingWriter::writeTaggings(const ObjectSet<TGRTTagging>& taggin
             stored.remove(QVContentTaggingSubTypeKeyName);
         }
     };
-    return changeStoredDictionary(preparedPath(url, plistPathComponent()), change, error, options);
+    return changeStoredDictionary(url, preparedPath(url, plistPathComponent()), change, error, options);
 }
 
 bool TGRTBundleContentInfoWriter::writeContentInfo(const std::shared_ptr<const TGRTContentInfo>& contentInfo,
                                                    const URL& url, Error* error,
                                                    const ContentWriteOptions& options) const {
-    return changeStoredContentInfo(preparedPath(url, plistPathComponent()), contentInfo, error, options);
+    return changeStoredContentInfo(url, preparedPath(url, plistPathComponent()), contentInfo, error, options);
 }
 
 bool TGRTBundleMetaDataWriter::writeMetaData(const std::shared_ptr<TGRTMetaData>& metaData, const URL& url,
@@ -55,7 +55,7 @@ bool TGRTBundleMetaDataWriter::writeMetaData(const std::shared_ptr<TGRTMetaData>
     if (!metaData) return failForMissingRecord(url.path(), error);
     if (metaData->fileType() == kFileTypeNone) metaData->setFileType(defaultFileType());
     const auto change = [&](PropertyList::Dictionary& stored) { metaData->storeOver(stored); };
-    return changeStoredDictionary(preparedPath(url, plistPathComponent()), change, error, options);
+    return changeStoredDictionary(url, preparedPath(url, plistPathComponent()), change, error, options);
 }
 
 }  // namespace qvct

@@ -32,7 +32,7 @@ bool changePreset(const URL& url, const std::function<void(PresetText&)>& change
         fail(reason, kErrorInvalidArgument, "the record holds a text that cannot be stored");
         return std::nullopt;
     };
-    return changeStoredFile(url.path(), changeText, error, options);
+    return changeStoredFile(url, url.path(), changeText, error, options);
 }
 
 }  // namespace

@@ -20,6 +20,7 @@ class TGRTCstSxvPstMetaDataReader : public TGRTBaseMetaDataReader {
     static bool supportsFileExtension(std::string_view extension);
     /// Where the record of a settings file lies.
     static URL sideCarURLForURL(const URL& url) { return url.URLByAppendingPathExtension("plist"); }
+    URL recordURLForURL(const URL& url) const override { return sideCarURLForURL(url); }
 
     /// A stored file type is kept, none becomes that of the extension.
     std::shared_ptr<TGRTMetaData> readMetaDataFromURL(const URL& url, std::uint64_t options,

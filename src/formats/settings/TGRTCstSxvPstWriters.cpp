@@ -25,13 +25,13 @@ bool TGRTCstSxvPstTaggingWriter::writeTaggings(const ObjectSet<TGRTTagging>& tag
                    std::int64_t{QVContentTaggingTypes::fallBackFileTypeForURL(url)});
         stored.remove(QVContentTaggingUUIDKeyName);
     };
-    return changeStoredDictionary(sideCar(url).path(), change, error, options);
+    return changeStoredDictionary(url, sideCar(url).path(), change, error, options);
 }
 
 bool TGRTCstSxvPstContentInfoWriter::writeContentInfo(
     const std::shared_ptr<const TGRTContentInfo>& contentInfo, const URL& url, Error* error,
     const ContentWriteOptions& options) const {
-    return changeStoredContentInfo(sideCar(url).path(), contentInfo, error, options);
+    return changeStoredContentInfo(url, sideCar(url).path(), contentInfo, error, options);
 }
 
 bool TGRTCstSxvPstMetaDataWriter::writeMetaData(const std::shared_ptr<TGRTMetaData>& metaData, const URL& url,
@@ -41,7 +41,7 @@ bool TGRTCstSxvPstMetaDataWriter::writeMetaData(const std::shared_ptr<TGRTMetaDa
         metaData->setFileType(QVContentTaggingTypes::fallBackFileTypeForURL(url));
     }
     const auto change = [&](PropertyList::Dictionary& stored) { metaData->storeInto(stored); };
-    return changeStoredDictionary(sideCar(url).path(), change, error, options);
+    return changeStoredDictionary(url, sideCar(url).path(), change, error, options);
 }
 
 }  // namespace qvct
