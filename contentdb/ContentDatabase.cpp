@@ -1,6 +1,7 @@
 #include "contentdb/ContentDatabase.h"
 
-#include "contentdb/Schema.h"
+#include "contentdb/Reading.h"
+#include "contentdb/RunLock.h"
 #include "contentdb/Search.h"
 #include "contentdb/Terms.h"
 #include "platform/Text.h"
@@ -13,8 +14,7 @@
 namespace qvct::contentdb {
 
 struct ContentDatabase::Implementation {
-    explicit Implementation(const std::string& path)
-        : connection(openDatabase(path, Access::read)), store(*connection) {}
+    explicit Implementation(const std::string& path) : connection(openToRead(path)), store(*connection) {}
 
     /// Runs `work` on one state of the database, whatever is written meanwhile.
     template <typename Work>
@@ -119,6 +119,10 @@ bool ContentDatabase::forEachFailure(const std::function<bool(const IndexedItem&
                    return true;
                })
         .has_value();
+}
+
+bool ContentDatabase::isBeingIndexed() const {
+    return RunLock::isHeld(implementation_->connection->path());
 }
 
 bool ContentDatabase::check(Error* error) {

@@ -25,6 +25,9 @@ namespace qvct::contentdb {
 class QVCT_API ContentDatabase {
   public:
     /// Null, and an error, when there is no such database, or it is damaged or of another version.
+    ///
+    /// One that `indexLibrary` is making at this moment is waited for until the first items are in it, ten
+    /// seconds at most. What a search then finds is what has been stored so far.
     static std::unique_ptr<ContentDatabase> open(const std::string& path, Error* error = nullptr);
     ~ContentDatabase();
 
@@ -56,6 +59,10 @@ class QVCT_API ContentDatabase {
     std::optional<Totals> totals(Error* error = nullptr);
     /// Calls `visit` with each item that could not be read, until it answers false.
     bool forEachFailure(const std::function<bool(const IndexedItem&)>& visit, Error* error = nullptr);
+
+    /// Whether a run of `indexLibrary` is going on, here or in another process, so that more may be found
+    /// soon.
+    bool isBeingIndexed() const;
 
     /// Reads everything: each page and its checksum, each tree, each record, and whether the index says of
     /// each item what the item says. @cost O(items), some minutes for a million.

@@ -1,5 +1,6 @@
 #include "contentdb/Indexer.h"
 
+#include "contentdb/DatabaseFiles.h"
 #include "contentdb/IndexRun.h"
 #include "contentdb/RunLock.h"
 #include "contentdb/Salvage.h"
@@ -8,7 +9,6 @@
 #include "platform/Text.h"
 #include "platform/Url.h"
 
-#include <filesystem>
 #include <thread>
 
 #include <fmt/format.h>
@@ -16,35 +16,14 @@
 namespace qvct::contentdb {
 namespace {
 
-/// A name beside the database that is not taken yet.
-std::string nameForDamaged(const std::string& database) {
-    std::string name = database + ".damaged";
-    for (int i = 2; fileExists(name); ++i) name = fmt::format("{}.damaged-{}", database, i);
-    return name;
-}
-
-/// Moves a database with its log; the log first, which nobody may take for that of another database.
-/// @throws DatabaseFailure when a part cannot be moved: nothing may come into its place then.
-void moveDatabase(const std::string& from, const std::string& to) {
-    for (const char* part : {"-shm", "-wal", ""}) {
-        std::error_code failure;
-        if (fileExists(from + part)) std::filesystem::rename(from + part, to + part, failure);
-        if (failure) {
-            throw DatabaseFailure(kErrorUnwritable,
-                                  fmt::format("{}: cannot be moved: {}", printable(from), failure.message()));
-        }
-    }
-}
-
 /// Puts a damaged database aside and what can be read of it into its place. Answers the folders that may have
 /// lost items.
 std::vector<std::string> replaceDamaged(const IndexOptions& options, const DatabaseFailure& failure) {
-    const std::string unfinished = options.database + ".unfinished";
+    const std::string unfinished = unfinishedPath(options.database);
     removeDatabase(unfinished);
     Salvage saved = salvage(options.database, unfinished);
-    const std::string aside = nameForDamaged(options.database);
-    moveDatabase(options.database, aside);
-    moveDatabase(unfinished, options.database);
+    declareRebuilt(options.database);
+    const std::string aside = putAside(options.database);
     if (options.note) {
         const std::string rest = saved.folders.empty()
                                      ? "; which other folders were in it could not be read"
@@ -54,6 +33,17 @@ std::vector<std::string> replaceDamaged(const IndexOptions& options, const Datab
     }
     std::erase_if(saved.folders, [](const std::string& folder) { return !isDirectory(folder); });
     return std::move(saved.folders);
+}
+
+/// Puts a database that an earlier run has rebuilt, but not into its place, there.
+void finishRebuild(const IndexOptions& options) {
+    if (!isRebuilt(options.database)) return;
+    const std::string aside = putAside(options.database);
+    if (!options.note) return;
+    options.note(fmt::format(
+        "{}: was damaged, and its rebuilding interrupted; the old one was put aside as {}, its other "
+        "folders are to be indexed again",
+        printable(options.database), printable(aside)));
 }
 
 IndexProgress runOnce(const IndexOptions& options, const std::vector<std::string>& folders,
@@ -93,9 +83,12 @@ std::optional<IndexProgress> indexLibrary(const IndexOptions& options, const Des
                           fmt::format("{}: {}", printable(folder),
                                       fileExists(folder) ? "is a file, not a folder" : "no such folder"));
     }
+    if (const auto reason = reasonAgainstDatabase(options.database))
+        return refuse(kErrorInvalidArgument, fmt::format("{}: {}", printable(options.database), *reason));
     const auto lock = RunLock::acquire(options.database, error);
     if (!lock) return std::nullopt;
     return guarded(error, std::optional<IndexProgress>(), [&]() -> std::optional<IndexProgress> {
+        finishRebuild(options);
         try {
             return runOnce(options, folders, factory);
         } catch (const DatabaseFailure& failure) {

@@ -1,4 +1,6 @@
+#include "contentdb/DatabaseFiles.h"
 #include "contentdb/Indexer.h"
+#include "contentdb/Reading.h"
 #include "contentdb/Schema.h"
 #include "contentdb/StoreWriter.h"
 #include "contentdb/Terms.h"
@@ -38,7 +40,7 @@ class Merge {
     Merge(const std::vector<std::string>& databases, const std::string& target)
         : connection_(openDatabase(target, Access::write)), writer_(*connection_) {
         for (const std::string& database : databases) {
-            auto connection = openDatabase(database, Access::read);
+            auto connection = openToRead(database);
             auto reader = std::make_unique<StoreWriter>(*connection);
             sources_.push_back({std::move(connection), std::move(reader)});
         }
@@ -113,7 +115,7 @@ bool mergeDatabases(const std::vector<std::string>& databases, const std::string
     if (fileExists(target))
         return fail(error, kErrorInvalidArgument, fmt::format("{}: exists already", printable(target)));
     // Built beside its place, so that a merge that was interrupted leaves no half database there.
-    const std::string unfinished = target + ".unfinished";
+    const std::string unfinished = unfinishedPath(target);
     removeDatabase(unfinished);
     const bool isDone = guarded(error, false, [&] {
         Merge(databases, unfinished).run();

@@ -119,8 +119,9 @@ struct QueryError {
 QVCT_API std::optional<Query> parseQuery(std::string_view text, const Vocabulary& vocabulary,
                                          QueryError* error);
 
-/// Evaluates a query in memory: whether it finds the item. Failed items are never found.
-QVCT_API bool matches(const Query& query, const IndexedItem& item);
+/// Evaluates a query in memory: whether it finds the item. Failed items are never found. False, and an error,
+/// when a regular expression of the query takes too long on the item.
+QVCT_API bool matches(const Query& query, const IndexedItem& item, Error* error = nullptr);
 
 /// Whether `a` comes before `b` in the query's order; items without the field last. Equal items are not
 /// before each other: whoever sorts keeps them in the order of the database.

@@ -30,9 +30,11 @@ bool occursInWords(const WordsMatch& match, std::string_view text) {
 /// Whether one item meets a match, one overload a kind.
 class Matching {
   public:
-    explicit Matching(const IndexedItem& item) : item_(item) {}
+    Matching(const IndexedItem& item, Error& fault) : item_(item), fault_(fault) {}
 
-    bool operator()(const Condition& condition) const { return std::visit(*this, condition.is); }
+    bool operator()(const Condition& condition) const {
+        return fault_.message.empty() && std::visit(*this, condition.is);
+    }
     bool operator()(const AllOf& all) const { return std::all_of(all.parts.begin(), all.parts.end(), *this); }
     bool operator()(const AnyOf& any) const { return std::any_of(any.parts.begin(), any.parts.end(), *this); }
     bool operator()(const NoneOf& none) const {
@@ -67,13 +69,14 @@ class Matching {
     }
     bool operator()(const ExpressionMatch& match) const {
         const std::vector<std::string> texts = textsInField(item_, match.field);
-        return std::any_of(texts.begin(), texts.end(), [&match](const std::string& text) {
-            return match.expression->occursIn(utf16FromUtf8(text));
+        return std::any_of(texts.begin(), texts.end(), [&](const std::string& text) {
+            return match.expression->occursIn(utf16FromUtf8(text), &fault_);
         });
     }
 
   private:
     const IndexedItem& item_;
+    Error& fault_;  // an expression that was given up: then the answer is none
 };
 
 /// Negative, 0 or positive; what is missing comes last whatever the direction.
@@ -94,8 +97,13 @@ std::vector<std::string> sortTexts(const IndexedItem& item, const Field& field) 
 
 }  // namespace
 
-bool matches(const Query& query, const IndexedItem& item) {
-    return item.failure.empty() && Matching(item)(query.condition);
+bool matches(const Query& query, const IndexedItem& item, Error* error) {
+    if (!item.failure.empty()) return false;
+    Error fault;
+    const bool isMatch = Matching(item, fault)(query.condition);
+    if (fault.message.empty()) return isMatch;
+    if (error != nullptr) *error = fault;
+    return false;
 }
 
 bool comesBefore(const Query& query, const IndexedItem& a, const IndexedItem& b) {

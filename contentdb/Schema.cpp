@@ -1,6 +1,7 @@
 #include "contentdb/Schema.h"
 
 #include "contentdb/ChecksumVfs.h"
+#include "contentdb/DatabaseFiles.h"
 #include "platform/FileAccess.h"
 #include "platform/Text.h"
 
@@ -72,18 +73,6 @@ std::string header(const std::string& path) {
     throw DatabaseFailure(code, fmt::format("{}: {}", printable(path), reason));
 }
 
-void create(Connection& connection) {
-    connection.run(fmt::format("PRAGMA page_size = {}", kPageSize).c_str());
-    Transaction transaction(connection);
-    // Another process may have been quicker.
-    if (connection.number("PRAGMA user_version") == 0) {
-        connection.run(fmt::format("PRAGMA application_id = {}", kApplicationId).c_str());
-        connection.run(kMigrations[0]);
-        connection.run("PRAGMA user_version = 1");
-    }
-    transaction.commit();
-}
-
 void migrate(Connection& connection) {
     constexpr auto present = static_cast<std::int64_t>(kMigrations.size());
     Transaction transaction(connection);
@@ -94,9 +83,18 @@ void migrate(Connection& connection) {
     transaction.commit();
 }
 
-void prepare(Connection& connection, bool isNew, Access access) {
+void configure(Connection& connection) {
     connection.run("PRAGMA cell_size_check = ON; PRAGMA temp_store = MEMORY; PRAGMA cache_size = -49152");
-    if (isNew) create(connection);
+}
+
+void keepLog(Connection& connection) {
+    if (connection.text("PRAGMA journal_mode = WAL") != "wal")
+        refuse(connection.path(), kErrorUnwritable, "no write-ahead log can be kept here");
+    connection.run("PRAGMA synchronous = NORMAL; PRAGMA wal_autocheckpoint = 4000");
+}
+
+void prepare(Connection& connection, Access access) {
+    configure(connection);
     constexpr auto present = static_cast<std::int64_t>(kMigrations.size());
     const std::int64_t version = connection.number("PRAGMA user_version");
     if (connection.number("PRAGMA application_id") != kApplicationId)
@@ -112,9 +110,30 @@ void prepare(Connection& connection, bool isNew, Access access) {
         return;
     }
     if (version < present) migrate(connection);
-    if (connection.text("PRAGMA journal_mode = WAL") != "wal")
-        refuse(connection.path(), kErrorUnwritable, "no write-ahead log can be kept here");
-    connection.run("PRAGMA synchronous = NORMAL; PRAGMA wal_autocheckpoint = 4000");
+    keepLog(connection);
+}
+
+bool isEmptyFile(const std::string& path) {
+    std::error_code ignored;
+    return std::filesystem::file_size(path, ignored) == 0;
+}
+
+/// Made beside its place: a reader finds a whole database there, or none.
+void create(const std::string& path) {
+    const std::string unborn = path + ".new";
+    removeDatabase(unborn);
+    {
+        Connection connection(unborn, Connection::Access::create);
+        configure(connection);
+        connection.run(
+            fmt::format("PRAGMA page_size = {0}; PRAGMA application_id = {1}", kPageSize, kApplicationId)
+                .c_str());
+        migrate(connection);
+        keepLog(connection);
+    }
+    std::error_code failure;
+    std::filesystem::rename(unborn, path, failure);
+    if (failure) refuse(path, kErrorUnwritable, failure.message());
 }
 
 /// The file by an URI that says that nobody writes to it, so that no log is needed beside it.
@@ -128,7 +147,7 @@ std::string immutableUri(const std::string& path) {
 std::unique_ptr<Connection> openForReading(const std::string& path) {
     try {
         auto connection = std::make_unique<Connection>(path, Connection::Access::readOnly);
-        prepare(*connection, false, Access::read);
+        prepare(*connection, Access::read);
         return connection;
     } catch (const DatabaseFailure& failure) {
         // In a folder that cannot be written the shared state of the log cannot be made.
@@ -143,7 +162,7 @@ std::unique_ptr<Connection> openForReading(const std::string& path) {
                "to its folder; one search by its owner does it");
     }
     auto connection = std::make_unique<Connection>(immutableUri(path), Connection::Access::readOnly);
-    prepare(*connection, false, Access::read);
+    prepare(*connection, Access::read);
     return connection;
 }
 
@@ -157,32 +176,25 @@ bool isMarkedAsContentDatabase(const std::string& path) {
            bytes.compare(place, 4, "QVCD") == 0;
 }
 
-void removeDatabase(const std::string& path) {
-    for (const char* part : {"", "-wal", "-shm", "-journal"}) {
-        std::error_code ignored;
-        std::filesystem::remove(path + part, ignored);
-    }
+std::optional<std::string> reasonAgainstDatabase(const std::string& path) {
+    if (isDirectory(path)) return "a folder, not a database";
+    if (fileExists(path) && !isRegularFile(path)) return "a pipe or device, not a database";
+    return std::nullopt;
 }
 
 std::unique_ptr<Connection> openDatabase(const std::string& path, Access access) {
-    std::error_code ignored;
+    if (const auto reason = reasonAgainstDatabase(path)) refuse(path, kErrorInvalidArgument, *reason);
     const bool exists = fileExists(path);
     if (!exists && access == Access::read) refuse(path, kErrorUnreadable, "there is no such database");
-    if (isDirectory(path)) refuse(path, kErrorInvalidArgument, "a folder, not a database");
-    const bool isNew = !exists || std::filesystem::file_size(path, ignored) == 0;
-    // An interrupted creation is finished by SQLite itself, from its journal.
-    if (!isNew && !isMarkedAsContentDatabase(path) && !fileExists(path + "-journal"))
+    if (access == Access::write && (!exists || isEmptyFile(path))) create(path);
+    if (!isMarkedAsContentDatabase(path)) {
         refuse(path, kErrorInvalidArgument,
                "not a content database, or one whose beginning is damaged; if it was one, move it away and "
                "index again");
-    if (access == Access::read) {
-        // A reader may not finish what a writer was interrupted in.
-        if (fileExists(path + "-journal"))
-            Connection(path, Connection::Access::create).number("PRAGMA schema_version");
-        return openForReading(path);
     }
-    auto connection = std::make_unique<Connection>(path, Connection::Access::create);
-    prepare(*connection, isNew || connection->number("PRAGMA application_id") == 0, access);
+    if (access == Access::read) return openForReading(path);
+    auto connection = std::make_unique<Connection>(path, Connection::Access::readWrite);
+    prepare(*connection, access);
     return connection;
 }
 

@@ -3,6 +3,7 @@
 #include "contentdb/Sqlite.h"
 
 #include <memory>
+#include <optional>
 #include <string>
 
 namespace qvct::contentdb {
@@ -14,8 +15,8 @@ enum class Access { read, write };
 /// @throws DatabaseFailure: kErrorMalformed when it is a content database that is damaged.
 std::unique_ptr<Connection> openDatabase(const std::string& path, Access access);
 
-/// Removes what there is of a database and its logs.
-void removeDatabase(const std::string& path);
+/// Why what lies at the path cannot be a database, found without opening it: a folder, a pipe, a device.
+std::optional<std::string> reasonAgainstDatabase(const std::string& path);
 
 /// Whether the file carries the mark of a content database, damaged or not.
 bool isMarkedAsContentDatabase(const std::string& path);

@@ -37,8 +37,8 @@ class Evaluation {
             bool goesOn = true;
             bounds.possible.forEach([&](std::uint16_t id) {
                 auto found = read(chunk << kChunkBits | id);
-                const bool isMatch = found && (bounds.sure.contains(id) || matches(query_, found->item));
-                if (isMatch) goesOn = visit(std::move(*found));
+                const bool isFound = found && (bounds.sure.contains(id) || isMatch(found->item));
+                if (isFound) goesOn = visit(std::move(*found));
                 return goesOn;
             });
             return goesOn;
@@ -52,13 +52,20 @@ class Evaluation {
         IdSet result = bounds.sure;
         open.forEach([&](std::uint16_t id) {
             const auto item = store_.item(chunk << kChunkBits | id);
-            if (item && matches(query_, *item)) result.insert(id);
+            if (item && isMatch(*item)) result.insert(id);
             return true;
         });
         return result;
     }
 
   private:
+    bool isMatch(const IndexedItem& item) const {
+        Error error;
+        const bool result = matches(query_, item, &error);
+        if (!error.message.empty()) throw DatabaseFailure(kErrorTooLarge, error.message);
+        return result;
+    }
+
     std::optional<Found> read(ItemId id) {
         auto item = store_.item(id);
         if (!item) return std::nullopt;

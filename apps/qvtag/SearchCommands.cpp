@@ -138,6 +138,9 @@ std::unique_ptr<ContentDatabase> opened(const Options& options, ToolContext& con
     Error error;
     auto database = ContentDatabase::open(options.database, &error);
     if (!database) context.itemFailed(error.message);
+    if (database && database->isBeingIndexed())
+        context.note(fmt::format("{}: a run of `index` is going on; this is what it has stored so far",
+                                 printable(options.database)));
     return database;
 }
 

@@ -18,13 +18,18 @@ struct Closer {
 }  // namespace
 
 struct RegularExpression::Implementation {
+    std::string pattern;
     std::unique_ptr<URegularExpression, Closer> expression;
 
-    bool find(std::u16string_view text) {
+    bool find(std::u16string_view text, Error* error = nullptr) {
         UErrorCode status = U_ZERO_ERROR;
         uregex_setText(expression.get(), text.data(), static_cast<int32_t>(text.size()), &status);
         const bool found = uregex_findNext(expression.get(), &status) != 0;
-        return found && U_SUCCESS(status);
+        if (U_SUCCESS(status)) return found;
+        const char* reason = status == U_REGEX_TIME_OUT ? "takes too long" : u_errorName(status);
+        return fail(error, kErrorTooLarge,
+                    fmt::format("regular expression \"{}\" on \"{}\": {}", printable(pattern),
+                                printable(utf8FromUtf16(text)), reason));
     }
 };
 
@@ -41,6 +46,7 @@ std::optional<RegularExpression> RegularExpression::compile(std::string_view pat
     UParseError place{};
     UErrorCode status = U_ZERO_ERROR;
     auto made = std::make_unique<Implementation>();
+    made->pattern = pattern;
     made->expression.reset(
         uregex_open(wide.data(), static_cast<int32_t>(wide.size()), flags, &place, &status));
     if (U_FAILURE(status)) {
@@ -53,8 +59,8 @@ std::optional<RegularExpression> RegularExpression::compile(std::string_view pat
     return RegularExpression(std::move(made));
 }
 
-bool RegularExpression::occursIn(std::u16string_view text) {
-    return implementation_->find(text);
+bool RegularExpression::occursIn(std::u16string_view text, Error* error) {
+    return implementation_->find(text, error);
 }
 
 std::vector<RegularExpression::Range> RegularExpression::firstMatch(std::u16string_view text) {

@@ -14,7 +14,7 @@ namespace qvct {
 /// A compiled ICU regular expression.
 ///
 /// Searching changes the expression's own state: use one from one thread at a time. A search that backtracks
-/// without end is given up after about a second and counts as no match.
+/// without end is given up after about a second and counts as no match, with an error where one is asked for.
 class QVCT_API RegularExpression {
   public:
     /// Whether capitals and small letters differ.
@@ -37,7 +37,7 @@ class QVCT_API RegularExpression {
     ~RegularExpression();
 
     /// Whether the pattern occurs anywhere in the text.
-    bool occursIn(std::u16string_view text);
+    bool occursIn(std::u16string_view text, Error* error = nullptr);
     /// The first occurrence with its capture groups; empty when there is none.
     std::vector<Range> firstMatch(std::u16string_view text);
 

@@ -7,12 +7,14 @@
 #include <csignal>
 #include <filesystem>
 #include <fstream>
+#include <future>
 #include <set>
 #include <thread>
 
 #include <fmt/format.h>
 #include <gmock/gmock.h>
 #include <sys/resource.h>
+#include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -538,6 +540,52 @@ TEST_F(Indexing, RebuildsADamagedDatabaseAndKeepsTheOld) {
     EXPECT_EQ(names().size(), 300U);
     EXPECT_THAT(notes_, ElementsAre(HasSubstr("built anew")));
     EXPECT_EQ(readAll(database() + ".damaged"), bytes);
+    // Interrupted before the new one was in its place: a reader puts it there, and so does a run.
+    for (const bool isAside : {true, false}) {
+        for (const bool byReader : {true, false}) {
+            std::filesystem::rename(database(), database() + ".rebuilt");
+            if (!isAside) folder_.write("db", bytes);
+            EXPECT_EQ(byReader ? names().size() : index().unchanged, 300U);
+            EXPECT_EQ(names().size(), 300U);
+            EXPECT_FALSE(fileExists(database() + ".rebuilt"));
+        }
+    }
+    EXPECT_EQ(readAll(database() + ".damaged-3"), bytes);
+}
+
+TEST_F(Indexing, IsWaitedForWhileTheDatabaseIsMade) {
+    for (int i = 0; i < 20; ++i) write(fmt::format("Kick {}.wav", i), std::to_string(i));
+    Milestone milestone;
+    const pid_t child = ::fork();
+    if (child == 0) {
+        index([&](IndexOptions& theirs) {
+            theirs.isCancelled = [&] {
+                milestone.reach();
+                milestone.awaitPass();
+                return false;
+            };
+        });
+        ::_exit(0);
+    }
+    milestone.awaitReached();
+    auto found = std::async(std::launch::async, [this] { return names("kick"); });
+    EXPECT_EQ(found.wait_for(std::chrono::milliseconds(200)), std::future_status::timeout);
+    milestone.letPass();
+    EXPECT_EQ(found.get().size(), 20U);
+    ::waitpid(child, nullptr, 0);
+    EXPECT_FALSE(ContentDatabase::open(database())->isBeingIndexed());
+}
+
+TEST_F(Indexing, IsNotSearchedByAnExpressionWithoutEnd) {
+    write(std::string(40, 'a') + "!.wav", "");
+    settle();
+    index();
+    const auto database = ContentDatabase::open(this->database());
+    const auto query = parseQuery("-name::^(a+)+$", *database->vocabulary(), nullptr);
+    Error error;
+    EXPECT_FALSE(database->search(*query, 10, &error));
+    EXPECT_THAT(error.message, HasSubstr("regular expression \"^(a+)+$\" on \"aaaa"));
+    EXPECT_THAT(error.message, HasSubstr("takes too long"));
 }
 
 TEST_F(Indexing, FindsDamageOnAnyPageAndKeepsAllFolders) {
@@ -613,6 +661,10 @@ TEST_F(Indexing, RefusesASecondRunAForeignFileAndAMissingFolder) {
     };
     EXPECT_THAT(refusal(), HasSubstr("not a content database"));
     EXPECT_EQ(readAll(song), std::string(20000, 'x'));
+    options.database = folder_.path("pipe");
+    ASSERT_EQ(::mkfifo(options.database.c_str(), 0600), 0);
+    EXPECT_THAT(refusal(), HasSubstr("a pipe or device"));
+    EXPECT_FALSE(fileExists(options.database + "-lock"));
     options.database = folder_.path("none/db");
     EXPECT_THAT(refusal(), HasSubstr("cannot be written"));
     options.database = database();

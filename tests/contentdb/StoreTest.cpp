@@ -6,6 +6,7 @@
 #include <functional>
 
 #include <gmock/gmock.h>
+#include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -143,6 +144,8 @@ TEST(Store, RefusesWhatIsNoContentDatabaseOfThisVersion) {
     Connection(newer, Connection::Access::readWrite).run("PRAGMA user_version = 99");
     folder.write("song.wav", std::string(5000, 'x'));
     const std::string empty = folder.write("empty", "");
+    const std::string pipe = folder.path("pipe");
+    ASSERT_EQ(::mkfifo(pipe.c_str(), 0600), 0);
     struct Case {
         std::string path;
         std::string reason;
@@ -150,7 +153,8 @@ TEST(Store, RefusesWhatIsNoContentDatabaseOfThisVersion) {
     for (const Case& one :
          {Case{newer, "newer version"}, Case{folder.path("song.wav"), "not a content database"},
           Case{empty, "not a content database"}, Case{folder.path("none"), "no such database"},
-          Case{folder.path(), "a folder"}}) {
+          Case{folder.path(), "a folder"}, Case{pipe, "a pipe or device"},
+          Case{"/dev/null", "a pipe or device"}}) {
         Error error;
         EXPECT_EQ(ContentDatabase::open(one.path, &error), nullptr) << one.path;
         EXPECT_THAT(error.message, HasSubstr(one.reason));
