@@ -78,7 +78,8 @@ bool IndexRun::walk(const std::string& folder) {
             [this](const std::string& path, const Error& error) {
                 unreadable_.insert(path);
                 if (options_.failed) options_.failed(error);
-            });
+            },
+            options_.links);
     if (listed_ == 0 && !options_.pruneRoots) bareRoots_.emplace(folder, 0);
     return areWorkersInOrder_;
 }

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "contentdb/IndexedItem.h"
+#include "formats/ContentWalk.h"
 #include "platform/Error.h"
 #include "platform/Export.h"
 
@@ -33,6 +34,9 @@ struct IndexOptions {
     /// A number for what describes items, such as `ContentDescriber::digest`. The database keeps it; when it
     /// is another than before, every item counts as changed, also those that only a later run comes to.
     std::uint64_t describer = 0;
+    /// Which links out of a folder are followed, and who is told of the others. A link that is passed over
+    /// takes nothing out of the index.
+    WalkedLinks links;
     /// Takes items out of the index whose files are gone, but for those below a folder of `folders` in which
     /// nothing is left: a disk that is away looks like this. `failed` is told of it.
     bool prune = false;

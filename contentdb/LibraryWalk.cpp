@@ -2,7 +2,6 @@
 
 #include "contentdb/Digest.h"
 #include "contentdb/Paths.h"
-#include "formats/ContentWalk.h"
 #include "platform/QVContentTaggingTypes.h"
 #include "platform/Text.h"
 #include "platform/Url.h"
@@ -149,12 +148,17 @@ void includeContents(int parent, const char* name, FileStamp& stamp, std::size_t
 
 class Walk {
   public:
-    Walk(const FolderVisitor& visit, const std::function<void(const std::string&, const Error&)>& failed)
-        : visit_(visit), failed_(failed) {}
+    Walk(const std::string& start, const FolderVisitor& visit,
+         const std::function<void(const std::string&, const Error&)>& failed, const WalkedLinks& links)
+        : start_(start),
+          visit_(visit),
+          failed_(failed),
+          passedOver_(links.passedOver),
+          rule_(start, links.outside) {}
 
     /// Links come last, so that a folder has the path where it lies, whatever points to it.
-    bool start(const std::string& path) {
-        bool goesOn = folder(path, 0);
+    bool run() {
+        bool goesOn = folder(start_, 0);
         for (; goesOn && !links_.empty(); links_.pop_front()) goesOn = folder(links_.front(), 0);
         return goesOn;
     }
@@ -205,17 +209,23 @@ class Walk {
             if (kind != Kind::other) fail(path + "/" + std::string(name));
             return;
         }
-        if (S_ISDIR(status.st_mode) && kind != Kind::bundle) {
-            if (isLink(folder, name, entry.kind)) {
+        const bool isWalked = S_ISDIR(status.st_mode) && kind != Kind::bundle;
+        const bool isContent =
+            kind == Kind::bundle ? S_ISDIR(status.st_mode) : kind != Kind::other && S_ISREG(status.st_mode);
+        if (!isWalked && !isContent) return;
+        const bool isALink = isLink(folder, name, entry.kind);
+        if (isALink && !rule_.follows(pathIn(path, name), isWalked)) {
+            if (passedOver_) passedOver_(URL::fileURLWithPath(pathIn(path, name)));
+            return;
+        }
+        if (isWalked) {
+            if (isALink) {
                 links_.push_back(pathIn(path, name));
             } else {
                 folders.emplace_back(name);
             }
             return;
         }
-        const bool isContent =
-            kind == Kind::bundle ? S_ISDIR(status.st_mode) : kind != Kind::other && S_ISREG(status.st_mode);
-        if (!isContent) return;
         ListedItem item{name, stampOf(status)};
         includeCompanions(folder, listing, item);
         if (kind == Kind::bundle) {
@@ -244,8 +254,11 @@ class Walk {
         return ::fstatat(folder, name.data(), &status, AT_SYMLINK_NOFOLLOW) == 0 && S_ISLNK(status.st_mode);
     }
 
+    const std::string& start_;
     const FolderVisitor& visit_;
     const std::function<void(const std::string&, const Error&)>& failed_;
+    const std::function<void(const URL&)>& passedOver_;
+    const LinkRule rule_;
     NameKinds kinds_;
     std::set<Identity> entered_;
     std::deque<std::string> links_;  // to folders, to be entered when the others were
@@ -269,8 +282,9 @@ std::uint64_t countBelow(const std::string& path, NameKinds& kinds, std::size_t 
 }  // namespace
 
 bool walkLibrary(const std::string& folder, const FolderVisitor& visit,
-                 const std::function<void(const std::string& path, const Error& error)>& failed) {
-    return Walk(visit, failed).start(folder);
+                 const std::function<void(const std::string& path, const Error& error)>& failed,
+                 const WalkedLinks& links) {
+    return Walk(folder, visit, failed, links).run();
 }
 
 std::uint64_t countContentNames(const std::string& folder) {

@@ -1,3 +1,4 @@
+#include "CommandLine.h"
 #include "Commands.h"
 #include "Resources.h"
 #include "RhythmMeasurement.h"
@@ -22,6 +23,7 @@ namespace {
 
 struct Options {
     std::vector<std::string> paths;
+    LinksOutside links = LinksOutside::files;
     std::vector<std::string> services;
     std::string keywordsFile;
     std::string rulesFile;
@@ -131,7 +133,7 @@ void run(const Options& options, ToolContext& context) {
                                            keywordsIn(options.keywordsFile, context));
     const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
     std::vector<Item> items;
-    for (const URL& url : context.contentItems(options.paths)) {
+    for (const URL& url : context.contentItems(options.paths, options.links)) {
         auto taggings = aggregator->taggingsWithContentsOfURL(url, *taxonomy, bits);
         if (options.measuresAnyRhythm) addAnyRhythm(url, *taxonomy, taggings);
         items.push_back({url, sortedTaggings(taggings)});
@@ -151,6 +153,7 @@ void addAutotagCommand(CLI::App& app, ToolContext& context) {
     const auto options = std::make_shared<Options>();
     auto* command = app.add_subcommand("autotag", "Derives tags for files and for everything below folders");
     command->add_option("paths", options->paths, "Files and folders")->required()->type_name("PATH");
+    addFollowOption(*command, options->links);
     addServicesOption(*command, options->services);
     command
         ->add_option("--keywords", options->keywordsFile,

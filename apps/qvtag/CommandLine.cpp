@@ -47,6 +47,12 @@ std::string refuseNegative(const std::string& text) {
     return text.starts_with('-') ? text + " is less than 0" : "";
 }
 
+void addFollowOption(CLI::App& command, LinksOutside& links) {
+    command.add_flag_callback(
+        "--follow", [&links] { links = LinksOutside::all; },
+        "Also follow links that lead out of the folders named");
+}
+
 CommandDescription describeCommandLine(const CLI::App& app) {
     return describe(app, {});
 }

@@ -1,5 +1,7 @@
 #pragma once
 
+#include "formats/LinkRule.h"
+
 #include <string>
 #include <vector>
 
@@ -31,6 +33,9 @@ struct CommandDescription {
 
 /// Accepts whole numbers from 0, also hexadecimal ones (0x100); the parser alone takes -1 for the largest.
 std::string refuseNegative(const std::string& text);
+
+/// Adds "--follow", which makes a walk follow every link.
+void addFollowOption(CLI::App& command, LinksOutside& links);
 
 /// Hidden commands and options are left out.
 CommandDescription describeCommandLine(const CLI::App& app);

@@ -1,3 +1,4 @@
+#include "CommandLine.h"
 #include "Commands.h"
 #include "Progress.h"
 #include "Services.h"
@@ -81,12 +82,15 @@ void run(Options& options, ToolContext& context) {
         bar.hide();
         context.note(message);
     };
+    std::vector<URL> passedOver;
+    index.links.passedOver = [&passedOver](const URL& link) { passedOver.push_back(link); };
     interruptGently();
     index.isCancelled = [] { return wasInterrupted != 0; };
     Error error;
     const auto progress = indexLibrary(index, factory, &error);
     bar.hide();
     if (!progress) return context.itemFailed(error.message);
+    context.notePassedOver(passedOver);
     printRun(jsonOfRun(index, *progress, bar.seconds()), *progress, context);
     if (wasInterrupted != 0) context.itemFailed("interrupted; the next run goes on from here");
 }
@@ -101,6 +105,7 @@ void addIndexCommand(CLI::App& app, ToolContext& context) {
     command->add_option("--db", index.database, "The database; made if there is none")
         ->required()
         ->type_name("FILE");
+    addFollowOption(*command, index.links.outside);
     auto* prune = command->add_flag("--prune", index.prune, "Take items out whose files are gone");
     command
         ->add_flag("--prune-roots", index.pruneRoots,

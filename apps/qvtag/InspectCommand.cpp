@@ -1,3 +1,4 @@
+#include "CommandLine.h"
 #include "Commands.h"
 #include "InspectedParts.h"
 #include "StandardStreams.h"
@@ -13,6 +14,7 @@ namespace {
 
 struct Options {
     std::vector<std::string> paths;
+    LinksOutside links = LinksOutside::files;
 };
 
 Json jsonOfPart(const InspectedPart& part) {
@@ -38,7 +40,7 @@ void printPart(const InspectedPart& part, const Terminal& terminal, std::size_t 
 
 void run(const Options& options, ToolContext& context) {
     Json json = Json::array();
-    for (const URL& url : context.contentItems(options.paths)) {
+    for (const URL& url : context.contentItems(options.paths, options.links)) {
         if (isOutputLost()) break;
         Error error;
         const auto parts = partsOfItem(url, &error);
@@ -64,6 +66,7 @@ void addInspectCommand(CLI::App& app, ToolContext& context) {
     auto* command =
         app.add_subcommand("inspect", "Shows what is in a file: chunks, header fields, stored entries");
     command->add_option("paths", options->paths, "Files and folders")->required()->type_name("PATH");
+    addFollowOption(*command, options->links);
     command->footer("Example:\n  qvtag inspect \"Kick 01.wav\"");
     command->callback([options, &context] { run(*options, context); });
 }

@@ -17,6 +17,7 @@ namespace {
 
 struct Options {
     std::vector<std::string> paths;
+    LinksOutside links = LinksOutside::files;
     std::uint64_t bits = 0;
 };
 
@@ -65,7 +66,7 @@ void printObject(const URL& url, const ContentObject& object, const Terminal& te
 void run(const Options& options, ToolContext& context) {
     Json json = Json::array();
     std::size_t withoutRecord = 0;
-    for (const URL& url : context.contentItems(options.paths)) {
+    for (const URL& url : context.contentItems(options.paths, options.links)) {
         if (isOutputLost()) break;
         Error error;
         const auto object =
@@ -98,6 +99,7 @@ void addObjectCommand(CLI::App& app, ToolContext& context) {
     const auto options = std::make_shared<Options>();
     auto* command = app.add_subcommand("object", "Shows what a content database stores of files and bundles");
     command->add_option("paths", options->paths, "Files and folders")->required()->type_name("PATH");
+    addFollowOption(*command, options->links);
     command
         ->add_option("--options", options->bits,
                      "Sum of 1: tags of retired vocabularies, and what loop keywords among them are called "

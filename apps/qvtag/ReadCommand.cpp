@@ -1,3 +1,4 @@
+#include "CommandLine.h"
 #include "Commands.h"
 #include "PropertyListOutput.h"
 #include "RecordOutput.h"
@@ -16,6 +17,7 @@ namespace {
 
 struct Options {
     std::vector<std::string> paths;
+    LinksOutside links = LinksOutside::files;
     bool legacy = false;
     bool mapped = false;
 };
@@ -74,7 +76,7 @@ void run(const Options& options, ToolContext& context) {
     const std::uint64_t bits = (options.legacy ? std::uint64_t{kReadLegacyTaggings} : 0) |
                                (options.mapped ? std::uint64_t{kReadMappedTaggings} : 0);
     Json json = Json::array();
-    for (const URL& url : context.contentItems(options.paths)) {
+    for (const URL& url : context.contentItems(options.paths, options.links)) {
         if (isOutputLost()) break;
         const auto record = readRecord(url, bits, context);
         if (!record) continue;
@@ -93,6 +95,7 @@ void addReadCommand(CLI::App& app, ToolContext& context) {
     const auto options = std::make_shared<Options>();
     auto* command = app.add_subcommand("read", "Shows what files and bundles store about themselves");
     command->add_option("paths", options->paths, "Files and folders")->required()->type_name("PATH");
+    addFollowOption(*command, options->links);
     command->add_flag("--legacy", options->legacy,
                       "Also the tags of retired vocabularies in old loops and presets");
     command->add_flag("--mapped", options->mapped, "Also what those tags are called today");

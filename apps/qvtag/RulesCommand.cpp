@@ -1,3 +1,4 @@
+#include "CommandLine.h"
 #include "Commands.h"
 #include "Resources.h"
 #include "StandardStreams.h"
@@ -19,6 +20,7 @@ using Service = std::shared_ptr<QVCTXMLRulesTaggingService>;
 
 struct Options {
     std::vector<std::string> paths;
+    LinksOutside links = LinksOutside::files;
     std::string rulesFile;
 };
 
@@ -96,7 +98,7 @@ void show(const Options& options, ToolContext& context) {
     const Service service = serviceWith(options.rulesFile, context);
     if (!service) return;
     Json items = Json::array();
-    for (const URL& url : context.contentItems(options.paths)) {
+    for (const URL& url : context.contentItems(options.paths, options.links)) {
         if (isOutputLost()) break;
         const auto matches = matchesOf(service, url, context);
         if (context.format == Format::table) {
@@ -165,7 +167,7 @@ void test(const Options& options, ToolContext& context) {
     const Service service = serviceWith(options.rulesFile, context);
     if (!service) return;
     std::vector<Tally> tallies = emptyTallies(service, options.rulesFile, context);
-    const std::vector<URL> items = context.contentItems(options.paths);
+    const std::vector<URL> items = context.contentItems(options.paths, options.links);
     count(items, service, tallies);
     printTallies(tallies, items.size(), context);
 }
@@ -178,6 +180,7 @@ void addRulesCommand(CLI::App& app, ToolContext& context) {
     rules->add_option("paths", options->paths, "Patches, settings, and folders of them")->type_name("PATH");
     rules->add_option("--rules", options->rulesFile, "Property list of rules to use instead of the built-in")
         ->type_name("FILE");
+    addFollowOption(*rules, options->links);
     rules->footer(
         "Example:\n  qvtag rules \"Patches/Warm Pad.patch\"\n  qvtag rules test MyRules.plist Patches");
 
@@ -189,6 +192,7 @@ void addRulesCommand(CLI::App& app, ToolContext& context) {
     testing->add_option("paths", options->paths, "Patches, settings, and folders of them")
         ->required()
         ->type_name("PATH");
+    addFollowOption(*testing, options->links);
     testing->footer("Example:\n  qvtag rules test MyRules.plist Patches");
     testing->callback([options, &context] { test(*options, context); });
     rules->callback([rules, options, &context] {

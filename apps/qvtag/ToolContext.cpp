@@ -71,8 +71,16 @@ void ToolContext::note(std::string_view message) const {
     if (!quiet) printLine(message);
 }
 
-std::vector<URL> ToolContext::contentItems(const std::vector<std::string>& paths) {
+void ToolContext::notePassedOver(const std::vector<URL>& links) const {
+    if (links.empty()) return;
+    const std::string all = links.size() == 1 ? "" : fmt::format(" (one of {} such links)", links.size());
+    note(fmt::format("{}: leads out of the folder and was passed over{}; --follow follows it",
+                     printable(links.front().path()), all));
+}
+
+std::vector<URL> ToolContext::contentItems(const std::vector<std::string>& paths, LinksOutside links) {
     std::vector<URL> items;
+    std::vector<URL> passedOver;
     const auto add = [&](const URL& url) {
         if (isValidUtf8(url.path())) {
             items.push_back(url);
@@ -81,8 +89,10 @@ std::vector<URL> ToolContext::contentItems(const std::vector<std::string>& paths
         }
     };
     for (const std::string& path : paths) {
-        walkContent(path, add, [this](const Error& error) { itemFailed(error.message); });
+        walkContent(path, add, [this](const Error& error) { itemFailed(error.message); },
+                    {links, [&passedOver](const URL& link) { passedOver.push_back(link); }});
     }
+    notePassedOver(passedOver);
     return items;
 }
 

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "Output.h"
+#include "formats/LinkRule.h"
 #include "platform/Url.h"
 
 #include <cstddef>
@@ -39,8 +40,10 @@ class ToolContext {
     int exitStatus() const { return exitStatus_; }
 
     /// Every content item at or below the paths; what cannot be read is reported. Names that are not UTF-8
-    /// are reported and left out.
-    std::vector<URL> contentItems(const std::vector<std::string>& paths);
+    /// are reported and left out. Links that are not followed are told in one note.
+    std::vector<URL> contentItems(const std::vector<std::string>& paths, LinksOutside links);
+    /// That note, for a walk of one's own; nothing when there are none.
+    void notePassedOver(const std::vector<URL>& links) const;
 
   private:
     class LoggedLines;

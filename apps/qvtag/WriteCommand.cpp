@@ -1,3 +1,4 @@
+#include "CommandLine.h"
 #include "Commands.h"
 #include "StandardStreams.h"
 #include "TaggingEdit.h"
@@ -20,6 +21,7 @@ namespace {
 
 struct Options {
     std::vector<std::string> paths;
+    LinksOutside links = LinksOutside::none;
     std::vector<std::string> add;
     std::vector<std::string> remove;
     std::optional<std::string> name;
@@ -187,7 +189,7 @@ void run(const Options& options, ToolContext& context) {
     Json json = Json::array();
     std::size_t written = 0;
     std::size_t unchanged = 0;
-    for (const URL& url : context.contentItems(options.paths)) {
+    for (const URL& url : context.contentItems(options.paths, options.links)) {
         const auto change = editItem(url, *edit, options, context);
         if (!change) continue;
         unchanged += change->isNone() ? 1 : 0;
@@ -209,6 +211,7 @@ void addWriteCommand(CLI::App& app, ToolContext& context) {
     const auto options = std::make_shared<Options>();
     auto* command = app.add_subcommand("write", "Changes the tags and the name that items store");
     command->add_option("paths", options->paths, "Files and folders")->required()->type_name("PATH");
+    addFollowOption(*command, options->links);
     command
         ->add_option("--add", options->add, "Tag to add, or to give another level (0 to 1, or a percentage)")
         ->type_name("CATEGORY/LABEL[=LEVEL]")

@@ -34,15 +34,19 @@ struct FolderEntry {
 
 class Walk {
   public:
-    Walk(const std::function<void(const URL&)>& item, const std::function<void(const Error&)>& failed)
-        : item_(item), failed_(failed) {}
+    Walk(const URL& start, const std::function<void(const URL&)>& item,
+         const std::function<void(const Error&)>& failed, const WalkedLinks& links)
+        : start_(start),
+          item_(item),
+          failed_(failed),
+          passedOver_(links.passedOver),
+          rule_(start.path(), links.outside) {}
 
-    void start(const std::string& path) {
-        const URL url = URL::fileURLWithPath(path);
+    void run() {
         struct stat status {};
-        if (::stat(url.path().c_str(), &status) != 0) return fail(url);
-        if (!S_ISDIR(status.st_mode) || isBundleName(url)) return item(url);
-        folder(url, {status.st_dev, status.st_ino});
+        if (::stat(start_.path().c_str(), &status) != 0) return fail(start_);
+        if (!S_ISDIR(status.st_mode) || isBundleName(start_)) return item(start_);
+        folder(start_, {status.st_dev, status.st_ino});
         for (; !links_.empty(); links_.pop_front()) folder(links_.front().first, links_.front().second);
     }
 
@@ -86,11 +90,20 @@ class Walk {
             return;
         }
         const bool isFolder = !isKnown && S_ISDIR(status.st_mode);
-        if (isFolder && !isBundleName(url)) {
-            const Identity identity = {status.st_dev, status.st_ino};
-            return isLink(url, kind) ? void(links_.emplace_back(url, identity)) : folder(url, identity);
+        const bool isWalked = isFolder && !isBundleName(url);
+        if (!isWalked && !(isContentName(url) && isFolder == isBundleName(url))) return;
+        const bool isALink = isLink(url, kind);
+        if (isALink && !rule_.follows(url.path(), isWalked)) {
+            if (passedOver_) passedOver_(url);
+            return;
         }
-        if (isContentName(url) && isFolder == isBundleName(url)) item(url);
+        if (!isWalked) return item(url);
+        const Identity identity = {status.st_dev, status.st_ino};
+        if (isALink) {
+            links_.emplace_back(url, identity);
+        } else {
+            folder(url, identity);
+        }
     }
 
     static bool isLink(const URL& url, unsigned char kind) {
@@ -99,8 +112,11 @@ class Walk {
         return ::lstat(url.path().c_str(), &status) == 0 && S_ISLNK(status.st_mode);
     }
 
+    const URL& start_;
     const std::function<void(const URL&)>& item_;
     const std::function<void(const Error&)>& failed_;
+    const std::function<void(const URL&)>& passedOver_;
+    const LinkRule rule_;
     std::set<Identity> entered_;
     // To folders: entered when all others were, so that a folder has the path where it lies.
     std::deque<std::pair<URL, Identity>> links_;
@@ -114,8 +130,8 @@ bool isContentName(const URL& url) {
 }
 
 void walkContent(const std::string& path, const std::function<void(const URL& item)>& item,
-                 const std::function<void(const Error& error)>& failed) {
-    Walk(item, failed).start(path);
+                 const std::function<void(const Error& error)>& failed, const WalkedLinks& links) {
+    Walk(URL::fileURLWithPath(path), item, failed, links).run();
 }
 
 }  // namespace qvct

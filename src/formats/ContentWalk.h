@@ -1,5 +1,6 @@
 #pragma once
 
+#include "formats/LinkRule.h"
 #include "platform/Error.h"
 #include "platform/Export.h"
 #include "platform/Url.h"
@@ -16,14 +17,23 @@ namespace qvct {
 /// all of its bytes tells whether one carries a record. Who names one can read it.
 QVCT_API bool isContentName(const URL& url);
 
+/// What a walk does with links, and whom it tells.
+struct WalkedLinks {
+    /// Who writes to the items should say none: else files outside of the folder are written to, too.
+    LinksOutside outside = LinksOutside::files;
+    /// Called for each link that is not followed; may be empty.
+    std::function<void(const URL& link)> passedOver;
+};
+
 /// Calls `item` for every content item at or below `path`, in the order of names.
 ///
-/// Folders are walked; a bundle is an item, what lies inside it is not. Links are followed, after all else,
-/// to folders that were not entered yet: each is entered once. A path that names a file itself is an item
-/// whatever its name. What cannot be read is reported to `failed`, and the walk goes on. Either function may
-/// be empty.
+/// Folders are walked; a bundle is an item, what lies inside it is not. Links to folders are followed as
+/// `links` says, after all else, to folders that were not entered yet: each is entered once. `path` itself is
+/// followed always, and when it names a file, that is an item whatever its name. What cannot be read is
+/// reported to `failed`, and the walk goes on. Each function may be empty.
 /// @cost  One listing a folder; files are looked at only where the file system does not tell their kind.
 QVCT_API void walkContent(const std::string& path, const std::function<void(const URL& item)>& item,
-                          const std::function<void(const Error& error)>& failed);
+                          const std::function<void(const Error& error)>& failed,
+                          const WalkedLinks& links = {});
 
 }  // namespace qvct

@@ -139,6 +139,50 @@ TEST(Autotag, CannotReadAFolderButGoesOn) {
     EXPECT_THAT(result.errors, HasSubstr("/a: Permission denied"));
 }
 
+TEST(Links, ThatLeadOutOfTheFolderAreFollowedOnRequest) {
+    namespace fs = std::filesystem;
+    const TemporaryFolder folder;
+    const std::string sound = Wav().file(Wav().format() + Wav().data());
+    for (const char* name :
+         {"in/a.wav", "in/.hidden/h.wav", "out/o.wav", "in-too/t.wav", "out/b.patch/#Root/x"})
+        folder.write(name, sound);
+    for (const auto& [link, target] : {std::pair("in/x", "../out"),
+                                       {"in/y", "../in-too"},
+                                       {"in/l.wav", "../out/o.wav"},
+                                       {"in/b.patch", "../out/b.patch"},
+                                       {"in/circle", "."},
+                                       {"in/stays", "../out/up/.hidden"},
+                                       {"out/up", "../in"},
+                                       {"named", "in"}})
+        fs::create_symlink(target, folder.path(link));
+    const auto walked = [&](std::vector<std::string> arguments, const std::string& start,
+                            const std::string& note) {
+        arguments.insert(arguments.end(), {"--json", folder.path(start)});
+        const ToolResult result = runTool(arguments);
+        EXPECT_EQ(result.status, 0) << result.errors;
+        EXPECT_EQ(result.errors.find("passed over") == std::string::npos, note.empty());
+        EXPECT_THAT(result.errors, HasSubstr(note));
+        std::vector<std::string> paths;
+        for (const json& item : result.json())
+            paths.push_back(fs::path(item["path"].get<std::string>()).lexically_relative(folder.path(start)));
+        return paths;
+    };
+    const std::string one = ": leads out of the folder and was passed over (one of ";
+    const std::string rest = " such links); --follow follows it";
+    for (const char* start : {"in", "named"}) {
+        EXPECT_THAT(walked({"write", "--add", "Source/Kick"}, start, "/b.patch" + one + "4" + rest),
+                    ElementsAre("a.wav", "stays/h.wav"));
+        for (const char* name : {"out/o.wav", "in-too/t.wav"}) EXPECT_EQ(readAll(folder.path(name)), sound);
+        EXPECT_THAT(walked({"read"}, start, "/x" + one + "2" + rest),
+                    ElementsAre("a.wav", "b.patch", "l.wav", "stays/h.wav"));
+    }
+    const std::vector<std::string> all = {"a.wav",     "b.patch", "l.wav",  "stays/h.wav",
+                                          "x/b.patch", "x/o.wav", "y/t.wav"};
+    EXPECT_EQ(walked({"read", "--follow"}, "in", ""), all);
+    EXPECT_EQ(walked({"write", "--add", "Source/Kick", "--follow"}, "in", ""), all);
+    EXPECT_NE(readAll(folder.path("out/o.wav")), sound);
+}
+
 TEST(Keywords, CountsLabels) {
     const ToolResult result = runTool({"keywords", "Drum Kit", "--json"});
     EXPECT_EQ(result.json()["Drum Kit"], 2);  // as a key it yields others and itself, as a label itself

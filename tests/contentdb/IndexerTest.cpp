@@ -242,6 +242,7 @@ TEST_F(Indexing, TakesNothingOutWhileADiskMayBeAway) {
         failures.clear();
         return index([&](IndexOptions& options) {
                    options.folders = {library(), disk};
+                   options.links.outside = LinksOutside::all;
                    options.prune = true;
                    options.pruneRoots = roots;
                    options.failed = [&](const Error& error) { failures.push_back(error.message); };
@@ -746,8 +747,22 @@ TEST_F(Indexing, EntersFoldersThatLinkToEachOtherOnceAndByTheirOwnNames) {
         std::filesystem::create_directory_symlink(folder_.path("elsewhere"),
                                                   fmt::format("{}/{}/far", library(), a));
     }
+    std::filesystem::create_symlink(folder_.path("elsewhere/Far.wav"), library() + "/Link.wav");
     settle();
-    EXPECT_EQ(index().seen, letters.size() + 1);
+    std::size_t passedOver = 0;
+    const auto walked = [&](LinksOutside outside) {
+        passedOver = 0;
+        return index([&](IndexOptions& options) {
+                   options.links = {outside, [&](const URL& /*link*/) { ++passedOver; }};
+               })
+            .seen;
+    };
+    EXPECT_EQ(walked(LinksOutside::none), letters.size());
+    EXPECT_EQ(passedOver, letters.size() + 1);
+    EXPECT_EQ(walked(LinksOutside::files), letters.size() + 1);
+    EXPECT_EQ(passedOver, letters.size());
+    EXPECT_EQ(walked(LinksOutside::all), letters.size() + 2);
+    EXPECT_EQ(passedOver, 0U);
     const auto database = ContentDatabase::open(this->database());
     for (const char a : letters) EXPECT_TRUE(database->item(fmt::format("{}/{}/Kick.wav", library(), a)));
     EXPECT_TRUE(database->item(library() + "/a/far/Far.wav"));
