@@ -4,6 +4,7 @@
 #include "platform/FileAccess.h"
 #include "platform/Text.h"
 
+#include <bit>
 #include <charconv>
 #include <cmath>
 #include <filesystem>
@@ -33,9 +34,8 @@ bool readSignature(const std::string& text, RhythmRequest& request) {
     if (topStatus != std::errc{} || slash == end || *slash != '/') return false;
     const auto [rest, bottomStatus] = std::from_chars(slash + 1, end, bottom);
     constexpr std::int32_t most = 64;
-    if (bottomStatus != std::errc{} || rest != end || top < 1 || bottom < 1 || top > most || bottom > most) {
-        return false;
-    }
+    const bool isNote = bottom >= 1 && bottom <= most && std::has_single_bit(static_cast<unsigned>(bottom));
+    if (bottomStatus != std::errc{} || rest != end || top < 1 || top > most || !isNote) return false;
     request.signatureTop = top;
     request.signatureBottom = bottom;
     return true;
@@ -61,6 +61,11 @@ Json jsonOf(const std::string& path, const RhythmResult& result) {
     json["beatCount"] = result.beatCount;
     json["tempo"] = rounded(result.tempo);
     json["signature"] = fmt::format("{}/{}", result.signatureTop, result.signatureBottom);
+    json["reasonForZero"] = result.reasonForZero.empty() ? Json() : Json(result.reasonForZero);
+    json["allTracks"] = Json();
+    if (const auto& all = result.allTracks)
+        json["allTracks"] = {
+            {"tracks", all->count}, {"density", all->density}, {"complexity", all->complexity}};
     return json;
 }
 
@@ -77,6 +82,10 @@ void printRow(const std::string& path, const RhythmResult& result) {
           printable(path), bar(result.density), static_cast<double>(result.density) * 100,
           bar(result.complexity), static_cast<double>(result.complexity) * 100, result.onsets.size(),
           result.beatCount, result.signatureTop, result.signatureBottom, rounded(result.tempo));
+    if (!result.reasonForZero.empty()) print("  complexity 0%: {}\n", result.reasonForZero);
+    if (const auto& all = result.allTracks)
+        print("  first of {} tracks; all together: density {:.0f}%, complexity {:.0f}%\n", all->count,
+              double{all->density} * 100, double{all->complexity} * 100);
 }
 
 bool beginsLikeSvg(const std::string& path) {

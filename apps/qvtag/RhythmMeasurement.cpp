@@ -1,7 +1,6 @@
 #include "RhythmMeasurement.h"
 
-#include "analysis/AudioTransientComplexity.h"
-#include "analysis/MetricWeights.h"
+#include "analysis/LoopRhythm.h"
 #include "platform/AudioDecoder.h"
 #include "platform/LCFileParser.h"
 #include "platform/MidiSequence.h"
@@ -26,6 +25,7 @@ struct Metre {
     std::int32_t bottom = 0;
 
     double beatsPerQuarter() const { return bottom / 4.0; }
+    LoopMetre ofLoop() const { return {static_cast<float>(tempo), beats, top, bottom}; }
 };
 
 bool failFor(Error* error, const URL& url, std::string_view reason) {
@@ -52,21 +52,27 @@ Metre metreOf(const LCFileData* data) {
             data->signatureBottom()};
 }
 
-/// Every note of every track, in the order of their starts, in beats.
-std::vector<Note> notesOf(const MidiSequence& sequence, double beatsPerQuarter) {
+/// What all tracks together give; nothing when no other than the first has notes.
+std::optional<RhythmResult::AllTracks> measuredTogether(const MidiSequence& sequence, const Metre& metre) {
+    RhythmResult::AllTracks all;
     std::vector<Note> notes;
     for (const MidiTrack& track : sequence.tracks()) {
+        all.count += track.notes.empty() ? 0 : 1;
         for (const MidiNote& note : track.notes)
-            notes.push_back(
-                {note.start * beatsPerQuarter, note.end() * beatsPerQuarter, note.pitch, note.velocity});
+            notes.push_back({note.start, note.end(), note.pitch, note.velocity});
     }
+    if (all.count < 2) return std::nullopt;
     std::stable_sort(notes.begin(), notes.end(),
                      [](const Note& a, const Note& b) { return a.startTime < b.startTime; });
-    return notes;
+    const auto analysis = analysisOf(notes, metre.ofLoop());
+    all.density = analysis->computeRhythmicDensity();
+    all.complexity = analysis->computeRhythmicComplexity();
+    return all;
 }
 
-std::optional<RhythmResult> measured(const URL& url, const std::vector<Note>& notes, const Metre& metre,
-                                     Error* error) {
+/// `beatsPerUnit` is what a unit of the notes' times is in beats.
+std::optional<RhythmResult> measured(const URL& url, const std::vector<Note>& notes, double beatsPerUnit,
+                                     const Metre& metre, Error* error) {
     if (metre.beats < 1 || metre.beats > kMostBeats) {
         failFor(error, url,
                 fmt::format("a loop of {} beats cannot be measured; 1 to {} can", metre.beats, kMostBeats));
@@ -76,14 +82,13 @@ std::optional<RhythmResult> measured(const URL& url, const std::vector<Note>& no
         failFor(error, url, "nothing sounds in it");
         return std::nullopt;
     }
-    const auto analysis = QVCTMidiAnalysis::initWithTempo(static_cast<float>(metre.tempo), metre.beats,
-                                                          metre.top, metre.bottom);
-    for (const Note& note : notes) analysis->addNote(note);
+    const auto analysis = analysisOf(notes, metre.ofLoop());
     RhythmDetail detail;
     RhythmResult result;
     result.complexity = analysis->computeRhythmicComplexity(&detail);
     result.density = analysis->computeRhythmicDensity();
-    for (const Note& note : analysis->notes()) result.onsets.push_back(note.startTime);
+    result.reasonForZero = detail.reasonForZero;
+    for (const Note& note : notes) result.onsets.push_back(note.startTime * beatsPerUnit);
     result.beatCount = metre.beats;
     result.tempo = metre.tempo;
     result.signatureTop = metre.top;
@@ -98,7 +103,7 @@ std::optional<RhythmResult> measured(const URL& url, const std::vector<Note>& no
     plot.density = result.density;
     plot.complexity = result.complexity;
     plot.notes = analysis->notes();
-    plot.onsets = result.onsets;
+    for (const Note& note : analysis->notes()) plot.onsets.push_back(note.startTime);
     plot.divisions = detail.divisions;
     plot.levelScores = detail.levelScores;
     for (const float weakness : analysis->getSyncopationMask()) plot.metricWeights.push_back(1 - weakness);
@@ -115,13 +120,19 @@ std::optional<RhythmResult> measureMidi(const URL& url, const MidiSequence& sequ
     }
     applyRequest(request, metre);
     if (metre.beats == 0) metre.beats = wholeBars(sequence.endOfNotes(), metre);
-    const auto notes = notesOf(sequence, metre.beatsPerQuarter());
+    const auto notes = notesOfFirstTrack(sequence);
+    if (notes.empty() && sequence.endOfNotes() > 0) {
+        failFor(error, url, "nothing sounds in its first track, which is the one that is measured");
+        return std::nullopt;
+    }
     if (notes.empty() && !sequence.problems().empty()) {
         failFor(error, url, "nothing sounds in it: " + join(sequence.problems(), "; "));
         return std::nullopt;
     }
-    auto result = measured(url, notes, metre, error);
-    if (result) result->problems = sequence.problems();
+    auto result = measured(url, notes, metre.beatsPerQuarter(), metre, error);
+    if (!result) return result;
+    result->allTracks = measuredTogether(sequence, metre);
+    result->problems = sequence.problems();
     return result;
 }
 
@@ -169,7 +180,7 @@ std::optional<RhythmResult> measureAudio(const URL& url, Metre metre, const Rhyt
     }
     if (metre.tempo == 0) metre.tempo = metre.beats / minutes / metre.beatsPerQuarter();
     auto result =
-        measured(url, notesOfOnsets(OnsetDetector::detect(*decoder), frames, metre.beats), metre, error);
+        measured(url, notesOfOnsets(OnsetDetector::detect(*decoder), frames, metre.beats), 1, metre, error);
     if (result) result->plot.waveform = waveformOf(url.path());
     return result;
 }
@@ -182,7 +193,7 @@ std::optional<RhythmResult> measureRhythm(const URL& url, const RhythmRequest& r
         return sequence ? measureMidi(url, *sequence, {}, request, error) : std::nullopt;
     }
     const auto data = LCFileParser::fileParserForURL(url)->enhancedFileData();
-    if (data && !data->midiData().empty()) {
+    if (data && data->tavioLoopType() != 0 && !data->midiData().empty()) {
         const auto sequence = MidiSequence::parse(data->midiData());
         if (sequence && !sequence->tracks().empty()) {
             return measureMidi(url, *sequence, metreOf(data.get()), request, error);

@@ -24,20 +24,30 @@ struct RhythmRequest {
 };
 
 struct RhythmResult {
+    // What the tagging service gives a loop of these notes, tempo, length and signature.
     float density = 0;
     float complexity = 0;
+    std::string reasonForZero;   ///< Why the complexity is 0; empty where it is not.
     std::vector<double> onsets;  ///< Beats.
     std::int32_t beatCount = 0;
     double tempo = 0;  ///< Quarter notes a minute.
     std::int32_t signatureTop = 4;
     std::int32_t signatureBottom = 4;
+    /// The same of the notes of all tracks, where more than the first one have some.
+    struct AllTracks {
+        std::size_t count = 0;  ///< Of the tracks with notes.
+        float density = 0;
+        float complexity = 0;
+    };
+    std::optional<AllTracks> allTracks;
     std::vector<std::string> problems;  ///< What is damaged in the MIDI, and was left out.
     RhythmPlot plot;
 };
 
-/// Measures a MIDI file, a loop with MIDI inside, or any sound that can be decoded. What neither the request
-/// nor the file tells is derived: the beats from tempo and length, the signature as 4/4. Nothing, and an
-/// error, when the length in beats cannot be known or nothing sounds.
+/// Measures a MIDI file, a loop with MIDI inside, or any sound that can be decoded, as the tagging service
+/// does: by the notes of the first track where there is MIDI, unless a loop says that it is one of sound
+/// alone. What neither the request nor the file tells is derived: the beats from tempo and length, the
+/// signature as 4/4. Nothing, and an error, when the length in beats cannot be known or nothing sounds.
 std::optional<RhythmResult> measureRhythm(const URL& url, const RhythmRequest& request, Error* error);
 
 }  // namespace qvct::tool

@@ -8,7 +8,7 @@
 
 namespace qvct {
 
-/// What a picture of a loop's rhythm shows. All times are in beats of the loop.
+/// What a picture of a loop's rhythm shows. Times are those that were measured.
 struct RhythmPlot {
     /// The lowest and highest sample of one slice of the loop, [-1, 1].
     struct Peak {

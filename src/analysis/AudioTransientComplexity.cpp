@@ -11,9 +11,6 @@
 namespace qvct {
 namespace {
 
-constexpr std::int32_t kPitch = 60;
-constexpr std::int32_t kVelocity = 127;
-
 // An editor's markers at the edges of a loop stand for the edges, not for sounds.
 std::vector<std::int64_t> withoutEdges(std::vector<std::int64_t> markers, std::int64_t frames) {
     if (!markers.empty() && markers.back() == frames) markers.pop_back();
@@ -23,20 +20,6 @@ std::vector<std::int64_t> withoutEdges(std::vector<std::int64_t> markers, std::i
 
 }  // namespace
 
-std::vector<Note> notesOfOnsets(std::span<const std::int64_t> onsets, std::int64_t frames,
-                                std::int32_t beatCount) {
-    std::vector<Note> notes;
-    const std::int64_t framesPerBeat = beatCount == 0 ? 0 : frames / beatCount;
-    if (framesPerBeat <= 0) return notes;
-    const float beatsPerFrame = 1.0F / static_cast<float>(framesPerBeat);
-    notes.reserve(onsets.size());
-    for (const std::int64_t onset : onsets) {
-        const double beat = static_cast<double>(static_cast<float>(onset) * beatsPerFrame);
-        notes.push_back({beat, beat, kPitch, kVelocity});
-    }
-    return notes;
-}
-
 bool AudioTransientComplexity::computeRhythmicDensityAndComplexityUsingTransients(const URL& url,
                                                                                   bool withNewAnalysis) {
     if (alreadyComputed_) return true;
@@ -44,7 +27,7 @@ bool AudioTransientComplexity::computeRhythmicDensityAndComplexityUsingTransient
     if (extension != "aif" && extension != "caf") return false;
     const auto data = LCFileParser::fileParserForURL(url)->enhancedFileData();
     if (!data) return false;
-    const LoopMetre metre{data->bpm(), data->beatCount(), data->signatureTop(), data->signatureBottom()};
+    const auto metre = LoopMetre::of(*data);
     if (!metre.isMeasured()) return false;
 
     const auto decoder = AudioDecoder::open(url.path());
@@ -63,9 +46,7 @@ bool AudioTransientComplexity::computeRhythmicDensityAndComplexity(std::span<con
     const std::vector<Note> notes = notesOfOnsets(onsets, frames, metre.beatCount);
     if (notes.empty()) return false;
 
-    const auto analysis = QVCTMidiAnalysis::initWithTempo(metre.bpm, metre.beatCount, metre.signatureTop,
-                                                          metre.signatureBottom);
-    for (const Note& note : notes) analysis->addNote(note);
+    const auto analysis = analysisOf(notes, metre);
     complexity_ = analysis->computeRhythmicComplexity();
     density_ = analysis->computeRhythmicDensity();
     alreadyComputed_ = true;

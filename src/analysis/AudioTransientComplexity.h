@@ -1,33 +1,12 @@
 #pragma once
 
-#include "analysis/Note.h"
+#include "analysis/LoopRhythm.h"
 #include "platform/Url.h"
 
 #include <cstdint>
 #include <span>
-#include <vector>
 
 namespace qvct {
-
-/// Tempo, length and signature of a loop.
-struct LoopMetre {
-    float bpm = 0;
-    std::int32_t beatCount = 0;
-    std::int32_t signatureTop = 0;
-    std::int32_t signatureBottom = 0;
-
-    /// Whether the rhythm of such a loop is graded: tempo, length and signature are known, and a bar has
-    /// neither 5 nor 7 beats.
-    bool isMeasured() const {
-        return bpm != 0 && beatCount != 0 && signatureTop != 0 && signatureBottom != 0 && signatureTop != 5 &&
-               signatureTop != 7;
-    }
-};
-
-/// Onsets at sample-frame positions as notes of equal loudness, in single precision; none where a beat has no
-/// frames.
-std::vector<Note> notesOfOnsets(std::span<const std::int64_t> onsets, std::int64_t frames,
-                                std::int32_t beatCount);
 
 /// Rhythmic density and complexity of an audio loop: its onsets are measured as notes of equal loudness.
 ///

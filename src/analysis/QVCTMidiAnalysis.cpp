@@ -10,6 +10,7 @@
 #include <cstddef>
 #include <limits>
 #include <string>
+#include <utility>
 
 #include <fmt/format.h>
 
@@ -140,9 +141,16 @@ float QVCTMidiAnalysis::syncopation(const std::vector<Note>& reduced) const {
 }
 
 float QVCTMidiAnalysis::computeRhythmicComplexity(RhythmDetail* detail) {
-    RhythmDetail ignored;
-    RhythmDetail& found = detail ? *detail : ignored;
-    found = {};
+    RhythmDetail found;
+    const float complexity = measureComplexity(found);
+    if (detail) {
+        if (complexity == 0) found.reasonForZero = reasonForZero(found);
+        *detail = std::move(found);
+    }
+    return complexity;
+}
+
+float QVCTMidiAnalysis::measureComplexity(RhythmDetail& found) {
     if (notes_.empty()) return 0;
     adjustNoteTimesToZero();
     found.notes = reducedNotes();
@@ -152,6 +160,23 @@ float QVCTMidiAnalysis::computeRhythmicComplexity(RhythmDetail* detail) {
     found.syncopation = syncopation(found.notes);
     const float sum = found.selfDissimilarity + found.syncopation;
     return sum > 0 ? std::min(sum, 1.0F) : 0;  // A sum that is not a number is 0.
+}
+
+std::string QVCTMidiAnalysis::reasonForZero(const RhythmDetail& found) const {
+    if (notes_.empty()) return "there are no notes";
+    if (hasNoMeasuredMetre(timeSigTop_)) return fmt::format("bars of {} beats are not graded", timeSigTop_);
+    if (beatCount_ > kLongestLoop) return fmt::format("it is longer than {} beats", kLongestLoop);
+    const auto bar = metricWeightsOfBar(timeSigTop_, timeSigBottom_);
+    if (bar.empty()) return fmt::format("bars of {} beats have no metric weights", timeSigTop_);
+    if (beatCount_ < timeSigTop_ || beatCount_ % timeSigTop_ != 0)
+        return fmt::format("{} beats are no whole bars of {}/{}", beatCount_, timeSigTop_, timeSigBottom_);
+    if (timeSigBottom_ == 0 || bar.size() != static_cast<std::size_t>(32 / timeSigBottom_ * timeSigTop_))
+        return fmt::format("bars of {}/{} have no metric weights", timeSigTop_, timeSigBottom_);
+    if (std::isnan(found.selfDissimilarity))
+        return fmt::format("{} beats do not divide into halves and thirds down to an eighth of a beat",
+                           beatCount_);
+    if (std::isnan(found.syncopation)) return "no note starts in a cell that has a metric weight";
+    return "its parts are alike, and its notes are soft or on strong beats";
 }
 
 std::vector<float> QVCTMidiAnalysis::getSyncopationMask() const {

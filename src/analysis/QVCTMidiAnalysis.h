@@ -4,6 +4,7 @@
 
 #include <cstdint>
 #include <memory>
+#include <string>
 #include <vector>
 
 namespace qvct {
@@ -17,6 +18,8 @@ struct RhythmDetail {
     float selfDissimilarity = 0;
     /// What the metric weights add, [-0.2, 0.2]; not a number where they do not cover the loop.
     float syncopation = 0;
+    /// Why the complexity is 0, in words for a person; empty where it is not.
+    std::string reasonForZero;
 };
 
 /// Rhythmic density and complexity of the notes of one loop.
@@ -75,6 +78,8 @@ class QVCTMidiAnalysis {
     std::vector<Note> reducedNotes() const;
     float selfDissimilarity(RhythmDetail& detail) const;
     float syncopation(const std::vector<Note>& reduced) const;
+    float measureComplexity(RhythmDetail& found);
+    std::string reasonForZero(const RhythmDetail& found) const;
 
     std::vector<Note> notes_;
     float bpm_;

@@ -22,14 +22,11 @@ TagDictionarySet QVCTRhythmicTaggingService::tagsForValues(float density, float 
 
 TagDictionarySet QVCTRhythmicTaggingService::tagsFromMidiIfExisting(const LCFileData& fileData) const {
     const auto sequence = MidiSequence::parse(fileData.midiData());
-    if (!sequence || sequence->tracks().empty()) return {};
-    const LoopMetre metre{fileData.bpm(), fileData.beatCount(), fileData.signatureTop(),
-                          fileData.signatureBottom()};
-    const auto& notes = sequence->tracks().front().notes;
+    if (!sequence) return {};
+    const auto metre = LoopMetre::of(fileData);
+    const auto notes = notesOfFirstTrack(*sequence);
     if (notes.empty() || !metre.isMeasured()) return {};
-    const auto analysis = QVCTMidiAnalysis::initWithTempo(metre.bpm, metre.beatCount, metre.signatureTop,
-                                                          metre.signatureBottom);
-    for (const MidiNote& note : notes) analysis->addNote({note.start, note.end(), note.pitch, note.velocity});
+    const auto analysis = analysisOf(notes, metre);
     const float density = analysis->computeRhythmicDensity();
     return tagsForValues(density, analysis->computeRhythmicComplexity());
 }

@@ -37,6 +37,7 @@ TEST(QVCTMidiAnalysis, AgreesWithTheGoldenValuesToTheLastBit) {
         RhythmDetail detail;
         EXPECT_EQ(analysis->computeRhythmicComplexity(&detail), golden.complexity);
         EXPECT_EQ(analysis->computeRhythmicDensity(), golden.density);
+        EXPECT_EQ(detail.reasonForZero.empty(), golden.complexity > 0) << detail.reasonForZero;
         ASSERT_EQ(detail.levelScores.size(), golden.levelScores.size());
         for (std::size_t i = 0; i < detail.levelScores.size(); ++i) {
             EXPECT_THAT(detail.levelScores[i],

@@ -1,9 +1,15 @@
+#include "analysis/LoopRhythm.h"
+#include "analysis/QVCTRhythmicTaggingService.h"
 #include "demo/Library.h"
+#include "platform/LCFileParser.h"
+#include "platform/LCFileWriter.h"
 #include "support/AudioFixtures.h"
 #include "support/Corpus.h"
 #include "support/RunTool.h"
 
 #include <cmath>
+#include <map>
+#include <tuple>
 
 #include <gmock/gmock.h>
 #include <sys/stat.h>
@@ -33,17 +39,47 @@ std::string midi(const std::vector<unsigned>& sixteenths, const std::string& fac
 /// Tempo 100 and 3/4, as events at the start.
 const std::string kFacts = std::string("\0\xFF\x51\x03\x09\x27\xC0\0\xFF\x58\x04\x03\x02\x18\x08", 15);
 
-/// Clicks at these frames in a 16-bit mono WAV of two seconds, with tempo facts if asked for.
-std::string clicks(const std::vector<std::size_t>& frames, const std::string& facts = {}) {
+/// Clicks at these frames of two seconds in 16 bits, one channel.
+std::string samplesOfClicks(const std::vector<std::size_t>& frames,
+                            std::string (*number)(std::uint64_t, std::size_t)) {
     std::string samples(2 * 88200, '\0');
     for (const std::size_t frame : frames) {
         for (unsigned i = 0; i < 1000; ++i) {
             const double value = 20000 * std::sin(0.3 * i) * std::exp(-0.005 * i);
-            samples.replace((frame + i) * 2, 2, little(static_cast<std::uint64_t>(std::llround(value)), 2));
+            samples.replace((frame + i) * 2, 2, number(static_cast<std::uint64_t>(std::llround(value)), 2));
         }
     }
+    return samples;
+}
+
+/// The same as a WAV, with tempo facts if asked for.
+std::string clicks(const std::vector<std::size_t>& frames, const std::string& facts = {}) {
     const Wav wav;
-    return wav.file(wav.format(1) + facts + wav.chunk("data", samples));
+    return wav.file(wav.format(1) + facts + wav.chunk("data", samplesOfClicks(frames, little)));
+}
+
+/// A loop of that type and metre which holds notes beside its sound.
+std::string writeLoop(const std::string& path, int type, const LoopMetre& metre, const std::string& notes) {
+    std::ofstream(path, std::ios::binary)
+        << Aiff::file(Aiff::common(1, 88200) +
+                      Aiff::chunk("SSND", big(0, 8) + samplesOfClicks({0, 11025, 33075, 66150}, big)));
+    const URL url = URL::fileURLWithPath(path);
+    const auto data = LCFileParser::fileParserForURL(url)->fileData();
+    data->setTavioLoopType(type);
+    data->setBpm(metre.bpm);
+    data->setBeatCount(metre.beatCount);
+    data->setSignatureTop(metre.signatureTop);
+    data->setSignatureBottom(metre.signatureBottom);
+    data->setMidiData({notes.begin(), notes.end()});
+    EXPECT_TRUE(LCFileWriter::fileWriterForURL(url)->writeFileData(data)) << path;
+    return path;
+}
+
+/// Several one-track files in one.
+std::string together(const std::vector<std::string>& files) {
+    std::string all = "MThd" + big(6, 4) + big(1, 2) + big(files.size(), 2) + big(96, 2);
+    for (const std::string& file : files) all += file.substr(14);
+    return all;
 }
 
 ToolResult rhythm(std::vector<std::string> arguments) {
@@ -85,6 +121,92 @@ TEST(RhythmCommand, TakesTempoMetreAndLengthFromAMidiFileOrTheOptions) {
     EXPECT_EQ(bare["tempo"], 120.0);
     EXPECT_EQ(bare["beatCount"], 8);
     EXPECT_THAT(runTool({"rhythm", file}).output, HasSubstr("4 onsets in 6 beats of 3/4 at 100 bpm\n"));
+}
+
+/// How many of the files the tagging service grades; each as the tool does.
+std::size_t expectAgreement(const std::vector<std::string>& files) {
+    std::size_t graded = 0;
+    std::map<std::string, json> measured;
+    for (const json& item : rhythm(files).json()) measured[item["path"]] = item;
+    for (const std::string& file : files) {
+        const URL url = URL::fileURLWithPath(file);
+        const TagDictionarySet tags = QVCTRhythmicTaggingService().tagsWithContentsOfURL(
+            url, nullptr, nullptr, LCFileParser::fileParserForURL(url)->enhancedFileData(),
+            QVCTAutoTaggingOptionRhythm);
+        graded += tags.empty() ? 0 : 1;
+        for (const TagDictionary& tag : tags) {
+            const bool isDensity = *tag.value(kTagDictionaryLabelKey)->string() == "Rhythmic Density";
+            const json& item = measured[file];
+            EXPECT_EQ(item[isDensity ? "density" : "complexity"],
+                      *tag.value(kTagDictionaryLevelKey)->doubleValue())
+                << file << item;
+        }
+    }
+    return graded;
+}
+
+TEST(RhythmCommand, GivesTheNumbersOfTheTaggingService) {
+    const TemporaryFolder folder;
+    const std::string one = midi({0, 3, 6, 10, 17, 22}), other = midi({0, 2, 4, 5, 8, 12, 13});
+    std::vector<std::string> files;
+    std::size_t graded = 0;
+    for (const int type : {-1, 0, 1, 2}) {
+        for (const auto& [top, bottom] : {std::pair(4, 4), {3, 4}, {6, 8}, {12, 8}, {2, 2}, {5, 4}, {7, 8}}) {
+            for (const std::string& notes :
+                 {one, together({one, other}), together({other, one}), together({emptyMidi(), one, other})}) {
+                const std::string name = std::to_string(files.size()) + ".aif";
+                files.push_back(writeLoop(folder.path(name), type, {120, 2 * top, top, bottom}, notes));
+                graded += type >= 0 && top != 5 && top != 7 ? 1 : 0;
+            }
+        }
+    }
+    EXPECT_EQ(expectAgreement(files), graded);
+}
+
+TEST(RhythmCommand, GivesTheNumbersOfTheTaggingServiceForTheCorpus) {
+    QVCT_SKIP_WITHOUT(corpus("midi"));
+    const TemporaryFolder folder;
+    std::vector<std::string> files;
+    for (const std::string& file : filesBelow(corpus("midi"))) {
+        if (!file.ends_with(".mid")) continue;
+        for (const LoopMetre& metre : {LoopMetre{120, 16, 4, 4}, {90, 24, 6, 8}}) {
+            const std::string name = std::to_string(files.size()) + ".aif";
+            files.push_back(writeLoop(folder.path(name), 1, metre, readAll(file)));
+        }
+    }
+    EXPECT_GT(expectAgreement(files), 200U);
+}
+
+TEST(RhythmCommand, TellsWhatMoreItKnows) {
+    const TemporaryFolder folder;
+    const std::string sparse = midi({0, 8}), dense = midi({0, 1, 2, 3, 4, 5, 6, 7, 8, 9, 10, 11, 12, 13});
+    const std::string both = folder.write("both.mid", together({sparse, dense}));
+    const json alone = rhythm({folder.write("alone.mid", sparse), "--beats", "4"}).json()[0];
+    const json item = rhythm({both, "--beats", "4"}).json()[0];
+    EXPECT_EQ(alone["allTracks"], json());
+    for (const char* key : {"density", "complexity", "onsets"}) EXPECT_EQ(item[key], alone[key]) << key;
+    EXPECT_EQ(item["allTracks"]["tracks"], 2);
+    EXPECT_GT(item["allTracks"]["density"], item["density"]);
+    EXPECT_THAT(runTool({"rhythm", both}).output, HasSubstr("\n  first of 2 tracks; all together: density "));
+    EXPECT_THAT(rhythm({folder.write("late.mid", together({emptyMidi(), emptyMidi(), sparse}))}).errors,
+                HasSubstr("late.mid: nothing sounds in its first track"));
+
+    const std::string file = folder.write("a.mid", midi({0, 3, 6, 10}));
+    EXPECT_EQ(rhythm({file}).json()[0]["reasonForZero"], json());
+    for (const auto& [beats, signature, reason] :
+         {std::tuple("5", "5/4", "bars of 5 beats are not graded"),
+          {"7", "7/8", "bars of 7 beats are not graded"},
+          {"8", "8/8", "bars of 8 beats have no metric weights"},
+          {"6", "4/4", "6 beats are no whole bars of 4/4"},
+          {"2", "4/4", "2 beats are no whole bars of 4/4"},
+          {"4", "4/8", "bars of 4/8 have no metric weights"},
+          {"20", "4/4", "20 beats do not divide into halves and thirds down to an eighth of a beat"}}) {
+        const json zero = rhythm({file, "--beats", beats, "--signature", signature}).json()[0];
+        EXPECT_EQ(zero["complexity"], 0) << reason;
+        EXPECT_EQ(zero["reasonForZero"], reason);
+    }
+    EXPECT_THAT(runTool({"rhythm", file, "--signature", "5/4"}).output,
+                HasSubstr("\n  complexity 0%: bars of 5 beats are not graded\n"));
 }
 
 TEST(RhythmCommand, ABarPlayedSeveralTimesIsAsDenseAsOnce) {
@@ -229,6 +351,8 @@ TEST(RhythmCommand, NamesWhatCannotBeMeasuredAndDoesTheRest) {
                                                   {"--tempo", "0"},
                                                   {"--tempo", "nan"},
                                                   {"--signature", "0/4"},
+                                                  {"--signature", "4/3"},
+                                                  {"--signature", "4/128"},
                                                   {"--signature", "4"}}) {
         const ToolResult result = rhythm({good, words[0], words[1]});
         EXPECT_EQ(result.status, 2) << words[0] << words[1];
