@@ -7,6 +7,7 @@
 #include "formats/bundle/TGRTBundleTypeValidators.h"
 #include "formats/settings/TGRTBinaryFileMetaDataReader.h"
 #include "platform/EditLock.h"
+#include "platform/FileAccess.h"
 #include "platform/Text.h"
 
 #include <algorithm>
@@ -124,12 +125,24 @@ bool carryOut(Change& change, const Options& options, ToolContext& context, Erro
     return true;
 }
 
+/// Whether the record beside or in an item is a link to elsewhere, which would be written to in its place.
+bool leadsAway(const std::string& record, const URL& url) {
+    if (record == url.path()) return false;  // an item that is a link itself was decided on by the walk
+    const URL folder = isDirectory(url.path()) ? url : url.URLByDeletingLastPathComponent();
+    return !LinkRule(folder.path(), LinksOutside::none).follows(record, false);
+}
+
 /// Reads, changes and writes an item in its turn; once more when another program saves it meanwhile.
 std::optional<Change> editItem(const URL& url, const TaggingEdit& edit, const Options& options,
                                ToolContext& context) {
     Error error;
     const auto turn = EditLock::acquire(url.path(), &error);
     const std::string record = TGRTFileNode::nodeWithFileURL(url)->recordURL().path();
+    if (options.links != LinksOutside::all && leadsAway(record, url)) {
+        context.itemFailed(fmt::format("{}: leads out of its folder, and is written to only with --follow",
+                                       printable(record)));
+        return std::nullopt;
+    }
     constexpr int kAttempts = 10;
     for (int attempt = 0; turn && attempt < kAttempts; ++attempt) {
         const FileStamp former = FileStamp::ofFile(record);

@@ -6,10 +6,10 @@
 namespace qvct {
 namespace {
 
-/// The path without links; empty when it leads nowhere.
+/// The path without links, as far as it exists; empty when that cannot be told.
 std::string resolved(const std::string& path) {
     std::error_code failure;
-    return std::filesystem::canonical(path, failure).string();
+    return std::filesystem::weakly_canonical(path, failure).string();
 }
 
 }  // namespace

@@ -1,3 +1,4 @@
+#include "formats/TGRTFileNode.h"
 #include "support/AudioFixtures.h"
 #include "support/RunTool.h"
 
@@ -181,6 +182,28 @@ TEST(Links, ThatLeadOutOfTheFolderAreFollowedOnRequest) {
     EXPECT_EQ(walked({"read", "--follow"}, "in", ""), all);
     EXPECT_EQ(walked({"write", "--add", "Source/Kick", "--follow"}, "in", ""), all);
     EXPECT_NE(readAll(folder.path("out/o.wav")), sound);
+}
+
+TEST(Links, OfRecordsThatLeadAwayAreWrittenToOnRequest) {
+    namespace fs = std::filesystem;
+    const TemporaryFolder folder;
+    const std::string foreign = runTool({"taxonomy", "export", "plist"}).output;
+    for (const char* item : {"in/Bass.cst", "in/Pad.patch"}) {
+        const std::string path = folder.path(item);
+        item == std::string("in/Pad.patch") ? folder.write("in/Pad.patch/x", "") : folder.write(item, "");
+        ASSERT_EQ(runTool({"write", "--add", "Source/Kick", path}).status, 0);
+        const std::string record =
+            TGRTFileNode::nodeWithFileURL(URL::fileURLWithPath(path))->recordURL().path();
+        const std::string target = folder.write("out/foreign.plist", foreign);
+        fs::remove(record);
+        fs::create_symlink(target, record);
+        const ToolResult refused = runTool({"write", "--add", "Source/Kick", path});
+        EXPECT_EQ(refused.status, 1) << item;
+        EXPECT_THAT(refused.errors, HasSubstr(record + ": leads out of its folder"));
+        EXPECT_EQ(readAll(target), foreign) << item;
+        EXPECT_EQ(runTool({"write", "--add", "Source/Kick", "--follow", path}).status, 0) << item;
+        EXPECT_NE(readAll(target), foreign) << item;
+    }
 }
 
 TEST(Keywords, CountsLabels) {
