@@ -5,10 +5,10 @@
 #include "contentdb/StoreWriter.h"
 #include "contentdb/Terms.h"
 #include "platform/FileAccess.h"
+#include "platform/FileReplacement.h"
 #include "platform/Text.h"
 
 #include <algorithm>
-#include <filesystem>
 #include <map>
 #include <memory>
 #include <set>
@@ -121,11 +121,9 @@ bool mergeDatabases(const std::vector<std::string>& databases, const std::string
         Merge(databases, unfinished).run();
         return true;
     });
-    std::error_code failure;
-    if (isDone) std::filesystem::rename(unfinished, target, failure);
-    if (failure) fail(error, kErrorUnwritable, fmt::format("{}: {}", printable(target), failure.message()));
-    if (!isDone || failure) removeDatabase(unfinished);
-    return isDone && !failure;
+    if (isDone && renameFlushed(unfinished, target, error)) return true;
+    removeDatabase(unfinished);
+    return false;
 }
 
 }  // namespace qvct::contentdb

@@ -55,6 +55,11 @@ void flushFolder(const std::string& folder) {
     if (descriptor.isOpen()) ::fsync(descriptor.number());
 }
 
+std::string folderOf(const std::string& path) {
+    const std::size_t slash = path.rfind('/');
+    return slash == std::string::npos ? "./" : path.substr(0, slash + 1);
+}
+
 /// A user's attributes must come along; labels that the system guards are its own affair.
 bool isOptionalAttribute(std::string_view name) {
     return name.starts_with("security.") || name.starts_with("trusted.");
@@ -124,8 +129,7 @@ class Replacement {
         std::error_code notThere;
         const std::filesystem::path resolved = std::filesystem::canonical(path, notThere);
         target_ = notThere ? path : resolved.string();
-        const std::size_t slash = target_.rfind('/');
-        folder_ = slash == std::string::npos ? "./" : target_.substr(0, slash + 1);
+        folder_ = folderOf(target_);
     }
 
     bool run(std::span<const FilePiece> pieces) {
@@ -314,6 +318,12 @@ bool replaceFileByPieces(const std::string& path, std::span<const FilePiece> pie
         return fail(error, kErrorInvalidArgument, fmt::format("{}: is no file URL", printable(path)));
     }
     return Replacement(path, options, error).run(pieces);
+}
+
+bool renameFlushed(const std::string& from, const std::string& to, Error* error) {
+    if (::rename(from.c_str(), to.c_str()) != 0) return failWithErrno(error, from, "cannot be moved");
+    flushFolder(folderOf(to));
+    return true;
 }
 
 }  // namespace qvct

@@ -50,4 +50,8 @@ struct FileReplacementOptions {
 bool replaceFileByPieces(const std::string& path, std::span<const FilePiece> pieces,
                          const FileReplacementOptions& options = {}, Error* error = nullptr);
 
+/// Renames a file whose contents have been flushed, over another one if there is any, and flushes the folder,
+/// so that it stands there after a crash, too. Both paths lie in the same folder.
+bool renameFlushed(const std::string& from, const std::string& to, Error* error = nullptr);
+
 }  // namespace qvct
