@@ -18,7 +18,7 @@ namespace {
 std::optional<PropertyList::Dictionary> parseStoredDictionary(const std::string& bytes, Error* error) {
     if (bytes.empty()) return PropertyList::Dictionary{};
     Error reason;
-    auto value = parsePropertyList(bytes, &reason);
+    auto value = parsePropertyList(bytes, &reason, PropertyListUse::rewriting);
     if (value && value->dictionary() != nullptr) return std::move(*value->dictionary());
     fail(error, kErrorMalformed,
          fmt::format("not written over, since what is there cannot be read ({})",

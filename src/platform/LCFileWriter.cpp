@@ -26,7 +26,7 @@ bool isReadable(const Container& container, Error* error) {
     if (chunk == nullptr || chunk->size == 0) return true;
     const auto bytes = container.recordBytes();
     Error reason;
-    const auto record = bytes ? parsePropertyList(*bytes, &reason) : std::nullopt;
+    const auto record = bytes ? parsePropertyList(*bytes, &reason, PropertyListUse::rewriting) : std::nullopt;
     if (record && record->dictionary() != nullptr) return true;
     return failAt(error, *chunk,
                   fmt::format("holds a record that cannot be read and is kept ({})",

@@ -1,8 +1,12 @@
 #include "platform/PropertyListFile.h"
 
 #include "platform/FileAccess.h"
+#include "platform/OldStylePropertyList.h"
+#include "platform/PropertyListBuilder.h"
+#include "platform/PropertyListEncoding.h"
 #include "platform/PropertyListGuard.h"
 #include "platform/Text.h"
+#include "platform/XmlParsing.h"
 
 #include <algorithm>
 #include <array>
@@ -10,7 +14,8 @@
 #include <cstring>
 #include <limits>
 #include <memory>
-#include <unordered_set>
+#include <utility>
+#include <vector>
 
 #include <fmt/format.h>
 #include <plist/plist.h>
@@ -67,54 +72,9 @@ PropertyList integer(plist_t node) {
     return static_cast<std::int64_t>(bits);
 }
 
-PropertyList valueOf(plist_t node);
-
-/// XML has no element for a UID: it is a dictionary with this one key.
-constexpr std::string_view kUidKey = "CF$UID";
-
-PropertyList uidOr(PropertyList::Dictionary dictionary) {
-    const PropertyList* value = dictionary.size() == 1 ? dictionary.value(kUidKey) : nullptr;
-    const std::int64_t* uid = value == nullptr ? nullptr : value->signedInteger();
-    if (uid != nullptr && *uid >= 0) return PropertyList::Uid{static_cast<std::uint64_t>(*uid)};
-    return dictionary;
-}
-
-/// Of a key that comes twice the first value holds: a second one could not be written again.
-PropertyList dictionary(plist_t node) {
-    PropertyList::Dictionary result;
-    std::unordered_set<std::string> seen;
-    plist_dict_iter raw = nullptr;
-    plist_dict_new_iter(node, &raw);
-    const std::unique_ptr<void, decltype(&std::free)> iterator(raw, std::free);
-    while (true) {
-        char* rawKey = nullptr;
-        plist_t value = nullptr;
-        plist_dict_next_item(node, raw, &rawKey, &value);
-        const std::unique_ptr<char, decltype(&std::free)> key(rawKey, std::free);
-        if (value == nullptr) return uidOr(std::move(result));
-        const std::string name = key ? key.get() : "";
-        if (seen.insert(name).second) result.append(name, valueOf(value));
-    }
-}
-
-PropertyList array(plist_t node) {
-    PropertyList::Array result;
-    plist_array_iter raw = nullptr;
-    plist_array_new_iter(node, &raw);
-    const std::unique_ptr<void, decltype(&std::free)> iterator(raw, std::free);
-    for (plist_t item = nullptr;; result.push_back(valueOf(item))) {
-        plist_array_next_item(node, raw, &item);
-        if (item == nullptr) return result;
-    }
-}
-
-PropertyList valueOf(plist_t node) {
+PropertyList leaf(plist_t node) {
     std::uint64_t length = 0;
     switch (plist_get_node_type(node)) {
-        case PLIST_DICT:
-            return dictionary(node);
-        case PLIST_ARRAY:
-            return array(node);
         case PLIST_UINT:
             return integer(node);
         case PLIST_DATE:
@@ -145,7 +105,60 @@ PropertyList valueOf(plist_t node) {
     }
 }
 
-Node nodeOf(const PropertyList& value, PropertyListFormat format);
+/// The library's tree as a value of ours.
+class TreeReader {
+  public:
+    PropertyList read(plist_t root) {
+        enter(root);
+        while (!open_.empty()) {
+            if (plist_t child = nextChild()) {
+                enter(child);
+            } else {
+                open_.pop_back();
+                builder_.close();
+            }
+        }
+        return builder_.take();
+    }
+
+  private:
+    /// A container whose children are being read.
+    struct Visit {
+        plist_t node;
+        std::unique_ptr<void, decltype(&std::free)> iterator;
+    };
+
+    void enter(plist_t node) {
+        void* iterator = nullptr;
+        if (PLIST_IS_DICT(node)) {
+            plist_dict_new_iter(node, &iterator);
+            builder_.openDictionary();
+        } else if (PLIST_IS_ARRAY(node)) {
+            plist_array_new_iter(node, &iterator);
+            builder_.openArray();
+        } else {
+            return builder_.add(leaf(node));
+        }
+        open_.push_back({node, {iterator, std::free}});
+    }
+
+    plist_t nextChild() {
+        const Visit& visit = open_.back();
+        plist_t child = nullptr;
+        if (builder_.isInDictionary()) {
+            char* key = nullptr;
+            plist_dict_next_item(visit.node, visit.iterator.get(), &key, &child);
+            const std::unique_ptr<char, decltype(&std::free)> owned(key, std::free);
+            builder_.key(key == nullptr ? "" : key);
+        } else {
+            plist_array_next_item(visit.node, visit.iterator.get(), &child);
+        }
+        return child;
+    }
+
+    std::vector<Visit> open_;
+    PropertyListBuilder builder_;
+};
 
 /// A value as the library reads it from a binary list with this one object: the only way to hand it a date of
 /// more than 32 bits of seconds, a negative number or an unsigned one above the signed range.
@@ -170,21 +183,18 @@ std::string bigEndian(std::uint64_t bits) {
     return bytes;
 }
 
-Node containerNode(const PropertyList& value, PropertyListFormat format) {
-    if (const PropertyList::Array* items = value.array()) {
-        Node node(plist_new_array());
-        for (const PropertyList& item : *items)
-            plist_array_append_item(node.get(), nodeOf(item, format).release());
-        return node;
-    }
+/// XML has no element for a UID: it is a dictionary with the key kUidKey.
+Node nodeOfUid(std::uint64_t uid, PropertyListFormat format) {
+    if (format == PropertyListFormat::binary) return Node(plist_new_uid(uid));
     Node node(plist_new_dict());
-    for (const PropertyList::Entry& entry : *value.dictionary()) {
-        plist_dict_set_item(node.get(), entry.key.c_str(), nodeOf(entry.value, format).release());
-    }
+    plist_dict_set_item(node.get(), PropertyListBuilder::kUidKey.data(), plist_new_uint(uid));
     return node;
 }
 
+/// The value as the library has it; a container without what it holds.
 Node nodeOf(const PropertyList& value, PropertyListFormat format) {
+    if (value.array() != nullptr) return Node(plist_new_array());
+    if (value.dictionary() != nullptr) return Node(plist_new_dict());
     if (const bool* flag = value.boolean()) return Node(plist_new_bool(*flag ? 1 : 0));
     if (const double* number = value.real()) return Node(plist_new_real(*number));
     if (const std::uint64_t* number = value.unsignedInteger()) {
@@ -195,113 +205,197 @@ Node nodeOf(const PropertyList& value, PropertyListFormat format) {
         return *number < 0 ? nodeOfObject(kIntegerMarker + bigEndian(bits)) : Node(plist_new_uint(bits));
     }
     if (const std::string* text = value.string()) return Node(plist_new_string(text->c_str()));
-    if (const PropertyList::Uid* uid = value.uid()) {
-        if (format == PropertyListFormat::binary) return Node(plist_new_uid(uid->value));
-        return nodeOf(PropertyList::Dictionary{{std::string(kUidKey), uid->value}}, format);
-    }
+    if (const PropertyList::Uid* uid = value.uid()) return nodeOfUid(uid->value, format);
     if (const PropertyList::Date* when = value.date()) {
         return nodeOfObject(kDateMarker +
                             bigEndian(std::bit_cast<std::uint64_t>(when->secondsSinceReferenceDate)));
     }
-    if (const PropertyList::Data* bytes = value.data()) {
-        return Node(plist_new_data(reinterpret_cast<const char*>(bytes->data()), bytes->size()));
-    }
-    return containerNode(value, format);
+    const PropertyList::Data& bytes = *value.data();
+    return Node(plist_new_data(reinterpret_cast<const char*>(bytes.data()), bytes.size()));
 }
 
-/// The years that XML can spell, 0001 to 9999.
-constexpr double kFirstDate = -63114076800.0;
-constexpr double kLastDate = 252423993599.0;
-
-bool isValidText(std::string_view text, Error* error) {
-    return isValidUtf8(text) || fail(error, kErrorMalformed, "property list: a text is not valid Unicode");
+/// The whole value as a tree of the library's.
+Node treeOf(const PropertyList& value, PropertyListFormat format) {
+    Node root = nodeOf(value, format);
+    std::vector<std::pair<const PropertyList*, plist_t>> pending = {{&value, root.get()}};
+    while (!pending.empty()) {
+        const auto [container, node] = pending.back();
+        pending.pop_back();
+        if (const PropertyList::Array* items = container->array()) {
+            for (const PropertyList& item : *items) {
+                pending.emplace_back(&item, nodeOf(item, format).release());
+                plist_array_append_item(node, pending.back().second);
+            }
+        }
+        if (const PropertyList::Dictionary* entries = container->dictionary()) {
+            for (const PropertyList::Entry& entry : *entries) {
+                pending.emplace_back(&entry.value, nodeOf(entry.value, format).release());
+                plist_dict_set_item(node, entry.key.c_str(), pending.back().second);
+            }
+        }
+    }
+    return root;
 }
 
-bool holdsOnlyValidLeaves(const PropertyList& value, Error* error) {
-    if (const std::string* text = value.string()) return isValidText(*text, error);
-    if (const PropertyList::Date* when = value.date()) {
-        const bool inRange =
-            when->secondsSinceReferenceDate >= kFirstDate && when->secondsSinceReferenceDate <= kLastDate;
-        return inRange || fail(error, kErrorMalformed, "property list: a date outside the years 1 to 9999");
-    }
-    if (const PropertyList::Array* items = value.array()) {
-        return std::all_of(items->begin(), items->end(),
-                           [error](const PropertyList& item) { return holdsOnlyValidLeaves(item, error); });
-    }
-    if (const PropertyList::Dictionary* entries = value.dictionary()) {
-        return std::all_of(entries->begin(), entries->end(), [error](const PropertyList::Entry& entry) {
-            return isValidText(entry.key, error) && holdsOnlyValidLeaves(entry.value, error);
-        });
-    }
-    return true;
-}
-
-/// Whether the text can be read back: the library ends texts at their first NUL and does not mind what is not
-/// Unicode, nor that XML knows no other control characters than tab and line ends and neither U+FFFE nor
-/// U+FFFF.
-bool isTextStorable(std::string_view text, PropertyListFormat format) {
-    if (text.find('\0') != std::string_view::npos || !isValidUtf8(text)) return false;
-    if (format == PropertyListFormat::binary) return true;
+/// Why a text could not be read back, or null: the library ends texts at their first NUL and does not mind
+/// what is not Unicode, nor that XML knows no other control characters than tab and line ends and neither
+/// U+FFFE nor U+FFFF.
+const char* textFault(std::string_view text, PropertyListFormat format) {
+    if (text.find('\0') != std::string_view::npos) return "a text with a NUL character";
+    if (!isValidUtf8(text)) return "a text that is not valid Unicode";
+    if (format == PropertyListFormat::binary) return nullptr;
     const bool hasControl = std::any_of(text.begin(), text.end(), [](char c) {
         return static_cast<unsigned char>(c) < 0x20 && c != '\t' && c != '\n' && c != '\r';
     });
-    return !hasControl && text.find("\xEF\xBF\xBE") == std::string_view::npos &&
-           text.find("\xEF\xBF\xBF") == std::string_view::npos;
+    const bool isForbidden = hasControl || text.find("\xEF\xBF\xBE") != std::string_view::npos ||
+                             text.find("\xEF\xBF\xBF") != std::string_view::npos;
+    return isForbidden ? "a text with a character that XML forbids" : nullptr;
 }
 
-bool isStorable(const PropertyList& value, PropertyListFormat format) {
-    if (const std::string* text = value.string()) return isTextStorable(*text, format);
-    if (const PropertyList::Array* items = value.array()) {
-        return std::all_of(items->begin(), items->end(),
-                           [format](const PropertyList& item) { return isStorable(item, format); });
+/// Why a value without what it holds could not be read back, or null.
+const char* leafFault(const PropertyList& value, PropertyListFormat format) {
+    if (const std::string* text = value.string()) return textFault(*text, format);
+    const PropertyList::Date* when = value.date();
+    return when == nullptr || isPropertyListDate(when->secondsSinceReferenceDate)
+               ? nullptr
+               : "a date outside of the years 1 to 9999";
+}
+
+bool isStorable(const PropertyList& root, PropertyListFormat format, Error* error) {
+    std::vector<std::pair<const PropertyList*, int>> pending = {{&root, 0}};
+    const auto refuse = [error](ErrorCode code, std::string reason) {
+        return fail(error, code, "no property list can hold " + std::move(reason));
+    };
+    while (!pending.empty()) {
+        const auto [value, depth] = pending.back();
+        pending.pop_back();
+        if (const char* fault = leafFault(*value, format)) return refuse(kErrorInvalidArgument, fault);
+        const PropertyList::Array* items = value->array();
+        const PropertyList::Dictionary* entries = value->dictionary();
+        if ((items != nullptr || entries != nullptr) && depth == kDeepestPropertyList) {
+            return refuse(kErrorTooLarge, fmt::format("more than {} levels", kDeepestPropertyList));
+        }
+        if (items != nullptr) {
+            for (const PropertyList& item : *items) pending.emplace_back(&item, depth + 1);
+        }
+        if (entries == nullptr) continue;
+        for (const PropertyList::Entry& entry : *entries) {
+            if (const char* fault = textFault(entry.key, format)) return refuse(kErrorInvalidArgument, fault);
+            pending.emplace_back(&entry.value, depth + 1);
+        }
     }
-    const PropertyList::Dictionary* entries = value.dictionary();
-    return entries == nullptr ||
-           std::all_of(entries->begin(), entries->end(), [format](const PropertyList::Entry& entry) {
-               return isTextStorable(entry.key, format) && isStorable(entry.value, format);
-           });
+    return true;
 }
 
 bool isBinary(std::span<const std::uint8_t> bytes) {
     return bytes.size() >= 6 && std::memcmp(bytes.data(), "bplist", 6) == 0;
 }
 
+/// Whether it is meant as XML: a "<" that opens no data of the old text form.
+bool isXml(std::string_view text) {
+    const std::size_t start = std::min(text.find_first_not_of(" \t\r\n"), text.size());
+    if (!text.substr(start).starts_with('<')) return false;
+    const std::size_t end = text.find_first_not_of(" \t\r\n0123456789abcdefABCDEF", start + 1);
+    return end == std::string_view::npos || text[end] != '>';
+}
+
+/// Whether the XML library would compare too many attributes with each other. Few lists have so many
+/// characters that could each make one.
+bool hasManyAttributes(std::string_view text, Error* error) {
+    return std::count(text.begin(), text.end(), '=') > kMostXmlAttributes && !hasFewAttributes(text, error);
+}
+
+/// The first byte behind the root element that is none of blanks, zeros, comments and instructions.
+std::optional<std::size_t> remainder(std::string_view text, std::size_t end) {
+    constexpr std::string_view blanks(" \t\r\n\0", 5);
+    constexpr std::array<std::pair<std::string_view, std::string_view>, 2> passedOver = {
+        {{"<!--", "-->"}, {"<?", "?>"}}};
+    while ((end = text.find_first_not_of(blanks, end)) != std::string_view::npos) {
+        const auto* hit = std::find_if(passedOver.begin(), passedOver.end(), [&](const auto& pair) {
+            return text.substr(end).starts_with(pair.first);
+        });
+        const std::size_t close =
+            hit == passedOver.end() ? std::string_view::npos : text.find(hit->second, end);
+        if (close == std::string_view::npos) return end;
+        end = close + hit->second.size();
+    }
+    return std::nullopt;
+}
+
+std::optional<PropertyList> valueOf(const Node& tree, PropertyListFault& fault) {
+    if (tree) return TreeReader().read(tree.get());
+    fault = {kErrorMalformed, 0, "cannot be read"};
+    return std::nullopt;
+}
+
+std::optional<PropertyList> parseBinary(std::span<const std::uint8_t> bytes, PropertyListFault& fault) {
+    if (auto found = faultOfBinaryPropertyList(bytes)) {
+        fault = *std::move(found);
+        return std::nullopt;
+    }
+    plist_t node = nullptr;
+    plist_from_bin(reinterpret_cast<const char*>(bytes.data()), static_cast<std::uint32_t>(bytes.size()),
+                   &node);
+    return valueOf(Node(node), fault);
+}
+
+std::optional<PropertyList> parseXml(std::string_view text, PropertyListUse use, PropertyListFault& fault) {
+    std::size_t end = 0;
+    auto found = faultOfXmlPropertyList(text, end);
+    const auto behind = found || use == PropertyListUse::reading ? std::nullopt : remainder(text, end);
+    if (behind) found = {kErrorMalformed, *behind, "something behind the end, which would be lost"};
+    if (found) {
+        fault = *std::move(found);
+        return std::nullopt;
+    }
+    plist_t node = nullptr;
+    plist_from_xml(text.data(), static_cast<std::uint32_t>(end), &node);
+    return valueOf(Node(node), fault);
+}
+
+bool failAt(Error* error, std::string_view form, const PropertyListFault& fault, std::size_t offset) {
+    return fail(error, fault.code, fmt::format("{} property list, byte {}: {}", form, offset, fault.reason));
+}
+
 }  // namespace
 
-std::optional<PropertyList> parsePropertyList(std::span<const std::uint8_t> bytes, Error* error) {
+std::optional<PropertyList> parsePropertyList(std::span<const std::uint8_t> bytes, Error* error,
+                                              PropertyListUse use) {
     if (bytes.size() > kLargestWholeFile) {
         fail(error, kErrorTooLarge, fmt::format("property list of {} bytes", bytes.size()));
         return std::nullopt;
     }
-    const auto* data = reinterpret_cast<const char*>(bytes.data());
-    const auto length = static_cast<std::uint32_t>(bytes.size());
-    plist_t raw = nullptr;
+    PropertyListFault fault;
     if (isBinary(bytes)) {
-        if (!isSafeBinaryPropertyList(bytes, error)) return std::nullopt;
-        plist_from_bin(data, length, &raw);
-    } else {
-        if (!isSafeXmlPropertyList(bytes, error)) return std::nullopt;
-        plist_from_xml(data, length, &raw);
+        auto value = parseBinary(bytes, fault);
+        if (!value) failAt(error, "binary", fault, fault.offset);
+        return value;
     }
-    const Node node(raw);
-    if (!node) {
-        fail(error, kErrorMalformed, "neither an XML nor a binary property list");
+    const auto characters = PropertyListCharacters::decode(bytes, fault);
+    if (!characters) {
+        failAt(error, "text", fault, fault.offset);
         return std::nullopt;
     }
-    PropertyList value = valueOf(node.get());
-    if (!holdsOnlyValidLeaves(value, error)) return std::nullopt;
+    const bool isXmlForm = isXml(characters->text());
+    if (Error reason; isXmlForm && hasManyAttributes(characters->text(), &reason)) {
+        fail(error, static_cast<ErrorCode>(reason.code), "XML property list, " + reason.message);
+        return std::nullopt;
+    }
+    auto value = isXmlForm ? parseXml(characters->text(), use, fault)
+                           : parseOldStylePropertyList(characters->text(), fault);
+    if (!value) failAt(error, isXmlForm ? "XML" : "old-style", fault, characters->byteOffset(fault.offset));
     return value;
 }
 
-std::optional<PropertyList> parsePropertyList(std::string_view bytes, Error* error) {
+std::optional<PropertyList> parsePropertyList(std::string_view bytes, Error* error, PropertyListUse use) {
     return parsePropertyList(std::span(reinterpret_cast<const std::uint8_t*>(bytes.data()), bytes.size()),
-                             error);
+                             error, use);
 }
 
-std::string serializePropertyList(const PropertyList& value, PropertyListFormat format) {
-    if (!isStorable(value, format)) return {};
-    const Node node = nodeOf(value, format);
-    return format == PropertyListFormat::xml ? xml(node.get()) : binary(node.get());
+std::string serializePropertyList(const PropertyList& value, PropertyListFormat format, Error* error) {
+    if (!isStorable(value, format, error)) return {};
+    const Node tree = treeOf(value, format);
+    return format == PropertyListFormat::xml ? xml(tree.get()) : binary(tree.get());
 }
 
 std::optional<PropertyList> readPropertyListFile(const std::string& path, Error* error) {
@@ -325,9 +419,11 @@ std::optional<PropertyList::Dictionary> readDictionaryFile(const std::string& pa
 
 bool writePropertyListFile(const PropertyList& value, const std::string& path, PropertyListFormat format,
                            Error* error) {
-    const std::string bytes = serializePropertyList(value, format);
+    Error reason;
+    const std::string bytes = serializePropertyList(value, format, &reason);
     if (bytes.empty()) {
-        return fail(error, kErrorInvalidArgument, fmt::format("{}: not a property list", printable(path)));
+        return fail(error, static_cast<ErrorCode>(reason.code),
+                    fmt::format("{}: {}", printable(path), reason.message));
     }
     return replaceFile(path, bytes, error);
 }

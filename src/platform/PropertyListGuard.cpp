@@ -1,11 +1,12 @@
 #include "platform/PropertyListGuard.h"
 
 #include "platform/PropertyListFile.h"
+#include "platform/Text.h"
 
 #include <algorithm>
-#include <cstring>
-#include <limits>
+#include <bit>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 #include <fmt/format.h>
@@ -21,6 +22,7 @@ constexpr std::uint64_t kExpansionSlack = 1U << 16;
 /// What one object of a binary property list is, read without looking past the end.
 struct Object {
     enum class Kind { leaf, array, dictionary } kind = Kind::leaf;
+    std::size_t offset = 0;          // of its marker
     std::size_t textUnit = 0;        // bytes of a character; 0 for what is no text
     std::uint64_t count = 0;         // references of a container (keys and values of a dictionary)
     std::size_t firstReference = 0;  // offset of a container's references
@@ -30,9 +32,12 @@ struct Object {
 /// The object graph of a binary property list.
 class BinaryGraph {
   public:
-    BinaryGraph(std::span<const std::uint8_t> bytes, Error* error) : bytes_(bytes), error_(error) {}
+    explicit BinaryGraph(std::span<const std::uint8_t> bytes) : bytes_(bytes) {}
 
-    bool check() { return readTrailer() && walk(); }
+    std::optional<PropertyListFault> check() {
+        if (!readTrailer() || !walk()) return fault_;
+        return std::nullopt;
+    }
 
   private:
     /// Totals of an object with all that it holds.
@@ -50,8 +55,9 @@ class BinaryGraph {
     };
     enum class State : std::uint8_t { unseen, open, done };
 
-    bool refuse(ErrorCode code, std::size_t offset, std::string_view reason) {
-        return fail(error_, code, fmt::format("binary property list, byte {}: {}", offset, reason));
+    bool refuse(ErrorCode code, std::size_t offset, std::string reason) {
+        fault_ = {code, offset, std::move(reason)};
+        return false;
     }
 
     std::uint64_t bigEndian(std::size_t offset, std::size_t width) const {
@@ -61,7 +67,8 @@ class BinaryGraph {
     }
 
     bool readTrailer() {
-        if (bytes_.size() < kHeaderSize + kTrailerSize) return refuse(kErrorMalformed, 0, "is cut short");
+        if (bytes_.size() < kHeaderSize + kTrailerSize)
+            return refuse(kErrorMalformed, bytes_.size(), "is cut short");
         const std::size_t trailer = bytes_.size() - kTrailerSize;
         offsetWidth_ = bytes_[trailer + 6];
         referenceWidth_ = bytes_[trailer + 7];
@@ -83,13 +90,14 @@ class BinaryGraph {
 
     /// Reads the marker and length of an object; false when it does not lie inside the bytes.
     bool readObject(std::uint64_t index, Object& object) {
-        const std::uint64_t offset =
-            bigEndian(table_ + static_cast<std::size_t>(index) * offsetWidth_, offsetWidth_);
+        const std::size_t place = table_ + static_cast<std::size_t>(index) * offsetWidth_;
+        const std::uint64_t offset = bigEndian(place, offsetWidth_);
         if (offset < kHeaderSize || offset >= table_) {
-            return refuse(kErrorMalformed, table_,
+            return refuse(kErrorMalformed, place,
                           fmt::format("object {} at offset {} outside", index, offset));
         }
-        auto at = static_cast<std::size_t>(offset);
+        object.offset = static_cast<std::size_t>(offset);
+        std::size_t at = object.offset;
         const std::uint8_t marker = bytes_[at++];
         std::uint64_t length = marker & 0x0fU;
         const unsigned type = marker >> 4U;
@@ -100,10 +108,11 @@ class BinaryGraph {
 
     /// A length of 15 or more is an integer object of its own behind the marker.
     bool readLength(std::size_t& at, std::uint64_t& length) {
+        const std::size_t place = at;
         const std::uint8_t marker = bytes_[at++];  // at is at most the start of the offset table
         const std::size_t width = std::size_t{1} << (marker & 0x0fU);
         if (marker >> 4U != 0x1 || width > 8 || width > table_ - std::min(at, table_)) {
-            return refuse(kErrorMalformed, at, "impossible length");
+            return refuse(kErrorMalformed, place, "impossible length");
         }
         length = bigEndian(at, width);
         at += width;
@@ -141,17 +150,30 @@ class BinaryGraph {
                 object.kind = Object::Kind::dictionary;
                 break;
             default:
-                return refuse(kErrorMalformed, at - 1, fmt::format("unknown marker {:#x}", type));
+                return refuse(kErrorMalformed, object.offset, fmt::format("unknown marker {:#x}", type));
         }
-        if (length > available / unit) return refuse(kErrorMalformed, at - 1, "object longer than the file");
+        if (length > available / unit)
+            return refuse(kErrorMalformed, object.offset, "object longer than the file");
         object.firstReference = at;
         object.count = object.kind == Object::Kind::dictionary ? 2 * length : length;
         object.payload = object.kind == Object::Kind::leaf ? length * unit : 0;
-        const bool isUtf16 = type == 0x6;
-        object.textUnit = type == 0x5 || isUtf16 ? unit : 0;
-        if (isUtf16 && !isPairedUtf16(at, length))
+        object.textUnit = type == 0x5 || type == 0x6 ? unit : 0;
+        return checkLeaf(type, length, at);
+    }
+
+    bool checkLeaf(unsigned type, std::uint64_t length, std::size_t at) {
+        if (type == 0x5 && !isAscii(textAt(at, length)) && !isValidUtf8(textAt(at, length)))
+            return refuse(kErrorMalformed, at, "a text is not valid Unicode");
+        if (type == 0x6 && !isPairedUtf16(at, length))
             return refuse(kErrorMalformed, at, "half a surrogate pair");
+        const bool isDate = type == 0x3 && length == 8;
+        if (isDate && !isPropertyListDate(std::bit_cast<double>(bigEndian(at, 8))))
+            return refuse(kErrorMalformed, at, "a date outside the years 1 to 9999");
         return true;
+    }
+
+    std::string_view textAt(std::size_t at, std::uint64_t length) const {
+        return {reinterpret_cast<const char*>(bytes_.data()) + at, static_cast<std::size_t>(length)};
     }
 
     bool isPairedUtf16(std::size_t at, std::uint64_t units) const {
@@ -216,7 +238,7 @@ class BinaryGraph {
         }
         states_[static_cast<std::size_t>(index)] = State::open;
         if (open_.size() >= static_cast<std::size_t>(kDeepestPropertyList)) {
-            return refuse(kErrorTooLarge, object.firstReference, "nested too deeply");
+            return refuse(kErrorTooLarge, object.offset, "nested too deeply");
         }
         open_.push_back(Visit{index, object});
         return true;
@@ -243,7 +265,7 @@ class BinaryGraph {
     }
 
     std::span<const std::uint8_t> bytes_;
-    Error* error_;
+    PropertyListFault fault_;
     std::size_t offsetWidth_ = 0;
     std::size_t referenceWidth_ = 0;
     std::uint64_t objectCount_ = 0;
@@ -256,8 +278,8 @@ class BinaryGraph {
 
 }  // namespace
 
-bool isSafeBinaryPropertyList(std::span<const std::uint8_t> bytes, Error* error) {
-    return BinaryGraph(bytes, error).check();
+std::optional<PropertyListFault> faultOfBinaryPropertyList(std::span<const std::uint8_t> bytes) {
+    return BinaryGraph(bytes).check();
 }
 
 }  // namespace qvct

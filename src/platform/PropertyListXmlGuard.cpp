@@ -1,38 +1,44 @@
 #include "platform/PropertyListFile.h"
 #include "platform/PropertyListGuard.h"
+#include "platform/Text.h"
 
 #include <algorithm>
 #include <array>
 #include <charconv>
+#include <chrono>
 #include <memory>
 #include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
 
-#include <fmt/format.h>
 #include <libxml/parser.h>
 
 namespace qvct {
 namespace {
 
-enum class Element { plist, dictionary, array, key, text, integer, data, flag };
+enum class Element { plist, dictionary, array, key, text, integer, real, date, data, flag };
 
 std::optional<Element> elementNamed(std::string_view name) {
-    constexpr std::array<std::pair<std::string_view, Element>, 11> names = {{{"plist", Element::plist},
-                                                                             {"dict", Element::dictionary},
-                                                                             {"array", Element::array},
-                                                                             {"key", Element::key},
+    // The most frequent ones first.
+    constexpr std::array<std::pair<std::string_view, Element>, 11> names = {{{"key", Element::key},
                                                                              {"string", Element::text},
-                                                                             {"real", Element::text},
-                                                                             {"date", Element::text},
+                                                                             {"dict", Element::dictionary},
                                                                              {"integer", Element::integer},
-                                                                             {"data", Element::data},
+                                                                             {"real", Element::real},
                                                                              {"true", Element::flag},
-                                                                             {"false", Element::flag}}};
+                                                                             {"false", Element::flag},
+                                                                             {"array", Element::array},
+                                                                             {"date", Element::date},
+                                                                             {"data", Element::data},
+                                                                             {"plist", Element::plist}}};
     const auto* hit =
         std::find_if(names.begin(), names.end(), [name](const auto& entry) { return entry.first == name; });
     return hit == names.end() ? std::nullopt : std::optional(hit->second);
+}
+
+bool isScalar(Element element) {
+    return element == Element::integer || element == Element::real || element == Element::date;
 }
 
 bool isSpace(char c) {
@@ -44,73 +50,126 @@ bool isBase64(char c) {
            c == '/' || c == '=' || isSpace(c);
 }
 
+/// Takes a number from the front of the text. Whether there is one.
+template <typename Number, typename... Options>
+bool takeNumber(std::string_view& text, Number& number, Options... options) {
+    const auto [end, status] = std::from_chars(text.data(), text.data() + text.size(), number, options...);
+    text.remove_prefix(static_cast<std::size_t>(end - text.data()));
+    return status == std::errc{};
+}
+
 /// Whether it is a whole number, decimal or hexadecimal, that 64 bits hold.
 bool isInteger(std::string_view text) {
-    while (!text.empty() && isSpace(text.front())) text.remove_prefix(1);
-    while (!text.empty() && isSpace(text.back())) text.remove_suffix(1);
     const bool negative = text.starts_with('-');
     if (negative || text.starts_with('+')) text.remove_prefix(1);
     const bool hexadecimal = text.starts_with("0x") || text.starts_with("0X");
     if (hexadecimal) text.remove_prefix(2);
     std::uint64_t magnitude = 0;
-    const auto [end, status] =
-        std::from_chars(text.data(), text.data() + text.size(), magnitude, hexadecimal ? 16 : 10);
-    return status == std::errc{} && end == text.data() + text.size() &&
+    return takeNumber(text, magnitude, hexadecimal ? 16 : 10) && text.empty() &&
            (!negative || magnitude <= 1ULL << 63U);
 }
 
-/// Follows the events of the XML parser and says the first thing that no property list has.
+/// Whether it is a number, "inf" or "nan"; one out of range is as near as there is.
+bool isReal(std::string_view text) {
+    if (text.starts_with('+')) text.remove_prefix(1);
+    double number = 0;
+    const auto [end, status] = std::from_chars(text.data(), text.data() + text.size(), number);
+    return status != std::errc::invalid_argument && end == text.data() + text.size();
+}
+
+/// Whether it is a date and time such as "2001-12-31T23:59:59Z", in the range that is written, too.
+bool isDate(std::string_view text) {
+    std::array<unsigned, 6> fields{};
+    constexpr std::string_view separators = "--T::Z";
+    for (std::size_t i = 0; i < fields.size(); ++i) {
+        if (!takeNumber(text, fields[i]) || !text.starts_with(separators[i])) return false;
+        text.remove_prefix(1);
+    }
+    using namespace std::chrono;
+    const auto [y, m, d, hour, minute, second] = fields;
+    if (!text.empty() || y > 9999 || m > 12 || d > 31 || hour > 23 || minute > 59 || second > 60)
+        return false;
+    const year_month_day date(year(static_cast<int>(y)), month(m), day(d));
+    const duration<double> sinceReference =
+        sys_days(date) - sys_days(year(2001) / January / 1) + hours(hour) + minutes(minute) + seconds(second);
+    return date.ok() && isPropertyListDate(sinceReference.count());
+}
+
+/// Follows the events of the XML parser and says the first thing that no property list has. `where` tells the
+/// offset of an event's first byte, when it is asked.
 class Grammar {
   public:
-    void start(std::string_view name, bool isPrefixed) {
+    template <typename Where>
+    void start(std::string_view name, bool isPrefixed, Where where) {
         const auto element = isPrefixed ? std::nullopt : elementNamed(name);
-        if (!element) return refuse("an element that is none of a property list");
-        if (!mayStandHere(*element)) return refuse("an element where it may not stand");
-        if (open_.size() > static_cast<std::size_t>(kDeepestPropertyList)) {
-            tooDeep_ = true;
-            return refuse("nested too deeply");
+        if (!element) return refuse("an element that is none of a property list", where());
+        if (!mayStandHere(*element)) return refuse("an element where it may not stand", where());
+        const bool isContainer = *element == Element::dictionary || *element == Element::array;
+        if (isContainer && open_.size() > static_cast<std::size_t>(kDeepestPropertyList)) {
+            return refuse("nested too deeply", where(), kErrorTooLarge);
         }
         if (!open_.empty()) ++open_.back().children;
-        open_.push_back({*element, 0});
-        integer_.clear();
+        open_.push_back({*element, 0, isScalar(*element) ? where() : 0});
+        scalar_.clear();
     }
 
-    void text(std::string_view characters) {
+    template <typename Where>
+    void text(std::string_view characters, Where where) {
         if (open_.empty()) return;
         const Element element = open_.back().element;
-        if (element == Element::integer) integer_ += characters;
-        if (element == Element::data && !std::all_of(characters.begin(), characters.end(), isBase64)) {
-            refuse("data that is not base 64");
+        if (element == Element::key || element == Element::text) return;
+        if (isScalar(element)) {
+            scalar_ += characters;
+            return;
         }
-        const bool holdsText = element == Element::key || element == Element::text ||
-                               element == Element::integer || element == Element::data;
-        if (!holdsText && !std::all_of(characters.begin(), characters.end(), isSpace)) {
-            refuse("text between elements");
-        }
+        const bool isData = element == Element::data;
+        const auto fault =
+            std::find_if_not(characters.begin(), characters.end(), isData ? isBase64 : isSpace);
+        if (fault == characters.end()) return;
+        refuse(isData ? "data that is not base 64" : "text between elements",
+               where() + static_cast<std::size_t>(fault - characters.begin()));
     }
 
-    void end() {
+    template <typename Where>
+    void end(Where where) {
         const Open closed = open_.back();
         open_.pop_back();
-        if (closed.element == Element::dictionary && closed.children % 2 != 0) refuse("a key without value");
-        if (closed.element == Element::plist && closed.children == 0) refuse("no value");
-        if (closed.element == Element::integer && !isInteger(integer_))
-            refuse("not a whole number of 64 bits");
-        isComplete_ = open_.empty() && fault_.empty();
+        const std::string_view scalar =
+            isScalar(closed.element) ? trimBlanksAndLineBreaks(scalar_) : std::string_view{};
+        switch (closed.element) {
+            case Element::dictionary:
+                if (closed.children % 2 != 0) refuse("a key without value", where());
+                break;
+            case Element::plist:
+                if (closed.children == 0) refuse("no value", where());
+                break;
+            case Element::integer:
+                if (!isInteger(scalar)) refuse("not a whole number of 64 bits", closed.offset);
+                break;
+            case Element::real:
+                if (!isReal(scalar)) refuse("not a number", closed.offset);
+                break;
+            case Element::date:
+                if (!isDate(scalar)) refuse("not a date and time of the years 1 to 9999", closed.offset);
+                break;
+            default:
+                break;
+        }
+        isComplete_ = open_.empty() && !fault_;
     }
 
-    void refuse(std::string_view fault) {
-        if (fault_.empty()) fault_ = fault;
+    void refuse(std::string_view reason, std::size_t offset, ErrorCode code = kErrorMalformed) {
+        if (!fault_) fault_ = PropertyListFault{code, offset, std::string(reason)};
     }
 
     bool isComplete() const { return isComplete_; }
-    bool isTooDeep() const { return tooDeep_; }
-    const std::string& fault() const { return fault_; }
+    const std::optional<PropertyListFault>& fault() const { return fault_; }
 
   private:
     struct Open {
         Element element;
         std::size_t children;
+        std::size_t offset;  // of a scalar
     };
 
     bool mayStandHere(Element element) const {
@@ -130,57 +189,63 @@ class Grammar {
     }
 
     std::vector<Open> open_;
-    std::string integer_;
-    std::string fault_;
+    std::string scalar_;  // of a number or date
+    std::optional<PropertyListFault> fault_;
     bool isComplete_ = false;
-    bool tooDeep_ = false;
 };
 
 std::string_view view(const xmlChar* text) {
     return reinterpret_cast<const char*>(text);
 }
 
-/// The parser, fed at once and stopped at the first fault or at the end of the root element: what may stand
-/// behind it is nobody's business.
+/// The parser, fed at once and stopped at the first fault or at the end of the root element.
 class Parser {
   public:
-    Parser() {
+    explicit Parser(std::string_view text) : text_(text) {
         xmlSAXHandler handler{};
         handler.initialized = XML_SAX2_MAGIC;
         handler.startElementNs = [](void* self, const xmlChar* name, const xmlChar* prefix, const xmlChar*,
                                     int, const xmlChar**, int, int, const xmlChar**) {
-            tell(self, [&](Grammar& grammar) { grammar.start(view(name), prefix != nullptr); });
+            tell(self, [&](Parser& p) {
+                p.grammar_.start(view(name), prefix != nullptr, [&p] { return p.lastTag(); });
+            });
         };
         handler.endElementNs = [](void* self, const xmlChar*, const xmlChar*, const xmlChar*) {
-            tell(self, [](Grammar& grammar) { grammar.end(); });
+            tell(self, [](Parser& p) { p.grammar_.end([&p] { return p.lastTag(); }); });
         };
-        handler.characters = handler.cdataBlock = [](void* self, const xmlChar* text, int length) {
-            tell(self, [&](Grammar& grammar) {
-                grammar.text({reinterpret_cast<const char*>(text), static_cast<std::size_t>(length)});
+        handler.characters = handler.cdataBlock = [](void* self, const xmlChar* part, int length) {
+            tell(self, [&](Parser& p) {
+                p.grammar_.text({reinterpret_cast<const char*>(part), static_cast<std::size_t>(length)},
+                                [&] { return p.offsetOf(part); });
             });
         };
         // Entities of one's own multiply; nothing that writes property lists makes any.
         handler.entityDecl = [](void* self, const xmlChar*, int, const xmlChar*, const xmlChar*, xmlChar*) {
-            tell(self, [](Grammar& grammar) { grammar.refuse("an entity declaration"); });
+            tell(self, [](Parser& p) { p.grammar_.refuse("an entity declaration", p.lastTag()); });
         };
         handler.reference = [](void* self, const xmlChar*) {
-            tell(self, [](Grammar& grammar) { grammar.refuse("an unknown entity"); });
+            tell(self, [](Parser& p) { p.grammar_.refuse("an unknown entity", p.offset()); });
+        };
+        handler.serror = [](void* self, xmlErrorPtr error) {
+            auto& parser = *static_cast<Parser*>(self);
+            if (error->level != XML_ERR_FATAL || parser.isStopped_) return;
+            const bool isAboutATag = error->code == XML_ERR_TAG_NAME_MISMATCH;
+            parser.grammar_.refuse("not well-formed XML", isAboutATag ? parser.lastTag() : parser.offset());
+            parser.isStopped_ = true;  // the parser stops by itself, and must not be stopped amid an error
         };
         context_.reset(xmlCreatePushParserCtxt(&handler, this, nullptr, 0, nullptr));
-        // Its own limit of depth lies below ours.
-        if (context_) xmlCtxtUseOptions(context_.get(), XML_PARSE_NONET | XML_PARSE_HUGE);
+        // Its own limit of depth lies below ours; the encoding is known, and not always the declared one.
+        if (context_)
+            xmlCtxtUseOptions(context_.get(), XML_PARSE_NONET | XML_PARSE_HUGE | XML_PARSE_IGNORE_ENC);
     }
 
-    const Grammar& parse(std::span<const std::uint8_t> bytes) {
-        if (!context_) return grammar_;
-        xmlParseChunk(context_.get(), reinterpret_cast<const char*>(bytes.data()),
-                      static_cast<int>(bytes.size()), 1);
-        if (context_->wellFormed == 0 && !isStopped_) grammar_.refuse("not well-formed XML");
-        return grammar_;
+    std::optional<PropertyListFault> parse(std::size_t& end) {
+        if (context_) xmlParseChunk(context_.get(), text_.data(), static_cast<int>(text_.size()), 1);
+        end = stoppedAt_;
+        if (grammar_.isComplete()) return std::nullopt;
+        if (grammar_.fault()) return grammar_.fault();
+        return PropertyListFault{kErrorMalformed, text_.size(), "it ends too early"};
     }
-
-    /// About where the parser stopped.
-    long offset() const { return context_ ? xmlByteConsumed(context_.get()) : 0; }
 
   private:
     struct Deleter {
@@ -194,26 +259,47 @@ class Parser {
     static void tell(void* self, Event event) {
         auto& parser = *static_cast<Parser*>(self);
         if (parser.isStopped_) return;
-        event(parser.grammar_);
-        if (parser.grammar_.fault().empty() && !parser.grammar_.isComplete()) return;
+        event(parser);
+        if (!parser.grammar_.fault() && !parser.grammar_.isComplete()) return;
         parser.isStopped_ = true;
+        parser.stoppedAt_ = parser.offset();
         xmlStopParser(parser.context_.get());
     }
 
+    /// How far the parser has come.
+    std::size_t offset() const {
+        const long consumed = xmlByteConsumed(context_.get());
+        return std::min(static_cast<std::size_t>(std::max(consumed, 0L)), text_.size());
+    }
+
+    /// Where the tag begins that the parser has just read.
+    std::size_t lastTag() const {
+        const std::size_t here = offset();
+        const std::size_t tag = here == 0 ? std::string_view::npos : text_.rfind('<', here - 1);
+        return tag == std::string_view::npos ? here : tag;
+    }
+
+    /// Where the characters stand that the parser hands out: mostly in its input, else just before.
+    std::size_t offsetOf(const xmlChar* characters) const {
+        const xmlParserInput& input = *context_->input;
+        if (characters >= input.base && characters < input.end)
+            return offset() - static_cast<std::size_t>(input.cur - characters);
+        const std::size_t here = offset();
+        const std::size_t tag = here == 0 ? std::string_view::npos : text_.rfind('>', here - 1);
+        return tag == std::string_view::npos ? here : tag + 1;
+    }
+
+    std::string_view text_;
     Grammar grammar_;
     bool isStopped_ = false;
+    std::size_t stoppedAt_ = 0;
     std::unique_ptr<xmlParserCtxt, Deleter> context_;
 };
 
 }  // namespace
 
-bool isSafeXmlPropertyList(std::span<const std::uint8_t> bytes, Error* error) {
-    Parser parser;
-    const Grammar& grammar = parser.parse(bytes);
-    if (grammar.isComplete()) return true;
-    return fail(error, grammar.isTooDeep() ? kErrorTooLarge : kErrorMalformed,
-                fmt::format("XML property list, byte {}: {}", parser.offset(),
-                            grammar.fault().empty() ? "it ends too early" : grammar.fault()));
+std::optional<PropertyListFault> faultOfXmlPropertyList(std::string_view text, std::size_t& end) {
+    return Parser(text).parse(end);
 }
 
 }  // namespace qvct

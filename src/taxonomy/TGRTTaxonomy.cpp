@@ -39,6 +39,29 @@ TGRTTaxonomy::TagPointer findInCategory(const TGRTCategory& category, const TGRT
     return only != nullptr && hasParentLabel(*only, parentLabel) ? only->shared_from_this() : nullptr;
 }
 
+/// A tag of a property list that is still to be made, with what lies below it.
+struct TagToCreate {
+    std::string label;
+    const PropertyList* value;
+    TGRTTaxonomy::TagPointer parent;
+};
+
+/// Puts the entries on top, the first sibling last.
+void pushSiblings(const PropertyList::Dictionary& dictionary, const TGRTTaxonomy::TagPointer& parent,
+                  std::vector<TagToCreate>& pending) {
+    std::vector<std::string> labels;
+    std::unordered_map<std::string_view, const PropertyList*> values;
+    for (const auto& [label, value] : dictionary) {
+        labels.push_back(label);
+        values.try_emplace(label, &value);
+    }
+    labels = TGRTTaxonomy::sortedTagLabelsFromArray(std::move(labels));
+    for (auto label = labels.rbegin(); label != labels.rend(); ++label) {
+        const PropertyList* value = values.at(*label);
+        pending.push_back({std::move(*label), value, parent});
+    }
+}
+
 }  // namespace
 
 std::shared_ptr<TGRTTaxonomy> TGRTTaxonomy::init() {
@@ -129,21 +152,19 @@ std::shared_ptr<TGRTTaxonomy> TGRTTaxonomy::taxonomyWithDictionary(
 std::vector<TGRTTaxonomy::TagPointer> TGRTTaxonomy::tagsFromDictionary(
     const PropertyList::Dictionary& dictionary, const TagPointer& parentTag,
     const CategoryPointer& category) {
-    std::vector<std::string> labels;
-    std::unordered_map<std::string_view, const PropertyList*> values;
-    for (const auto& [label, value] : dictionary) {
-        labels.push_back(label);
-        values.try_emplace(label, &value);
-    }
     std::vector<TagPointer> tags;
-    for (const std::string& label : sortedTagLabelsFromArray(std::move(labels))) {
-        tags.push_back(TGRTTag::initWithLabel(label, parentTag, category));
-        const TagPointer tag = tags.back();
-        const PropertyList& value = *values.at(label);
-        std::vector<TagPointer> below;
-        if (const auto* children = value.dictionary()) below = tagsFromDictionary(*children, tag, category);
-        if (const auto* leaves = value.array()) below = tagsFromArray(*leaves, tag, category);
-        tags.insert(tags.end(), below.begin(), below.end());
+    std::vector<TagToCreate> pending;
+    pushSiblings(dictionary, parentTag, pending);
+    while (!pending.empty()) {
+        const TagToCreate next = std::move(pending.back());
+        pending.pop_back();
+        const TagPointer tag = TGRTTag::initWithLabel(next.label, next.parent, category);
+        tags.push_back(tag);
+        if (const auto* children = next.value->dictionary()) pushSiblings(*children, tag, pending);
+        if (const auto* leaves = next.value->array()) {
+            const auto below = tagsFromArray(*leaves, tag, category);
+            tags.insert(tags.end(), below.begin(), below.end());
+        }
     }
     return tags;
 }
@@ -292,7 +313,9 @@ std::uint64_t TGRTTaxonomy::revision() const {
 PropertyList::Dictionary TGRTTaxonomy::dictionary() const {
     PropertyList::Dictionary categories;
     for (const auto& category : categories_) categories.set(category->identifier(), category->dictionary());
-    return {{std::string(kCategoriesKey), std::move(categories)}};
+    PropertyList::Dictionary root;
+    root.set(kCategoriesKey, std::move(categories));  // moved: the list may be deep
+    return root;
 }
 
 bool TGRTTaxonomy::writeToURL(const URL& url, Error* error) const {

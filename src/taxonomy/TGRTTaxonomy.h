@@ -38,7 +38,8 @@ class QVCT_API QVContentTaggingTaxonomy {
     virtual const ObjectSet<TGRTCategory>& categories() const = 0;
     virtual Localization localizationDictionary() const = 0;
     virtual std::string localizedStrings() const = 0;
-    /// Writes the property list. False, and an error, when it cannot be written.
+    /// Writes the property list. False, and an error, when it cannot be written: to a URL that is no file's,
+    /// or with tags nested so deep that the property list would exceed kDeepestPropertyList.
     virtual bool writeToURL(const URL& url, Error* error = nullptr) const = 0;
     virtual std::string serializedTaxonomyData() const = 0;
 };

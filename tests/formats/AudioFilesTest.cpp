@@ -59,6 +59,7 @@ TEST(LoopReader, AddsOldKeywordsOnDemand) {
     const TemporaryFolder folder;
     const std::string path = writeOldLoop(folder);
     const std::vector<std::string> today = {"Genres/House"};
+    // Without a level: not "=0.00".
     const std::vector<std::string> legacy = {"LoopDescriptors/Cheerful", "LoopDescriptors/Dark"};
     const std::vector<std::string> mapped = {"Sound Descriptors/Bright / Dark=0.80",
                                              "Sound Descriptors/Happy"};

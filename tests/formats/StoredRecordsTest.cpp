@@ -268,6 +268,7 @@ TEST(PluginTaggings, NameThePlugInsThatAreNotBypassed) {
     const auto taggings = TGRTPatchMetaDataReader::pluginTaggingsForURL(urlOf(folder.path("a.patch")));
     EXPECT_TRUE(TGRTPatchMetaDataReader::pluginTaggingsForURL(urlOf(folder.path("b.patch"))).empty());
     setLogHandler(former);
+    // Without a level: not "=0.00".
     EXPECT_THAT(textsOf(taggings), ElementsAre("Plugins/Odd & Even", "Plugins/Tube Amp"));
     EXPECT_THAT(lines, ElementsAre("pluginName Tube Amp", "pluginName Odd & Even"));
 }

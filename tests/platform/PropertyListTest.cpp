@@ -1,5 +1,6 @@
 #include "platform/PropertyList.h"
 #include "platform/PropertyListFile.h"
+#include "platform/Text.h"
 #include "support/Corpus.h"
 #include "support/TemporaryFolder.h"
 
@@ -118,11 +119,43 @@ std::string chainOfSharedArrays(std::size_t levels, std::size_t fanOut) {
     return bytes + offsets + trailer;
 }
 
-std::string nestedXml(int depth) {
+std::string nestedXml(int depth, const std::string& innermost) {
     std::string xml = "<plist>";
     for (int i = 0; i < depth; ++i) xml += "<array>";
+    xml += innermost;
     for (int i = 0; i < depth; ++i) xml += "</array>";
     return xml + "</plist>";
+}
+
+std::string manyAttributes(int count) {
+    std::string xml = "<plist";
+    for (int i = 0; i < count; ++i) xml += fmt::format(" a{}=''", i);
+    return xml + "><true/></plist>";
+}
+
+std::string nestedText(int depth) {
+    const auto count = static_cast<std::size_t>(depth);
+    return std::string(count, '(') + "x" + std::string(count, ')');
+}
+
+PropertyList nestedList(int depth) {
+    PropertyList list = "x";
+    for (int i = 0; i < depth; ++i) {
+        PropertyList::Array outer;
+        outer.push_back(std::move(list));
+        list = std::move(outer);
+    }
+    return list;
+}
+
+TEST(PropertyList, WhatIsWrittenCanBeReadWhateverTheDepth) {
+    for (const auto format : {PropertyListFormat::xml, PropertyListFormat::binary}) {
+        const PropertyList deepest = nestedList(kDeepestPropertyList);
+        EXPECT_EQ(parsePropertyList(serializePropertyList(deepest, format)), deepest);
+        Error error;
+        EXPECT_EQ(serializePropertyList(nestedList(kDeepestPropertyList + 1), format, &error), "");
+        EXPECT_EQ(error.message, "no property list can hold more than 1024 levels");
+    }
 }
 
 TEST(PropertyList, RefusesWhatWouldExhaustMemoryOrTheStack) {
@@ -133,10 +166,16 @@ TEST(PropertyList, RefusesWhatWouldExhaustMemoryOrTheStack) {
     } const cases[] = {
         {"shared array", chainOfSharedArrays(3, 2), true},
         {"a kilobyte that expands to 15^60 values", chainOfSharedArrays(60, 14), false},
-        {"binary within the depth", chainOfSharedArrays(500, 1), true},
-        {"binary nested too deeply", chainOfSharedArrays(5000, 1), false},
-        {"XML within the depth", nestedXml(500), true},
-        {"XML nested too deeply", nestedXml(100000), false},
+        {"binary within the depth", chainOfSharedArrays(kDeepestPropertyList, 1), true},
+        {"binary nested too deeply", chainOfSharedArrays(kDeepestPropertyList + 1, 1), false},
+        {"XML within the depth", nestedXml(kDeepestPropertyList, "<true/>"), true},
+        {"XML nested too deeply", nestedXml(kDeepestPropertyList + 1, ""), false},
+        {"XML nested far too deeply", nestedXml(100000, ""), false},
+        {"XML with an element of 40,000 attributes", manyAttributes(40000), false},
+        {"text within the depth", nestedText(kDeepestPropertyList), true},
+        {"text nested too deeply", nestedText(kDeepestPropertyList + 1), false},
+        {"text nested far too deeply", nestedText(100000), false},
+        {"text of a million values", "(" + replaceAll(std::string(1000000, 'a'), "a", "a,") + ")", false},
     };
     for (const auto& c : cases) {
         Error error;
@@ -154,6 +193,7 @@ TEST(PropertyList, RefusesXmlThatIsNoPropertyList) {
         {"<dict><key>a</key><!-- b --><integer> -0x10 </integer></dict>", nullptr},
         {"<string><![CDATA[<dict>]]>&lt;&#233;</string>", nullptr},
         {"<data>\n\tAAEC\n\t</data></plist>behind it", nullptr},
+        {"<array><real> -1.5e3 </real><real>+infinity</real><date>1-01-01T00:00:00Z</date></array>", nullptr},
         {"<dict><key>a</key></dict>", "a key without value"},
         {"<dict><string>a</string></dict>", "an element where it may not stand"},
         {"<dict><key>a</key><key>b</key></dict>", "an element where it may not stand"},
@@ -167,6 +207,10 @@ TEST(PropertyList, RefusesXmlThatIsNoPropertyList) {
         {"<integer>-9223372036854775809</integer>", "not a whole number of 64 bits"},
         {"<integer>1.5</integer>", "not a whole number of 64 bits"},
         {"<integer/>", "not a whole number of 64 bits"},
+        {"<real>1.5x</real>", "not a number"},
+        {"<date>yesterday</date>", "not a date and time"},
+        {"<date>2021-02-29T00:00:00Z</date>", "not a date and time"},
+        {"<date>2021-02-28T00:00:00Z.</date>", "not a date and time"},
         {"<data>AA*C</data>", "data that is not base 64"},
         {"<string>&unknown;</string>", "not well-formed XML"},
         {"<string>a", "not well-formed XML"},
@@ -185,6 +229,120 @@ TEST(PropertyList, RefusesXmlThatIsNoPropertyList) {
     EXPECT_FALSE(
         parsePropertyList("<!DOCTYPE plist [<!ENTITY a \"b\">]><plist><string>&a;</string></plist>", &error));
     EXPECT_NE(error.message.find("an entity declaration"), std::string::npos) << error.message;
+}
+
+std::string utf16(const std::string& text, bool isBigEndian, bool hasMark) {
+    std::string bytes = !hasMark ? "" : isBigEndian ? "\xFE\xFF" : "\xFF\xFE";
+    for (const char16_t unit : utf16FromUtf8(text)) {
+        const char high = static_cast<char>(unit >> 8U);
+        const char low = static_cast<char>(unit);
+        bytes += {isBigEndian ? high : low, isBigEndian ? low : high};
+    }
+    return bytes;
+}
+
+TEST(PropertyList, ReadsUnicodeInEveryEncoding) {
+    const std::string body =
+        "<plist><dict><key>\u97f3</key><string>\U0001f941 e\u0301</string></dict></plist>";
+    const std::string declared = "<?xml version=\"1.0\" encoding=\"UTF-16\"?>\n" + body;
+    const PropertyList expected = Dictionary{{"\u97f3", "\U0001f941 e\u0301"}};
+    for (const std::string& bytes :
+         {body, "\xEF\xBB\xBF" + body, declared, utf16(body, false, true), utf16(body, true, true),
+          utf16(declared, false, true), utf16(declared, true, true), utf16(declared, false, false),
+          utf16(declared, true, false), utf16("{\"\u97f3\"=\"\U0001f941 e\u0301\";}", true, true)}) {
+        Error error;
+        EXPECT_EQ(parsePropertyList(bytes, &error), expected) << error.message;
+    }
+}
+
+TEST(PropertyList, ReadsTheOldTextForm) {
+    struct {
+        const char* text;
+        PropertyList value;
+    } const cases[] = {
+        {"{ key = value; \"a b\" = 'it\"s'; alone; last = com.x-y/z:1_$ }",
+         Dictionary{{"key", "value"}, {"a b", "it\"s"}, {"alone", "alone"}, {"last", "com.x-y/z:1_$"}}},
+        {" // a comment\n( a, /* another */ (), {}, \"\", )\n",
+         PropertyList::Array{"a", PropertyList::Array{}, Dictionary{}, ""}},
+        {"<00ff 1A\n2b>", PropertyList::Data{0, 255, 26, 43}},
+        {"{a = <>; b = 5; a = again;}", Dictionary{{"a", PropertyList::Data{}}, {"b", "5"}}},
+        {R"("\a\b\f\n\r\t\v\"\'\\\q\
+")",
+         "\a\b\f\n\r\t\v\"'\\q\n"},
+        {R"("\101\0053\341\256 \U00e9\Ud83e\Udd41\ud83e")", "A\0053\u00c6\ufb01 \u00e9\U0001f941ud83e"},
+    };
+    for (const auto& c : cases) {
+        Error error;
+        const auto value = parsePropertyList(c.text, &error);
+        ASSERT_TRUE(value) << c.text << error.message;
+        EXPECT_EQ(*value, c.value) << c.text;
+    }
+}
+
+TEST(PropertyList, FaultsNameTheirByteInTheFile) {
+    const std::string xml = "<plist><array>ab<integer>x</integer></array></plist>";
+    struct {
+        const char* what;
+        std::string bytes;
+        const char* message;
+    } const cases[] = {
+        {"text", xml, "XML property list, byte 14: text between elements"},
+        {"behind a mark", "\xEF\xBB\xBF" + xml, "XML property list, byte 17: text between elements"},
+        {"in UTF-16", utf16("<!-- \U0001f941 -->" + xml, true, true),
+         "XML property list, byte 52: text between elements"},
+        {"number", "<plist>\n<integer>x</integer></plist>", "byte 8: not a whole number"},
+        {"element", "<plist><dict><key>a</key>\n<word/></dict></plist>", "byte 26: an element that is none"},
+        {"mismatch", "<plist><array>\n</dict></plist>", "byte 15: not well-formed"},
+        {"cut short", "<plist><array>", "byte 14: not well-formed"},
+        {"data", "<plist><data>AAAA\nAA*A</data></plist>", "byte 20: data that is not base 64"},
+        {"half a pair", utf16("<a", false, true) + "\x3d\xd8>",
+         "text property list, byte 6: half a character"},
+        {"odd", utf16("<a>", false, true) + "x", "byte 8: half a character"},
+        {"no list", "hello", "old-style property list, byte 0: neither a dictionary"},
+        {"empty", "", "old-style property list, byte 0: neither a dictionary"},
+        {"no semicolon", "{a = b c = d;}", "byte 7: no \";\""},
+        {"no equals sign", "{a b}", "byte 3: no \"=\""},
+        {"no comma", "(a b)", "byte 3: no \",\""},
+        {"no end", "{a = (b,", "byte 8: it ends too early"},
+        {"no quote", "( \"a)", "byte 2: a text that does not end"},
+        {"no comment's end", "{ /* }", "byte 2: a comment that does not end"},
+        {"hexadecimal", "<0 0>", "byte 1: data that is not"},
+        {"half of a pair", "(\"\\Ud83e.\")", "byte 2: half a surrogate pair"},
+        {"NUL", "(\"a\\0\")", "byte 1: a text that is not valid Unicode, or holds a NUL"},
+        {"junk", "{} x", "byte 3: something behind"},
+        {"binary", "bplist00", "binary property list, byte 8: is cut short"},
+        {"object outside", chainOfSharedArrays(1, 1).replace(12, 1, "\x7f"),
+         "binary property list, byte 12: object 0 at offset 32520 outside"},
+        {"marker", chainOfSharedArrays(1, 1).replace(11, 1, "\x70"), "byte 11: unknown marker 0x7"},
+    };
+    for (const auto& c : cases) {
+        Error error;
+        EXPECT_FALSE(parsePropertyList(c.bytes, &error)) << c.what;
+        EXPECT_NE(error.message.find(c.message), std::string::npos) << c.what << ": " << error.message;
+    }
+}
+
+TEST(PropertyList, WhatStandsBehindAnXmlListIsNotRewrittenAway) {
+    struct {
+        const char* behind;
+        const char* message;  // null: rewritten
+    } const cases[] = {
+        {" \n<!-- comment --><?instruction?>\n", nullptr},
+        {"\n<plist/>", "XML property list, byte 23: something behind the end"},
+        {"<!-- not ended", "XML property list, byte 22: something behind the end"},
+    };
+    for (const auto& c : cases) {
+        const std::string bytes = std::string("<plist><dict/></plist>") + c.behind;
+        Error error;
+        EXPECT_TRUE(parsePropertyList(bytes, &error)) << error.message;
+        EXPECT_EQ(parsePropertyList(bytes, &error, PropertyListUse::rewriting).has_value(),
+                  c.message == nullptr);
+        if (c.message != nullptr) {
+            EXPECT_NE(error.message.find(c.message), std::string::npos) << error.message;
+        }
+    }
+    const std::string padded("<plist><dict/></plist>\0\0", 24);
+    EXPECT_TRUE(parsePropertyList(padded, nullptr, PropertyListUse::rewriting));
 }
 
 TEST(PropertyList, RefusesAContainerThatHoldsItself) {

@@ -7,9 +7,11 @@
 #include "taxonomy/TGRTTaxonomySearching.h"
 
 #include <cmath>
+#include <functional>
 #include <random>
 
 #include <gmock/gmock.h>
+#include <pthread.h>
 
 namespace qvct {
 namespace {
@@ -124,6 +126,55 @@ TEST(Taxonomy, SurvivesBeingWrittenAndReadBack) {
     const auto fromData =
         TGRTTaxonomy::taxonomyWithData({reinterpret_cast<const std::uint8_t*>(binary.data()), binary.size()});
     EXPECT_EQ(fromData->allTags().size(), originalTags.size());
+}
+
+/// A taxonomy with one tag on each level.
+std::shared_ptr<TGRTTaxonomy> deepTaxonomy(int levels) {
+    const auto taxonomy = TGRTTaxonomy::init();
+    const auto category = taxonomy->findOrCreateCategoryWithIdentifier("Deep");
+    TagPointer tag;
+    for (int level = 0; level < levels; ++level)
+        tag = TGRTTag::initWithLabel(std::to_string(level), tag, category);
+    return taxonomy;
+}
+
+/// Runs it on a thread with a stack of that many bytes.
+void runWithStack(std::size_t bytes, const std::function<void()>& work) {
+    pthread_attr_t attributes;
+    pthread_attr_init(&attributes);
+    ASSERT_EQ(pthread_attr_setstacksize(&attributes, bytes), 0);
+    pthread_t thread{};
+    const auto run = [](void* argument) -> void* {
+        (*static_cast<const std::function<void()>*>(argument))();
+        return nullptr;
+    };
+    ASSERT_EQ(pthread_create(&thread, &attributes, run, const_cast<std::function<void()>*>(&work)), 0);
+    pthread_join(thread, nullptr);
+    pthread_attr_destroy(&attributes);
+}
+
+TEST(Taxonomy, OfAThousandLevelsIsWrittenAndReadWithASmallStack) {
+    const test::TemporaryFolder folder;
+    const URL url = URL::fileURLWithPath(folder.path("deep.plist"));
+#ifdef NDEBUG
+    constexpr std::size_t stack = 512U << 10U;  // as some systems give to each further thread
+#else
+    constexpr std::size_t stack = 8U << 20U;  // frames of code that is not optimised are several times larger
+#endif
+    runWithStack(stack, [&url] {
+        // The property list has three dictionaries more: its own, of the categories, of the category.
+        constexpr int levels = kDeepestPropertyList - 3;
+        Error error;
+        EXPECT_TRUE(deepTaxonomy(levels)->writeToURL(url, &error)) << error.message;
+        const auto read = TGRTTaxonomy::taxonomyWithContentsOfURL(url, &error);
+        const auto lowest = read->findTagForLabel(std::to_string(levels - 1));
+        ASSERT_NE(lowest, nullptr) << error.message;
+        EXPECT_EQ(lowest->ancestors().size(), std::size_t{levels} - 1);
+        EXPECT_FALSE(deepTaxonomy(levels + 1)->writeToURL(url, &error));
+        EXPECT_THAT(error.message,
+                    testing::HasSubstr("deep.plist: no property list can hold more than 1024 levels"));
+        EXPECT_EQ(TGRTTaxonomy::taxonomyWithContentsOfURL(url)->allTags().size(), std::size_t{levels});
+    });
 }
 
 TEST(Taxonomy, SaysWhatCouldNotBeRead) {
