@@ -2,6 +2,7 @@
 
 #include "contentdb/ItemCodec.h"
 #include "contentdb/Terms.h"
+#include "platform/HardLimit.h"
 
 #include <csignal>
 #include <ctime>
@@ -164,6 +165,7 @@ void runWorker(int socket, WorkerStatus& status, const DescriberFactory& factory
     ::signal(SIGINT, SIG_IGN);
     ::signal(SIGTERM, SIG_DFL);
     ::prctl(PR_SET_PDEATHSIG, SIGKILL);
+    HardLimit::enable();
     try {
         if (const auto describer = factory()) work(socket, status, *describer);
     } catch (const std::exception&) {

@@ -17,11 +17,6 @@ void keepLoss() {
     if (lossOfOutput == 0) lossOfOutput = errno != 0 ? errno : EIO;
 }
 
-void flushOutput() {
-    errno = 0;
-    if (lossOfOutput == 0 && std::fflush(stdout) != 0) keepLoss();
-}
-
 }  // namespace
 
 void prepareStandardStreams() {
@@ -37,6 +32,11 @@ void prepareStandardStreams() {
 void printText(std::string_view text) {
     errno = 0;
     if (lossOfOutput == 0 && std::fwrite(text.data(), 1, text.size(), stdout) != text.size()) keepLoss();
+}
+
+void flushOutput() {
+    errno = 0;
+    if (lossOfOutput == 0 && std::fflush(stdout) != 0) keepLoss();
 }
 
 void printErrorText(std::string_view text) {

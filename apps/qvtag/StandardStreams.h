@@ -17,6 +17,8 @@ void prepareStandardStreams();
 
 /// Writes to standard output.
 void printText(std::string_view text);
+/// Writes what was held back to standard output.
+void flushOutput();
 /// Writes to standard error, behind all that was written to standard output. What is lost there is not told
 /// anywhere: the exit status tells of every failure without it.
 void printErrorText(std::string_view text);

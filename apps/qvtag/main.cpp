@@ -1,5 +1,6 @@
 #include "Commands.h"
 #include "StandardStreams.h"
+#include "platform/HardLimit.h"
 #include "platform/UnfinishedFile.h"
 #include "platform/Version.h"
 
@@ -83,8 +84,9 @@ int run(int argc, char** argv) {
 
 int main(int argc, char** argv) {
     qvct::tool::prepareStandardStreams();
-    int status = kSomeFailed;
     qvct::removeUnfinishedFilesWhenEnded();
+    qvct::HardLimit::enable(qvct::tool::flushOutput);
+    int status = kSomeFailed;
     try {
         status = run(argc, argv);
     } catch (const std::exception& error) {

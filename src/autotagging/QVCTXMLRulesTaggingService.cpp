@@ -137,6 +137,7 @@ TagDictionarySet QVCTXMLRulesTaggingService::tagsWithContentsOfURL(
     if ((options & QVCTAutoTaggingOptionXMLRules) == 0 || !xmlDocument) return tags;
     for (const Rule& rule : rules_) {
         if (rule.type != kXPathType && rule.type != kScriptType) continue;
+        const LogScope scope(fmt::format("rule {}: ", rule.number));
         const std::string text = resolvedText(rule.text);
         if (text.empty()) continue;
         for (TagDictionary& tag : evaluate(rule.type, text, rule.tag, xmlDocument, nullptr)) {

@@ -2,7 +2,9 @@
 
 #include "autotagging/QVCTXMLDocument.h"
 #include "autotagging/RegularExpressionGuard.h"
+#include "autotagging/ScriptGuard.h"
 #include "autotagging/ScriptValues.h"
+#include "platform/HardLimit.h"
 #include "platform/Log.h"
 #include "platform/Text.h"
 
@@ -29,6 +31,9 @@ using Clock = std::chrono::steady_clock;
 /// Seconds of work between two looks at the limits.
 constexpr double kSlice = 0.01;
 constexpr std::size_t kLongestMessage = 4096;
+/// What a script may use up beyond its limits before the process ends, where that is allowed.
+constexpr std::chrono::milliseconds kHardTime{1000};
+constexpr std::size_t kHardMemory = std::size_t{64} << 20;
 
 /// The virtual machine of a thread, which its contexts share.
 class ContextGroup {
@@ -88,15 +93,22 @@ std::string withoutKeyword(std::string text, std::string_view word) {
 }
 
 /// A rule's text as the engine gets it: "async" and "import", which would go on after the script's end, are
-/// keywords no more. Kept for this thread, since the same rules are evaluated for each item.
-const ScriptString& prepared(std::string_view script) {
+/// keywords no more.
+struct Prepared {
+    ScriptString text;
+    bool isOwn = false;
+};
+
+/// Kept for this thread, since the same rules are evaluated for each item.
+const Prepared& prepared(std::string_view script) {
     constexpr std::size_t mostKept = 64;
-    thread_local std::unordered_map<std::string, ScriptString> kept;
+    thread_local std::unordered_map<std::string, Prepared> kept;
     std::string key(script);
     if (const auto hit = kept.find(key); hit != kept.end()) return hit->second;
     if (kept.size() >= mostKept) kept.clear();
     const std::string text = withoutKeyword(withoutKeyword(key, "async"), "import");
-    return kept.emplace(std::move(key), scriptString(text)).first->second;
+    Prepared made{scriptString(text), isOwnScript(script)};
+    return kept.emplace(std::move(key), std::move(made)).first->second;
 }
 
 /// The engine's words, and why it does not know what every other engine does.
@@ -110,7 +122,7 @@ std::string withReason(const std::string& problem, std::string_view script) {
 }  // namespace
 
 struct ScriptContext::Implementation {
-    enum class Stop { none, time, memory };
+    enum class Stop { none, time, memory, unguarded };
 
     ScriptLimits limits;
     Clock::time_point deadline = Clock::now() + limits.time;
@@ -119,7 +131,8 @@ struct ScriptContext::Implementation {
     const QVCTXMLDocument* document = nullptr;
     std::shared_ptr<ContextGroup> group = sharedGroup();
     JSGlobalContextRef context = JSGlobalContextCreateInGroup(group->reference(), nullptr);
-    JSObjectRef exec = nullptr;  ///< The engine's `RegExp.prototype.exec`.
+    bool isGuarded = false;
+    std::optional<HardLimit> hardLimit;  ///< For foreign scripts, until the context has gone.
 
     explicit Implementation(const ScriptLimits& chosen) : limits(chosen) {
         outer = std::exchange(current, this);
@@ -131,7 +144,6 @@ struct ScriptContext::Implementation {
     ~Implementation() {
         JSContextGroupClearExecutionTimeLimit(group->reference());
         current = outer;
-        JSValueUnprotect(context, exec);
         JSGlobalContextRelease(context);
         // A machine that was stopped may hold much memory: the thread's next context begins with a new one.
         if (stop != Stop::none && groupOfThisThread() == group) groupOfThisThread().reset();
@@ -157,7 +169,7 @@ struct ScriptContext::Implementation {
         if (std::exchange(isStopLogged, true)) return;
         if (stop == Stop::time) {
             logProblem(fmt::format("stopped after {} ms", limits.time.count()));
-        } else {
+        } else if (stop == Stop::memory) {
             logProblem(fmt::format("stopped at more than {} MiB of memory", limits.memory >> 20U));
         }
     }
@@ -194,15 +206,13 @@ struct ScriptContext::Implementation {
     }
 
     void defineLog();
-    void removePromises();
-    void installGuard();
+    void guard();
 
     static JSClassRef documentClass();
     static JSValueRef logMessage(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
                                  JSValueRef*);
-    static JSValueRef guardedExec(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
-                                  JSValueRef*);
-    static bool isBounded(JSContextRef, JSObjectRef expression, JSStringRef text, JSValueRef* exception);
+    static JSValueRef checkExpression(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
+                                      JSValueRef*);
     static JSValueRef isMatchingXPath(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
                                       JSValueRef*);
     static JSValueRef jsonStringForXPath(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
@@ -243,24 +253,21 @@ void ScriptContext::Implementation::defineLog() {
     setProperty(context, global(), "__log", logFunction);
 }
 
-/// Promises are settled when the script has ended, each in a call of its own, so that no limit of time ever
-/// stops them. Rules have nothing to wait for: what makes promises is taken away, and `prepared` takes the
-/// syntax.
-void ScriptContext::Implementation::removePromises() {
+/// Puts what foreign scripts can reach under the guard. The library's own scripts run without it.
+void ScriptContext::Implementation::guard() {
+    if (std::exchange(isGuarded, true)) return;
+    hardLimit.emplace(limits.time + kHardTime, limits.memory + kHardMemory,
+                      LogScope::prefix() + "JavaScript");
+    thread_local const ScriptString program = scriptString(scriptGuard());
     JSGlobalContextSetEvalEnabled(context, false, scriptString("not available to rules").get());
-    // Written over: deleting them takes twice as long.
-    for (const char* name : {"Promise", "WebAssembly"})
-        setProperty(context, global(), name, JSValueMakeUndefined(context));
-}
-
-/// Puts every use of a regular expression under the guard: all methods of texts and expressions go through
-/// `exec`. Done by hand, since compiling a script for it in each context would take longer.
-void ScriptContext::Implementation::installGuard() {
-    const JSObjectRef expression = JSObjectMakeRegExp(context, 0, nullptr, nullptr);
-    const JSObjectRef prototype = const_cast<JSObjectRef>(JSObjectGetPrototype(context, expression));
-    exec = const_cast<JSObjectRef>(property(context, prototype, "exec", nullptr));
-    JSValueProtect(context, exec);
-    setProperty(context, prototype, "exec", JSObjectMakeFunctionWithCallback(context, nullptr, guardedExec));
+    const JSValueRef function = JSEvaluateScript(context, program.get(), nullptr, nullptr, 1, nullptr);
+    const JSValueRef check = JSObjectMakeFunctionWithCallback(context, nullptr, checkExpression);
+    JSValueRef exception = nullptr;
+    const JSObjectRef callee = function != nullptr ? JSValueToObject(context, function, nullptr) : nullptr;
+    if (callee != nullptr) JSObjectCallAsFunction(context, callee, nullptr, 1, &check, &exception);
+    if (callee != nullptr && exception == nullptr) return;
+    logProblem("the guard of scripts does not run");
+    stop = Stop::unguarded;
 }
 
 JSValueRef ScriptContext::Implementation::logMessage(JSContextRef context, JSObjectRef /*function*/,
@@ -276,37 +283,23 @@ JSValueRef ScriptContext::Implementation::logMessage(JSContextRef context, JSObj
     return JSValueMakeUndefined(context);
 }
 
-JSValueRef ScriptContext::Implementation::guardedExec(JSContextRef context, JSObjectRef /*function*/,
-                                                      JSObjectRef self, size_t count,
-                                                      const JSValueRef values[], JSValueRef* exception) {
-    const JSValueRef value = count > 0 ? values[0] : JSValueMakeUndefined(context);
-    const ScriptString text(JSValueToStringCopy(context, value, exception));
-    if (!text || !isBounded(context, self, text.get(), exception)) return JSValueMakeUndefined(context);
-    const JSValueRef argument = JSValueMakeString(context, text.get());
-    const JSValueRef result = JSObjectCallAsFunction(context, running().exec, self, 1, &argument, exception);
-    return result != nullptr ? result : JSValueMakeUndefined(context);
-}
-
-/// False, and an exception, for what would take too long or cannot be asked.
-bool ScriptContext::Implementation::isBounded(JSContextRef context, JSObjectRef expression, JSStringRef text,
-                                              JSValueRef* exception) {
-    const auto asked = [&](std::string_view name) {
-        const JSValueRef value = property(context, expression, name, exception);
-        return *exception == nullptr ? value : JSValueMakeUndefined(context);
-    };
-    const ScriptString pattern(JSValueToStringCopy(context, asked("source"), exception));
-    const ScriptString flags(JSValueToStringCopy(context, asked("flags"), exception));
-    const double last = JSValueToNumber(context, asked("lastIndex"), exception);
-    if (!pattern || !flags || *exception != nullptr) return false;
-    const bool isSticky = viewOf(flags.get()).find_first_of(u"gy") != std::u16string_view::npos;
-    const std::size_t start = isSticky && last > 0 && last < 1e9 ? static_cast<std::size_t>(last) : 0;
-    if (isRegularExpressionBounded(viewOf(pattern.get()), viewOf(flags.get()), viewOf(text), start,
-                                   running().deadline)) {
-        return true;
+JSValueRef ScriptContext::Implementation::checkExpression(JSContextRef context, JSObjectRef /*function*/,
+                                                          JSObjectRef /*self*/, size_t count,
+                                                          const JSValueRef values[], JSValueRef* exception) {
+    if (count < 4) return JSValueMakeUndefined(context);
+    const ScriptString pattern(JSValueToStringCopy(context, values[0], exception));
+    const ScriptString flags(JSValueToStringCopy(context, values[1], exception));
+    const ScriptString text(JSValueToStringCopy(context, values[2], exception));
+    const double last = JSValueToNumber(context, values[3], exception);
+    if (!pattern || !flags || !text) return JSValueMakeUndefined(context);
+    const std::size_t start = last > 0 && last < 1e9 ? static_cast<std::size_t>(last) : 0;
+    if (!isRegularExpressionBounded(viewOf(pattern.get()), viewOf(flags.get()), viewOf(text.get()), start,
+                                    running().deadline)) {
+        const std::string reason =
+            fmt::format("regular expression takes too long: /{}/", textOf(pattern.get()));
+        *exception = JSValueMakeString(context, scriptString(reason).get());
     }
-    const std::string reason = fmt::format("regular expression takes too long: /{}/", textOf(pattern.get()));
-    *exception = JSValueMakeString(context, scriptString(reason).get());
-    return false;
+    return JSValueMakeUndefined(context);
 }
 
 JSValueRef ScriptContext::Implementation::isMatchingXPath(JSContextRef context, JSObjectRef /*function*/,
@@ -338,8 +331,6 @@ ScriptContext::~ScriptContext() = default;
 std::shared_ptr<ScriptContext> ScriptContext::make(const ScriptLimits& limits) {
     auto implementation = std::make_unique<Implementation>(limits);
     implementation->defineLog();
-    implementation->removePromises();
-    implementation->installGuard();
     return std::shared_ptr<ScriptContext>(new ScriptContext(std::move(implementation)));
 }
 
@@ -353,8 +344,11 @@ void ScriptContext::exposeDocument(const QVCTXMLDocument& document) {
 bool ScriptContext::evaluate(std::string_view script) {
     Implementation& self = *implementation_;
     JSValueRef exception = nullptr;
+    const Prepared& program = prepared(script);
     const bool ran = self.run([&] {
-        JSEvaluateScript(self.context, prepared(script).get(), nullptr, nullptr, 1, &exception);
+        if (!program.isOwn) self.guard();
+        if (self.stop != Implementation::Stop::none) return;
+        JSEvaluateScript(self.context, program.text.get(), nullptr, nullptr, 1, &exception);
         if (exception != nullptr) self.logException(exception, script);
     });
     return ran && exception == nullptr;
@@ -391,7 +385,7 @@ bool ScriptContext::checkSyntax(std::string_view script, Error* error) {
     const auto context = make({});
     const JSGlobalContextRef reference = context->implementation_->context;
     JSValueRef exception = nullptr;
-    if (JSCheckScriptSyntax(reference, prepared(script).get(), nullptr, 1, &exception)) return true;
+    if (JSCheckScriptSyntax(reference, prepared(script).text.get(), nullptr, 1, &exception)) return true;
     const JSValueRef line =
         property(reference, JSValueToObject(reference, exception, nullptr), "line", nullptr);
     return fail(error, kErrorMalformed,

@@ -15,9 +15,10 @@ class QVCTXMLDocument;
 
 /// What a script may use up. Time is that of the whole evaluation, checked about every ten milliseconds;
 /// memory is what the script's objects take, checked as often, so that one single operation can go beyond it.
+/// Processes that allow it (`HardLimit`) are ended when a script cannot be stopped otherwise.
 struct ScriptLimits {
     std::chrono::milliseconds time{1000};
-    std::size_t memory = std::size_t{256} << 20;
+    std::size_t memory = std::size_t{64} << 20;
 };
 
 /// Bounds on what a script returns: values in all, their nesting, bytes of text in all.

@@ -12,7 +12,7 @@ namespace qvct {
 namespace {
 
 std::mutex handlerMutex;
-thread_local std::string prefix;
+thread_local std::string currentPrefix;
 
 LogHandler& currentHandler() {
     static LogHandler handler;
@@ -48,7 +48,7 @@ std::string onOneLine(std::string_view message) {
 }  // namespace
 
 void log(std::string_view message) {
-    const std::string line = prefix + onOneLine(message);
+    const std::string line = currentPrefix + onOneLine(message);
     LogHandler handler;
     {
         const std::lock_guard lock(handlerMutex);
@@ -67,11 +67,15 @@ LogHandler setLogHandler(LogHandler handler) {
 }
 
 LogScope::LogScope(std::string text) {
-    prefix = std::move(text);
+    currentPrefix = std::move(text);
 }
 
 LogScope::~LogScope() {
-    prefix.clear();
+    currentPrefix.clear();
+}
+
+const std::string& LogScope::prefix() {
+    return currentPrefix;
 }
 
 }  // namespace qvct

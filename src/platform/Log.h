@@ -28,6 +28,9 @@ class QVCT_API LogScope {
     LogScope(const LogScope&) = delete;
     LogScope& operator=(const LogScope&) = delete;
     ~LogScope();
+
+    /// The prefix of this thread's messages; empty outside of a scope.
+    static const std::string& prefix();
 };
 
 }  // namespace qvct

@@ -2,6 +2,7 @@
 #include "support/RunTool.h"
 
 #include <algorithm>
+#include <chrono>
 #include <filesystem>
 #include <set>
 
@@ -102,6 +103,25 @@ TEST_F(RulesCommand, TriesRulesAndCountsTheirMatches) {
     EXPECT_THAT(runTool({"rules", "test", rules, patch_}).output,
                 HasSubstr("matches of 1      time an item\n   1  XPath                      1 "));
     EXPECT_THAT(runTool({"rules", "--rules", rules, patch_}).output, HasSubstr("   3  JavaScript  S\n"));
+}
+
+TEST_F(RulesCommand, EndsWhereAScriptCannotBeStopped) {
+    const std::string doubled = "var s = 'ab'; for (var i = 0; 28 > i; i++) s += s;";
+    const struct {
+        std::string script, reason;
+    } rows[] = {
+        {doubled + "s.charCodeAt(7)", "qvtag: rule 1: JavaScript takes too much and cannot be stopped"},
+        {"for (var i = 0; 9 > i; i++) String(3n ** 660000n)", "qvtag: rule 1: JavaScript"},
+        {"new Array(1e8).fill(0)", "qvtag: rule 1: JavaScript"},
+        {"Array.prototype.reverse.call({length: 2 ** 53 - 1})",
+         "rule 1: JavaScript Exception: stopped after 1000 ms"},
+    };
+    for (const auto& row : rows) {
+        const auto start = std::chrono::steady_clock::now();
+        const ToolResult result = tryRules(ruleList({scriptRule("function main() { " + row.script + " }")}));
+        EXPECT_THAT(result.errors, HasSubstr(row.reason));
+        EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(4)) << row.script;
+    }
 }
 
 TEST_F(RulesCommand, NamesTheRuleThatIsWrong) {

@@ -157,7 +157,9 @@ TEST(Script, CannotGoOnAfterItsEnd) {
         {"/'/; async function f() {} /'/; function main() { return [1] }", "are not available"},
         {"\\u0061sync function main() { return [1] }", "SyntaxError"},
         {"function f() { return Promise.resolve().then(f) } function main() { f(); return [1] }",
-         "TypeError: undefined is not an object (evaluating 'Promise.resolve')"},
+         "ReferenceError: Can't find variable: Promise"},
+        {"function main() { var P = Array.fromAsync([]).constructor; function f() { P.resolve().then(f) } f(); }",
+         "TypeError: Array.fromAsync is not a function"},
         {"function main() { return eval('as' + 'ync function f() { for (;;) await 1 } f()') }",
          "EvalError: not available to rules"},
         {"function main() { return new Function('return 1') }", "EvalError: not available to rules"}};
@@ -172,6 +174,30 @@ TEST(Script, CannotGoOnAfterItsEnd) {
                   "return [asynchronous, o.async, o['import'], /^async$/.test('async'), '\\async', `async`]"),
               "[1,2,3,true,\"async\",\"async\"]");
     EXPECT_THAT(log.messages(), testing::IsEmpty());
+}
+
+/// Walks from the global object to all that a script can get hold of.
+TEST(Script, ReachesNothingThatEscapesItsLimits) {
+    const test::CapturedLog log;
+    EXPECT_EQ(resultOfMain(R"js(
+        var seen = new Set(), open = [globalThis, function* () {}, (function* () {})(), [].values(), new Map().entries(),
+            "".matchAll(/a/g), Iterator.from([]), function () { return arguments }(), Symbol(), 1n, new Proxy({}, {})];
+        var found = [], forbidden = /^(exec|test|repeat|padStart|padEnd|normalize|\[Symbol\.(match|matchAll|replace|search|split)\])$/;
+        while (open.length > 0) {
+            var value = open.pop();
+            if (value === null || (typeof value !== "object" && typeof value !== "function") || seen.has(value)) continue;
+            seen.add(value);
+            var tag = Object.prototype.toString.call(value), name = typeof value === "function" ? String(value.name) : "";
+            if (/async|promise|buffer|worker/i.test(tag + name) || forbidden.test(name)) found.push(tag + name);
+            open.push(Object.getPrototypeOf(value));
+            Reflect.ownKeys(value).forEach(function (key) {
+                var property = Object.getOwnPropertyDescriptor(value, key);
+                open.push(property.value, property.get, property.set);
+            });
+        }
+        return [seen.size > 500, found])js"),
+              "[true,[]]");
+    EXPECT_THAT(log.messages(), IsEmpty());
 }
 
 TEST(Script, RecursionWithoutEndIsAnException) {
@@ -194,6 +220,67 @@ TEST(Script, CatastrophicExpressionsAreStoppedWhateverCallsThem) {
         EXPECT_EQ(resultOfMain("return [" + use + "]"), "nil") << use;
         EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(5)) << use;
         EXPECT_THAT(log.messages(), ElementsAre(HasSubstr("JavaScript Exception: "))) << use;
+    }
+}
+
+TEST(Script, CannotForgeExpressionsThatTheGuardLooksAt) {
+    const Limits limits({milliseconds(200), std::size_t{256} << 20});
+    const std::string begin = "var r = /a*a*a*a*a*a*b/, t = 'a'.repeat(300), p = RegExp.prototype; ";
+    for (const std::string& attack :
+         {std::string("r.exec = null; r.test(t)"),
+          std::string("delete p.exec; r.test(t)"),
+          std::string("p.exec = null; r.test(t)"),
+          std::string("r.__defineGetter__('exec', () => null); r.test(t)"),
+          std::string("Object.defineProperty(r, 'exec', {value: null}); r.test(t)"),
+          std::string("Object.defineProperty(r, 'source', {value: 'a'}); r.test(t)"),
+          std::string("Object.defineProperty(p, 'source', {value: 'a'}); r.test(t)"),
+          std::string("Object.defineProperty(p, 'source', {get() { return 'a' }}); t.replace(r, '')"),
+          std::string("Object.defineProperty(r, 'flags', {value: 'v'}); t.match(r)"),
+          std::string("class R extends RegExp { exec = null; get source() { return 'a' } } new R(r).test(t)"),
+          std::string("var test = p.test; Object.setPrototypeOf(r, null); test.call(r, t)"),
+          std::string("var f = p[Symbol.replace]; Object.setPrototypeOf(r, null); f.call(r, t, '')"),
+          std::string(
+              "r.constructor = {[Symbol.species]: function () { var c = /a*a*a*a*a*a*b/y; c.exec = null; "
+              "return c }}; t.split(r)"),
+          std::string(
+              "Object.defineProperty(r, 'constructor', {value: {[Symbol.species]: RegExp}}); t.split(r)"),
+          std::string("r.lastIndex = 300; r.test(t)"),
+          std::string("var n = 0; r = /a*a*a*a*a*a*b/g; r.lastIndex = {valueOf() { return n++ ? 0 : 300 }}; "
+                      "r.test(t)"),
+          std::string("r.exec = null; p.test.call(new Proxy(r, {}), t)"),
+          std::string("r.exec = null; Array.prototype[Symbol.iterator] = Reflect.apply = null; "
+                      "Function.prototype.call = Function.prototype.apply = null; r.test(t)"),
+          std::string("Object.prototype.get = () => null; r.test(t)"),
+          std::string("r.exec = null; Object.freeze(r); t.search(r)"),
+          std::string("/a/.compile(r.source).test(t)"),
+          std::string("r.exec = null; var deep = () => { try { deep() } catch (e) { r.test(t) } }; deep(); "
+                      "throw 0")}) {
+        const test::CapturedLog log;
+        const auto start = std::chrono::steady_clock::now();
+        EXPECT_EQ(resultOfMain(begin + attack + "; return [1]"), "nil") << attack;
+        EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(2)) << attack;
+        EXPECT_THAT(log.messages(), ElementsAre(HasSubstr("JavaScript Exception: "))) << attack;
+    }
+}
+
+TEST(Script, TextsAreNotMultipliedWithoutBound) {
+    const struct {
+        const char *body, *result;
+    } rows[] = {
+        {"'ab'.repeat(1e7)", "nil"},
+        {"''.padStart(2 ** 30, 'ab')", "nil"},
+        {"''.padEnd(1e9)", "nil"},
+        {"'\ufdfa'.repeat(2e6).normalize('NFKD')", "nil"},
+        {"'ab'.repeat({n: 0, valueOf() { return this.n++ ? 1e9 : 1 }})", "[2]"},
+        {"'ab'.repeat(3) + 'x'.padStart(3) + 'y'.padEnd(3, 'z') + 'e\u0301'.normalize()", "[13]"},
+        {"'ab'.repeat(-1)", "nil"},
+    };
+    for (const auto& row : rows) {
+        const test::CapturedLog log;
+        EXPECT_EQ(resultOfMain(std::string("var t = (function () { return ") + row.body +
+                               " })(); return [t.length]"),
+                  row.result)
+            << row.body;
     }
 }
 
