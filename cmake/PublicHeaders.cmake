@@ -37,6 +37,7 @@ set(QVCT_PUBLIC_HEADERS
   metadata/TGRTMetaData.h
   formats/ContentWalk.h
   formats/ContentWriters.h
+  formats/LinkRule.h
   formats/QVContentEditorFileUtilities.h
   formats/TGRTBaseMetaDataReader.h
   formats/TGRTContentNodeTypeValidator.h
