@@ -7,8 +7,8 @@
 
 namespace qvct::tool {
 
-// All that the tool says goes through here, and nothing of it throws: a full disk, a closed stream or a reader
-// that has gone must not keep a command from writing the items that it was asked to write.
+// All that the tool says goes through here, and nothing of it throws: a full disk, a closed stream or a
+// reader that has gone must not keep a command from writing the items that it was asked to write.
 
 /// Makes the streams safe to write to. A stream that the caller has closed is opened again for nothing: the
 /// next file to be opened would take its place otherwise, and messages would end in it. To write to a pipe
