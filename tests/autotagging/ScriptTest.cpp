@@ -158,7 +158,8 @@ TEST(Script, CannotGoOnAfterItsEnd) {
         {"\\u0061sync function main() { return [1] }", "SyntaxError"},
         {"function f() { return Promise.resolve().then(f) } function main() { f(); return [1] }",
          "ReferenceError: Can't find variable: Promise"},
-        {"function main() { var P = Array.fromAsync([]).constructor; function f() { P.resolve().then(f) } f(); }",
+        {"function main() { var P = Array.fromAsync([]).constructor; function f() { P.resolve().then(f) } "
+         "f(); }",
          "TypeError: Array.fromAsync is not a function"},
         {"function main() { return eval('as' + 'ync function f() { for (;;) await 1 } f()') }",
          "EvalError: not available to rules"},
