@@ -103,6 +103,7 @@ void tellCalls() {
 
 /// Starts `act` in a process of its own: what it remembers of the folder ends with it.
 pid_t start(const Act& act, const std::string& folder, const CutPlan& plan = {}) {
+    shared().calls = 0;  // it is there before the process that shares it
     const pid_t child = ::fork();
     if (child != 0) return child;
     planCut(plan);
@@ -144,7 +145,6 @@ std::size_t cutEveryCall(const TemporaryFolder& folder, const Files& before, con
             if (needsHalf && !calls.canBeHalf[point]) continue;
             restored(folder, before);
             SCOPED_TRACE(fmt::format("call {} of {}, cut {}", point, calls.calls, static_cast<int>(cut)));
-            shared().calls = 0;
             const Outcome outcome = run(act, path, {.cut = cut, .point = point});
             check(path, {outcome, calls.isRemoval[point]});
             cuts += outcome == Outcome::died || shared().calls > point ? 1 : 0;
