@@ -167,7 +167,9 @@ void runWorker(int socket, WorkerStatus& status, const DescriberFactory& factory
     ::prctl(PR_SET_PDEATHSIG, SIGKILL);
     HardLimit::enable();
     try {
-        if (const auto describer = factory()) work(socket, status, *describer);
+        const auto describer = factory();
+        status.isStarting = false;
+        if (describer) work(socket, status, *describer);
     } catch (const std::exception&) {
         ::_exit(1);
     }

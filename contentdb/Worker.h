@@ -12,6 +12,7 @@ namespace qvct::contentdb {
 
 /// What a worker shows to its supervisor in memory that both see.
 struct WorkerStatus {
+    std::atomic<bool> isStarting;       ///< it has no describer yet
     std::atomic<std::uint64_t> ticket;  ///< the item that it is at; 0 for none
     std::atomic<std::int64_t> since;    ///< when it began, on the monotonic clock, in nanoseconds
 };

@@ -23,6 +23,9 @@ namespace {
 
 /// Items that one worker may have before it; enough that it never waits.
 constexpr std::size_t kQueuePerWorker = 128;
+/// Longest that a worker may take to make its describer: forked while another thread of the host had a lock
+/// that this needs, it would wait for ever.
+constexpr std::chrono::milliseconds kLongestStart{30000};
 /// Workers in a row that may end without having described anything.
 constexpr unsigned kMostBarrenWorkers = 5;
 
@@ -60,6 +63,8 @@ struct WorkerPool::Implementation {
         if (process.status == nullptr) process.status = sharedStatus();
         if (process.status == nullptr) return false;
         process.status->ticket = 0;
+        process.status->isStarting = true;
+        process.status->since = monotonicNanoseconds();
         if (::socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, pair) != 0) return false;
         const pid_t id = ::fork();
         if (id == 0) {
@@ -154,9 +159,11 @@ struct WorkerPool::Implementation {
     }
 
     void endIfLate(Process& process) const {
-        const std::int64_t limit = std::chrono::nanoseconds(settings.timeLimit).count();
         const std::uint64_t ticket = process.status->ticket;
-        if (ticket == 0 || monotonicNanoseconds() - process.status->since < limit) return;
+        const bool isStarting = ticket == 0 && process.status->isStarting;
+        if (ticket == 0 && !isStarting) return;
+        const std::chrono::nanoseconds limit = isStarting ? kLongestStart : settings.timeLimit;
+        if (monotonicNanoseconds() - process.status->since < limit.count()) return;
         if (process.status->ticket != ticket) return;  // it has gone on meanwhile
         process.wasLate = true;
         ::kill(process.id, SIGKILL);

@@ -4,6 +4,8 @@
 #include "demo/Library.h"
 #include "support/TemporaryFolder.h"
 
+#include <atomic>
+#include <chrono>
 #include <filesystem>
 #include <fstream>
 #include <iterator>
@@ -11,6 +13,8 @@
 
 #include <gmock/gmock.h>
 #include <qvcontenttagging/autotagging/QVTaggingAggregator.h>
+#include <qvcontenttagging/contentdb/ContentDatabase.h>
+#include <qvcontenttagging/contentdb/ContentDescriber.h>
 #include <qvcontenttagging/contentdb/Indexer.h>
 #include <qvcontenttagging/formats/ContentWalk.h>
 #include <qvcontenttagging/formats/TGRTFileNode.h>
@@ -220,6 +224,83 @@ TEST(Threads, TagTheSameItemsAtOnceWithAnAggregatorEach) {
     }
     for (std::thread& thread : threads) thread.join();
     EXPECT_THAT(results, Each(expected));
+}
+
+/// Adds the tag to what the items have, again and again: each time another file stands there.
+void tagAgain(const std::vector<URL>& items, int times) {
+    const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
+    const auto jazz = TGRTTagging::initWithTag(taxonomy->findTagForLabel("Jazz", "Genres"), nullptr);
+    for (; times > 0; --times) {
+        for (const URL& url : items) {
+            Error error;
+            const auto writer = TGRTMetaDataWriterFactory::taggingWriterForURL(url);
+            EXPECT_TRUE(writer && writer->writeTaggings({jazz}, url, &error)) << error.message;
+        }
+    }
+}
+
+void indexWithNames(const std::string& folder, const std::string& database) {
+    contentdb::IndexOptions options;
+    options.folders = {folder};
+    options.database = database;
+    options.workers = 2;
+    options.retryFailed = true;
+    options.longestBatch = std::chrono::milliseconds(10);
+    Error error;
+    EXPECT_TRUE(contentdb::indexLibrary(
+        options,
+        [] { return std::make_unique<contentdb::ContentDescriber>(QVCTAutoTaggingOptionFilenameKeywords); },
+        &error))
+        << error.message;
+}
+
+/// How many items it finds; opens the database anew, as a host does that was just started.
+std::size_t countFound(const std::string& path, const std::string& text) {
+    Error error;
+    const auto database = contentdb::ContentDatabase::open(path, &error);
+    EXPECT_TRUE(database) << error.message;
+    if (!database) return 0;
+    const auto query = contentdb::parseQuery(text, *database->vocabulary(), nullptr);
+    const auto found = database->search(*query, 1000, &error);
+    EXPECT_TRUE(found && database->facets(*query, &error)) << error.message;
+    return found ? found->size() : 0;
+}
+
+TEST(Threads, IndexSearchAndWriteAtOnce) {
+    const TemporaryFolder folder;
+    const TemporaryFolder databases;
+    const std::string database = databases.path("db");
+    const std::vector<URL> items = writeDemoLibrary(folder);
+    std::vector<URL> taken;
+    for (const URL& url : items)
+        if (TGRTMetaDataWriterFactory::taggingWriterForURL(url)) taken.push_back(url);
+    ASSERT_GT(taken.size(), 4U);
+    // What is made once is made before workers are forked.
+    tagAgain({taken[0]}, 1);
+    indexWithNames(folder.path(), databases.path("first"));
+    std::atomic<bool> isOver = false;
+    std::vector<std::thread> writers;
+    std::vector<std::thread> searches;
+    // Both to the same files, from either end.
+    for (const std::vector<URL>& order : {taken, std::vector<URL>(taken.rbegin(), taken.rend())})
+        writers.emplace_back([order] { tagAgain(order, 3); });
+    std::thread indexer([&] {
+        for (int run = 0; run < 4; ++run) indexWithNames(folder.path(), database);
+    });
+    while (!std::filesystem::exists(database + "-lock")) std::this_thread::yield();
+    for (int i = 0; i < 2; ++i) {
+        searches.emplace_back([&] {
+            while (!isOver) EXPECT_GT(countFound(database, ""), 0U);
+        });
+    }
+    for (std::thread& thread : writers) thread.join();
+    indexer.join();
+    isOver = true;
+    for (std::thread& thread : searches) thread.join();
+    indexWithNames(folder.path(), database);
+    EXPECT_EQ(countFound(database, "genre:jazz"), taken.size());
+    Error error;
+    EXPECT_TRUE(contentdb::ContentDatabase::open(database)->check(&error)) << error.message;
 }
 
 TEST(Threads, FindTheSameAsOneByOneInTheSharedTaxonomy) {
