@@ -165,7 +165,7 @@ ContentDescriber::~ContentDescriber() = default;
 
 std::uint64_t ContentDescriber::digest(std::uint64_t services) {
     // Raised when items are described otherwise than by the same version before.
-    constexpr std::uint64_t edition = 2;
+    constexpr std::uint64_t edition = 3;
     Digest digest;
     digest.add(services);
     digest.add(version());
@@ -193,7 +193,8 @@ std::optional<IndexedItem> ContentDescriber::describe(const std::string& path, E
                                                                                       *its.taxonomyOfRecords);
     its.aggregator.prepare(url, record, its.services);
     IndexedItem item;
-    item.name = object->displayName();
+    item.name = url.lastPathComponentWithoutExtension();
+    if (object->displayName() != item.name) item.title = object->displayName();
     item.fileType = object->fileType();
     if (item.fileType == kFileTypeNone) item.fileType = QVContentTaggingTypes::fallBackFileTypeForURL(url);
     item.subFileType = object->subFileType();

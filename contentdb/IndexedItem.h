@@ -72,7 +72,10 @@ struct IndexedItem {
     std::string payloadHash;
     FileStamp stamp;
 
+    /// As the file is called, without its extension.
     std::string name;
+    /// The name that its record gives it; empty when there is none, or it is the file's.
+    std::string title;
     std::int64_t fileType = 0;
     std::int64_t subFileType = 0;
     bool previewAvailable = false;

@@ -131,6 +131,7 @@ std::string encodedDescription(const IndexedItem& item) {
         out.text(dependency.path);
     }
     out.text(item.failure);
+    if (!item.title.empty()) out.text(item.title);
     return out.take();
 }
 
@@ -150,6 +151,7 @@ bool decodeDescription(std::string_view bytes, IndexedItem& item) {
         item.dependencies.push_back(std::move(dependency));
     }
     item.failure = in.text();
+    if (!in.isAtEnd()) item.title = in.text();
     return in.isIntact() && in.isAtEnd();
 }
 

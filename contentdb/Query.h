@@ -25,7 +25,7 @@ struct Field {
     bool operator==(const Field&) const = default;
 };
 
-/// The item has these words in a row in its name, its path or a label; in folded form.
+/// The item has these words in a row in its name, title, path or a label; in folded form.
 struct WordsMatch {
     std::vector<std::string> words;
     bool lastMayContinue = true;

@@ -142,7 +142,8 @@ std::vector<std::string> textsInField(const IndexedItem& item, const Field& fiel
     std::vector<std::string> texts;
     switch (field.kind) {
         case Field::Kind::name:
-            return {item.name};
+            if (item.title.empty()) return {item.name};
+            return {item.name, item.title};
         case Field::Kind::path:
             return {item.path};
         case Field::Kind::type:

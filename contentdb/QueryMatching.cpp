@@ -90,7 +90,8 @@ int compare(const std::vector<T>& a, const std::vector<T>& b, bool isDescending)
 }
 
 std::vector<std::string> sortTexts(const IndexedItem& item, const Field& field) {
-    std::vector<std::string> texts = textsInField(item, field);
+    const bool isName = field.kind == Field::Kind::name;  // by the file's, whatever its title
+    std::vector<std::string> texts = isName ? std::vector{item.name} : textsInField(item, field);
     for (std::string& text : texts) text = folded(text);
     return texts;
 }

@@ -108,7 +108,7 @@ std::string levelField(std::string_view label) {
 }
 
 std::vector<std::string_view> textsOf(const IndexedItem& item) {
-    std::vector<std::string_view> texts = {item.name, item.path};
+    std::vector<std::string_view> texts = {item.name, item.title, item.path};
     for (const IndexedTagging& tagging : item.taggings) {
         texts.emplace_back(tagging.label);
         for (const std::string& ancestor : tagging.ancestors) texts.emplace_back(ancestor);

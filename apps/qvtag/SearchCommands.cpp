@@ -85,7 +85,9 @@ Json jsonOf(ContentDatabase& database, ItemId id, const IndexedItem& item) {
     json["id"] = id;
     json["path"] = item.path;
     json["earlierPaths"] = database.earlierPaths(id).value_or(std::vector<std::string>());
-    json["displayName"] = item.name;
+    json["name"] = item.name;
+    json["title"] = item.title.empty() ? Json() : Json(item.title);
+    json["displayName"] = item.title.empty() ? item.name : item.title;
     json["type"] = QVContentTaggingTypes::nameForFileType(item.fileType);
     json["fileType"] = item.fileType;
     json["subFileType"] = item.subFileType;
@@ -111,7 +113,7 @@ std::optional<double> tempoOf(const IndexedItem& item) {
     return tempo == nullptr ? std::nullopt : std::optional(*tempo);
 }
 
-/// A heading a folder, below it a line an item: its name, tempo and tags.
+/// A heading a folder, below it a line an item: its name, title, tempo and tags.
 void printItems(const std::vector<const IndexedItem*>& items, const std::vector<std::string>& notes,
                 const Terminal& terminal) {
     constexpr std::size_t widest = 40;
@@ -126,6 +128,8 @@ void printItems(const std::vector<const IndexedItem*>& items, const std::vector<
         folder = its;
         std::vector<Word> words;
         if (!notes.empty()) words.push_back({notes[i], Color::strong});
+        if (!items[i]->title.empty())
+            words.push_back({fmt::format("\"{}\"", printable(items[i]->title)), Color::plain});
         if (const auto tempo = tempoOf(*items[i]))
             words.push_back({fmt::format("{:g} bpm", *tempo), Color::faint});
         for (const IndexedTagging& tagging : items[i]->taggings)

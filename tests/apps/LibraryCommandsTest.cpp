@@ -77,6 +77,23 @@ TEST_F(LibraryCommands, IndexAndFind) {
     EXPECT_EQ(run({"search", "", "--limit", "2"}).json().size(), 2U);
 }
 
+TEST_F(LibraryCommands, ShowTheNameOfTheFileAndItsTitle) {
+    const std::string kick = folder_.path("sounds/Drums/Dark Kick 01.wav");
+    ASSERT_EQ(runTool({"write", "--name", "Automated Build", kick}).status, 0);
+    settle();
+    index();
+    for (const char* query : {"dark", "automated", "name:kick name:build"}) {
+        const json found = run({"search", query}).json();
+        ASSERT_EQ(found.size(), 1U) << query;
+        EXPECT_EQ(found[0]["name"], "Dark Kick 01");
+        EXPECT_EQ(found[0]["title"], "Automated Build");
+    }
+    EXPECT_EQ(run({"search", "snare"}).json()[0]["title"], nullptr);
+    EXPECT_EQ(names("type:audio name+").front(), "Automated Build");  // Dark Kick comes first
+    EXPECT_THAT(runTool({"search", "dark", "--db", folder_.path("db")}).output,
+                HasSubstr("Dark Kick 01  \"Automated Build\""));
+}
+
 TEST_F(LibraryCommands, KnowItemsAgainThatWereMovedAndTagged) {
     index();
     const auto idOf = [this](const std::string& query) {

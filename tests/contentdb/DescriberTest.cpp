@@ -71,6 +71,21 @@ class Describing : public testing::Test {
     TemporaryFolder folder_;
 };
 
+TEST_F(Describing, KeepsTheNameOfTheFileBesideTheTitleOfItsRecord) {
+    const std::string path = folder_.write("House/Dark Kick 122bpm.wav", loop());
+    EXPECT_EQ(describe(path).title, "");
+    for (const std::string title : {"Automated Build", "Dark Kick 122bpm"}) {
+        const URL url = URL::fileURLWithPath(path);
+        const auto record = TGRTMetaData::init();
+        record->setDisplayName(title);
+        ASSERT_TRUE(TGRTFileNode::nodeWithFileURL(url)->metaDataWriterForFileURL(url)->writeMetaData(
+            record, url, nullptr));
+        const IndexedItem item = describe(path);
+        EXPECT_EQ(item.name, "Dark Kick 122bpm");
+        EXPECT_EQ(item.title, title == item.name ? "" : title);
+    }
+}
+
 TEST_F(Describing, TellsWhereATaggingComesFrom) {
     const std::string path = folder_.write("House/Dark Kick 122bpm.wav", loop());
     tag(path, "My Moods", "Misty");

@@ -33,6 +33,7 @@ class ItemGenerator {
         if (pick(4) == 0) item.packs.push_back("Pack " + std::to_string(pick(20)));
         if (pick(8) == 0)
             item.dependencies.push_back({"uuid-" + std::to_string(pick(100)), "/deep/" + word()});
+        if (hasOddNames_ && pick(4) == 0) item.title = word() + " " + word();
         return item;
     }
 
