@@ -5,6 +5,8 @@
 #include "platform/Text.h"
 
 #include <filesystem>
+#include <fstream>
+#include <string_view>
 #include <system_error>
 
 #include <fmt/format.h>
@@ -14,6 +16,16 @@ namespace {
 
 std::string rebuiltPath(const std::string& database) {
     return database + ".rebuilt";
+}
+
+/// The first bytes of the file, or fewer if it is shorter.
+std::string header(const std::string& path) {
+    constexpr std::size_t size = 100;
+    std::string bytes(size, '\0');
+    std::ifstream file(path, std::ios::binary);
+    file.read(bytes.data(), size);
+    bytes.resize(static_cast<std::size_t>(file.gcount()));
+    return bytes;
 }
 
 /// A name beside the database that is not taken yet: the same one until the database itself has it.
@@ -33,6 +45,14 @@ void moveIfThere(const std::string& from, const std::string& to) {
 
 }  // namespace
 
+bool isMarkedAsContentDatabase(const std::string& path) {
+    constexpr std::string_view magic = "SQLite format 3";
+    constexpr std::size_t place = 68;
+    const std::string bytes = header(path);
+    return bytes.size() > place + 4 && bytes.compare(0, magic.size(), magic) == 0 &&
+           bytes.compare(place, 4, "QVCD") == 0;
+}
+
 void removeDatabase(const std::string& path) {
     for (const char* part : {"", "-wal", "-shm", "-journal"}) {
         std::error_code ignored;
@@ -49,7 +69,7 @@ void declareRebuilt(const std::string& database) {
 }
 
 bool isRebuilt(const std::string& database) {
-    return fileExists(rebuiltPath(database));
+    return isMarkedAsContentDatabase(rebuiltPath(database));
 }
 
 std::string putAside(const std::string& database) {

@@ -7,9 +7,7 @@
 
 #include <array>
 #include <cstdint>
-#include <cstring>
 #include <filesystem>
-#include <fstream>
 
 #include <fmt/format.h>
 #include <unistd.h>
@@ -58,16 +56,6 @@ constexpr std::array kMigrations = {
     R"(ALTER TABLE folder ADD COLUMN part INTEGER NOT NULL DEFAULT 1;
        ALTER TABLE folder ADD COLUMN parts INTEGER NOT NULL DEFAULT 1;
        UPDATE folder SET digest = 0;)"};
-
-/// The first bytes of the file, or fewer if it is shorter.
-std::string header(const std::string& path) {
-    constexpr std::size_t size = 100;
-    std::string bytes(size, '\0');
-    std::ifstream file(path, std::ios::binary);
-    file.read(bytes.data(), size);
-    bytes.resize(static_cast<std::size_t>(file.gcount()));
-    return bytes;
-}
 
 [[noreturn]] void refuse(const std::string& path, ErrorCode code, std::string_view reason) {
     throw DatabaseFailure(code, fmt::format("{}: {}", printable(path), reason));
@@ -120,7 +108,7 @@ bool isEmptyFile(const std::string& path) {
 
 /// Made beside its place: a reader finds a whole database there, or none.
 void create(const std::string& path) {
-    const std::string unborn = path + ".new";
+    const std::string unborn = unfinishedPath(path);
     removeDatabase(unborn);
     {
         Connection connection(unborn, Connection::Access::create);
@@ -167,14 +155,6 @@ std::unique_ptr<Connection> openForReading(const std::string& path) {
 }
 
 }  // namespace
-
-bool isMarkedAsContentDatabase(const std::string& path) {
-    constexpr std::string_view magic = "SQLite format 3";
-    constexpr std::size_t place = 68;
-    const std::string bytes = header(path);
-    return bytes.size() > place + 4 && bytes.compare(0, magic.size(), magic) == 0 &&
-           bytes.compare(place, 4, "QVCD") == 0;
-}
 
 std::optional<std::string> reasonAgainstDatabase(const std::string& path) {
     if (isDirectory(path)) return "a folder, not a database";

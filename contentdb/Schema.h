@@ -18,7 +18,4 @@ std::unique_ptr<Connection> openDatabase(const std::string& path, Access access)
 /// Why what lies at the path cannot be a database, found without opening it: a folder, a pipe, a device.
 std::optional<std::string> reasonAgainstDatabase(const std::string& path);
 
-/// Whether the file carries the mark of a content database, damaged or not.
-bool isMarkedAsContentDatabase(const std::string& path);
-
 }  // namespace qvct::contentdb
