@@ -170,7 +170,8 @@ std::string QVCTMidiAnalysis::reasonForZero(const RhythmDetail& found) const {
     if (bar.empty()) return fmt::format("bars of {} beats have no metric weights", timeSigTop_);
     if (beatCount_ < timeSigTop_ || beatCount_ % timeSigTop_ != 0)
         return fmt::format("{} beats are no whole bars of {}/{}", beatCount_, timeSigTop_, timeSigBottom_);
-    if (timeSigBottom_ == 0 || bar.size() != static_cast<std::size_t>(32 / timeSigBottom_ * timeSigTop_))
+    if (timeSigBottom_ == 0 ||
+        static_cast<std::int64_t>(bar.size()) != std::int64_t{32 / timeSigBottom_} * timeSigTop_)
         return fmt::format("bars of {}/{} have no metric weights", timeSigTop_, timeSigBottom_);
     if (std::isnan(found.selfDissimilarity))
         return fmt::format("{} beats do not divide into halves and thirds down to an eighth of a beat",
