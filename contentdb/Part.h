@@ -13,7 +13,7 @@ struct Part {
     unsigned count = 1;
 
     bool holds(std::string_view folder, std::string_view name) const {
-        return count == 1 || stringHash(pathIn(folder, name)) % count == number - 1;
+        return count <= 1 || stringHash(pathIn(folder, name)) % count == number - 1;
     }
     bool operator==(const Part&) const = default;
 };

@@ -16,6 +16,7 @@ struct QVCT_API FileStamp {
     std::uint64_t size = 0;
     std::int64_t modifiedNanoseconds = 0;
 
+    /// Of what the system says of a file.
     static FileStamp of(const struct stat& status);
     /// Of the file that stands at `path` now, links followed; empty where there is none.
     static FileStamp ofFile(const std::string& path);
