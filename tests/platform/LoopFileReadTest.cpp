@@ -314,6 +314,51 @@ TEST(LoopFileRead, CountsTheFramesOfPackedAiffAudio) {
     }
 }
 
+TEST(LoopFileRead, CountsTheFramesOfCodedWavAudio) {
+    constexpr int kALaw = 6;
+    constexpr int kMuLaw = 7;
+    constexpr int kMsAdpcm = 2;
+    constexpr int kImaAdpcm = 0x11;
+    constexpr int kGsm = 0x31;
+    constexpr int kUnknown = 0x55;
+    struct {
+        int coding;
+        unsigned channels, bytesOfBlock;
+        std::uint32_t fact;
+        std::size_t bytes;
+        std::uint64_t frames;
+    } const cases[] = {
+        {kALaw, 1, 2, 2000, 1000, 1000},  // the header speaks of 16 bits
+        {kMuLaw, 2, 2, 0, 1000, 500},
+        {kMsAdpcm, 1, 256, 0, 2560, 5000},
+        {kMsAdpcm, 2, 512, 0, 5120, 5000},
+        {kMsAdpcm, 1, 256, 4990, 2560, 4990},          // the last block is filled up
+        {kMsAdpcm, 1, 256, 0xFFFFFFFF, 2560, 5000},    // more than there can be
+        {kImaAdpcm, 1, 256, 0, 2660, 5050 + 1 + 192},  // cut off within a block
+        {kImaAdpcm, 2, 256, 9000, 2560, 2490},
+        {kImaAdpcm, 2, 256, 1245, 2560, 2490},  // half of them, as some encoders write
+        {kImaAdpcm, 1, 0, 0, 2, 0},
+        {kGsm, 1, 65, 3100, 650, 3100},
+        {kGsm, 1, 65, 0, 650, 3200},
+        {kUnknown, 1, 1, 5000, 650, 5000},
+        {kUnknown, 1, 1, 0xFFFFFFFF, 22050, 44100},  // as the data rate makes likely
+    };
+    const Wav wav;
+    for (const auto& c : cases) {
+        const std::string format =
+            wav.chunk("fmt ", test::little(static_cast<unsigned>(c.coding), 2) + test::little(c.channels, 2) +
+                                  test::little(44100, 4) + test::little(22050, 4) +
+                                  test::little(c.bytesOfBlock, 2) + test::little(4, 2));
+        const std::string fact = c.fact == 0 ? "" : wav.chunk("fact", test::little(c.fact, 4));
+        const auto data = parserOf(wav.file(format + fact + wav.data(c.bytes)))->fileData();
+        ASSERT_TRUE(data);
+        EXPECT_EQ(data->frameCount(), c.frames) << c.coding << ", " << c.bytes << " bytes";
+    }
+    std::string caf = Caf::file(Caf::description(44100, 1) + Caf::data(1000));
+    caf.replace(caf.find("lpcm"), 4, "alaw");
+    EXPECT_EQ(parserOf(caf)->fileData()->frameCount(), 1000U);
+}
+
 TEST(LoopFileRead, ListsEveryChunkWithItsPlaceAndWhatIsWrongWithIt) {
     const Wav wav;
     const std::string file = wav.file(wav.format() + wav.chunk("\x86\x01te", "abcd") + wav.data(401) +

@@ -1,3 +1,4 @@
+#include "platform/AudioDecoder.h"
 #include "platform/FileAccess.h"
 #include "platform/LCFileParser.h"
 #include "platform/LCFileWriter.h"
@@ -13,7 +14,9 @@ namespace qvct {
 namespace {
 
 using test::Aiff;
+using test::big;
 using test::Caf;
+using test::little;
 using test::TemporaryFolder;
 using test::Wav;
 using testing::HasSubstr;
@@ -44,6 +47,14 @@ bool tag(const std::string& path, Error* error = nullptr) {
 /// Without any record.
 bool untag(const std::string& path, Error* error = nullptr) {
     return write(path, std::make_shared<LCFileData>(), error);
+}
+
+/// As libsndfile hears them.
+std::vector<float> samplesOf(const std::string& path) {
+    const auto decoder = AudioDecoder::open(path);
+    std::vector<float> samples(100000);
+    samples.resize(decoder ? decoder->read(samples) : 0);
+    return samples;
 }
 
 /// The four bytes of a size.
@@ -145,20 +156,73 @@ TEST(LoopFileWrite, TheRecordGoesBehindTheAudioExceptWhereTheAudioIsOpenEnded) {
     EXPECT_TRUE(contentsOf(open).ends_with(audio));
 }
 
-TEST(LoopFileWrite, AMissingLastPadByteIsAddedAndCounted) {
+/// Sizes and pad bytes that others write wrong, where all bytes are accounted for: afterwards they are right,
+/// what libsndfile hears is the same, and nothing else has changed.
+TEST(LoopFileWrite, PutsHarmlessSizesAndPadBytesRight) {
     const Wav wav;
-    const std::string whole = wav.file(wav.format() + wav.data(333));
-    const std::string uncounted = "RIFF" + test::little(whole.size() - 9, 4) + whole.substr(8);
-    for (const std::string& bytes :
-         {whole.substr(0, whole.size() - 1), uncounted, uncounted.substr(0, uncounted.size() - 1)}) {
+    const auto sized = [](const std::string& form, int more) {
+        const bool isBig = form.starts_with("FORM");
+        const std::uint64_t size = form.size() - 8 + static_cast<std::uint64_t>(more);
+        return form.substr(0, 4) + (isBig ? big(size, 4) : little(size, 4)) + form.substr(8);
+    };
+    const auto unpadded = [](const std::string& chunk) { return chunk.substr(0, chunk.size() - 1); };
+    const std::string mono = wav.format(1, 8000, 8);
+    const std::string even = wav.file(mono + wav.data(334));
+    const std::string odd = wav.file(mono + wav.data(333));
+    const std::string oddChunk = wav.chunk("odd ", "abc");
+    const std::string aiff = Aiff::file(Aiff::common(1, 333, 8) + Aiff::sound(333));
+    const std::string name = Aiff::chunk("NAME", "Sea");
+    const std::string zeros(16, '\0');
+    const std::string caf = Caf::file(Caf::description() + Caf::data());
+    struct {
+        const char* what;
+        std::string bytes;
+        std::string right;
+    } const cases[] = {
+        {"last pad missing, counted", unpadded(odd), odd},
+        {"last pad there, not counted", sized(odd, -1), odd},
+        {"last pad missing, not counted", sized(unpadded(odd), 0), odd},
+        {"one too large", sized(even, 1), even},
+        {"36 too small", sized(even, -36), even},
+        {"3 too small, last pad missing", sized(unpadded(odd), -3), odd},
+        {"two too large, last pad missing", sized(unpadded(odd), 2), odd},
+        {"size of the file", sized(even, 8), even},
+        {"AIFF: one too large", sized(aiff, 1), aiff},
+        {"AIFF: size of the file, last pad missing", sized(unpadded(aiff), 8), aiff},
+        {"4 zeros in the form", sized(even + zeros.substr(12), 0), even + zeros.substr(12)},
+        {"16 zeros in the form, last pad missing", sized(unpadded(odd) + zeros, 0), odd + zeros.substr(1)},
+        {"12 zeros behind the form", even + zeros.substr(4), even + zeros.substr(4)},
+        {"AIFF: 6 zeros in the form", sized(aiff + zeros.substr(10), 0), aiff + zeros.substr(10)},
+        {"CAF: 9 zeros", caf + zeros.substr(7), caf + zeros.substr(7)},
+        {"pad missing before the audio", wav.file(mono + unpadded(oddChunk) + wav.data(333)),
+         wav.file(mono + oddChunk + wav.data(333))},
+        {"pad missing behind the audio", wav.file(mono + unpadded(wav.data(333)) + oddChunk),
+         wav.file(mono + wav.data(333) + oddChunk)},
+        {"pad missing where the next chunk looks like one a byte later, too",
+         wav.file(mono + unpadded(wav.data(333)) + wav.chunk("smpl", std::string(36, '\0')) + oddChunk),
+         wav.file(mono + wav.data(333) + wav.chunk("smpl", std::string(36, '\0')) + oddChunk)},
+        {"two pads missing", wav.file(mono + unpadded(wav.data(333)) + unpadded(oddChunk)),
+         wav.file(mono + wav.data(333) + oddChunk)},
+        {"AIFF: pad missing before the audio",
+         Aiff::file(Aiff::common(1, 333, 8) + unpadded(name) + Aiff::sound(333)),
+         Aiff::file(Aiff::common(1, 333, 8) + name + Aiff::sound(333))},
+    };
+    for (const auto& c : cases) {
         const TemporaryFolder folder;
-        const std::string path = folder.write("a.wav", bytes);
+        const std::string path = folder.write("a", c.bytes);
+        const auto heard = samplesOf(path);
+        const auto before = fingerprintOfFile(URL::fileURLWithPath(path));
         Error error;
-        ASSERT_TRUE(tag(path, &error)) << error.message;
-        EXPECT_EQ(read(path)->taggingDictionary(), kTagging);
-        EXPECT_EQ(sizeAt(contentsOf(path), 4, 4, false), contentsOf(path).size() - 8);
+        ASSERT_TRUE(tag(path, &error)) << c.what << ": " << error.message;
+        EXPECT_EQ(read(path)->taggingDictionary(), kTagging) << c.what;
+        EXPECT_THAT(before->differences(*fingerprintOfFile(URL::fileURLWithPath(path))), testing::IsEmpty())
+            << c.what;
+        const auto after = samplesOf(path);
+        EXPECT_FALSE(after.empty()) << c.what;
+        // It finds no audio behind a missing pad byte.
+        EXPECT_TRUE(heard.empty() || heard == after) << c.what;
         ASSERT_TRUE(untag(path));
-        EXPECT_EQ(contentsOf(path), whole);
+        EXPECT_EQ(contentsOf(path), c.right) << c.what;
     }
 }
 
@@ -269,8 +333,9 @@ TEST(LoopFileWrite, RefusesWhatItCannotRewriteWithCertainty) {
         {"wav-never-finished.wav",
          "RIFF" + test::little(0, 4) + "WAVE" + start + "data" + test::little(0, 4) + "abcd",
          "byte 4 has no size"},
-        {"wav-pad-missing.wav", wav.file(start + wav.chunk("odd ", "abc").substr(0, 11) + wav.data()),
-         "chunk 'odd ' at byte 36: the pad byte"},
+        {"wav-cut-off-in-a-header.wav", wav.file(start + wav.data(40) + wav.chunk("junk", "")).substr(0, 89),
+         "byte 4 claims"},
+        {"wav-cut-off-behind-a-header.wav", wav.file(start + wav.data(400)).substr(0, 44), "byte 4 claims"},
         {"wav-invalid-id.wav", wav.file(start + wav.data(40) + wav.chunk("\1\2te", "")),
          "at byte 84: its id is invalid"},
         {"wav-two-formats.wav", wav.file(start + wav.format(1, 8000, 8) + wav.data()),
@@ -346,6 +411,7 @@ TEST(LoopFileWrite, RealAndMalformedFilesAreTaggedWithoutLossOrLeftAlone) {
     QVCT_SKIP_WITHOUT(root);
     int tagged = 0;
     int refused = 0;
+    int padded = 0;
     for (const char* part : {"audio", "malformed"}) {
         for (const std::string& file : test::filesBelow(test::corpus(part))) {
             const TemporaryFolder folder;
@@ -366,13 +432,17 @@ TEST(LoopFileWrite, RealAndMalformedFilesAreTaggedWithoutLossOrLeftAlone) {
             EXPECT_TRUE(before->differences(*after).empty()) << file;
             ASSERT_TRUE(untag(path, &error)) << error.message;
             const std::string back = contentsOf(path);
-            // A missing last pad byte was added; a size that left it out is put right.
+            // A missing last pad byte was added; a size that left it out is put right. Two lack others.
             const std::string whole = bytes + std::string(bytes.size() % 2, '\0');
-            EXPECT_TRUE(back.substr(8) == whole.substr(8)) << file;
+            padded += back.size() == whole.size() ? 0 : 1;
+            EXPECT_TRUE(back.size() != whole.size() || back.substr(8) == whole.substr(8)) << file;
+            const auto untagged = fingerprintOfFile(URL::fileURLWithPath(path));
+            EXPECT_THAT(before->differences(*untagged), testing::IsEmpty()) << file;
         }
     }
     EXPECT_EQ(tagged + refused, 117);
     EXPECT_GE(tagged, 100);
+    EXPECT_EQ(padded, 2);
 }
 
 }  // namespace

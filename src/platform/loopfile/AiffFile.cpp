@@ -63,7 +63,8 @@ Packing packingOf(std::uint32_t coding, std::uint32_t bits) {
 std::uint64_t framesOf(std::uint32_t coding, const LCAudioFacts& header, std::uint64_t bytes) {
     const Packing packing = packingOf(coding, header.bitsPerSample);
     const std::uint64_t packet = std::uint64_t{packing.bytes} * header.channelCount;
-    if (packet == 0) return coding == fourCC("DWVW") ? header.frameCount : 0;
+    // At least a bit a sample.
+    if (packet == 0) return coding == fourCC("DWVW") ? std::min(header.frameCount, 8 * bytes) : 0;
     const std::uint64_t held = bytes / packet * packing.frames;
     return coding == fourCC("ima4") ? held : std::min(header.frameCount, held);
 }

@@ -58,7 +58,8 @@ void CafFile::walk() {
         at = chunk.end;
         chunks_.push_back(chunk);
     }
-    if (fault_.empty() && at < fileEnd) {
+    chunksEnd_ = at;
+    if (fault_.empty() && at < fileEnd && !areFiller(at, fileEnd)) {
         fault_ = fmt::format("{} bytes at byte {} are no chunk that is known of", fileEnd - at, at);
     }
 }
@@ -85,36 +86,43 @@ bool CafFile::readFacts(LCAudioFacts& facts, Error* error) const {
 bool CafFile::readFormat(const Chunk& description, LCAudioFacts& facts, Error* error) const {
     BoundedCursor header = cursor(description);
     facts.sampleRate = header.f64();
-    header.skip(8);  // coding and its flags
-    const std::uint32_t bytesPerPacket = header.u32();
-    const std::uint32_t framesPerPacket = header.u32();
+    const std::uint32_t coding = header.fourCC();
+    header.skip(4);  // its flags
+    std::uint32_t bytesPerPacket = header.u32();
+    std::uint32_t framesPerPacket = header.u32();
     facts.channelCount = header.u32();
     facts.bitsPerSample = header.u32();
     if (header.failed()) return failAt(error, description, "is too short");
     if (!checkFormat(facts, description, error)) return false;
-    if (bytesPerPacket == 0) {
-        facts.frameCount = packetTableFrames();
-        return true;
+    if (coding == fourCC("alaw") || coding == fourCC("ulaw")) {
+        bytesPerPacket = facts.channelCount;  // a byte a sample, whatever the header says
+        framesPerPacket = 1;
     }
     const Chunk& data = *find(Chunk::Role::audio);
-    const std::uint64_t packets = data.size < kEditCount ? 0 : (data.size - kEditCount) / bytesPerPacket;
+    const std::uint64_t bytes = data.size < kEditCount ? 0 : data.size - kEditCount;
     constexpr std::uint32_t kMostFramesPerPacket = 1U << 20U;
     if (framesPerPacket > kMostFramesPerPacket) {
         return failAt(error, description,
                       fmt::format("{} frames in a packet are out of range", framesPerPacket));
     }
-    facts.frameCount = packets * framesPerPacket;
+    facts.frameCount = bytesPerPacket == 0 ? packetTableFrames(bytes, framesPerPacket)
+                                           : bytes / bytesPerPacket * framesPerPacket;
     return true;
 }
 
-std::uint64_t CafFile::packetTableFrames() const {
+/// What the table of packets of varying size says, as far as there can be so many packets: each has a byte of
+/// audio at least.
+std::uint64_t CafFile::packetTableFrames(std::uint64_t bytes, std::uint32_t framesPerPacket) const {
     const Chunk* table = find(fourCC("pakt"));
     if (table == nullptr) return 0;
     BoundedCursor contents = cursor(*table);
-    contents.skip(8);  // number of packets
+    const std::int64_t packets = contents.i64();
     const std::int64_t frames = contents.i64();
-    constexpr std::int64_t kMost = std::int64_t{1} << 48;
-    return contents.failed() || frames < 0 || frames > kMost ? 0 : static_cast<std::uint64_t>(frames);
+    if (contents.failed() || packets < 0 || frames < 0) return 0;
+    constexpr std::uint64_t kMost = std::uint64_t{1} << 48U;
+    const std::uint64_t held = std::min(static_cast<std::uint64_t>(packets), bytes);
+    const std::uint64_t most = framesPerPacket == 0 ? kMost : held * framesPerPacket;
+    return std::min(static_cast<std::uint64_t>(frames), most);
 }
 
 std::optional<std::vector<FilePiece>> CafFile::piecesWith(const std::string& record, Error* /*error*/) const {
@@ -131,6 +139,7 @@ std::optional<std::vector<FilePiece>> CafFile::piecesWith(const std::string& rec
         if (chunk.role != Chunk::Role::record) pieces.addRange(chunk.offset, chunk.end);
     }
     if (openEnd == nullptr) pieces.addBytes(ours);
+    pieces.addRange(chunksEnd_, window_.size());
     return pieces.take();
 }
 

@@ -30,9 +30,10 @@ class CafFile : public Container {
     void walk();
     bool isRecord(const Chunk& chunk) const;
     bool readFormat(const Chunk& description, LCAudioFacts& facts, Error* error) const;
-    std::uint64_t packetTableFrames() const;
+    std::uint64_t packetTableFrames(std::uint64_t bytes, std::uint32_t framesPerPacket) const;
 
     bool endsOpen_ = false;  // with audio of size -1
+    std::uint64_t chunksEnd_ = 0;
     std::string fault_;
 };
 

@@ -13,6 +13,8 @@
 namespace qvct {
 namespace {
 
+constexpr std::uint64_t kMostFiller = 4096;
+
 std::string charactersOf(std::uint32_t code) {
     std::string text;
     for (int shift = 24; shift >= 0; shift -= 8)
@@ -103,6 +105,13 @@ std::optional<std::vector<std::uint8_t>> Container::recordBytes() const {
     auto bytes = contents.bytes(chunk->size);
     if (contents.failed()) return std::nullopt;
     return bytes;
+}
+
+bool Container::areFiller(std::uint64_t begin, std::uint64_t end) const {
+    if (begin >= end || end - begin > kMostFiller) return false;
+    const auto bytes = BoundedCursor(window_, order_, begin, end - begin).bytes(end - begin);
+    return std::all_of(bytes.begin(), bytes.end(), [](std::uint8_t byte) { return byte == 0; }) &&
+           bytes.size() == end - begin;
 }
 
 std::optional<std::vector<FilePiece>> Container::rewritten(const std::string& record, Error* error) const {

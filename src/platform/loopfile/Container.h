@@ -101,6 +101,8 @@ class Container {
   protected:
     Container(ReadWindow& window, ByteOrder order) : window_(window), order_(order) {}
 
+    /// Whether the bytes behind the last chunk only fill the file up: few, and all of them zero.
+    bool areFiller(std::uint64_t begin, std::uint64_t end) const;
     virtual std::optional<std::vector<FilePiece>> piecesWith(const std::string& record,
                                                              Error* error) const = 0;
 

@@ -16,12 +16,13 @@ bool isOdd(std::uint64_t value) {
 
 /// Whether the chunk is of odd size and ends without its pad byte.
 bool lacksPad(const Chunk& chunk) {
-    return isOdd(chunk.end);
+    return isOdd(chunk.size) && chunk.end == chunk.contents + chunk.size;
 }
 
 }  // namespace
 
 Chunk IffFile::chunkAt(std::uint64_t offset) const {
+    const std::uint64_t fileEnd = window_.size();
     BoundedCursor header(window_, order_, offset, formEnd_ - offset);
     Chunk chunk;
     chunk.id = header.fourCC();
@@ -33,17 +34,27 @@ Chunk IffFile::chunkAt(std::uint64_t offset) const {
         chunk.contents = chunk.end = formEnd_;
         return chunk;
     }
-    chunk.size = std::min(declared, formEnd_ - chunk.contents);
-    chunk.end = std::min(chunk.contents + chunk.size + (chunk.size & 1U), formEnd_);
+    chunk.size = std::min(declared, fileEnd - chunk.contents);
+    const std::uint64_t contentsEnd = chunk.contents + chunk.size;
+    chunk.end = std::min(contentsEnd + (chunk.size & 1U), std::max(contentsEnd, formEnd_));
     if (!isPrintableCode(chunk.id)) chunk.fault = "its id is invalid";
     if (chunk.size < declared) chunk.fault = "claims more bytes than there are";
     return chunk;
 }
 
-/// Some writers forget the pad byte; then the next header lies one byte before the place where it belongs.
+/// Whether the chunk is sound, and another one or the end follows it.
+bool IffFile::leadsOn(const Chunk& chunk) const {
+    if (chunk.fault != nullptr) return false;
+    if (chunk.end >= formEnd_ || formEnd_ - chunk.end < kChunkHeader) return true;
+    const bool mayLackPad = isOdd(chunk.size) && chunkAt(chunk.end - 1).fault == nullptr;
+    return mayLackPad || chunkAt(chunk.end).fault == nullptr || areFiller(chunk.end, formEnd_);
+}
+
+/// Some writers forget the pad byte; then the next header lies one byte before the place where it belongs. A
+/// byte later it may look like one, too.
 bool IffFile::startsOneByteEarlier(const Chunk& chunk) const {
-    if (chunk.fault == nullptr || chunks_.empty() || !isOdd(chunks_.back().size)) return false;
-    return chunkAt(chunk.offset - 1).fault == nullptr;
+    if (chunks_.empty() || !isOdd(chunks_.back().size) || leadsOn(chunk)) return false;
+    return leadsOn(chunkAt(chunk.offset - 1));
 }
 
 void IffFile::walk(std::uint64_t formSize, bool isOpenEnded) {
@@ -57,7 +68,6 @@ void IffFile::walk(std::uint64_t formSize, bool isOpenEnded) {
         if (startsOneByteEarlier(chunk)) {
             chunk = chunkAt(at - 1);
             chunks_.back().end = at - 1;
-            chunks_.back().fault = "the pad byte behind it is missing";
         }
         if (chunk.id == 0) break;  // zeros fill the rest
         const bool holdsTheRest = isOpenEnded && isAudio(chunk.id) && chunk.size == 0;
@@ -68,24 +78,27 @@ void IffFile::walk(std::uint64_t formSize, bool isOpenEnded) {
         if (isAudio(chunk.id)) chunk.role = Chunk::Role::audio;
         if (const auto signature = signatureOf(chunk)) chunk.becomeRecord(*signature);
         at = chunk.end;
+        formEnd_ = std::max(formEnd_, at);  // its size may be too small
         chunks_.push_back(chunk);
     }
-    takeOverPad(declaredEnd, isOpenEnded);
+    takeOverPad();
     at = chunks_.empty() ? at : chunks_.back().end;
-    if (fault_.empty() && at < formEnd_) {
+    if (areFiller(at, formEnd_)) formEnd_ = at;
+    if (isOpenEnded) return;
+    if (at < formEnd_) {
         fault_ = fmt::format("{} bytes at byte {} are no chunk that is known of", formEnd_ - at, at);
+    }
+    // A size that is too large is common, and harmless where all chunks are whole.
+    const bool isCutOff = chunks_.empty() || chunks_.back().fault != nullptr || at < formEnd_;
+    if (declaredEnd > fileEnd && isCutOff) {
+        fault_ = fmt::format("the form at byte 4 claims {} bytes, the file has {}", declaredEnd, fileEnd);
     }
 }
 
-/// A size that leaves out the last pad byte, or counts one that is missing, is common and harmless.
-void IffFile::takeOverPad(std::uint64_t declaredEnd, bool isOpenEnded) {
-    const std::uint64_t fileEnd = window_.size();
+/// A size that leaves out the last pad byte is common and harmless.
+void IffFile::takeOverPad() {
     const bool endsOdd = !chunks_.empty() && chunks_.back().end == formEnd_ && lacksPad(chunks_.back());
-    if (endsOdd && formEnd_ < fileEnd) chunks_.back().end = ++formEnd_;
-    const bool countsMissingPad = endsOdd && declaredEnd == fileEnd + 1;
-    if (!isOpenEnded && declaredEnd > fileEnd && !countsMissingPad) {
-        fault_ = fmt::format("the form at byte 4 claims {} bytes, the file has {}", declaredEnd, fileEnd);
-    }
+    if (endsOdd && formEnd_ < window_.size()) chunks_.back().end = ++formEnd_;
 }
 
 std::string IffFile::number(std::uint64_t value, std::size_t width) const {
@@ -112,11 +125,9 @@ void IffFile::addChunk(PieceList& pieces, const Chunk& chunk, std::uint64_t /*fo
 std::optional<std::vector<FilePiece>> IffFile::piecesWith(const std::string& record, Error* error) const {
     const std::string ours = recordChunk(record);
     std::uint64_t formSize = kFormHeader - kChunkHeader + ours.size();
-    bool lastLacksPad = false;
     for (const Chunk& chunk : chunks_) {
         if (chunk.role == Chunk::Role::record) continue;
-        lastLacksPad = lacksPad(chunk);
-        formSize += chunk.end - chunk.offset + (lastLacksPad ? 1 : 0);
+        formSize += chunk.end - chunk.offset + (lacksPad(chunk) ? 1 : 0);
     }
     if (!canGrowTo(formSize)) {
         fail(error, kErrorTooLarge,
@@ -127,9 +138,10 @@ std::optional<std::vector<FilePiece>> IffFile::piecesWith(const std::string& rec
     PieceList pieces;
     pieces.addBytes(formHeader(formSize));
     for (const Chunk& chunk : chunks_) {
-        if (chunk.role != Chunk::Role::record) addChunk(pieces, chunk, formSize);
+        if (chunk.role == Chunk::Role::record) continue;
+        addChunk(pieces, chunk, formSize);
+        if (lacksPad(chunk)) pieces.addBytes(std::string(1, '\0'));
     }
-    if (lastLacksPad) pieces.addBytes(std::string(1, '\0'));
     pieces.addBytes(ours);
     pieces.addRange(formEnd_, window_.size());
     return pieces.take();

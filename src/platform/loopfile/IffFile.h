@@ -7,7 +7,8 @@ namespace qvct {
 /// What WAV and AIFF share: one form of 12 bytes, and in it chunks of an 8-byte header, contents and a pad
 /// byte after an odd size.
 ///
-/// Our chunk always goes to the end of the form, so that the audio stays where it is.
+/// Our chunk always goes to the end of the form, so that the audio stays where it is; what else lies behind
+/// the chunks follows it. Pad bytes that are missing are added.
 class IffFile : public Container {
   public:
     std::string fault() const override { return fault_; }
@@ -37,8 +38,9 @@ class IffFile : public Container {
 
   private:
     Chunk chunkAt(std::uint64_t offset) const;
+    bool leadsOn(const Chunk& chunk) const;
     bool startsOneByteEarlier(const Chunk& chunk) const;
-    void takeOverPad(std::uint64_t declaredEnd, bool isOpenEnded);
+    void takeOverPad();
     std::string recordChunk(const std::string& record) const;
 
     std::uint64_t formEnd_ = 0;  ///< At most the file's.

@@ -10,7 +10,29 @@ namespace {
 constexpr std::uint32_t kInLongSizes = 0xFFFFFFFF;  // the size stands in ds64
 constexpr std::uint16_t kPcm = 1;
 constexpr std::uint16_t kFloat = 3;
+constexpr std::uint16_t kMsAdpcm = 2;
+constexpr std::uint16_t kALaw = 6;
+constexpr std::uint16_t kMuLaw = 7;
+constexpr std::uint16_t kImaAdpcm = 0x11;
+constexpr std::uint16_t kGsm = 0x31;
 constexpr std::uint16_t kExtensible = 0xFFFE;
+
+/// A coding whose blocks each begin with a header, and hold as many frames as their size tells.
+struct BlockCoding {
+    std::uint64_t header = 0;  ///< Bytes a channel.
+    std::uint64_t framesOfHeader = 0;
+    std::uint64_t framesOfByte = 0;  ///< Of one channel.
+
+    std::uint64_t framesOf(std::uint64_t bytes, std::uint64_t channels) const {
+        if (bytes < header * channels) return 0;
+        return framesOfHeader + (bytes - header * channels) * framesOfByte / channels;
+    }
+};
+
+constexpr BlockCoding kBlocksOfMsAdpcm{7, 2, 2};
+constexpr BlockCoding kBlocksOfImaAdpcm{4, 1, 2};
+constexpr std::uint64_t kGsmBlock = 65;
+constexpr std::uint64_t kGsmFrames = 320;
 
 }  // namespace
 
@@ -105,7 +127,7 @@ bool WavFile::readFormat(const Chunk& format, const Chunk& data, LCAudioFacts& f
     }
     if (!checkFormat(facts, format, error)) return false;
     if (coding != kPcm && coding != kFloat) {
-        facts.frameCount = codedFrames(data.size, bytesPerSecond, facts.sampleRate);
+        facts.frameCount = codedFrames({coding, bytesPerSecond, bytesPerFrame}, data.size, facts);
         return true;
     }
     const std::uint32_t needed = (facts.bitsPerSample + 7U) / 8U * facts.channelCount;
@@ -118,17 +140,50 @@ bool WavFile::readFormat(const Chunk& format, const Chunk& data, LCAudioFacts& f
     return true;
 }
 
-/// For codings whose frames have no fixed size: what the file says, else what its data rate makes likely.
-std::uint64_t WavFile::codedFrames(std::uint64_t dataSize, std::uint32_t bytesPerSecond,
-                                   double sampleRate) const {
-    if (const Chunk* fact = find(fourCC("fact"))) {
-        BoundedCursor contents = cursor(*fact);
-        const std::uint32_t frames = contents.u32();
-        if (isLong() && frames == kInLongSizes) return longSizes_.frames;
-        if (!contents.failed() && frames > 0) return frames;
+std::uint64_t WavFile::codedFrames(const Coding& coding, std::uint64_t bytes,
+                                   const LCAudioFacts& facts) const {
+    const std::uint64_t channels = facts.channelCount;
+    switch (coding.number) {
+        case kALaw:
+        case kMuLaw:
+            return bytes / channels;  // a byte a sample, whatever the header says of frames and rate
+        case kMsAdpcm:
+        case kImaAdpcm: {
+            const BlockCoding& blocks = coding.number == kMsAdpcm ? kBlocksOfMsAdpcm : kBlocksOfImaAdpcm;
+            const std::uint64_t size = coding.bytesPerBlock == 0 ? bytes + 1 : coding.bytesPerBlock;
+            const std::uint64_t framesOfBlock = blocks.framesOf(size, channels);
+            const std::uint64_t framesOfRest = blocks.framesOf(bytes % size, channels);
+            return saidFrames(bytes / size * framesOfBlock + framesOfRest, framesOfBlock);
+        }
+        case kGsm:
+            return saidFrames(bytes / kGsmBlock * kGsmFrames, kGsmFrames);
+        default:
+            return likelyFrames(coding, bytes, facts.sampleRate);
     }
-    if (bytesPerSecond == 0) return 0;
-    return static_cast<std::uint64_t>(static_cast<double>(dataSize) / bytesPerSecond * sampleRate);
+}
+
+/// The number of frames in `fact`; 0 for none.
+std::uint64_t WavFile::factFrames() const {
+    const Chunk* fact = find(fourCC("fact"));
+    if (fact == nullptr) return 0;
+    const std::uint32_t frames = cursor(*fact).u32();
+    return isLong() && frames == kInLongSizes ? longSizes_.frames : frames;
+}
+
+/// The last blocks are filled up: what `fact` says counts where it leaves out no more than two of them, as
+/// encoders write them. Some say half of the frames of a stereo file.
+std::uint64_t WavFile::saidFrames(std::uint64_t held, std::uint64_t framesOfBlock) const {
+    const std::uint64_t said = factFrames();
+    return said > 0 && said < held && held - said < 2 * framesOfBlock ? said : held;
+}
+
+/// For codings that nothing is known of: what the file says, else what its data rate makes likely.
+std::uint64_t WavFile::likelyFrames(const Coding& coding, std::uint64_t bytes, double sampleRate) const {
+    constexpr std::uint64_t kMostFramesOfByte = 64;  // far above what any coding packs
+    const std::uint64_t said = factFrames();
+    if (said > 0 && said / kMostFramesOfByte <= bytes) return said;
+    if (coding.bytesPerSecond == 0) return 0;
+    return static_cast<std::uint64_t>(static_cast<double>(bytes) / coding.bytesPerSecond * sampleRate);
 }
 
 std::optional<std::uint64_t> WavFile::signatureOf(const Chunk& chunk) const {

@@ -35,11 +35,21 @@ class WavFile : public IffFile {
         std::vector<std::pair<std::uint32_t, std::uint64_t>> others;
     };
 
+    /// What the header says of audio that is neither PCM nor float.
+    struct Coding {
+        std::uint16_t number = 0;
+        std::uint32_t bytesPerSecond = 0;
+        std::uint16_t bytesPerBlock = 0;
+    };
+
     bool isLong() const { return magic_ == fourCC("RF64") || magic_ == fourCC("BW64"); }
     void readLongSizes();
     void refuseContradictions();
     bool readFormat(const Chunk& format, const Chunk& data, LCAudioFacts& facts, Error* error) const;
-    std::uint64_t codedFrames(std::uint64_t dataSize, std::uint32_t bytesPerSecond, double sampleRate) const;
+    std::uint64_t codedFrames(const Coding& coding, std::uint64_t bytes, const LCAudioFacts& facts) const;
+    std::uint64_t factFrames() const;
+    std::uint64_t saidFrames(std::uint64_t held, std::uint64_t framesOfBlock) const;
+    std::uint64_t likelyFrames(const Coding& coding, std::uint64_t bytes, double sampleRate) const;
 
     std::uint32_t magic_;
     std::uint32_t shortFormSize_ = 0;
