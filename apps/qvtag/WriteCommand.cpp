@@ -99,8 +99,10 @@ void updateSubType(const Change& change) {
 }
 
 bool write(const Change& change, const Options& options, Error* error) {
-    const ContentWriteOptions how{
-        .keepsTimes = options.keepsTimes, .verifies = options.verifies, .expected = change.former};
+    const ContentWriteOptions how{.keepsTimes = options.keepsTimes,
+                                  .verifies = options.verifies,
+                                  .isDryRun = options.isDryRun,
+                                  .expected = change.former};
     const auto node = TGRTFileNode::nodeWithFileURL(change.url);
     if (change.newName) {
         updateSubType(change);
@@ -111,14 +113,17 @@ bool write(const Change& change, const Options& options, Error* error) {
     return writer && writer->writeTaggings(change.record->taggings(), change.url, error, how);
 }
 
-/// Whether the item was written; what a verification finds afterwards is reported here.
+/// Whether the item was written, or in a dry run would be; what a verification finds afterwards is reported
+/// here.
 bool carryOut(Change& change, const Options& options, ToolContext& context, Error* error) {
     if (options.verifies) {
         change.verification = Verification::before(change.url, error);
         if (!change.verification) return false;
     }
-    change.isWritten = write(change, options, error);
-    if (!change.isWritten || !change.verification) return change.isWritten;
+    const bool isDone = write(change, options, error);
+    if (options.isDryRun) change.verification.reset();
+    change.isWritten = isDone && !options.isDryRun;
+    if (!isDone || !change.verification) return isDone;
     change.faults = change.verification->faultsAfterWriting(*change.record);
     for (const std::string& fault : change.faults)
         context.itemFailed(fmt::format("{}: {}", printable(change.url.path()), fault));
@@ -147,7 +152,7 @@ std::optional<Change> editItem(const URL& url, const TaggingEdit& edit, const Op
     for (int attempt = 0; turn && attempt < kAttempts; ++attempt) {
         const FileStamp former = FileStamp::ofFile(record);
         auto change = changeOfItem(url, edit, options, context);
-        if (!change || change->isNone() || options.isDryRun) return change;
+        if (!change || change->isNone()) return change;
         change->former = former;
         error = {};
         if (carryOut(*change, options, context, &error)) return change;

@@ -20,6 +20,8 @@ struct ContentWriteOptions {
     /// Audio files: the new file is compared with the old one before it takes its place, and abandoned when
     /// more than our record differs.
     bool verifies = false;
+    /// Every check is made that a write makes, and nothing is written: whether it would be is the answer.
+    bool isDryRun = false;
     /// The state of the file that holds the record (`recordURL`) when what is written was decided; another
     /// one is an error, and what another program saved stays. Without it, the state when the call begins.
     std::optional<FileStamp> expected = std::nullopt;

@@ -39,6 +39,8 @@ bool changeStoredFile(
     std::string stored;
     FileReplacementOptions how;
     how.keepsTimes = options.keepsTimes;
+    how.isDryRun = options.isDryRun;
+    how.makesFolders = path.starts_with(item.path() + "/");  // they are the item's own
     how.expected = options.expected.value_or(stamp);
     if (isThere) {
         const auto bytes = readFile(path, error);

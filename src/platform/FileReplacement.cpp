@@ -134,9 +134,12 @@ class Replacement {
 
     bool run(std::span<const FilePiece> pieces) {
         if (!openOld()) return false;
+        if (options_.isDryRun) return canMakeFile();
+        std::error_code notMade;  // the file cannot be made then, either
+        if (options_.makesFolders) std::filesystem::create_directories(folder_, notMade);
         removeLeftFiles(folder_);
         UnfinishedFile made(folder_, old_ ? 0600 : 0666);
-        if (!made.isOpen()) return failWithErrno(error_, path_, "cannot make a file beside it");
+        if (!made.isOpen()) return failToMake();
         if (!write(pieces, made.descriptor())) return false;
         if (options_.check && !options_.check(made.path(), error_)) return false;
         return takeOver(made) && takePlace(made);
@@ -159,6 +162,17 @@ class Replacement {
         }
         return isExpected(FileStamp::of(status_));
     }
+
+    bool canMakeFile() const {
+        std::filesystem::path folder = folder_;
+        std::error_code unknown;
+        while (options_.makesFolders && !exists(folder, unknown) && folder.has_relative_path())
+            folder = folder.parent_path();
+        // The dot makes it an error when that is no folder.
+        return ::faccessat(AT_FDCWD, (folder / ".").c_str(), W_OK | X_OK, AT_EACCESS) == 0 || failToMake();
+    }
+
+    bool failToMake() const { return failWithErrno(error_, path_, "cannot make a file beside it"); }
 
     bool isExpected(const FileStamp& stamp) const {
         return !options_.expected || stamp == *options_.expected || failForOtherSave();

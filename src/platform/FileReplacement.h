@@ -19,7 +19,9 @@ struct FilePiece {
 };
 
 struct FileReplacementOptions {
-    bool keepsTimes = false;  ///< The new file takes over the times of access and change.
+    bool keepsTimes = false;    ///< The new file takes over the times of access and change.
+    bool isDryRun = false;      ///< What would refuse the replacement does, and nothing is made.
+    bool makesFolders = false;  ///< Folders that are missing on the way to the file are made.
     /// The state of the old file that the pieces were made for (empty: that there was none). Whatever else
     /// stands at the path when the new file is to take its place is an error, and stays.
     std::optional<FileStamp> expected;

@@ -54,13 +54,14 @@ bool isSameOutsideOfTheRecord(const std::string& path, const LCFingerprint& befo
                             join(differences, "; ")));
 }
 
-bool makeLoopDataFile(const std::string& path, const std::string& record, Error* error) {
+bool makeLoopDataFile(const std::string& path, const std::string& record, bool isDryRun, Error* error) {
     if (record.empty()) {
         return failFor(error, path,
                        {{}, kErrorInvalidArgument, "a loop data file cannot be without a record"});
     }
     const FilePiece whole{.bytes = record};
     FileReplacementOptions options;
+    options.isDryRun = isDryRun;
     options.expected = FileStamp{};
     return replaceFileByPieces(path, {&whole, 1}, options, error);
 }
@@ -90,7 +91,8 @@ bool LCFileWriter::writeFileData(const std::shared_ptr<const LCFileData>& data, 
     }
     const auto turn = EditLock::acquire(path_, error);
     if (!turn) return false;
-    if (LoopDataFile::isName(path_) && isMissing(path_)) return makeLoopDataFile(path_, record, error);
+    if (LoopDataFile::isName(path_) && isMissing(path_))
+        return makeLoopDataFile(path_, record, options_.isDryRun, error);
 
     const auto reader = FileReader::open(path_, error);
     if (!reader) return false;
@@ -107,6 +109,7 @@ bool LCFileWriter::writeFileData(const std::shared_ptr<const LCFileData>& data, 
 
     FileReplacementOptions options;
     options.keepsTimes = options_.keepsTimes;
+    options.isDryRun = options_.isDryRun;
     options.expected = options_.expected.value_or(reader->stamp());
     if (options_.verifies) {
         const auto before = fingerprintOfReader(*reader, path_, error);

@@ -24,6 +24,7 @@ bool changeFileData(const URL& url, bool isLoopType, const std::function<void(LC
     fileData->setTavioLoopType(isLoopType ? fileData->tavioLoopType() : -1);
     const LCWriteOptions how{.keepsTimes = options.keepsTimes,
                              .verifies = options.verifies,
+                             .isDryRun = options.isDryRun,
                              .expected = options.expected.value_or(stamp)};
     return LCFileWriter::fileWriterForURL(url, how)->writeFileData(fileData, error);
 }
