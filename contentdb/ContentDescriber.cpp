@@ -5,6 +5,7 @@
 #include "contentdb/Decimal.h"
 #include "contentdb/Digest.h"
 #include "contentdb/PayloadHash.h"
+#include "formats/TGRTFileNode.h"
 #include "formats/TGRTMetaDataReaderFactory.h"
 #include "indexing/TGRTIndexableContentObject.h"
 #include "platform/FileAccess.h"
@@ -128,8 +129,10 @@ struct ContentDescriber::Implementation {
         R"((?<![\d.,])(\d{2,3}(?:[.,]\d+)?)[\s_-]?bpm(?![\p{L}\d]))", RegularExpression::Case::insensitive);
 
     std::shared_ptr<TGRTMetaData> record(const URL& url, Error& error) const {
-        const auto reader = TGRTMetaDataReaderFactory::metaDataReaderForURL(url, taxonomyOfRecords);
-        return reader ? reader->readMetaDataFromURL(url, kOptions, &error) : nullptr;
+        const auto node = TGRTFileNode::nodeWithFileURL(url);
+        const bool isContent = TGRTMetaDataReaderFactory::metaDataReaderForURL(url, taxonomyOfRecords) ||
+                               node->validator();  // audio, whatever its extension
+        return isContent ? node->readMetaDataWithOptions(kOptions, taxonomyOfRecords, &error) : nullptr;
     }
 
     void addAllTaggings(IndexedItem& item, const URL& url, const TGRTMetaData* record,

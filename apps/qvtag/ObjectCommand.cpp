@@ -3,6 +3,7 @@
 #include "PropertyListOutput.h"
 #include "RecordOutput.h"
 #include "StandardStreams.h"
+#include "formats/TGRTFileNode.h"
 #include "indexing/TGRTIndexableContentObject.h"
 #include "platform/QVContentTaggingTypes.h"
 #include "platform/Text.h"
@@ -22,6 +23,15 @@ struct Options {
 };
 
 using ContentObject = QVContentTaggingIndexableContentObject;
+
+/// As `indexableContentObjectForURL`, also of audio whose extension is none of content.
+std::shared_ptr<ContentObject> objectOf(const URL& url, std::uint64_t bits, Error* error) {
+    const auto taxonomy = TGRTIndexableContentObject::taxonomyForOptions(bits);
+    const auto record = TGRTFileNode::nodeWithFileURL(url)->readMetaDataWithOptions(bits, taxonomy, error);
+    const bool isKnown = record && record->fileType() != kFileTypeNone;
+    if (!isKnown && (bits & kIndexWithoutRecord) == 0) return nullptr;
+    return TGRTIndexableContentObject::indexableContentObjectForMetaData(record.get(), url, *taxonomy);
+}
 
 Json jsonOfObject(const URL& url, const ContentObject& object) {
     Json json;
@@ -69,8 +79,7 @@ void run(const Options& options, ToolContext& context) {
     for (const URL& url : context.contentItems(options.paths, options.links)) {
         if (isOutputLost()) break;
         Error error;
-        const auto object =
-            TGRTIndexableContentObject::indexableContentObjectForURL(url, options.bits, &error);
+        const auto object = objectOf(url, options.bits, &error);
         if (!error.message.empty()) {
             context.itemFailed(error.message);
         } else if (!object) {

@@ -8,7 +8,7 @@ namespace qvct {
 
 FileType QVContentTaggingTypes::fallBackFileTypeForURL(const URL& url) {
     using Row = std::pair<std::string_view, FileType>;
-    constexpr std::array<Row, 13> types = {{{"patch", kFileTypePatch},
+    constexpr std::array<Row, 14> types = {{{"patch", kFileTypePatch},
                                             {"loopdata", kFileTypeLoop},
                                             {"vcp", kFileTypeSynthPreset},
                                             {"sxv", kFileTypeSamplerSettings},
@@ -20,6 +20,7 @@ FileType QVContentTaggingTypes::fallBackFileTypeForURL(const URL& url) {
                                             {"aifc", kFileTypeAudioFile},
                                             {"caf", kFileTypeAudioFile},
                                             {"wav", kFileTypeAudioFile},
+                                            {"wave", kFileTypeAudioFile},
                                             {"ostrax", kFileTypeProject}}};
     const std::string extension = url.lowercasePathExtension();
     const auto* hit = std::find_if(types.begin(), types.end(),

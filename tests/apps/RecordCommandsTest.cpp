@@ -151,6 +151,36 @@ TEST(Write, DryRunShowsTheDifferenceAndTouchesNothing) {
     EXPECT_EQ(contents(), before);
 }
 
+TEST(Write, ADryRunRefusesWhatTheWriteRefuses) {
+    const Items items;
+    const Wav wav;
+    items.folder.write("cut.wav", wav.file(wav.format() + wav.data()).substr(0, 400));
+    items.folder.write("unreadable.wav", wav.file(wav.format() + wav.data() + wav.chunk("qvct", "bplist")));
+    items.folder.write("open.vcp", "<tagging>\n");
+    items.folder.write("broken.cst", "settings");
+    items.folder.write("broken.cst.plist", "no list");
+    items.folder.write("Folder.patch/tags.plist/inner", "");
+    items.folder.write("Taken.ostrax/Resources", "no folder");
+    std::filesystem::permissions(items.folder.path("shot.aif"), std::filesystem::perms::owner_read);
+    for (const std::vector<std::string>& change : {std::vector<std::string>{"--name", "a\x01"},
+                                                   {"--add", "Genres/House"},
+                                                   {"--name", "B", "--verify"}}) {
+        std::vector<std::string> arguments = {"write", "--json", items.folder.path()};
+        arguments.insert(arguments.end(), change.begin(), change.end());
+        arguments.emplace_back("--dry-run");
+        const ToolResult promised = runTool(arguments);
+        arguments.pop_back();
+        const ToolResult done = runTool(arguments);
+        EXPECT_EQ(promised.status, 1);
+        EXPECT_EQ(promised.errors, done.errors);
+        ASSERT_EQ(promised.json().size(), done.json().size());
+        for (std::size_t i = 0; i < done.json().size(); ++i) {
+            EXPECT_EQ(promised.json()[i]["path"], done.json()[i]["path"]);
+            EXPECT_EQ(promised.json()[i]["written"], false);
+        }
+    }
+}
+
 TEST(Write, RefusesWrongWordsBeforeAnythingIsTouched) {
     const Items items;
     const std::string item = items.folder.path("Bass.cst");
@@ -322,6 +352,44 @@ TEST(Read, FindsEveryKindOfAudioInAFolderAndNamesPreviews) {
     EXPECT_THAT(named.errors, HasSubstr("is the recorded preview of another item"));
     const json parts = runTool({"inspect", "--json", folder.path("loop.wav")}).json()[0]["parts"];
     EXPECT_THAT(parts.dump(), HasSubstr("bytes behind the last chunk"));
+}
+
+TEST(Audio, IsToldByItsContentsWhateverItsExtension) {
+    const Wav wav;
+    const std::string riff = wav.file(wav.format(1, 1000) + wav.data(4000));
+    const std::string form = Aiff::file(Aiff::common(1, 2000, 16, Aiff::rate(1000)) + Aiff::sound(4000));
+    const std::string packed =
+        Aiff::file(Aiff::common(1, 2000, 16, Aiff::rate(1000), "sowt") + Aiff::sound(4000), "AIFC");
+    const std::string caf = Caf::file(Caf::description(1000) + Caf::data(8000));
+    const TemporaryFolder folder;
+    const std::vector<std::string> found = {folder.write("s/a.aif", riff), folder.write("s/b.aifc", packed),
+                                            folder.write("s/c.aiff", caf), folder.write("s/d.caf", form),
+                                            folder.write("s/e.wav", form), folder.write("s/f.wav", caf),
+                                            folder.write("s/g.wave", riff)};
+    // Not looked for, but taken where it is named.
+    const std::vector<std::string> named = {folder.write("h.snd", riff), folder.write("i", packed)};
+    ASSERT_EQ(
+        runTool({"write", "--verify", "--add", "Genres/House", folder.path("s"), named[0], named[1]}).status,
+        0);
+    const ToolResult indexed = runTool({"index", folder.path("s"), "--db", folder.path("db")});
+    EXPECT_EQ(indexed.status, 0) << indexed.errors;
+    const std::size_t all = found.size() + named.size();
+    struct {
+        std::vector<std::string> arguments;
+        std::size_t count;
+    } const cases[] = {{{"read", "--json", folder.path("s"), named[0], named[1]}, all},
+                       {{"object", "--json", folder.path("s"), named[0], named[1]}, all},
+                       {{"search", "tag:House", "--json", "--db", folder.path("db")}, found.size()}};
+    for (const auto& c : cases) {
+        const ToolResult result = runTool(c.arguments);
+        EXPECT_EQ(result.status, 0) << result.errors;
+        EXPECT_EQ(result.json().size(), c.count) << c.arguments[0];
+        for (const json& item : result.json()) {
+            EXPECT_EQ(item["keyValues"]["LengthInSeconds"], 2.0) << item;
+            EXPECT_EQ(item["fileType"], 7) << item;
+            EXPECT_EQ(tagsOf(item).count("Genres/House"), 1U) << item;
+        }
+    }
 }
 
 TEST(Inspect, ShowsWhatIsInEveryKindOfItem) {
