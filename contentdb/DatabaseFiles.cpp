@@ -2,7 +2,7 @@
 
 #include "contentdb/Sqlite.h"
 #include "platform/FileAccess.h"
-#include "platform/Text.h"
+#include "platform/FileReplacement.h"
 
 #include <filesystem>
 #include <fstream>
@@ -36,11 +36,9 @@ std::string nameForDamaged(const std::string& database) {
 }
 
 void moveIfThere(const std::string& from, const std::string& to) {
-    std::error_code failure;
-    if (fileExists(from)) std::filesystem::rename(from, to, failure);
-    if (!failure) return;
-    throw DatabaseFailure(kErrorUnwritable,
-                          fmt::format("{}: cannot be moved: {}", printable(from), failure.message()));
+    Error error;
+    if (fileExists(from) && !renameFlushed(from, to, &error))
+        throw DatabaseFailure(kErrorUnwritable, error.message);
 }
 
 }  // namespace

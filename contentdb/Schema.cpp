@@ -3,6 +3,7 @@
 #include "contentdb/ChecksumVfs.h"
 #include "contentdb/DatabaseFiles.h"
 #include "platform/FileAccess.h"
+#include "platform/FileReplacement.h"
 #include "platform/Text.h"
 
 #include <array>
@@ -119,9 +120,8 @@ void create(const std::string& path) {
         migrate(connection);
         keepLog(connection);
     }
-    std::error_code failure;
-    std::filesystem::rename(unborn, path, failure);
-    if (failure) refuse(path, kErrorUnwritable, failure.message());
+    Error error;
+    if (!renameFlushed(unborn, path, &error)) throw DatabaseFailure(kErrorUnwritable, error.message);
 }
 
 /// The file by an URI that says that nobody writes to it, so that no log is needed beside it.

@@ -487,7 +487,7 @@ std::size_t cutMerges() {
 
 /// Every change of a file is flushed before that file takes its place, nothing is written to it afterwards,
 /// and then its folder is flushed.
-void expectFlushesInOrder(const std::vector<Call>& calls) {
+void expectFlushesInOrder(const std::vector<Call>& calls, bool isReplaced = true) {
     std::map<std::string, bool> isFlushed;
     std::set<std::string> unflushedFolders;
     std::size_t places = 0;
@@ -500,8 +500,10 @@ void expectFlushesInOrder(const std::vector<Call>& calls) {
             const std::size_t arrow = call.path.find(" > ");
             const std::string from = call.path.substr(0, arrow);
             const std::string to = call.path.substr(arrow + 3);
-            EXPECT_TRUE(isFlushed[from]) << "takes its place before it is flushed";
-            isFlushed[to] = isFlushed[from];
+            const bool isWhole = !isFlushed.contains(from) || isFlushed[from];    // or was so before
+            const bool isLog = from.ends_with("-wal") || from.ends_with("-shm");  // put aside as it is
+            EXPECT_TRUE(isWhole || isLog) << "takes its place before it is flushed";
+            isFlushed[to] = isWhole;
             if (isHidden(to)) continue;
             unflushedFolders.insert(fs::path(to).parent_path().string());
             ++places;
@@ -511,7 +513,7 @@ void expectFlushesInOrder(const std::vector<Call>& calls) {
             isFlushed[call.path] = false;
         }
     }
-    EXPECT_GE(places, 1U);
+    EXPECT_EQ(places > 0, isReplaced);
     EXPECT_TRUE(unflushedFolders.empty()) << *unflushedFolders.begin() << " is not flushed";
 }
 
@@ -593,6 +595,13 @@ TEST_F(CrashPoints, OfMergesLoseNothing) {
     const std::size_t cuts = cutMerges();
     std::printf("crash points of merges: %zu\n", cuts);
     EXPECT_GE(cuts, 350U);
+}
+
+TEST_P(CrashPointsOfIndexRuns, FlushInOrder) {
+    const TemporaryFolder folder;
+    const Files files = changedLibrary(folder, GetParam());
+    const bool isReplaced = GetParam().known == 0 || GetParam().isDamaged;
+    expectFlushesInOrder(callsOf(indexFolder, restored(folder, files)), isReplaced);
 }
 
 TEST_F(CrashPoints, OfMergesFlushInOrder) {
