@@ -102,7 +102,10 @@ std::unique_ptr<EditLock> EditLock::acquire(const std::string& path, Error* erro
 
 EditLock::~EditLock() {
     const auto held = heldOn(folder_);
-    if (held != heldByThisThread().end() && --held->count == 0) heldByThisThread().erase(held);
+    if (held == heldByThisThread().end() || --held->count > 0) return;
+    // Closing would not do: a process that was forked meanwhile has the descriptor, too.
+    ::flock(held->descriptor.number(), LOCK_UN);
+    heldByThisThread().erase(held);
 }
 
 }  // namespace qvct

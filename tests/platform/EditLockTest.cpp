@@ -2,6 +2,7 @@
 #include "support/TemporaryFolder.h"
 
 #include <chrono>
+#include <csignal>
 #include <thread>
 
 #include <fmt/format.h>
@@ -48,6 +49,22 @@ TEST(EditLock, IsTakenAgainByItsThreadAndEndsWithTheLast) {
     EXPECT_FALSE(isFree(item));
     inner.reset();
     EXPECT_TRUE(isFree(item));
+}
+
+TEST(EditLock, EndsAlthoughAProcessWasForkedMeanwhile) {
+    const TemporaryFolder folder;
+    const std::string item = folder.write("item", "x");
+    auto turn = EditLock::acquire(item);
+    const pid_t child = ::fork();
+    if (child == 0) {
+        ::pause();
+        ::_exit(0);
+    }
+    EXPECT_FALSE(isFree(item));
+    turn.reset();
+    EXPECT_TRUE(isFree(item));
+    ::kill(child, SIGKILL);
+    ::waitpid(child, nullptr, 0);
 }
 
 TEST(EditLock, OfAnotherProcessIsWaitedForAndNamed) {
