@@ -60,6 +60,13 @@ std::string folderOf(const std::string& path) {
     return slash == std::string::npos ? "./" : path.substr(0, slash + 1);
 }
 
+/// False, and the reason in `errno`, when it cannot be renamed; else its folder knows of it on the disk, too.
+bool renameOnDisk(const std::string& from, const std::string& to) {
+    if (::rename(from.c_str(), to.c_str()) != 0) return false;
+    flushFolder(folderOf(to));
+    return true;
+}
+
 /// A user's attributes must come along; labels that the system guards are its own affair.
 bool isOptionalAttribute(std::string_view name) {
     return name.starts_with("security.") || name.starts_with("trusted.");
@@ -239,11 +246,8 @@ class Replacement {
     }
 
     bool takePlaceOfAny(UnfinishedFile& made) const {
-        if (::rename(made.path().c_str(), target_.c_str()) != 0) {
-            return failWithErrno(error_, path_, "cannot be replaced");
-        }
+        if (!renameOnDisk(made.path(), target_)) return failWithErrno(error_, path_, "cannot be replaced");
         made.release();
-        flushFolder(folder_);
         return true;
     }
 
@@ -335,9 +339,7 @@ bool replaceFileByPieces(const std::string& path, std::span<const FilePiece> pie
 }
 
 bool renameFlushed(const std::string& from, const std::string& to, Error* error) {
-    if (::rename(from.c_str(), to.c_str()) != 0) return failWithErrno(error, from, "cannot be moved");
-    flushFolder(folderOf(to));
-    return true;
+    return renameOnDisk(from, to) || failWithErrno(error, from, "cannot be moved");
 }
 
 }  // namespace qvct

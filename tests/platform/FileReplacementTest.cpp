@@ -297,20 +297,30 @@ TEST(FileReplacement, HolesStayHoles) {
     EXPECT_EQ(std::filesystem::file_size(path), head.length) << "ends in a hole";
 }
 
-/// Sends a signal to a process in the middle of writing `path`; how the process ended.
-int statusAfterSignal(const std::string& path, int signal, bool isIgnored = false) {
+/// Does something in another process; how that ended.
+int statusOfProcess(const std::function<bool()>& work) {
     const pid_t child = ::fork();
-    if (child == 0) {
-        if (isIgnored) std::signal(signal, SIG_IGN);
-        removeUnfinishedFilesWhenEnded();
-        FileReplacementOptions options;
-        options.check = [signal](const std::string&, Error*) { return ::raise(signal) == 0; };
-        const FilePiece whole{.bytes = "new"};
-        ::_exit(replaceFileByPieces(path, {&whole, 1}, options) ? 0 : 1);
-    }
+    if (child == 0) ::_exit(work() ? 0 : 1);
     int status = 0;
     ::waitpid(child, &status, 0);
     return status;
+}
+
+/// Does something in the middle of writing "new" to `path`.
+bool writeAndMeanwhile(const std::string& path, const std::function<bool()>& work) {
+    removeUnfinishedFilesWhenEnded();
+    FileReplacementOptions options;
+    options.check = [&](const std::string&, Error*) { return work(); };
+    const FilePiece whole{.bytes = "new"};
+    return replaceFileByPieces(path, {&whole, 1}, options);
+}
+
+/// Sends a signal to a process in the middle of writing `path`; how the process ended.
+int statusAfterSignal(const std::string& path, int signal, bool isIgnored = false) {
+    return statusOfProcess([&] {
+        if (isIgnored) std::signal(signal, SIG_IGN);
+        return writeAndMeanwhile(path, [&] { return ::raise(signal) == 0; });
+    });
 }
 
 TEST(FileReplacement, AUserWhoEndsTheProgramFindsNothingLeftBehind) {
@@ -324,6 +334,10 @@ TEST(FileReplacement, AUserWhoEndsTheProgramFindsNothingLeftBehind) {
         EXPECT_EQ(statusAfterSignal(path, signal, true), 0) << "an ignored signal ended it";
         EXPECT_EQ(contentsOf(path), "new");
     }
+    const TemporaryFolder folder;
+    const auto endAFork = [] { return WIFSIGNALED(statusOfProcess([] { return ::raise(SIGTERM) == 0; })); };
+    EXPECT_EQ(statusOfProcess([&] { return writeAndMeanwhile(folder.path("file"), endAFork); }), 0)
+        << "a process that it forked removed its file";
 }
 
 TEST(FileReplacement, WhatAKilledProcessLeftIsRemovedByTheNextWriteAndNothingElse) {

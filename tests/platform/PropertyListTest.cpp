@@ -92,7 +92,8 @@ TEST(PropertyList, ConvertsLikeTheExchangeFormatExpects) {
 }
 
 /// A binary list of containers that each hold the next one `fanOut` times.
-std::string chainOfSharedArrays(std::size_t levels, std::size_t fanOut) {
+/// The first may hold one further down before it.
+std::string chainOfSharedArrays(std::size_t levels, std::size_t fanOut, std::size_t alsoInFirst = 0) {
     std::string bytes("bplist00");
     std::string offsets;
     const auto addOffset = [&] {
@@ -101,7 +102,9 @@ std::string chainOfSharedArrays(std::size_t levels, std::size_t fanOut) {
     };
     for (std::size_t level = 0; level < levels; ++level) {
         addOffset();
-        bytes += static_cast<char>(0xA0 + fanOut);
+        const bool isTwice = level == 0 && alsoInFirst > 0;
+        bytes += static_cast<char>(0xA0 + fanOut + (isTwice ? 1 : 0));
+        if (isTwice) bytes += {static_cast<char>(alsoInFirst >> 8U), static_cast<char>(alsoInFirst)};
         for (std::size_t i = 0; i < fanOut; ++i) {
             bytes += static_cast<char>((level + 1) >> 8U);
             bytes += static_cast<char>(level + 1);
@@ -168,6 +171,8 @@ TEST(PropertyList, RefusesWhatWouldExhaustMemoryOrTheStack) {
         {"a kilobyte that expands to 15^60 values", chainOfSharedArrays(60, 14), false},
         {"binary within the depth", chainOfSharedArrays(kDeepestPropertyList, 1), true},
         {"binary nested too deeply", chainOfSharedArrays(kDeepestPropertyList + 1, 1), false},
+        {"binary nested too deeply behind what was read before",
+         chainOfSharedArrays(kDeepestPropertyList + 1, 1, kDeepestPropertyList / 2), false},
         {"XML within the depth", nestedXml(kDeepestPropertyList, "<true/>"), true},
         {"XML nested too deeply", nestedXml(kDeepestPropertyList + 1, ""), false},
         {"XML nested far too deeply", nestedXml(100000, ""), false},
