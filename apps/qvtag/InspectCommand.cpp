@@ -33,8 +33,9 @@ void printPart(const InspectedPart& part, const Terminal& terminal, std::size_t 
     const std::string place = part.offset ? fmt::format("{}", *part.offset) : "";
     const std::string size = part.size ? fmt::format("{}", *part.size) : "";
     const std::string label = std::string(2 * depth, ' ') + printable(part.id);
-    print("{:>10} {:>10}  {}  {}{}\n", place, size, padded(label, 20), printable(part.meaning),
-          part.fault.empty() ? "" : "  " + colored(terminal, Color::accent, "FAULT: " + part.fault));
+    print(
+        "{:>10} {:>10}  {}  {}{}\n", place, size, padded(label, 20), printable(part.meaning),
+        part.fault.empty() ? "" : "  " + colored(terminal, Color::accent, "FAULT: " + printable(part.fault)));
     for (const InspectedPart& child : part.children) printPart(child, terminal, depth + 1);
 }
 

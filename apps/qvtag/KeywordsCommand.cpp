@@ -18,8 +18,8 @@ struct Options {
 
 void printTable(const CountedSet& found) {
     std::size_t width = 0;
-    for (const auto& [label, _] : found) width = std::max(width, displayWidth(label));
-    for (const auto& [label, count] : found) print("{}  {}\n", padded(label, width), count);
+    for (const auto& [label, _] : found) width = std::max(width, displayWidth(printable(label)));
+    for (const auto& [label, count] : found) print("{}  {}\n", padded(printable(label), width), count);
 }
 
 void run(const Options& options, ToolContext& context) {

@@ -153,7 +153,7 @@ Json jsonOfCoverage(const Coverage& coverage) {
 void printList(std::string_view heading, const std::vector<std::string>& lines) {
     if (lines.empty()) return;
     print("  {} ({})\n", heading, lines.size());
-    for (const std::string& line : lines) print("    {}\n", line);
+    for (const std::string& line : lines) print("    {}\n", printable(line));
 }
 
 void printCoverage(const Coverage& coverage, const Terminal& terminal) {

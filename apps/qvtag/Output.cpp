@@ -89,7 +89,7 @@ std::string textOfTagging(const TGRTTagging& tagging) {
 std::string pathOfTag(const TGRTTag& tag) {
     std::string path = tag.label();
     for (const auto& ancestor : tag.ancestors()) path.insert(0, ancestor->label() + " > ");
-    return tag.categoryIdentifier() + " > " + path;
+    return printable(tag.categoryIdentifier() + " > " + path);
 }
 
 std::string padded(std::string_view text, std::size_t columns) {

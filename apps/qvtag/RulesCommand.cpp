@@ -39,7 +39,8 @@ std::shared_ptr<QVCTXMLDocument> documentOf(const URL& url) {
 std::string textOf(const TagDictionary& tag) {
     const PropertyList* label = tag.value(kTagDictionaryLabelKey);
     const PropertyList* level = tag.value(kTagDictionaryLevelKey);
-    std::string text = label != nullptr && label->string() != nullptr ? *label->string() : "(no label)";
+    std::string text =
+        label != nullptr && label->string() != nullptr ? printable(*label->string()) : "(no label)";
     if (const auto weight = level == nullptr ? std::nullopt : level->doubleValue()) {
         text += fmt::format(" {:.0f}%", *weight * 100);
     }

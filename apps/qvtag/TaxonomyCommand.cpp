@@ -61,8 +61,8 @@ Json jsonOfTag(const TGRTTag& tag) {
 void printTree(const TGRTTag& tag, const Terminal& terminal, std::size_t depth) {
     std::string remark = tag.valueType() == kTagValuePlain ? "" : std::string(kindOf(tag));
     if (!tag.valueStepLabels().empty()) remark += ": " + join(tag.valueStepLabels(), ", ");
-    print("{}{}{}\n", std::string(2 * depth, ' '), tag.label(),
-          remark.empty() ? "" : "  " + colored(terminal, Color::faint, "(" + remark + ")"));
+    print("{}{}{}\n", std::string(2 * depth, ' '), printable(tag.label()),
+          remark.empty() ? "" : "  " + colored(terminal, Color::faint, "(" + printable(remark) + ")"));
     for (const auto& child : tag.children()) printTree(*child, terminal, depth + 1);
 }
 
@@ -87,7 +87,7 @@ void show(const Options& options, ToolContext& context) {
     Json json = Json::array();
     for (const auto& category : chosenCategories(options.categories, *taxonomy, context)) {
         if (context.format == Format::table) {
-            print("{}  {}\n", colored(context.terminal(), Color::strong, category->identifier()),
+            print("{}  {}\n", colored(context.terminal(), Color::strong, printable(category->identifier())),
                   colored(context.terminal(), Color::faint, fmt::format("{} tags", category->tags().size())));
             for (const auto& tag : category->rootTags()) printTree(*tag, context.terminal(), 1);
             continue;

@@ -16,8 +16,14 @@
 namespace qvct::tool {
 namespace {
 
+/// Whatever a message cites, a terminal gets nothing but characters and line breaks.
 void printLine(std::string_view message) {
-    printError("qvtag: {}\n", message);
+    std::string text = "qvtag: ";
+    for (std::size_t end = message.find('\n'); end != std::string_view::npos; end = message.find('\n')) {
+        text += printable(message.substr(0, end)) + '\n';
+        message.remove_prefix(end + 1);
+    }
+    printErrorText(text + printable(message) + '\n');
 }
 
 }  // namespace

@@ -124,6 +124,59 @@ TEST_F(RulesCommand, EndsWhereAScriptCannotBeStopped) {
     }
 }
 
+/// A taxonomy, a keyword mapping, rules, a record and a description, each of whose texts clears the screen.
+TEST_F(RulesCommand, NoTextOfAFileReachesTheTerminalAsACommand) {
+    const std::string clear =
+                          "\xc2\x9b"
+                          "2J",
+                      key = "<key>" + clear, string = "<string>" + clear;
+    const auto list = [](const std::string& entries) {
+        return "<plist version=\"1.0\"><dict>" + entries + "</dict></plist>";
+    };
+    folder_.write("files/A" + clear + ".patch/org.qvcontenttagging.intermediate.cache.xml",
+                  "<Patch name='" + clear + "'/>");
+    folder_.write(
+        "files/A" + clear + ".patch/tags.plist",
+        list("<key>DisplayName</key>" + string + "d</string><key>KeyValueData</key><dict>" + key + "k</key>" +
+             string + "v</string></dict><key>Tagging</key><dict>" + key + "c</key><array><dict>" +
+             "<key>Name</key>" + string + "t</string></dict></array></dict>"));
+    const std::string taxonomy = folder_.write(
+        "t.plist",
+        list("<key>categories</key><dict>" + key + "C</key><dict>" + key + "L</key><dict/></dict></dict>"));
+    const std::string rules = folder_.write(
+        "r.plist",
+        ruleList({xPathRule("/Patch[@name = '" + clear + "']"), xPathRule("/Patch" + clear + "["),
+                  "<key>rule</key><string>/Patch</string><key>tag</key>" + string + "L</string>",
+                  scriptRule("throw '" + clear + "'"),
+                  scriptRule("function main() { console.log('\\x1b[2J'); return [{label: '\\x1b[2J'}] }")}));
+    const std::string files = folder_.path("files"), database = folder_.path("db");
+    const std::vector<std::vector<std::string>> commands = {
+        {"rules", "--rules", rules, files},
+        {"rules", "test", rules, files},
+        {"autotag", "--rules", rules, files},
+        {"read", files},
+        {"inspect", files},
+        {"object", files},
+        {"index", files, "--db", database},
+        {"search", "A", "--db", database},
+        {"facets", "A", "--db", database},
+        {"taxonomy", "show"},
+        {"taxonomy", "search", "L"},
+        {"taxonomy", "find", clear + "L"},
+        {"taxonomy", "find", "2J"},
+        {"taxonomy", "coverage"},
+        {"keywords", clear + "L"},
+        {"write", "--name", clear, "--dry-run", files + "/A" + clear + ".patch"}};
+    for (std::vector<std::string> command : commands) {
+        command.insert(command.begin(), {"--taxonomy", taxonomy});
+        const ToolResult result = runTool(command);
+        for (const char* raw : {"\x1b[2J", "\xc2\x9b"}) {
+            EXPECT_EQ(result.output.find(raw), std::string::npos) << testing::PrintToString(command);
+            EXPECT_EQ(result.errors.find(raw), std::string::npos) << testing::PrintToString(command);
+        }
+    }
+}
+
 TEST_F(RulesCommand, NamesTheRuleThatIsWrong) {
     const std::string parentheses = std::string(20000, '(') + "1" + std::string(20000, ')');
     const std::string latin = "file://" + folder_.write("latin.xpath", "/a[@x='\xe9']");
