@@ -50,16 +50,16 @@ bool holdsNumber(Relation relation, double value, double constant) {
     }
 }
 
-bool holdsText(Relation relation, std::string_view value, std::string_view constant) {
+bool holdsText(Relation relation, const char* value, const std::string& constant) {
     switch (relation) {
         case Relation::equal:
             return value == constant;
         case Relation::notEqual:
             return value != constant;
         case Relation::contains:
-            return value.find(constant) != std::string_view::npos;
+            return std::strstr(value, constant.c_str()) != nullptr;  // linear, whatever the texts
         case Relation::startsWith:
-            return value.starts_with(constant);
+            return std::string_view(value).starts_with(constant);
         default:
             return false;
     }

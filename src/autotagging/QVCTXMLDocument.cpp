@@ -1,6 +1,7 @@
 #include "autotagging/QVCTXMLDocument.h"
 
 #include "autotagging/QVCTXMLParser.h"
+#include "autotagging/ScriptContext.h"
 #include "autotagging/XPathExpression.h"
 #include "platform/Decompression.h"
 #include "platform/FileAccess.h"
@@ -9,6 +10,8 @@
 #include "platform/Text.h"
 #include "platform/XmlParsing.h"
 
+#include <algorithm>
+#include <chrono>
 #include <unordered_map>
 #include <utility>
 
@@ -45,7 +48,7 @@ struct QVCTXMLDocument::Implementation {
     XmlTree document;
     std::size_t textSize = 0;
     bool isPlain = false;
-    XPathContext context;  // after the document, on which it depends
+    mutable std::optional<XPathScope> scope;  // after the document, on which it depends
     /// By expression: the scripts of a rule set ask for the same plug-ins.
     std::unordered_map<std::string, std::optional<std::string>> keptJson;
     std::size_t keptBytes = 0;
@@ -56,13 +59,13 @@ struct QVCTXMLDocument::Implementation {
         if (!parsed.tree) return;
         isPlain = qvct::isPlain(parsed, text);
         document = std::move(parsed.tree);
-        context = makeXPathContext(document.get());
+        scope.emplace(*document);
     }
 
-    xmlNode* firstNode(std::string_view expression) const {
-        if (!context || expression.empty()) return nullptr;
+    xmlNode* firstNode(std::string_view expression, double share) const {
+        if (!scope || expression.empty()) return nullptr;
         const auto compiled = XPathExpression::cached(expression);
-        return compiled ? compiled->firstNode(*context) : nullptr;
+        return compiled ? compiled->firstNode(*scope, share) : nullptr;
     }
 
     /// The JSON of the element's text, which is written and read only where that may make a difference.
@@ -108,27 +111,33 @@ std::shared_ptr<QVCTXMLDocument> QVCTXMLDocument::initWithContentsOfQVZippedXMLU
     return initWithXMLData(xml ? textOf(*xml) : std::string_view{}, url.path());
 }
 
+/// A script's time is that of the expressions which it asks for, too.
+double QVCTXMLDocument::shareOfSteps() const {
+    const std::shared_ptr<ScriptContext> script = context_.lock();
+    return script ? std::clamp(std::chrono::duration<double>(script->timeLeft()).count(), 0.0, 1.0) : 1;
+}
+
 bool QVCTXMLDocument::hasContent() const {
     return implementation_->document != nullptr;
 }
 
 std::vector<std::shared_ptr<QVSKXMLNode>> QVCTXMLDocument::nodesForXPath(std::string_view expression) const {
     std::vector<std::shared_ptr<QVSKXMLNode>> nodes;
-    if (!implementation_->context || expression.empty()) return nodes;
+    if (!implementation_->scope || expression.empty()) return nodes;
     const auto compiled = XPathExpression::cached(expression);
     if (!compiled) return nodes;
-    for (xmlNode* node : compiled->nodes(*implementation_->context)) {
+    for (xmlNode* node : compiled->nodes(*implementation_->scope, shareOfSteps())) {
         nodes.push_back(QVSKXMLNode::initWithXMLNode(node));
     }
     return nodes;
 }
 
 std::shared_ptr<QVSKXMLNode> QVCTXMLDocument::firstNodeForXPath(std::string_view expression) const {
-    return QVSKXMLNode::initWithXMLNode(implementation_->firstNode(expression));
+    return QVSKXMLNode::initWithXMLNode(implementation_->firstNode(expression, shareOfSteps()));
 }
 
 bool QVCTXMLDocument::anyNodesForXPath(std::string_view expression) const {
-    return implementation_->firstNode(expression) != nullptr;
+    return implementation_->firstNode(expression, shareOfSteps()) != nullptr;
 }
 
 bool QVCTXMLDocument::isMatchingXPath(std::string_view expression) const {
@@ -139,10 +148,11 @@ std::optional<std::string> QVCTXMLDocument::JSONStringForXPath(std::string_view 
     Implementation& self = *implementation_;
     std::string key(expression);
     if (const auto kept = self.keptJson.find(key); kept != self.keptJson.end()) return kept->second;
-    xmlNode* node = self.firstNode(expression);
+    xmlNode* node = self.firstNode(expression, shareOfSteps());
     std::optional<std::string> json = node != nullptr ? self.jsonOf(node) : std::nullopt;
     const std::size_t bytes = key.size() + (json ? json->size() : 0);
-    if (self.keptBytes + bytes <= kMostKeptJson) {
+    const bool isFinal = !self.scope || self.scope->isComplete();
+    if (isFinal && self.keptBytes + bytes <= kMostKeptJson) {
         self.keptBytes += bytes;
         self.keptJson.emplace(std::move(key), json);
     }

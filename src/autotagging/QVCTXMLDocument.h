@@ -65,13 +65,16 @@ class QVCT_API QVCTXMLDocument : public QVCTXMLDocumentExport {
     /// The JSON of a document's XML text; nothing when it has no content.
     static std::optional<std::string> JSONStringWithData(std::string_view data);
 
-    /// The script context in which the document is exposed at this time. Not used by the document itself.
+    /// The script context in which the document is exposed at this time. Expressions that are asked for
+    /// meanwhile take no more steps than fit into the script's time.
     std::shared_ptr<ScriptContext> context() const { return context_.lock(); }
     void setContext(const std::shared_ptr<ScriptContext>& context) { context_ = context; }
 
   private:
     struct Implementation;
     explicit QVCTXMLDocument(std::unique_ptr<Implementation> implementation);
+
+    double shareOfSteps() const;
 
     std::unique_ptr<Implementation> implementation_;
     std::weak_ptr<ScriptContext> context_;

@@ -377,6 +377,10 @@ std::optional<PropertyList::Array> ScriptContext::callForArray(std::string_view 
     return isStopped() ? std::nullopt : std::move(result);
 }
 
+std::chrono::nanoseconds ScriptContext::timeLeft() const {
+    return implementation_->deadline - Clock::now();
+}
+
 bool ScriptContext::isStopped() const {
     return implementation_->stop != Implementation::Stop::none;
 }

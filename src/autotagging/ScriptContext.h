@@ -53,6 +53,8 @@ class ScriptContext {
     /// failed, or it returned nothing, no array or too much.
     std::optional<PropertyList::Array> callForArray(std::string_view function);
 
+    /// What is left of the time; negative when it is over.
+    std::chrono::nanoseconds timeLeft() const;
     /// Whether a limit was reached.
     bool isStopped() const;
 

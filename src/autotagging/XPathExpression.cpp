@@ -1,5 +1,6 @@
 #include "autotagging/XPathExpression.h"
 
+#include "autotagging/XPathFunctions.h"
 #include "autotagging/XPathNames.h"
 #include "platform/Log.h"
 #include "platform/Text.h"
@@ -17,6 +18,9 @@ namespace {
 
 /// Most expressions that a thread keeps; scripts may make up new ones without end.
 constexpr std::size_t kMostCachedExpressions = 1024;
+
+/// Where the numbers of faults in expressions begin among those of all faults.
+constexpr int kFirstReason = XML_XPATH_EXPRESSION_OK;
 
 std::string_view reasonOf(int code) {
     switch (code) {
@@ -52,8 +56,12 @@ std::string_view reasonOf(int code) {
             return "character that XML does not allow";
         case XML_XPATH_MEMORY_ERROR:
             return "out of memory";
+        case kFirstReason + XPATH_OP_LIMIT_EXCEEDED:
+            return "takes too many steps in this document";
+        case kFirstReason + XPATH_RECURSION_LIMIT_EXCEEDED:
+            return "nested too deep";
         default:
-            return "cannot be evaluated, or only with too much nesting or work";
+            return "cannot be evaluated";
     }
 }
 
@@ -77,9 +85,12 @@ void keepSyntaxError(void* target, xmlErrorPtr raised) {
     *static_cast<Error*>(target) = syntaxError(text, offset, reasonOf(raised->code));
 }
 
-void logEvaluationError(void* text, xmlErrorPtr raised) {
-    log(fmt::format("XPath \"{}\": {}", shortened(*static_cast<const std::string*>(text)),
-                    reasonOf(raised->code)));
+void logProblem(const std::string& expression, std::string_view reason) {
+    log(fmt::format("XPath \"{}\": {}", shortened(expression), reason));
+}
+
+void logEvaluationError(void* evaluation, xmlErrorPtr raised) {
+    logProblem(static_cast<const XPathEvaluation*>(evaluation)->expression, reasonOf(raised->code));
 }
 
 struct ObjectCloser {
@@ -88,17 +99,39 @@ struct ObjectCloser {
 
 }  // namespace
 
-void XPathContextCloser::operator()(xmlXPathContext* context) const {
+void XPathScope::Closer::operator()(_xmlXPathContext* context) const {
     xmlXPathFreeContext(context);
 }
 
-XPathContext makeXPathContext(_xmlDoc* document) {
-    XPathContext context(xmlXPathNewContext(document));
-    if (context) {
-        context->error = logEvaluationError;
-        context->opLimit = kMostXPathOperations;
-    }
-    return context;
+XPathScope::XPathScope(_xmlDoc& document) : context_(xmlXPathNewContext(&document)) {
+    if (!context_) return;
+    context_->error = logEvaluationError;
+    xmlXPathRegisterFuncLookup(context_.get(), linearXPathFunction, nullptr);
+}
+
+const XmlExtent& XPathScope::extent() {
+    if (extent_) return *extent_;
+    xmlXPathOrderDocElems(context_->doc);  // two elements are put in order without a walk between them
+    return extent_.emplace(extentOf(*context_->doc));
+}
+
+bool XPathScope::holdsTooMuchText(const XPathCost& cost) {
+    const XmlExtent& all = extent();
+    const std::size_t longest = std::max(all.longestAttribute, cost.readsText ? all.text : 0);
+    const std::size_t compared = cost.readsText ? all.elementTexts : 0;
+    return longest > kMostXPathText / std::max<std::size_t>(cost.texts, 1) ||
+           (cost.isJoin && (all.attributeTexts > kMostXPathText || compared > kMostXPathText));
+}
+
+std::size_t XPathScope::workOfStep(const XPathCost& cost) {
+    constexpr std::size_t bytesOfWork = 8;  // as many are copied in the time of one comparison
+    const XmlExtent& all = extent();
+    std::size_t bytes = all.longestAttribute;
+    if (cost.readsText) bytes += cost.isJoin ? all.elementTexts : all.text;
+    const std::size_t nodes = cost.isJoin || cost.readsText ? all.nodes : 0;
+    const std::size_t copied = bytes * std::max<std::size_t>(cost.texts, 1);
+    const std::size_t lookedUp = cost.readsIds ? all.ids * copied : 0;
+    return 1 + nodes + copied / bytesOfWork + lookedUp;
 }
 
 void XPathExpression::Closer::operator()(xmlXPathCompExpr* expression) const {
@@ -111,7 +144,8 @@ std::shared_ptr<const XPathExpression> XPathExpression::compile(std::string_view
              fmt::format("XPath of {} bytes: empty, too long or binary", text.size()));
         return nullptr;
     }
-    const XPathContext context(xmlXPathNewContext(nullptr));
+    const std::unique_ptr<xmlXPathContext, decltype(&xmlXPathFreeContext)> context(
+        xmlXPathNewContext(nullptr), xmlXPathFreeContext);
     if (!context) return nullptr;
     Error raised;
     context->error = keepSyntaxError;
@@ -128,6 +162,7 @@ std::shared_ptr<const XPathExpression> XPathExpression::compile(std::string_view
         return nullptr;
     }
     expression->locationPath_ = LocationPath::parse(text);
+    expression->cost_ = costOfXPath(text);
     return expression;
 }
 
@@ -147,12 +182,24 @@ std::shared_ptr<const XPathExpression> XPathExpression::cached(std::string_view 
     return cache.emplace(std::move(key), std::move(expression)).first->second;
 }
 
-std::vector<xmlNode*> XPathExpression::nodes(xmlXPathContext& context) const {
+std::vector<xmlNode*> XPathExpression::nodes(XPathScope& scope, double share) const {
+    scope.isComplete_ = false;
+    if (!scope.context_) return {};
+    if (scope.holdsTooMuchText(cost_)) {
+        logProblem(text_, "reads too much text in this document");
+        return {};
+    }
+    xmlXPathContext& context = *scope.context_;
+    const std::size_t workOfStep = scope.workOfStep(cost_);
+    const auto mostSteps = static_cast<double>(std::min(kMostXPathSteps, kMostXPathWork / workOfStep));
+    XPathEvaluation evaluation{text_, workOfStep};
+    context.opLimit = 1 + static_cast<unsigned long>(share * mostSteps);
     context.opCount = 0;
     context.node = nullptr;
-    context.userData = const_cast<std::string*>(&text_);  // for messages, which only read it
+    context.userData = &evaluation;
     const std::unique_ptr<xmlXPathObject, ObjectCloser> result(
         xmlXPathCompiledEval(compiled_.get(), &context));
+    scope.isComplete_ = result != nullptr;
     if (!result || result->type != XPATH_NODESET || result->nodesetval == nullptr) return {};
     std::vector<xmlNode*> selected;
     for (int i = 0; i < result->nodesetval->nodeNr; ++i) {
@@ -163,11 +210,14 @@ std::vector<xmlNode*> XPathExpression::nodes(xmlXPathContext& context) const {
     return selected;
 }
 
-xmlNode* XPathExpression::firstNode(xmlXPathContext& context) const {
+xmlNode* XPathExpression::firstNode(XPathScope& scope, double share) const {
+    if (!scope.context_) return nullptr;
+    scope.isComplete_ = true;
     // The library compares texts that hold entity references in a way of its own.
-    const bool mayHoldReferences = context.doc->intSubset != nullptr;
-    if (locationPath_ && !mayHoldReferences) return locationPath_->firstNode(context.doc);
-    const std::vector<xmlNode*> all = nodes(context);
+    const xmlDoc* document = scope.context_->doc;
+    const bool mayHoldReferences = document->intSubset != nullptr;
+    if (locationPath_ && !mayHoldReferences) return locationPath_->firstNode(document);
+    const std::vector<xmlNode*> all = nodes(scope, share);
     return all.empty() ? nullptr : all.front();
 }
 

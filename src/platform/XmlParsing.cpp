@@ -143,9 +143,9 @@ class Parser {
                 fmt::format("more than {} elements and attributes; the rest is left out", self.mostNodes_));
         }
         const int inScope = self.context_->nsNr / 2;  // a prefix and an address each
-        if (inScope > kMostXmlAttributes) {
+        if (inScope > kMostXmlNameSpaces) {
             return self.stop(
-                fmt::format("more than {} name spaces; the rest is left out", kMostXmlAttributes));
+                fmt::format("more than {} name spaces; the rest is left out", kMostXmlNameSpaces));
         }
         xmlSAX2StartElementNs(context, name, prefix, uri, nameSpaceCount, nameSpaces, attributeCount,
                               defaultedCount, attributes);

@@ -12,9 +12,10 @@ struct _xmlDoc;  // NOLINT(bugprone-reserved-identifier): libxml2's name
 
 namespace qvct {
 
-/// Most attributes and name space declarations of one element, name spaces in scope, and attributes that a
-/// document type declares: the XML library compares each of them with all the others.
+/// Most attributes and name space declarations of one element, attributes that a document type declares, and
+/// name spaces in scope: the XML library compares each of them with all the others.
 inline constexpr int kMostXmlAttributes = 1000;
+inline constexpr int kMostXmlNameSpaces = 256;
 /// Most elements and attributes of a document, and the bytes of text that stand for one more: a tree takes a
 /// hundred bytes and more for each. Large patches have 10,000, one for 20 bytes.
 inline constexpr std::size_t kMostXmlNodes = 100'000;

@@ -140,6 +140,23 @@ TEST(Script, WithoutEndIsStoppedAndTheNextOneRuns) {
     }
 }
 
+TEST(Script, TimeIsThatOfTheExpressionsThatItAsksFor) {
+    std::string xml = "<P>";
+    for (int i = 0; i < 2000; ++i) xml += "<a n='" + std::to_string(i) + "'/>";
+    const auto document = QVCTXMLDocument::initWithXMLData(xml + "</P>", "test.xml");
+    const char* const expression = "/P[count(//a[@n = //a/@n][position() < 3]) = 2]";
+    const std::string script = std::string("function main() { return [document.JSONStringForXPath('") +
+                               expression + "') !== null] }";
+    const test::CapturedLog log;
+    {
+        const Limits limits({milliseconds(40), std::size_t{64} << 20});
+        const auto result = QVCTJavaScriptUtilities::tagsForXMLDocument(document, script);
+        EXPECT_NE(result, PropertyList::Array{true});
+    }
+    EXPECT_THAT(log.messages(), testing::Contains(HasSubstr("takes too many steps in this document")));
+    EXPECT_NE(document->JSONStringForXPath(expression), std::nullopt) << "kept though it was not complete";
+}
+
 TEST(Script, CannotGoOnAfterItsEnd) {
     const struct {
         const char* script;

@@ -337,7 +337,7 @@ TEST(XMLDocument, WhatTheLibraryComparesWithAllOthersIsBounded) {
     const std::string many = repeated(40000, " a#=''");
     std::string nested;
     for (int depth = 0; depth < 60; ++depth)
-        nested += "<b" + repeated(900, " xmlns:n" + std::to_string(depth) + "x#='u'") + ">";
+        nested += "<b" + repeated(200, " xmlns:n" + std::to_string(depth) + "x#='u'") + ">";
     const struct {
         const char* fault;
         std::string xml;
@@ -350,7 +350,7 @@ TEST(XMLDocument, WhatTheLibraryComparesWithAllOthersIsBounded) {
          "<!DOCTYPE P [<!ENTITY e \"&#60;b" + replaceAll(many, "=", "&#61;") + "/>\">]><P>&e;</P>"},
         {"line 1: more than 1000 attributes declared",
          "<!DOCTYPE P [<!ATTLIST P" + repeated(40000, " a# CDATA ''") + ">]><P/>"},
-        {"line 1: more than 1000 name spaces", nested + repeated(20000, "<n0x0:c/>")},
+        {"line 1: more than 256 name spaces", nested + repeated(20000, "<n0x0:c/>")},
         {"line 1: texts in the encoding \"utf-7\" are not read",
          "<?xml version='1.0' encoding='UTF-7'?><P/>"},
     };
@@ -364,6 +364,101 @@ TEST(XMLDocument, WhatTheLibraryComparesWithAllOthersIsBounded) {
     }
     EXPECT_TRUE(
         document("<P" + repeated(500, " a#='='") + "><c d='&lt;=\"='/></P>")->isMatchingXPath("/P/c"));
+}
+
+/// A thousand plug-ins with three parameters each.
+std::string largePatch() {
+    const std::string parameters = repeated(3, "<Parameter name='p#' value='#'/>");
+    return "<P><Default name='n7'/>" +
+           repeated(1000, "<Plugin name='n#'>" + replaceAll(parameters, "#", "1") + "text #</Plugin>") +
+           "</P>";
+}
+
+TEST(XPath, WhatCostsMoreThanItsStepsIsBounded) {
+    const std::string flat = "<P>" + repeated(3000, "<a n='#'>t#</a>") + "</P>";
+    const std::string empty = "<P>" + repeated(90000, "<a/>") + "</P>";
+    const std::string text = "<P><t>" + std::string(1 << 20, 'x') + "</t>" + repeated(3000, "<a/>") + "</P>";
+    const std::string attribute =
+        "<P n='" + std::string(1 << 20, 'x') + "'>" + repeated(30000, "<a/>") + "</P>";
+    const std::string entities =
+        "<!DOCTYPE P [<!ENTITY e '" + std::string(100000, 'x') + "'>]><P>" + repeated(15000, "&e;") + "</P>";
+    const std::string same = "<P>" + repeated(1000, "<a>" + std::string(1000, 'x') + "</a>") + "</P>";
+    const std::string nested =
+        replaceAll(repeated(250, "<a>"), "#", "") + std::string(1 << 20, 'x') + repeated(250, "</a>");
+    const char* const steps = "takes too many steps in this document";
+    const char* const bytes = "reads too much text in this document";
+    const struct {
+        const std::string& xml;
+        std::string expression;
+        const char* reason;
+    } rows[] = {
+        {flat, "//*[//* = //*][//q]", steps},
+        {flat, "//*[//a < //a/text()]", steps},
+        {flat, "//*[//a | //a]", steps},
+        {flat, "//*/following::*", steps},
+        {flat, "//a[preceding::a/following::a[//q]]", steps},
+        {flat, "//a/preceding-sibling::a/parent::*[//q]", steps},
+        {empty, "//*[/ = 'x']", steps},
+        {empty, "//*[/ + 1]", steps},
+        {text, "//*[contains(/, 'q')]", steps},
+        {text, "//*[normalize-space(/) = 'q']", steps},
+        {text, "//*[translate(/, 'q', 'x') = 'q']", steps},
+        {text, "//*[string-length() = string-length(/) + 1]", steps},
+        {attribute, "//*[contains(/P/@n, 'q')]", steps},
+        {same, "//a[//a != //a]", steps},
+        {same, "//a[//a[. = /] != //a]", steps},
+        {nested, "//a[//a != //a]", bytes},
+        {text, "/P[contains(concat(/P" + repeated(400, ",string(/)") + "), 'q')]", bytes},
+        {text, "/P[contains(concat(/P" + repeated(400, ",/") + "), 'q')]", bytes},
+        {attribute, "/P[contains(concat(@n" + repeated(400, ",@n") + "), 'q')]", bytes},
+        {entities, "/P[contains(., 'q')]", bytes},
+    };
+    for (const auto& row : rows) {
+        const test::CapturedLog log;
+        const auto xml = document(row.xml);
+        const auto start = std::chrono::steady_clock::now();
+        EXPECT_FALSE(xml->isMatchingXPath(row.expression));
+        EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(3))
+            << row.expression.substr(0, 99);
+        EXPECT_THAT(log.messages(), ElementsAre(AllOf(HasSubstr("XPath \"" + row.expression.substr(0, 99)),
+                                                      HasSubstr(row.reason))));
+    }
+}
+
+TEST(XPath, FunctionsTakeTimeAsTheirTextsAreLong) {
+    const test::CapturedLog log;
+    const auto xml =
+        document("<P><t>" + std::string(1 << 18, 'x') + "</t><k>" + std::string(60000, 'x') + "y</k></P>");
+    const auto start = std::chrono::steady_clock::now();
+    for (const char* expression :
+         {"/P[not(contains(t, k))]", "/P[substring-before(t, k) = '']", "/P[substring-after(t, k) = '']",
+          "/P[translate(t, k, '') = '']",
+          "/P[string-length(translate(k, '\u4e00xy\u00e9xy', 'z\u00e9')) = 60000]",
+          "/P[translate('-\u00e9a\u4e00', 'a\u00e9a', '\U0001F600bc') = '-b\U0001F600\u4e00']",
+          "/P[substring-before('a\u00e9b', '\u00e9') = 'a' and substring-before('ab', '') = '']",
+          "/P[substring-after('a\u00e9b', '\u00e9') = 'b' and substring-after('ab', '') = 'ab']",
+          "/P[contains('', '') and contains(11, 1) and not(contains('', 'a'))]",
+          "/P[normalize-space(' a  b \t\n') = 'a b' and normalize-space('  ') = '']",
+          "//k[string-length(normalize-space()) = 60001]"})
+        EXPECT_TRUE(xml->isMatchingXPath(expression)) << expression;
+    EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(2));
+    EXPECT_FALSE(xml->isMatchingXPath("/P[contains(t)]") || xml->isMatchingXPath("/P[translate(t, k)]"));
+    EXPECT_THAT(log.messages(), testing::Each(HasSubstr("wrong number of arguments")));
+}
+
+TEST(XPath, OrdinaryExpressionsOverLargePatchesStayWithinTheBounds) {
+    const test::CapturedLog log;
+    const auto xml = document(largePatch());
+    for (const char* expression :
+         {"//Plugin//Parameter", "//Plugin[@name = //Default/@name]", "//Default[@name = //Plugin/@name]",
+          "//Plugin[. = 'text 999']", "//Plugin[contains(., 'text 999')]", "//Parameter[@value > 0]/..",
+          "//Parameter/ancestor::Plugin", "//Default | //Plugin[@name='n9']",
+          "//Plugin[Parameter/@value = 1]", "//Plugin[following-sibling::Plugin[@name='n999']]",
+          "//Parameter[contains(concat(@name, @value), '11')]", "//Plugin[not(preceding-sibling::Plugin)]",
+          "//*[self::Plugin or self::Default][@name = 'n7']",
+          "//Plugin[count(Parameter[number(@value) >= 1]) = 2]", "//Plugin[last()]"})
+        EXPECT_TRUE(xml->isMatchingXPath(expression)) << expression;
+    EXPECT_THAT(log.messages(), IsEmpty());
 }
 
 TEST(XMLDocument, JsonIsCountedBeforeItIsMade) {

@@ -1,0 +1,23 @@
+#pragma once
+
+#include <cstddef>
+
+struct _xmlDoc;  // NOLINT(bugprone-reserved-identifier): libxml2's name
+
+namespace qvct {
+
+/// How much there is in a document that expressions may look at. Texts are in bytes, with their entities
+/// replaced: a reference counts as often as it stands there.
+struct XmlExtent {
+    std::size_t nodes = 0;         ///< Elements, attributes, texts and the like.
+    std::size_t ids = 0;           ///< Attributes that identify their element.
+    std::size_t text = 0;          ///< Of the whole document, without attributes.
+    std::size_t elementTexts = 0;  ///< Of all elements together: a text counts once for each that it is in.
+    std::size_t longestAttribute = 0;
+    std::size_t attributeTexts = 0;  ///< Of all attributes together.
+};
+
+/// @cost  O(nodes)
+XmlExtent extentOf(const _xmlDoc& document);
+
+}  // namespace qvct
