@@ -23,16 +23,34 @@ namespace {
 
 using Parts = std::vector<InspectedPart>;
 
-InspectedPart entryPart(std::string id, const PropertyList& value) {
+/// Most entries of a property list that are shown: on its way out each takes a kilobyte.
+constexpr std::size_t kMostEntries = 10'000;
+
+/// Shows `left` entries at most, and counts them down.
+InspectedPart entryPart(std::string id, const PropertyList& value, std::size_t& left) {
     InspectedPart part{std::move(id), {}, {}, textOfPropertyList(value), {}, {}};
+    std::size_t count = 0;
+    const auto add = [&](std::string key, const PropertyList& entry) {
+        ++count;
+        if (left == 0) return;
+        --left;
+        part.children.push_back(entryPart(std::move(key), entry, left));
+    };
     if (const auto* dictionary = value.dictionary()) {
-        for (const auto& entry : *dictionary) part.children.push_back(entryPart(entry.key, entry.value));
+        for (const auto& entry : *dictionary) add(entry.key, entry.value);
     }
     if (const auto* array = value.array()) {
-        for (const PropertyList& item : *array)
-            part.children.push_back(entryPart(fmt::format("[{}]", part.children.size()), item));
+        for (const PropertyList& item : *array) add(fmt::format("[{}]", count), item);
     }
+    const std::size_t hidden = count - part.children.size();
+    if (hidden > 0)
+        part.children.push_back({"...", {}, {}, fmt::format("{} more that are not shown", hidden), {}, {}});
     return part;
+}
+
+InspectedPart entryPart(std::string id, const PropertyList& value) {
+    std::size_t left = kMostEntries;
+    return entryPart(std::move(id), value, left);
 }
 
 InspectedPart chunkPart(const LCChunk& chunk) {

@@ -287,6 +287,18 @@ bool isStorable(const PropertyList& root, PropertyListFormat format, Error* erro
     return true;
 }
 
+/// Keys and values.
+std::size_t countOf(const PropertyList& value) {
+    std::size_t count = 1;
+    if (const auto* items = value.array()) {
+        for (const PropertyList& item : *items) count += countOf(item);
+    }
+    if (const auto* entries = value.dictionary()) {
+        for (const PropertyList::Entry& entry : *entries) count += 1 + countOf(entry.value);
+    }
+    return count;
+}
+
 bool isBinary(std::span<const std::uint8_t> bytes) {
     return bytes.size() >= 6 && std::memcmp(bytes.data(), "bplist", 6) == 0;
 }
@@ -395,7 +407,11 @@ std::optional<PropertyList> parsePropertyList(std::string_view bytes, Error* err
 std::string serializePropertyList(const PropertyList& value, PropertyListFormat format, Error* error) {
     if (!isStorable(value, format, error)) return {};
     const Node tree = treeOf(value, format);
-    return format == PropertyListFormat::xml ? xml(tree.get()) : binary(tree.get());
+    std::string bytes = format == PropertyListFormat::xml ? xml(tree.get()) : binary(tree.get());
+    if (countOf(value) < mostPropertyListValues(bytes.size())) return bytes;
+    fail(error, kErrorTooLarge,
+         fmt::format("no property list of {} bytes can hold so many keys and values", bytes.size()));
+    return {};
 }
 
 std::optional<PropertyList> readPropertyListFile(const std::string& path, Error* error) {

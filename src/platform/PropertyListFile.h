@@ -15,9 +15,10 @@ namespace qvct {
 // Reading property lists, binary, XML and in the old text form, the latter two in UTF-8 or UTF-16; writing
 // them, binary and XML.
 //
-// What is read is bounded before anything is built from it: the nesting by kDeepestPropertyList, the values
-// that a binary list's shared references expand to by its size. Everything that a property list can hold
-// survives a read and a write in either encoding, in its order; dates lose fractions of a second in XML.
+// What is read is bounded before anything is built from it: the nesting by kDeepestPropertyList, the keys and
+// values to 150,000 and one more for every 64 bytes, those that a binary list's shared references expand to
+// by its size. Everything that a property list can hold survives a read and a write in either encoding, in
+// its order; dates lose fractions of a second in XML.
 
 /// How many dictionaries and arrays of a property list may lie in each other. Deeper ones are refused as too
 /// large, when read and when written alike, so that what is written can be read.
@@ -42,8 +43,8 @@ QVCT_API std::optional<PropertyList> parsePropertyList(std::string_view bytes, E
 /// @}
 
 /// XML with header, document type and tabs, or binary format 1.0. Empty, and an error, for what could not be
-/// read back: nesting over kDeepestPropertyList; a text that is not UTF-8, with a NUL character or, in XML,
-/// with a character that XML forbids; a date outside of the years 1 to 9999.
+/// read back: nesting over kDeepestPropertyList; too many keys and values; a text that is not UTF-8, with a
+/// NUL character or, in XML, with a character that XML forbids; a date outside of the years 1 to 9999.
 QVCT_API std::string serializePropertyList(const PropertyList& value, PropertyListFormat format,
                                            Error* error = nullptr);
 

@@ -259,6 +259,8 @@ class BinaryGraph {
             visit.totals.payload > 4 * std::uint64_t{bytes_.size()} + kExpansionSlack) {
             return refuse(kErrorTooLarge, place, "shared references expand without bound");
         }
+        if (visit.totals.values > mostPropertyListValues(bytes_.size()))
+            return refuse(kErrorTooLarge, place, "too many keys and values");
         if (visit.totals.depth > kDeepestPropertyList)
             return refuse(kErrorTooLarge, place, "nested too deeply");
         return true;

@@ -99,6 +99,8 @@ bool isDate(std::string_view text) {
 /// offset of an event's first byte, when it is asked.
 class Grammar {
   public:
+    explicit Grammar(std::size_t mostElements) : elementsLeft_(mostElements) {}
+
     template <typename Where>
     void start(std::string_view name, bool isPrefixed, Where where) {
         const auto element = isPrefixed ? std::nullopt : elementNamed(name);
@@ -108,6 +110,7 @@ class Grammar {
         if (isContainer && open_.size() > static_cast<std::size_t>(kDeepestPropertyList)) {
             return refuse("nested too deeply", where(), kErrorTooLarge);
         }
+        if (elementsLeft_-- == 0) return refuse("too many keys and values", where(), kErrorTooLarge);
         if (!open_.empty()) ++open_.back().children;
         open_.push_back({*element, 0, isScalar(*element) ? where() : 0});
         scalar_.clear();
@@ -188,6 +191,7 @@ class Grammar {
         }
     }
 
+    std::size_t elementsLeft_;
     std::vector<Open> open_;
     std::string scalar_;  // of a number or date
     std::optional<PropertyListFault> fault_;
@@ -201,7 +205,7 @@ std::string_view view(const xmlChar* text) {
 /// The parser, fed at once and stopped at the first fault or at the end of the root element.
 class Parser {
   public:
-    explicit Parser(std::string_view text) : text_(text) {
+    explicit Parser(std::string_view text) : text_(text), grammar_(mostPropertyListValues(text.size())) {
         xmlSAXHandler handler{};
         handler.initialized = XML_SAX2_MAGIC;
         handler.startElementNs = [](void* self, const xmlChar* name, const xmlChar* prefix, const xmlChar*,

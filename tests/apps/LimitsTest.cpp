@@ -122,6 +122,9 @@ void writeHostilePatches(const TemporaryFolder& folder) {
     description("attributes-in-entity",
                 "<!DOCTYPE P [<!ENTITY e \"&#60;b" + repeated(40000, " a#=''") + "/>\">]><P>&e;</P>");
     description("elements", "<P>" + repeated(1000000, "<a/>") + "</P>");
+    record("values", "<key>KeyValueData</key><array>" + repeated(700000, "<dict/>") + "</array>");
+    record("entries", "<key>KeyValueData</key><array>" + repeated(160000, "<true/>") + "</array>");
+    record("keys", repeated(80000, "<key>k#</key><true/>"));
     record("key-values", "<key>KeyValueData</key><dict>" +
                              repeated(50000, "<key>k#</key><integer>1</integer>") + "</dict>");
 }
@@ -130,6 +133,7 @@ TEST(Limits, HoldForHostilePatches) {
     const TemporaryFolder folder;
     writeHostilePatches(folder);
     Commands commands = kReaders;
+    commands.push_back({"--json", "inspect"});
     commands.push_back({"--json", "read"});
     commands.push_back({"--json", "object"});
     EXPECT_GT(expectWithinLimits(folder.path(), commands), 5U);

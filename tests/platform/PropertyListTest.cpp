@@ -122,6 +122,23 @@ std::string chainOfSharedArrays(std::size_t levels, std::size_t fanOut, std::siz
     return bytes + offsets + trailer;
 }
 
+/// A binary array whose items are all the same object.
+std::string sharedItems(std::uint32_t count) {
+    std::string bytes("bplist00\xAF\x12");
+    for (const unsigned shift : {24U, 16U, 8U, 0U}) bytes += static_cast<char>(count >> shift);
+    bytes += std::string(count, '\x01') + '\x09';
+    const auto item = static_cast<std::uint32_t>(bytes.size() - 1);
+    std::string table, trailer(32, '\0');
+    for (const std::uint32_t offset : {std::uint32_t{8}, item}) {
+        for (const unsigned shift : {24U, 16U, 8U, 0U}) table += static_cast<char>(offset >> shift);
+    }
+    trailer[6] = 4;
+    trailer[7] = 1;
+    trailer[15] = 2;
+    for (std::size_t i = 0; i < 4; ++i) trailer[28 + i] = static_cast<char>((item + 1) >> (24 - 8 * i));
+    return bytes + table + trailer;
+}
+
 std::string nestedXml(int depth, const std::string& innermost) {
     std::string xml = "<plist>";
     for (int i = 0; i < depth; ++i) xml += "<array>";
@@ -151,13 +168,17 @@ PropertyList nestedList(int depth) {
     return list;
 }
 
-TEST(PropertyList, WhatIsWrittenCanBeReadWhateverTheDepth) {
+TEST(PropertyList, WhatIsWrittenCanBeReadWhateverItsSize) {
     for (const auto format : {PropertyListFormat::xml, PropertyListFormat::binary}) {
         const PropertyList deepest = nestedList(kDeepestPropertyList);
         EXPECT_EQ(parsePropertyList(serializePropertyList(deepest, format)), deepest);
         Error error;
         EXPECT_EQ(serializePropertyList(nestedList(kDeepestPropertyList + 1), format, &error), "");
         EXPECT_EQ(error.message, "no property list can hold more than 1024 levels");
+        const PropertyList longest = PropertyList::Array(149'000, true);
+        EXPECT_EQ(parsePropertyList(serializePropertyList(longest, format)), longest);
+        EXPECT_EQ(serializePropertyList(PropertyList::Array(200'000, true), format, &error), "");
+        EXPECT_NE(error.message.find("so many keys and values"), std::string::npos) << error.message;
     }
 }
 
@@ -167,6 +188,7 @@ TEST(PropertyList, RefusesWhatWouldExhaustMemoryOrTheStack) {
         std::string bytes;
         bool accepted;
     } const cases[] = {
+        {"shared items", sharedItems(100000), true},
         {"shared array", chainOfSharedArrays(3, 2), true},
         {"a kilobyte that expands to 15^60 values", chainOfSharedArrays(60, 14), false},
         {"binary within the depth", chainOfSharedArrays(kDeepestPropertyList, 1), true},
@@ -177,6 +199,10 @@ TEST(PropertyList, RefusesWhatWouldExhaustMemoryOrTheStack) {
         {"XML nested too deeply", nestedXml(kDeepestPropertyList + 1, ""), false},
         {"XML nested far too deeply", nestedXml(100000, ""), false},
         {"XML with an element of 40,000 attributes", manyAttributes(40000), false},
+        {"XML of a million values",
+         "<plist><array>" + replaceAll(std::string(1000000, 'a'), "a", "<true/>") + "</array></plist>",
+         false},
+        {"binary of 300,000 values", sharedItems(300000), false},
         {"text within the depth", nestedText(kDeepestPropertyList), true},
         {"text nested too deeply", nestedText(kDeepestPropertyList + 1), false},
         {"text nested far too deeply", nestedText(100000), false},
