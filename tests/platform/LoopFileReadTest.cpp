@@ -336,7 +336,9 @@ TEST(LoopFileRead, CountsTheFramesOfCodedWavAudio) {
         {kMsAdpcm, 1, 256, 0xFFFFFFFF, 2560, 5000},    // more than there can be
         {kImaAdpcm, 1, 256, 0, 2660, 5050 + 1 + 192},  // cut off within a block
         {kImaAdpcm, 2, 256, 9000, 2560, 2490},
-        {kImaAdpcm, 2, 256, 1245, 2560, 2490},  // half of them, as some encoders write
+        {kImaAdpcm, 2, 256, 1245, 2560, 2490},   // half of them, as some encoders write
+        {kImaAdpcm, 2, 2048, 3061, 6144, 6123},  // of few blocks, too
+        {kMsAdpcm, 2, 512, 250, 512, 250},
         {kImaAdpcm, 1, 0, 0, 2, 0},
         {kGsm, 1, 65, 3100, 650, 3100},
         {kGsm, 1, 65, 0, 650, 3200},

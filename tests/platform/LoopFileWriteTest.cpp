@@ -182,8 +182,12 @@ TEST(LoopFileWrite, PutsHarmlessSizesAndPadBytesRight) {
         {"last pad missing, counted", unpadded(odd), odd},
         {"last pad there, not counted", sized(odd, -1), odd},
         {"last pad missing, not counted", sized(unpadded(odd), 0), odd},
+        {"last pad missing, not counted, another's bytes behind", sized(unpadded(odd), 0) + "TAGtitle",
+         odd + "TAGtitle"},
         {"one too large", sized(even, 1), even},
         {"36 too small", sized(even, -36), even},
+        {"36 too small, a chunk behind", sized(wav.file(mono + wav.data(334) + oddChunk), -36),
+         wav.file(mono + wav.data(334) + oddChunk)},
         {"3 too small, last pad missing", sized(unpadded(odd), -3), odd},
         {"two too large, last pad missing", sized(unpadded(odd), 2), odd},
         {"size of the file", sized(even, 8), even},
@@ -323,6 +327,7 @@ TEST(LoopFileWrite, WordsOfTheNameStandInForDescriptorsOnlyInEnhancedDataAndOnRe
 TEST(LoopFileWrite, RefusesWhatItCannotRewriteWithCertainty) {
     const Wav wav;
     const std::string start = wav.format();
+    const std::string block = "<000001><000002><000003>";
     const std::string record = serializePropertyList(Dictionary{{"a", 1}}, PropertyListFormat::binary);
     struct {
         const char* fault;
@@ -343,6 +348,14 @@ TEST(LoopFileWrite, RefusesWhatItCannotRewriteWithCertainty) {
         {"wav-stray-bytes.wav", wav.file(start + wav.data(40) + "stray"), "byte 84 are no chunk"},
         {"wav-size-too-large.wav", wav.file(start + wav.data(40) + "junk" + test::little(0xFFFFFFF8, 4)),
          "'junk' at byte 84: claims more"},
+        {"wav-audio-reaches-into-the-block-behind.wav",
+         wav.file(start + "data" + test::little(46, 4) + test::noise(40)) + block,
+         "'1><0' at byte 90: claims more"},
+        {"wav-chunk-reaches-into-the-block-behind.wav",
+         wav.file(start + wav.data(40) + "LIST" + test::little(22, 4) + "INFOINAM" + test::little(4, 4) +
+                  std::string("abc", 4)) +
+             block,
+         "'1><0' at byte 114: claims more"},
         {"wav-two-records.wav",
          wav.file(start + wav.data(40) + wav.chunk("qvct", record) + wav.chunk("qvct", record)),
          "a second record"},

@@ -69,6 +69,11 @@ void IffFile::walk(std::uint64_t formSize, bool isOpenEnded) {
             chunk = chunkAt(at - 1);
             chunks_.back().end = at - 1;
         }
+        if (chunk.end > formEnd_) {
+            // A form that its own chunk contradicts does not tell where the bytes of others begin.
+            formEnd_ = fileEnd;
+            chunk = chunkAt(chunk.offset);
+        }
         if (chunk.id == 0) break;  // zeros fill the rest
         const bool holdsTheRest = isOpenEnded && isAudio(chunk.id) && chunk.size == 0;
         if (holdsTheRest) {
@@ -78,7 +83,6 @@ void IffFile::walk(std::uint64_t formSize, bool isOpenEnded) {
         if (isAudio(chunk.id)) chunk.role = Chunk::Role::audio;
         if (const auto signature = signatureOf(chunk)) chunk.becomeRecord(*signature);
         at = chunk.end;
-        formEnd_ = std::max(formEnd_, at);  // its size may be too small
         chunks_.push_back(chunk);
     }
     takeOverPad();
@@ -98,7 +102,8 @@ void IffFile::walk(std::uint64_t formSize, bool isOpenEnded) {
 /// A size that leaves out the last pad byte is common and harmless.
 void IffFile::takeOverPad() {
     const bool endsOdd = !chunks_.empty() && chunks_.back().end == formEnd_ && lacksPad(chunks_.back());
-    if (endsOdd && formEnd_ < window_.size()) chunks_.back().end = ++formEnd_;
+    if (!endsOdd || formEnd_ >= window_.size()) return;
+    if (areFiller(formEnd_, formEnd_ + 1)) chunks_.back().end = ++formEnd_;
 }
 
 std::string IffFile::number(std::uint64_t value, std::size_t width) const {

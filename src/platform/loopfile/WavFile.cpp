@@ -152,8 +152,10 @@ std::uint64_t WavFile::codedFrames(const Coding& coding, std::uint64_t bytes,
             const BlockCoding& blocks = coding.number == kMsAdpcm ? kBlocksOfMsAdpcm : kBlocksOfImaAdpcm;
             const std::uint64_t size = coding.bytesPerBlock == 0 ? bytes + 1 : coding.bytesPerBlock;
             const std::uint64_t framesOfBlock = blocks.framesOf(size, channels);
-            const std::uint64_t framesOfRest = blocks.framesOf(bytes % size, channels);
-            return saidFrames(bytes / size * framesOfBlock + framesOfRest, framesOfBlock);
+            const std::uint64_t held = bytes / size * framesOfBlock + blocks.framesOf(bytes % size, channels);
+            // Some encoders divide this number by that of the channels once too often.
+            const bool isDivided = coding.number == kImaAdpcm && channels > 1;
+            return isDivided && factFrames() == held / channels ? held : saidFrames(held, framesOfBlock);
         }
         case kGsm:
             return saidFrames(bytes / kGsmBlock * kGsmFrames, kGsmFrames);
@@ -171,7 +173,7 @@ std::uint64_t WavFile::factFrames() const {
 }
 
 /// The last blocks are filled up: what `fact` says counts where it leaves out no more than two of them, as
-/// encoders write them. Some say half of the frames of a stereo file.
+/// encoders write them.
 std::uint64_t WavFile::saidFrames(std::uint64_t held, std::uint64_t framesOfBlock) const {
     const std::uint64_t said = factFrames();
     return said > 0 && said < held && held - said < 2 * framesOfBlock ? said : held;
