@@ -19,21 +19,25 @@
 namespace qvct {
 namespace {
 
+using Key = std::tuple<std::uint64_t, std::uint64_t, int>;
+
 /// A lock that this thread holds, and how often.
 struct Held {
-    std::pair<std::uint64_t, std::uint64_t> folder;
+    Key key;
     FileDescriptor descriptor;
     int count = 1;
 };
 
+/// Without the copies that a forked process has of its parent's.
 std::vector<Held>& heldByThisThread() {
     thread_local std::vector<Held> held;
+    std::erase_if(held, [](const Held& each) { return std::get<int>(each.key) != ::getpid(); });
     return held;
 }
 
-auto heldOn(const std::pair<std::uint64_t, std::uint64_t>& folder) {
+auto heldOn(const Key& key) {
     auto& held = heldByThisThread();
-    return std::find_if(held.begin(), held.end(), [&](const Held& each) { return each.folder == folder; });
+    return std::find_if(held.begin(), held.end(), [&](const Held& each) { return each.key == key; });
 }
 
 std::string folderOf(const std::string& path) {
@@ -82,26 +86,26 @@ std::unique_ptr<EditLock> EditLock::acquire(const std::string& path, Error* erro
     struct stat status {};
     if (!descriptor.isOpen() || ::fstat(descriptor.number(), &status) != 0)
         return std::unique_ptr<EditLock>(new EditLock({}));
-    const Folder folder(status.st_dev, status.st_ino);
-    const auto held = heldOn(folder);
+    const Key key(status.st_dev, status.st_ino, ::getpid());
+    const auto held = heldOn(key);
     if (held != heldByThisThread().end()) {
         ++held->count;
-        return std::unique_ptr<EditLock>(new EditLock(folder));
+        return std::unique_ptr<EditLock>(new EditLock(key));
     }
     if (lockWithin(descriptor.number(), patience) == EWOULDBLOCK) {
-        const std::string holder = holderOf(folder.second);
+        const std::string holder = holderOf(status.st_ino);
         fail(error, kErrorUnwritable,
-             fmt::format("{}: {} has been writing in its folder for {} s", printable(path),
-                         holder.empty() ? "another program" : holder,
-                         std::chrono::duration<double>(patience).count()));
+             fmt::format("{}: waited {} s for a turn to write in its folder, which {} has now",
+                         printable(path), std::chrono::duration<double>(patience).count(),
+                         holder.empty() ? "another program" : holder));
         return nullptr;
     }
-    heldByThisThread().push_back({folder, std::move(descriptor)});
-    return std::unique_ptr<EditLock>(new EditLock(folder));
+    heldByThisThread().push_back({key, std::move(descriptor)});
+    return std::unique_ptr<EditLock>(new EditLock(key));
 }
 
 EditLock::~EditLock() {
-    const auto held = heldOn(folder_);
+    const auto held = heldOn(key_);
     if (held == heldByThisThread().end() || --held->count > 0) return;
     // Closing would not do: a process that was forked meanwhile has the descriptor, too.
     ::flock(held->descriptor.number(), LOCK_UN);

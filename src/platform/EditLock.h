@@ -7,7 +7,7 @@
 #include <cstdint>
 #include <memory>
 #include <string>
-#include <utility>
+#include <tuple>
 
 namespace qvct {
 
@@ -17,14 +17,15 @@ namespace qvct {
 ///
 /// It is an advisory lock (`flock`) on the folder that the item lies in, links followed. It leaves no file
 /// behind and ends with the process, however that ends. A thread that holds it takes it again at once; it is
-/// to be given back by the thread that took it. Where the folder cannot be opened or its file system has no
-/// locks, everybody is let through: then a write over what another writer changed meanwhile is an error.
+/// to be given back by the thread that took it. A process that is forked meanwhile has no part in it. Where
+/// the folder cannot be opened or its file system has no locks, everybody is let through: then a write over
+/// what another writer changed meanwhile is an error.
 class QVCT_API EditLock {
   public:
     /// How long a turn is waited for.
     static constexpr std::chrono::milliseconds kPatience = std::chrono::seconds(30);
 
-    /// Null, and an error that names the process that held it last, when it is still another's turn after
+    /// Null, and an error that names the process whose turn it is then, when it is still another's after
     /// `patience`.
     static std::unique_ptr<EditLock> acquire(const std::string& path, Error* error = nullptr,
                                              std::chrono::milliseconds patience = kPatience);
@@ -33,11 +34,11 @@ class QVCT_API EditLock {
     ~EditLock();
 
   private:
-    using Folder = std::pair<std::uint64_t, std::uint64_t>;  // device and number
+    using Key = std::tuple<std::uint64_t, std::uint64_t, int>;  // the folder's device and number, the process
 
-    explicit EditLock(Folder folder) : folder_(folder) {}
+    explicit EditLock(Key key) : key_(key) {}
 
-    Folder folder_;
+    Key key_;
 };
 
 }  // namespace qvct

@@ -167,7 +167,17 @@ class Replacement {
         if (!old_->isOpen() || ::fstat(old_->number(), &status_) != 0) {
             return failWithErrno(error_, path_, "cannot be opened");
         }
-        return isExpected(FileStamp::of(status_));
+        return isReplaceable() && isExpected(FileStamp::of(status_));
+    }
+
+    /// Where everybody may make files (the folder for temporary ones), others' may be written but not
+    /// replaced.
+    bool isReplaceable() const {
+        struct stat folder {};
+        const uid_t user = ::geteuid();
+        if (user == 0 || user == status_.st_uid || ::stat(folder_.c_str(), &folder) != 0) return true;
+        if ((folder.st_mode & S_ISVTX) == 0 || user == folder.st_uid) return true;
+        return failFor(error_, path_, "lies in a folder where only its owner may replace it");
     }
 
     bool canMakeFile() const {
@@ -241,8 +251,11 @@ class Replacement {
         if (::fsync(made.descriptor()) != 0) return failWithErrno(error_, path_, "cannot be flushed");
         if (options_.expected && !isExpected(FileStamp::ofFile(target_))) return false;
         const EndingSignalsHeld held;
-        if (!options_.expected) return takePlaceOfAny(made);
-        return old_ ? exchange(made) : takeEmptyPlace(made);
+        const bool isDone = !options_.expected ? takePlaceOfAny(made)
+                            : old_             ? exchange(made)
+                                               : takeEmptyPlace(made);
+        made.remove();
+        return isDone;
     }
 
     bool takePlaceOfAny(UnfinishedFile& made) const {

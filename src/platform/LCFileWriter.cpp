@@ -54,15 +54,16 @@ bool isSameOutsideOfTheRecord(const std::string& path, const LCFingerprint& befo
                             join(differences, "; ")));
 }
 
-bool makeLoopDataFile(const std::string& path, const std::string& record, bool isDryRun, Error* error) {
+bool makeLoopDataFile(const std::string& path, const std::string& record, const LCWriteOptions& how,
+                      Error* error) {
     if (record.empty()) {
         return failFor(error, path,
                        {{}, kErrorInvalidArgument, "a loop data file cannot be without a record"});
     }
     const FilePiece whole{.bytes = record};
     FileReplacementOptions options;
-    options.isDryRun = isDryRun;
-    options.expected = FileStamp{};
+    options.isDryRun = how.isDryRun;
+    options.expected = how.expected.value_or(FileStamp{});
     return replaceFileByPieces(path, {&whole, 1}, options, error);
 }
 
@@ -92,7 +93,7 @@ bool LCFileWriter::writeFileData(const std::shared_ptr<const LCFileData>& data, 
     const auto turn = EditLock::acquire(path_, error);
     if (!turn) return false;
     if (LoopDataFile::isName(path_) && isMissing(path_))
-        return makeLoopDataFile(path_, record, options_.isDryRun, error);
+        return makeLoopDataFile(path_, record, options_, error);
 
     const auto reader = FileReader::open(path_, error);
     if (!reader) return false;

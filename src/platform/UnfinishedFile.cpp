@@ -29,7 +29,7 @@ constexpr std::string_view kSuffix = ".tmp";
 
 /// The paths of this process's unfinished files, where a signal handler can read them.
 struct Slot {
-    enum State { free, changing, used };
+    enum State { free, changing, used, removing };
     std::atomic<int> state = free;
     std::atomic<pid_t> owner = 0;  // a forked process has a copy
     std::array<char, PATH_MAX> path{};
@@ -38,10 +38,12 @@ std::array<Slot, 16> slots;
 
 constexpr std::array kEndingSignals = {SIGINT, SIGTERM, SIGHUP};
 
-/// The signal comes again, and ends the process, when this returns.
+/// The signal comes again, and ends the process, when this returns. Until then other threads go on.
 void removeUnfinishedFilesAndEnd(int signal) {
-    for (const Slot& slot : slots) {
-        if (slot.state == Slot::used && slot.owner == ::getpid()) ::unlink(slot.path.data());
+    for (Slot& slot : slots) {
+        int expected = Slot::used;
+        if (slot.owner != ::getpid()) continue;
+        if (slot.state.compare_exchange_strong(expected, Slot::removing)) ::unlink(slot.path.data());
     }
     ::raise(signal);
 }
@@ -56,16 +58,16 @@ std::size_t takeSlot() {
 }
 
 void setSlot(std::size_t slot, const std::string& path) {
-    if (slot >= slots.size()) return;
-    slots[slot].state = Slot::changing;
-    if (path.size() >= PATH_MAX) return;
+    if (slot >= slots.size() || path.size() >= PATH_MAX) return;
     std::copy_n(path.c_str(), path.size() + 1, slots[slot].path.data());
     slots[slot].owner = ::getpid();
     slots[slot].state = Slot::used;
 }
 
 void freeSlot(std::size_t slot) {
-    if (slot < slots.size()) slots[slot].state = Slot::free;
+    if (slot >= slots.size()) return;
+    int state = slots[slot].state;
+    if (state != Slot::removing) slots[slot].state.compare_exchange_strong(state, Slot::free);
 }
 
 /// FNV-1a of a stamp, which stands for it in names.
@@ -137,7 +139,8 @@ bool isLookedThrough(const std::string& folder) {
 
 }  // namespace
 
-UnfinishedFile::UnfinishedFile(const std::string& folder, mode_t mode) : folder_(folder), slot_(takeSlot()) {
+UnfinishedFile::UnfinishedFile(const std::string& folder, mode_t mode)
+    : folder_(folder), owner_(::getpid()), slot_(takeSlot()) {
     const EndingSignalsHeld held;
     for (int attempt = 0; attempt < 100; ++attempt) {
         if (make(fmt::format("{}{}-{}{}", kPrefix, ::getpid(), attempt, kSuffix), mode) || errno != EEXIST)
@@ -146,8 +149,7 @@ UnfinishedFile::UnfinishedFile(const std::string& folder, mode_t mode) : folder_
 }
 
 UnfinishedFile::~UnfinishedFile() {
-    if (isOpen() && !path_.empty()) ::unlink(path_.c_str());
-    freeSlot(slot_);
+    remove();
 }
 
 bool UnfinishedFile::make(const std::string& name, mode_t mode) {
@@ -167,13 +169,9 @@ bool UnfinishedFile::make(const std::string& name, mode_t mode) {
     }
     modeAtCreation_ = status.st_mode & 07777U;
     file_ = std::move(file);
-    moveTo(name);
-    return true;
-}
-
-void UnfinishedFile::moveTo(const std::string& name) {
-    path_ = folder_ + name;
+    path_ = path;
     setSlot(slot_, path_);
+    return true;
 }
 
 bool UnfinishedFile::renameForExchangeWith(const FileStamp& old) {
@@ -182,13 +180,23 @@ bool UnfinishedFile::renameForExchangeWith(const FileStamp& old) {
     const std::string name = fmt::format(
         "{}-{:x}-{:x}{}", path_.substr(folder_.size(), path_.size() - folder_.size() - kSuffix.size()),
         markOf(FileStamp::of(status)), markOf(old), kSuffix);
+    giveSlotBack();
     if (::rename(path_.c_str(), (folder_ + name).c_str()) != 0) return false;
-    moveTo(name);
+    path_ = folder_ + name;
     return true;
+}
+
+void UnfinishedFile::remove() {
+    if (!path_.empty() && owner_ == ::getpid()) ::unlink(path_.c_str());
+    release();
 }
 
 void UnfinishedFile::release() {
     path_.clear();
+    giveSlotBack();
+}
+
+void UnfinishedFile::giveSlotBack() {
     freeSlot(slot_);
     slot_ = slots.size();
 }

@@ -35,19 +35,23 @@ class UnfinishedFile {
 
     /// Gives it a name that tells which file is to come out when it is exchanged for the one at its place.
     /// What stands under such a name is removed by a later write only when it is one of these two, for else
-    /// it is what another program saved at that moment. False, and `errno`, on failure.
+    /// it is what another program saved at that moment. Signals that end the program leave it alone for the
+    /// same reason. False, and `errno`, on failure.
     bool renameForExchangeWith(const FileStamp& old);
+    /// Removes what stands under its name now, unless it was released.
+    void remove();
     /// Nothing is left to remove: it took its place, or what stands under its name is not ours.
     void release();
 
   private:
     bool make(const std::string& name, mode_t mode);
-    void moveTo(const std::string& name);
+    void giveSlotBack();
 
     std::string folder_;
     std::string path_;
     FileDescriptor file_{-1};
     mode_t modeAtCreation_ = 0;
+    pid_t owner_;  // a forked process has a copy
     std::size_t slot_;
 };
 
@@ -57,12 +61,13 @@ class UnfinishedFile {
 void removeLeftFiles(const std::string& folder);
 
 /// Has the signals by which a user ends a program (interrupt, terminate, hang up) remove the unfinished files
-/// of this process before they end it. Those that the process ignores stay ignored. For programs of their
-/// own: a host's signals are its own affair.
+/// of this process before they end it. One that another thread is just exchanging stays; the next write in
+/// its folder removes it. Those signals that the process ignores stay ignored. For programs of their own: a
+/// host's signals are its own affair.
 void removeUnfinishedFilesWhenEnded();
 
-/// Holds back the signals by which a user ends a program, in this thread, for the moments in which a name and
-/// what is known of it disagree.
+/// Holds back the signals by which a user ends a program, for the moments in which nothing knows of a file
+/// that is to be removed. In this thread alone: another one may end the program meanwhile.
 class EndingSignalsHeld {
   public:
     EndingSignalsHeld();

@@ -7,12 +7,14 @@
 #include "formats/TGRTFileNode.h"
 #include "platform/EditLock.h"
 #include "platform/LCFileWriter.h"
+#include "platform/UnfinishedFile.h"
 #include "support/AudioFixtures.h"
 #include "support/RunTool.h"
 
 #include <algorithm>
 #include <array>
 #include <chrono>
+#include <csignal>
 #include <cstdio>
 #include <cstdlib>
 #include <functional>
@@ -107,6 +109,7 @@ pid_t start(const Act& act, const std::string& folder, const CutPlan& plan = {})
     const pid_t child = ::fork();
     if (child != 0) return child;
     planCut(plan);
+    if (plan.cut == Cut::termination) removeUnfinishedFilesWhenEnded();
     const bool isDone = act(folder);
     tellCalls();
     ::_exit(isDone ? 0 : 1);
@@ -115,6 +118,7 @@ pid_t start(const Act& act, const std::string& folder, const CutPlan& plan = {})
 Outcome outcomeOf(pid_t process) {
     int status = 0;
     ::waitpid(process, &status, 0);
+    if (WIFSIGNALED(status) && WTERMSIG(status) == SIGTERM) return Outcome::died;
     EXPECT_TRUE(WIFEXITED(status)) << "ended by signal " << WTERMSIG(status);
     const int code = WEXITSTATUS(status);
     return code == 0 ? Outcome::succeeded : code == 1 ? Outcome::failed : Outcome::died;
@@ -313,9 +317,9 @@ void save(const std::string& path, const std::string& contents, Save how) {
     if (how == Save::byRenaming) fs::rename(written, path);
 }
 
-/// Another program saves the item right before every call of a write, which dies right before every later one
+/// Another program saves the item right before every call of a write, which ends right before every later one
 /// or goes on. What that program saved stands there afterwards, as it was or with our change.
-std::size_t saveBeforeEveryCall(const Item& item, Write write, Save how) {
+std::size_t saveBeforeEveryCall(const Item& item, Write write, Save how, Cut end = Cut::death) {
     const TemporaryFolder folder;
     const Files saved = afterWrite(item, writeOtherTag).files;
     const Files savedAndWritten = afterWrite({item.name, saved}, write).files;
@@ -329,7 +333,7 @@ std::size_t saveBeforeEveryCall(const Item& item, Write write, Save how) {
         for (std::size_t death = at; death <= calls; ++death) {
             restored(folder, item.files);
             SCOPED_TRACE(fmt::format("{}: saved before call {}, death before {}", item.name, at, death));
-            CutPlan plan{.cut = death < calls ? Cut::death : Cut::none, .point = death};
+            CutPlan plan{.cut = death < calls ? end : Cut::none, .point = death};
             plan.otherProgram = [&] {
                 fs::create_directories(fs::path(path + "/" + name).parent_path());
                 save(path + "/" + name, contents, how);
@@ -552,6 +556,7 @@ TEST_P(CrashPointsOfWrites, LoseNothing) {
         for (const Save how : {Save::byRenaming, Save::inPlace})
             saves += saveBeforeEveryCall(item, write, how);
     }
+    saves += saveBeforeEveryCall(item, writeName, Save::byRenaming, Cut::termination);
     const std::size_t pairs = killOneOfTwo(item);
     std::printf(
         "crash points of writes to %s: %zu calls cut, %zu with another program's save, %zu of two at "

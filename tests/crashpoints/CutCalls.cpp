@@ -4,8 +4,10 @@
 
 #include <array>
 #include <cerrno>
+#include <csignal>
 #include <cstdarg>
 #include <mutex>
+#include <thread>
 #include <utility>
 
 #include <dlfcn.h>
@@ -29,6 +31,18 @@ struct Verdict {
     int reason = 0;
 };
 
+/// The caller may hold the signal back.
+void terminateInAnotherThread() {
+    std::thread([] {
+        isOtherProgram = true;
+        sigset_t termination;
+        ::sigemptyset(&termination);
+        ::sigaddset(&termination, SIGTERM);
+        ::pthread_sigmask(SIG_UNBLOCK, &termination, nullptr);
+        ::raise(SIGTERM);
+    }).join();
+}
+
 Verdict verdictOfPlan(bool canBeHalf) {
     switch (plan.cut) {
         case Cut::none:
@@ -46,6 +60,8 @@ Verdict verdictOfPlan(bool canBeHalf) {
             ::_exit(kDiedOfCut);
         case Cut::halfThenDeath:
             return {Verdict::halfThenDeath};
+        case Cut::termination:
+            terminateInAnotherThread();
     }
     return {};
 }

@@ -18,6 +18,7 @@ enum class Cut {
     shortWrite,     ///< half of a write is done, and the next call finds the disk full
     death,          ///< the process dies in place of the call
     halfThenDeath,  ///< half of a write is done, then the process dies
+    termination,    ///< another thread handles the signal to end right before the call
 };
 
 struct CutPlan {

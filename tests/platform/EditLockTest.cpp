@@ -67,6 +67,22 @@ TEST(EditLock, EndsAlthoughAProcessWasForkedMeanwhile) {
     ::waitpid(child, nullptr, 0);
 }
 
+TEST(EditLock, IsNeitherHeldNorEndedByAProcessThatWasForkedMeanwhile) {
+    const TemporaryFolder folder;
+    const std::string item = folder.write("item", "x");
+    auto turn = EditLock::acquire(item);
+    const pid_t child = ::fork();
+    if (child == 0) {
+        const bool isHeld = EditLock::acquire(item, nullptr, milliseconds(0)) != nullptr;
+        turn.reset();
+        ::_exit(isHeld ? 1 : 0);
+    }
+    int status = 0;
+    ::waitpid(child, &status, 0);
+    EXPECT_EQ(status, 0) << "it is held";
+    EXPECT_FALSE(isFree(item)) << "it was ended";
+}
+
 TEST(EditLock, OfAnotherProcessIsWaitedForAndNamed) {
     const TemporaryFolder folder;
     const std::string item = folder.write("item", "x");
@@ -84,7 +100,7 @@ TEST(EditLock, OfAnotherProcessIsWaitedForAndNamed) {
     Error error;
     EXPECT_FALSE(EditLock::acquire(item, &error, milliseconds(20)));
     EXPECT_THAT(error.message, testing::AllOf(HasSubstr(item), HasSubstr(fmt::format("process {} (", child)),
-                                              HasSubstr("for 0.02 s")));
+                                              HasSubstr("waited 0.02 s")));
     EXPECT_TRUE(EditLock::acquire(item, &error)) << "it ends with the process";
     ::waitpid(child, nullptr, 0);
     ::close(held[0]);

@@ -131,20 +131,32 @@ TEST(FileReplacement, RefusesProtectedFilesAndWhatIsNoFile) {
     EXPECT_EQ(filesIn(folder), 1U);
 }
 
-TEST(FileReplacement, AReadOnlyFolderIsAnErrorAndLosesNothing) {
-    const TemporaryFolder folder;
-    const std::string path = folder.write("file", "old");
-    ::chmod(path.c_str(), 0666);
-    ::chmod(folder.path().c_str(), 0555);
+TEST(FileReplacement, AFolderThatForbidsItIsAnErrorBeforehandAndLosesNothing) {
+    struct {
+        mode_t mode;
+        const char* reason;
+    } const folders[] = {{0555, "Permission denied"}, {01777, "only its owner may replace it"}};
     const bool isRoot = ::geteuid() == 0;
-    ASSERT_EQ(isRoot ? ::seteuid(kNobody) : 0, 0);
-    Error error;
-    const bool replaced = replaceFile(path, "new", &error);
-    ASSERT_EQ(isRoot ? ::seteuid(0) : 0, 0);
-    ::chmod(folder.path().c_str(), 0755);
-    EXPECT_FALSE(replaced);
-    EXPECT_THAT(error.message, testing::AllOf(HasSubstr(path), HasSubstr("Permission denied")));
-    EXPECT_EQ(contentsOf(path), "old");
+    for (const auto& each : folders) {
+        if (each.mode == 01777 && !isRoot) continue;  // no other user's file can be made
+        const TemporaryFolder folder;
+        const std::string path = folder.write("file", "old");
+        ::chmod(path.c_str(), 0666);
+        ::chmod(folder.path().c_str(), each.mode);
+        for (const bool isDryRun : {true, false}) {
+            FileReplacementOptions options;
+            options.isDryRun = isDryRun;
+            const FilePiece whole{.bytes = "new"};
+            Error error;
+            ASSERT_EQ(isRoot ? ::seteuid(kNobody) : 0, 0);
+            const bool replaced = replaceFileByPieces(path, {&whole, 1}, options, &error);
+            ASSERT_EQ(isRoot ? ::seteuid(0) : 0, 0);
+            EXPECT_FALSE(replaced) << isDryRun;
+            EXPECT_THAT(error.message, testing::AllOf(HasSubstr(path), HasSubstr(each.reason)));
+        }
+        ::chmod(folder.path().c_str(), 0755);
+        EXPECT_EQ(contentsOf(path), "old");
+    }
 }
 
 TEST(FileReplacement, AFullDiskLosesNothingAndLeavesNothingBehind) {
@@ -336,8 +348,15 @@ TEST(FileReplacement, AUserWhoEndsTheProgramFindsNothingLeftBehind) {
     }
     const TemporaryFolder folder;
     const auto endAFork = [] { return WIFSIGNALED(statusOfProcess([] { return ::raise(SIGTERM) == 0; })); };
-    EXPECT_EQ(statusOfProcess([&] { return writeAndMeanwhile(folder.path("file"), endAFork); }), 0)
-        << "a process that it forked removed its file";
+    const auto abandonInAFork = [] {
+        const pid_t fork = ::fork();
+        if (fork != 0) ::waitpid(fork, nullptr, 0);
+        return fork != 0;
+    };
+    for (const std::function<bool()>& work : {std::function<bool()>(endAFork), {abandonInAFork}}) {
+        EXPECT_EQ(statusOfProcess([&] { return writeAndMeanwhile(folder.path("file"), work); }), 0)
+            << "a process that it forked removed its file";
+    }
 }
 
 TEST(FileReplacement, WhatAKilledProcessLeftIsRemovedByTheNextWriteAndNothingElse) {

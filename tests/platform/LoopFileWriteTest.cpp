@@ -414,6 +414,14 @@ TEST(LoopFileWrite, NullDataAndOtherFilesFailWithAReason) {
     EXPECT_FALSE(write(folder.path("missing.wav"), std::make_shared<LCFileData>(), &error));
     EXPECT_FALSE(write(folder.path("new.loopdata"), std::make_shared<LCFileData>(), &error));
     EXPECT_FALSE(write(folder.path(), std::make_shared<LCFileData>(), &error));
+    const std::string removed = folder.write("removed.loopdata", "as it was read");
+    LCWriteOptions asRead;
+    asRead.expected = FileStamp::ofFile(removed);
+    std::filesystem::remove(removed);
+    const auto data = std::make_shared<LCFileData>();
+    data->setTaggingDictionary(kTagging);
+    EXPECT_FALSE(write(removed, data, &error, asRead));
+    EXPECT_THAT(error.message, HasSubstr("changed by another program"));
     EXPECT_EQ(test::filesBelow(folder.path()).size(), 1U);
 }
 
