@@ -11,6 +11,7 @@
 #include "platform/Text.h"
 
 #include <algorithm>
+#include <filesystem>
 #include <memory>
 #include <optional>
 
@@ -133,6 +134,8 @@ bool carryOut(Change& change, const Options& options, ToolContext& context, Erro
 /// Whether the record beside or in an item is a link to elsewhere, which would be written to in its place.
 bool leadsAway(const std::string& record, const URL& url) {
     if (record == url.path()) return false;  // an item that is a link itself was decided on by the walk
+    std::error_code reason;                  // told by the write, which fails for it
+    if (std::filesystem::status(record, reason).type() == std::filesystem::file_type::none) return false;
     const URL folder = isDirectory(url.path()) ? url : url.URLByDeletingLastPathComponent();
     return !LinkRule(folder.path(), LinksOutside::none).follows(record, false);
 }

@@ -153,10 +153,12 @@ class Replacement {
     }
 
   private:
-    /// False only when there is an old file that must not be replaced.
+    /// False when there is an old file that must not be replaced, or it cannot be told.
     bool openOld() {
         struct stat status {};
-        if (::stat(target_.c_str(), &status) != 0) return isExpected({});
+        if (::stat(target_.c_str(), &status) != 0) {
+            return errno == ENOENT ? isExpected({}) : failWithErrno(error_, path_, "cannot be opened");
+        }
         if (!S_ISREG(status.st_mode)) return failFor(error_, path_, "is not a regular file");
         constexpr mode_t kAnyWrite = S_IWUSR | S_IWGRP | S_IWOTH;
         if ((status.st_mode & kAnyWrite) == 0 ||

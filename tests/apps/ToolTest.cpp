@@ -204,6 +204,12 @@ TEST(Links, OfRecordsThatLeadAwayAreWrittenToOnRequest) {
         EXPECT_EQ(runTool({"write", "--add", "Source/Kick", "--follow", path}).status, 0) << item;
         EXPECT_NE(readAll(target), foreign) << item;
     }
+    const std::string longName = folder.write("in/" + std::string(247, 'x') + ".cst", "");
+    for (const char* option : {"--dry-run", "--verify"}) {
+        const ToolResult refused = runTool({"write", "--add", "Source/Kick", option, longName});
+        EXPECT_EQ(refused.status, 1) << option;
+        EXPECT_THAT(refused.errors, HasSubstr("x.cst.plist: cannot be opened: File name too long")) << option;
+    }
 }
 
 TEST(Keywords, CountsLabels) {
