@@ -23,34 +23,44 @@ struct ParserCloser {
 };
 
 /// Encodings that spell markup in ASCII, by how their names begin; zeros between the letters are skipped.
-constexpr std::array<std::string_view, 22> kAsciiEncodings = {
-    "utf-8",     "utf8",     "utf-16",  "utf16", "utf-32",    "ucs-2",   "ucs-4", "ascii",
-    "us-ascii",  "iso-8859", "iso8859", "latin", "windows-",  "cp125",   "gb",    "big5",
-    "shift_jis", "sjis",     "euc-",    "koi8-", "macintosh", "iso-2022"};
+/// Shifted ones such as ISO 2022 are none: the bytes of markup occur in their characters.
+constexpr std::array<std::string_view, 28> kAsciiEncodings = {
+    "utf-8",  "utf8",     "utf-16",   "utf16",   "utf-32", "ucs-2",     "ucs-4",
+    "ascii",  "us-ascii", "iso-8859", "iso8859", "latin",  "iso_8859",  "windows-",
+    "cp125",  "cp85",     "cp86",     "gb",      "big5",   "shift_jis", "shift-jis",
+    "x-sjis", "sjis",     "euc-",     "x-euc",   "koi8-",  "macintosh", "x-mac-"};
 
 bool isBlank(char c) {
     return c == ' ' || c == '\t' || c == '\r' || c == '\n' || c == '\0';
 }
 
-/// The declared encoding in small letters, if there is one.
-std::optional<std::string> declaredEncoding(std::string_view text) {
-    constexpr std::size_t longestDeclaration = 1024;
-    std::string start(text.substr(0, longestDeclaration));
+/// The XML declaration without zeros and byte order mark, up to its end or the most that is looked at.
+std::string declarationOf(std::string_view text) {
+    constexpr std::size_t longest = 1024;
+    std::string start(text.substr(0, longest));
     std::erase(start, '\0');
     const std::size_t declaration = start.find("<?xml");
-    if (declaration == std::string::npos || declaration > 4) return std::nullopt;  // a byte order mark
-    const std::string inside = start.substr(declaration, start.find("?>") - declaration);
-    const std::size_t word = inside.find("encoding");
-    const std::size_t quote = word == std::string::npos ? word : inside.find_first_of("'\"", word);
-    if (quote == std::string::npos) return std::nullopt;
-    const std::string name = inside.substr(quote + 1);
-    return lowercase(name.substr(0, name.find(inside[quote])));
+    if (declaration == std::string::npos || declaration > 4) return {};
+    const std::size_t end = start.find("?>", declaration);
+    return start.substr(declaration, end == std::string::npos ? end : end + 2 - declaration);
+}
+
+/// The declared encoding in small letters, if there is one.
+std::optional<std::string> declaredEncoding(std::string_view declaration) {
+    const std::size_t word = declaration.find("encoding");
+    const std::size_t quote = word == std::string_view::npos ? word : declaration.find_first_of("'\"", word);
+    if (quote == std::string_view::npos) return std::nullopt;
+    const std::string_view name = declaration.substr(quote + 1);
+    return lowercase(name.substr(0, name.find(declaration[quote])));
 }
 
 bool hasAsciiMarkup(std::string_view text, Error* error) {
     constexpr std::string_view declarationInEbcdic = "\x4C\x6F\xA7\x94";
     if (text.starts_with(declarationInEbcdic)) return fail(error, kErrorMalformed, "line 1: EBCDIC");
-    const std::optional<std::string> name = declaredEncoding(text);
+    const std::string declaration = declarationOf(text);
+    if (!declaration.empty() && !declaration.ends_with("?>"))
+        return fail(error, kErrorMalformed, "line 1: an XML declaration that is too long, or does not end");
+    const std::optional<std::string> name = declaredEncoding(declaration);
     const bool isKnown =
         !name || std::any_of(kAsciiEncodings.begin(), kAsciiEncodings.end(),
                              [&](std::string_view start) { return name->starts_with(start); });
@@ -64,19 +74,39 @@ std::size_t lineAt(std::string_view text, std::size_t offset) {
                    std::count(text.begin(), text.begin() + static_cast<std::ptrdiff_t>(offset), '\n'));
 }
 
-/// Where the one attribute too many begins its value. No attribute goes on behind a "<", and each has a quote
-/// behind its "=": elsewhere too many are counted rather than too few.
-std::optional<std::size_t> attributeTooMany(std::string_view text) {
+/// Where the value begins whose "=" stands at that place, its quote; the size when there is none.
+std::size_t valueBehind(std::string_view text, std::size_t equals) {
+    std::size_t at = equals + 1;
+    while (at < text.size() && isBlank(text[at])) ++at;
+    return at < text.size() && (text[at] == '"' || text[at] == '\'') ? at : text.size();
+}
+
+/// Counts in tags alone. No attribute goes on behind a "<", whatever is wrong with the text.
+std::optional<std::size_t> attributeTooManyInTags(std::string_view text) {
+    std::size_t at = 0;
+    while ((at = text.find('<', at)) != std::string_view::npos) {
+        int count = 0;
+        for (++at; at < text.size() && text[at] != '<' && text[at] != '>'; ++at) {
+            if (text[at] != '=') continue;
+            const std::size_t quote = valueBehind(text, at);
+            if (quote == text.size()) continue;
+            if (++count > kMostXmlAttributes) return at;
+            at = quote + 1;
+            while (at < text.size() && text[at] != text[quote] && text[at] != '<') ++at;
+            if (at < text.size() && text[at] == '<') --at;  // ends the tag in the next turn
+        }
+    }
+    return std::nullopt;
+}
+
+/// Counts whatever may be an attribute, for texts in which a quote or ">" may be part of a character.
+std::optional<std::size_t> attributeTooManyAnywhere(std::string_view text) {
     int count = 0;
     for (std::size_t at = 0; at < text.size(); ++at) {
         if (text[at] == '<') {
             count = 0;
-        } else if (text[at] == '=') {
-            std::size_t next = at + 1;
-            while (next < text.size() && isBlank(text[next])) ++next;
-            const bool isValue = next < text.size() && (text[next] == '"' || text[next] == '\'');
-            if (isValue && ++count > kMostXmlAttributes) return at;
-            at = next - 1;
+        } else if (text[at] == '=' && valueBehind(text, at) < text.size() && ++count > kMostXmlAttributes) {
+            return at;
         }
     }
     return std::nullopt;
@@ -188,6 +218,11 @@ void XmlTreeCloser::operator()(_xmlDoc* document) const {
 
 ParsedXml parseXml(std::string_view text) {
     return Parser(text).parse();
+}
+
+std::optional<std::size_t> attributeTooMany(std::string_view text) {
+    const bool isUtf8 = text.find('\0') == std::string_view::npos && isValidUtf8(text);
+    return isUtf8 ? attributeTooManyInTags(text) : attributeTooManyAnywhere(text);
 }
 
 bool hasFewAttributes(std::string_view text, Error* error) {

@@ -4,6 +4,7 @@
 
 #include <cstddef>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -40,8 +41,14 @@ struct ParsedXml {
 /// @cost  O(bytes)
 ParsedXml parseXml(std::string_view text);
 
-/// Whether no element has too many attributes, counted without parsing; else false, and an error with its
-/// line. Texts in an encoding that does not spell markup in ASCII (apart from UTF-16 and UTF-32) are refused.
+/// Where an element has one attribute too many, counted without parsing. The text is UTF-8, or of another
+/// encoding that spells markup in ASCII.
+/// @cost  O(bytes), a nanosecond each.
+std::optional<std::size_t> attributeTooMany(std::string_view text);
+
+/// Whether no element has too many attributes; else false, and an error with its line. Texts in an encoding
+/// that does not spell markup in ASCII (apart from UTF-16 and UTF-32) are refused, and so is a declaration
+/// too long to tell.
 /// @cost  O(bytes), a nanosecond each.
 bool hasFewAttributes(std::string_view text, Error* error = nullptr);
 

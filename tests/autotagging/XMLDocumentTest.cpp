@@ -353,6 +353,12 @@ TEST(XMLDocument, WhatTheLibraryComparesWithAllOthersIsBounded) {
         {"line 1: more than 256 name spaces", nested + repeated(20000, "<n0x0:c/>")},
         {"line 1: texts in the encoding \"utf-7\" are not read",
          "<?xml version='1.0' encoding='UTF-7'?><P/>"},
+        {"line 1: texts in the encoding \"iso-2022-jp\" are not read",
+         "<?xml version='1.0' encoding='ISO-2022-JP'?><P/>"},
+        {"line 1: an XML declaration that is too long",
+         "<?xml version='1.0'" + std::string(1024, ' ') + "encoding='UTF-7'?><P/>"},
+        {"line 1: an element with more than 1000 attributes",
+         "<!-- a='--><P b='>'" + repeated(40000, " a#='>'") + "/>"},
     };
     for (const auto& row : rows) {
         const test::CapturedLog log;
@@ -364,6 +370,12 @@ TEST(XMLDocument, WhatTheLibraryComparesWithAllOthersIsBounded) {
     }
     EXPECT_TRUE(
         document("<P" + repeated(500, " a#='='") + "><c d='&lt;=\"='/></P>")->isMatchingXPath("/P/c"));
+    EXPECT_TRUE(document("<P>" + repeated(1100, "&lt;a b='#'/&gt;") + "<c/></P>")->isMatchingXPath("/P/c"));
+    for (const char* encoding : {"ISO_8859-1", "x-sjis", "cp850", "x-mac-roman"}) {
+        const auto xml =
+            document(std::string("<?xml version='1.0' encoding='") + encoding + "'?><P><c/></P>");
+        EXPECT_TRUE(xml->isMatchingXPath("/P/c")) << encoding;
+    }
 }
 
 /// A thousand plug-ins with three parameters each.
