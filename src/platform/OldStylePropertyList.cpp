@@ -12,9 +12,6 @@
 namespace qvct {
 namespace {
 
-/// Most keys and values: two bytes can spell one, which takes fifty in memory.
-constexpr std::size_t kMostValues = 500'000;
-
 /// Octal escapes above 0177 are characters of the encoding of the system that this form comes from.
 constexpr std::array<char16_t, 128> kUpperHalf = {
     0x00A0, 0x00C0, 0x00C1, 0x00C2, 0x00C3, 0x00C4, 0x00C5, 0x00C7, 0x00C8, 0x00C9, 0x00CA, 0x00CB, 0x00CC,
@@ -105,7 +102,10 @@ class Reader {
         return true;
     }
 
-    bool count() { return ++values_ <= kMostValues || refuse("too many keys and values", kErrorTooLarge); }
+    bool count() {
+        return ++values_ <= mostPropertyListValues(text_.size()) ||
+               refuse("too many keys and values", kErrorTooLarge);
+    }
 
     bool openContainer() {
         if (builder_.depth() >= static_cast<std::size_t>(kDeepestPropertyList))

@@ -4,21 +4,20 @@
 
 #include <string>
 #include <string_view>
-#include <unordered_set>
 #include <vector>
 
 namespace qvct {
 
 /// Builds a property list from its parts in the order in which they stand, however deep, without recursion.
 ///
-/// Of a key that comes twice the first value holds: a second one could not be written again.
+/// Of a key that comes twice the last value holds, where the first one stood: most readers have it so.
 class PropertyListBuilder {
   public:
     /// XML has no element for a UID: it is a dictionary with this one key, and a number that is not negative.
     static constexpr std::string_view kUidKey = "CF$UID";
 
-    void openDictionary() { open_.push_back({PropertyList::Dictionary{}, {}, {}}); }
-    void openArray() { open_.push_back({PropertyList::Array{}, {}, {}}); }
+    void openDictionary() { open_.push_back({PropertyList::Dictionary{}, {}}); }
+    void openArray() { open_.push_back({PropertyList::Array{}, {}}); }
     /// The key of the value that comes next, in a dictionary.
     void key(std::string key) { open_.back().key = std::move(key); }
     /// A value that holds no others.
@@ -36,9 +35,7 @@ class PropertyListBuilder {
     struct Open {
         PropertyList container;
         std::string key;
-        std::unordered_set<std::string> seen;  // of a dictionary too large to look through
     };
-    static bool isNewKey(Open& open);
 
     std::vector<Open> open_;
     PropertyList root_ = false;

@@ -6,7 +6,7 @@
 #include "platform/PropertyListEncoding.h"
 #include "platform/PropertyListGuard.h"
 #include "platform/Text.h"
-#include "platform/XmlParsing.h"
+#include "platform/XmlPropertyList.h"
 
 #include <algorithm>
 #include <array>
@@ -37,14 +37,6 @@ std::string binary(plist_t node) {
     std::uint32_t length = 0;
     plist_to_bin(node, &raw, &length);
     const std::unique_ptr<char, BufferDeleter> buffer(raw);
-    return raw == nullptr ? std::string{} : std::string(raw, length);
-}
-
-std::string xml(plist_t node) {
-    char* raw = nullptr;
-    std::uint32_t length = 0;
-    plist_to_xml(node, &raw, &length);
-    const std::unique_ptr<char, decltype(&plist_to_xml_free)> buffer(raw, plist_to_xml_free);
     return raw == nullptr ? std::string{} : std::string(raw, length);
 }
 
@@ -183,16 +175,8 @@ std::string bigEndian(std::uint64_t bits) {
     return bytes;
 }
 
-/// XML has no element for a UID: it is a dictionary with the key kUidKey.
-Node nodeOfUid(std::uint64_t uid, PropertyListFormat format) {
-    if (format == PropertyListFormat::binary) return Node(plist_new_uid(uid));
-    Node node(plist_new_dict());
-    plist_dict_set_item(node.get(), PropertyListBuilder::kUidKey.data(), plist_new_uint(uid));
-    return node;
-}
-
 /// The value as the library has it; a container without what it holds.
-Node nodeOf(const PropertyList& value, PropertyListFormat format) {
+Node nodeOf(const PropertyList& value) {
     if (value.array() != nullptr) return Node(plist_new_array());
     if (value.dictionary() != nullptr) return Node(plist_new_dict());
     if (const bool* flag = value.boolean()) return Node(plist_new_bool(*flag ? 1 : 0));
@@ -205,7 +189,7 @@ Node nodeOf(const PropertyList& value, PropertyListFormat format) {
         return *number < 0 ? nodeOfObject(kIntegerMarker + bigEndian(bits)) : Node(plist_new_uint(bits));
     }
     if (const std::string* text = value.string()) return Node(plist_new_string(text->c_str()));
-    if (const PropertyList::Uid* uid = value.uid()) return nodeOfUid(uid->value, format);
+    if (const PropertyList::Uid* uid = value.uid()) return Node(plist_new_uid(uid->value));
     if (const PropertyList::Date* when = value.date()) {
         return nodeOfObject(kDateMarker +
                             bigEndian(std::bit_cast<std::uint64_t>(when->secondsSinceReferenceDate)));
@@ -215,21 +199,21 @@ Node nodeOf(const PropertyList& value, PropertyListFormat format) {
 }
 
 /// The whole value as a tree of the library's.
-Node treeOf(const PropertyList& value, PropertyListFormat format) {
-    Node root = nodeOf(value, format);
+Node treeOf(const PropertyList& value) {
+    Node root = nodeOf(value);
     std::vector<std::pair<const PropertyList*, plist_t>> pending = {{&value, root.get()}};
     while (!pending.empty()) {
         const auto [container, node] = pending.back();
         pending.pop_back();
         if (const PropertyList::Array* items = container->array()) {
             for (const PropertyList& item : *items) {
-                pending.emplace_back(&item, nodeOf(item, format).release());
+                pending.emplace_back(&item, nodeOf(item).release());
                 plist_array_append_item(node, pending.back().second);
             }
         }
         if (const PropertyList::Dictionary* entries = container->dictionary()) {
             for (const PropertyList::Entry& entry : *entries) {
-                pending.emplace_back(&entry.value, nodeOf(entry.value, format).release());
+                pending.emplace_back(&entry.value, nodeOf(entry.value).release());
                 plist_dict_set_item(node, entry.key.c_str(), pending.back().second);
             }
         }
@@ -311,12 +295,6 @@ bool isXml(std::string_view text) {
     return end == std::string_view::npos || text[end] != '>';
 }
 
-/// Whether the XML library would compare too many attributes with each other. Few lists have so many
-/// characters that could each make one.
-bool hasManyAttributes(std::string_view text, Error* error) {
-    return std::count(text.begin(), text.end(), '=') > kMostXmlAttributes && !hasFewAttributes(text, error);
-}
-
 /// The first byte behind the root element that is none of blanks, zeros, comments and instructions.
 std::optional<std::size_t> remainder(std::string_view text, std::size_t end) {
     constexpr std::string_view blanks(" \t\r\n\0", 5);
@@ -334,12 +312,6 @@ std::optional<std::size_t> remainder(std::string_view text, std::size_t end) {
     return std::nullopt;
 }
 
-std::optional<PropertyList> valueOf(const Node& tree, PropertyListFault& fault) {
-    if (tree) return TreeReader().read(tree.get());
-    fault = {kErrorMalformed, 0, "cannot be read"};
-    return std::nullopt;
-}
-
 std::optional<PropertyList> parseBinary(std::span<const std::uint8_t> bytes, PropertyListFault& fault) {
     if (auto found = faultOfBinaryPropertyList(bytes)) {
         fault = *std::move(found);
@@ -348,21 +320,18 @@ std::optional<PropertyList> parseBinary(std::span<const std::uint8_t> bytes, Pro
     plist_t node = nullptr;
     plist_from_bin(reinterpret_cast<const char*>(bytes.data()), static_cast<std::uint32_t>(bytes.size()),
                    &node);
-    return valueOf(Node(node), fault);
+    if (const Node tree{node}) return TreeReader().read(tree.get());
+    fault = {kErrorMalformed, 0, "cannot be read"};
+    return std::nullopt;
 }
 
 std::optional<PropertyList> parseXml(std::string_view text, PropertyListUse use, PropertyListFault& fault) {
     std::size_t end = 0;
-    auto found = faultOfXmlPropertyList(text, end);
-    const auto behind = found || use == PropertyListUse::reading ? std::nullopt : remainder(text, end);
-    if (behind) found = {kErrorMalformed, *behind, "something behind the end, which would be lost"};
-    if (found) {
-        fault = *std::move(found);
-        return std::nullopt;
-    }
-    plist_t node = nullptr;
-    plist_from_xml(text.data(), static_cast<std::uint32_t>(end), &node);
-    return valueOf(Node(node), fault);
+    auto value = parseXmlPropertyList(text, end, fault);
+    const auto behind = !value || use == PropertyListUse::reading ? std::nullopt : remainder(text, end);
+    if (!behind) return value;
+    fault = {kErrorMalformed, *behind, "something behind the end, which would be lost"};
+    return std::nullopt;
 }
 
 bool failAt(Error* error, std::string_view form, const PropertyListFault& fault, std::size_t offset) {
@@ -389,10 +358,6 @@ std::optional<PropertyList> parsePropertyList(std::span<const std::uint8_t> byte
         return std::nullopt;
     }
     const bool isXmlForm = isXml(characters->text());
-    if (Error reason; isXmlForm && hasManyAttributes(characters->text(), &reason)) {
-        fail(error, static_cast<ErrorCode>(reason.code), "XML property list, " + reason.message);
-        return std::nullopt;
-    }
     auto value = isXmlForm ? parseXml(characters->text(), use, fault)
                            : parseOldStylePropertyList(characters->text(), fault);
     if (!value) failAt(error, isXmlForm ? "XML" : "old-style", fault, characters->byteOffset(fault.offset));
@@ -406,27 +371,28 @@ std::optional<PropertyList> parsePropertyList(std::string_view bytes, Error* err
 
 std::string serializePropertyList(const PropertyList& value, PropertyListFormat format, Error* error) {
     if (!isStorable(value, format, error)) return {};
-    const Node tree = treeOf(value, format);
-    std::string bytes = format == PropertyListFormat::xml ? xml(tree.get()) : binary(tree.get());
+    std::string bytes =
+        format == PropertyListFormat::xml ? xmlPropertyList(value) : binary(treeOf(value).get());
     if (countOf(value) < mostPropertyListValues(bytes.size())) return bytes;
     fail(error, kErrorTooLarge,
          fmt::format("no property list of {} bytes can hold so many keys and values", bytes.size()));
     return {};
 }
 
-std::optional<PropertyList> readPropertyListFile(const std::string& path, Error* error) {
+std::optional<PropertyList> readPropertyListFile(const std::string& path, Error* error, PropertyListUse use) {
     const auto bytes = readFile(path, error);
     if (!bytes) return std::nullopt;
     Error reason;
-    auto value = parsePropertyList(*bytes, &reason);
+    auto value = parsePropertyList(*bytes, &reason, use);
     if (!value)
         fail(error, static_cast<ErrorCode>(reason.code),
              fmt::format("{}: {}", printable(path), reason.message));
     return value;
 }
 
-std::optional<PropertyList::Dictionary> readDictionaryFile(const std::string& path, Error* error) {
-    auto value = readPropertyListFile(path, error);
+std::optional<PropertyList::Dictionary> readDictionaryFile(const std::string& path, Error* error,
+                                                           PropertyListUse use) {
+    auto value = readPropertyListFile(path, error, use);
     if (!value) return std::nullopt;
     if (PropertyList::Dictionary* dictionary = value->dictionary()) return std::move(*dictionary);
     fail(error, kErrorMalformed, fmt::format("{}: the property list is not a dictionary", printable(path)));

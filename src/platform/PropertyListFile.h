@@ -16,9 +16,11 @@ namespace qvct {
 // them, binary and XML.
 //
 // What is read is bounded before anything is built from it: the nesting by kDeepestPropertyList, the keys and
-// values to 150,000 and one more for every 64 bytes, those that a binary list's shared references expand to
-// by its size. Everything that a property list can hold survives a read and a write in either encoding, in
-// its order; dates lose fractions of a second in XML.
+// values to 150,000 and one more for every 64 bytes, the texts and data that a binary list's shared
+// references expand to by its size. Everything that a property list can hold survives a read and a write in
+// either encoding, in its order, but for this: of a key that comes twice the last value holds, dates lose
+// fractions of a second in XML, and what carries no value (comments, attributes, the encoding, how a number
+// is spelled) is not kept.
 
 /// How many dictionaries and arrays of a property list may lie in each other. Deeper ones are refused as too
 /// large, when read and when written alike, so that what is written can be read.
@@ -34,7 +36,8 @@ enum class PropertyListUse { reading, rewriting };
 /// @{
 /// The value that the bytes hold, whatever the form, or nothing and an error with the offset of the byte at
 /// fault.
-/// @cost  O(size); memory at most proportional to the size.
+/// @cost  O(size), with O(n log n) for the n keys of one dictionary; memory at most 64 MiB and four times the
+/// size.
 QVCT_API std::optional<PropertyList> parsePropertyList(std::span<const std::uint8_t> bytes,
                                                        Error* error = nullptr,
                                                        PropertyListUse use = PropertyListUse::reading);
@@ -49,10 +52,11 @@ QVCT_API std::string serializePropertyList(const PropertyList& value, PropertyLi
                                            Error* error = nullptr);
 
 /// The value in a file; errors name the path.
-QVCT_API std::optional<PropertyList> readPropertyListFile(const std::string& path, Error* error = nullptr);
+QVCT_API std::optional<PropertyList> readPropertyListFile(const std::string& path, Error* error = nullptr,
+                                                          PropertyListUse use = PropertyListUse::reading);
 /// The dictionary in a file; any other value is an error.
-QVCT_API std::optional<PropertyList::Dictionary> readDictionaryFile(const std::string& path,
-                                                                    Error* error = nullptr);
+QVCT_API std::optional<PropertyList::Dictionary> readDictionaryFile(
+    const std::string& path, Error* error = nullptr, PropertyListUse use = PropertyListUse::reading);
 /// Writes as `replaceFile` does: the file holds the old or the new value at any instant.
 QVCT_API bool writePropertyListFile(const PropertyList& value, const std::string& path,
                                     PropertyListFormat format, Error* error = nullptr);

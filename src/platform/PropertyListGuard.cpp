@@ -16,7 +16,7 @@ namespace {
 
 constexpr std::size_t kHeaderSize = 8;
 constexpr std::size_t kTrailerSize = 32;
-/// Values may outnumber the file's bytes by this much (shared leaves are common, shared containers are not).
+/// Texts and data may outgrow the file by this much: those that come twice are often stored once.
 constexpr std::uint64_t kExpansionSlack = 1U << 16;
 
 /// What one object of a binary property list is, read without looking past the end.
@@ -241,26 +241,29 @@ class BinaryGraph {
             return refuse(kErrorTooLarge, object.offset, "nested too deeply");
         }
         open_.push_back(Visit{index, object});
+        ++expanded_.values;
         return true;
     }
 
     void close() {
         const Visit& visit = open_.back();
+        expanded_.values -= visit.totals.values;  // the container's place counts them once more
+        expanded_.payload -= visit.totals.payload;
         states_[static_cast<std::size_t>(visit.index)] = State::done;
         totals_[static_cast<std::size_t>(visit.index)] = visit.totals;
         open_.pop_back();
     }
 
     bool add(Visit& visit, const Totals& child, std::size_t place) {
-        visit.totals.values += child.values;
-        visit.totals.payload += child.payload;
-        visit.totals.depth = std::max(visit.totals.depth, child.depth + 1);
-        if (visit.totals.values > bytes_.size() + kExpansionSlack ||
-            visit.totals.payload > 4 * std::uint64_t{bytes_.size()} + kExpansionSlack) {
-            return refuse(kErrorTooLarge, place, "shared references expand without bound");
+        for (Totals* totals : {&visit.totals, &expanded_}) {
+            totals->values += child.values;
+            totals->payload += child.payload;
         }
-        if (visit.totals.values > mostPropertyListValues(bytes_.size()))
+        visit.totals.depth = std::max(visit.totals.depth, child.depth + 1);
+        if (expanded_.values > mostPropertyListValues(bytes_.size()))
             return refuse(kErrorTooLarge, place, "too many keys and values");
+        if (expanded_.payload > 4 * std::uint64_t{bytes_.size()} + kExpansionSlack)
+            return refuse(kErrorTooLarge, place, "shared references expand without bound");
         if (visit.totals.depth > kDeepestPropertyList)
             return refuse(kErrorTooLarge, place, "nested too deeply");
         return true;
@@ -276,6 +279,7 @@ class BinaryGraph {
     std::vector<State> states_;
     std::vector<Totals> totals_;
     std::vector<Visit> open_;
+    Totals expanded_;  // what the open containers hold so far
 };
 
 }  // namespace

@@ -65,6 +65,29 @@ TEST(PropertyList, XmlIsWhatThePlatformsOwnReadersExpect) {
     EXPECT_TRUE(xml.starts_with("<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<!DOCTYPE plist PUBLIC "))
         << xml;
     EXPECT_NE(xml.find("\n\t<key>a</key>\n\t<dict>\n\t\t<key>b</key>\n"), std::string::npos) << xml;
+    const struct {
+        PropertyList value;
+        const char* xml;
+    } cases[] = {
+        {"a\r\n<&>\"'", "<string>a&#13;\n&lt;&amp;&gt;\"'</string>\n"},
+        {PropertyList::Date{-63113904000.0}, "<date>0001-01-01T00:00:00Z</date>\n"},
+        {PropertyList::Date{86399.9}, "<date>2001-01-01T23:59:59Z</date>\n"},
+        {-0.0, "<real>-0.0</real>\n"},
+        {0.1, "<real>0.10000000000000001</real>\n"},
+        {std::numeric_limits<double>::quiet_NaN(), "<real>nan</real>\n"},
+        {PropertyList::Uid{7}, "<dict>\n\t<key>CF$UID</key>\n\t<integer>7</integer>\n</dict>\n"},
+        {PropertyList::Array{PropertyList::Array{}, Dictionary{}},
+         "<array>\n\t<array/>\n\t<dict/>\n</array>\n"},
+        {PropertyList::Array{PropertyList::Data(52, 0xA5), PropertyList::Data{}},
+         "<array>\n\t<data>\n\tpaWlpaWlpaWlpaWlpaWlpaWlpaWlpaWlpaWlpaWlpaWlpaWlpaWlpaWlpaWlpaWlpaWl\n"
+         "\tpQ==\n\t</data>\n\t<data>\n\t</data>\n</array>\n"},
+    };
+    for (const auto& c : cases) {
+        const std::string written = serializePropertyList(c.value, PropertyListFormat::xml);
+        EXPECT_NE(written.find(std::string("<plist version=\"1.0\">\n") + c.xml + "</plist>\n"),
+                  std::string::npos)
+            << written;
+    }
 }
 
 TEST(PropertyList, RefusesToCutATextAtANulCharacter) {
@@ -139,6 +162,26 @@ std::string sharedItems(std::uint32_t count) {
     return bytes + table + trailer;
 }
 
+/// A binary list of arrays in each other, each with three texts of its own that all are the same bytes.
+std::string arraysThatShareOneText(std::size_t levels, std::size_t length) {
+    const auto bigEndian = [](std::size_t number, std::size_t width) {
+        std::string bytes;
+        for (std::size_t i = width; i-- > 0;) bytes += static_cast<char>(number >> (8 * i));
+        return bytes;
+    };
+    std::string bytes = "bplist00\x5F\x12" + bigEndian(length, 4) + std::string(length, 'x');
+    std::string table;
+    for (std::size_t i = 0; i < levels; ++i) {
+        table += bigEndian(bytes.size(), 4);
+        bytes += i + 1 < levels ? '\xA4' : '\xA3';
+        for (std::size_t text = 0; text < 3; ++text) bytes += bigEndian(levels + 3 * i + text, 2);
+        if (i + 1 < levels) bytes += bigEndian(i + 1, 2);
+    }
+    for (std::size_t i = 0; i < 3 * levels; ++i) table += bigEndian(8, 4);
+    return bytes + table + std::string(6, '\0') + "\x04\x02" + bigEndian(4 * levels, 8) + bigEndian(0, 8) +
+           bigEndian(bytes.size(), 8);
+}
+
 std::string nestedXml(int depth, const std::string& innermost) {
     std::string xml = "<plist>";
     for (int i = 0; i < depth; ++i) xml += "<array>";
@@ -147,10 +190,18 @@ std::string nestedXml(int depth, const std::string& innermost) {
     return xml + "</plist>";
 }
 
-std::string manyAttributes(int count) {
-    std::string xml = "<plist";
-    for (int i = 0; i < count; ++i) xml += fmt::format(" a{}=''", i);
-    return xml + "><true/></plist>";
+/// Many times `piece`, with its number where it says "#".
+std::string repeated(int count, std::string_view piece) {
+    const bool isNumbered = piece.find('#') != std::string_view::npos;
+    std::string text;
+    for (int i = 0; i < count; ++i) text += isNumbered ? replaceAll(piece, "#", std::to_string(i)) : piece;
+    return text;
+}
+
+std::string nestedNameSpaces(int depth) {
+    std::string xml = "<plist>";
+    for (int i = 0; i < depth; ++i) xml += "<array" + repeated(100, fmt::format(" xmlns:a{}x#='u'", i)) + ">";
+    return xml + repeated(1000, "<true/>") + repeated(depth, "</array>") + "</plist>";
 }
 
 std::string nestedText(int depth) {
@@ -198,10 +249,21 @@ TEST(PropertyList, RefusesWhatWouldExhaustMemoryOrTheStack) {
         {"XML within the depth", nestedXml(kDeepestPropertyList, "<true/>"), true},
         {"XML nested too deeply", nestedXml(kDeepestPropertyList + 1, ""), false},
         {"XML nested far too deeply", nestedXml(100000, ""), false},
-        {"XML with an element of 40,000 attributes", manyAttributes(40000), false},
-        {"XML of a million values",
-         "<plist><array>" + replaceAll(std::string(1000000, 'a'), "a", "<true/>") + "</array></plist>",
+        {"binary of 1,000 arrays that share one text", arraysThatShareOneText(1000, 1 << 20), false},
+        {"XML with an element of 40,000 attributes",
+         "<plist" + repeated(40000, " a#=''") + "><true/></plist>", false},
+        {"XML with 1,000 attributes, and more in a text",
+         "<plist" + repeated(1000, " a#='>'") + "><string>" + repeated(1100, "&lt;a b='#'/&gt;") +
+             "</string></plist>",
+         true},
+        {"XML with an attribute declaration",
+         "<!DOCTYPE plist [<!ATTLIST dict a (b|c) \"b\">]><plist><dict/></plist>", false},
+        {"XML with 200 name spaces", nestedNameSpaces(2), true},
+        {"XML with 300 name spaces", nestedNameSpaces(3), false},
+        {"XML of a million values", "<plist><array>" + repeated(1000000, "<true/>") + "</array></plist>",
          false},
+        {"XML of a text of 400,000 entities",
+         "<plist><string>" + repeated(400000, "&amp;") + "</string></plist>", true},
         {"binary of 300,000 values", sharedItems(300000), false},
         {"text within the depth", nestedText(kDeepestPropertyList), true},
         {"text nested too deeply", nestedText(kDeepestPropertyList + 1), false},
@@ -210,9 +272,50 @@ TEST(PropertyList, RefusesWhatWouldExhaustMemoryOrTheStack) {
     };
     for (const auto& c : cases) {
         Error error;
+        const auto start = std::chrono::steady_clock::now();
         EXPECT_EQ(parsePropertyList(c.bytes, &error).has_value(), c.accepted)
             << c.what << ": " << error.message;
+        EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(1)) << c.what;
         EXPECT_EQ(error.message.empty(), c.accepted) << c.what;
+    }
+}
+
+TEST(PropertyList, XmlHoldsWhatItsCharactersSay) {
+    const auto array = [](auto... values) { return PropertyList::Array{values...}; };
+    const auto infinity = std::numeric_limits<double>::infinity();
+    struct {
+        const char* xml;
+        PropertyList value;
+    } const cases[] = {
+        {"<integer>08</integer><integer>0099</integer><integer>-017</integer>", array(8, 99, -17)},
+        {"<integer> +5\n</integer><integer>0x1F</integer><integer>-0X10</integer>", array(5, 31, -16)},
+        {"<integer>1&#50;</integer><integer>1<!-- c -->2</integer><integer>1<![CDATA[2]]>3</integer>",
+         array(12, 12, 123)},
+        {"<integer>00000000000000000000000000000000000000012</integer>", array(12)},
+        {"<integer>-9223372036854775808</integer><integer>0xFFFFFFFFFFFFFFFF</integer>",
+         array(std::numeric_limits<std::int64_t>::min(), std::numeric_limits<std::uint64_t>::max())},
+        {"<real>1<!-- c -->5</real><real>&#45;.5e1</real><real>+1.</real>", array(15.0, -5.0, 1.0)},
+        {"<real>1.5e400</real><real>-1e400</real><real>1.5e-400</real>", array(infinity, -infinity, 0.0)},
+        {"<data>QU<!-- c -->JD</data><data>QU&#74;D</data><data>\r\nQ U\tJD<?p?> </data>",
+         array(PropertyList::Data{'A', 'B', 'C'}, PropertyList::Data{'A', 'B', 'C'},
+               PropertyList::Data{'A', 'B', 'C'})},
+        {"<data>/+8=</data><data>/+8</data><data>QQ</data><data/>",
+         array(PropertyList::Data{255, 239}, PropertyList::Data{255, 239}, PropertyList::Data{'A'},
+               PropertyList::Data{})},
+        {"<date>02001-001-01T0:0:0Z</date><date>2001-01-01T00:<!-- c -->01:60Z</date>",
+         array(PropertyList::Date{0}, PropertyList::Date{120})},
+        {"<string>a<?pi?>b<!-- c --><![CDATA[&amp;]]>&#233;</string><string/>", array("ab&amp;\u00e9", "")},
+        {"<string>a\r\nb\rc&#13;&#xA;</string>", array("a\nb\nc\r\n")},
+        {"<dict><key/><true/><key>a<?pi?>b</key><false> </false></dict>",
+         array(Dictionary{{"", true}, {"ab", false}})},
+    };
+    for (const auto& c : cases) {
+        Error error;
+        const auto value = parsePropertyList(fmt::format("<plist><array>{}</array></plist>", c.xml), &error);
+        ASSERT_TRUE(value) << c.xml << error.message;
+        EXPECT_EQ(*value, c.value) << c.xml;
+        EXPECT_EQ(parsePropertyList(serializePropertyList(*value, PropertyListFormat::xml)), c.value)
+            << c.xml;
     }
 }
 
@@ -243,6 +346,11 @@ TEST(PropertyList, RefusesXmlThatIsNoPropertyList) {
         {"<date>2021-02-29T00:00:00Z</date>", "not a date and time"},
         {"<date>2021-02-28T00:00:00Z.</date>", "not a date and time"},
         {"<data>AA*C</data>", "data that is not base 64"},
+        {"<data>AAECA</data>", "whole groups of base 64"},
+        {"<data>AA==AAEC</data>", "whole groups of base 64"},
+        {"<data>AA=</data>", "whole groups of base 64"},
+        {"<data>====</data>", "whole groups of base 64"},
+        {"<real>+-1</real>", "not a number"},
         {"<string>&unknown;</string>", "not well-formed XML"},
         {"<string>a", "not well-formed XML"},
         {"<array></dict>", "not well-formed XML"},
@@ -296,7 +404,7 @@ TEST(PropertyList, ReadsTheOldTextForm) {
         {" // a comment\n( a, /* another */ (), {}, \"\", )\n",
          PropertyList::Array{"a", PropertyList::Array{}, Dictionary{}, ""}},
         {"<00ff 1A\n2b>", PropertyList::Data{0, 255, 26, 43}},
-        {"{a = <>; b = 5; a = again;}", Dictionary{{"a", PropertyList::Data{}}, {"b", "5"}}},
+        {"{a = <>; b = 5; a = again;}", Dictionary{{"a", "again"}, {"b", "5"}}},
         {R"("\a\b\f\n\r\t\v\"\'\\\q\
 ")",
          "\a\b\f\n\r\t\v\"'\\q\n"},
@@ -326,6 +434,12 @@ TEST(PropertyList, FaultsNameTheirByteInTheFile) {
         {"mismatch", "<plist><array>\n</dict></plist>", "byte 15: not well-formed"},
         {"cut short", "<plist><array>", "byte 14: not well-formed"},
         {"data", "<plist><data>AAAA\nAA*A</data></plist>", "byte 20: data that is not base 64"},
+        {"padding", "<plist><data>AAAAA</data></plist>", "byte 7: data that is not whole groups of base 64"},
+        {"attribute declaration", "<!DOCTYPE plist [<!ATTLIST dict a CDATA 'x'>]><plist><dict/></plist>",
+         "byte 17: an attribute declaration"},
+        {"attributes",
+         utf16("<!---->", true, true) + utf16("<plist" + repeated(1001, " a=''") + "/>", true, false),
+         "byte 10032: an element with more than 1000 attributes"},
         {"half a pair", utf16("<a", false, true) + "\x3d\xd8>",
          "text property list, byte 6: half a character"},
         {"odd", utf16("<a>", false, true) + "x", "byte 8: half a character"},
@@ -382,11 +496,13 @@ TEST(PropertyList, RefusesAContainerThatHoldsItself) {
     EXPECT_FALSE(parsePropertyList(bytes));
 }
 
-/// A binary list of one dictionary with two pairs; its objects are the dictionary, two keys and one value.
-std::string dictionaryOfTwoPairs(const std::string& firstKey, const std::string& secondKey) {
+/// A binary list of one dictionary with two pairs; its objects are the dictionary, two keys and one value,
+/// the first pair's, and the second's unless that is another object.
+std::string dictionaryOfTwoPairs(const std::string& firstKey, const std::string& secondKey,
+                                 char secondValue = '\x03') {
     std::string bytes = "bplist00";
     std::string offsets(1, static_cast<char>(bytes.size()));
-    bytes += std::string("\xD2\x01\x02\x03\x03", 5);
+    bytes += std::string("\xD2\x01\x02\x03", 4) + secondValue;
     for (const std::string& object : {firstKey, secondKey, std::string("\x09")}) {
         offsets += static_cast<char>(bytes.size());
         bytes += object;
@@ -413,10 +529,18 @@ TEST(PropertyList, RefusesKeysThatTheLibraryWouldEndTheProcessAt) {
     EXPECT_FALSE(parsePropertyList("<plist><dict><key>a&#0;b</key><true/></dict></plist>"));
 }
 
-TEST(PropertyList, OfAKeyThatComesTwiceTheFirstHolds) {
-    const auto value = parsePropertyList(dictionaryOfTwoPairs("\x51\x61", "\x51\x61"));
-    ASSERT_TRUE(value);
-    EXPECT_EQ(value->dictionary()->size(), 1U);
+TEST(PropertyList, OfAKeyThatComesTwiceTheLastHoldsWhereTheFirstStood) {
+    const std::string others = repeated(20, "<key>#</key><true/>");
+    for (const std::string& bytes :
+         {dictionaryOfTwoPairs("\x51\x61", "\x51\x61", '\x02'), std::string("{a = no; a = a;}"),
+          "<plist><dict><key>a</key><true/>" + others + "<key>a</key><string>a</string></dict></plist>"}) {
+        Error error;
+        const auto value = parsePropertyList(bytes, &error);
+        ASSERT_TRUE(value) << error.message;
+        EXPECT_EQ(value->dictionary()->size(), bytes.find("19") == std::string::npos ? 1U : 21U);
+        EXPECT_EQ(value->dictionary()->begin()->key, "a");
+        EXPECT_EQ(value->dictionary()->begin()->value, PropertyList("a"));
+    }
 }
 
 TEST(PropertyList, ReadsTheValidCorpusAndSurvivesTheHostileOneInTime) {
