@@ -48,7 +48,8 @@ Settings settingsIn(const std::string& file, std::string_view what, Read read, T
 }
 
 Settings keywordsIn(const std::string& file, ToolContext& context) {
-    Settings keywords = settingsIn(file, "keywords", readDictionaryFile, context);
+    const auto read = [](const std::string& path, Error* error) { return readDictionaryFile(path, error); };
+    Settings keywords = settingsIn(file, "keywords", read, context);
     if (keywords) checkKeywords(*keywords, context);
     return keywords;
 }

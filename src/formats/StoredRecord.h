@@ -24,7 +24,8 @@ bool changeStoredFile(
     Error* error, const ContentWriteOptions& options);
 
 /// The same for a property list. Entries that `change` leaves alone stay, in their order. A new file is XML,
-/// one that is there keeps its encoding; one that cannot be read as a dictionary is not written over.
+/// and so is one that was text of any form; a binary one stays binary. One that cannot be read as a
+/// dictionary is not written over.
 bool changeStoredDictionary(const URL& item, const std::string& path,
                             const std::function<void(PropertyList::Dictionary&)>& change, Error* error,
                             const ContentWriteOptions& options);

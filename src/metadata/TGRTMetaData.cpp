@@ -41,7 +41,8 @@ bool isKeyOfRecord(std::string_view key) {
 
 PropertyList::Dictionary storedDictionary(const URL& url, Error* error) {
     if (!fileExists(url.path())) return {};
-    return readDictionaryFile(url.path(), error).value_or(PropertyList::Dictionary{});
+    return readDictionaryFile(url.path(), error, PropertyListUse::rewriting)
+        .value_or(PropertyList::Dictionary{});
 }
 
 }  // namespace

@@ -62,8 +62,8 @@ class QVCT_API TGRTMetaData : public Object {
     void storeOver(PropertyList::Dictionary& stored) const;
     /// What to store at the URL: this record put into the property list that is stored there, by `storeInto`.
     ///
-    /// When nothing is stored there it starts empty. So it does when what is there cannot be read, but then
-    /// the error says so: whoever writes the result destroys what is there.
+    /// When nothing is stored there it starts empty. So it does when what is there cannot be read, or holds
+    /// more behind its end, but then the error says so: whoever writes the result destroys what is there.
     PropertyList::Dictionary prepareDictionaryForURL(const URL& url, Error* error = nullptr) const;
 
     /// The record that a dictionary holds; null without dictionary. Entries that are not of their type count

@@ -88,9 +88,12 @@ TEST(MetaData, SaysWhenWhatIsStoredCannotBeRead) {
     Error error;
     EXPECT_EQ(record->prepareDictionaryForURL(URL::fileURLWithPath(folder.path("none")), &error).size(), 3U);
     EXPECT_EQ(error.message, "");
-    const URL broken = URL::fileURLWithPath(folder.write("broken", "<plist><dict>"));
-    EXPECT_EQ(record->prepareDictionaryForURL(broken, &error).size(), 3U);
-    EXPECT_THAT(error.message, testing::HasSubstr(broken.path()));
+    for (const char* broken : {"<plist><dict>", "<plist><dict/></plist>behind"}) {
+        const URL url = URL::fileURLWithPath(folder.write("broken", broken));
+        EXPECT_EQ(record->prepareDictionaryForURL(url, &error).size(), 3U);
+        EXPECT_THAT(error.message, testing::HasSubstr(url.path())) << broken;
+        error = {};
+    }
 }
 
 TEST(MetaData, CountsWrongTypesAsAbsent) {
