@@ -102,7 +102,7 @@ std::optional<std::vector<std::uint64_t>> numbersIn(std::string_view name) {
 
 bool isOwnerGone(int file, const struct stat& status) {
     if (::flock(file, LOCK_EX | LOCK_NB) == 0) return true;
-    constexpr std::time_t kDay = 24 * 60 * 60;
+    constexpr std::time_t kDay = std::time_t{24} * 60 * 60;
     return errno != EWOULDBLOCK && status.st_ctim.tv_sec + kDay < std::time(nullptr);
 }
 
