@@ -4,6 +4,12 @@
 
 namespace qvct::contentdb {
 
+/// Where the database is that a host names so: links followed, whether something is there or not.
+std::string pathOfDatabase(const std::string& name);
+
+/// Makes an empty file in which a database can be made, as private as `model`, if there is one.
+void makeEmptyLike(const std::string& model, const std::string& path);
+
 /// Whether the file carries the mark of a content database, damaged or not.
 bool isMarkedAsContentDatabase(const std::string& path);
 
@@ -16,9 +22,9 @@ std::string unfinishedPath(const std::string& database);
 /// @{
 /// How a damaged database is replaced, so that the old or the new one is found after a crash at any instant:
 /// the unfinished database, whole and closed by then, is declared rebuilt ("<database>.rebuilt"); the old one
-/// is put aside
-/// ("<database>.damaged") and the rebuilt one, if there is one, into its place. To put aside again goes on
-/// where that was interrupted; it answers the name of the old one. Whoever does so has the RunLock.
+/// is put aside ("<database>.damaged"), and then the rebuilt one, if there is one, is put into its place. To
+/// put aside again goes on where that was interrupted; it answers the name of the old one. Whoever does so
+/// has the RunLock.
 /// @throws DatabaseFailure when a file cannot be moved.
 void declareRebuilt(const std::string& database);
 bool isRebuilt(const std::string& database);

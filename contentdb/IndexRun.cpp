@@ -206,8 +206,10 @@ void IndexRun::store(std::vector<Described>& batch) {
 
 void IndexRun::storeOne(const Described& described, Pending& pending) {
     const IndexedItem& item = described.item;
+    const bool wasAway = item.stamp == FileStamp{};
+    if (wasAway) pending.folder->digest = 0;  // the next run reads it again
     // What goes away while it waits to be read is missing, and not broken.
-    if (!item.failure.empty() && isGone(item.path)) {
+    if (!item.failure.empty() && (wasAway || isGone(item.path))) {
         pending.folder->digest = 0;
         return;
     }
@@ -274,6 +276,7 @@ void IndexRun::pruneUnvisited(const std::string& root) {
         writer_.begin();
         pruneFolder(folder, path);
         writer_.commit();
+        visited_.insert(folder.id);  // below another root as well
     }
 }
 

@@ -16,33 +16,14 @@
 namespace qvct::contentdb {
 namespace {
 
-/// Puts a damaged database aside and what can be read of it into its place. Answers the folders that may have
-/// lost items.
-std::vector<std::string> replaceDamaged(const IndexOptions& options, const DatabaseFailure& failure) {
-    const std::string unfinished = unfinishedPath(options.database);
-    removeDatabase(unfinished);
-    Salvage saved = salvage(options.database, unfinished);
-    declareRebuilt(options.database);
-    const std::string aside = putAside(options.database);
-    if (options.note) {
-        const std::string rest = saved.folders.empty()
-                                     ? "; which other folders were in it could not be read"
-                                     : fmt::format(", with {} items that could be read", saved.items);
-        options.note(fmt::format("{}; it was put aside as {} and is built anew{}", failure.what(),
-                                 printable(aside), rest));
-    }
-    std::erase_if(saved.folders, [](const std::string& folder) { return !isDirectory(folder); });
-    return std::move(saved.folders);
-}
-
 /// Puts a database that an earlier run has rebuilt, but not into its place, there.
 void finishRebuild(const IndexOptions& options) {
     if (!isRebuilt(options.database)) return;
     const std::string aside = putAside(options.database);
     if (!options.note) return;
     options.note(fmt::format(
-        "{}: was damaged, and its rebuilding interrupted; the old one was put aside as {}, its other "
-        "folders are to be indexed again",
+        "{}: was damaged, and its rebuilding interrupted; the rebuilt one is in its place, the old "
+        "one was put aside as {}",
         printable(options.database), printable(aside)));
 }
 
@@ -62,10 +43,40 @@ IndexProgress runOnce(const IndexOptions& options, const std::vector<std::string
     return run.progress();
 }
 
+/// Puts a damaged database aside, and into its place what can be read of it with what the folders that were
+/// in it have now: all at once, so that no folder is forgotten when this is interrupted. Whether it came to
+/// its end.
+bool replaceDamaged(const IndexOptions& options, const DescriberFactory& factory,
+                    const DatabaseFailure& failure) {
+    IndexOptions rebuilding = options;
+    rebuilding.prune = false;
+    rebuilding.database = unfinishedPath(options.database);
+    removeDatabase(rebuilding.database);
+    Salvage saved = salvage(options.database, rebuilding.database);
+    const bool knowsFolders = !saved.folders.empty();
+    std::erase_if(saved.folders, [](const std::string& folder) { return !isDirectory(folder); });
+    if (!saved.folders.empty()) {
+        runOnce(rebuilding, saved.folders, factory);
+        openDatabase(rebuilding.database, Access::write)->emptyLog();
+    }
+    if (options.isCancelled && options.isCancelled()) return false;
+    declareRebuilt(options.database);
+    const std::string aside = putAside(options.database);
+    if (options.note) {
+        const std::string rest = knowsFolders ? fmt::format(", with {} items that could be read", saved.items)
+                                              : "; which other folders were in it could not be read";
+        options.note(fmt::format("{}; it was put aside as {} and was built anew{}", failure.what(),
+                                 printable(aside), rest));
+    }
+    return true;
+}
+
 }  // namespace
 
-std::optional<IndexProgress> indexLibrary(const IndexOptions& options, const DescriberFactory& factory,
+std::optional<IndexProgress> indexLibrary(const IndexOptions& wanted, const DescriberFactory& factory,
                                           Error* error) {
+    IndexOptions options = wanted;
+    options.database = pathOfDatabase(wanted.database);
     const auto refuse = [error](ErrorCode code, const std::string& message) {
         qvct::fail(error, code, message);
         return std::nullopt;
@@ -95,10 +106,7 @@ std::optional<IndexProgress> indexLibrary(const IndexOptions& options, const Des
             const bool isOurs =
                 failure.code() == kErrorMalformed && isMarkedAsContentDatabase(options.database);
             if (!isOurs) throw;
-            IndexOptions others = options;
-            others.prune = false;
-            others.folders = replaceDamaged(options, failure);
-            if (!others.folders.empty()) runOnce(others, others.folders, factory);
+            if (!replaceDamaged(options, factory, failure)) return IndexProgress{};
         }
         return runOnce(options, folders, factory);
     });

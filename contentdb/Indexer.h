@@ -35,7 +35,7 @@ struct IndexOptions {
     /// is another than before, every item counts as changed, also those that only a later run comes to.
     std::uint64_t describer = 0;
     /// Which links out of a folder are followed, and who is told of the others. A link that is passed over
-    /// takes nothing out of the index.
+    /// takes nothing out of the index, unless what it leads to is indexed under a path of its own.
     WalkedLinks links;
     /// Takes items out of the index whose files are gone, but for those below a folder of `folders` in which
     /// nothing is left: a disk that is away looks like this. `failed` is told of it.
@@ -61,8 +61,8 @@ struct IndexOptions {
     std::function<void(const IndexProgress&)> progress;
     /// Called for each item or folder that cannot be read, with path and reason.
     std::function<void(const Error&)> failed;
-    /// Told when a damaged database was put aside ("<database>.damaged") and is built anew, from what can
-    /// still be read of it and from all folders that are known to it.
+    /// Told when a damaged database was put aside ("<database>.damaged") and built anew, from what can still
+    /// be read of it and from all folders that are known to it.
     std::function<void(const std::string& message)> note;
     /// Asked after each folder and while items are read; true ends the run early, with all that was read so
     /// far stored and nothing taken out.

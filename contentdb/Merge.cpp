@@ -1,6 +1,7 @@
 #include "contentdb/DatabaseFiles.h"
 #include "contentdb/Indexer.h"
 #include "contentdb/Reading.h"
+#include "contentdb/RunLock.h"
 #include "contentdb/Schema.h"
 #include "contentdb/StoreWriter.h"
 #include "contentdb/Terms.h"
@@ -41,6 +42,7 @@ class Merge {
         : connection_(openDatabase(target, Access::write)), writer_(*connection_) {
         for (const std::string& database : databases) {
             auto connection = openToRead(database);
+            connection->run("BEGIN");  // all of it in one state, whatever a run writes meanwhile
             auto reader = std::make_unique<StoreWriter>(*connection);
             sources_.push_back({std::move(connection), std::move(reader)});
         }
@@ -51,9 +53,7 @@ class Merge {
         writer_.begin();
         for (const auto& [path, parts] : folders()) addFolder(parts);
         writer_.commit();
-        // Closing writes the log into the file as well, but does not tell when that fails.
-        if (connection_->number("PRAGMA wal_checkpoint(TRUNCATE)") != 0)
-            connection_->fail("cannot write the log into the file");
+        connection_->emptyLog();
     }
 
   private:
@@ -111,8 +111,11 @@ class Merge {
 
 }  // namespace
 
-bool mergeDatabases(const std::vector<std::string>& databases, const std::string& target, Error* error) {
-    if (fileExists(target))
+bool mergeDatabases(const std::vector<std::string>& databases, const std::string& name, Error* error) {
+    const std::string target = pathOfDatabase(name);
+    const auto lock = RunLock::acquire(target, error);
+    if (!lock) return false;
+    if (fileExists(target) || isRebuilt(target))
         return fail(error, kErrorInvalidArgument, fmt::format("{}: exists already", printable(target)));
     // Built beside its place, so that a merge that was interrupted leaves no half database there.
     const std::string unfinished = unfinishedPath(target);

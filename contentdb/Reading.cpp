@@ -34,7 +34,8 @@ void finishRebuild(const std::string& path) {
 
 }  // namespace
 
-std::unique_ptr<Connection> openToRead(const std::string& path) {
+std::unique_ptr<Connection> openToRead(const std::string& name) {
+    const std::string path = pathOfDatabase(name);
     const auto end = std::chrono::steady_clock::now() + kPatience;
     // Asked before the database is looked at: all that a run has stored is there when it has ended.
     while (RunLock::isHeld(path)) {

@@ -1,11 +1,13 @@
 #include "contentdb/Salvage.h"
 
 #include "contentdb/ChecksumVfs.h"
+#include "contentdb/DatabaseFiles.h"
 #include "contentdb/Schema.h"
 #include "contentdb/StoreWriter.h"
 #include "contentdb/Terms.h"
 
 #include <algorithm>
+#include <filesystem>
 #include <memory>
 #include <set>
 
@@ -27,6 +29,17 @@ auto readable(Read read) -> decltype(read()) {
         return read();
     } catch (const DatabaseFailure&) {
         return {};
+    }
+}
+
+/// Null where the database is too damaged to be opened. A disk that is full, or does not answer, damages
+/// none.
+std::unique_ptr<Connection> openedIfReadable(const std::string& path) {
+    try {
+        return openDatabase(path, Access::read);
+    } catch (const DatabaseFailure& failure) {
+        if (failure.code() == kErrorUnreadable || failure.code() == kErrorUnwritable) throw;
+        return nullptr;
     }
 }
 
@@ -58,9 +71,11 @@ std::set<std::string> knownFolders(Connection& connection) {
     return folders;
 }
 
+/// Whether walking another folder comes to this one.
 bool isInAnother(const std::string& path, const std::set<std::string>& folders) {
     std::string_view folder = path;
     while (folder != "/" && !folder.empty()) {
+        if (std::filesystem::is_symlink(folder)) return false;  // which its walk may pass over
         folder = placeOf(folder).folder;
         if (folders.contains(std::string(folder))) return true;
     }
@@ -86,6 +101,7 @@ std::int64_t copyItems(ContentStore& from, const std::string& target) {
         return true;
     });
     writer.commit();
+    connection->emptyLog();
     return items;
 }
 
@@ -93,13 +109,14 @@ std::int64_t copyItems(ContentStore& from, const std::string& target) {
 
 Salvage salvage(const std::string& damaged, const std::string& target) {
     Salvage saved;
-    const auto connection = readable([&] { return openDatabase(damaged, Access::read); });
+    const auto connection = openedIfReadable(damaged);
     std::unique_ptr<ContentStore> store;
     readable([&] {
         if (connection) store = std::make_unique<ContentStore>(*connection);
         return true;
     });
     if (!store) return saved;
+    makeEmptyLike(damaged, target);
     saved.items = copyItems(*store, target);
     const std::set<std::string> folders = knownFolders(*connection);
     std::copy_if(folders.begin(), folders.end(), std::back_inserter(saved.folders),

@@ -7,7 +7,9 @@
 #include "platform/Text.h"
 
 #include <array>
+#include <cerrno>
 #include <cstdint>
+#include <cstring>
 #include <filesystem>
 
 #include <fmt/format.h>
@@ -111,8 +113,9 @@ bool isEmptyFile(const std::string& path) {
 void create(const std::string& path) {
     const std::string unborn = unfinishedPath(path);
     removeDatabase(unborn);
+    makeEmptyLike(path, unborn);
     {
-        Connection connection(unborn, Connection::Access::create);
+        Connection connection(unborn, Connection::Access::readWrite);
         configure(connection);
         connection.run(
             fmt::format("PRAGMA page_size = {0}; PRAGMA application_id = {1}", kPageSize, kApplicationId)
@@ -167,6 +170,7 @@ std::unique_ptr<Connection> openDatabase(const std::string& path, Access access)
     const bool exists = fileExists(path);
     if (!exists && access == Access::read) refuse(path, kErrorUnreadable, "there is no such database");
     if (access == Access::write && (!exists || isEmptyFile(path))) create(path);
+    if (::access(path.c_str(), R_OK) != 0) refuse(path, kErrorUnreadable, std::strerror(errno));
     if (!isMarkedAsContentDatabase(path)) {
         refuse(path, kErrorInvalidArgument,
                "not a content database, or one whose beginning is damaged; if it was one, move it away and "

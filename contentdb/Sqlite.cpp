@@ -43,9 +43,7 @@ std::string_view reasonOf(int result, std::string_view otherwise) {
 Connection::Connection(const std::string& path, Access access) : path_(path) {
     registerChecksumVfs();
     constexpr int patience = 10000;  // milliseconds that a writer waits for another
-    const int flags = access == Access::readOnly    ? SQLITE_OPEN_READONLY
-                      : access == Access::readWrite ? SQLITE_OPEN_READWRITE
-                                                    : SQLITE_OPEN_READWRITE | SQLITE_OPEN_CREATE;
+    const int flags = access == Access::readOnly ? SQLITE_OPEN_READONLY : SQLITE_OPEN_READWRITE;
     if (sqlite3_open_v2(path.c_str(), &handle_, flags | SQLITE_OPEN_NOMUTEX, kChecksumVfs) != SQLITE_OK) {
         const int result = sqlite3_extended_errcode(handle_);
         const std::string reason(reasonOf(result, sqlite3_errmsg(handle_)));
@@ -92,6 +90,10 @@ void Connection::checkPages() {
     if (result == SQLITE_OK) return;
     throw DatabaseFailure(codeOf(result),
                           fmt::format("{}: {}", printable(path_), reasonOf(result, sqlite3_errstr(result))));
+}
+
+void Connection::emptyLog() {
+    if (number("PRAGMA wal_checkpoint(TRUNCATE)") != 0) fail("cannot write the log into the file");
 }
 
 bool Connection::isInTransaction() const {

@@ -28,7 +28,7 @@ class DatabaseFailure : public std::runtime_error {
 /// An open connection. One thread at a time.
 class Connection {
   public:
-    enum class Access { readOnly, readWrite, create };
+    enum class Access { readOnly, readWrite };
 
     /// @throws DatabaseFailure, as every operation here.
     Connection(const std::string& path, Access access);
@@ -44,6 +44,8 @@ class Connection {
     /// Reads every page of the file, so that each is held against its checksum; for a writer, as it takes
     /// what the log has into the file before. @cost  That of reading the file.
     void checkPages();
+    /// Takes the log into the file. Closing does so as well, but does not tell when it fails.
+    void emptyLog();
     [[noreturn]] void fail(std::string_view doing) const;
     const std::string& path() const { return path_; }
     bool isInTransaction() const;

@@ -2,6 +2,7 @@
 
 #include "contentdb/ItemCodec.h"
 #include "contentdb/Terms.h"
+#include "platform/FileAccess.h"
 #include "platform/HardLimit.h"
 
 #include <csignal>
@@ -69,6 +70,8 @@ IndexedItem described(ItemDescriber& describer, const Task& task) {
     }
     item.path = task.path;
     item.stamp = task.stamp;
+    // Away, perhaps for a moment: what was read may not be all, and a failure not the item's own.
+    if (!fileExists(task.path)) item.stamp = {};
     return item;
 }
 

@@ -80,11 +80,12 @@ Json jsonOf(const std::vector<IndexedValue>& values) {
     return json;
 }
 
-Json jsonOf(ContentDatabase& database, ItemId id, const IndexedItem& item) {
+/// With an error when the database cannot be read any more.
+Json jsonOf(ContentDatabase& database, ItemId id, const IndexedItem& item, Error* error) {
     Json json;
     json["id"] = id;
     json["path"] = item.path;
-    json["earlierPaths"] = database.earlierPaths(id).value_or(std::vector<std::string>());
+    json["earlierPaths"] = database.earlierPaths(id, error).value_or(std::vector<std::string>());
     json["name"] = item.name;
     json["title"] = item.title.empty() ? Json() : Json(item.title);
     json["displayName"] = item.title.empty() ? item.name : item.title;
@@ -177,15 +178,17 @@ void searchItems(const Options& options, ToolContext& context) {
     if (!found) return context.itemFailed(error.message);
     if (context.format != Format::table) {
         Json json = Json::array();
-        for (const Found& one : *found) json.push_back(jsonOf(*database, one.id, one.item));
+        for (const Found& one : *found) json.push_back(jsonOf(*database, one.id, one.item, &error));
+        if (!error.message.empty()) return context.itemFailed(error.message);
         return printJson(json, context.format);
     }
     std::vector<const IndexedItem*> items;
     for (const Found& one : *found) items.push_back(&one.item);
     printItems(items, {}, context.terminal());
-    const auto count = items.size() < options.limit ? static_cast<std::int64_t>(items.size())
-                                                    : database->count(*query).value_or(0);
-    context.note(fmt::format("{} found, {} shown", count, items.size()));
+    const auto count = items.size() < options.limit ? std::optional(static_cast<std::int64_t>(items.size()))
+                                                    : database->count(*query, &error);
+    if (!count) return context.itemFailed(error.message);
+    context.note(fmt::format("{} found, {} shown", *count, items.size()));
 }
 
 void countTags(const Options& options, ToolContext& context) {
@@ -218,9 +221,10 @@ void findSimilar(const Options& options, ToolContext& context) {
     if (context.format != Format::table) {
         Json json = Json::array();
         for (const Similar& one : *found) {
-            json.push_back(jsonOf(*database, one.id, one.item));
+            json.push_back(jsonOf(*database, one.id, one.item, &error));
             json.back()["similarity"] = one.similarity;
         }
+        if (!error.message.empty()) return context.itemFailed(error.message);
         return printJson(json, context.format);
     }
     std::vector<const IndexedItem*> items;

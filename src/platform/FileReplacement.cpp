@@ -157,7 +157,9 @@ class Replacement {
     bool openOld() {
         struct stat status {};
         if (::stat(target_.c_str(), &status) != 0) {
-            return errno == ENOENT ? isExpected({}) : failWithErrno(error_, path_, "cannot be opened");
+            if (errno != ENOENT) return failWithErrno(error_, path_, "cannot be opened");
+            const bool isLink = ::lstat(target_.c_str(), &status) == 0;
+            return isLink ? failFor(error_, path_, "is a link that leads nowhere") : isExpected({});
         }
         if (!S_ISREG(status.st_mode)) return failFor(error_, path_, "is not a regular file");
         constexpr mode_t kAnyWrite = S_IWUSR | S_IWGRP | S_IWOTH;

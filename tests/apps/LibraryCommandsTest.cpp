@@ -211,6 +211,16 @@ TEST_F(LibraryCommands, CountTagsAndFindSimilar) {
     EXPECT_EQ(similar[0]["displayName"], "Techno Kick");
 }
 
+TEST_F(LibraryCommands, SayWhenNotAllCouldBeCounted) {
+    folder_.write("sounds/" + std::string(40, 'a') + "!.cst", "");
+    settle();
+    index();
+    const ToolResult result =
+        runTool({"search", "name::^dark|^(a+)+$", "--limit", "1", "--db", folder_.path("db")});
+    EXPECT_EQ(result.status, 1);
+    EXPECT_THAT(result.errors, HasSubstr("takes too long"));
+}
+
 TEST_F(LibraryCommands, FindNumbersAsTheyAreWritten) {
     folder_.write("sounds/Odd.wav",
                   Wav().file(Wav().format() + Wav().acid(0, 60, 7, 86.6F) + Wav().data(5000)));

@@ -1,4 +1,5 @@
 #include "Library.h"
+#include "contentdb/RunLock.h"
 #include "platform/FileAccess.h"
 #include "platform/Url.h"
 #include "support/RunTool.h"
@@ -13,6 +14,8 @@
 
 #include <fmt/format.h>
 #include <gmock/gmock.h>
+#include <sched.h>
+#include <sys/mount.h>
 #include <sys/resource.h>
 #include <sys/stat.h>
 #include <sys/wait.h>
@@ -49,6 +52,8 @@ class NameDescriber : public ItemDescriber {
         if (item.name.find("slow") != std::string::npos)
             std::this_thread::sleep_for(std::chrono::milliseconds(2));
         item.fileType = kFileTypeAudioFile;
+        const std::filesystem::path folder = std::filesystem::path(path).parent_path();
+        if (std::filesystem::remove(folder / "leaves")) std::filesystem::rename(folder, folder / "../away");
         if (!isDirectory(path)) item.payloadHash = readAll(path);
         if (item.payloadHash == "before") std::ofstream(path) << "after!";
         item.taggings = {{"Drums", "Source", {}, {}, Provenance::automatic, "names"}};
@@ -183,8 +188,109 @@ TEST_F(Indexing, ReadsAgainWhatChangedWhileItWasRead) {
     EXPECT_EQ(index().described, 0U);
 }
 
+TEST_F(Indexing, ReadsAgainWhatWasAwayWhileItWasRead) {
+    for (const char* name : {"disk/Hat.wav", "disk/Kick.wav"}) write(name, "sound");
+    settle();
+    for (int run = 0; run < 2; ++run) {
+        write("disk/leaves", "");
+        index([](IndexOptions& options) { options.workers = 1; });
+        std::filesystem::rename(library() + "/away", library() + "/disk");
+    }
+    EXPECT_EQ(index().failed, 0U);
+    EXPECT_EQ(names().size(), 2U);
+    const auto database = ContentDatabase::open(this->database());
+    for (const char* name : {"Hat", "Kick"})
+        EXPECT_EQ(database->item(library() + "/disk/" + name + ".wav")->item.payloadHash, "sound") << name;
+}
+
+TEST_F(Indexing, OfAFullDiskLosesNothingOfADamagedDatabase) {
+    for (int i = 0; i < 200; ++i) {
+        write(fmt::format("Kick {}.wav", i), std::to_string(i));
+        folder_.write(fmt::format("elsewhere/Snare {}.wav", i), std::to_string(-i - 1));
+    }
+    settle();
+    index([this](IndexOptions& options) { options.folders.push_back(folder_.path("elsewhere")); });
+    std::string damaged = readAll(database());
+    damaged[3 * 8192 + 4000] = static_cast<char>(damaged[3 * 8192 + 4000] ^ 1);
+    const std::string disk = folder_.path("disk");
+    std::filesystem::create_directory(disk);
+    const pid_t child = ::fork();
+    if (child == 0) {
+        if (::unshare(CLONE_NEWNS) != 0 || ::mount("none", "/", nullptr, MS_REC | MS_PRIVATE, nullptr) != 0 ||
+            ::mount("none", disk.c_str(), "tmpfs", 0, "size=4m") != 0)
+            ::_exit(2);
+        std::size_t refused = 0;
+        for (const std::size_t pages : {0U, 25U, 50U, 75U, 100U, 140U}) {
+            const std::size_t free = pages * 4096;
+            for (const auto& file : std::filesystem::directory_iterator(disk)) std::filesystem::remove(file);
+            std::ofstream(disk + "/db") << damaged;
+            std::ofstream(disk + "/filler") << std::string((4U << 20U) - damaged.size() - free, 'x');
+            IndexOptions options;
+            options.folders = {library()};
+            options.database = disk + "/db";
+            const auto make = [] { return std::make_unique<NameDescriber>(); };
+            if (!indexLibrary(options, make)) ++refused;
+            std::filesystem::remove(disk + "/filler");
+            EXPECT_TRUE(indexLibrary(options, make)) << free;
+            EXPECT_EQ(names("", disk + "/db").size(), 400U) << free;
+        }
+        ::_exit(HasFailure() || refused == 0 ? 1 : 0);
+    }
+    int status = 0;
+    ::waitpid(child, &status, 0);
+    if (WEXITSTATUS(status) == 2) GTEST_SKIP() << "only root can mount a disk";
+    EXPECT_EQ(status, 0);
+}
+
+TEST_F(Indexing, AndMergingTakeTurnsAtADatabase) {
+    write("Kick.wav", "");
+    settle();
+    index();
+    const std::string target = folder_.path("merged");
+    const auto refusal = [&] {
+        Error error;
+        EXPECT_FALSE(mergeDatabases({database()}, target, &error));
+        return error.message;
+    };
+    Milestone milestone;
+    const pid_t child = ::fork();
+    if (child == 0) {
+        const auto turn = RunLock::acquire(target, nullptr);
+        milestone.reach();
+        milestone.awaitPass();
+        ::_exit(0);
+    }
+    milestone.awaitReached();
+    EXPECT_THAT(refusal(), HasSubstr("another run is writing"));
+    milestone.letPass();
+    ::waitpid(child, nullptr, 0);
+    std::filesystem::copy_file(database(), target + ".rebuilt");
+    EXPECT_THAT(refusal(), HasSubstr("exists already"));
+}
+
+TEST_F(Indexing, ReachesADatabaseThroughALink) {
+    for (int i = 0; i < 300; ++i) write(fmt::format("Kick {}.wav", i), std::to_string(i));
+    settle();
+    const std::string link = folder_.path("link");
+    std::filesystem::create_symlink("real", link);
+    const auto throughLink = [&](IndexOptions& options) { options.database = link; };
+    index(throughLink);
+    auto turn = RunLock::acquire(folder_.path("real"), nullptr);
+    IndexOptions options;
+    options.folders = {library()};
+    options.database = link;
+    EXPECT_FALSE(indexLibrary(options, [] { return std::make_unique<NameDescriber>(); }));
+    const std::string bytes = readAll(folder_.path("real"));
+    folder_.write("real", bytes.substr(0, 9000) + "?" + bytes.substr(9001));
+    turn.reset();
+    index(throughLink);
+    EXPECT_TRUE(std::filesystem::is_symlink(link));
+    EXPECT_TRUE(ContentDatabase::open(folder_.path("real"))->check());
+    EXPECT_EQ(names("", link).size(), 300U);
+}
+
 TEST_F(Indexing, TakesAFolderOnceThatSeveralRootsShow) {
-    for (const char* name : {"Kick.wav", "sub/Snare.wav", "sub/Hat.wav"}) write(name, name);
+    for (const char* name : {"Kick.wav", "sub/deep/Snare.wav", "sub/Hat.wav"}) write(name, name);
     settle();
     const auto overlapping = [this](IndexOptions& options) {
         options.folders = {library(), library() + "/sub", library()};
@@ -195,6 +301,13 @@ TEST_F(Indexing, TakesAFolderOnceThatSeveralRootsShow) {
     EXPECT_EQ(index(overlapping).seen, 4U);
     EXPECT_EQ(names().size(), 4U);
     EXPECT_TRUE(ContentDatabase::open(database())->check());
+    std::filesystem::remove_all(library() + "/sub");
+    std::filesystem::create_directory(library() + "/sub");
+    const auto pruning = [&](IndexOptions& options) {
+        overlapping(options);
+        options.prune = true;
+    };
+    EXPECT_EQ(index(pruning).missing, 3U);
 }
 
 TEST_F(Indexing, ForgetsMissingFilesOnlyWhenTold) {
@@ -534,6 +647,8 @@ TEST_F(Indexing, RebuildsADamagedDatabaseAndKeepsTheOld) {
     for (int i = 0; i < 300; ++i) write(fmt::format("Kick {}.wav", i), "");
     settle();
     index();
+    constexpr auto isPrivate = std::filesystem::perms(0600);
+    std::filesystem::permissions(database(), isPrivate);
     std::string bytes = readAll(database());
     for (std::size_t at = 9000; at < bytes.size(); at += 8192) bytes[at] = static_cast<char>(bytes[at] ^ 1);
     folder_.write("db", bytes);
@@ -541,6 +656,7 @@ TEST_F(Indexing, RebuildsADamagedDatabaseAndKeepsTheOld) {
     EXPECT_EQ(names().size(), 300U);
     EXPECT_THAT(notes_, ElementsAre(HasSubstr("built anew")));
     EXPECT_EQ(readAll(database() + ".damaged"), bytes);
+    EXPECT_EQ(std::filesystem::status(database()).permissions(), isPrivate);
     // Interrupted before the new one was in its place: a reader puts it there, and so does a run.
     for (const bool isAside : {true, false}) {
         for (const bool byReader : {true, false}) {
@@ -549,6 +665,9 @@ TEST_F(Indexing, RebuildsADamagedDatabaseAndKeepsTheOld) {
             EXPECT_EQ(byReader ? names().size() : index().unchanged, 300U);
             EXPECT_EQ(names().size(), 300U);
             EXPECT_FALSE(fileExists(database() + ".rebuilt"));
+            if (!byReader) {
+                EXPECT_THAT(notes_.back(), testing::EndsWith(isAside ? "db.damaged" : "db.damaged-3"));
+            }
         }
     }
     EXPECT_EQ(readAll(database() + ".damaged-3"), bytes);
@@ -594,8 +713,13 @@ TEST_F(Indexing, FindsDamageOnAnyPageAndKeepsAllFolders) {
         write(fmt::format("{}/Kick {}.wav", i % 3, i), std::to_string(i));
         folder_.write(fmt::format("elsewhere/{}/Snare {}.wav", i % 3, i), std::to_string(-i - 1));
     }
+    write("Hat.wav", "hat");
+    std::filesystem::create_directory_symlink(folder_.path("elsewhere/2"), library() + "/link");
     settle();
-    index([this](IndexOptions& options) { options.folders.push_back(folder_.path("elsewhere")); });
+    index([this](IndexOptions& options) {
+        options.folders = {folder_.path("elsewhere/0"), folder_.path("elsewhere/1"), library()};
+        options.links.outside = LinksOutside::all;
+    });
     std::filesystem::rename(library() + "/0/Kick 0.wav", library() + "/1/Moved.wav");
     settle();
     EXPECT_EQ(index().moved, 1U);
@@ -688,6 +812,7 @@ TEST_F(Indexing, RefusesASecondRunAForeignFileAndAMissingFolder) {
     EXPECT_THAT(refusal(), HasSubstr(fmt::format("another run is writing to it (process {})", child)));
     milestone.letPass();
     ::waitpid(child, nullptr, 0);
+    ASSERT_EQ(::mkfifo((database() + ".rebuilt").c_str(), 0600), 0);
     EXPECT_THAT(names(), ElementsAre("Kick"));
 }
 

@@ -128,6 +128,14 @@ TEST(FileReplacement, RefusesProtectedFilesAndWhatIsNoFile) {
     std::filesystem::create_directory(folder.path("folder"));
     EXPECT_FALSE(replaceFile(folder.path("folder"), "new", &error));
     EXPECT_FALSE(replaceFile(folder.path("missing/file"), "new", &error));
+    std::filesystem::create_symlink(folder.path("nowhere"), folder.path("link"));
+    error = {};
+    for (const bool isDryRun : {true, false}) {
+        FileReplacementOptions options;
+        options.isDryRun = isDryRun;
+        EXPECT_FALSE(replaceFileByPieces(folder.path("link"), {}, options, &error));
+        EXPECT_THAT(error.message, HasSubstr("link: is a link that leads nowhere"));
+    }
     EXPECT_EQ(filesIn(folder), 1U);
 }
 
