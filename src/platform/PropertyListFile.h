@@ -36,8 +36,8 @@ enum class PropertyListUse { reading, rewriting };
 /// @{
 /// The value that the bytes hold, whatever the form, or nothing and an error with the offset of the byte at
 /// fault.
-/// @cost  O(size), with O(n log n) for the n keys of one dictionary; memory at most 64 MiB and four times the
-/// size.
+/// @cost  O(size), with O(n log n) for the n keys of one dictionary; memory at most proportional to the size,
+/// beside 64 MiB.
 QVCT_API std::optional<PropertyList> parsePropertyList(std::span<const std::uint8_t> bytes,
                                                        Error* error = nullptr,
                                                        PropertyListUse use = PropertyListUse::reading);

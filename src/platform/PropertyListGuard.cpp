@@ -16,8 +16,11 @@ namespace {
 
 constexpr std::size_t kHeaderSize = 8;
 constexpr std::size_t kTrailerSize = 32;
-/// Texts and data may outgrow the file by this much: those that come twice are often stored once.
-constexpr std::uint64_t kExpansionSlack = 1U << 16;
+/// Most bytes of texts, as UTF-8, and data: those that come twice are often stored once, and three bytes of
+/// UTF-8 stand for two of UTF-16. There are two copies of them while the list is read.
+constexpr std::uint64_t mostPayload(std::size_t size) {
+    return (std::uint64_t{8} << 20U) + std::uint64_t{size} / 2 * 3;
+}
 
 /// What one object of a binary property list is, read without looking past the end.
 struct Object {
@@ -233,7 +236,8 @@ class BinaryGraph {
         if (!readObject(index, object)) return false;
         if (object.kind == Object::Kind::leaf) {
             states_[static_cast<std::size_t>(index)] = State::done;
-            totals_[static_cast<std::size_t>(index)] = {1, object.payload, 0};
+            const std::uint64_t payload = object.textUnit == 2 ? object.payload / 2 * 3 : object.payload;
+            totals_[static_cast<std::size_t>(index)] = {1, payload, 0};
             return true;
         }
         states_[static_cast<std::size_t>(index)] = State::open;
@@ -262,7 +266,7 @@ class BinaryGraph {
         visit.totals.depth = std::max(visit.totals.depth, child.depth + 1);
         if (expanded_.values > mostPropertyListValues(bytes_.size()))
             return refuse(kErrorTooLarge, place, "too many keys and values");
-        if (expanded_.payload > 4 * std::uint64_t{bytes_.size()} + kExpansionSlack)
+        if (expanded_.payload > mostPayload(bytes_.size()))
             return refuse(kErrorTooLarge, place, "shared references expand without bound");
         if (visit.totals.depth > kDeepestPropertyList)
             return refuse(kErrorTooLarge, place, "nested too deeply");

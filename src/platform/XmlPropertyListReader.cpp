@@ -16,6 +16,7 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 #include <fmt/format.h>
@@ -200,7 +201,7 @@ class Reader {
                 isComplete_ = true;
                 break;
             case Element::key:
-                builder_.key(characters_);
+                builder_.key(std::exchange(characters_, {}));
                 break;
             default:
                 add(closed);
@@ -251,7 +252,7 @@ class Reader {
             case Element::data:
                 return addIf(dataOf(characters_), "data that is not whole groups of base 64", closed.offset);
             case Element::text:
-                return builder_.add(characters_);
+                return builder_.add(std::exchange(characters_, {}));
             default:
                 return builder_.add(closed.element == Element::yes);
         }

@@ -249,6 +249,8 @@ TEST(PropertyList, RefusesWhatWouldExhaustMemoryOrTheStack) {
         {"XML within the depth", nestedXml(kDeepestPropertyList, "<true/>"), true},
         {"XML nested too deeply", nestedXml(kDeepestPropertyList + 1, ""), false},
         {"XML nested far too deeply", nestedXml(100000, ""), false},
+        {"binary of three short texts that are one", arraysThatShareOneText(1, 1 << 20), true},
+        {"binary of three long texts that are one", arraysThatShareOneText(1, 8 << 20), false},
         {"binary of 1,000 arrays that share one text", arraysThatShareOneText(1000, 1 << 20), false},
         {"XML with an element of 40,000 attributes",
          "<plist" + repeated(40000, " a#=''") + "><true/></plist>", false},
