@@ -18,6 +18,7 @@
 #include <algorithm>
 #include <cstdlib>
 #include <filesystem>
+#include <fstream>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -178,7 +179,8 @@ void fill(const std::string& path, std::size_t count) {
 /// The same words, tags and tempos in a table of SQLite's text index, with prefixes: the baseline.
 class TextIndex {
   public:
-    TextIndex(const std::string& path, std::size_t count) : connection_(path, Connection::Access::create) {
+    TextIndex(const std::string& path, std::size_t count)
+        : connection_(emptyFile(path), Connection::Access::readWrite) {
         connection_.run(
             "PRAGMA page_size = 8192; PRAGMA journal_mode = WAL; PRAGMA synchronous = NORMAL;"
             "CREATE VIRTUAL TABLE text USING fts5 (words, content = '', detail = none, "
@@ -192,6 +194,11 @@ class TextIndex {
             if (i % 8192 == 0) connection_.run("COMMIT; BEGIN");
         }
         connection_.run("COMMIT");
+    }
+
+    static std::string emptyFile(const std::string& path) {
+        std::ofstream(path).flush();
+        return path;
     }
 
     std::size_t count(const std::string& word, const std::string& tag, int low, int high) {
