@@ -438,8 +438,9 @@ Files changedLibrary(const TemporaryFolder& folder, const Change& change) {
     for (std::size_t i = 0; i < change.added; ++i)
         folder.write(fmt::format("user/library/New {}.wav", i), "new");
     if (change.isDamaged) {
-        constexpr std::size_t intact = 8192;
+        constexpr std::size_t page = 8192;
         std::string database = readAll(path + "/db");
+        const std::size_t intact = database.size() / page / 2 * page;
         database.replace(intact, std::string::npos, std::string(database.size() - intact, 'x'));
         folder.write("user/db", database);
     }
