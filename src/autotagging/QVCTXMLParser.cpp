@@ -195,7 +195,11 @@ std::optional<PropertyList::Dictionary> QVCTXMLParser::objectWithData(std::strin
         parseErrorOccurred(errorOf(*context));
         return std::nullopt;
     }
-    return takeObject();
+    auto object = takeObject();
+    // The library takes some texts that end in a document type for well-formed.
+    if (object.size() == 1) return object;
+    parseErrorOccurred({std::string(QVCTErrorDomain), kErrorMalformed, "XML: no element"});
+    return std::nullopt;
 }
 
 void QVCTXMLParser::didFindElement(const xmlNode& element) {
