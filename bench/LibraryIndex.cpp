@@ -196,11 +196,6 @@ class TextIndex {
         connection_.run("COMMIT");
     }
 
-    static std::string emptyFile(const std::string& path) {
-        std::ofstream(path).flush();
-        return path;
-    }
-
     std::size_t count(const std::string& word, const std::string& tag, int low, int high) {
         std::string match = fmt::format("\"{}\"* AND \"\xc2\x80tag{}\" AND (", folded(word), bareName(tag));
         for (int tempo = low; tempo <= high; ++tempo)
@@ -213,6 +208,11 @@ class TextIndex {
     }
 
   private:
+    static std::string emptyFile(const std::string& path) {
+        std::ofstream(path).flush();
+        return path;
+    }
+
     static std::string textOf(const IndexedItem& item) {
         std::string text;
         for (const std::string_view part : textsOf(item)) {

@@ -206,14 +206,11 @@ void IndexRun::store(std::vector<Described>& batch) {
 
 void IndexRun::storeOne(const Described& described, Pending& pending) {
     const IndexedItem& item = described.item;
-    const bool wasAway = item.stamp == FileStamp{};
+    const bool hasFailed = !item.failure.empty();
+    const bool wasAway = item.stamp == FileStamp{} || (hasFailed && isGone(item.path));
     if (wasAway) pending.folder->digest = 0;  // the next run reads it again
-    // What goes away while it waits to be read is missing, and not broken.
-    if (!item.failure.empty() && (wasAway || isGone(item.path))) {
-        pending.folder->digest = 0;
-        return;
-    }
-    if (!item.failure.empty()) {
+    if (wasAway && hasFailed) return;         // it is missing, and not broken
+    if (hasFailed) {
         ++progress_.failed;
         if (options_.failed) {
             options_.failed({std::string(QVCTErrorDomain), kErrorUnreadable, messageOfFailure(item)});

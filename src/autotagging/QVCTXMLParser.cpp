@@ -55,8 +55,13 @@ void characters(void* context, const xmlChar* text, int length) {
 /// Keeps only entities whose text stands in the document, so that nothing outside is ever read.
 void declareEntity(void* context, const xmlChar* name, int type, const xmlChar* publicId,
                    const xmlChar* systemId, xmlChar* content) {
-    if (!hasFewAttributes(viewOf(content))) {
-        xmlStopParser(static_cast<xmlParserCtxt*>(context));
+    if (attributeTooMany(viewOf(content))) {
+        auto* stopped = static_cast<xmlParserCtxt*>(context);
+        parserOf(context).parseErrorOccurred(
+            {std::string(QVCTErrorDomain), kErrorTooLarge,
+             fmt::format("XML, line {}: an entity with more than {} attributes",
+                         xmlSAX2GetLineNumber(stopped), kMostXmlAttributes)});
+        xmlStopParser(stopped);
     } else if (type == XML_INTERNAL_GENERAL_ENTITY) {
         xmlSAX2EntityDecl(context, name, type, publicId, systemId, content);
     }
@@ -191,15 +196,12 @@ std::optional<PropertyList::Dictionary> QVCTXMLParser::objectWithData(std::strin
              fmt::format("XML, line {}: its JSON grows too large", xmlSAX2GetLineNumber(context.get()))});
         return std::nullopt;
     }
+    if (error_.code != 0) return std::nullopt;  // stopped, which the library takes for well-formed
     if (context->wellFormed == 0) {
         parseErrorOccurred(errorOf(*context));
         return std::nullopt;
     }
-    auto object = takeObject();
-    // The library takes some texts that end in a document type for well-formed.
-    if (object.size() == 1) return object;
-    parseErrorOccurred({std::string(QVCTErrorDomain), kErrorMalformed, "XML: no element"});
-    return std::nullopt;
+    return takeObject();
 }
 
 void QVCTXMLParser::didFindElement(const xmlNode& element) {

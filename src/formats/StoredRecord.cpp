@@ -68,10 +68,9 @@ bool changeStoredDictionary(const URL& item, const std::string& path,
         change(*dictionary);
         const bool isBinary = stored.starts_with("bplist");
         std::string bytes = serializePropertyList(
-            std::move(*dictionary), isBinary ? PropertyListFormat::binary : PropertyListFormat::xml);
-        if (!bytes.empty()) return bytes;
-        fail(reason, kErrorInvalidArgument, "the record holds a text that cannot be stored");
-        return std::nullopt;
+            std::move(*dictionary), isBinary ? PropertyListFormat::binary : PropertyListFormat::xml, reason);
+        if (bytes.empty()) return std::nullopt;
+        return bytes;
     };
     return changeStoredFile(item, path, changeBytes, error, options);
 }

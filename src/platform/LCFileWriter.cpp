@@ -84,12 +84,11 @@ std::shared_ptr<LCFileWriter> LCFileWriter::fileWriterForURL(const URL& url, LCW
 bool LCFileWriter::writeFileData(const std::shared_ptr<const LCFileData>& data, Error* error) const {
     const auto refuse = [&](const Error& reason) { return failFor(error, path_, reason); };
     if (!data) return refuse({{}, kErrorInvalidArgument, "there is no file data to write"});
-    const std::string record = data->record().empty()
-                                   ? std::string{}
-                                   : serializePropertyList(data->record(), PropertyListFormat::binary);
-    if (record.empty() && !data->record().empty()) {
-        return refuse({{}, kErrorInvalidArgument, "the record holds a value that cannot be stored"});
-    }
+    Error reason;
+    const std::string record =
+        data->record().empty() ? std::string{}
+                               : serializePropertyList(data->record(), PropertyListFormat::binary, &reason);
+    if (record.empty() && !data->record().empty()) return refuse(reason);
     const auto turn = EditLock::acquire(path_, error);
     if (!turn) return false;
     if (LoopDataFile::isName(path_) && isMissing(path_))
@@ -98,7 +97,6 @@ bool LCFileWriter::writeFileData(const std::shared_ptr<const LCFileData>& data, 
     const auto reader = FileReader::open(path_, error);
     if (!reader) return false;
     ReadWindow window(*reader);
-    Error reason;
     const auto container = Container::open(window, path_, &reason);
     LCAudioFacts facts;
     if (!container || !container->readFacts(facts, &reason) || !isReadable(*container, &reason)) {

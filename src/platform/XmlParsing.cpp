@@ -22,27 +22,56 @@ struct ParserCloser {
     void operator()(xmlParserCtxt* context) const { xmlFreeParserCtxt(context); }
 };
 
-/// Encodings that spell markup in ASCII, by how their names begin; zeros between the letters are skipped.
-/// Shifted ones such as ISO 2022 are none: the bytes of markup occur in their characters.
-constexpr std::array<std::string_view, 28> kAsciiEncodings = {
-    "utf-8",  "utf8",     "utf-16",   "utf16",   "utf-32", "ucs-2",     "ucs-4",
-    "ascii",  "us-ascii", "iso-8859", "iso8859", "latin",  "iso_8859",  "windows-",
-    "cp125",  "cp85",     "cp86",     "gb",      "big5",   "shift_jis", "shift-jis",
-    "x-sjis", "sjis",     "euc-",     "x-euc",   "koi8-",  "macintosh", "x-mac-"};
+/// Declared, these change nothing for the library: it has told the width of characters by the first bytes.
+constexpr std::array<std::string_view, 4> kUnswitchedEncodings = {"utf-8", "utf8", "utf-16", "utf16"};
 
-bool isBlank(char c) {
-    return c == ' ' || c == '\t' || c == '\r' || c == '\n' || c == '\0';
+/// Encodings in which the bytes of markup occur in no other character, by how their names begin. Shifted ones
+/// such as ISO 2022 are none.
+constexpr std::array<std::string_view, 21> kAsciiEncodings = {
+    "ascii",     "us-ascii",  "iso-8859", "iso8859", "latin", "iso_8859",  "windows-",
+    "cp125",     "cp85",      "cp86",     "gb",      "big5",  "x-sjis",    "sjis",
+    "shift_jis", "shift-jis", "euc-",     "x-euc",   "koi8-", "macintosh", "x-mac-"};
+
+/// How many bytes a character of markup takes, and which of them has its letter.
+struct Characters {
+    std::size_t width = 1;
+    std::size_t letter = 0;
+};
+
+/// As the library tells them by the first bytes.
+Characters charactersOf(std::string_view text) {
+    using namespace std::string_view_literals;
+    if (text.starts_with("<\0\0\0"sv)) return {4, 0};
+    if (text.starts_with("\0\0\0<"sv)) return {4, 3};
+    if (text.starts_with("<\0?\0"sv) || text.starts_with("\xFF\xFE"sv)) return {2, 0};
+    if (text.starts_with("\0<\0?"sv) || text.starts_with("\xFE\xFF"sv)) return {2, 1};
+    return {};
 }
 
-/// The XML declaration without zeros and byte order mark, up to its end or the most that is looked at.
-std::string declarationOf(std::string_view text) {
-    constexpr std::size_t longest = 1024;
-    std::string start(text.substr(0, longest));
-    std::erase(start, '\0');
+/// A byte for each wide character: its letter, or a question mark for what is no markup.
+std::string narrowed(std::string_view text, Characters characters) {
+    std::string narrow(text.size() / characters.width, '?');
+    for (std::size_t i = 0; i < narrow.size(); ++i) {
+        const std::string_view wide = text.substr(i * characters.width, characters.width);
+        const char letter = wide[characters.letter];
+        const auto zeros = static_cast<std::size_t>(std::count(wide.begin(), wide.end(), '\0'));
+        if (letter > 0 && zeros + 1 == characters.width) narrow[i] = letter;
+    }
+    return narrow;
+}
+
+bool isBlank(char c) {
+    return c == ' ' || c == '\t' || c == '\r' || c == '\n';
+}
+
+/// The XML declaration behind a byte order mark, up to its end or the most that is looked at.
+std::string_view declarationOf(std::string_view text) {
+    constexpr std::size_t longest = 1024, longestMark = 3;
+    const std::string_view start = text.substr(0, longest);
     const std::size_t declaration = start.find("<?xml");
-    if (declaration == std::string::npos || declaration > 4) return {};
+    if (declaration == std::string_view::npos || declaration > longestMark) return {};
     const std::size_t end = start.find("?>", declaration);
-    return start.substr(declaration, end == std::string::npos ? end : end + 2 - declaration);
+    return start.substr(declaration, end == std::string_view::npos ? end : end + 2 - declaration);
 }
 
 /// The declared encoding in small letters, if there is one.
@@ -54,16 +83,20 @@ std::optional<std::string> declaredEncoding(std::string_view declaration) {
     return lowercase(name.substr(0, name.find(declaration[quote])));
 }
 
-bool hasAsciiMarkup(std::string_view text, Error* error) {
+/// Whether the library reads the markup as it is seen here, a byte for each of its characters.
+bool hasKnownMarkup(std::string_view narrow, bool isWide, Error* error) {
     constexpr std::string_view declarationInEbcdic = "\x4C\x6F\xA7\x94";
-    if (text.starts_with(declarationInEbcdic)) return fail(error, kErrorMalformed, "line 1: EBCDIC");
-    const std::string declaration = declarationOf(text);
+    if (narrow.starts_with(declarationInEbcdic)) return fail(error, kErrorMalformed, "line 1: EBCDIC");
+    const std::string_view declaration = declarationOf(narrow);
     if (!declaration.empty() && !declaration.ends_with("?>"))
         return fail(error, kErrorMalformed, "line 1: an XML declaration that is too long, or does not end");
     const std::optional<std::string> name = declaredEncoding(declaration);
+    if (!name || std::find(kUnswitchedEncodings.begin(), kUnswitchedEncodings.end(), *name) !=
+                     kUnswitchedEncodings.end())
+        return true;
     const bool isKnown =
-        !name || std::any_of(kAsciiEncodings.begin(), kAsciiEncodings.end(),
-                             [&](std::string_view start) { return name->starts_with(start); });
+        !isWide && std::any_of(kAsciiEncodings.begin(), kAsciiEncodings.end(),
+                               [&](std::string_view start) { return name->starts_with(start); });
     return isKnown ||
            fail(error, kErrorMalformed,
                 fmt::format("line 1: texts in the encoding \"{}\" are not read", printable(*name)));
@@ -79,37 +112,6 @@ std::size_t valueBehind(std::string_view text, std::size_t equals) {
     std::size_t at = equals + 1;
     while (at < text.size() && isBlank(text[at])) ++at;
     return at < text.size() && (text[at] == '"' || text[at] == '\'') ? at : text.size();
-}
-
-/// Counts in tags alone. No attribute goes on behind a "<", whatever is wrong with the text.
-std::optional<std::size_t> attributeTooManyInTags(std::string_view text) {
-    std::size_t at = 0;
-    while ((at = text.find('<', at)) != std::string_view::npos) {
-        int count = 0;
-        for (++at; at < text.size() && text[at] != '<' && text[at] != '>'; ++at) {
-            if (text[at] != '=') continue;
-            const std::size_t quote = valueBehind(text, at);
-            if (quote == text.size()) continue;
-            if (++count > kMostXmlAttributes) return at;
-            at = quote + 1;
-            while (at < text.size() && text[at] != text[quote] && text[at] != '<') ++at;
-            if (at < text.size() && text[at] == '<') --at;  // ends the tag in the next turn
-        }
-    }
-    return std::nullopt;
-}
-
-/// Counts whatever may be an attribute, for texts in which a quote or ">" may be part of a character.
-std::optional<std::size_t> attributeTooManyAnywhere(std::string_view text) {
-    int count = 0;
-    for (std::size_t at = 0; at < text.size(); ++at) {
-        if (text[at] == '<') {
-            count = 0;
-        } else if (text[at] == '=' && valueBehind(text, at) < text.size() && ++count > kMostXmlAttributes) {
-            return at;
-        }
-    }
-    return std::nullopt;
 }
 
 /// Keeps the XML library's messages, and ends the parsing of what grows too large.
@@ -221,16 +223,33 @@ ParsedXml parseXml(std::string_view text) {
 }
 
 std::optional<std::size_t> attributeTooMany(std::string_view text) {
-    const bool isUtf8 = text.find('\0') == std::string_view::npos && isValidUtf8(text);
-    return isUtf8 ? attributeTooManyInTags(text) : attributeTooManyAnywhere(text);
+    std::size_t at = 0;
+    while ((at = text.find('<', at)) != std::string_view::npos) {
+        int count = 0;
+        // No attribute goes on behind a "<", whatever is wrong with the text.
+        for (++at; at < text.size() && text[at] != '<' && text[at] != '>'; ++at) {
+            if (text[at] != '=') continue;
+            const std::size_t quote = valueBehind(text, at);
+            if (quote == text.size()) continue;
+            if (++count > kMostXmlAttributes) return at;
+            at = quote + 1;
+            while (at < text.size() && text[at] != text[quote] && text[at] != '<') ++at;
+            if (at < text.size() && text[at] == '<') --at;  // ends the tag in the next turn
+        }
+    }
+    return std::nullopt;
 }
 
 bool hasFewAttributes(std::string_view text, Error* error) {
-    if (!hasAsciiMarkup(text, error)) return false;
-    const auto offset = attributeTooMany(text);
+    const Characters characters = charactersOf(text);
+    const bool isWide = characters.width > 1;
+    const std::string letters = isWide ? narrowed(text, characters) : std::string();
+    const std::string_view narrow = isWide ? letters : text;
+    if (!hasKnownMarkup(narrow, isWide, error)) return false;
+    const auto offset = attributeTooMany(narrow);
     return !offset || fail(error, kErrorTooLarge,
                            fmt::format("line {}: an element with more than {} attributes",
-                                       lineAt(text, *offset), kMostXmlAttributes));
+                                       lineAt(narrow, *offset), kMostXmlAttributes));
 }
 
 }  // namespace qvct

@@ -42,13 +42,13 @@ struct ParsedXml {
 ParsedXml parseXml(std::string_view text);
 
 /// Where an element has one attribute too many, counted without parsing. The text is UTF-8, or of another
-/// encoding that spells markup in ASCII.
+/// encoding in which the bytes of markup occur in no other character.
 /// @cost  O(bytes), a nanosecond each.
 std::optional<std::size_t> attributeTooMany(std::string_view text);
 
-/// Whether no element has too many attributes; else false, and an error with its line. Texts in an encoding
-/// that does not spell markup in ASCII (apart from UTF-16 and UTF-32) are refused, and so is a declaration
-/// too long to tell.
+/// Whether no element has too many attributes; else false, and an error with its line. Texts in UTF-8,
+/// UTF-16, UTF-32 and encodings in which the bytes of markup occur in no other character are read; others are
+/// refused, and so is a declaration too long to tell.
 /// @cost  O(bytes), a nanosecond each.
 bool hasFewAttributes(std::string_view text, Error* error = nullptr);
 

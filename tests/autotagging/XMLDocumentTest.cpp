@@ -64,6 +64,7 @@ TEST(XmlToDictionaries, KeepsItsShapeAndQuirks) {
         {"<a/><b/>", "nil"},
         {"<a>&unknown;</a>", "nil"},
         {"<a b='1' b='2'/>", "nil"},
+        {"<!DOCTYPE a [<!ENTITY e '<?xml'>]><a/>", R"({"a":{}})"},
         {"", "nil"},
         {"text", "nil"},
     };
@@ -327,9 +328,10 @@ std::string repeated(int count, std::string_view piece) {
     return text;
 }
 
+/// Little-endian; a "*" becomes U+3C3C, both bytes of which are those of a "<".
 std::string utf16(std::string_view ascii) {
     std::string wide = "\xff\xfe";
-    for (const char c : ascii) wide += {c, '\0'};
+    for (const char c : ascii) wide += c == '*' ? std::string("<<") : std::string{c, '\0'};
     return wide;
 }
 
@@ -345,7 +347,10 @@ TEST(XMLDocument, WhatTheLibraryComparesWithAllOthersIsBounded) {
         {"line 2: an element with more than 1000 attributes", "<P>\n<b" + many + "/></P>"},
         {"line 1001: an element with more than 1000 attributes",
          "<P" + repeated(40000, " xmlns:a#=\n'>'") + "/>"},
-        {"line 1: an element with more than 1000 attributes", utf16("<P" + many + "/>")},
+        {"line 1: an element with more than 1000 attributes",
+         utf16("<P" + replaceAll(many, "''", "'*'") + "/>")},
+        {"line 1: texts in the encoding \"iso-8859-1\" are not read",
+         utf16("<?xml version='1.0' encoding='ISO-8859-1'?><P/>")},
         {"line 1: an entity with more than 1000 attributes",
          "<!DOCTYPE P [<!ENTITY e \"&#60;b" + replaceAll(many, "=", "&#61;") + "/>\">]><P>&e;</P>"},
         {"line 1: more than 1000 attributes declared",
@@ -364,7 +369,9 @@ TEST(XMLDocument, WhatTheLibraryComparesWithAllOthersIsBounded) {
         const test::CapturedLog log;
         const auto start = std::chrono::steady_clock::now();
         EXPECT_FALSE(document(row.xml)->isMatchingXPath("//c")) << row.fault;
-        QVCTXMLParser::dictionaryForXMLData(row.xml);
+        QVCTXMLParser parser(QVCTXMLParser::largestJson(row.xml.size()));
+        const auto dictionary = parser.objectWithData(row.xml);
+        EXPECT_TRUE(dictionary ? dictionary->size() == 1 : parser.error().code != 0) << row.fault;
         EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(2)) << row.fault;
         EXPECT_THAT(log.messages(), testing::Contains(HasSubstr(std::string("test.xml, ") + row.fault)));
     }
@@ -376,6 +383,8 @@ TEST(XMLDocument, WhatTheLibraryComparesWithAllOthersIsBounded) {
             document(std::string("<?xml version='1.0' encoding='") + encoding + "'?><P><c/></P>");
         EXPECT_TRUE(xml->isMatchingXPath("/P/c")) << encoding;
     }
+    EXPECT_TRUE(document(utf16("<P a='*'>" + repeated(600, "<b d='>*' e=''/>") + "<c/></P>"))
+                    ->isMatchingXPath("/P/c"));
 }
 
 /// A thousand plug-ins with three parameters each.

@@ -51,15 +51,19 @@ TEST(EditLock, IsTakenAgainByItsThreadAndEndsWithTheLast) {
     EXPECT_TRUE(isFree(item));
 }
 
+/// A process forked from here that does this one thing, and ends with its status.
+template <typename Work>
+pid_t forked(const Work& work) {
+    const pid_t child = ::fork();
+    if (child == 0) ::_exit(work());
+    return child;
+}
+
 TEST(EditLock, EndsAlthoughAProcessWasForkedMeanwhile) {
     const TemporaryFolder folder;
     const std::string item = folder.write("item", "x");
     auto turn = EditLock::acquire(item);
-    const pid_t child = ::fork();
-    if (child == 0) {
-        ::pause();
-        ::_exit(0);
-    }
+    const pid_t child = forked(::pause);
     EXPECT_FALSE(isFree(item));
     turn.reset();
     EXPECT_TRUE(isFree(item));
@@ -71,12 +75,11 @@ TEST(EditLock, IsNeitherHeldNorEndedByAProcessThatWasForkedMeanwhile) {
     const TemporaryFolder folder;
     const std::string item = folder.write("item", "x");
     auto turn = EditLock::acquire(item);
-    const pid_t child = ::fork();
-    if (child == 0) {
+    const pid_t child = forked([&] {
         const bool isHeld = EditLock::acquire(item, nullptr, milliseconds(0)) != nullptr;
         turn.reset();
-        ::_exit(isHeld ? 1 : 0);
-    }
+        return isHeld ? 1 : 0;
+    });
     int status = 0;
     ::waitpid(child, &status, 0);
     EXPECT_EQ(status, 0) << "it is held";
@@ -88,13 +91,11 @@ TEST(EditLock, OfAnotherProcessIsWaitedForAndNamed) {
     const std::string item = folder.write("item", "x");
     int held[2];
     ASSERT_EQ(::pipe(held), 0);
-    const pid_t child = ::fork();
-    if (child == 0) {
+    const pid_t child = forked([&] {
         const auto turn = EditLock::acquire(item);
         [[maybe_unused]] const ssize_t told = ::write(held[1], "x", 1);
-        ::usleep(400'000);
-        ::_exit(0);
-    }
+        return ::usleep(400'000);
+    });
     char byte = 0;
     ASSERT_EQ(::read(held[0], &byte, 1), 1);
     Error error;
