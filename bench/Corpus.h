@@ -1,7 +1,7 @@
 #pragma once
 
 #include "GrooveRenderer.h"
-#include "platform/MidiSequence.h"
+#include "media/midi/MidiSequence.h"
 
 #include <algorithm>
 #include <cstdlib>

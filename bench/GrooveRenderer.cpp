@@ -1,6 +1,6 @@
 #include "GrooveRenderer.h"
 
-#include "platform/AudioDecoder.h"
+#include "media/audio/AudioDecoder.h"
 
 #include <algorithm>
 #include <cmath>

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "platform/MidiSequence.h"
+#include "media/midi/MidiSequence.h"
 
 #include <array>
 #include <cstdint>

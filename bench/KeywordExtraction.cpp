@@ -2,7 +2,7 @@
 // faster.
 
 #include "Measure.h"
-#include "autotagging/QVCTKeywordExtractor.h"
+#include "autotagging/keywords/QVCTKeywordExtractor.h"
 #include "support/OneByOneExtractor.h"
 #include "support/PathGenerator.h"
 

@@ -3,8 +3,8 @@
 //
 //   bench_loop_files [folder of sounds] [folder to write in]
 #include "Measure.h"
-#include "platform/LCFileParser.h"
-#include "platform/LCFileWriter.h"
+#include "media/loopfile/LCFileParser.h"
+#include "media/loopfile/LCFileWriter.h"
 
 #include <algorithm>
 #include <cstdlib>

@@ -6,8 +6,8 @@
 #include "Measure.h"
 #include "OnsetScore.h"
 #include "WavFile.h"
-#include "platform/AudioDecoder.h"
-#include "platform/OnsetDetector.h"
+#include "listening/onsets/OnsetDetector.h"
+#include "media/audio/AudioDecoder.h"
 
 #include <cstdlib>
 

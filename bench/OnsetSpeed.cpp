@@ -4,8 +4,8 @@
 #include "Corpus.h"
 #include "Measure.h"
 #include "WavFile.h"
-#include "platform/AudioDecoder.h"
-#include "platform/OnsetDetector.h"
+#include "listening/onsets/OnsetDetector.h"
+#include "media/audio/AudioDecoder.h"
 
 #include <cstdlib>
 

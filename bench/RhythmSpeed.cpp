@@ -2,9 +2,9 @@
 // clustering of 10,000 notes takes.
 #include "Corpus.h"
 #include "Measure.h"
-#include "analysis/AgglomerativeClustering.h"
-#include "analysis/QVCTMidiAnalysis.h"
-#include "platform/FileAccess.h"
+#include "listening/rhythm/AgglomerativeClustering.h"
+#include "listening/rhythm/QVCTMidiAnalysis.h"
+#include "platform/files/FileAccess.h"
 
 #include <random>
 

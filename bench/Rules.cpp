@@ -1,10 +1,10 @@
 // The default rules: against evaluating each rule by itself, and what one item costs.
 
 #include "Measure.h"
-#include "autotagging/QVCTJavaScriptUtilities.h"
-#include "autotagging/QVCTXMLDocument.h"
-#include "autotagging/QVCTXMLRulesTaggingService.h"
-#include "autotagging/XPathExpression.h"
+#include "autotagging/scripts/QVCTJavaScriptUtilities.h"
+#include "autotagging/services/QVCTXMLRulesTaggingService.h"
+#include "autotagging/xml/QVCTXMLDocument.h"
+#include "autotagging/xml/XPathExpression.h"
 
 #include <cstdio>
 #include <cstdlib>

@@ -2,12 +2,12 @@
 // looking up labels.
 
 #include "Measure.h"
-#include "platform/PropertyListFile.h"
-#include "platform/TaggingTypes.h"
+#include "platform/data/PropertyListFile.h"
 #include "resources/EmbeddedFiles.h"
 #include "resources/QVCTCompiledResources.h"
 #include "taxonomy/TGRTTagging.h"
 #include "taxonomy/TGRTTaxonomy.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <span>
 #include <string>

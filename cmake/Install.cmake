@@ -2,22 +2,20 @@
 # tool with its manual page and completions; resources and documents.
 include(CMakePackageConfigHelpers)
 
-# Headers include each other by paths from src/, which are too common to be found by everybody who has a
-# "platform/Error.h" of his own: installed they say <qvcontenttagging/platform/Error.h>.
+# Headers include each other by paths from src/. Installed they lie in one folder, <qvcontenttagging/Error.h>, so that
+# no host is touched when a file moves to another room.
 list(TRANSFORM QVCT_PUBLIC_HEADERS PREPEND "${PROJECT_SOURCE_DIR}/src/" OUTPUT_VARIABLE headers)
 list(TRANSFORM QVCT_PUBLIC_DATABASE_HEADERS PREPEND "${PROJECT_SOURCE_DIR}/" OUTPUT_VARIABLE database_headers)
 foreach(header IN LISTS headers database_headers)
-  cmake_path(GET header PARENT_PATH folder)
-  cmake_path(GET folder FILENAME folder)
   cmake_path(GET header FILENAME name)
-  set(installed "${PROJECT_BINARY_DIR}/include/qvcontenttagging/${folder}/${name}")
+  set(installed "${PROJECT_BINARY_DIR}/include/qvcontenttagging/${name}")
   add_custom_command(OUTPUT "${installed}"
     COMMAND ${CMAKE_COMMAND} -DINPUT=${header} -DOUTPUT=${installed}
             -P "${PROJECT_SOURCE_DIR}/cmake/InstalledHeader.cmake"
     DEPENDS "${header}" "${PROJECT_SOURCE_DIR}/cmake/InstalledHeader.cmake" VERBATIM
-    COMMENT "Header ${folder}/${name} as it is installed")
+    COMMENT "Header ${name} as it is installed")
   list(APPEND installed_headers "${installed}")
-  install(FILES "${installed}" DESTINATION "${CMAKE_INSTALL_INCLUDEDIR}/qvcontenttagging/${folder}")
+  install(FILES "${installed}" DESTINATION "${CMAKE_INSTALL_INCLUDEDIR}/qvcontenttagging")
 endforeach()
 add_custom_target(qvct_installed_headers ALL DEPENDS ${installed_headers})
 

@@ -1,26 +1,26 @@
-# What a host may include, and so what the shared libraries export; every other symbol is hidden. Installed below
-# include/qvcontenttagging with the folders kept.
+# What a host may include, and so what the shared libraries export; every other symbol is hidden. Installed in
+# include/qvcontenttagging, without their folders.
 set(QVCT_PUBLIC_HEADERS
-  platform/CountedSet.h
-  platform/EditLock.h
-  platform/Error.h
-  platform/Export.h
-  platform/FileStamp.h
-  platform/Log.h
-  platform/Object.h
-  platform/ObjectSet.h
-  platform/PropertyList.h
-  platform/PropertyListFile.h
-  platform/QVContentTaggingTypes.h
-  platform/RegularExpression.h
-  platform/ResourceBundle.h
-  platform/TaggingTypes.h
-  platform/Url.h
-  platform/UserDefaults.h
-  platform/Version.h
+  platform/base/CountedSet.h
+  platform/base/Error.h
+  platform/base/Export.h
+  platform/base/Log.h
+  platform/base/Object.h
+  platform/base/ObjectSet.h
+  platform/base/Version.h
+  platform/text/RegularExpression.h
+  platform/text/Url.h
+  platform/files/EditLock.h
+  platform/files/FileStamp.h
+  platform/files/ResourceBundle.h
+  platform/data/PropertyList.h
+  platform/data/PropertyListFile.h
+  platform/data/UserDefaults.h
+  media/loopfile/RecordKeys.h
   taxonomy/QVTagIdentifierUtility.h
-  taxonomy/TagNormalization.h
   taxonomy/TaggingSetAdditions.h
+  taxonomy/TaggingTypes.h
+  taxonomy/TagNormalization.h
   taxonomy/TGRTCategory.h
   taxonomy/TGRTLegacyTaxonomyMapping.h
   taxonomy/TGRTLevel.h
@@ -39,6 +39,7 @@ set(QVCT_PUBLIC_HEADERS
   formats/ContentWriters.h
   formats/LinkRule.h
   formats/QVContentEditorFileUtilities.h
+  formats/QVContentTaggingTypes.h
   formats/TGRTBaseMetaDataReader.h
   formats/TGRTContentNodeTypeValidator.h
   formats/TGRTFileNode.h
@@ -46,14 +47,14 @@ set(QVCT_PUBLIC_HEADERS
   formats/TGRTMetaDataReaderFactory.h
   formats/TGRTMetaDataWriterFactory.h
   formats/TGRTPackage.h
-  autotagging/QVCTAutoTaggingService.h
-  autotagging/QVCTKeywordExtractor.h
-  autotagging/QVCTXMLDocument.h
-  autotagging/QVCTXMLRulesTaggingService.h
-  autotagging/QVSKXMLNode.h
+  autotagging/keywords/QVCTKeywordExtractor.h
+  autotagging/xml/QVCTXMLDocument.h
+  autotagging/xml/QVSKXMLNode.h
+  autotagging/services/QVCTAutoTaggingService.h
+  autotagging/services/QVCTXMLRulesTaggingService.h
+  autotagging/services/TagDictionary.h
+  autotagging/services/TaggingServiceNames.h
   autotagging/QVTaggingAggregator.h
-  autotagging/TagDictionary.h
-  autotagging/TaggingServiceNames.h
   indexing/QVContentTaggingIndexableContentObject.h
   indexing/TGRTIndexableContentObject.h)
 

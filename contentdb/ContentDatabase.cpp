@@ -1,10 +1,12 @@
 #include "contentdb/ContentDatabase.h"
 
-#include "contentdb/Reading.h"
-#include "contentdb/RunLock.h"
-#include "contentdb/Search.h"
-#include "contentdb/Terms.h"
-#include "platform/Text.h"
+#include "contentdb/query/Search.h"
+#include "contentdb/query/SimilarItems.h"
+#include "contentdb/store/Reading.h"
+#include "contentdb/store/RunLock.h"
+#include "contentdb/store/StoreCheck.h"
+#include "contentdb/terms/Terms.h"
+#include "platform/text/Text.h"
 #include "taxonomy/TGRTTaxonomy.h"
 
 #include <algorithm>
@@ -129,7 +131,7 @@ bool ContentDatabase::check(Error* error) {
     return implementation_
         ->read(error,
                [this] {
-                   implementation_->store.checkAll();
+                   checkStore(implementation_->store);
                    return true;
                })
         .has_value();

@@ -3,8 +3,8 @@
 #include "contentdb/Indexer.h"
 #include "contentdb/Query.h"
 #include "contentdb/SearchResults.h"
-#include "platform/Error.h"
-#include "platform/Export.h"
+#include "platform/base/Error.h"
+#include "platform/base/Export.h"
 
 #include <cstddef>
 #include <cstdint>

@@ -1,8 +1,8 @@
 #pragma once
 
-#include "autotagging/TaggingServiceNames.h"
+#include "autotagging/services/TaggingServiceNames.h"
 #include "contentdb/IndexedItem.h"
-#include "platform/Export.h"
+#include "platform/base/Export.h"
 
 #include <cstdint>
 #include <memory>

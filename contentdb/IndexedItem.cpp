@@ -1,6 +1,6 @@
 #include "contentdb/IndexedItem.h"
 
-#include "platform/Text.h"
+#include "platform/text/Text.h"
 
 namespace qvct::contentdb {
 

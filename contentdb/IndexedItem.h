@@ -1,7 +1,7 @@
 #pragma once
 
-#include "platform/Error.h"
-#include "platform/Export.h"
+#include "platform/base/Error.h"
+#include "platform/base/Export.h"
 
 #include <cstdint>
 #include <functional>

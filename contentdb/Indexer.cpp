@@ -1,13 +1,16 @@
 #include "contentdb/Indexer.h"
 
-#include "contentdb/DatabaseFiles.h"
-#include "contentdb/IndexRun.h"
-#include "contentdb/RunLock.h"
-#include "contentdb/Salvage.h"
-#include "contentdb/Schema.h"
-#include "platform/FileAccess.h"
-#include "platform/Text.h"
-#include "platform/Url.h"
+#include "contentdb/index/IndexRun.h"
+#include "contentdb/store/DatabaseFiles.h"
+#include "contentdb/store/Merge.h"
+#include "contentdb/store/RunLock.h"
+#include "contentdb/store/Salvage.h"
+#include "contentdb/store/Schema.h"
+#include "contentdb/store/StoreCheck.h"
+#include "platform/files/FileAccess.h"
+#include "platform/files/FileReplacement.h"
+#include "platform/text/Text.h"
+#include "platform/text/Url.h"
 
 #include <thread>
 
@@ -34,7 +37,10 @@ IndexProgress runOnce(const IndexOptions& options, const std::vector<std::string
                        {options.workers != 0 ? options.workers : processors, options.timeLimitPerItem});
     const auto connection = openDatabase(options.database, Access::write);
     connection->checkPages();
-    if (options.check) ContentStore(*connection).checkAll();
+    if (options.check) {
+        ContentStore store(*connection);
+        checkStore(store);
+    }
     IndexRun run(options, *connection, workers);
     bool isInOrder = true;
     for (const std::string& folder : folders) isInOrder = isInOrder && run.walk(folder);
@@ -110,6 +116,24 @@ std::optional<IndexProgress> indexLibrary(const IndexOptions& wanted, const Desc
         }
         return runOnce(options, folders, factory);
     });
+}
+
+bool mergeDatabases(const std::vector<std::string>& databases, const std::string& name, Error* error) {
+    const std::string target = pathOfDatabase(name);
+    const auto lock = RunLock::acquire(target, error);
+    if (!lock) return false;
+    if (fileExists(target) || isRebuilt(target))
+        return fail(error, kErrorInvalidArgument, fmt::format("{}: exists already", printable(target)));
+    // Built beside its place, so that a merge that was interrupted leaves no half database there.
+    const std::string unfinished = unfinishedPath(target);
+    removeDatabase(unfinished);
+    const bool isDone = guarded(error, false, [&] {
+        mergeInto(unfinished, databases);
+        return true;
+    });
+    if (isDone && renameFlushed(unfinished, target, error)) return true;
+    removeDatabase(unfinished);
+    return false;
 }
 
 }  // namespace qvct::contentdb

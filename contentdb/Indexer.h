@@ -2,8 +2,8 @@
 
 #include "contentdb/IndexedItem.h"
 #include "formats/ContentWalk.h"
-#include "platform/Error.h"
-#include "platform/Export.h"
+#include "platform/base/Error.h"
+#include "platform/base/Export.h"
 
 #include <chrono>
 #include <cstdint>

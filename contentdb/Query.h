@@ -1,8 +1,8 @@
 #pragma once
 
 #include "contentdb/IndexedItem.h"
-#include "platform/Export.h"
-#include "platform/RegularExpression.h"
+#include "platform/base/Export.h"
+#include "platform/text/RegularExpression.h"
 
 #include <cstddef>
 #include <memory>

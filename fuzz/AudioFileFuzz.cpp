@@ -1,8 +1,8 @@
 // Any bytes as an audio file: decoding and the search for onsets end, within memory that the file cannot
 // choose.
 #include "ExactInput.h"
-#include "platform/AudioDecoder.h"
-#include "platform/OnsetDetector.h"
+#include "listening/onsets/OnsetDetector.h"
+#include "media/audio/AudioDecoder.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
     const qvct::fuzz::ExactInput input(data, size);

@@ -1,7 +1,7 @@
 // Whatever the bytes: no crash, and what can be read survives being written and read in both encodings.
 
 #include "ExactInput.h"
-#include "platform/PropertyListFile.h"
+#include "platform/data/PropertyListFile.h"
 
 using namespace qvct;
 

@@ -1,7 +1,7 @@
 // Whatever the label: no crash, and a tag written with its marker is read as the same kind of tag.
 
 #include "ExactInput.h"
-#include "platform/Text.h"
+#include "platform/text/Text.h"
 #include "taxonomy/TGRTCategory.h"
 #include "taxonomy/TGRTTag.h"
 

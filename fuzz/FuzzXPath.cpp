@@ -2,8 +2,8 @@
 // that the XML library finds.
 
 #include "ExactInput.h"
-#include "autotagging/QVCTXMLDocument.h"
-#include "platform/Log.h"
+#include "autotagging/xml/QVCTXMLDocument.h"
+#include "platform/base/Log.h"
 
 using namespace qvct;
 

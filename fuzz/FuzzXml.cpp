@@ -1,11 +1,11 @@
 // Whatever the text: XML and its JSON without a crash, and the JSON only of text that has one root element.
 
 #include "ExactInput.h"
-#include "autotagging/QVCTXMLDocument.h"
-#include "autotagging/QVCTXMLParser.h"
-#include "platform/Decompression.h"
-#include "platform/Log.h"
-#include "platform/Text.h"
+#include "autotagging/xml/QVCTXMLDocument.h"
+#include "autotagging/xml/QVCTXMLParser.h"
+#include "platform/base/Log.h"
+#include "platform/files/Decompression.h"
+#include "platform/text/Text.h"
 
 using namespace qvct;
 

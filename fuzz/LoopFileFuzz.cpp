@@ -3,10 +3,10 @@
 //   - a rewrite keeps every byte that is not the record's, and the record comes back;
 //   - a second rewrite is accepted, and without a record the file is as if it had never had one.
 // Built once per container; the input is turned to that container, so that no time goes into others.
-#include "platform/LCFileParser.h"
-#include "platform/LCFileWriter.h"
-#include "platform/PropertyListFile.h"
-#include "platform/loopfile/Container.h"
+#include "media/loopfile/LCFileParser.h"
+#include "media/loopfile/LCFileWriter.h"
+#include "media/loopfile/containers/Container.h"
+#include "platform/data/PropertyListFile.h"
 
 #include <cstdio>
 #include <cstdlib>

@@ -1,7 +1,7 @@
 // Any bytes as a MIDI file: times ascend and are finite, notes lie within their track, levels are in [0, 1].
 #include "ExactInput.h"
-#include "analysis/QVCTMidiAnalysis.h"
-#include "platform/MidiSequence.h"
+#include "listening/rhythm/QVCTMidiAnalysis.h"
+#include "media/midi/MidiSequence.h"
 
 #include <cmath>
 

@@ -1,7 +1,7 @@
 // Any bytes as blocks of samples, at any rate and channel count: onsets ascend and lie within the signal, and
 // the size of the blocks does not matter.
 #include "ExactInput.h"
-#include "platform/OnsetDetector.h"
+#include "listening/onsets/OnsetDetector.h"
 
 #include <algorithm>
 #include <cstring>

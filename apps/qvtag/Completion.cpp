@@ -1,5 +1,5 @@
 #include "CommandLine.h"
-#include "platform/Text.h"
+#include "platform/text/Text.h"
 
 #include <algorithm>
 #include <functional>

@@ -1,6 +1,6 @@
 #include "CommandLine.h"
-#include "platform/Text.h"
-#include "platform/Version.h"
+#include "platform/base/Version.h"
+#include "platform/text/Text.h"
 
 #include <fmt/format.h>
 

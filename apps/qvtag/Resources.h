@@ -1,7 +1,7 @@
 #pragma once
 
-#include "platform/Error.h"
-#include "platform/PropertyList.h"
+#include "platform/base/Error.h"
+#include "platform/data/PropertyList.h"
 
 #include <optional>
 #include <string>

@@ -1,11 +1,11 @@
 #include "RhythmMeasurement.h"
 
-#include "analysis/LoopRhythm.h"
-#include "platform/AudioDecoder.h"
-#include "platform/LCFileParser.h"
-#include "platform/MidiSequence.h"
-#include "platform/OnsetDetector.h"
-#include "platform/Text.h"
+#include "listening/onsets/OnsetDetector.h"
+#include "listening/rhythm/LoopRhythm.h"
+#include "media/audio/AudioDecoder.h"
+#include "media/loopfile/LCFileParser.h"
+#include "media/midi/MidiSequence.h"
+#include "platform/text/Text.h"
 
 #include <algorithm>
 #include <cmath>

@@ -1,9 +1,9 @@
 #pragma once
 
-#include "RhythmPlot.h"
-#include "analysis/QVCTMidiAnalysis.h"
-#include "platform/Error.h"
-#include "platform/Url.h"
+#include "listening/rhythm/QVCTMidiAnalysis.h"
+#include "output/RhythmPlot.h"
+#include "platform/base/Error.h"
+#include "platform/text/Url.h"
 
 #include <cstdint>
 #include <optional>

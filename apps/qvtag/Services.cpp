@@ -1,7 +1,7 @@
 #include "Services.h"
 
-#include "autotagging/TaggingServiceNames.h"
-#include "platform/Text.h"
+#include "autotagging/services/TaggingServiceNames.h"
+#include "platform/text/Text.h"
 
 #include <algorithm>
 

@@ -1,6 +1,6 @@
 #include "SimilarTags.h"
 
-#include "platform/Text.h"
+#include "platform/text/Text.h"
 #include "taxonomy/TGRTTaxonomySearching.h"
 
 #include <algorithm>

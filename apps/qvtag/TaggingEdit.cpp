@@ -2,7 +2,7 @@
 
 #include "SimilarTags.h"
 #include "ToolContext.h"
-#include "platform/Text.h"
+#include "platform/text/Text.h"
 #include "taxonomy/TagNormalization.h"
 
 #include <algorithm>

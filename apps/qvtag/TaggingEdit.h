@@ -1,6 +1,6 @@
 #pragma once
 
-#include "platform/ObjectSet.h"
+#include "platform/base/ObjectSet.h"
 #include "taxonomy/TGRTTagging.h"
 #include "taxonomy/TGRTTaxonomy.h"
 

@@ -1,10 +1,10 @@
 #include "ToolContext.h"
 
 #include "Resources.h"
-#include "StandardStreams.h"
 #include "formats/ContentWalk.h"
-#include "platform/Log.h"
-#include "platform/Text.h"
+#include "output/StandardStreams.h"
+#include "platform/base/Log.h"
+#include "platform/text/Text.h"
 
 #include <algorithm>
 #include <memory>

@@ -1,8 +1,8 @@
 #pragma once
 
-#include "Output.h"
 #include "formats/LinkRule.h"
-#include "platform/Url.h"
+#include "output/Output.h"
+#include "platform/text/Url.h"
 
 #include <cstddef>
 #include <memory>

@@ -1,9 +1,9 @@
 #include "Verification.h"
 
+#include "formats/QVContentTaggingTypes.h"
 #include "formats/TGRTFileNode.h"
 #include "formats/preset/PresetRecord.h"
-#include "platform/FileAccess.h"
-#include "platform/QVContentTaggingTypes.h"
+#include "platform/files/FileAccess.h"
 
 #include <fmt/format.h>
 

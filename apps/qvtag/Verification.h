@@ -1,10 +1,10 @@
 #pragma once
 
-#include "Output.h"
+#include "media/loopfile/LCFingerprint.h"
 #include "metadata/TGRTMetaData.h"
-#include "platform/Error.h"
-#include "platform/LCFileWriter.h"
-#include "platform/Url.h"
+#include "output/Output.h"
+#include "platform/base/Error.h"
+#include "platform/text/Url.h"
 
 #include <optional>
 #include <string>

@@ -1,8 +1,8 @@
-#include "Commands.h"
-#include "StandardStreams.h"
-#include "platform/HardLimit.h"
-#include "platform/UnfinishedFile.h"
-#include "platform/Version.h"
+#include "commands/Commands.h"
+#include "output/StandardStreams.h"
+#include "platform/base/HardLimit.h"
+#include "platform/base/Version.h"
+#include "platform/files/UnfinishedFile.h"
 
 #include <algorithm>
 #include <exception>

@@ -4,15 +4,15 @@
 
 #include <iostream>
 
-#include <qvcontenttagging/autotagging/QVTaggingAggregator.h>
-#include <qvcontenttagging/contentdb/ContentDatabase.h>
-#include <qvcontenttagging/contentdb/ContentDescriber.h>
-#include <qvcontenttagging/contentdb/Indexer.h>
-#include <qvcontenttagging/formats/ContentWalk.h>
-#include <qvcontenttagging/formats/TGRTMetaDataReaderFactory.h>
-#include <qvcontenttagging/formats/TGRTMetaDataWriterFactory.h>
-#include <qvcontenttagging/platform/Version.h>
-#include <qvcontenttagging/taxonomy/TGRTTaxonomy.h>
+#include <qvcontenttagging/ContentDatabase.h>
+#include <qvcontenttagging/ContentDescriber.h>
+#include <qvcontenttagging/ContentWalk.h>
+#include <qvcontenttagging/Indexer.h>
+#include <qvcontenttagging/QVTaggingAggregator.h>
+#include <qvcontenttagging/TGRTMetaDataReaderFactory.h>
+#include <qvcontenttagging/TGRTMetaDataWriterFactory.h>
+#include <qvcontenttagging/TGRTTaxonomy.h>
+#include <qvcontenttagging/Version.h>
 
 namespace {
 

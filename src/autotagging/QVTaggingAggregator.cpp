@@ -1,16 +1,16 @@
 #include "autotagging/QVTaggingAggregator.h"
 
-#include "analysis/QVCTRhythmicTaggingService.h"
-#include "autotagging/QVCTContentTypeTaggingService.h"
-#include "autotagging/QVCTFilenameKeywordExtractorTaggingService.h"
-#include "autotagging/QVCTSoftwareInstrumentTaggingService.h"
-#include "autotagging/QVCTTranslateTagsTaggingService.h"
-#include "autotagging/QVCTUserGeneratedTaggingService.h"
-#include "autotagging/QVCTXMLDocument.h"
-#include "autotagging/QVCTXMLRulesTaggingService.h"
+#include "autotagging/services/QVCTContentTypeTaggingService.h"
+#include "autotagging/services/QVCTFilenameKeywordExtractorTaggingService.h"
+#include "autotagging/services/QVCTRhythmicTaggingService.h"
+#include "autotagging/services/QVCTSoftwareInstrumentTaggingService.h"
+#include "autotagging/services/QVCTTranslateTagsTaggingService.h"
+#include "autotagging/services/QVCTUserGeneratedTaggingService.h"
+#include "autotagging/services/QVCTXMLRulesTaggingService.h"
+#include "autotagging/xml/QVCTXMLDocument.h"
 #include "formats/QVContentEditorFileUtilities.h"
 #include "formats/TGRTFileNode.h"
-#include "platform/LCFileParser.h"
+#include "media/loopfile/LCFileParser.h"
 
 #include <string>
 #include <utility>

@@ -1,10 +1,10 @@
 #pragma once
 
-#include "autotagging/QVCTAutoTaggingService.h"
-#include "platform/Export.h"
-#include "platform/ObjectSet.h"
-#include "platform/PropertyList.h"
-#include "platform/Url.h"
+#include "autotagging/services/QVCTAutoTaggingService.h"
+#include "platform/base/Export.h"
+#include "platform/base/ObjectSet.h"
+#include "platform/data/PropertyList.h"
+#include "platform/text/Url.h"
 #include "taxonomy/TGRTTagging.h"
 #include "taxonomy/TGRTTaxonomy.h"
 

@@ -1,8 +1,8 @@
 #include "formats/ContentWalk.h"
 
+#include "formats/QVContentTaggingTypes.h"
 #include "formats/audiofile/TGRTAudioFileTypeValidator.h"
-#include "platform/QVContentTaggingTypes.h"
-#include "platform/Text.h"
+#include "platform/text/Text.h"
 
 #include <algorithm>
 #include <cerrno>

@@ -1,9 +1,9 @@
 #pragma once
 
 #include "formats/LinkRule.h"
-#include "platform/Error.h"
-#include "platform/Export.h"
-#include "platform/Url.h"
+#include "platform/base/Error.h"
+#include "platform/base/Export.h"
+#include "platform/text/Url.h"
 
 #include <functional>
 #include <string>

@@ -2,11 +2,11 @@
 
 #include "metadata/TGRTContentInfo.h"
 #include "metadata/TGRTMetaData.h"
-#include "platform/Error.h"
-#include "platform/Export.h"
-#include "platform/FileStamp.h"
-#include "platform/ObjectSet.h"
-#include "platform/Url.h"
+#include "platform/base/Error.h"
+#include "platform/base/Export.h"
+#include "platform/base/ObjectSet.h"
+#include "platform/files/FileStamp.h"
+#include "platform/text/Url.h"
 #include "taxonomy/TGRTTagging.h"
 
 #include <memory>

@@ -1,7 +1,7 @@
 #include "formats/QVContentEditorFileUtilities.h"
 
-#include "platform/FileAccess.h"
-#include "platform/TaggingTypes.h"
+#include "platform/files/FileAccess.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <algorithm>
 #include <array>

@@ -1,7 +1,7 @@
 #pragma once
 
-#include "platform/Export.h"
-#include "platform/Url.h"
+#include "platform/base/Export.h"
+#include "platform/text/Url.h"
 
 #include <optional>
 

@@ -1,12 +1,12 @@
 #include "formats/StoredRecord.h"
 
 #include "metadata/StoredParts.h"
-#include "platform/EditLock.h"
-#include "platform/FileAccess.h"
-#include "platform/FileReplacement.h"
-#include "platform/PropertyListFile.h"
-#include "platform/TaggingTypes.h"
-#include "platform/Text.h"
+#include "platform/data/PropertyListFile.h"
+#include "platform/files/EditLock.h"
+#include "platform/files/FileAccess.h"
+#include "platform/files/FileReplacement.h"
+#include "platform/text/Text.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <utility>
 

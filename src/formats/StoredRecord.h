@@ -1,8 +1,8 @@
 #pragma once
 
 #include "formats/ContentWriters.h"
-#include "platform/Error.h"
-#include "platform/PropertyList.h"
+#include "platform/base/Error.h"
+#include "platform/data/PropertyList.h"
 
 #include <functional>
 #include <memory>

@@ -1,6 +1,6 @@
 #include "formats/TGRTBaseMetaDataReader.h"
 
-#include "platform/Text.h"
+#include "platform/text/Text.h"
 
 #include <algorithm>
 

@@ -1,7 +1,7 @@
 #pragma once
 
 #include "formats/TGRTMetaDataReader.h"
-#include "platform/Export.h"
+#include "platform/base/Export.h"
 #include "taxonomy/TGRTTaxonomy.h"
 
 #include <memory>

@@ -2,8 +2,8 @@
 
 #include "formats/ContentWriters.h"
 #include "formats/TGRTMetaDataReader.h"
-#include "platform/Export.h"
-#include "platform/Url.h"
+#include "platform/base/Export.h"
+#include "platform/text/Url.h"
 
 #include <memory>
 #include <optional>

@@ -5,7 +5,7 @@
 #include "formats/bundle/TGRTBundleTypeValidators.h"
 #include "formats/preset/TGRTVorthalPresetTypeValidator.h"
 #include "formats/settings/TGRTCstSxvPstTypeValidator.h"
-#include "platform/Text.h"
+#include "platform/text/Text.h"
 
 #include <algorithm>
 #include <array>

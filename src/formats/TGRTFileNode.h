@@ -2,10 +2,10 @@
 
 #include "formats/TGRTContentNodeTypeValidator.h"
 #include "metadata/TGRTMetaData.h"
-#include "platform/Error.h"
-#include "platform/Export.h"
-#include "platform/Object.h"
-#include "platform/Url.h"
+#include "platform/base/Error.h"
+#include "platform/base/Export.h"
+#include "platform/base/Object.h"
+#include "platform/text/Url.h"
 #include "taxonomy/TGRTTaggingCollection.h"
 
 #include <cstdint>

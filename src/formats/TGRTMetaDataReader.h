@@ -2,12 +2,12 @@
 
 #include "metadata/TGRTKeyValue.h"
 #include "metadata/TGRTMetaData.h"
-#include "platform/Error.h"
-#include "platform/Export.h"
-#include "platform/ObjectSet.h"
-#include "platform/TaggingTypes.h"
-#include "platform/Url.h"
+#include "platform/base/Error.h"
+#include "platform/base/Export.h"
+#include "platform/base/ObjectSet.h"
+#include "platform/text/Url.h"
 #include "taxonomy/TGRTTagging.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <cstdint>
 #include <memory>

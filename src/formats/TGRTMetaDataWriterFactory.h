@@ -1,8 +1,8 @@
 #pragma once
 
 #include "formats/ContentWriters.h"
-#include "platform/Export.h"
-#include "platform/Url.h"
+#include "platform/base/Export.h"
+#include "platform/text/Url.h"
 
 #include <memory>
 

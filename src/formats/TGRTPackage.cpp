@@ -1,8 +1,8 @@
 #include "formats/TGRTPackage.h"
 
 #include "formats/TGRTFileNode.h"
-#include "platform/TaggingTypes.h"
 #include "resources/PackDisplayNames.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <algorithm>
 #include <unordered_map>

@@ -1,9 +1,9 @@
 #pragma once
 
 #include "metadata/TGRTMetaData.h"
-#include "platform/Export.h"
-#include "platform/Object.h"
-#include "platform/Url.h"
+#include "platform/base/Export.h"
+#include "platform/base/Object.h"
+#include "platform/text/Url.h"
 
 #include <memory>
 #include <string>

@@ -2,8 +2,8 @@
 
 #include "metadata/TGRTDependencyItem.h"
 #include "metadata/TGRTKeyValue.h"
-#include "platform/Export.h"
-#include "platform/ObjectSet.h"
+#include "platform/base/Export.h"
+#include "platform/base/ObjectSet.h"
 #include "taxonomy/TGRTTagging.h"
 
 #include <cstdint>

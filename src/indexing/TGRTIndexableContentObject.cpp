@@ -2,7 +2,7 @@
 
 #include "formats/QVContentEditorFileUtilities.h"
 #include "formats/TGRTMetaDataReaderFactory.h"
-#include "platform/Text.h"
+#include "platform/text/Text.h"
 #include "taxonomy/TGRTLegacyTaxonomyMapping.h"
 #include "taxonomy/TaggingSetAdditions.h"
 

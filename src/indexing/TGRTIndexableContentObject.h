@@ -2,12 +2,12 @@
 
 #include "indexing/QVContentTaggingIndexableContentObject.h"
 #include "metadata/TGRTMetaData.h"
-#include "platform/Error.h"
-#include "platform/Export.h"
-#include "platform/Object.h"
-#include "platform/TaggingTypes.h"
-#include "platform/Url.h"
+#include "platform/base/Error.h"
+#include "platform/base/Export.h"
+#include "platform/base/Object.h"
+#include "platform/text/Url.h"
 #include "taxonomy/TGRTTaxonomy.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <map>
 #include <memory>

@@ -1,6 +1,6 @@
 #include "metadata/QVCTUUIDGenerator.h"
 
-#include "platform/Url.h"
+#include "platform/text/Url.h"
 
 #include <array>
 

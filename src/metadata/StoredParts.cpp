@@ -1,7 +1,7 @@
 #include "metadata/StoredParts.h"
 
-#include "platform/TaggingTypes.h"
 #include "taxonomy/TGRTTaxonomy.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <algorithm>
 #include <functional>

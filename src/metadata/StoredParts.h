@@ -2,8 +2,8 @@
 
 #include "metadata/TGRTContentInfo.h"
 #include "metadata/TGRTKeyValue.h"
-#include "platform/ObjectSet.h"
-#include "platform/PropertyList.h"
+#include "platform/base/ObjectSet.h"
+#include "platform/data/PropertyList.h"
 #include "taxonomy/TGRTTagging.h"
 
 namespace qvct {

@@ -1,6 +1,6 @@
 #include "metadata/TGRTApplicationInfo.h"
 
-#include "platform/TaggingTypes.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <fmt/format.h>
 

@@ -1,8 +1,8 @@
 #pragma once
 
-#include "platform/Export.h"
-#include "platform/Object.h"
-#include "platform/PropertyList.h"
+#include "platform/base/Export.h"
+#include "platform/base/Object.h"
+#include "platform/data/PropertyList.h"
 
 #include <memory>
 #include <optional>

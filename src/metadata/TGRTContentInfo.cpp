@@ -1,6 +1,6 @@
 #include "metadata/TGRTContentInfo.h"
 
-#include "platform/TaggingTypes.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <fmt/format.h>
 

@@ -2,10 +2,10 @@
 
 #include "metadata/TGRTApplicationInfo.h"
 #include "metadata/TGRTDependencyItem.h"
-#include "platform/Export.h"
-#include "platform/Object.h"
-#include "platform/ObjectSet.h"
-#include "platform/PropertyList.h"
+#include "platform/base/Export.h"
+#include "platform/base/Object.h"
+#include "platform/base/ObjectSet.h"
+#include "platform/data/PropertyList.h"
 
 #include <memory>
 #include <set>

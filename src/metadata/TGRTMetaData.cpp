@@ -1,10 +1,10 @@
 #include "metadata/TGRTMetaData.h"
 
 #include "metadata/StoredParts.h"
-#include "platform/FileAccess.h"
-#include "platform/PropertyListFile.h"
-#include "platform/TaggingTypes.h"
+#include "platform/data/PropertyListFile.h"
+#include "platform/files/FileAccess.h"
 #include "taxonomy/TGRTTaxonomy.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <algorithm>
 #include <array>

@@ -2,12 +2,12 @@
 
 #include "metadata/TGRTContentInfo.h"
 #include "metadata/TGRTKeyValue.h"
-#include "platform/Error.h"
-#include "platform/Export.h"
-#include "platform/Object.h"
-#include "platform/ObjectSet.h"
-#include "platform/PropertyList.h"
-#include "platform/Url.h"
+#include "platform/base/Error.h"
+#include "platform/base/Export.h"
+#include "platform/base/Object.h"
+#include "platform/base/ObjectSet.h"
+#include "platform/data/PropertyList.h"
+#include "platform/text/Url.h"
 #include "taxonomy/TGRTTagging.h"
 
 #include <cstdint>

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "platform/Object.h"
+#include "platform/base/Object.h"
 
 #include <cstdint>
 #include <string>

@@ -1,8 +1,8 @@
 #include "resources/PackDisplayNames.h"
 
-#include "platform/FileAccess.h"
-#include "platform/ResourceBundle.h"
-#include "platform/Text.h"
+#include "platform/files/FileAccess.h"
+#include "platform/files/ResourceBundle.h"
+#include "platform/text/Text.h"
 #include "resources/QVCTCompiledResources.h"
 
 #include <optional>

@@ -1,8 +1,8 @@
 #include "resources/QVCTCompiledResources.h"
 
-#include "platform/Log.h"
-#include "platform/PropertyListFile.h"
-#include "platform/Text.h"
+#include "platform/base/Log.h"
+#include "platform/data/PropertyListFile.h"
+#include "platform/text/Text.h"
 #include "resources/EmbeddedFiles.h"
 
 #include <utility>

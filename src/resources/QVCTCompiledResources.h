@@ -1,6 +1,6 @@
 #pragma once
 
-#include "platform/PropertyList.h"
+#include "platform/data/PropertyList.h"
 
 #include <cstdint>
 #include <optional>

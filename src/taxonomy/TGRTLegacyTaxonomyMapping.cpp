@@ -1,9 +1,9 @@
 #include "taxonomy/TGRTLegacyTaxonomyMapping.h"
 
-#include "platform/FileAccess.h"
-#include "platform/Log.h"
-#include "platform/ResourceBundle.h"
-#include "platform/Text.h"
+#include "platform/base/Log.h"
+#include "platform/files/FileAccess.h"
+#include "platform/files/ResourceBundle.h"
+#include "platform/text/Text.h"
 #include "resources/QVCTCompiledResources.h"
 #include "taxonomy/LegacyMappingTable.h"
 #include "taxonomy/LegacyTagLookup.h"

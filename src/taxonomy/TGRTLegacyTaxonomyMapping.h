@@ -1,8 +1,8 @@
 #pragma once
 
-#include "platform/Export.h"
-#include "platform/ObjectSet.h"
-#include "platform/Url.h"
+#include "platform/base/Export.h"
+#include "platform/base/ObjectSet.h"
+#include "platform/text/Url.h"
 #include "taxonomy/TGRTTagging.h"
 #include "taxonomy/TGRTTaxonomy.h"
 

@@ -1,7 +1,7 @@
 #pragma once
 
-#include "platform/Export.h"
-#include "platform/Object.h"
+#include "platform/base/Export.h"
+#include "platform/base/Object.h"
 
 #include <memory>
 #include <string>

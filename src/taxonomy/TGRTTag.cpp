@@ -1,8 +1,8 @@
 #include "taxonomy/TGRTTag.h"
 
-#include "platform/TaggingTypes.h"
-#include "platform/Text.h"
+#include "platform/text/Text.h"
 #include "taxonomy/TGRTCategory.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <algorithm>
 #include <utility>

@@ -1,8 +1,8 @@
 #include "taxonomy/TGRTTagging.h"
 
-#include "platform/DecimalFormatter.h"
-#include "platform/TaggingTypes.h"
+#include "platform/text/DecimalFormatter.h"
 #include "taxonomy/TGRTTaxonomy.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <algorithm>
 #include <array>

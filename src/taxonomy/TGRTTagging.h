@@ -1,9 +1,9 @@
 #pragma once
 
-#include "platform/Export.h"
-#include "platform/Object.h"
-#include "platform/ObjectSet.h"
-#include "platform/PropertyList.h"
+#include "platform/base/Export.h"
+#include "platform/base/Object.h"
+#include "platform/base/ObjectSet.h"
+#include "platform/data/PropertyList.h"
 #include "taxonomy/TGRTLevel.h"
 #include "taxonomy/TGRTTag.h"
 

@@ -1,13 +1,14 @@
 #include "taxonomy/TGRTTaxonomy.h"
 
-#include "platform/EvictableCache.h"
-#include "platform/PropertyListFile.h"
-#include "platform/ResourceBundle.h"
-#include "platform/TaggingTypes.h"
-#include "platform/Text.h"
+#include "platform/base/EvictableCache.h"
+#include "platform/data/PropertyListFile.h"
+#include "platform/files/ResourceBundle.h"
+#include "platform/text/Text.h"
 #include "resources/QVCTCompiledResources.h"
 #include "taxonomy/LegacyMappingTable.h"
 #include "taxonomy/TGRTTagging.h"
+#include "taxonomy/TaggingTypes.h"
+#include "taxonomy/TaxonomyLocalization.h"
 
 #include <algorithm>
 #include <array>
@@ -343,6 +344,14 @@ std::string TGRTTaxonomy::description() const {
     std::string lines = "\n";
     for (const auto& category : categories_) lines += category->description() + "\n";
     return fmt::format("<TGRTTaxonomy {}> categories: {}", static_cast<const void*>(this), lines);
+}
+
+TGRTTaxonomy::Localization TGRTTaxonomy::localizationDictionary() const {
+    return localizationOf(*this);
+}
+
+std::string TGRTTaxonomy::localizedStrings() const {
+    return stringsTableOf(localizationDictionary());
 }
 
 }  // namespace qvct

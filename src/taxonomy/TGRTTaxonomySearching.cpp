@@ -1,6 +1,6 @@
 #include "taxonomy/TGRTTaxonomySearching.h"
 
-#include "platform/Text.h"
+#include "platform/text/Text.h"
 
 namespace qvct {
 

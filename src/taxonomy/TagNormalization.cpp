@@ -1,7 +1,7 @@
 #include "taxonomy/TagNormalization.h"
 
-#include "platform/RegularExpression.h"
-#include "platform/Text.h"
+#include "platform/text/RegularExpression.h"
+#include "platform/text/Text.h"
 
 #include <algorithm>
 

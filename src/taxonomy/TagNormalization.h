@@ -1,6 +1,6 @@
 #pragma once
 
-#include "platform/Export.h"
+#include "platform/base/Export.h"
 
 #include <cstdint>
 #include <optional>

@@ -1,7 +1,7 @@
 #pragma once
 
-#include "platform/Export.h"
-#include "platform/ObjectSet.h"
+#include "platform/base/Export.h"
+#include "platform/base/ObjectSet.h"
 #include "taxonomy/TGRTTagging.h"
 
 #include <memory>

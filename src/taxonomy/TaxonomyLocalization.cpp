@@ -1,8 +1,9 @@
-#include "platform/Text.h"
-#include "platform/UserDefaults.h"
+#include "taxonomy/TaxonomyLocalization.h"
+
+#include "platform/data/UserDefaults.h"
+#include "platform/text/Text.h"
 #include "resources/PackDisplayNames.h"
 #include "taxonomy/QVTagIdentifierUtility.h"
-#include "taxonomy/TGRTTaxonomy.h"
 
 #include <algorithm>
 #include <array>
@@ -12,8 +13,6 @@
 
 namespace qvct {
 namespace {
-
-using Localization = TGRTTaxonomy::Localization;
 
 constexpr std::array<std::pair<const char*, const char*>, 12> kKeyNames = {{{"C", "Key: C"},
                                                                             {"CSharp", "Key: C#"},
@@ -64,19 +63,14 @@ std::string quoted(std::string text) {
 
 }  // namespace
 
-std::string QVTagIdentifierUtility::localizationKeyForJingJangTagLabel(std::string_view label,
-                                                                       bool lowerValue) {
-    return fmt::format("{}_{}", label, lowerValue ? "lowerPole" : "upperPole");
-}
-
-Localization TGRTTaxonomy::localizationDictionary() const {
+Localization localizationOf(const TGRTTaxonomy& taxonomy) {
     const bool reversed = UserDefaults::boolForKey("fakeLocalization");
     Localization strings;
-    std::vector<TagPointer> tags = allTags();
+    std::vector<TagPointer> tags = taxonomy.allTags();
     std::stable_sort(tags.begin(), tags.end(),
                      [](const auto& a, const auto& b) { return a->label() < b->label(); });
     for (const auto& tag : tags) addTag(strings, *tag, reversed);
-    for (const auto& category : categories_) {
+    for (const auto& category : taxonomy.categories()) {
         strings[category->identifier()] = shown(category->identifier(), reversed);
     }
     for (const auto& [identifier, name] : packDisplayNames()) replaceIfPresent(strings, identifier, name);
@@ -87,10 +81,9 @@ Localization TGRTTaxonomy::localizationDictionary() const {
     return strings;
 }
 
-std::string TGRTTaxonomy::localizedStrings() const {
+std::string stringsTableOf(const Localization& strings) {
     std::string table;
-    for (const auto& [key, value] : localizationDictionary())
-        table += fmt::format("{} = {};\n\n", quoted(key), quoted(value));
+    for (const auto& [key, value] : strings) table += fmt::format("{} = {};\n\n", quoted(key), quoted(value));
     return table;
 }
 

@@ -1,7 +1,7 @@
-#include "autotagging/QVCTJavaScriptUtilities.h"
-#include "autotagging/QVCTXMLDocument.h"
-#include "autotagging/RegularExpressionGuard.h"
-#include "platform/Json.h"
+#include "autotagging/scripts/QVCTJavaScriptUtilities.h"
+#include "autotagging/scripts/RegularExpressionGuard.h"
+#include "autotagging/xml/QVCTXMLDocument.h"
+#include "platform/data/Json.h"
 #include "support/CapturedLog.h"
 
 #include <cstdio>

@@ -1,8 +1,8 @@
-#include "autotagging/QVCTXMLDocument.h"
-#include "autotagging/QVCTXMLParser.h"
-#include "autotagging/XPathExpression.h"
-#include "platform/Json.h"
-#include "platform/Text.h"
+#include "autotagging/xml/QVCTXMLDocument.h"
+#include "autotagging/xml/QVCTXMLParser.h"
+#include "autotagging/xml/XPathExpression.h"
+#include "platform/data/Json.h"
+#include "platform/text/Text.h"
 #include "support/CapturedLog.h"
 #include "support/TemporaryFolder.h"
 

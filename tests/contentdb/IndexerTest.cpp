@@ -1,7 +1,7 @@
 #include "Library.h"
-#include "contentdb/RunLock.h"
-#include "platform/FileAccess.h"
-#include "platform/Url.h"
+#include "contentdb/store/RunLock.h"
+#include "platform/files/FileAccess.h"
+#include "platform/text/Url.h"
 #include "support/RunTool.h"
 
 #include <chrono>

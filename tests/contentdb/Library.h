@@ -1,8 +1,8 @@
 #pragma once
 
 #include "contentdb/ContentDatabase.h"
-#include "contentdb/StoreWriter.h"
-#include "contentdb/Terms.h"
+#include "contentdb/store/StoreWriter.h"
+#include "contentdb/terms/Terms.h"
 #include "support/ItemGenerator.h"
 #include "support/TemporaryFolder.h"
 

@@ -2,7 +2,7 @@
 // random, indexed again and again: whatever happened, the database then says what a new one would say.
 
 #include "Library.h"
-#include "platform/Url.h"
+#include "platform/text/Url.h"
 #include "support/RunTool.h"
 
 #include <algorithm>

@@ -1,5 +1,5 @@
 #include "Library.h"
-#include "contentdb/IdSet.h"
+#include "contentdb/store/IdSet.h"
 
 #include <filesystem>
 #include <fstream>

@@ -5,9 +5,9 @@
 #include "contentdb/ContentDatabase.h"
 #include "formats/FormatsSupport.h"
 #include "formats/TGRTFileNode.h"
-#include "platform/EditLock.h"
-#include "platform/LCFileWriter.h"
-#include "platform/UnfinishedFile.h"
+#include "media/loopfile/LCFileWriter.h"
+#include "platform/files/EditLock.h"
+#include "platform/files/UnfinishedFile.h"
 #include "support/AudioFixtures.h"
 #include "support/RunTool.h"
 

@@ -1,6 +1,6 @@
 #include "demo/Library.h"
 #include "demo/Patches.h"
-#include "platform/PropertyListFile.h"
+#include "platform/data/PropertyListFile.h"
 #include "support/Places.h"
 #include "support/TemporaryFolder.h"
 

@@ -1,8 +1,8 @@
 #include "FormatsSupport.h"
 #include "formats/TGRTMetaDataReaderFactory.h"
 #include "formats/audiofile/TGRTAudioFileTypeValidator.h"
-#include "platform/LCFileParser.h"
-#include "platform/LCFileWriter.h"
+#include "media/loopfile/LCFileParser.h"
+#include "media/loopfile/LCFileWriter.h"
 #include "support/AudioFixtures.h"
 
 #include <algorithm>

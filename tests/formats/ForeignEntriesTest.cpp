@@ -2,9 +2,9 @@
 
 #include "FormatsSupport.h"
 #include "formats/TGRTFileNode.h"
+#include "media/loopfile/LCFileParser.h"
+#include "media/loopfile/LCFileWriter.h"
 #include "metadata/StoredParts.h"
-#include "platform/LCFileParser.h"
-#include "platform/LCFileWriter.h"
 #include "support/AudioFixtures.h"
 
 #include <map>

@@ -1,12 +1,12 @@
 #pragma once
 
-#include "platform/ObjectSet.h"
-#include "platform/PropertyListFile.h"
-#include "platform/TaggingTypes.h"
-#include "platform/Url.h"
+#include "platform/base/ObjectSet.h"
+#include "platform/data/PropertyListFile.h"
+#include "platform/text/Url.h"
 #include "support/TemporaryFolder.h"
 #include "taxonomy/TGRTTagging.h"
 #include "taxonomy/TGRTTaxonomy.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <optional>
 #include <set>

@@ -6,8 +6,8 @@
 #include "formats/bundle/TGRTBundleTypeValidators.h"
 #include "formats/settings/TGRTBinaryFileMetaDataReader.h"
 #include "formats/settings/TGRTCstSxvPstTypeValidator.h"
-#include "platform/FileAccess.h"
-#include "platform/Log.h"
+#include "platform/base/Log.h"
+#include "platform/files/FileAccess.h"
 
 #include <filesystem>
 

@@ -2,8 +2,8 @@
 #include "formats/FormatsSupport.h"
 #include "formats/TGRTMetaDataReader.h"
 #include "indexing/TGRTIndexableContentObject.h"
-#include "platform/LCFileParser.h"
-#include "platform/LCFileWriter.h"
+#include "media/loopfile/LCFileParser.h"
+#include "media/loopfile/LCFileWriter.h"
 
 #include <functional>
 

@@ -1,7 +1,7 @@
 #include "metadata/QVCTUUIDGenerator.h"
 #include "metadata/TGRTContentInfo.h"
 #include "metadata/TGRTSettingsInfo.h"
-#include "platform/TaggingTypes.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <gmock/gmock.h>
 

@@ -1,8 +1,8 @@
 #include "metadata/TGRTMetaData.h"
-#include "platform/PropertyListFile.h"
-#include "platform/TaggingTypes.h"
+#include "platform/data/PropertyListFile.h"
 #include "support/TemporaryFolder.h"
 #include "taxonomy/TGRTTaxonomy.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <limits>
 

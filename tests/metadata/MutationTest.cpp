@@ -1,7 +1,7 @@
 // Ten thousand damaged dictionaries: whatever stands where, reading passes over it and keeps the rest.
 
 #include "metadata/TGRTMetaData.h"
-#include "platform/PropertyListFile.h"
+#include "platform/data/PropertyListFile.h"
 #include "taxonomy/TGRTTaxonomy.h"
 
 #include <cmath>

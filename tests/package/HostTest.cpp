@@ -12,18 +12,18 @@
 #include <thread>
 
 #include <gmock/gmock.h>
-#include <qvcontenttagging/autotagging/QVTaggingAggregator.h>
-#include <qvcontenttagging/contentdb/ContentDatabase.h>
-#include <qvcontenttagging/contentdb/ContentDescriber.h>
-#include <qvcontenttagging/contentdb/Indexer.h>
-#include <qvcontenttagging/formats/ContentWalk.h>
-#include <qvcontenttagging/formats/TGRTFileNode.h>
-#include <qvcontenttagging/formats/TGRTMetaDataReaderFactory.h>
-#include <qvcontenttagging/formats/TGRTMetaDataWriterFactory.h>
-#include <qvcontenttagging/indexing/TGRTIndexableContentObject.h>
-#include <qvcontenttagging/taxonomy/TGRTLegacyTaxonomyMapping.h>
-#include <qvcontenttagging/taxonomy/TGRTTaxonomySearching.h>
-#include <qvcontenttagging/taxonomy/TaggingSetAdditions.h>
+#include <qvcontenttagging/ContentDatabase.h>
+#include <qvcontenttagging/ContentDescriber.h>
+#include <qvcontenttagging/ContentWalk.h>
+#include <qvcontenttagging/Indexer.h>
+#include <qvcontenttagging/QVTaggingAggregator.h>
+#include <qvcontenttagging/TGRTFileNode.h>
+#include <qvcontenttagging/TGRTIndexableContentObject.h>
+#include <qvcontenttagging/TGRTLegacyTaxonomyMapping.h>
+#include <qvcontenttagging/TGRTMetaDataReaderFactory.h>
+#include <qvcontenttagging/TGRTMetaDataWriterFactory.h>
+#include <qvcontenttagging/TGRTTaxonomySearching.h>
+#include <qvcontenttagging/TaggingSetAdditions.h>
 
 namespace qvct {
 namespace {

@@ -1,4 +1,4 @@
-#include "platform/Decompression.h"
+#include "platform/files/Decompression.h"
 
 #include <string>
 

@@ -1,4 +1,4 @@
-#include "platform/EditLock.h"
+#include "platform/files/EditLock.h"
 #include "support/TemporaryFolder.h"
 
 #include <chrono>

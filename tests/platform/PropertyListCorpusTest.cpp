@@ -1,7 +1,7 @@
 // Real property lists: what is valid survives a read and a write, what is hostile takes neither time nor
 // memory.
 
-#include "platform/PropertyListFile.h"
+#include "platform/data/PropertyListFile.h"
 #include "support/Corpus.h"
 
 #include <chrono>

@@ -1,6 +1,6 @@
-#include "platform/PropertyList.h"
-#include "platform/PropertyListFile.h"
-#include "platform/Text.h"
+#include "platform/data/PropertyList.h"
+#include "platform/data/PropertyListFile.h"
+#include "platform/text/Text.h"
 #include "support/Corpus.h"
 #include "support/TemporaryFolder.h"
 

@@ -1,4 +1,4 @@
-#include "platform/Url.h"
+#include "platform/text/Url.h"
 
 #include <gtest/gtest.h>
 

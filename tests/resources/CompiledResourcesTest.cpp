@@ -1,4 +1,4 @@
-#include "platform/Log.h"
+#include "platform/base/Log.h"
 #include "resources/EmbeddedFiles.h"
 #include "resources/QVCTCompiledResources.h"
 #include "support/Places.h"

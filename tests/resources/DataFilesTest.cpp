@@ -1,9 +1,9 @@
 // Holds the data files to the figures and labels that the rest of the system, and its hosts, count on.
 
-#include "platform/TaggingTypes.h"
-#include "platform/Text.h"
+#include "platform/text/Text.h"
 #include "resources/QVCTCompiledResources.h"
 #include "taxonomy/TGRTTaxonomy.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <map>
 #include <set>

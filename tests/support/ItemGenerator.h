@@ -1,7 +1,7 @@
 #pragma once
 
 #include "contentdb/IndexedItem.h"
-#include "platform/TaggingTypes.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <array>
 #include <cstdint>

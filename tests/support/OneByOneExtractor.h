@@ -1,7 +1,7 @@
 #pragma once
 
-#include "autotagging/QVCTKeywordExtractor.h"
-#include "platform/Text.h"
+#include "autotagging/keywords/QVCTKeywordExtractor.h"
+#include "platform/text/Text.h"
 
 #include <optional>
 #include <string>

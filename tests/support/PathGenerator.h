@@ -1,6 +1,6 @@
 #pragma once
 
-#include "autotagging/QVCTKeywordExtractor.h"
+#include "autotagging/keywords/QVCTKeywordExtractor.h"
 
 #include <random>
 #include <string>

@@ -1,5 +1,5 @@
-#include "platform/Log.h"
-#include "platform/Text.h"
+#include "platform/base/Log.h"
+#include "platform/text/Text.h"
 #include "resources/QVCTCompiledResources.h"
 #include "support/TemporaryFolder.h"
 #include "taxonomy/LegacyMappingTable.h"

@@ -1,8 +1,8 @@
-#include "platform/DecimalFormatter.h"
-#include "platform/TaggingTypes.h"
+#include "platform/text/DecimalFormatter.h"
 #include "taxonomy/TGRTTaggingCollection.h"
 #include "taxonomy/TGRTTaxonomy.h"
 #include "taxonomy/TaggingSetAdditions.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <cstdio>
 #include <cstdlib>

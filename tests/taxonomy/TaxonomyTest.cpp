@@ -1,10 +1,10 @@
-#include "platform/PropertyListFile.h"
-#include "platform/ResourceBundle.h"
-#include "platform/TaggingTypes.h"
-#include "platform/UserDefaults.h"
+#include "platform/data/PropertyListFile.h"
+#include "platform/data/UserDefaults.h"
+#include "platform/files/ResourceBundle.h"
 #include "support/TemporaryFolder.h"
 #include "taxonomy/TGRTTaxonomy.h"
 #include "taxonomy/TGRTTaxonomySearching.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <cmath>
 #include <functional>

@@ -1,8 +1,8 @@
 #include "formats/audiofile/TGRTAudioFileMetaDataReader.h"
 
 #include "formats/audiofile/TGRTAudioFileTypeValidator.h"
-#include "platform/LCFileParser.h"
-#include "platform/Text.h"
+#include "media/loopfile/LCFileParser.h"
+#include "platform/text/Text.h"
 
 #include <array>
 

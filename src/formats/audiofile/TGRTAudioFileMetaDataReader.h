@@ -1,7 +1,7 @@
 #pragma once
 
 #include "formats/TGRTBaseMetaDataReader.h"
-#include "platform/LCFileData.h"
+#include "media/loopfile/LCFileData.h"
 
 #include <memory>
 #include <string_view>

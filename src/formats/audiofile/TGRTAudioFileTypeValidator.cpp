@@ -1,7 +1,7 @@
 #include "formats/audiofile/TGRTAudioFileTypeValidator.h"
 
-#include "platform/LCFileParser.h"
-#include "platform/Text.h"
+#include "media/loopfile/LCFileParser.h"
+#include "platform/text/Text.h"
 
 #include <algorithm>
 #include <array>

@@ -1,11 +1,11 @@
 #include "formats/audiofile/TGRTAudioFileWriters.h"
 
 #include "formats/StoredRecord.h"
+#include "media/loopfile/LCFileParser.h"
+#include "media/loopfile/LCFileWriter.h"
 #include "metadata/StoredParts.h"
-#include "platform/EditLock.h"
-#include "platform/LCFileParser.h"
-#include "platform/LCFileWriter.h"
-#include "platform/TaggingTypes.h"
+#include "platform/files/EditLock.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <functional>
 

@@ -1,9 +1,9 @@
 #pragma once
 
-#include "platform/ObjectSet.h"
-#include "platform/TaggingTypes.h"
+#include "platform/base/ObjectSet.h"
 #include "taxonomy/TGRTTagging.h"
 #include "taxonomy/TaggingSetAdditions.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <algorithm>
 #include <array>

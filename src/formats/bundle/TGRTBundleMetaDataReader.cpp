@@ -1,8 +1,8 @@
 #include "formats/bundle/TGRTBundleMetaDataReader.h"
 
 #include "formats/bundle/BundleRecord.h"
-#include "platform/FileAccess.h"
-#include "platform/PropertyListFile.h"
+#include "platform/data/PropertyListFile.h"
+#include "platform/files/FileAccess.h"
 #include "taxonomy/TaggingSetAdditions.h"
 
 #include <algorithm>

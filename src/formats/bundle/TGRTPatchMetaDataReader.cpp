@@ -2,8 +2,8 @@
 
 #include "formats/QVContentEditorFileUtilities.h"
 #include "formats/bundle/BundleRecord.h"
-#include "platform/Log.h"
-#include "platform/XmlDocument.h"
+#include "platform/base/Log.h"
+#include "platform/data/XmlDocument.h"
 
 #include <array>
 

@@ -1,7 +1,7 @@
 #include "formats/preset/PresetRecord.h"
 
-#include "platform/TaggingTypes.h"
-#include "platform/Text.h"
+#include "platform/text/Text.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <algorithm>
 #include <array>

@@ -1,9 +1,9 @@
 #include "formats/preset/TGRTVorthalLegacyTaggingParser.h"
 
 #include "formats/preset/VorthalLegacyCodes.h"
-#include "platform/FileAccess.h"
-#include "platform/Log.h"
-#include "platform/Text.h"
+#include "platform/base/Log.h"
+#include "platform/files/FileAccess.h"
+#include "platform/text/Text.h"
 #include "taxonomy/LegacyTagLookup.h"
 #include "taxonomy/TGRTLegacyTaxonomyMapping.h"
 #include "taxonomy/TGRTTaxonomy.h"

@@ -1,7 +1,7 @@
 #pragma once
 
-#include "platform/ObjectSet.h"
-#include "platform/Url.h"
+#include "platform/base/ObjectSet.h"
+#include "platform/text/Url.h"
 #include "taxonomy/TGRTTag.h"
 #include "taxonomy/TGRTTagging.h"
 

@@ -2,8 +2,8 @@
 
 #include "formats/preset/PresetRecord.h"
 #include "formats/preset/TGRTVorthalLegacyTaggingParser.h"
-#include "platform/FileAccess.h"
-#include "platform/Text.h"
+#include "platform/files/FileAccess.h"
+#include "platform/text/Text.h"
 
 #include <array>
 

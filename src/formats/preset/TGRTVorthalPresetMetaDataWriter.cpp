@@ -2,9 +2,9 @@
 
 #include "formats/StoredRecord.h"
 #include "formats/preset/PresetRecord.h"
-#include "platform/FileAccess.h"
-#include "platform/TaggingTypes.h"
-#include "platform/Text.h"
+#include "platform/files/FileAccess.h"
+#include "platform/text/Text.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <functional>
 

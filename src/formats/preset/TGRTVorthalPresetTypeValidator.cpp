@@ -1,6 +1,6 @@
 #include "formats/preset/TGRTVorthalPresetTypeValidator.h"
 
-#include "platform/FileAccess.h"
+#include "platform/files/FileAccess.h"
 
 namespace qvct {
 

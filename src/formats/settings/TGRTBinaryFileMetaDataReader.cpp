@@ -1,11 +1,11 @@
 #include "formats/settings/TGRTBinaryFileMetaDataReader.h"
 
 #include "formats/settings/CFBinaryPlistFindTrailer.h"
-#include "platform/FileAccess.h"
-#include "platform/Log.h"
-#include "platform/ProcessArguments.h"
-#include "platform/PropertyListFile.h"
-#include "platform/Text.h"
+#include "platform/base/Log.h"
+#include "platform/base/ProcessArguments.h"
+#include "platform/data/PropertyListFile.h"
+#include "platform/files/FileAccess.h"
+#include "platform/text/Text.h"
 
 #include <algorithm>
 #include <array>

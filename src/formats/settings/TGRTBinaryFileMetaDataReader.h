@@ -1,7 +1,7 @@
 #pragma once
 
 #include "formats/TGRTBaseMetaDataReader.h"
-#include "platform/PropertyList.h"
+#include "platform/data/PropertyList.h"
 
 #include <memory>
 #include <optional>

@@ -1,8 +1,8 @@
 #include "formats/settings/TGRTCstSxvPstMetaDataReader.h"
 
-#include "platform/FileAccess.h"
-#include "platform/PropertyListFile.h"
-#include "platform/QVContentTaggingTypes.h"
+#include "formats/QVContentTaggingTypes.h"
+#include "platform/data/PropertyListFile.h"
+#include "platform/files/FileAccess.h"
 
 #include <array>
 

@@ -1,7 +1,7 @@
 #include "formats/settings/TGRTCstSxvPstTypeValidator.h"
 
 #include "formats/bundle/TGRTBundleTypeValidators.h"
-#include "platform/FileAccess.h"
+#include "platform/files/FileAccess.h"
 
 namespace qvct {
 

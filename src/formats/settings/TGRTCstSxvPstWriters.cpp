@@ -1,9 +1,9 @@
 #include "formats/settings/TGRTCstSxvPstWriters.h"
 
+#include "formats/QVContentTaggingTypes.h"
 #include "formats/StoredRecord.h"
 #include "formats/settings/TGRTCstSxvPstMetaDataReader.h"
 #include "metadata/StoredParts.h"
-#include "platform/QVContentTaggingTypes.h"
 
 #include <utility>
 

@@ -1,8 +1,8 @@
 #include "formats/settings/TGRTSettingsHeaderReader.h"
 
-#include "platform/SwapData.h"
-#include "platform/Text.h"
-#include "platform/loopfile/RandomAccessReader.h"
+#include "platform/files/RandomAccessReader.h"
+#include "platform/files/SwapData.h"
+#include "platform/text/Text.h"
 
 #include <algorithm>
 #include <array>

@@ -1,8 +1,8 @@
 #pragma once
 
 #include "metadata/TGRTSettingsInfo.h"
-#include "platform/Error.h"
-#include "platform/Url.h"
+#include "platform/base/Error.h"
+#include "platform/text/Url.h"
 
 #include <cstddef>
 #include <cstdint>

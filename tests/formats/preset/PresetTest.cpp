@@ -2,8 +2,8 @@
 #include "formats/TGRTMetaDataReaderFactory.h"
 #include "formats/preset/PresetText.h"
 #include "formats/preset/TGRTVorthalPresetMetaDataWriter.h"
-#include "platform/FileAccess.h"
-#include "platform/Text.h"
+#include "platform/files/FileAccess.h"
+#include "platform/text/Text.h"
 
 #include <gmock/gmock.h>
 

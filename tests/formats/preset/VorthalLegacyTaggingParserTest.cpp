@@ -1,5 +1,5 @@
 #include "formats/preset/TGRTVorthalLegacyTaggingParser.h"
-#include "platform/Log.h"
+#include "platform/base/Log.h"
 #include "resources/QVCTCompiledResources.h"
 #include "support/TemporaryFolder.h"
 #include "taxonomy/TGRTTaxonomy.h"

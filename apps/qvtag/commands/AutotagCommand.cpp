@@ -1,0 +1,172 @@
+#include "CommandLine.h"
+#include "Resources.h"
+#include "RhythmMeasurement.h"
+#include "Services.h"
+#include "autotagging/QVTaggingAggregator.h"
+#include "autotagging/services/QVCTRhythmicTaggingService.h"
+#include "commands/Commands.h"
+#include "formats/QVContentTaggingTypes.h"
+#include "formats/TGRTFileNode.h"
+#include "media/loopfile/LCFileParser.h"
+#include "output/StandardStreams.h"
+#include "platform/data/PropertyListFile.h"
+#include "platform/text/Text.h"
+
+#include <algorithm>
+#include <memory>
+
+#include <CLI/CLI.hpp>
+#include <fmt/format.h>
+
+namespace qvct::tool {
+namespace {
+
+struct Options {
+    std::vector<std::string> paths;
+    LinksOutside links = LinksOutside::files;
+    std::vector<std::string> services;
+    std::string keywordsFile;
+    std::string rulesFile;
+    bool measuresAnyRhythm = false;
+};
+
+struct Item {
+    URL url;
+    std::vector<std::shared_ptr<TGRTTagging>> taggings;
+};
+
+using Settings = QVTaggingAggregator::Settings;
+
+/// The settings in a file; none, and a line on standard error, when it is not one.
+template <typename Read>
+Settings settingsIn(const std::string& file, std::string_view what, Read read, ToolContext& context) {
+    if (file.empty()) return std::nullopt;
+    Error error;
+    Settings settings = read(file, &error);
+    if (!settings) context.itemFailed(fmt::format("{} (using the built-in {})", error.message, what));
+    return settings;
+}
+
+Settings keywordsIn(const std::string& file, ToolContext& context) {
+    const auto read = [](const std::string& path, Error* error) { return readDictionaryFile(path, error); };
+    Settings keywords = settingsIn(file, "keywords", read, context);
+    if (keywords) checkKeywords(*keywords, context);
+    return keywords;
+}
+
+/// What the item's record says that it is, else its name.
+std::int64_t fileTypeOf(const URL& url) {
+    const auto record = TGRTFileNode::nodeWithFileURL(url)->readMetaDataWithOptions(0);
+    const std::int64_t stored = record ? record->fileType() : std::int64_t{kFileTypeNone};
+    return stored != kFileTypeNone ? stored : QVContentTaggingTypes::fallBackFileTypeForURL(url);
+}
+
+Json jsonOfItem(const Item& item) {
+    Json json;
+    json["path"] = item.url.path();
+    json["type"] = QVContentTaggingTypes::nameForFileType(fileTypeOf(item.url));
+    json["taggings"] = Json::array();
+    for (const auto& tagging : item.taggings) json["taggings"].push_back(jsonOfTagging(*tagging));
+    return json;
+}
+
+/// One heading a folder, below it a line an item: its name and its tags.
+void printTable(const std::vector<Item>& items, const Terminal& terminal) {
+    constexpr std::size_t widestName = 40;
+    std::size_t width = 0;
+    for (const Item& item : items) width = std::max(width, displayWidth(item.url.lastPathComponent()));
+    width = std::min(width, widestName);
+    std::string folder;
+    for (const Item& item : items) {
+        const std::string itsFolder = item.url.URLByDeletingLastPathComponent().path();
+        if (itsFolder != folder) {
+            print("{}{}\n", folder.empty() ? "" : "\n",
+                  colored(terminal, Color::strong, printable(itsFolder)));
+            folder = itsFolder;
+        }
+        std::vector<Word> words;
+        for (const auto& tagging : item.taggings) {
+            words.push_back({textOfTagging(*tagging), tagging->level() ? Color::accent : Color::plain});
+        }
+        if (words.empty()) words.push_back({"no tags", Color::faint});
+        print("  {}  {}\n", padded(printable(item.url.lastPathComponent()), width),
+              wrapped(terminal, words, width + 4));
+    }
+}
+
+void noteTotals(const std::vector<Item>& items, const ToolContext& context) {
+    std::size_t tags = 0;
+    std::size_t tagged = 0;
+    for (const Item& item : items) {
+        tags += item.taggings.size();
+        tagged += item.taggings.empty() ? 0 : 1;
+    }
+    context.note(fmt::format("{} items, {} of them tagged, {} tags", items.size(), tagged, tags));
+}
+
+bool isGraded(const ObjectSet<TGRTTagging>& taggings) {
+    return std::any_of(taggings.begin(), taggings.end(),
+                       [](const auto& tagging) { return tagging->label() == "Rhythmic Density"; });
+}
+
+/// Grades audio that the rhythm service leaves alone, where its length in beats is known.
+void addAnyRhythm(const URL& url, const TGRTTaxonomy& taxonomy, ObjectSet<TGRTTagging>& taggings) {
+    if (isGraded(taggings)) return;
+    const auto data = LCFileParser::fileParserForURL(url)->enhancedFileData();
+    if (!data || data->beatCount() == 0) return;
+    Error ignored;
+    const auto rhythm = measureRhythm(url, {}, &ignored);
+    if (!rhythm) return;
+    for (const TagDictionary& tag :
+         QVCTRhythmicTaggingService::tagsForValues(rhythm->density, rhythm->complexity)) {
+        auto tagging = TGRTTagging::initWithTag(
+            taxonomy.findTagForLabel(*tag.value(kTagDictionaryLabelKey)->string()),
+            TGRTLevel::levelWithWeight(*tag.value(kTagDictionaryLevelKey)->doubleValue()));
+        if (tagging) tagging->setIsAutoTagging(true);
+        taggings.insert(tagging);
+    }
+}
+
+void run(const Options& options, ToolContext& context) {
+    const auto bits = optionsForServices(options.services, context);
+    const auto aggregator =
+        QVTaggingAggregator::initWithRules(settingsIn(options.rulesFile, "rules", readRules, context),
+                                           keywordsIn(options.keywordsFile, context));
+    const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
+    std::vector<Item> items;
+    for (const URL& url : context.contentItems(options.paths, options.links)) {
+        auto taggings = aggregator->taggingsWithContentsOfURL(url, *taxonomy, bits);
+        if (options.measuresAnyRhythm) addAnyRhythm(url, *taxonomy, taggings);
+        items.push_back({url, sortedTaggings(taggings)});
+    }
+    if (context.format == Format::table) {
+        printTable(items, context.terminal());
+        return noteTotals(items, context);
+    }
+    Json json = Json::array();
+    for (const Item& item : items) json.push_back(jsonOfItem(item));
+    printJson(json, context.format);
+}
+
+}  // namespace
+
+void addAutotagCommand(CLI::App& app, ToolContext& context) {
+    const auto options = std::make_shared<Options>();
+    auto* command = app.add_subcommand("autotag", "Derives tags for files and for everything below folders");
+    command->add_option("paths", options->paths, "Files and folders")->required()->type_name("PATH");
+    addFollowOption(*command, options->links);
+    addServicesOption(*command, options->services);
+    command
+        ->add_option("--keywords", options->keywordsFile,
+                     "Property list of keywords to use instead of the built-in")
+        ->type_name("FILE");
+    command
+        ->add_option("--rules", options->rulesFile, "Property list of rules to use instead of the built-in")
+        ->type_name("FILE");
+    command->add_flag("--rhythm-any", options->measuresAnyRhythm,
+                      "Grade the rhythm of every sound whose length in beats is known");
+    command->footer("Example:\n  qvtag autotag --json Loops \"Patches/Warm Pad.patch\"");
+    command->callback([options, &context] { run(*options, context); });
+}
+
+}  // namespace qvct::tool

@@ -1,0 +1,79 @@
+#include "commands/Commands.h"
+#include "contentdb/ContentDatabase.h"
+#include "output/StandardStreams.h"
+#include "platform/text/Text.h"
+
+#include <memory>
+
+#include <CLI/CLI.hpp>
+
+namespace qvct::tool {
+namespace {
+
+using namespace contentdb;
+
+struct Options {
+    std::vector<std::string> databases;
+    std::string target;
+};
+
+void merge(const Options& options, ToolContext& context) {
+    Error error;
+    if (!mergeDatabases(options.databases, options.target, &error)) return context.itemFailed(error.message);
+    const auto merged = ContentDatabase::open(options.target, &error);
+    const auto totals = merged ? merged->totals(&error) : std::nullopt;
+    if (!totals) return context.itemFailed(error.message);
+    if (context.format == Format::table)
+        return print("{} items, {} of them failed\n", totals->items, totals->failures);
+    printJson(Json{{"database", options.target}, {"items", totals->items}, {"failed", totals->failures}},
+              context.format);
+}
+
+void check(const Options& options, ToolContext& context) {
+    Json json = Json::array();
+    for (const std::string& path : options.databases) {
+        Error error;
+        const auto database = ContentDatabase::open(path, &error);
+        const bool isIntact = database && database->check(&error);
+        const auto totals = isIntact ? database->totals(&error) : std::nullopt;
+        if (!totals) {
+            context.itemFailed(error.message);
+            json.push_back({{"database", path}, {"intact", false}, {"reason", error.message}});
+            continue;
+        }
+        Json failures = Json::array();
+        database->forEachFailure([&](const IndexedItem& item) {
+            if (context.format == Format::table) print("{}\n", messageOfFailure(item));
+            failures.push_back({{"path", item.path}, {"reason", item.failure}});
+            return true;
+        });
+        if (context.format == Format::table)
+            print("{}: intact, {} items, {} of them failed\n", printable(path), totals->items,
+                  totals->failures);
+        json.push_back(
+            {{"database", path}, {"intact", true}, {"items", totals->items}, {"failures", failures}});
+    }
+    if (context.format != Format::table) printJson(json, context.format);
+}
+
+}  // namespace
+
+void addDatabaseCommand(CLI::App& app, ToolContext& context) {
+    const auto options = std::make_shared<Options>();
+    auto* command = app.add_subcommand("db", "Merges and checks databases");
+    command->require_subcommand(1);
+    command->footer("Example:\n  qvtag db merge part1.db part2.db --db all.db\n  qvtag db check all.db");
+
+    auto* merging = command->add_subcommand("merge", "Unites the databases of parts into a new one");
+    merging->add_option("databases", options->databases, "The parts")->required()->type_name("FILE");
+    merging->add_option("--db", options->target, "The new database")->required()->type_name("FILE");
+    merging->footer("Example:\n  qvtag db merge part1.db part2.db --db all.db");
+    merging->callback([options, &context] { merge(*options, context); });
+
+    auto* checking = command->add_subcommand("check", "Reads a database whole; lists the items that failed");
+    checking->add_option("databases", options->databases, "The databases")->required()->type_name("FILE");
+    checking->footer("Example:\n  qvtag db check all.db");
+    checking->callback([options, &context] { check(*options, context); });
+}
+
+}  // namespace qvct::tool

@@ -1,0 +1,137 @@
+#include "CommandLine.h"
+#include "Services.h"
+#include "commands/Commands.h"
+#include "contentdb/ContentDatabase.h"
+#include "contentdb/ContentDescriber.h"
+#include "contentdb/index/LibraryWalk.h"
+#include "output/Progress.h"
+#include "output/StandardStreams.h"
+#include "platform/text/Text.h"
+
+#include <chrono>
+#include <csignal>
+#include <memory>
+
+#include <CLI/CLI.hpp>
+
+namespace qvct::tool {
+namespace {
+
+using contentdb::IndexOptions;
+using contentdb::IndexProgress;
+
+struct Options {
+    IndexOptions index;
+    std::vector<std::string> services;
+    unsigned secondsPerItem = 30;
+};
+
+volatile std::sig_atomic_t wasInterrupted = 0;
+
+/// Ctrl-C ends the run at the next batch; a second one ends the tool.
+void interruptGently() {
+    struct sigaction action {};
+    action.sa_handler = [](int) { wasInterrupted = 1; };
+    action.sa_flags = static_cast<int>(SA_RESETHAND);
+    ::sigaction(SIGINT, &action, nullptr);
+}
+
+Json jsonOfRun(const IndexOptions& options, const IndexProgress& progress, double seconds) {
+    Json json;
+    json["database"] = options.database;
+    json["items"] = progress.seen;
+    json["unchanged"] = progress.unchanged;
+    json["indexed"] = progress.described;
+    json["moved"] = progress.moved;
+    json["failed"] = progress.failed;
+    json["missing"] = progress.missing;
+    json["pruned"] = progress.pruned;
+    json["seconds"] = seconds;
+    json["itemsPerSecond"] = seconds > 0 ? static_cast<double>(progress.seen) / seconds : 0;
+    return json;
+}
+
+void printRun(const Json& run, const IndexProgress& progress, const ToolContext& context) {
+    if (context.format != Format::table) return printJson(run, context.format);
+    print("{} items: {} indexed ({} of them moved), {} unchanged, {} failed", progress.seen,
+          progress.described, progress.moved, progress.unchanged, progress.failed);
+    if (progress.missing > 0) print(", {} missing of which {} pruned", progress.missing, progress.pruned);
+    print("; {:.1f} s, {:.0f} a second\n", run["seconds"].get<double>(), run["itemsPerSecond"].get<double>());
+}
+
+void run(Options& options, ToolContext& context) {
+    const auto services = optionsForServices(options.services, context);
+    if (context.exitStatus() != 0) return;  // half of the services would mark the items as done
+    const auto factory = [&services] { return std::make_unique<contentdb::ContentDescriber>(services); };
+    Progress bar(context.quiet);
+    IndexOptions& index = options.index;
+    index.describer = contentdb::ContentDescriber::digest(services);
+    index.timeLimitPerItem = std::chrono::seconds(options.secondsPerItem);
+    std::uint64_t total = 0;
+    if (bar.isShown()) {
+        for (const std::string& folder : index.folders) total += contentdb::countContentNames(folder);
+    }
+    index.progress = [&](const IndexProgress& at) {
+        bar.show(at.unchanged + at.described + at.failed, total / index.parts);
+    };
+    index.failed = [&](const Error& error) {
+        bar.hide();
+        context.itemFailed(error.message);
+    };
+    index.note = [&](const std::string& message) {
+        bar.hide();
+        context.note(message);
+    };
+    std::vector<URL> passedOver;
+    index.links.passedOver = [&passedOver](const URL& link) { passedOver.push_back(link); };
+    interruptGently();
+    index.isCancelled = [] { return wasInterrupted != 0; };
+    Error error;
+    const auto progress = indexLibrary(index, factory, &error);
+    bar.hide();
+    if (!progress) return context.itemFailed(error.message);
+    context.notePassedOver(passedOver);
+    printRun(jsonOfRun(index, *progress, bar.seconds()), *progress, context);
+    if (wasInterrupted != 0) context.itemFailed("interrupted; the next run goes on from here");
+}
+
+}  // namespace
+
+void addIndexCommand(CLI::App& app, ToolContext& context) {
+    const auto options = std::make_shared<Options>();
+    IndexOptions& index = options->index;
+    auto* command = app.add_subcommand("index", "Brings a database up to date with folders of sounds");
+    command->add_option("folders", index.folders, "Folders to walk")->required()->type_name("DIR");
+    command->add_option("--db", index.database, "The database; made if there is none")
+        ->required()
+        ->type_name("FILE");
+    addFollowOption(*command, index.links.outside);
+    auto* prune = command->add_flag("--prune", index.prune, "Take items out whose files are gone");
+    command
+        ->add_flag("--prune-roots", index.pruneRoots,
+                   "Also where a named folder is empty or missing, as when its disk is away")
+        ->needs(prune);
+    command->add_flag("--retry", index.retryFailed, "Read items again that failed before");
+    command->add_flag("--check", index.check,
+                      "Read the database whole first; what is damaged is built anew. Without, only its pages "
+                      "are held against their checksums");
+    addServicesOption(*command, options->services);
+    auto* part = command->add_option("--part", index.part, "Index only part I of the items")
+                     ->type_name("I")
+                     ->check(CLI::Range(1, 1000000));
+    auto* parts = command->add_option("--parts", index.parts, "Into how many parts the items are divided")
+                      ->type_name("N")
+                      ->check(CLI::Range(1, 1000000));
+    part->needs(parts);
+    parts->needs(part);
+    command->add_option("--workers", index.workers, "Processes that read items (default: one a processor)")
+        ->check(CLI::Range(0, 1024));
+    command->add_option("--time-limit", options->secondsPerItem, "Seconds that one item may take")
+        ->check(CLI::Range(1, 86400));
+    command->footer(
+        "Example:\n  qvtag index ~/Music/Loops --db loops.db\n"
+        "  qvtag index /sounds --db part2.db --part 2 --parts 4");
+    command->callback([options, &context] { run(*options, context); });
+}
+
+}  // namespace qvct::tool

@@ -1,0 +1,48 @@
+#include "autotagging/keywords/QVCTKeywordExtractor.h"
+#include "commands/Commands.h"
+#include "output/StandardStreams.h"
+#include "platform/text/Text.h"
+
+#include <algorithm>
+#include <memory>
+
+#include <CLI/CLI.hpp>
+#include <fmt/format.h>
+
+namespace qvct::tool {
+namespace {
+
+struct Options {
+    std::string text;
+};
+
+void printTable(const CountedSet& found) {
+    std::size_t width = 0;
+    for (const auto& [label, _] : found) width = std::max(width, displayWidth(printable(label)));
+    for (const auto& [label, count] : found) print("{}  {}\n", padded(printable(label), width), count);
+}
+
+void run(const Options& options, ToolContext& context) {
+    if (!isValidUtf8(options.text)) {
+        return context.itemFailed(fmt::format("{}: the text is not UTF-8", printable(options.text)));
+    }
+    const auto extractor = QVCTKeywordExtractor::defaultKeywordExtractor();
+    const CountedSet found = extractor->extractKeywordsFromString(options.text);
+    if (context.format == Format::table) return printTable(found);
+    Json counts = Json::object();
+    for (const auto& [label, count] : found) counts[label] = count;
+    printJson(counts, context.format);
+}
+
+}  // namespace
+
+void addKeywordsCommand(CLI::App& app, ToolContext& context) {
+    const auto options = std::make_shared<Options>();
+    auto* command =
+        app.add_subcommand("keywords", "Shows which labels the words of a text yield, and how often");
+    command->add_option("text", options->text, "The text, such as a path")->required();
+    command->footer("Example:\n  qvtag keywords \"Loops/Deep House/Warm Analog Synth.caf\"");
+    command->callback([options, &context] { run(*options, context); });
+}
+
+}  // namespace qvct::tool

@@ -1,0 +1,106 @@
+#include "CommandLine.h"
+#include "commands/Commands.h"
+#include "formats/QVContentTaggingTypes.h"
+#include "formats/TGRTFileNode.h"
+#include "output/PropertyListOutput.h"
+#include "output/RecordOutput.h"
+#include "output/StandardStreams.h"
+#include "platform/text/Text.h"
+
+#include <memory>
+
+#include <CLI/CLI.hpp>
+#include <fmt/format.h>
+
+namespace qvct::tool {
+namespace {
+
+struct Options {
+    std::vector<std::string> paths;
+    LinksOutside links = LinksOutside::files;
+    bool legacy = false;
+    bool mapped = false;
+};
+
+/// The record of an item; an empty one of its kind when it stores none, null when it cannot be read.
+std::shared_ptr<TGRTMetaData> readRecord(const URL& url, std::uint64_t bits, ToolContext& context) {
+    Error error;
+    auto record = TGRTFileNode::nodeWithFileURL(url)->readMetaDataWithOptions(bits, &error);
+    if (!error.message.empty()) {
+        context.itemFailed(error.message);
+        return nullptr;
+    }
+    if (record) return record;
+    record = TGRTMetaData::init();
+    record->setFileType(QVContentTaggingTypes::fallBackFileTypeForURL(url));
+    return record;
+}
+
+Json jsonOfRecord(const URL& url, const TGRTMetaData& record) {
+    Json json;
+    json["path"] = url.path();
+    const std::string name = record.displayName().value_or("");
+    json["displayName"] = name.empty() ? Json() : Json(name);
+    json["fileType"] = record.fileType();
+    json["subFileType"] = record.subFileType();
+    json["taggings"] = Json::array();
+    for (const auto& tagging : sortedTaggings(record.taggings()))
+        json["taggings"].push_back(jsonOfTagging(*tagging));
+    json["keyValues"] = jsonOfPropertyList(TGRTKeyValue::keyValueDictionaryForKeyValues(record.keyValues()));
+    json["contentInfo"] =
+        record.contentInfo() ? jsonOfPropertyList(record.contentInfo()->dictionary()) : Json::object();
+    return json;
+}
+
+void printRecord(const URL& url, const TGRTMetaData& record, const Terminal& terminal) {
+    print("{}\n", colored(terminal, Color::strong, printable(url.path())));
+    printKind(terminal, record.fileType(), record.subFileType());
+    const std::string name = record.displayName().value_or("");
+    if (!name.empty()) printField(terminal, "name", {{printable(name), Color::plain}});
+    printTaggings(terminal, record.taggings());
+    printKeyValues(terminal, record.keyValues());
+    if (!record.contentInfo()) return;
+    std::vector<Word> words;
+    for (const std::string& path : record.contentInfo()->assetDependencyPaths())
+        words.push_back({printable(path), Color::plain});
+    printField(terminal, "needs", words);
+    words.clear();
+    for (const auto& info : record.contentInfo()->applicationInfos())
+        words.push_back({printable(fmt::format("{} {}", info->appIdentifier().value_or(""),
+                                               info->minimumVersion().value_or(""))),
+                         Color::plain});
+    printField(terminal, "opened by", words);
+}
+
+void run(const Options& options, ToolContext& context) {
+    const std::uint64_t bits = (options.legacy ? std::uint64_t{kReadLegacyTaggings} : 0) |
+                               (options.mapped ? std::uint64_t{kReadMappedTaggings} : 0);
+    Json json = Json::array();
+    for (const URL& url : context.contentItems(options.paths, options.links)) {
+        if (isOutputLost()) break;
+        const auto record = readRecord(url, bits, context);
+        if (!record) continue;
+        if (context.format == Format::table) {
+            printRecord(url, *record, context.terminal());
+        } else {
+            json.push_back(jsonOfRecord(url, *record));
+        }
+    }
+    if (context.format != Format::table) printJson(json, context.format);
+}
+
+}  // namespace
+
+void addReadCommand(CLI::App& app, ToolContext& context) {
+    const auto options = std::make_shared<Options>();
+    auto* command = app.add_subcommand("read", "Shows what files and bundles store about themselves");
+    command->add_option("paths", options->paths, "Files and folders")->required()->type_name("PATH");
+    addFollowOption(*command, options->links);
+    command->add_flag("--legacy", options->legacy,
+                      "Also the tags of retired vocabularies in old loops and presets");
+    command->add_flag("--mapped", options->mapped, "Also what those tags are called today");
+    command->footer("Example:\n  qvtag read --json --mapped Loops");
+    command->callback([options, &context] { run(*options, context); });
+}
+
+}  // namespace qvct::tool

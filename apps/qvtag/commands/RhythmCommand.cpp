@@ -1,0 +1,168 @@
+#include "RhythmMeasurement.h"
+#include "commands/Commands.h"
+#include "output/StandardStreams.h"
+#include "platform/files/FileAccess.h"
+#include "platform/text/Text.h"
+
+#include <bit>
+#include <charconv>
+#include <cmath>
+#include <filesystem>
+#include <fstream>
+#include <memory>
+
+#include <CLI/CLI.hpp>
+#include <fmt/format.h>
+
+namespace qvct::tool {
+namespace {
+
+struct Options {
+    std::vector<std::string> paths;
+    RhythmRequest request;
+    std::string signature;
+    std::string plotFile;
+};
+
+/// "6/8" into its two numbers.
+bool readSignature(const std::string& text, RhythmRequest& request) {
+    if (text.empty()) return true;
+    std::int32_t top = 0;
+    std::int32_t bottom = 0;
+    const char* end = text.data() + text.size();
+    const auto [slash, topStatus] = std::from_chars(text.data(), end, top);
+    if (topStatus != std::errc{} || slash == end || *slash != '/') return false;
+    const auto [rest, bottomStatus] = std::from_chars(slash + 1, end, bottom);
+    constexpr std::int32_t most = 64;
+    const bool isNote = bottom >= 1 && bottom <= most && std::has_single_bit(static_cast<unsigned>(bottom));
+    if (bottomStatus != std::errc{} || rest != end || top < 1 || top > most || !isNote) return false;
+    request.signatureTop = top;
+    request.signatureBottom = bottom;
+    return true;
+}
+
+/// What a range lets through, since it compares with nothing.
+std::string refuseNotANumber(const std::string& text) {
+    double value = 0;
+    return CLI::detail::lexical_cast(text, value) && std::isnan(value) ? "not a number" : "";
+}
+
+/// Whole numbers without a fraction, others with what tells them apart.
+double rounded(double value) {
+    return std::round(value * 1e6) / 1e6;
+}
+
+Json jsonOf(const std::string& path, const RhythmResult& result) {
+    Json json{{"path", URL::fileURLWithPath(path).path()},
+              {"density", result.density},
+              {"complexity", result.complexity},
+              {"onsets", Json::array()}};
+    for (const double onset : result.onsets) json["onsets"].push_back(rounded(onset));
+    json["beatCount"] = result.beatCount;
+    json["tempo"] = rounded(result.tempo);
+    json["signature"] = fmt::format("{}/{}", result.signatureTop, result.signatureBottom);
+    json["reasonForZero"] = result.reasonForZero.empty() ? Json() : Json(result.reasonForZero);
+    json["allTracks"] = Json();
+    if (const auto& all = result.allTracks)
+        json["allTracks"] = {
+            {"tracks", all->count}, {"density", all->density}, {"complexity", all->complexity}};
+    return json;
+}
+
+std::string bar(float value) {
+    constexpr std::size_t width = 10;
+    const auto full = static_cast<std::size_t>(std::lround(value * static_cast<float>(width)));
+    std::string text;
+    for (std::size_t i = 0; i < width; ++i) text += i < full ? "█" : "░";
+    return text;
+}
+
+void printRow(const std::string& path, const RhythmResult& result) {
+    print("{}\n  density {} {:3.0f}%   complexity {} {:3.0f}%   {} onsets in {} beats of {}/{} at {:g} bpm\n",
+          printable(path), bar(result.density), static_cast<double>(result.density) * 100,
+          bar(result.complexity), static_cast<double>(result.complexity) * 100, result.onsets.size(),
+          result.beatCount, result.signatureTop, result.signatureBottom, rounded(result.tempo));
+    if (!result.reasonForZero.empty()) print("  complexity 0%: {}\n", result.reasonForZero);
+    if (const auto& all = result.allTracks)
+        print("  first of {} tracks; all together: density {:.0f}%, complexity {:.0f}%\n", all->count,
+              double{all->density} * 100, double{all->complexity} * 100);
+}
+
+bool beginsLikeSvg(const std::string& path) {
+    if (!isRegularFile(path)) return false;
+    std::string start(5, '\0');
+    std::ifstream(path, std::ios::binary).read(start.data(), static_cast<std::streamsize>(start.size()));
+    return start.starts_with("<svg") || start == "<?xml";
+}
+
+/// Why a picture must not be put there, since something else would be lost; empty when it may.
+std::string problemOfPlot(const std::string& target, const std::vector<std::string>& inputs) {
+    namespace fs = std::filesystem;
+    std::error_code ignored;
+    if (!fs::exists(target, ignored)) return {};
+    const std::string place = printable(target) + ": ";
+    for (const std::string& input : inputs) {
+        if (fs::equivalent(target, input, ignored)) return place + "is to be read, and not to be drawn over";
+    }
+    const bool isSvg =
+        URL::fileURLWithPath(target).lowercasePathExtension() == "svg" && beginsLikeSvg(target);
+    return isSvg ? std::string{} : place + "is no SVG, and is not replaced by one";
+}
+
+void writePlot(const Options& options, const RhythmResult& result, ToolContext& context) {
+    if (options.plotFile.empty()) return;
+    Error error;
+    if (!replaceFile(options.plotFile, result.plot.svg(), &error)) context.itemFailed(error.message);
+}
+
+void run(Options options, ToolContext& context) {
+    if (!readSignature(options.signature, options.request)) {
+        return context.usageFailed(
+            fmt::format("\"{}\" is no time signature such as 6/8", printable(options.signature)));
+    }
+    if (!options.plotFile.empty() && options.paths.size() != 1) {
+        return context.usageFailed("--plot draws one file; name only one");
+    }
+    const std::string problem = problemOfPlot(options.plotFile, options.paths);
+    if (!problem.empty()) return context.usageFailed(problem);
+    Json items = Json::array();
+    for (const std::string& path : options.paths) {
+        if (isOutputLost()) break;
+        Error error;
+        const auto result = measureRhythm(URL::fileURLWithPath(path), options.request, &error);
+        if (!result) {
+            context.itemFailed(error.message);
+            continue;
+        }
+        for (const std::string& damage : result->problems)
+            context.note(fmt::format("{}: {}", printable(path), damage));
+        writePlot(options, *result, context);
+        if (context.format == Format::table) {
+            printRow(path, *result);
+        } else {
+            items.push_back(jsonOf(path, *result));
+        }
+    }
+    if (context.format != Format::table) printJson(items, context.format);
+}
+
+}  // namespace
+
+void addRhythmCommand(CLI::App& app, ToolContext& context) {
+    const auto options = std::make_shared<Options>();
+    auto* command = app.add_subcommand("rhythm", "Measures how dense and how complex a rhythm is");
+    command->add_option("files", options->paths, "MIDI files, loops and other sounds")
+        ->required()
+        ->type_name("FILE");
+    command->add_option("--tempo", options->request.tempo, "Quarter notes a minute")
+        ->check(CLI::Range(1.0, 1000.0) & CLI::Validator(refuseNotANumber, ""));
+    command->add_option("--beats", options->request.beats, "Length in beats, 6 a bar of 6/8")
+        ->check(CLI::Range(1, kMostBeats));
+    command->add_option("--signature", options->signature, "Time signature, such as 6/8");
+    command->add_option("--plot", options->plotFile, "Draw the rhythm, and what gave it its numbers")
+        ->type_name("FILE.svg");
+    command->footer("Example:\n  qvtag rhythm \"Deep House Beat.caf\" --plot beat.svg");
+    command->callback([options, &context] { run(*options, context); });
+}
+
+}  // namespace qvct::tool

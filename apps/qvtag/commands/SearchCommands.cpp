@@ -1,0 +1,277 @@
+#include "CommandLine.h"
+#include "commands/Commands.h"
+#include "contentdb/ContentDatabase.h"
+#include "contentdb/store/Decimal.h"
+#include "formats/QVContentTaggingTypes.h"
+#include "output/StandardStreams.h"
+#include "platform/text/Text.h"
+#include "platform/text/Url.h"
+#include "taxonomy/TGRTTagging.h"
+#include "taxonomy/TGRTTaxonomy.h"
+
+#include <algorithm>
+#include <cmath>
+#include <functional>
+#include <map>
+#include <memory>
+#include <unordered_map>
+
+#include <CLI/CLI.hpp>
+#include <fmt/format.h>
+
+namespace qvct::tool {
+namespace {
+
+using namespace contentdb;
+
+struct Options {
+    std::vector<std::string> words;
+    std::string database;
+    std::size_t limit = 50;
+    std::string path;
+};
+
+std::string_view nameOf(Provenance provenance) {
+    switch (provenance) {
+        case Provenance::virtualTag:
+            return "virtual";
+        case Provenance::automatic:
+            return "automatic";
+        case Provenance::stored:
+            break;
+    }
+    return "stored";
+}
+
+/// In tenths; the tag's default level stands in where the tagging has none.
+std::int64_t weightLevelOf(const IndexedTagging& tagging) {
+    const auto level = tagging.level ? TGRTLevel::levelWithWeight(decimalOf(*tagging.level)) : nullptr;
+    const auto tag = TGRTTaxonomy::defaultTaxonomy()->findTagForLabel(tagging.label, tagging.category);
+    const auto known = TGRTTagging::initWithTag(tag, level);
+    constexpr float tenths = 10;
+    return known ? known->weightLevel() : std::lround(tagging.level.value_or(1) * tenths);
+}
+
+Json jsonOf(const IndexedTagging& tagging) {
+    Json json;
+    json["label"] = tagging.label;
+    json["parent"] = tagging.ancestors.empty() ? Json() : Json(tagging.ancestors[0]);
+    json["category"] = tagging.category;
+    json["level"] = tagging.level ? Json(decimalOf(*tagging.level)) : Json();
+    json["auto"] = tagging.isAuto;
+    json["weightLevel"] = weightLevelOf(tagging);
+    json["provenance"] = nameOf(tagging.provenance);
+    json["service"] = tagging.service.empty() ? Json() : Json(tagging.service);
+    return json;
+}
+
+/// Of a key that comes twice the last value.
+Json jsonOf(const std::vector<IndexedValue>& values) {
+    Json json = Json::object();
+    auto& members = json.get_ref<Json::object_t&>();
+    std::unordered_map<std::string_view, std::size_t> places;  // the object's own search is linear
+    for (const auto& [key, value] : values) {
+        const auto* number = std::get_if<double>(&value);
+        const auto [hit, isNew] = places.emplace(key, members.size());
+        if (isNew) members.emplace_back(key, Json());
+        (members.begin() + static_cast<std::ptrdiff_t>(hit->second))->second =
+            number != nullptr ? jsonOfNumber(*number) : Json(std::get<std::string>(value));
+    }
+    return json;
+}
+
+/// With an error when the database cannot be read any more.
+Json jsonOf(ContentDatabase& database, ItemId id, const IndexedItem& item, Error* error) {
+    Json json;
+    json["id"] = id;
+    json["path"] = item.path;
+    json["earlierPaths"] = database.earlierPaths(id, error).value_or(std::vector<std::string>());
+    json["name"] = item.name;
+    json["title"] = item.title.empty() ? Json() : Json(item.title);
+    json["displayName"] = item.title.empty() ? item.name : item.title;
+    json["type"] = QVContentTaggingTypes::nameForFileType(item.fileType);
+    json["fileType"] = item.fileType;
+    json["subFileType"] = item.subFileType;
+    json["previewAvailable"] = item.previewAvailable;
+    json["taggings"] = Json::array();
+    for (const IndexedTagging& tagging : item.taggings) json["taggings"].push_back(jsonOf(tagging));
+    json["keyValues"] = jsonOf(item.values);
+    json["packages"] = item.packs;
+    json["dependencies"] = Json::array();
+    for (const IndexedDependency& dependency : item.dependencies)
+        json["dependencies"].push_back({{"uuid", dependency.uuid}, {"path", dependency.path}});
+    return json;
+}
+
+std::string textOf(const IndexedTagging& tagging) {
+    return tagging.level ? fmt::format("{} {:.0f}%", tagging.label, *tagging.level * 100) : tagging.label;
+}
+
+std::optional<double> tempoOf(const IndexedItem& item) {
+    const auto hit = std::find_if(item.values.begin(), item.values.end(),
+                                  [](const IndexedValue& value) { return value.key == "Tempo"; });
+    const auto* tempo = hit == item.values.end() ? nullptr : std::get_if<double>(&hit->value);
+    return tempo == nullptr ? std::nullopt : std::optional(*tempo);
+}
+
+/// A heading a folder, below it a line an item: its name, title, tempo and tags.
+void printItems(const std::vector<const IndexedItem*>& items, const std::vector<std::string>& notes,
+                const Terminal& terminal) {
+    constexpr std::size_t widest = 40;
+    std::size_t width = 0;
+    for (const IndexedItem* item : items) width = std::max(width, displayWidth(printable(item->name)));
+    width = std::min(width, widest);
+    std::string folder;
+    for (std::size_t i = 0; i < items.size(); ++i) {
+        const std::string its = URL::fileURLWithPath(items[i]->path).URLByDeletingLastPathComponent().path();
+        if (its != folder)
+            print("{}{}\n", i == 0 ? "" : "\n", colored(terminal, Color::strong, printable(its)));
+        folder = its;
+        std::vector<Word> words;
+        if (!notes.empty()) words.push_back({notes[i], Color::strong});
+        if (!items[i]->title.empty())
+            words.push_back({fmt::format("\"{}\"", printable(items[i]->title)), Color::plain});
+        if (const auto tempo = tempoOf(*items[i]))
+            words.push_back({fmt::format("{:g} bpm", *tempo), Color::faint});
+        for (const IndexedTagging& tagging : items[i]->taggings)
+            words.push_back({printable(textOf(tagging)), tagging.level ? Color::accent : Color::plain});
+        print("  {}  {}\n", padded(printable(items[i]->name), width), wrapped(terminal, words, width + 4));
+    }
+}
+
+std::unique_ptr<ContentDatabase> opened(const Options& options, ToolContext& context) {
+    Error error;
+    auto database = ContentDatabase::open(options.database, &error);
+    if (!database) context.itemFailed(error.message);
+    if (database && database->isBeingIndexed())
+        context.note(fmt::format("{}: a run of `index` is going on; this is what it has stored so far",
+                                 printable(options.database)));
+    return database;
+}
+
+/// The query, or nothing after a message that points at the place.
+std::optional<Query> queryOf(const Options& options, ContentDatabase& database, ToolContext& context) {
+    Error error;
+    const auto vocabulary = database.vocabulary(&error);
+    if (!vocabulary) {
+        context.itemFailed(error.message);
+        return std::nullopt;
+    }
+    const std::string text = join(options.words, " ");
+    QueryError fault;
+    auto query = parseQuery(text, *vocabulary, &fault);
+    if (query) return query;
+    const std::string before = printable(std::string_view(text).substr(0, fault.position));
+    const std::string marked = printable(std::string_view(text).substr(fault.position, fault.length));
+    context.usageFailed(fmt::format("{}\n  {}\n  {}{}", fault.message, printable(text),
+                                    std::string(displayWidth(before), ' '),
+                                    std::string(std::max<std::size_t>(1, displayWidth(marked)), '^')));
+    return std::nullopt;
+}
+
+void searchItems(const Options& options, ToolContext& context) {
+    const auto database = opened(options, context);
+    const auto query = database ? queryOf(options, *database, context) : std::nullopt;
+    if (!query) return;
+    Error error;
+    const auto found = database->search(*query, options.limit, &error);
+    if (!found) return context.itemFailed(error.message);
+    if (context.format != Format::table) {
+        Json json = Json::array();
+        for (const Found& one : *found) json.push_back(jsonOf(*database, one.id, one.item, &error));
+        if (!error.message.empty()) return context.itemFailed(error.message);
+        return printJson(json, context.format);
+    }
+    std::vector<const IndexedItem*> items;
+    for (const Found& one : *found) items.push_back(&one.item);
+    printItems(items, {}, context.terminal());
+    const auto count = items.size() < options.limit ? std::optional(static_cast<std::int64_t>(items.size()))
+                                                    : database->count(*query, &error);
+    if (!count) return context.itemFailed(error.message);
+    context.note(fmt::format("{} found, {} shown", *count, items.size()));
+}
+
+void countTags(const Options& options, ToolContext& context) {
+    const auto database = opened(options, context);
+    const auto query = database ? queryOf(options, *database, context) : std::nullopt;
+    if (!query) return;
+    Error error;
+    const auto found = database->facets(*query, &error);
+    if (!found) return context.itemFailed(error.message);
+    if (context.format != Format::table) {
+        Json json = Json::array();
+        for (const Facet& facet : *found)
+            json.push_back({{"label", facet.label}, {"category", facet.category}, {"count", facet.count}});
+        return printJson(json, context.format);
+    }
+    std::map<std::string, std::vector<const Facet*>> categories;
+    for (const Facet& facet : *found) categories[facet.category].push_back(&facet);
+    for (const auto& [category, tags] : categories) {
+        print("{}\n", colored(context.terminal(), Color::strong, printable(category)));
+        for (const Facet* facet : tags) print("  {:>9}  {}\n", facet->count, printable(facet->label));
+    }
+}
+
+void findSimilar(const Options& options, ToolContext& context) {
+    const auto database = opened(options, context);
+    if (!database) return;
+    Error error;
+    const auto found = database->similar(URL::fileURLWithPath(options.path).path(), options.limit, &error);
+    if (!found) return context.itemFailed(error.message);
+    if (context.format != Format::table) {
+        Json json = Json::array();
+        for (const Similar& one : *found) {
+            json.push_back(jsonOf(*database, one.id, one.item, &error));
+            json.back()["similarity"] = one.similarity;
+        }
+        if (!error.message.empty()) return context.itemFailed(error.message);
+        return printJson(json, context.format);
+    }
+    std::vector<const IndexedItem*> items;
+    std::vector<std::string> notes;
+    for (const Similar& one : *found) {
+        items.push_back(&one.item);
+        notes.push_back(fmt::format("{:3.0f}%", one.similarity * 100));
+    }
+    printItems(items, notes, context.terminal());
+}
+
+CLI::App* addCommand(CLI::App& app, const char* name, const char* what,
+                     const std::shared_ptr<Options>& options, ToolContext& context,
+                     void (*run)(const Options&, ToolContext&)) {
+    auto* command = app.add_subcommand(name, what);
+    command->add_option("--db", options->database, "The database")->required()->type_name("FILE");
+    command->callback([options, &context, run] { run(*options, context); });
+    return command;
+}
+
+}  // namespace
+
+void addSearchCommands(CLI::App& app, ToolContext& context) {
+    const auto options = std::make_shared<Options>();
+    const auto addLimit = [&options](CLI::App* command) {
+        command->add_option("--limit", options->limit, "Most items to show")
+            ->capture_default_str()
+            ->check(CLI::Validator(refuseNegative, ""));
+    };
+    auto* searching = addCommand(app, "search", "Finds items in a database", options, context, searchItems);
+    searching->add_option("query", options->words, "What to find; a query that begins with - goes behind --");
+    addLimit(searching);
+    searching->footer(
+        "Example:\n  qvtag search 'kick genre:House bpm:118..124 -type:loop bpm+' --db loops.db");
+
+    auto* counting =
+        addCommand(app, "facets", "Counts the tags of what a query finds", options, context, countTags);
+    counting->add_option("query", options->words, "What to find; everything if left out");
+    counting->footer("Example:\n  qvtag facets 'type:loop bpm:90..100' --db loops.db");
+
+    auto* nearing =
+        addCommand(app, "similar", "Finds the items nearest to one", options, context, findSimilar);
+    nearing->add_option("path", options->path, "The item, which must be in the database")
+        ->required()
+        ->type_name("PATH");
+    addLimit(nearing);
+    nearing->footer("Example:\n  qvtag similar 'Loops/Dusty Kick.wav' --db loops.db --limit 10");
+}
+
+}  // namespace qvct::tool

@@ -1,0 +1,255 @@
+#include "CommandLine.h"
+#include "TaggingEdit.h"
+#include "Verification.h"
+#include "commands/Commands.h"
+#include "formats/TGRTFileNode.h"
+#include "formats/bundle/TGRTBundleTypeValidators.h"
+#include "formats/settings/TGRTBinaryFileMetaDataReader.h"
+#include "output/StandardStreams.h"
+#include "platform/files/EditLock.h"
+#include "platform/files/FileAccess.h"
+#include "platform/text/Text.h"
+
+#include <algorithm>
+#include <filesystem>
+#include <memory>
+#include <optional>
+
+#include <CLI/CLI.hpp>
+#include <fmt/format.h>
+
+namespace qvct::tool {
+namespace {
+
+struct Options {
+    std::vector<std::string> paths;
+    LinksOutside links = LinksOutside::none;
+    std::vector<std::string> add;
+    std::vector<std::string> remove;
+    std::optional<std::string> name;
+    bool creates = false;
+    bool isDryRun = false;
+    bool verifies = false;
+    bool keepsTimes = false;
+};
+
+/// What a write does, or did, to one item.
+struct Change {
+    URL url;
+    std::shared_ptr<TGRTMetaData> record = {};  // as it is to be
+    ObjectSet<TGRTTagging> added = {};
+    ObjectSet<TGRTTagging> removed = {};
+    std::string oldName = {};
+    std::optional<std::string> newName = {};
+    bool isWritten = false;
+    FileStamp former = {};                          // of the file that holds the record, when that was read
+    std::optional<Verification> verification = {};  // of what was written
+    std::vector<std::string> faults = {};           // that it found
+
+    bool isNone() const { return added.empty() && removed.empty() && !newName; }
+};
+
+/// Why nothing can be written to an item of a kind that is none of those with writers.
+std::string reasonNotWritten(const URL& url) {
+    const std::string path = printable(url.path());
+    if (TGRTBinaryFileMetaDataReader::supportsFileExtension(url.pathExtension()))
+        return path + ": data files are never written";
+    Error error;
+    TGRTFileNode::nodeWithFileURL(url)->readMetaDataWithOptions(0, &error);
+    if (!error.message.empty()) return error.message;
+    const URL folder = url.URLByDeletingLastPathComponent();
+    return TGRTPatchTypeValidator().isValidContentTypeAtFileURL(folder)
+               ? fmt::format("{}: belongs to the patch it lies in, {}", path, printable(folder.path()))
+               : path + ": cannot be written";
+}
+
+std::optional<Change> changeOfItem(const URL& url, const TaggingEdit& edit, const Options& options,
+                                   ToolContext& context) {
+    const auto node = TGRTFileNode::nodeWithFileURL(url);
+    Error error;
+    Change change{.url = url};
+    if (!node->validator()) {
+        context.itemFailed(reasonNotWritten(url));
+        return std::nullopt;
+    }
+    change.record = node->readMetaDataWithOptions(0, &error);
+    if (!error.message.empty()) {
+        context.itemFailed(error.message);
+        return std::nullopt;
+    }
+    if (!change.record) change.record = TGRTMetaData::init();
+    const auto before = change.record->taggings();
+    change.record->setTaggings(edit.apply(before));
+    change.added = difference(change.record->taggings(), before);
+    change.removed = difference(before, change.record->taggings());
+    change.oldName = change.record->displayName().value_or("");
+    if (options.name && *options.name != change.oldName) {
+        change.newName = options.name;
+        change.record->setDisplayName(*options.name);
+    }
+    return change;
+}
+
+/// A whole record stores the sub type that it holds: that of other tags must not stay in it.
+void updateSubType(const Change& change) {
+    const bool hasOtherTags = !change.added.empty() || !change.removed.empty();
+    const auto writer = std::dynamic_pointer_cast<TGRTBundleTaggingWriter>(
+        TGRTFileNode::nodeWithFileURL(change.url)->taggingWriterForFileURL(change.url));
+    if (hasOtherTags && writer)
+        change.record->setSubFileType(writer->subTypeFromTaggings(change.record->taggings()));
+}
+
+bool write(const Change& change, const Options& options, Error* error) {
+    const ContentWriteOptions how{.keepsTimes = options.keepsTimes,
+                                  .verifies = options.verifies,
+                                  .isDryRun = options.isDryRun,
+                                  .expected = change.former};
+    const auto node = TGRTFileNode::nodeWithFileURL(change.url);
+    if (change.newName) {
+        updateSubType(change);
+        const auto writer = node->metaDataWriterForFileURL(change.url);
+        return writer && writer->writeMetaData(change.record, change.url, error, how);
+    }
+    const auto writer = node->taggingWriterForFileURL(change.url);
+    return writer && writer->writeTaggings(change.record->taggings(), change.url, error, how);
+}
+
+/// Whether the item was written, or in a dry run would be; what a verification finds afterwards is reported
+/// here.
+bool carryOut(Change& change, const Options& options, ToolContext& context, Error* error) {
+    if (options.verifies) {
+        change.verification = Verification::before(change.url, error);
+        if (!change.verification) return false;
+    }
+    const bool isDone = write(change, options, error);
+    if (options.isDryRun) change.verification.reset();
+    change.isWritten = isDone && !options.isDryRun;
+    if (!isDone || !change.verification) return isDone;
+    change.faults = change.verification->faultsAfterWriting(*change.record);
+    for (const std::string& fault : change.faults)
+        context.itemFailed(fmt::format("{}: {}", printable(change.url.path()), fault));
+    return true;
+}
+
+/// Whether the record beside or in an item is a link to elsewhere, which would be written to in its place.
+bool leadsAway(const std::string& record, const URL& url) {
+    if (record == url.path()) return false;  // an item that is a link itself was decided on by the walk
+    std::error_code reason;                  // told by the write, which fails for it
+    if (std::filesystem::status(record, reason).type() == std::filesystem::file_type::none) return false;
+    const URL folder = isDirectory(url.path()) ? url : url.URLByDeletingLastPathComponent();
+    return !LinkRule(folder.path(), LinksOutside::none).follows(record, false);
+}
+
+/// Reads, changes and writes an item in its turn; once more when another program saves it meanwhile.
+std::optional<Change> editItem(const URL& url, const TaggingEdit& edit, const Options& options,
+                               ToolContext& context) {
+    Error error;
+    const auto turn = EditLock::acquire(url.path(), &error);
+    const std::string record = TGRTFileNode::nodeWithFileURL(url)->recordURL().path();
+    if (options.links != LinksOutside::all && leadsAway(record, url)) {
+        context.itemFailed(fmt::format("{}: leads out of its folder, and is written to only with --follow",
+                                       printable(record)));
+        return std::nullopt;
+    }
+    constexpr int kAttempts = 10;
+    for (int attempt = 0; turn && attempt < kAttempts; ++attempt) {
+        const FileStamp former = FileStamp::ofFile(record);
+        auto change = changeOfItem(url, edit, options, context);
+        if (!change || change->isNone()) return change;
+        change->former = former;
+        error = {};
+        if (carryOut(*change, options, context, &error)) return change;
+        if (FileStamp::ofFile(record) == former) break;
+    }
+    context.itemFailed(error.message.empty() ? printable(url.path()) + ": cannot be written" : error.message);
+    return std::nullopt;
+}
+
+Json jsonOfTaggings(const ObjectSet<TGRTTagging>& taggings) {
+    Json json = Json::array();
+    for (const auto& tagging : sortedTaggings(taggings)) json.push_back(jsonOfTagging(*tagging));
+    return json;
+}
+
+Json jsonOfChange(const Change& change) {
+    Json json;
+    json["path"] = change.url.path();
+    json["written"] = change.isWritten;
+    json["added"] = jsonOfTaggings(change.added);
+    json["removed"] = jsonOfTaggings(change.removed);
+    json["name"] = change.newName ? Json{{"from", change.oldName}, {"to", *change.newName}} : Json();
+    if (!change.verification) {
+        json["verified"] = nullptr;
+        return json;
+    }
+    json["verified"] = change.verification->summary();
+    json["verified"]["faults"] = change.faults;
+    return json;
+}
+
+void printChange(const Change& change, const Terminal& terminal) {
+    print("{}\n", colored(terminal, Color::strong, printable(change.url.path())));
+    for (const auto& tagging : sortedTaggings(change.removed))
+        print("  - {}/{}\n", printable(tagging->category()), textOfTagging(*tagging));
+    for (const auto& tagging : sortedTaggings(change.added))
+        print("  + {}/{}\n", printable(tagging->category()), textOfTagging(*tagging));
+    if (change.newName)
+        print("  name \"{}\" becomes \"{}\"\n", printable(change.oldName), printable(*change.newName));
+    if (change.isNone()) print("  {}\n", colored(terminal, Color::faint, "nothing to change"));
+    if (change.verification)
+        print("  {}\n", colored(terminal, Color::faint, change.verification->description()));
+}
+
+void run(const Options& options, ToolContext& context) {
+    const auto edit = TaggingEdit::make(options.add, options.remove, options.creates, context);
+    if (!edit) return;
+    if (edit->isEmpty() && !options.name)
+        return context.usageFailed("nothing to write: --add, --remove or --name");
+    if (options.name && !isValidUtf8(*options.name))
+        return context.usageFailed(fmt::format("the name \"{}\" is not UTF-8", printable(*options.name)));
+    Json json = Json::array();
+    std::size_t written = 0;
+    std::size_t unchanged = 0;
+    for (const URL& url : context.contentItems(options.paths, options.links)) {
+        const auto change = editItem(url, *edit, options, context);
+        if (!change) continue;
+        unchanged += change->isNone() ? 1 : 0;
+        written += change->isWritten ? 1 : 0;
+        if (context.format == Format::table) {
+            printChange(*change, context.terminal());
+        } else {
+            json.push_back(jsonOfChange(*change));
+        }
+    }
+    if (context.format != Format::table) return printJson(json, context.format);
+    context.note(options.isDryRun ? std::string("nothing was written: this is a dry run")
+                                  : fmt::format("{} items written, {} unchanged", written, unchanged));
+}
+
+}  // namespace
+
+void addWriteCommand(CLI::App& app, ToolContext& context) {
+    const auto options = std::make_shared<Options>();
+    auto* command = app.add_subcommand("write", "Changes the tags and the name that items store");
+    command->add_option("paths", options->paths, "Files and folders")->required()->type_name("PATH");
+    addFollowOption(*command, options->links);
+    command
+        ->add_option("--add", options->add, "Tag to add, or to give another level (0 to 1, or a percentage)")
+        ->type_name("CATEGORY/LABEL[=LEVEL]")
+        ->allow_extra_args(false);
+    command->add_option("--remove", options->remove, "Tag to remove, whatever its level")
+        ->type_name("CATEGORY/LABEL")
+        ->allow_extra_args(false);
+    command->add_option("--name", options->name, "Display name")->type_name("NAME");
+    command->add_flag("--create", options->creates, "Also add tags that the taxonomy does not know");
+    command->add_flag("--dry-run", options->isDryRun, "Show what would change, and write nothing");
+    command->add_flag("--verify", options->verifies,
+                      "Compare audio and all that is not ours before and after, and read the record back");
+    command->add_flag("--keep-times", options->keepsTimes, "Files keep their times of access and change");
+    command->footer(
+        "The first \"/\" separates category and label: \"Sound Descriptors/Bright / Dark=25%\".\n"
+        "Example:\n  qvtag write --add Genres/House --add \"Source/Bass=0.5\" --dry-run Loops");
+    command->callback([options, &context] { run(*options, context); });
+}
+
+}  // namespace qvct::tool

@@ -1,0 +1,91 @@
+#pragma once
+
+#include "contentdb/Indexer.h"
+#include "contentdb/index/LibraryWalk.h"
+#include "contentdb/index/WorkerPool.h"
+#include "contentdb/store/StoreWriter.h"
+
+#include <chrono>
+#include <cstdint>
+#include <map>
+#include <memory>
+#include <optional>
+#include <set>
+#include <string>
+#include <unordered_map>
+#include <unordered_set>
+#include <vector>
+
+namespace qvct::contentdb {
+
+/// One run of the indexer over an open database. Throws DatabaseFailure.
+class IndexRun {
+  public:
+    IndexRun(const IndexOptions& options, Connection& connection, WorkerPool& workers);
+
+    /// False when the workers cannot be kept running.
+    bool walk(const std::string& folder);
+    bool finish();
+    const IndexProgress& progress() const { return progress_; }
+
+  private:
+    /// A folder some of whose items are still to be stored; then its digest can be.
+    struct OpenFolder {
+        std::string path;
+        std::uint64_t digest = 0;
+        std::int64_t gone = 0;
+        std::size_t remaining = 0;
+    };
+    struct Pending {
+        ItemId id = 0;
+        bool isNew = false;
+        std::shared_ptr<OpenFolder> folder;
+    };
+
+    bool visit(const std::string& path, const std::vector<ListedItem>& items);
+    std::vector<ListedItem> itemsOfPart(const std::string& path, const std::vector<ListedItem>& items) const;
+    bool submitChanged(const std::shared_ptr<OpenFolder>& folder, std::int64_t folderId,
+                       const std::vector<ListedItem>& items);
+    bool submit(const ListedItem& item, ItemId id, const std::shared_ptr<OpenFolder>& folder);
+    void stopIfCancelled();
+    bool collect();
+    void store(std::vector<Described>& batch);
+    void storeOne(const Described& described, Pending& pending);
+    void storeFolder(const OpenFolder& folder);
+    void flush();
+    void flushIfDue();
+    void prune();
+    void pruneUnvisited(const std::string& root);
+    void pruneFolder(const FolderRecord& folder, const std::string& path);
+    void removeIfGone(ItemId id);
+    bool isSpared(std::string_view path);
+    std::optional<std::string> otherPathOf(const std::string& folder);
+    void report();
+
+    const IndexOptions& options_;
+    const Part part_;
+    WorkerPool& workers_;
+    StoreWriter writer_;
+    IndexProgress progress_;
+    ItemId nextId_;
+    bool isNewDatabase_;
+    bool isStopped_ = false;
+    bool areWorkersInOrder_ = true;
+    std::uint64_t lastTicket_ = 0;
+    std::unordered_map<std::uint64_t, Pending> pending_;
+    std::vector<Described> batch_;
+    std::size_t termsInBatch_ = 0;
+    std::vector<std::shared_ptr<OpenFolder>> complete_;  // to be stored with the batch
+    std::uint64_t listed_ = 0;                           // in the root at which the walk is, of all parts
+    std::vector<std::string> roots_;
+    std::map<std::string, std::uint64_t, std::less<>> bareRoots_;  // nothing is there; how much is missing
+    std::unordered_set<std::string> shown_;                        // folders, by path
+    std::unordered_set<std::int64_t> visited_;                     // folders, by number
+    std::map<std::pair<std::uint64_t, std::uint64_t>, std::string> shownByInode_;  // made when asked
+    std::set<std::string, std::less<>> unreadable_;
+    std::set<ItemId> missing_;  // of the folders that were visited
+    std::chrono::steady_clock::time_point lastFlush_;
+    std::chrono::steady_clock::time_point lastReport_;
+};
+
+}  // namespace qvct::contentdb

@@ -1,0 +1,79 @@
+#pragma once
+
+#include "contentdb/IndexedItem.h"
+#include "contentdb/SearchResults.h"
+#include "contentdb/store/IdSet.h"
+#include "contentdb/store/Schema.h"
+#include "contentdb/store/Sqlite.h"
+
+#include <cstdint>
+#include <functional>
+#include <memory>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace qvct::contentdb {
+
+using TermId = std::int64_t;
+
+/// Entry of the index: one term, one chunk of items.
+constexpr std::int64_t postingKey(TermId term, std::int64_t chunk) {
+    return term << kChunkBits | chunk;
+}
+/// More items than this cannot be numbered.
+inline constexpr ItemId kLastItemId = (ItemId{1} << (2 * kChunkBits)) - 1;
+
+/// Reads items and index entries. Every operation throws DatabaseFailure.
+class ContentStore {
+  public:
+    explicit ContentStore(Connection& connection);
+
+    std::optional<IndexedItem> item(ItemId id);
+    std::optional<ItemId> idOfPath(std::string_view path);
+    /// Where the item was before, in the order of bytes.
+    std::vector<std::string> earlierPaths(ItemId id);
+    ItemId lastId();
+    std::int64_t countOfItems();
+    std::int64_t countOfFailures();
+    /// What described the items, see IndexOptions; 0 when that is not known.
+    std::uint64_t describer();
+    /// Paths and reasons, in the order of items, until `visit` answers false.
+    void forEachFailure(const std::function<bool(const IndexedItem&)>& visit);
+
+    struct Tag {
+        TermId term;
+        std::string label;
+        std::string category;
+    };
+    std::vector<Tag> tags();
+    /// Categories, or fields of numbers, that some item has had.
+    std::vector<std::string> fields(bool ofNumbers);
+
+    std::optional<TermId> term(std::string_view value);
+    /// Calls `visit` for the terms that begin with `start` and are below `end`, in order.
+    void forEachTerm(std::string_view start, std::string_view end,
+                     const std::function<void(TermId, std::string_view)>& visit);
+    /// Adds the items of the chunk that have the term.
+    void addPosting(TermId term, std::int64_t chunk, IdSet& ids);
+
+    Connection& connection() { return connection_; }
+
+  private:
+    Connection& connection_;
+    Statement item_;
+    Statement idOfPath_;
+    Statement term_;
+    Statement terms_;
+    Statement posting_;
+};
+
+/// Folder and file name of a path.
+struct Place {
+    std::string_view folder;
+    std::string_view file;
+};
+Place placeOf(std::string_view path);
+
+}  // namespace qvct::contentdb

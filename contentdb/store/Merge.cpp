@@ -1,0 +1,112 @@
+#include "contentdb/store/Merge.h"
+
+#include "contentdb/store/Reading.h"
+#include "contentdb/store/Schema.h"
+#include "contentdb/store/StoreWriter.h"
+#include "contentdb/terms/Terms.h"
+
+#include <algorithm>
+#include <map>
+#include <memory>
+#include <set>
+
+namespace qvct::contentdb {
+namespace {
+
+constexpr std::size_t kBatch = 8192;
+
+/// Folders in the order of a walk: a folder before what is in it, and siblings by name, so that "/" comes
+/// before every other byte.
+struct WalkOrder {
+    bool operator()(const std::string& a, const std::string& b) const {
+        return std::lexicographical_compare(a.begin(), a.end(), b.begin(), b.end(),
+                                            [](char left, char right) { return rank(left) < rank(right); });
+    }
+    static int rank(char c) { return c == '/' ? 0 : static_cast<unsigned char>(c); }
+};
+
+struct Source {
+    std::unique_ptr<Connection> connection;
+    std::unique_ptr<StoreWriter> reader;
+};
+
+class Merge {
+  public:
+    Merge(const std::vector<std::string>& databases, const std::string& target)
+        : connection_(openDatabase(target, Access::write)), writer_(*connection_) {
+        for (const std::string& database : databases) {
+            auto connection = openToRead(database);
+            connection->run("BEGIN");  // all of it in one state, whatever a run writes meanwhile
+            auto reader = std::make_unique<StoreWriter>(*connection);
+            sources_.push_back({std::move(connection), std::move(reader)});
+        }
+    }
+
+    void run() {
+        writer_.setDescriber(describer());
+        writer_.begin();
+        for (const auto& [path, parts] : folders()) addFolder(parts);
+        writer_.commit();
+        connection_->emptyLog();
+    }
+
+  private:
+    struct Part {
+        std::size_t source;
+        std::int64_t folder;
+    };
+    using Folders = std::map<std::string, std::vector<Part>, WalkOrder>;
+
+    /// Of all the sources; 0 when they differ, so that the next run reads everything again.
+    std::uint64_t describer() {
+        std::set<std::uint64_t> describers;
+        for (const Source& source : sources_) describers.insert(source.reader->store().describer());
+        return describers.size() == 1 ? *describers.begin() : 0;
+    }
+
+    Folders folders() {
+        Folders folders;
+        for (std::size_t i = 0; i < sources_.size(); ++i) {
+            sources_[i].reader->forEachFolder("/", [&](const FolderRecord& folder, std::string_view path) {
+                folders[std::string(path)].push_back({i, folder.id});
+            });
+        }
+        return folders;
+    }
+
+    /// The items of one folder by name, each from the first source that has it. The folder's digest is left
+    /// open: the next run looks at the folder once and then knows it.
+    void addFolder(const std::vector<Part>& parts) {
+        std::map<std::string, std::pair<std::size_t, ItemId>> items;
+        for (const Part& part : parts) {
+            for (const auto& [name, file] : sources_[part.source].reader->files(part.folder))
+                items.try_emplace(name, part.source, file.id);
+        }
+        for (const auto& [name, place] : items) {
+            ContentStore& store = sources_[place.first].reader->store();
+            const auto item = store.item(place.second);
+            if (!item) continue;
+            writer_.put(++lastId_, *item, termsOf(*item));
+            for (const std::string& path : store.earlierPaths(place.second))
+                writer_.addEarlierPath(lastId_, path);
+            if (++inBatch_ < kBatch) continue;
+            inBatch_ = 0;
+            writer_.commit();
+            writer_.begin();
+        }
+    }
+
+    std::unique_ptr<Connection> connection_;
+    StoreWriter writer_;
+    std::vector<Source> sources_;
+    ItemId lastId_ = 0;
+    std::size_t inBatch_ = 0;
+};
+
+}  // namespace
+
+void mergeInto(const std::string& target, const std::vector<std::string>& databases) {
+    Merge(databases, target).run();
+}
+
+}  // namespace qvct::contentdb

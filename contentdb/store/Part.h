@@ -1,0 +1,21 @@
+#pragma once
+
+#include "contentdb/store/Paths.h"
+#include "platform/base/Object.h"
+
+#include <string_view>
+
+namespace qvct::contentdb {
+
+/// Which share of the items a run takes, from 1; by the path, so that all runs agree.
+struct Part {
+    unsigned number = 1;
+    unsigned count = 1;
+
+    bool holds(std::string_view folder, std::string_view name) const {
+        return count <= 1 || stringHash(pathIn(folder, name)) % count == number - 1;
+    }
+    bool operator==(const Part&) const = default;
+};
+
+}  // namespace qvct::contentdb

@@ -1,0 +1,56 @@
+#include "contentdb/store/Reading.h"
+
+#include "contentdb/store/DatabaseFiles.h"
+#include "contentdb/store/RunLock.h"
+#include "contentdb/store/Schema.h"
+#include "platform/files/FileAccess.h"
+#include "platform/text/Text.h"
+
+#include <chrono>
+#include <thread>
+
+#include <fmt/format.h>
+
+namespace qvct::contentdb {
+namespace {
+
+constexpr std::chrono::seconds kPatience{10};
+constexpr std::chrono::milliseconds kPause{20};
+
+/// Nothing where a run that goes on has yet to put something.
+std::unique_ptr<Connection> openUnlessEmpty(const std::string& path) {
+    if (!fileExists(path)) return nullptr;
+    auto connection = openDatabase(path, Access::read);
+    return connection->number("SELECT EXISTS (SELECT 1 FROM item)") != 0 ? std::move(connection) : nullptr;
+}
+
+void finishRebuild(const std::string& path) {
+    Error error;
+    if (!isRebuilt(path)) return;
+    const auto lock = RunLock::acquire(path, &error);
+    if (!lock) throw DatabaseFailure(kErrorUnwritable, error.message);
+    if (isRebuilt(path)) putAside(path);
+}
+
+}  // namespace
+
+std::unique_ptr<Connection> openToRead(const std::string& name) {
+    const std::string path = pathOfDatabase(name);
+    const auto end = std::chrono::steady_clock::now() + kPatience;
+    // Asked before the database is looked at: all that a run has stored is there when it has ended.
+    while (RunLock::isHeld(path)) {
+        if (auto connection = openUnlessEmpty(path)) return connection;
+        if (std::chrono::steady_clock::now() > end) {
+            throw DatabaseFailure(
+                kErrorUnreadable,
+                fmt::format("{}: is being made, and nothing is in it yet; try again when the "
+                            "run of `index` has stored something",
+                            printable(path)));
+        }
+        std::this_thread::sleep_for(kPause);
+    }
+    finishRebuild(path);
+    return openDatabase(path, Access::read);
+}
+
+}  // namespace qvct::contentdb

@@ -1,0 +1,94 @@
+#include "contentdb/store/StoreCheck.h"
+
+#include "contentdb/store/FolderDigest.h"
+#include "contentdb/store/Part.h"
+#include "contentdb/terms/Terms.h"
+#include "platform/text/Text.h"
+
+#include <deque>
+#include <optional>
+#include <vector>
+
+#include <fmt/format.h>
+
+namespace qvct::contentdb {
+namespace {
+
+/// A number for a set of (entry, item) pairs that does not depend on their order.
+class Tally {
+  public:
+    void add(std::int64_t key, std::uint16_t id) {
+        std::uint64_t state = static_cast<std::uint64_t>(key) * 0x9e3779b97f4a7c15U + id;
+        state = (state ^ state >> 31U) * 0xbf58476d1ce4e5b9U;
+        sum_ += state ^ state >> 29U;
+        ++count_;
+    }
+    bool operator==(const Tally&) const = default;
+
+  private:
+    std::uint64_t sum_ = 0;
+    std::uint64_t count_ = 0;
+};
+
+/// The folder that does not hold what it is passed over for: its digest speaks of other items than it has.
+std::optional<std::string> misjudgedFolder(Connection& connection) {
+    Statement folder(connection,
+                     "SELECT id, path, digest, part, parts FROM folder WHERE digest <> 0 AND gone = 0");
+    Statement items(connection,
+                    "SELECT file, size, modified, changed, inode FROM item WHERE folder = ? ORDER BY file");
+    while (folder.step()) {
+        const std::string path(folder.bytes(1));
+        const Part part{static_cast<unsigned>(folder.integer(3)), static_cast<unsigned>(folder.integer(4))};
+        std::deque<std::string> names;
+        std::vector<ListedItem> listed;
+        for (items.bind(1, folder.integer(0)); items.step();) {
+            if (!part.holds(path, items.bytes(0))) continue;
+            names.emplace_back(items.bytes(0));
+            listed.push_back(
+                {names.back(),
+                 {items.unsignedInteger(1), items.integer(2), items.integer(3), items.unsignedInteger(4)}});
+        }
+        items.reset();
+        if (digestOf(listed) != folder.unsignedInteger(2)) return path;
+    }
+    return std::nullopt;
+}
+
+}  // namespace
+
+void checkStore(ContentStore& store) {
+    Connection& connection = store.connection();
+    const auto damaged = [&connection](std::string_view what) {
+        throw DatabaseFailure(kErrorMalformed, fmt::format("{}: the database is damaged: {}",
+                                                           printable(connection.path()), what));
+    };
+    const std::string verdict = connection.text("PRAGMA integrity_check(1)");
+    // Of several lines the last one says what is wrong, and where.
+    if (verdict != "ok")
+        damaged(fmt::format("its pages do not fit together ({})", verdict.substr(verdict.rfind('\n') + 1)));
+    Tally said;
+    for (ItemId id = 1, last = store.lastId(); id <= last; ++id) {
+        const auto its = store.item(id);
+        if (!its) continue;
+        for (const std::string& value : termsOf(*its)) {
+            const auto known = store.term(value);
+            if (!known) damaged(fmt::format("a term of {} is missing", printable(its->path)));
+            said.add(postingKey(*known, id >> kChunkBits), static_cast<std::uint16_t>(id & (kChunkSize - 1)));
+        }
+    }
+    Tally indexed;
+    Statement postings(connection, "SELECT key, ids FROM posting");
+    while (postings.step()) {
+        IdSet ids;
+        if (!ids.insertEncoded(postings.bytes(1))) damaged("an index entry");
+        ids.forEach([&](std::uint16_t id) {
+            indexed.add(postings.integer(0), id);
+            return true;
+        });
+    }
+    if (!(said == indexed)) damaged("the index does not say what the items say");
+    if (const auto folder = misjudgedFolder(connection))
+        damaged(fmt::format("{} does not hold the items that it is known by", printable(*folder)));
+}
+
+}  // namespace qvct::contentdb

@@ -1,0 +1,101 @@
+#pragma once
+
+#include "contentdb/store/ContentStore.h"
+#include "contentdb/store/Part.h"
+
+#include <cstdint>
+#include <map>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <unordered_map>
+#include <unordered_set>
+#include <vector>
+
+namespace qvct::contentdb {
+
+/// What the index remembers of a folder.
+struct FolderRecord {
+    std::int64_t id = 0;
+    std::uint64_t digest = 0;
+    std::int64_t gone = 0;
+    /// The share of its items that the digest speaks for.
+    Part part = {};
+};
+
+/// What the index remembers of a file in a folder.
+struct FileRecord {
+    ItemId id = 0;
+    FileStamp stamp;
+    bool hasFailed = false;
+};
+
+/// Whether no item lies at the path any more. What only cannot be looked at is not gone, nor what lies behind
+/// a link that leads nowhere at the moment: a disk may be away.
+bool isGone(const std::string& path);
+
+/// Changes items and the index in batches: what lies between `begin` and `commit` is written whole or not at
+/// all. Every operation throws DatabaseFailure; a writer that has thrown is of no more use.
+class StoreWriter {
+  public:
+    explicit StoreWriter(Connection& connection);
+    ~StoreWriter();
+
+    void begin();
+    void commit();
+
+    /// Stores the item under `id`, new or known; it replaces another that is in its place. `terms` are its
+    /// terms, sorted (see termsOf).
+    void put(ItemId id, const IndexedItem& item, const std::vector<std::string>& terms);
+    void remove(ItemId id);
+    /// A known item of the same payload whose file is no longer there: the same item, moved.
+    std::optional<ItemId> idOfMoved(const IndexedItem& item);
+    void addEarlierPath(ItemId id, std::string_view path);
+
+    /// Notes what describes items from now on. What another has described counts as changed. A batch of its
+    /// own.
+    void setDescriber(std::uint64_t describer);
+
+    FolderRecord folder(std::string_view path);
+    std::map<std::string, FileRecord, std::less<>> files(std::int64_t folder);
+    /// A folder that items have left since this writer was made keeps its digest open.
+    void setFolder(FolderRecord folder);
+    /// Calls `visit` for every folder at or below the path.
+    void forEachFolder(std::string_view path,
+                       const std::function<void(const FolderRecord&, std::string_view)>& visit);
+
+    ContentStore& store() { return store_; }
+
+  private:
+    struct Change {
+        std::int64_t key;
+        std::uint16_t id;
+        bool isAdded;
+    };
+
+    std::int64_t folderId(std::string_view path);
+    void leave(std::string_view path);
+    TermId termId(const std::string& value);
+    void noteNames(const IndexedItem& item);
+    void change(ItemId id, const std::string& term, bool isAdded);
+    void flushPostings();
+
+    ContentStore store_;
+    std::optional<Transaction> transaction_;
+    std::vector<Change> changes_;
+    std::unordered_map<std::string, TermId> termIds_;
+    std::unordered_set<std::string> names_;  // tags and fields known to be listed
+    std::string lastFolder_;
+    std::int64_t lastFolderId_ = 0;
+    std::unordered_set<std::int64_t> left_;  // folders that had items which now are elsewhere, or nowhere
+    Statement put_;
+    Statement putTerm_;
+    Statement putPosting_;
+    Statement dropPosting_;
+    Statement sameFiles_;
+    Statement samePayloads_;
+    Statement folder_;
+    Statement putFolder_;
+};
+
+}  // namespace qvct::contentdb

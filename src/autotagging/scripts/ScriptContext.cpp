@@ -1,0 +1,398 @@
+#include "autotagging/scripts/ScriptContext.h"
+
+#include "autotagging/scripts/RegularExpressionGuard.h"
+#include "autotagging/scripts/ScriptGuard.h"
+#include "autotagging/scripts/ScriptValues.h"
+#include "autotagging/xml/QVCTXMLDocument.h"
+#include "autotagging/xml/XPathDeadline.h"
+#include "platform/base/HardLimit.h"
+#include "platform/base/Log.h"
+#include "platform/text/Text.h"
+
+#include <string>
+#include <unordered_map>
+#include <utility>
+
+#include <fmt/format.h>
+
+// Exported by the engine, but not declared in its headers.
+extern "C" {
+using JSShouldTerminateCallback = bool (*)(JSContextRef, void*);
+void JSContextGroupSetExecutionTimeLimit(JSContextGroupRef, double seconds, JSShouldTerminateCallback, void*);
+void JSContextGroupClearExecutionTimeLimit(JSContextGroupRef);
+void JSGlobalContextSetEvalEnabled(JSGlobalContextRef, bool isEnabled, JSStringRef message);
+JSObjectRef JSGetMemoryUsageStatistics(JSContextRef);
+}
+
+namespace qvct {
+namespace {
+
+using Clock = std::chrono::steady_clock;
+
+/// Seconds of work between two looks at the limits.
+constexpr double kSlice = 0.01;
+constexpr std::size_t kLongestMessage = 4096;
+/// What a script may use up beyond its limits before the process ends, where that is allowed.
+constexpr std::chrono::milliseconds kHardTime{1000};
+constexpr std::size_t kHardMemory = std::size_t{64} << 20;
+
+/// The virtual machine of a thread, which its contexts share.
+class ContextGroup {
+  public:
+    ContextGroup() : group_(JSContextGroupCreate()) {}
+    ContextGroup(const ContextGroup&) = delete;
+    ContextGroup& operator=(const ContextGroup&) = delete;
+    ~ContextGroup() { JSContextGroupRelease(group_); }
+    JSContextGroupRef reference() const { return group_; }
+
+  private:
+    JSContextGroupRef group_;
+};
+
+std::shared_ptr<ContextGroup>& groupOfThisThread() {
+    thread_local std::shared_ptr<ContextGroup> group;
+    return group;
+}
+
+std::shared_ptr<ContextGroup> sharedGroup() {
+    std::shared_ptr<ContextGroup>& group = groupOfThisThread();
+    if (!group) group = std::make_shared<ContextGroup>();
+    return group;
+}
+
+std::u16string_view viewOf(JSStringRef string) {
+    return {reinterpret_cast<const char16_t*>(JSStringGetCharactersPtr(string)), JSStringGetLength(string)};
+}
+
+std::string argument(JSContextRef context, std::size_t count, const JSValueRef values[], std::size_t index,
+                     JSValueRef* exception) {
+    return textOf(context, index < count ? values[index] : JSValueMakeUndefined(context), exception);
+}
+
+JSValueRef valueOf(JSContextRef context, const std::optional<std::string>& text) {
+    return text ? JSValueMakeString(context, scriptString(*text).get()) : JSValueMakeNull(context);
+}
+
+void setProperty(JSContextRef context, JSObjectRef object, std::string_view name, JSValueRef value) {
+    JSObjectSetProperty(context, object, scriptString(name).get(), value, kJSPropertyAttributeNone, nullptr);
+}
+
+JSValueRef property(JSContextRef context, JSObjectRef object, std::string_view name, JSValueRef* exception) {
+    return JSObjectGetProperty(context, object, scriptString(name).get(), exception);
+}
+
+/// Writes the first letter of a word as an escape, wherever the word stands: in texts, expressions and names
+/// it stays the same, but no keyword may be written so. What follows a backslash is no keyword anyway.
+std::string withoutKeyword(std::string text, std::string_view word) {
+    const std::string escape = fmt::format("\\u{:04x}", static_cast<unsigned char>(word.front()));
+    for (std::size_t at = text.find(word); at != std::string::npos; at = text.find(word, at + 1)) {
+        if (at > 0 && text[at - 1] == '\\') continue;
+        text.replace(at, 1, escape);
+        at += escape.size();
+    }
+    return text;
+}
+
+/// A rule's text as the engine gets it: "async" and "import", which would go on after the script's end, are
+/// keywords no more.
+struct Prepared {
+    ScriptString text;
+    bool isOwn = false;
+};
+
+/// Kept for this thread, since the same rules are evaluated for each item.
+const Prepared& prepared(std::string_view script) {
+    constexpr std::size_t mostKept = 64;
+    thread_local std::unordered_map<std::string, Prepared> kept;
+    std::string key(script);
+    if (const auto hit = kept.find(key); hit != kept.end()) return hit->second;
+    if (kept.size() >= mostKept) kept.clear();
+    const std::string text = withoutKeyword(withoutKeyword(key, "async"), "import");
+    Prepared made{scriptString(text), isOwnScript(script)};
+    return kept.emplace(std::move(key), std::move(made)).first->second;
+}
+
+/// The engine's words, and why it does not know what every other engine does.
+std::string withReason(const std::string& problem, std::string_view script) {
+    const bool mayMissKeyword =
+        problem.starts_with("SyntaxError") &&
+        (script.find("async") != std::string_view::npos || script.find("import") != std::string_view::npos);
+    return mayMissKeyword ? problem + " (\"async\" and \"import\" are not available to rules)" : problem;
+}
+
+}  // namespace
+
+struct ScriptContext::Implementation {
+    enum class Stop { none, time, memory, unguarded };
+
+    ScriptLimits limits;
+    Clock::time_point deadline = Clock::now() + limits.time;
+    Stop stop = Stop::none;
+    int messages = 0;
+    const QVCTXMLDocument* document = nullptr;
+    std::shared_ptr<ContextGroup> group = sharedGroup();
+    JSGlobalContextRef context = JSGlobalContextCreateInGroup(group->reference(), nullptr);
+    bool isGuarded = false;
+    std::optional<HardLimit> hardLimit;  ///< For foreign scripts, until the context has gone.
+
+    explicit Implementation(const ScriptLimits& chosen) : limits(chosen) {
+        outer = std::exchange(current, this);
+        JSContextGroupSetExecutionTimeLimit(group->reference(), kSlice, shouldTerminate, this);
+    }
+    Implementation(const Implementation&) = delete;
+    Implementation& operator=(const Implementation&) = delete;
+
+    ~Implementation() {
+        JSContextGroupClearExecutionTimeLimit(group->reference());
+        current = outer;
+        JSGlobalContextRelease(context);
+        // A machine that was stopped may hold much memory: the thread's next context begins with a new one.
+        if (stop != Stop::none && groupOfThisThread() == group) groupOfThisThread().reset();
+    }
+
+    /// The context whose script calls back. Kept here and not in the global object, since the engine looks up
+    /// the variables of a global object with private data slowly.
+    static Implementation& running() { return *current; }
+
+    JSObjectRef global() const { return JSContextGetGlobalObject(context); }
+
+    void logException(JSValueRef thrown, std::string_view script = {}) {
+        if (stop == Stop::none && thrown != nullptr)
+            logProblem(withReason(textOf(context, thrown, nullptr), script));
+        if (stop != Stop::none) logStop();
+    }
+
+    static void logProblem(std::string_view text) {
+        log(fmt::format("JavaScript Exception: {}", text.substr(0, kLongestMessage)));
+    }
+
+    void logStop() {
+        if (std::exchange(isStopLogged, true)) return;
+        if (stop == Stop::time) {
+            logProblem(fmt::format("stopped after {} ms", limits.time.count()));
+        } else if (stop == Stop::memory) {
+            logProblem(fmt::format("stopped at more than {} MiB of memory", limits.memory >> 20U));
+        }
+    }
+
+    /// Runs `work`, which enters the machine, under the limits; false once one was reached.
+    template <typename Work>
+    bool run(Work work) {
+        if (stop != Stop::none) return false;
+        if (Clock::now() >= deadline) {
+            stop = Stop::time;
+        } else {
+            const XPathDeadline ofExpressions(deadline);
+            work();
+        }
+        if (stop != Stop::none) logStop();
+        return stop == Stop::none;
+    }
+
+    /// Asked by the machine once a slice is over. Must ask for the next slice itself, even when it says stop:
+    /// calls into the machine from our own functions may swallow the stopping.
+    static bool shouldTerminate(JSContextRef context, void* self) {
+        auto& implementation = *static_cast<Implementation*>(self);
+        if (Clock::now() >= implementation.deadline) {
+            implementation.stop = Stop::time;
+        } else if (memoryInUse(context) > static_cast<double>(implementation.limits.memory)) {
+            implementation.stop = Stop::memory;
+        }
+        JSContextGroupSetExecutionTimeLimit(implementation.group->reference(), kSlice, shouldTerminate, self);
+        return implementation.stop != Stop::none;
+    }
+
+    static double memoryInUse(JSContextRef context) {
+        const JSObjectRef statistics = JSGetMemoryUsageStatistics(context);
+        return JSValueToNumber(context, property(context, statistics, "heapCapacity", nullptr), nullptr);
+    }
+
+    void defineLog();
+    void guard();
+
+    static JSClassRef documentClass();
+    static JSValueRef logMessage(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
+                                 JSValueRef*);
+    static JSValueRef checkExpression(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
+                                      JSValueRef*);
+    static JSValueRef isMatchingXPath(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
+                                      JSValueRef*);
+    static JSValueRef jsonStringForXPath(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
+                                         JSValueRef*);
+    static JSValueRef jsonString(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
+                                 JSValueRef*);
+
+    bool isStopLogged = false;
+    Implementation* outer = nullptr;
+    static thread_local Implementation* current;
+};
+
+thread_local ScriptContext::Implementation* ScriptContext::Implementation::current = nullptr;
+
+JSClassRef ScriptContext::Implementation::documentClass() {
+    static const JSClassRef made = [] {
+        constexpr JSPropertyAttributes fixed = kJSPropertyAttributeReadOnly | kJSPropertyAttributeDontDelete;
+        static const JSStaticFunction functions[] = {{"isMatchingXPath", isMatchingXPath, fixed},
+                                                     {"JSONStringForXPath", jsonStringForXPath, fixed},
+                                                     {"JSONString", jsonString, fixed},
+                                                     {nullptr, nullptr, 0}};
+        JSClassDefinition definition = kJSClassDefinitionEmpty;
+        definition.className = "QVCTXMLDocument";
+        definition.staticFunctions = functions;
+        return JSClassCreate(&definition);
+    }();
+    return made;
+}
+
+/// `console` is an object of our own, since the engine's takes longer to make than most scripts run.
+void ScriptContext::Implementation::defineLog() {
+    const JSObjectRef logFunction = JSObjectMakeFunctionWithCallback(context, nullptr, logMessage);
+    const JSObjectRef console = JSObjectMake(context, nullptr, nullptr);
+    for (const char* name : {"log", "info", "warn", "error", "debug"}) {
+        setProperty(context, console, name, logFunction);
+    }
+    setProperty(context, global(), "console", console);
+    setProperty(context, global(), "__log", logFunction);
+}
+
+/// Puts what foreign scripts can reach under the guard. The library's own scripts run without it.
+void ScriptContext::Implementation::guard() {
+    if (std::exchange(isGuarded, true)) return;
+    hardLimit.emplace(limits.time + kHardTime, limits.memory + kHardMemory,
+                      LogScope::prefix() + "JavaScript");
+    thread_local const ScriptString program = scriptString(scriptGuard());
+    JSGlobalContextSetEvalEnabled(context, false, scriptString("not available to rules").get());
+    const JSValueRef function = JSEvaluateScript(context, program.get(), nullptr, nullptr, 1, nullptr);
+    const JSValueRef check = JSObjectMakeFunctionWithCallback(context, nullptr, checkExpression);
+    JSValueRef exception = nullptr;
+    const JSObjectRef callee = function != nullptr ? JSValueToObject(context, function, nullptr) : nullptr;
+    if (callee != nullptr) JSObjectCallAsFunction(context, callee, nullptr, 1, &check, &exception);
+    if (callee != nullptr && exception == nullptr) return;
+    logProblem("the guard of scripts does not run");
+    stop = Stop::unguarded;
+}
+
+JSValueRef ScriptContext::Implementation::logMessage(JSContextRef context, JSObjectRef /*function*/,
+                                                     JSObjectRef /*self*/, size_t count,
+                                                     const JSValueRef values[], JSValueRef* exception) {
+    const std::string message = argument(context, count, values, 0, exception);
+    const int number = ++running().messages;
+    if (number <= kMostScriptMessages) {
+        log(fmt::format("JavaScript: {}", std::string_view(message).substr(0, kLongestMessage)));
+    } else if (number == kMostScriptMessages + 1) {
+        log("JavaScript: (further messages of this script are dropped)");
+    }
+    return JSValueMakeUndefined(context);
+}
+
+JSValueRef ScriptContext::Implementation::checkExpression(JSContextRef context, JSObjectRef /*function*/,
+                                                          JSObjectRef /*self*/, size_t count,
+                                                          const JSValueRef values[], JSValueRef* exception) {
+    if (count < 4) return JSValueMakeUndefined(context);
+    const ScriptString pattern(JSValueToStringCopy(context, values[0], exception));
+    const ScriptString flags(JSValueToStringCopy(context, values[1], exception));
+    const ScriptString text(JSValueToStringCopy(context, values[2], exception));
+    const double last = JSValueToNumber(context, values[3], exception);
+    if (!pattern || !flags || !text) return JSValueMakeUndefined(context);
+    const std::size_t start = last > 0 && last < 1e9 ? static_cast<std::size_t>(last) : 0;
+    if (!isRegularExpressionBounded(viewOf(pattern.get()), viewOf(flags.get()), viewOf(text.get()), start,
+                                    running().deadline)) {
+        const std::string reason =
+            fmt::format("regular expression takes too long: /{}/", textOf(pattern.get()));
+        *exception = JSValueMakeString(context, scriptString(reason).get());
+    }
+    return JSValueMakeUndefined(context);
+}
+
+JSValueRef ScriptContext::Implementation::isMatchingXPath(JSContextRef context, JSObjectRef /*function*/,
+                                                          JSObjectRef /*self*/, size_t count,
+                                                          const JSValueRef values[], JSValueRef* exception) {
+    const std::string expression = argument(context, count, values, 0, exception);
+    return JSValueMakeBoolean(context, running().document->isMatchingXPath(expression));
+}
+
+JSValueRef ScriptContext::Implementation::jsonStringForXPath(JSContextRef context, JSObjectRef /*function*/,
+                                                             JSObjectRef /*self*/, size_t count,
+                                                             const JSValueRef values[],
+                                                             JSValueRef* exception) {
+    const std::string expression = argument(context, count, values, 0, exception);
+    return valueOf(context, running().document->JSONStringForXPath(expression));
+}
+
+JSValueRef ScriptContext::Implementation::jsonString(JSContextRef context, JSObjectRef /*function*/,
+                                                     JSObjectRef /*self*/, size_t /*count*/,
+                                                     const JSValueRef /*values*/[],
+                                                     JSValueRef* /*exception*/) {
+    return valueOf(context, running().document->JSONString());
+}
+
+ScriptContext::ScriptContext(std::unique_ptr<Implementation> implementation)
+    : implementation_(std::move(implementation)) {}
+ScriptContext::~ScriptContext() = default;
+
+std::shared_ptr<ScriptContext> ScriptContext::make(const ScriptLimits& limits) {
+    auto implementation = std::make_unique<Implementation>(limits);
+    implementation->defineLog();
+    return std::shared_ptr<ScriptContext>(new ScriptContext(std::move(implementation)));
+}
+
+void ScriptContext::exposeDocument(const QVCTXMLDocument& document) {
+    Implementation& self = *implementation_;
+    self.document = &document;
+    setProperty(self.context, self.global(), "document",
+                JSObjectMake(self.context, Implementation::documentClass(), nullptr));
+}
+
+bool ScriptContext::evaluate(std::string_view script) {
+    Implementation& self = *implementation_;
+    JSValueRef exception = nullptr;
+    const Prepared& program = prepared(script);
+    const bool ran = self.run([&] {
+        if (!program.isOwn) self.guard();
+        if (self.stop != Implementation::Stop::none) return;
+        JSEvaluateScript(self.context, program.text.get(), nullptr, nullptr, 1, &exception);
+        if (exception != nullptr) self.logException(exception, script);
+    });
+    return ran && exception == nullptr;
+}
+
+std::optional<PropertyList::Array> ScriptContext::callForArray(std::string_view function) {
+    Implementation& self = *implementation_;
+    std::optional<PropertyList::Array> result;
+    self.run([&] {
+        JSValueRef exception = nullptr;
+        const JSValueRef callee = property(self.context, self.global(), function, &exception);
+        if (exception == nullptr && (!JSValueIsObject(self.context, callee) ||
+                                     !JSObjectIsFunction(self.context, const_cast<JSObjectRef>(callee)))) {
+            return Implementation::logProblem(fmt::format("TypeError: {} is not a function", function));
+        }
+        const JSValueRef value = exception != nullptr
+                                     ? nullptr
+                                     : JSObjectCallAsFunction(self.context, const_cast<JSObjectRef>(callee),
+                                                              nullptr, 0, nullptr, &exception);
+        if (value == nullptr || exception != nullptr) return self.logException(exception);
+        if (JSValueIsUndefined(self.context, value) || JSValueIsNull(self.context, value)) return;
+        std::string problem;
+        result = arrayOf(self.context, value, problem);
+        if (!result && self.stop == Implementation::Stop::none) Implementation::logProblem(problem);
+    });
+    return isStopped() ? std::nullopt : std::move(result);
+}
+
+bool ScriptContext::isStopped() const {
+    return implementation_->stop != Implementation::Stop::none;
+}
+
+bool ScriptContext::checkSyntax(std::string_view script, Error* error) {
+    const auto context = make({});
+    const JSGlobalContextRef reference = context->implementation_->context;
+    JSValueRef exception = nullptr;
+    if (JSCheckScriptSyntax(reference, prepared(script).text.get(), nullptr, 1, &exception)) return true;
+    const JSValueRef line =
+        property(reference, JSValueToObject(reference, exception, nullptr), "line", nullptr);
+    return fail(error, kErrorMalformed,
+                fmt::format("script, line {}: {}", textOf(reference, line, nullptr),
+                            withReason(textOf(reference, exception, nullptr), script)));
+}
+
+}  // namespace qvct

@@ -1,0 +1,69 @@
+#pragma once
+
+#include "platform/base/Error.h"
+#include "platform/data/PropertyList.h"
+
+#include <chrono>
+#include <cstddef>
+#include <memory>
+#include <optional>
+#include <string_view>
+
+namespace qvct {
+
+class QVCTXMLDocument;
+
+/// What a script may use up. Time is that of the whole evaluation, checked about every ten milliseconds;
+/// memory is what the script's objects take, checked as often, so that one single operation can go beyond it.
+/// Processes that allow it (`HardLimit`) are ended when a script cannot be stopped otherwise.
+struct ScriptLimits {
+    std::chrono::milliseconds time{1000};
+    std::size_t memory = std::size_t{64} << 20;
+};
+
+/// Bounds on what a script returns: values in all, their nesting, bytes of text in all.
+inline constexpr std::size_t kMostScriptValues = 2000;
+inline constexpr int kDeepestScriptValue = 16;
+inline constexpr std::size_t kMostScriptText = std::size_t{1} << 20;
+/// Most lines that one evaluation writes to the log; those behind are dropped.
+inline constexpr int kMostScriptMessages = 100;
+
+/// A fresh global object in which one rule's script runs, with its limits.
+///
+/// Contexts of one thread share a virtual machine, which makes them cheap, and nothing that scripts can see.
+/// Faults are logged as "JavaScript Exception: ..."; after one the context goes on, after a limit was reached
+/// it does nothing any more. Use a context from the thread that made it, and one at a time.
+/// @cost  About a tenth of a millisecond for making one.
+class ScriptContext {
+  public:
+    /// With `console.log` and `__log` ("JavaScript: ..." in the log). The limits count from here.
+    static std::shared_ptr<ScriptContext> make(const ScriptLimits& limits);
+    ScriptContext(const ScriptContext&) = delete;
+    ScriptContext& operator=(const ScriptContext&) = delete;
+    ~ScriptContext();
+
+    /// Makes the document's three operations callable as the global `document`. It must outlive the context.
+    void exposeDocument(const QVCTXMLDocument& document);
+
+    /// Runs a program. Whether it ended without a fault.
+    bool evaluate(std::string_view script);
+
+    /// Calls the global function without arguments and converts the array that it returns: objects become
+    /// dictionaries; null, undefined and symbols are left out. Nothing when there is no such function, it
+    /// failed, or it returned nothing, no array or too much.
+    std::optional<PropertyList::Array> callForArray(std::string_view function);
+
+    /// Whether a limit was reached.
+    bool isStopped() const;
+
+    /// Whether the text is a program, else where it is not.
+    static bool checkSyntax(std::string_view script, Error* error = nullptr);
+
+  private:
+    struct Implementation;
+    explicit ScriptContext(std::unique_ptr<Implementation> implementation);
+
+    std::unique_ptr<Implementation> implementation_;
+};
+
+}  // namespace qvct

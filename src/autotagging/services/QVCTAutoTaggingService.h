@@ -1,0 +1,41 @@
+#pragma once
+
+#include "autotagging/services/TagDictionary.h"
+#include "platform/base/Export.h"
+#include "platform/text/Url.h"
+
+#include <cstdint>
+#include <memory>
+
+namespace qvct {
+
+class LCFileData;
+class QVCTXMLDocument;
+class TGRTMetaData;
+
+/// Which services run. The lower bits are left to the reading of the metadata record.
+enum QVCTAutoTaggingOptions : std::uint64_t {
+    QVCTAutoTaggingOptionContentType = 0x008,
+    QVCTAutoTaggingOptionFilenameKeywords = 0x010,
+    QVCTAutoTaggingOptionRhythm = 0x020,
+    QVCTAutoTaggingOptionXMLRules = 0x040,
+    QVCTAutoTaggingOptionSoftwareInstruments = 0x080,
+    QVCTAutoTaggingOptionUserGenerated = 0x100,
+    QVCTAutoTaggingOptionTranslateTags = 0x200
+};
+
+/// One way of deriving tags. Each service answers to one bit of the options.
+class QVCT_API QVCTAutoTaggingService {
+  public:
+    virtual ~QVCTAutoTaggingService() = default;
+
+    /// The tags of an item; none when the option bit is clear or the service has nothing to say.
+    /// Each input but the URL is null where the item has none.
+    virtual TagDictionarySet tagsWithContentsOfURL(const URL& url,
+                                                   const std::shared_ptr<QVCTXMLDocument>& xmlDocument,
+                                                   const std::shared_ptr<TGRTMetaData>& metaData,
+                                                   const std::shared_ptr<LCFileData>& fileData,
+                                                   std::uint64_t options) = 0;
+};
+
+}  // namespace qvct

@@ -1,0 +1,30 @@
+#pragma once
+
+#include "autotagging/services/QVCTAutoTaggingService.h"
+
+#include <memory>
+
+namespace qvct {
+
+/// Grades the rhythm of a loop: "Rhythmic Density" and "Rhythmic Complexity", each with a level in [0, 1].
+///
+/// A loop that holds MIDI is judged by the notes of its first track; a loop of sound, or audio that says that
+/// it is one, by its onsets. Files that say to be no loop get nothing, nor do loops without tempo, length or
+/// signature, and those in 5 or 7. Stateless: safe from every thread.
+class QVCTRhythmicTaggingService : public QVCTAutoTaggingService {
+  public:
+    TagDictionarySet tagsWithContentsOfURL(const URL& url,
+                                           const std::shared_ptr<QVCTXMLDocument>& xmlDocument,
+                                           const std::shared_ptr<TGRTMetaData>& metaData,
+                                           const std::shared_ptr<LCFileData>& fileData,
+                                           std::uint64_t options) override;
+
+    TagDictionarySet tagsFromMidiIfExisting(const LCFileData& fileData) const;
+    /// Decodes the whole file.
+    TagDictionarySet tagsFromTransients(const URL& url) const;
+
+    /// The two tags for two measured values.
+    static TagDictionarySet tagsForValues(float density, float complexity);
+};
+
+}  // namespace qvct

@@ -1,0 +1,85 @@
+#pragma once
+
+#include "autotagging/xml/LocationPath.h"
+#include "autotagging/xml/XPathCost.h"
+#include "autotagging/xml/XmlExtent.h"
+#include "platform/base/Error.h"
+
+#include <memory>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+struct _xmlDoc;            // NOLINT(bugprone-reserved-identifier): libxml2's name
+struct _xmlNode;           // NOLINT(bugprone-reserved-identifier): libxml2's name
+struct _xmlXPathCompExpr;  // NOLINT(bugprone-reserved-identifier): libxml2's name
+struct _xmlXPathContext;   // NOLINT(bugprone-reserved-identifier): libxml2's name
+
+namespace qvct {
+
+/// Longest expression in bytes, and most steps of one evaluation (less than a second's worth).
+inline constexpr std::size_t kLongestXPath = std::size_t{64} << 10;
+inline constexpr unsigned long kMostXPathSteps = 20'000'000;
+/// Most nodes that are compared or merged, and bytes of text copied, unseen by the count of steps: an
+/// expression that may do so takes as many steps less as the document is large. About a second's worth.
+inline constexpr unsigned long kMostXPathWork = 2'000'000'000;
+/// Most text that an evaluation may hold at once.
+inline constexpr std::size_t kMostXPathText = std::size_t{16} << 20;
+
+/// The place where one document's expressions are evaluated: no name spaces, no context node, limits on the
+/// work, messages to the log.
+class XPathScope {
+  public:
+    explicit XPathScope(_xmlDoc& document);
+
+    /// Whether the last evaluation came to its end: with more steps, others may find more.
+    bool isComplete() const { return isComplete_; }
+
+  private:
+    friend class XPathExpression;
+    struct Closer {
+        void operator()(_xmlXPathContext* context) const;
+    };
+
+    const XmlExtent& extent();
+    bool holdsTooMuchText(const XPathCost& cost);
+    std::size_t workOfStep(const XPathCost& cost);
+
+    std::unique_ptr<_xmlXPathContext, Closer> context_;
+    bool isComplete_ = true;
+    std::optional<XmlExtent> extent_;  // when an expression first needs it
+};
+
+/// A compiled XPath 1.0 expression. Evaluating changes its caches: use one from one thread at a time.
+class XPathExpression {
+  public:
+    /// Nothing and an error with the character where the expression goes wrong.
+    static std::shared_ptr<const XPathExpression> compile(std::string_view text, Error* error = nullptr);
+
+    /// The same from this thread's cache, so that a rule is compiled once, and a wrong one told once: by the
+    /// error, or by the log where none is asked for.
+    static std::shared_ptr<const XPathExpression> cached(std::string_view text, Error* error = nullptr);
+
+    /// The selected nodes in document order; empty when the result is no node set, or when a limit was
+    /// reached, which the log tells. An XPathDeadline of the thread is such a limit.
+    std::vector<_xmlNode*> nodes(XPathScope& scope) const;
+
+    /// The first of `nodes`, or null. Common forms stop there (`LocationPath`), others select all.
+    _xmlNode* firstNode(XPathScope& scope) const;
+
+    /// Whether `firstNode` walks the tree itself (in documents without entity declarations).
+    bool isLocationPath() const { return locationPath_.has_value(); }
+
+  private:
+    struct Closer {
+        void operator()(_xmlXPathCompExpr* expression) const;
+    };
+
+    std::string text_;
+    std::unique_ptr<_xmlXPathCompExpr, Closer> compiled_;
+    std::optional<LocationPath> locationPath_;
+    XPathCost cost_;
+};
+
+}  // namespace qvct

@@ -1,0 +1,46 @@
+#pragma once
+
+#include "platform/base/Error.h"
+
+#include <cstddef>
+#include <cstdint>
+#include <memory>
+#include <span>
+#include <string>
+
+namespace qvct {
+
+/// Decodes an audio file block by block: every container, coding, rate, depth and channel count that
+/// libsndfile knows. Memory does not depend on the file's length.
+///
+/// Samples are in [-1, 1] for integer files; float files give what they hold, which may be beyond that,
+/// infinite or not a number. One decoder is used from one thread at a time.
+class AudioDecoder {
+  public:
+    static constexpr int kMostChannels = 256;
+
+    /// Null, and an error that names the path, when the file is unreadable or no known audio.
+    static std::unique_ptr<AudioDecoder> open(const std::string& path, Error* error = nullptr);
+    /// Over bytes in memory, which must outlive the decoder.
+    static std::unique_ptr<AudioDecoder> open(std::span<const std::uint8_t> bytes, Error* error = nullptr);
+    ~AudioDecoder();
+
+    /// Frames a second, at least 1.
+    int sampleRate() const;
+    /// 1 to kMostChannels.
+    int channels() const;
+    /// Length in frames as the header states it; a damaged file may give fewer.
+    std::int64_t frames() const;
+
+    /// Decodes the next frames, interleaved, as many as fit into `samples`; how many came. 0 is the end, or
+    /// the first byte that cannot be decoded.
+    std::size_t read(std::span<float> samples);
+
+  private:
+    struct State;
+    explicit AudioDecoder(std::unique_ptr<State> state);
+
+    std::unique_ptr<State> state_;
+};
+
+}  // namespace qvct

@@ -1,0 +1,50 @@
+#pragma once
+
+#include "media/loopfile/containers/Container.h"
+
+namespace qvct {
+
+/// What WAV and AIFF share: one form of 12 bytes, and in it chunks of an 8-byte header, contents and a pad
+/// byte after an odd size.
+///
+/// Our chunk always goes to the end of the form, so that the audio stays where it is; what else lies behind
+/// the chunks follows it. Pad bytes that are missing are added.
+class IffFile : public Container {
+  public:
+    std::string fault() const override { return fault_; }
+
+  protected:
+    using Container::Container;
+
+    /// Lists the chunks of a form that says that `formSize` bytes follow its first 8; `isOpenEnded` when it
+    /// does not know (a recorder that could not go back).
+    void walk(std::uint64_t formSize, bool isOpenEnded);
+    std::optional<std::vector<FilePiece>> piecesWith(const std::string& record, Error* error) const override;
+
+    /// The size of a chunk whose header says `size`.
+    virtual std::uint64_t sizeOf(std::uint32_t /*id*/, std::uint32_t size) const { return size; }
+    virtual bool isAudio(std::uint32_t id) const = 0;
+    /// Bytes of our signature at the start of the contents when the chunk is a record; nothing when it is
+    /// not.
+    virtual std::optional<std::uint64_t> signatureOf(const Chunk& chunk) const = 0;
+    /// Our chunk's id, and the signature before the record.
+    virtual std::string recordStart() const = 0;
+    virtual bool canGrowTo(std::uint64_t formSize) const = 0;
+    /// The first 12 bytes of a form of that size.
+    virtual std::string formHeader(std::uint64_t formSize) const = 0;
+    virtual void addChunk(PieceList& pieces, const Chunk& chunk, std::uint64_t formSize) const;
+
+    std::string number(std::uint64_t value, std::size_t width) const;
+
+  private:
+    Chunk chunkAt(std::uint64_t offset) const;
+    bool leadsOn(const Chunk& chunk) const;
+    bool startsOneByteEarlier(const Chunk& chunk) const;
+    void takeOverPad();
+    std::string recordChunk(const std::string& record) const;
+
+    std::uint64_t formEnd_ = 0;  ///< At most the file's.
+    std::string fault_;
+};
+
+}  // namespace qvct

@@ -1,9 +1,0 @@
-#include "platform/Version.h"
-
-namespace qvct {
-
-std::string_view version() {
-    return QVCT_VERSION;
-}
-
-}  // namespace qvct

@@ -1,0 +1,14 @@
+#pragma once
+
+#include "platform/base/Export.h"
+
+#include <string_view>
+
+namespace qvct {
+
+/// The version of the library that is running, such as "1.2.3".
+///
+/// A host that was built with another one may want to know. Safe from every thread.
+QVCT_API std::string_view version();
+
+}  // namespace qvct

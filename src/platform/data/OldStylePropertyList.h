@@ -1,0 +1,20 @@
+#pragma once
+
+#include "platform/data/PropertyList.h"
+#include "platform/data/PropertyListGuard.h"
+
+#include <optional>
+#include <string_view>
+
+namespace qvct {
+
+/// Reads the oldest form of a property list: `{ key = value; }`, `(a, b)`, `<00ff>`, "quoted" or 'quoted'
+/// with escapes, bare words, comments as in C. It knows only dictionaries, arrays, texts and data.
+///
+/// A bare word is no list by itself: nearly any text would begin with one. Nothing, and the fault, for a text
+/// that is none, nests over kDeepestPropertyList, has more than mostPropertyListValues, or goes on behind the
+/// value.
+/// @cost  O(size), without recursion.
+std::optional<PropertyList> parseOldStylePropertyList(std::string_view text, PropertyListFault& fault);
+
+}  // namespace qvct

@@ -1,0 +1,44 @@
+#pragma once
+
+#include "platform/data/PropertyList.h"
+
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace qvct {
+
+/// Builds a property list from its parts in the order in which they stand, however deep, without recursion.
+///
+/// Of a key that comes twice the last value holds, where the first one stood: most readers have it so.
+class PropertyListBuilder {
+  public:
+    /// XML has no element for a UID: it is a dictionary with this one key, and a number that is not negative.
+    static constexpr std::string_view kUidKey = "CF$UID";
+
+    void openDictionary() { open_.push_back({PropertyList::Dictionary{}, {}}); }
+    void openArray() { open_.push_back({PropertyList::Array{}, {}}); }
+    /// The key of the value that comes next, in a dictionary.
+    void key(std::string key) { open_.back().key = std::move(key); }
+    /// A value that holds no others.
+    void add(PropertyList value);
+    /// Ends the innermost container.
+    void close();
+    /// How many containers are open.
+    std::size_t depth() const { return open_.size(); }
+    /// Whether the innermost container is a dictionary.
+    bool isInDictionary() const { return open_.back().container.dictionary() != nullptr; }
+    /// What was built, all containers being closed.
+    PropertyList take() { return std::move(root_); }
+
+  private:
+    struct Open {
+        PropertyList container;
+        std::string key;
+    };
+
+    std::vector<Open> open_;
+    PropertyList root_ = false;
+};
+
+}  // namespace qvct

@@ -1,0 +1,86 @@
+#include "platform/data/XmlDocument.h"
+
+#include "platform/data/XmlParsing.h"
+#include "platform/files/Decompression.h"
+#include "platform/files/FileAccess.h"
+#include "platform/text/Text.h"
+
+#include <fmt/format.h>
+#include <libxml/tree.h>
+#include <libxml/xpath.h>
+#include <libxml/xpathInternals.h>
+
+namespace qvct {
+namespace {
+
+struct Closer {
+    void operator()(xmlXPathContext* context) const { xmlXPathFreeContext(context); }
+    void operator()(xmlXPathObject* result) const { xmlXPathFreeObject(result); }
+    void operator()(xmlChar* text) const { xmlFree(text); }
+};
+template <typename T>
+using Owned = std::unique_ptr<T, Closer>;
+
+/// A file this large takes several times its size in memory once it is parsed.
+constexpr std::uint64_t kLargestXmlFile = 64ULL << 20U;
+
+std::string_view textOf(const std::vector<std::uint8_t>& bytes) {
+    return {reinterpret_cast<const char*>(bytes.data()), bytes.size()};
+}
+
+const xmlChar* xmlText(const std::string& text) {
+    return reinterpret_cast<const xmlChar*>(text.c_str());
+}
+
+}  // namespace
+
+struct XmlDocument::Implementation {
+    XmlTree document;
+};
+
+XmlDocument::XmlDocument(std::unique_ptr<Implementation> implementation)
+    : implementation_(std::move(implementation)) {}
+XmlDocument::~XmlDocument() = default;
+
+std::shared_ptr<XmlDocument> XmlDocument::fromFile(const std::string& path, Error* error) {
+    const auto bytes = readFile(path, error, kLargestXmlFile);
+    if (!bytes) return nullptr;
+    if (!path.ends_with(".zxml")) return fromText(textOf(*bytes), path, error);
+    Error reason;
+    const auto xml = decompress(*bytes, &reason);
+    if (xml) return fromText(textOf(*xml), path, error);
+    fail(error, static_cast<ErrorCode>(reason.code), fmt::format("{}: {}", printable(path), reason.message));
+    return nullptr;
+}
+
+std::shared_ptr<XmlDocument> XmlDocument::fromText(std::string_view text, std::string_view name,
+                                                   Error* error) {
+    ParsedXml parsed = parseXml(text);
+    if (!parsed.tree) {
+        const std::string reason = parsed.faults.empty() ? "no XML" : parsed.faults.front();
+        fail(error, kErrorMalformed, fmt::format("{}, {}", printable(name), reason));
+        return nullptr;
+    }
+    auto implementation = std::make_unique<Implementation>();
+    implementation->document = std::move(parsed.tree);
+    return std::shared_ptr<XmlDocument>(new XmlDocument(std::move(implementation)));
+}
+
+std::vector<std::string> XmlDocument::attributeValues(const std::string& xpath,
+                                                      const std::string& attribute) const {
+    const Owned<xmlXPathContext> context(xmlXPathNewContext(implementation_->document.get()));
+    const Owned<xmlXPathObject> result(context ? xmlXPathEvalExpression(xmlText(xpath), context.get())
+                                               : nullptr);
+    std::vector<std::string> values;
+    if (!result || result->type != XPATH_NODESET || result->nodesetval == nullptr) return values;
+    xmlXPathNodeSetSort(result->nodesetval);
+    for (int i = 0; i < result->nodesetval->nodeNr; ++i) {
+        const xmlNode* node = result->nodesetval->nodeTab[i];
+        const Owned<xmlChar> value(node->type == XML_ELEMENT_NODE ? xmlGetProp(node, xmlText(attribute))
+                                                                  : nullptr);
+        values.emplace_back(value ? reinterpret_cast<const char*>(value.get()) : "");
+    }
+    return values;
+}
+
+}  // namespace qvct

@@ -1,0 +1,399 @@
+#include "platform/data/XmlPropertyListReader.h"
+
+#include "platform/data/PropertyListBuilder.h"
+#include "platform/data/PropertyListFile.h"
+#include "platform/data/XmlParsing.h"
+#include "platform/text/Text.h"
+
+#include <algorithm>
+#include <array>
+#include <charconv>
+#include <chrono>
+#include <clocale>
+#include <cstdint>
+#include <cstdlib>
+#include <iterator>
+#include <memory>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <utility>
+#include <vector>
+
+#include <fmt/format.h>
+#include <libxml/parser.h>
+
+namespace qvct {
+namespace {
+
+enum class Element { plist, dictionary, array, key, text, integer, real, date, data, yes, no };
+
+std::optional<Element> elementNamed(std::string_view name) {
+    // The most frequent ones first.
+    constexpr std::array<std::pair<std::string_view, Element>, 11> names = {{{"key", Element::key},
+                                                                             {"string", Element::text},
+                                                                             {"dict", Element::dictionary},
+                                                                             {"integer", Element::integer},
+                                                                             {"real", Element::real},
+                                                                             {"true", Element::yes},
+                                                                             {"false", Element::no},
+                                                                             {"array", Element::array},
+                                                                             {"date", Element::date},
+                                                                             {"data", Element::data},
+                                                                             {"plist", Element::plist}}};
+    const auto* hit =
+        std::find_if(names.begin(), names.end(), [name](const auto& entry) { return entry.first == name; });
+    return hit == names.end() ? std::nullopt : std::optional(hit->second);
+}
+
+/// Whether its characters are more than blanks between elements.
+bool holdsCharacters(Element element) {
+    return element == Element::key || element == Element::text || element == Element::integer ||
+           element == Element::real || element == Element::date || element == Element::data;
+}
+
+bool isSpace(char c) {
+    return c == ' ' || c == '\t' || c == '\n' || c == '\r';
+}
+
+/// What a digit of base 64 stands for; 64 for what is none.
+constexpr std::array<std::uint8_t, 256> kBase64 = [] {
+    std::array<std::uint8_t, 256> values{};
+    values.fill(64);
+    std::uint8_t value = 0;
+    for (const char c : std::string_view("ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789+/"))
+        values[static_cast<unsigned char>(c)] = value++;
+    return values;
+}();
+
+std::uint8_t base64(char c) {
+    return kBase64[static_cast<unsigned char>(c)];
+}
+
+bool isBase64(char c) {
+    return base64(c) < 64 || c == '=' || isSpace(c);
+}
+
+/// The bytes that the digits spell. Padding may be missing, but not be wrong.
+std::optional<PropertyList> dataOf(std::string_view digits) {
+    const std::size_t count = digits.find_last_not_of('=') + 1;
+    const std::size_t padding = digits.size() - count;
+    const std::size_t lastGroup = count % 4;
+    const bool isPadded = padding == 0 || (lastGroup > 1 && padding == 4 - lastGroup);
+    digits = digits.substr(0, count);
+    if (lastGroup == 1 || !isPadded || digits.find('=') != std::string_view::npos) return std::nullopt;
+    PropertyList::Data bytes;
+    bytes.reserve(count / 4 * 3 + 2);
+    unsigned bits = 0;
+    for (std::size_t i = 0; i < count; ++i) {
+        bits = bits << 6U | base64(digits[i]);
+        if (i % 4 > 0) bytes.push_back(static_cast<std::uint8_t>(bits >> (6 - 2 * (i % 4))));
+    }
+    return bytes;
+}
+
+/// Takes a number from the front of the text. Whether there is one.
+template <typename Number, typename... Options>
+bool takeNumber(std::string_view& text, Number& number, Options... options) {
+    const auto [end, status] = std::from_chars(text.data(), text.data() + text.size(), number, options...);
+    text.remove_prefix(static_cast<std::size_t>(end - text.data()));
+    return status == std::errc{};
+}
+
+/// A whole number, decimal or hexadecimal, that 64 bits hold.
+std::optional<PropertyList> integerOf(std::string_view text) {
+    const bool isNegative = text.starts_with('-');
+    if (isNegative || text.starts_with('+')) text.remove_prefix(1);
+    const bool isHexadecimal = text.starts_with("0x") || text.starts_with("0X");
+    if (isHexadecimal) text.remove_prefix(2);
+    std::uint64_t magnitude = 0;
+    if (!takeNumber(text, magnitude, isHexadecimal ? 16 : 10) || !text.empty()) return std::nullopt;
+    if (!isNegative) return magnitude;
+    if (magnitude > 1ULL << 63U) return std::nullopt;
+    return static_cast<std::int64_t>(0 - magnitude);
+}
+
+/// A number, "inf" or "nan"; one out of range is as near as there is, infinity or 0.
+std::optional<PropertyList> realOf(std::string_view text) {
+    const bool hasPlus = text.starts_with('+');
+    if (hasPlus) text.remove_prefix(1);
+    double number = 0;
+    const auto [end, status] = std::from_chars(text.data(), text.data() + text.size(), number);
+    const bool isNumber = status != std::errc::invalid_argument && end == text.data() + text.size();
+    if (!isNumber || (hasPlus && text.starts_with('-'))) return std::nullopt;
+    static const locale_t plain = newlocale(LC_ALL_MASK, "C", nullptr);
+    return status == std::errc{} ? number : strtod_l(std::string(text).c_str(), nullptr, plain);
+}
+
+/// A date and time such as "2001-12-31T23:59:59Z", in the range that is written, too.
+std::optional<PropertyList> dateOf(std::string_view text) {
+    std::array<unsigned, 6> fields{};
+    constexpr std::string_view separators = "--T::Z";
+    for (std::size_t i = 0; i < fields.size(); ++i) {
+        if (!takeNumber(text, fields[i]) || !text.starts_with(separators[i])) return std::nullopt;
+        text.remove_prefix(1);
+    }
+    using namespace std::chrono;
+    const auto [y, m, d, hour, minute, second] = fields;
+    if (!text.empty() || y > 9999 || m > 12 || d > 31 || hour > 23 || minute > 59 || second > 60)
+        return std::nullopt;
+    const year_month_day day(year(static_cast<int>(y)), month(m), std::chrono::day(d));
+    const duration<double> sinceReference =
+        sys_days(day) - sys_days(year(2001) / January / 1) + hours(hour) + minutes(minute) + seconds(second);
+    if (!day.ok() || !isPropertyListDate(sinceReference.count())) return std::nullopt;
+    return PropertyList::Date{sinceReference.count()};
+}
+
+/// Builds the value from the events of the XML parser, and says the first thing that no property list has.
+/// `where` tells the offset of an event's first byte, when it is asked.
+class Reader {
+  public:
+    explicit Reader(std::size_t size) : mostValues_(mostPropertyListValues(size)) {}
+
+    template <typename Where>
+    void start(std::string_view name, bool isPrefixed, Where where) {
+        const auto element = isPrefixed ? std::nullopt : elementNamed(name);
+        if (!element) return refuse("an element that is none of a property list", where());
+        if (!mayStandHere(*element)) return refuse("an element where it may not stand", where());
+        if (++values_ > mostValues_) return refuse("too many keys and values", where(), kErrorTooLarge);
+        const bool isContainer = *element == Element::dictionary || *element == Element::array;
+        if (isContainer && builder_.depth() >= static_cast<std::size_t>(kDeepestPropertyList))
+            return refuse("nested too deeply", where(), kErrorTooLarge);
+        if (*element == Element::dictionary) builder_.openDictionary();
+        if (*element == Element::array) builder_.openArray();
+        if (!open_.empty()) ++open_.back().children;
+        open_.push_back({*element, 0, holdsCharacters(*element) ? where() : 0});
+        characters_.clear();
+    }
+
+    template <typename Where>
+    void text(std::string_view characters, Where where) {
+        if (open_.empty()) return;
+        const Element element = open_.back().element;
+        const bool isData = element == Element::data;
+        const bool isFree = holdsCharacters(element) && !isData;
+        const auto fault =
+            isFree ? characters.end()
+                   : std::find_if_not(characters.begin(), characters.end(), isData ? isBase64 : isSpace);
+        if (fault != characters.end()) {
+            refuse(isData ? "data that is not base 64" : "text between elements",
+                   where() + static_cast<std::size_t>(fault - characters.begin()));
+        } else if (isData) {
+            std::remove_copy_if(characters.begin(), characters.end(), std::back_inserter(characters_),
+                                isSpace);
+        } else if (isFree) {
+            characters_ += characters;
+        }
+    }
+
+    template <typename Where>
+    void end(Where where) {
+        const Open closed = open_.back();
+        open_.pop_back();
+        switch (closed.element) {
+            case Element::dictionary:
+                if (closed.children % 2 != 0) return refuse("a key without value", where());
+                [[fallthrough]];
+            case Element::array:
+                builder_.close();
+                break;
+            case Element::plist:
+                if (closed.children == 0) return refuse("no value", where());
+                isComplete_ = true;
+                break;
+            case Element::key:
+                builder_.key(std::exchange(characters_, {}));
+                break;
+            default:
+                add(closed);
+        }
+    }
+
+    void refuse(std::string_view reason, std::size_t offset, ErrorCode code = kErrorMalformed) {
+        if (!fault_) fault_ = PropertyListFault{code, offset, std::string(reason)};
+    }
+
+    bool isComplete() const { return isComplete_; }
+    const std::optional<PropertyListFault>& fault() const { return fault_; }
+    PropertyList take() { return builder_.take(); }
+
+  private:
+    struct Open {
+        Element element;
+        std::size_t children;
+        std::size_t offset;  // of what holds characters
+    };
+
+    bool mayStandHere(Element element) const {
+        if (open_.empty()) return element == Element::plist;
+        const Open& parent = open_.back();
+        if (element == Element::plist) return false;
+        switch (parent.element) {
+            case Element::plist:
+                return element != Element::key && parent.children == 0;
+            case Element::array:
+                return element != Element::key;
+            case Element::dictionary:
+                return (element == Element::key) == (parent.children % 2 == 0);
+            default:
+                return false;
+        }
+    }
+
+    /// The value of an element that holds no others.
+    void add(const Open& closed) {
+        const std::string_view scalar = trimBlanksAndLineBreaks(characters_);
+        switch (closed.element) {
+            case Element::integer:
+                return addIf(integerOf(scalar), "not a whole number of 64 bits", closed.offset);
+            case Element::real:
+                return addIf(realOf(scalar), "not a number", closed.offset);
+            case Element::date:
+                return addIf(dateOf(scalar), "not a date and time of the years 1 to 9999", closed.offset);
+            case Element::data:
+                return addIf(dataOf(characters_), "data that is not whole groups of base 64", closed.offset);
+            case Element::text:
+                return builder_.add(std::exchange(characters_, {}));
+            default:
+                return builder_.add(closed.element == Element::yes);
+        }
+    }
+
+    void addIf(std::optional<PropertyList> value, std::string_view fault, std::size_t offset) {
+        if (!value) return refuse(fault, offset);
+        builder_.add(*std::move(value));
+    }
+
+    std::size_t mostValues_;
+    std::size_t values_ = 0;
+    PropertyListBuilder builder_;
+    std::vector<Open> open_;
+    std::string characters_;  // of the innermost element
+    std::optional<PropertyListFault> fault_;
+    bool isComplete_ = false;
+};
+
+std::string_view view(const xmlChar* text) {
+    return reinterpret_cast<const char*>(text);
+}
+
+/// The parser, fed at once and stopped at the first fault or at the end of the root element.
+class Parser {
+  public:
+    explicit Parser(std::string_view text) : text_(text), reader_(text.size()) {
+        xmlSAXHandler handler{};
+        handler.initialized = XML_SAX2_MAGIC;
+        handler.startElementNs = [](void* self, const xmlChar* name, const xmlChar* prefix, const xmlChar*,
+                                    int, const xmlChar**, int, int, const xmlChar**) {
+            tell(self, [&](Parser& p) {
+                if (p.context_->nsNr / 2 > kMostXmlNameSpaces)  // a prefix and an address each
+                    return p.reader_.refuse("too many name spaces", p.lastTag(), kErrorTooLarge);
+                p.reader_.start(view(name), prefix != nullptr, [&p] { return p.lastTag(); });
+            });
+        };
+        handler.endElementNs = [](void* self, const xmlChar*, const xmlChar*, const xmlChar*) {
+            tell(self, [](Parser& p) { p.reader_.end([&p] { return p.lastTag(); }); });
+        };
+        handler.characters = handler.cdataBlock = [](void* self, const xmlChar* part, int length) {
+            tell(self, [&](Parser& p) {
+                p.reader_.text({reinterpret_cast<const char*>(part), static_cast<std::size_t>(length)},
+                               [&] { return p.offsetOf(part); });
+            });
+        };
+        // Entities of one's own multiply; nothing that writes property lists makes any.
+        handler.entityDecl = [](void* self, const xmlChar*, int, const xmlChar*, const xmlChar*, xmlChar*) {
+            tell(self, [](Parser& p) { p.reader_.refuse("an entity declaration", p.lastTag()); });
+        };
+        // Nothing that reads a property list looks at attributes; the parser compares each with all others.
+        handler.attributeDecl = [](void* self, const xmlChar*, const xmlChar*, int, int, const xmlChar*,
+                                   xmlEnumerationPtr choices) {
+            xmlFreeEnumeration(choices);
+            tell(self, [](Parser& p) { p.reader_.refuse("an attribute declaration", p.lastTag()); });
+        };
+        handler.reference = [](void* self, const xmlChar*) {
+            tell(self, [](Parser& p) { p.reader_.refuse("an unknown entity", p.offset()); });
+        };
+        handler.serror = [](void* self, xmlErrorPtr error) {
+            auto& parser = *static_cast<Parser*>(self);
+            if (error->level != XML_ERR_FATAL || parser.isStopped_) return;
+            const bool isAboutATag = error->code == XML_ERR_TAG_NAME_MISMATCH;
+            parser.reader_.refuse("not well-formed XML", isAboutATag ? parser.lastTag() : parser.offset());
+            parser.isStopped_ = true;  // the parser stops by itself, and must not be stopped amid an error
+        };
+        context_.reset(xmlCreatePushParserCtxt(&handler, this, nullptr, 0, nullptr));
+        // Its own limit of depth lies below ours; the encoding is known, and not always the declared one.
+        if (context_)
+            xmlCtxtUseOptions(context_.get(), XML_PARSE_NONET | XML_PARSE_HUGE | XML_PARSE_IGNORE_ENC);
+    }
+
+    std::optional<PropertyList> parse(std::size_t& end, PropertyListFault& fault) {
+        if (const auto offset = attributeTooMany(text_)) {
+            reader_.refuse(fmt::format("an element with more than {} attributes", kMostXmlAttributes),
+                           *offset, kErrorTooLarge);
+        } else if (context_) {
+            xmlParseChunk(context_.get(), text_.data(), static_cast<int>(text_.size()), 1);
+        }
+        end = stoppedAt_;
+        if (reader_.isComplete()) return reader_.take();
+        fault =
+            reader_.fault().value_or(PropertyListFault{kErrorMalformed, text_.size(), "it ends too early"});
+        return std::nullopt;
+    }
+
+  private:
+    struct Deleter {
+        void operator()(xmlParserCtxt* context) const {
+            xmlFreeDoc(context->myDoc);
+            xmlFreeParserCtxt(context);
+        }
+    };
+
+    template <typename Event>
+    static void tell(void* self, Event event) {
+        auto& parser = *static_cast<Parser*>(self);
+        if (parser.isStopped_) return;
+        event(parser);
+        if (!parser.reader_.fault() && !parser.reader_.isComplete()) return;
+        parser.isStopped_ = true;
+        parser.stoppedAt_ = parser.offset();
+        xmlStopParser(parser.context_.get());
+    }
+
+    /// How far the parser has come.
+    std::size_t offset() const {
+        const long consumed = xmlByteConsumed(context_.get());
+        return std::min(static_cast<std::size_t>(std::max(consumed, 0L)), text_.size());
+    }
+
+    /// Where the tag begins that the parser has just read.
+    std::size_t lastTag() const {
+        const std::size_t here = offset();
+        const std::size_t tag = here == 0 ? std::string_view::npos : text_.rfind('<', here - 1);
+        return tag == std::string_view::npos ? here : tag;
+    }
+
+    /// Where the characters stand that the parser hands out: mostly in its input, else just before.
+    std::size_t offsetOf(const xmlChar* characters) const {
+        const xmlParserInput& input = *context_->input;
+        if (characters >= input.base && characters < input.end)
+            return offset() - static_cast<std::size_t>(input.cur - characters);
+        const std::size_t here = offset();
+        const std::size_t tag = here == 0 ? std::string_view::npos : text_.rfind('>', here - 1);
+        return tag == std::string_view::npos ? here : tag + 1;
+    }
+
+    std::string_view text_;
+    Reader reader_;
+    bool isStopped_ = false;
+    std::size_t stoppedAt_ = 0;
+    std::unique_ptr<xmlParserCtxt, Deleter> context_;
+};
+
+}  // namespace
+
+std::optional<PropertyList> parseXmlPropertyList(std::string_view text, std::size_t& end,
+                                                 PropertyListFault& fault) {
+    return Parser(text).parse(end, fault);
+}
+
+}  // namespace qvct

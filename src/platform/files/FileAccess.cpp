@@ -1,0 +1,110 @@
+#include "platform/files/FileAccess.h"
+
+#include "platform/files/FileDescriptor.h"
+#include "platform/files/FileReplacement.h"
+#include "platform/text/Text.h"
+#include "platform/text/Url.h"
+
+#include <cerrno>
+#include <cstring>
+
+#include <fcntl.h>
+#include <fmt/format.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+namespace qvct {
+namespace {
+
+bool failFor(Error* error, ErrorCode code, std::string_view path, std::string_view reason) {
+    return fail(error, code, fmt::format("{}: {}", printable(path), reason));
+}
+
+bool failWithErrno(Error* error, ErrorCode code, std::string_view path) {
+    return failFor(error, code, path, std::strerror(errno));
+}
+
+bool statOf(const std::string& path, struct stat& status) {
+    return !isURLText(path) && ::stat(path.c_str(), &status) == 0;
+}
+
+}  // namespace
+
+bool fileExists(const std::string& path) {
+    struct stat status {};
+    return statOf(path, status);
+}
+
+bool isDirectory(const std::string& path) {
+    struct stat status {};
+    return statOf(path, status) && S_ISDIR(status.st_mode);
+}
+
+bool isRegularFile(const std::string& path) {
+    struct stat status {};
+    return statOf(path, status) && S_ISREG(status.st_mode);
+}
+
+FileDescriptor openRegularFile(const std::string& path, Error* error, struct stat* status) {
+    if (isURLText(path)) {
+        failFor(error, kErrorInvalidArgument, path, "is no file URL");
+        return FileDescriptor(-1);
+    }
+    // Without O_NONBLOCK, opening a named pipe would wait for a writer for ever.
+    FileDescriptor descriptor(::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
+    struct stat own {};
+    if (status == nullptr) status = &own;
+    if (!descriptor.isOpen() || ::fstat(descriptor.number(), status) != 0) {
+        failWithErrno(error, kErrorUnreadable, path);
+    } else if (!S_ISREG(status->st_mode)) {
+        failFor(error, kErrorUnreadable, path,
+                S_ISDIR(status->st_mode) ? "is a folder" : "is not a regular file");
+    } else {
+        return descriptor;
+    }
+    return FileDescriptor(-1);
+}
+
+std::optional<std::vector<std::uint8_t>> readFile(const std::string& path, Error* error,
+                                                  std::uint64_t limit) {
+    struct stat status {};
+    const FileDescriptor descriptor = openRegularFile(path, error, &status);
+    if (!descriptor.isOpen()) return std::nullopt;
+    const auto size = static_cast<std::uint64_t>(status.st_size);
+    if (size > limit) {
+        failFor(error, kErrorTooLarge, path, fmt::format("{} bytes are over the limit of {}", size, limit));
+        return std::nullopt;
+    }
+    std::vector<std::uint8_t> bytes(size);
+    std::size_t filled = 0;
+    while (filled < bytes.size()) {
+        const ssize_t got = ::read(descriptor.number(), bytes.data() + filled, bytes.size() - filled);
+        if (got < 0 && errno == EINTR) continue;
+        if (got < 0) {
+            failWithErrno(error, kErrorUnreadable, path);
+            return std::nullopt;
+        }
+        if (got == 0) break;  // the file shrank while it was read
+        filled += static_cast<std::size_t>(got);
+    }
+    bytes.resize(filled);
+    return bytes;
+}
+
+std::optional<std::string> readTextFile(const std::string& path, Error* error) {
+    const auto bytes = readFile(path, error);
+    if (!bytes) return std::nullopt;
+    std::string text(bytes->begin(), bytes->end());
+    if (!isValidUtf8(text)) {
+        failFor(error, kErrorMalformed, path, "is not UTF-8 text");
+        return std::nullopt;
+    }
+    return text;
+}
+
+bool replaceFile(const std::string& path, std::string_view bytes, Error* error) {
+    const FilePiece whole{.bytes = std::string(bytes)};
+    return replaceFileByPieces(path, {&whole, 1}, {}, error);
+}
+
+}  // namespace qvct

@@ -1,0 +1,126 @@
+#include "listening/onsets/OnsetDetector.h"
+
+#include <algorithm>
+#include <cmath>
+#include <limits>
+#include <numbers>
+#include <random>
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+namespace qvct {
+namespace {
+
+using Onsets = std::vector<std::int64_t>;
+
+Onsets onsetsOf(const std::vector<float>& samples, double rate, int channels = 1,
+                std::size_t blockFrames = 0) {
+    OnsetDetector detector(rate, channels);
+    const std::size_t block = blockFrames ? blockFrames * static_cast<std::size_t>(channels)
+                                          : std::max<std::size_t>(samples.size(), 1);
+    for (std::size_t at = 0; at < samples.size(); at += block) {
+        detector.process(std::span(samples).subspan(at, std::min(block, samples.size() - at)));
+    }
+    return detector.finish();
+}
+
+// Decaying bursts of noise at the given times, in the given channels.
+std::vector<float> bursts(const std::vector<double>& times, double seconds, double rate, int channels = 1) {
+    std::mt19937 random(11);
+    std::uniform_real_distribution<float> noise(-0.5F, 0.5F);
+    std::vector<float> samples(static_cast<std::size_t>(seconds * rate) * static_cast<std::size_t>(channels));
+    for (const double time : times) {
+        const auto start = static_cast<std::size_t>(time * rate);
+        for (std::size_t i = 0; i < static_cast<std::size_t>(0.1 * rate); ++i) {
+            const float sample = noise(random) * static_cast<float>(std::exp(-50 * double(i) / rate));
+            for (int c = 0; c < channels; ++c) {
+                const std::size_t at =
+                    (start + i) * static_cast<std::size_t>(channels) + static_cast<std::size_t>(c);
+                if (at < samples.size()) samples[at] += sample;
+            }
+        }
+    }
+    return samples;
+}
+
+const std::vector<double> kTimes = {0, 0.25, 0.333, 0.5, 0.75, 0.875, 1.2};
+
+TEST(OnsetDetector, FindsAttacksAtAnyRateAndChannelCount) {
+    for (const double rate : {8000.0, 11025.0, 22050.0, 32000.0, 44100.0, 48000.0, 96000.0, 192000.0}) {
+        for (const int channels : {1, 2, 6}) {
+            const Onsets onsets = onsetsOf(bursts(kTimes, 1.5, rate, channels), rate, channels);
+            ASSERT_EQ(onsets.size(), kTimes.size()) << rate << " Hz, " << channels;
+            for (std::size_t i = 0; i < onsets.size(); ++i) {
+                EXPECT_NEAR(double(onsets[i]) / rate, kTimes[i], 0.004) << rate << " Hz, " << channels;
+            }
+        }
+    }
+}
+
+TEST(OnsetDetector, BlocksDoNotMatter) {
+    const auto samples = bursts(kTimes, 1.5, 44100, 2);
+    const Onsets whole = onsetsOf(samples, 44100, 2);
+    for (const std::size_t block : {1U, 7U, 4095U, 5000U})
+        EXPECT_EQ(onsetsOf(samples, 44100, 2, block), whole);
+}
+
+TEST(OnsetDetector, LoudnessDoesNotMatter) {
+    auto samples = bursts(kTimes, 1.5, 44100);
+    for (float& sample : samples) sample *= 0.03F;
+    EXPECT_EQ(onsetsOf(samples, 44100).size(), kTimes.size());
+}
+
+TEST(OnsetDetector, OppositeChannelsDoNotCancel) {
+    auto samples = bursts(kTimes, 1.5, 44100, 2);
+    for (std::size_t i = 1; i < samples.size(); i += 2) samples[i] = -samples[i];
+    EXPECT_EQ(onsetsOf(samples, 44100, 2).size(), kTimes.size());
+}
+
+TEST(OnsetDetector, NothingBeginsInSilenceOffsetOrTooLittleSound) {
+    EXPECT_EQ(onsetsOf({}, 44100), Onsets{});
+    EXPECT_EQ(onsetsOf({1.0F}, 44100), Onsets{});
+    EXPECT_EQ(onsetsOf(std::vector<float>(100000, 0.0F), 44100), Onsets{});
+    EXPECT_EQ(onsetsOf(std::vector<float>(100000, 1.0F), 44100), Onsets{});
+    EXPECT_EQ(onsetsOf(std::vector<float>(100001, -1.0F), 48000, 3), Onsets{});
+}
+
+TEST(OnsetDetector, TheEndOfASoundIsNoOnset) {
+    std::vector<float> samples(44100);
+    for (std::size_t i = 0; i < 20000; ++i) {
+        samples[i + 5000] =
+            static_cast<float>(0.5 * std::sin(2 * std::numbers::pi * 1000 * double(i) / 44100));
+    }
+    const Onsets onsets = onsetsOf(samples, 44100);
+    ASSERT_EQ(onsets.size(), 1U);
+    EXPECT_NEAR(double(onsets[0]), 5000, 200);
+}
+
+TEST(OnsetDetector, AFlamIsOneOnsetAtItsFirstStroke) {
+    const Onsets onsets = onsetsOf(bursts({0.5, 0.52}, 1, 44100), 44100);
+    ASSERT_EQ(onsets.size(), 1U);
+    EXPECT_NEAR(double(onsets[0]) / 44100, 0.5, 0.005);
+}
+
+TEST(OnsetDetector, SurvivesSamplesThatAreNoNumbersAndOddRates) {
+    const float bad[] = {std::nanf(""), std::numeric_limits<float>::infinity(),
+                         -std::numeric_limits<float>::infinity(), std::numeric_limits<float>::max(), 1e-42F};
+    std::mt19937 random(2);
+    for (const double rate : {1.0, 3.0, 100.0, 999.5, 44100.0, 768000.0, 2147483647.0}) {
+        for (const int channels : {1, 2, 256}) {
+            auto samples = bursts({0.1}, 0.5, 44100);
+            for (int i = 0; i < 2000; ++i) samples[random() % samples.size()] = bad[i % 5];
+            const Onsets onsets = onsetsOf(samples, rate, channels);
+            EXPECT_TRUE(std::is_sorted(onsets.begin(), onsets.end(), std::less_equal<>()));
+            const auto frames = static_cast<std::int64_t>(samples.size()) / channels;
+            for (const std::int64_t onset : onsets) EXPECT_TRUE(onset >= 0 && onset < frames) << onset;
+        }
+    }
+    // One bad sample must not deafen the detector for what follows.
+    auto samples = bursts(kTimes, 1.5, 44100);
+    samples[4000] = std::nanf("");
+    EXPECT_GE(onsetsOf(samples, 44100).size(), kTimes.size());
+}
+
+}  // namespace
+}  // namespace qvct

@@ -1,0 +1,149 @@
+#include "listening/onsets/OnsetDetector.h"
+#include "media/audio/AudioDecoder.h"
+#include "platform/files/FileAccess.h"
+#include "support/Corpus.h"
+#include "support/TemporaryFolder.h"
+
+#include <cmath>
+#include <cstring>
+#include <string>
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+namespace qvct {
+namespace {
+
+std::string littleEndian(std::uint32_t value, int bytes) {
+    std::string out;
+    for (int i = 0; i < bytes; ++i) out.push_back(static_cast<char>(value >> (8 * i)));
+    return out;
+}
+
+// A WAV file; format 1 is integers, 3 floats.
+std::string wav(std::uint32_t format, std::uint32_t channels, std::uint32_t rate, std::uint32_t bits,
+                const std::string& data) {
+    const std::string fmt = littleEndian(format, 2) + littleEndian(channels, 2) + littleEndian(rate, 4) +
+                            littleEndian(rate * channels * bits / 8, 4) +
+                            littleEndian(channels * bits / 8, 2) + littleEndian(bits, 2);
+    const auto length = static_cast<std::uint32_t>(data.size());
+    return "RIFF" + littleEndian(length + 36, 4) + "WAVEfmt " + littleEndian(16, 4) + fmt + "data" +
+           littleEndian(length, 4) + data;
+}
+
+std::string floats(const std::vector<float>& samples) {
+    std::string bytes(samples.size() * sizeof(float), '\0');
+    std::memcpy(bytes.data(), samples.data(), bytes.size());
+    return bytes;
+}
+
+std::span<const std::uint8_t> bytesOf(const std::string& text) {
+    return {reinterpret_cast<const std::uint8_t*>(text.data()), text.size()};
+}
+
+std::vector<float> decoded(AudioDecoder& decoder, std::size_t blockFrames = 100) {
+    std::vector<float> all;
+    std::vector<float> block(blockFrames * static_cast<std::size_t>(decoder.channels()));
+    while (const std::size_t frames = decoder.read(block)) {
+        all.insert(all.end(), block.begin(),
+                   block.begin() +
+                       static_cast<std::ptrdiff_t>(frames * static_cast<std::size_t>(decoder.channels())));
+    }
+    return all;
+}
+
+TEST(AudioDecoder, GivesTheSamplesOfEveryDepth) {
+    const std::string sixteen = wav(1, 2, 48000, 16, std::string("\x00\x40\x00\x80\xff\x7f\x01\x00", 8));
+    const auto decoder = AudioDecoder::open(bytesOf(sixteen));
+    ASSERT_TRUE(decoder);
+    EXPECT_EQ(decoder->sampleRate(), 48000);
+    EXPECT_EQ(decoder->channels(), 2);
+    EXPECT_EQ(decoder->frames(), 2);
+    EXPECT_THAT(decoded(*decoder, 1), testing::ElementsAre(0.5F, -1.0F, 32767.0F / 32768, 1.0F / 32768));
+
+    const std::string eight = wav(1, 1, 8000, 8, std::string("\x80\xc0\x00", 3));
+    EXPECT_THAT(decoded(*AudioDecoder::open(bytesOf(eight))), testing::ElementsAre(0.0F, 0.5F, -1.0F));
+    const std::string wide = wav(1, 1, 96000, 24, std::string("\x00\x00\x40\x00\x00\x80", 6));
+    EXPECT_THAT(decoded(*AudioDecoder::open(bytesOf(wide))), testing::ElementsAre(0.5F, -1.0F));
+    const std::string real = wav(3, 1, 44100, 32, floats({0.25F, -4.0F}));
+    EXPECT_THAT(decoded(*AudioDecoder::open(bytesOf(real))), testing::ElementsAre(0.25F, -4.0F));
+}
+
+TEST(AudioDecoder, ReadsFromAPathWhatItReadsFromMemory) {
+    const test::TemporaryFolder folder;
+    std::string data;
+    for (std::uint32_t i = 0; i < 5000; ++i) data += littleEndian(i * 2654435761U, 2);
+    const std::string file = wav(1, 1, 44100, 16, data);
+    const auto memory = AudioDecoder::open(bytesOf(file));
+    const auto path = AudioDecoder::open(folder.write("a.wav", file));
+    ASSERT_TRUE(memory && path);
+    EXPECT_EQ(decoded(*memory), decoded(*path, 4096));
+}
+
+TEST(AudioDecoder, RefusesWhatIsNoAudioAndNamesIt) {
+    const test::TemporaryFolder folder;
+    for (const std::string& bytes : {std::string(), std::string("RIFF"), std::string(1000, 'x')}) {
+        Error error;
+        EXPECT_FALSE(AudioDecoder::open(folder.write("no.wav", bytes), &error));
+        EXPECT_THAT(error.message, testing::HasSubstr("no.wav"));
+        EXPECT_FALSE(AudioDecoder::open(bytesOf(bytes)));
+    }
+    EXPECT_FALSE(AudioDecoder::open(folder.path("absent.wav")));
+    EXPECT_FALSE(AudioDecoder::open(bytesOf(wav(1, 0, 44100, 16, "abcd")))) << "no channels";
+}
+
+TEST(AudioDecoder, StopsAtTheEndOfATruncatedFile) {
+    std::string file = wav(1, 1, 44100, 16, std::string(2000, '\x11'));
+    file.resize(file.size() - 1001);
+    const auto decoder = AudioDecoder::open(bytesOf(file));
+    ASSERT_TRUE(decoder);
+    EXPECT_LE(decoded(*decoder).size(), 500U);
+}
+
+TEST(AudioDecoder, FloatFilesWithoutNumbersHaveNoOnsetsOfTheirOwn) {
+    std::vector<float> samples(30000, 0.0F);
+    for (std::size_t i = 0; i < samples.size(); i += 3) samples[i] = i % 2 ? std::nanf("") : HUGE_VALF;
+    const std::string file = wav(3, 1, 44100, 32, floats(samples));
+    const auto decoder = AudioDecoder::open(bytesOf(file));
+    ASSERT_TRUE(decoder);
+    EXPECT_THAT(OnsetDetector::detect(*decoder), testing::IsEmpty());
+    const std::string none = wav(1, 1, 44100, 16, "");
+    const auto empty = AudioDecoder::open(bytesOf(none));
+    ASSERT_TRUE(empty);
+    EXPECT_THAT(OnsetDetector::detect(*empty), testing::IsEmpty());
+}
+
+TEST(AudioDecoder, ReadsTheSameNoteFromEveryCoding) {
+    const auto folder = test::corpus("audio/pluck");
+    QVCT_SKIP_WITHOUT(folder);
+    const auto reference = AudioDecoder::open((folder / "pluck-pcm24.wav").string());
+    ASSERT_TRUE(reference);
+    const std::vector<float> expected = decoded(*reference);
+    for (const std::string& path : test::filesBelow(folder)) {
+        const auto decoder = AudioDecoder::open(path);
+        ASSERT_TRUE(decoder) << path;
+        const std::vector<float> samples = decoded(*decoder);
+        ASSERT_EQ(samples.size(), expected.size()) << path;
+        double error = 0;
+        for (std::size_t i = 0; i < samples.size(); ++i)
+            error = std::max(error, std::abs(double(samples[i] - expected[i])));
+        EXPECT_LT(error, 0.05) << path;
+    }
+}
+
+TEST(AudioDecoder, SurvivesMalformedFiles) {
+    const auto folder = test::corpus("malformed");
+    QVCT_SKIP_WITHOUT(folder);
+    for (const std::string& path : test::filesBelow(folder)) {
+        Error error;
+        const auto decoder = AudioDecoder::open(path, &error);
+        if (!decoder) {
+            EXPECT_THAT(error.message, testing::HasSubstr(path));
+        } else {
+            OnsetDetector::detect(*decoder);
+        }
+    }
+}
+
+}  // namespace
+}  // namespace qvct
