@@ -54,13 +54,13 @@ struct IndexedDependency {
 };
 
 /// What tells whether a file has changed. Times are nanoseconds since 1970.
-struct FileStamp {
+struct ItemStamp {
     std::uint64_t size = 0;
     std::int64_t modified = 0;
     std::int64_t changed = 0;
     std::uint64_t inode = 0;
 
-    bool operator==(const FileStamp&) const = default;
+    bool operator==(const ItemStamp&) const = default;
 };
 
 /// Everything that the content database knows of one item.
@@ -70,7 +70,7 @@ struct IndexedItem {
     /// Hash of the audio or content alone, so that an item that was moved or retagged is recognised. Empty
     /// when unknown.
     std::string payloadHash;
-    FileStamp stamp;
+    ItemStamp stamp;
 
     /// As the file is called, without its extension.
     std::string name;

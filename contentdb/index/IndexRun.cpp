@@ -91,7 +91,7 @@ bool IndexRun::visit(const std::string& path, const std::vector<ListedItem>& all
     if (options_.parts > 1) part = itemsOfPart(path, all);
     const std::vector<ListedItem>& items = options_.parts > 1 ? part : all;
     progress_.seen += items.size();
-    const FolderRecord known = writer_.folder(path);
+    const FolderRecord known = writer_.store().folder(path);
     if (known.id != 0) visited_.insert(known.id);
     const std::uint64_t digest = digestOf(items);
     // What is missing may have turned up elsewhere.
@@ -123,7 +123,7 @@ std::vector<ListedItem> IndexRun::itemsOfPart(const std::string& path,
 
 bool IndexRun::submitChanged(const std::shared_ptr<OpenFolder>& folder, std::int64_t folderId,
                              const std::vector<ListedItem>& items) {
-    auto known = folderId == 0 ? decltype(writer_.files(0))() : writer_.files(folderId);
+    auto known = folderId == 0 ? decltype(writer_.store().files(0))() : writer_.store().files(folderId);
     const std::int64_t now = wallNanoseconds();
     for (ListedItem item : items) {
         const std::int64_t age = now - item.stamp.changed;
@@ -207,7 +207,7 @@ void IndexRun::store(std::vector<Described>& batch) {
 void IndexRun::storeOne(const Described& described, Pending& pending) {
     const IndexedItem& item = described.item;
     const bool hasFailed = !item.failure.empty();
-    const bool wasAway = item.stamp == FileStamp{} || (hasFailed && isGone(item.path));
+    const bool wasAway = item.stamp == ItemStamp{} || (hasFailed && isGone(item.path));
     if (wasAway) pending.folder->digest = 0;  // the next run reads it again
     if (wasAway && hasFailed) return;         // it is missing, and not broken
     if (hasFailed) {
@@ -230,7 +230,7 @@ void IndexRun::storeOne(const Described& described, Pending& pending) {
 }
 
 void IndexRun::storeFolder(const OpenFolder& folder) {
-    FolderRecord record = writer_.folder(folder.path);
+    FolderRecord record = writer_.store().folder(folder.path);
     if (record.id == 0) return;  // nothing of it was stored
     visited_.insert(record.id);
     record.digest = folder.digest;
@@ -266,7 +266,7 @@ void IndexRun::prune() {
 
 void IndexRun::pruneUnvisited(const std::string& root) {
     std::vector<std::pair<FolderRecord, std::string>> folders;
-    writer_.forEachFolder(root, [&](const FolderRecord& folder, std::string_view path) {
+    writer_.store().forEachFolder(root, [&](const FolderRecord& folder, std::string_view path) {
         if (!visited_.contains(folder.id) && !isBelow(path, unreadable_)) folders.emplace_back(folder, path);
     });
     for (const auto& [folder, path] : folders) {
@@ -279,7 +279,7 @@ void IndexRun::pruneUnvisited(const std::string& root) {
 
 void IndexRun::pruneFolder(const FolderRecord& folder, const std::string& path) {
     const auto otherPath = otherPathOf(path);
-    for (const auto& [name, file] : writer_.files(folder.id)) {
+    for (const auto& [name, file] : writer_.store().files(folder.id)) {
         if (!part_.holds(path, name)) continue;
         const auto other = otherPath ? writer_.store().idOfPath(pathIn(*otherPath, name)) : std::nullopt;
         if (other) {

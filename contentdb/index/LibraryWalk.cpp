@@ -110,13 +110,13 @@ std::int64_t nanoseconds(const timespec& time) {
     return time.tv_sec * second + time.tv_nsec;
 }
 
-FileStamp stampOf(const struct stat& status) {
+ItemStamp stampOf(const struct stat& status) {
     return {static_cast<std::uint64_t>(status.st_size), nanoseconds(status.st_mtim),
             nanoseconds(status.st_ctim), static_cast<std::uint64_t>(status.st_ino)};
 }
 
 /// Makes the stamp tell changes of a second file as well.
-void include(FileStamp& stamp, const FileStamp& other) {
+void include(ItemStamp& stamp, const ItemStamp& other) {
     stamp.size += other.size;
     stamp.modified = std::max(stamp.modified, other.modified);
     stamp.changed = std::max(stamp.changed, other.changed);
@@ -124,7 +124,7 @@ void include(FileStamp& stamp, const FileStamp& other) {
 }
 
 /// Takes in all that lies in a bundle, up to a bound that no bundle reaches.
-void includeContents(int parent, const char* name, FileStamp& stamp, std::size_t& budget, std::size_t depth) {
+void includeContents(int parent, const char* name, ItemStamp& stamp, std::size_t& budget, std::size_t depth) {
     constexpr std::size_t deepest = 16;
     // The bundle itself may be a link; one within it is part of it as it stands.
     const int links = depth == 0 ? 0 : O_NOFOLLOW;

@@ -24,7 +24,7 @@ constexpr std::size_t kAnswersAtOnce = 1U << 16U;
 struct Task {
     std::uint64_t ticket = 0;
     std::string path;
-    FileStamp stamp;
+    ItemStamp stamp;
 };
 
 Task decodedTask(std::string_view message) {
@@ -32,10 +32,7 @@ Task decodedTask(std::string_view message) {
     Task task;
     task.ticket = in.number();
     task.path = in.text();
-    task.stamp.size = in.number();
-    task.stamp.modified = static_cast<std::int64_t>(in.number());
-    task.stamp.changed = static_cast<std::int64_t>(in.number());
-    task.stamp.inode = in.number();
+    task.stamp = in.stamp();
     return task;
 }
 
@@ -43,10 +40,7 @@ std::string encodedAnswer(std::uint64_t ticket, const IndexedItem& item) {
     ByteWriter out;
     out.number(ticket);
     out.text(item.path);
-    out.number(item.stamp.size);
-    out.number(static_cast<std::uint64_t>(item.stamp.modified));
-    out.number(static_cast<std::uint64_t>(item.stamp.changed));
-    out.number(item.stamp.inode);
+    out.stamp(item.stamp);
     out.text(item.payloadHash);
     out.text(encodedDescription(item));
     const std::vector<std::string> terms = termsOf(item);
@@ -138,14 +132,11 @@ bool nextMessage(std::string_view stream, std::size_t& at, std::string_view& mes
     return true;
 }
 
-std::string encodedTask(std::uint64_t ticket, std::string_view path, const FileStamp& stamp) {
+std::string encodedTask(std::uint64_t ticket, std::string_view path, const ItemStamp& stamp) {
     ByteWriter out;
     out.number(ticket);
     out.text(path);
-    out.number(stamp.size);
-    out.number(static_cast<std::uint64_t>(stamp.modified));
-    out.number(static_cast<std::uint64_t>(stamp.changed));
-    out.number(stamp.inode);
+    out.stamp(stamp);
     return out.take();
 }
 
@@ -153,10 +144,7 @@ bool decodeAnswer(std::string_view message, Described& described) {
     ByteReader in(message);
     described.ticket = in.number();
     described.item.path = in.text();
-    described.item.stamp.size = in.number();
-    described.item.stamp.modified = static_cast<std::int64_t>(in.number());
-    described.item.stamp.changed = static_cast<std::int64_t>(in.number());
-    described.item.stamp.inode = in.number();
+    described.item.stamp = in.stamp();
     described.item.payloadHash = in.text();
     const bool isItem = decodeDescription(in.text(), described.item);
     for (std::size_t left = in.count(); left > 0; --left) described.terms.emplace_back(in.text());

@@ -24,7 +24,7 @@ void appendMessage(std::string& stream, std::string_view message);
 /// Takes the first whole message off the stream, from `at` on; false when there is none yet.
 bool nextMessage(std::string_view stream, std::size_t& at, std::string_view& message);
 
-std::string encodedTask(std::uint64_t ticket, std::string_view path, const FileStamp& stamp);
+std::string encodedTask(std::uint64_t ticket, std::string_view path, const ItemStamp& stamp);
 /// Whether the bytes are an answer of a worker.
 bool decodeAnswer(std::string_view message, Described& described);
 

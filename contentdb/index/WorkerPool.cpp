@@ -31,7 +31,7 @@ constexpr unsigned kMostBarrenWorkers = 5;
 
 struct Waiting {
     std::string path;
-    FileStamp stamp;
+    ItemStamp stamp;
 };
 
 struct Process {
@@ -189,7 +189,7 @@ bool WorkerPool::hasRoom() const {
                        [](const Process& process) { return process.waiting.size() < kQueuePerWorker; });
 }
 
-void WorkerPool::submit(std::uint64_t ticket, std::string path, const FileStamp& stamp) {
+void WorkerPool::submit(std::uint64_t ticket, std::string path, const ItemStamp& stamp) {
     auto& processes = implementation_->processes;
     Process& process = *std::min_element(
         processes.begin(), processes.end(),

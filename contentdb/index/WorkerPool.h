@@ -39,7 +39,7 @@ class WorkerPool {
     /// Whether another item can be taken without more memory than a bounded queue.
     bool hasRoom() const;
     /// Hands out the item at the path. The stamp becomes part of what comes back.
-    void submit(std::uint64_t ticket, std::string path, const FileStamp& stamp);
+    void submit(std::uint64_t ticket, std::string path, const ItemStamp& stamp);
     /// Whether items are on their way.
     bool isBusy() const;
     /// Waits a little for what is ready and calls `take` for each, in any order. Whether the pool is in

@@ -26,6 +26,11 @@ IndexedItem readItem(const Statement& row, const Connection& connection) {
     return item;
 }
 
+FolderRecord folderIn(const Statement& row) {
+    return {row.integer(0), row.unsignedInteger(1), row.integer(2),
+            Part{static_cast<unsigned>(row.integer(3)), static_cast<unsigned>(row.integer(4))}};
+}
+
 }  // namespace
 
 ContentStore::ContentStore(Connection& connection)
@@ -36,7 +41,8 @@ ContentStore::ContentStore(Connection& connection)
           "SELECT item.id FROM folder JOIN item ON item.folder = folder.id WHERE path = ? AND file = ?"),
       term_(connection, "SELECT id FROM term WHERE value = ?"),
       terms_(connection, "SELECT id, value FROM term WHERE value >= ? AND value < ? ORDER BY value"),
-      posting_(connection, "SELECT ids FROM posting WHERE key = ?") {}
+      posting_(connection, "SELECT ids FROM posting WHERE key = ?"),
+      folder_(connection, "SELECT id, digest, gone, part, parts FROM folder WHERE path = ?") {}
 
 std::optional<IndexedItem> ContentStore::item(ItemId id) {
     std::optional<IndexedItem> result;
@@ -60,6 +66,40 @@ std::vector<std::string> ContentStore::earlierPaths(ItemId id) {
     std::vector<std::string> paths;
     for (statement.bind(1, id); statement.step();) paths.emplace_back(statement.bytes(0));
     return paths;
+}
+
+FolderRecord ContentStore::folder(std::string_view path) {
+    FolderRecord record;
+    if (folder_.bind(1, path).step()) record = folderIn(folder_);
+    folder_.reset();
+    return record;
+}
+
+std::map<std::string, FileRecord, std::less<>> ContentStore::files(std::int64_t folder) {
+    Statement statement(connection_,
+                        "SELECT file, id, size, modified, changed, inode, failed FROM item WHERE folder = ?");
+    std::map<std::string, FileRecord, std::less<>> files;
+    for (statement.bind(1, folder); statement.step();) {
+        files[std::string(statement.bytes(0))] = {statement.integer(1),
+                                                  {statement.unsignedInteger(2), statement.integer(3),
+                                                   statement.integer(4), statement.unsignedInteger(5)},
+                                                  statement.integer(6) != 0};
+    }
+    return files;
+}
+
+void ContentStore::forEachFolder(std::string_view path,
+                                 const std::function<void(const FolderRecord&, std::string_view)>& visit) {
+    // Everything below "a" begins with "a/" and is less than "a0", '0' being the byte after '/'.
+    const std::string_view base = path == "/" ? std::string_view() : path;
+    const std::string below = std::string(base) + "/";
+    const std::string behind = std::string(base) + "0";
+    Statement statement(connection_,
+                        "SELECT id, digest, gone, part, parts, path FROM folder WHERE path = ?1 OR (path >= "
+                        "?2 AND path < ?3)");
+    for (statement.bind(1, path).bind(2, below).bind(3, behind); statement.step();) {
+        visit(folderIn(statement), statement.bytes(5));
+    }
 }
 
 ItemId ContentStore::lastId() {

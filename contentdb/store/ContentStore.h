@@ -3,11 +3,13 @@
 #include "contentdb/IndexedItem.h"
 #include "contentdb/SearchResults.h"
 #include "contentdb/store/IdSet.h"
+#include "contentdb/store/Part.h"
 #include "contentdb/store/Schema.h"
 #include "contentdb/store/Sqlite.h"
 
 #include <cstdint>
 #include <functional>
+#include <map>
 #include <memory>
 #include <optional>
 #include <string>
@@ -25,7 +27,23 @@ constexpr std::int64_t postingKey(TermId term, std::int64_t chunk) {
 /// More items than this cannot be numbered.
 inline constexpr ItemId kLastItemId = (ItemId{1} << (2 * kChunkBits)) - 1;
 
-/// Reads items and index entries. Every operation throws DatabaseFailure.
+/// What the index remembers of a folder.
+struct FolderRecord {
+    std::int64_t id = 0;
+    std::uint64_t digest = 0;
+    std::int64_t gone = 0;
+    /// The share of its items that the digest speaks for.
+    Part part = {};
+};
+
+/// What the index remembers of a file in a folder.
+struct FileRecord {
+    ItemId id = 0;
+    ItemStamp stamp;
+    bool hasFailed = false;
+};
+
+/// Reads items, folders and index entries. Every operation throws DatabaseFailure.
 class ContentStore {
   public:
     explicit ContentStore(Connection& connection);
@@ -41,6 +59,14 @@ class ContentStore {
     std::uint64_t describer();
     /// Paths and reasons, in the order of items, until `visit` answers false.
     void forEachFailure(const std::function<bool(const IndexedItem&)>& visit);
+
+    /// With the number 0 when the index does not know it.
+    FolderRecord folder(std::string_view path);
+    /// By name.
+    std::map<std::string, FileRecord, std::less<>> files(std::int64_t folder);
+    /// Calls `visit` for every folder at or below the path.
+    void forEachFolder(std::string_view path,
+                       const std::function<void(const FolderRecord&, std::string_view)>& visit);
 
     struct Tag {
         TermId term;
@@ -67,6 +93,7 @@ class ContentStore {
     Statement term_;
     Statement terms_;
     Statement posting_;
+    Statement folder_;
 };
 
 /// Folder and file name of a path.

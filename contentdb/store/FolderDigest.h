@@ -13,7 +13,7 @@ struct ListedItem {
     std::string_view name;
     /// Tells changes of the record, description and preview beside it as well, and of all that lies in a
     /// bundle.
-    FileStamp stamp;
+    ItemStamp stamp;
 };
 
 /// One number for the names and stamps of a folder's items; never 0.

@@ -70,6 +70,13 @@ void ByteWriter::text(std::string_view value) {
     bytes_ += value;
 }
 
+void ByteWriter::stamp(const ItemStamp& value) {
+    number(value.size);
+    number(static_cast<std::uint64_t>(value.modified));
+    number(static_cast<std::uint64_t>(value.changed));
+    number(value.inode);
+}
+
 std::string_view ByteReader::take(std::size_t size) {
     if (size > rest_.size()) {
         isIntact_ = false;
@@ -103,6 +110,15 @@ double ByteReader::real() {
 
 std::string_view ByteReader::text() {
     return take(count());
+}
+
+ItemStamp ByteReader::stamp() {
+    ItemStamp value;
+    value.size = number();
+    value.modified = static_cast<std::int64_t>(number());
+    value.changed = static_cast<std::int64_t>(number());
+    value.inode = number();
+    return value;
 }
 
 std::size_t ByteReader::count() {

@@ -16,6 +16,7 @@ class ByteWriter {
     void number(std::uint64_t value);
     void real(double value);
     void text(std::string_view value);
+    void stamp(const ItemStamp& value);
     std::string take() { return std::move(bytes_); }
 
   private:
@@ -29,6 +30,7 @@ class ByteReader {
     std::uint64_t number();
     double real();
     std::string_view text();
+    ItemStamp stamp();
     /// A number of entries to come, each of at least one byte.
     std::size_t count();
     bool isIntact() const { return isIntact_; }

@@ -1,5 +1,6 @@
 #include "contentdb/store/Merge.h"
 
+#include "contentdb/store/Batches.h"
 #include "contentdb/store/Reading.h"
 #include "contentdb/store/Schema.h"
 #include "contentdb/store/StoreWriter.h"
@@ -13,8 +14,6 @@
 namespace qvct::contentdb {
 namespace {
 
-constexpr std::size_t kBatch = 8192;
-
 /// Folders in the order of a walk: a folder before what is in it, and siblings by name, so that "/" comes
 /// before every other byte.
 struct WalkOrder {
@@ -27,7 +26,7 @@ struct WalkOrder {
 
 struct Source {
     std::unique_ptr<Connection> connection;
-    std::unique_ptr<StoreWriter> reader;
+    std::unique_ptr<ContentStore> store;
 };
 
 class Merge {
@@ -37,16 +36,16 @@ class Merge {
         for (const std::string& database : databases) {
             auto connection = openToRead(database);
             connection->run("BEGIN");  // all of it in one state, whatever a run writes meanwhile
-            auto reader = std::make_unique<StoreWriter>(*connection);
-            sources_.push_back({std::move(connection), std::move(reader)});
+            auto store = std::make_unique<ContentStore>(*connection);
+            sources_.push_back({std::move(connection), std::move(store)});
         }
     }
 
     void run() {
         writer_.setDescriber(describer());
-        writer_.begin();
-        for (const auto& [path, parts] : folders()) addFolder(parts);
-        writer_.commit();
+        Batches batches(writer_);
+        for (const auto& [path, parts] : folders()) addFolder(parts, batches);
+        batches.end();
         connection_->emptyLog();
     }
 
@@ -60,14 +59,14 @@ class Merge {
     /// Of all the sources; 0 when they differ, so that the next run reads everything again.
     std::uint64_t describer() {
         std::set<std::uint64_t> describers;
-        for (const Source& source : sources_) describers.insert(source.reader->store().describer());
+        for (const Source& source : sources_) describers.insert(source.store->describer());
         return describers.size() == 1 ? *describers.begin() : 0;
     }
 
     Folders folders() {
         Folders folders;
         for (std::size_t i = 0; i < sources_.size(); ++i) {
-            sources_[i].reader->forEachFolder("/", [&](const FolderRecord& folder, std::string_view path) {
+            sources_[i].store->forEachFolder("/", [&](const FolderRecord& folder, std::string_view path) {
                 folders[std::string(path)].push_back({i, folder.id});
             });
         }
@@ -76,23 +75,20 @@ class Merge {
 
     /// The items of one folder by name, each from the first source that has it. The folder's digest is left
     /// open: the next run looks at the folder once and then knows it.
-    void addFolder(const std::vector<Part>& parts) {
+    void addFolder(const std::vector<Part>& parts, Batches& batches) {
         std::map<std::string, std::pair<std::size_t, ItemId>> items;
         for (const Part& part : parts) {
-            for (const auto& [name, file] : sources_[part.source].reader->files(part.folder))
+            for (const auto& [name, file] : sources_[part.source].store->files(part.folder))
                 items.try_emplace(name, part.source, file.id);
         }
         for (const auto& [name, place] : items) {
-            ContentStore& store = sources_[place.first].reader->store();
+            ContentStore& store = *sources_[place.first].store;
             const auto item = store.item(place.second);
             if (!item) continue;
             writer_.put(++lastId_, *item, termsOf(*item));
             for (const std::string& path : store.earlierPaths(place.second))
                 writer_.addEarlierPath(lastId_, path);
-            if (++inBatch_ < kBatch) continue;
-            inBatch_ = 0;
-            writer_.commit();
-            writer_.begin();
+            batches.count();
         }
     }
 
@@ -100,7 +96,6 @@ class Merge {
     StoreWriter writer_;
     std::vector<Source> sources_;
     ItemId lastId_ = 0;
-    std::size_t inBatch_ = 0;
 };
 
 }  // namespace

@@ -1,5 +1,6 @@
 #include "contentdb/store/Salvage.h"
 
+#include "contentdb/store/Batches.h"
 #include "contentdb/store/ChecksumVfs.h"
 #include "contentdb/store/DatabaseFiles.h"
 #include "contentdb/store/Schema.h"
@@ -16,7 +17,6 @@
 namespace qvct::contentdb {
 namespace {
 
-constexpr std::size_t kBatch = 8192;
 /// Where the end of a table is damaged its last number is not known. No page stands for more rows than this,
 /// and no row is shorter.
 constexpr std::int64_t kMostMisses = 1 << 16;
@@ -85,24 +85,20 @@ bool isInAnother(const std::string& path, const std::set<std::string>& folders) 
 std::int64_t copyItems(ContentStore& from, const std::string& target) {
     const auto connection = openDatabase(target, Access::write);
     StoreWriter writer(*connection);
-    std::int64_t items = 0;
     if (const auto describer = readable([&] { return from.describer(); })) writer.setDescriber(describer);
-    writer.begin();
+    Batches batches(writer);
     forEachNumber(from.connection(), "item", [&](ItemId id) {
         const auto item = readable([&] { return from.item(id); });
         if (!item) return false;
         writer.put(id, *item, termsOf(*item));
         for (const std::string& path : readable([&] { return from.earlierPaths(id); }))
             writer.addEarlierPath(id, path);
-        if (++items % kBatch == 0) {
-            writer.commit();
-            writer.begin();
-        }
+        batches.count();
         return true;
     });
-    writer.commit();
+    batches.end();
     connection->emptyLog();
-    return items;
+    return batches.items();
 }
 
 }  // namespace

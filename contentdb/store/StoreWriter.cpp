@@ -37,11 +37,6 @@ std::string candidatesWhere(std::string_view condition) {
         condition, kMostCandidates);
 }
 
-FolderRecord folderIn(const Statement& row) {
-    return {row.integer(0), row.unsignedInteger(1), row.integer(2),
-            Part{static_cast<unsigned>(row.integer(3)), static_cast<unsigned>(row.integer(4))}};
-}
-
 }  // namespace
 
 bool isGone(const std::string& path) {
@@ -66,7 +61,6 @@ StoreWriter::StoreWriter(Connection& connection)
       dropPosting_(connection, "DELETE FROM posting WHERE key = ?"),
       sameFiles_(connection, candidatesWhere("AND inode = ?")),
       samePayloads_(connection, candidatesWhere("")),
-      folder_(connection, "SELECT id, digest, gone, part, parts FROM folder WHERE path = ?"),
       putFolder_(connection, "INSERT INTO folder (path, digest, gone) VALUES (?, 0, 0) RETURNING id") {}
 
 StoreWriter::~StoreWriter() = default;
@@ -154,26 +148,6 @@ void StoreWriter::setDescriber(std::uint64_t describer) {
     commit();
 }
 
-FolderRecord StoreWriter::folder(std::string_view path) {
-    FolderRecord record;
-    if (folder_.bind(1, path).step()) record = folderIn(folder_);
-    folder_.reset();
-    return record;
-}
-
-std::map<std::string, FileRecord, std::less<>> StoreWriter::files(std::int64_t folder) {
-    Statement statement(store_.connection(),
-                        "SELECT file, id, size, modified, changed, inode, failed FROM item WHERE folder = ?");
-    std::map<std::string, FileRecord, std::less<>> files;
-    for (statement.bind(1, folder); statement.step();) {
-        files[std::string(statement.bytes(0))] = {statement.integer(1),
-                                                  {statement.unsignedInteger(2), statement.integer(3),
-                                                   statement.integer(4), statement.unsignedInteger(5)},
-                                                  statement.integer(6) != 0};
-    }
-    return files;
-}
-
 void StoreWriter::setFolder(FolderRecord folder) {
     if (left_.contains(folder.id)) folder.digest = 0;
     Statement(store_.connection(), "UPDATE folder SET digest = ?, gone = ?, part = ?, parts = ? WHERE id = ?")
@@ -186,28 +160,14 @@ void StoreWriter::setFolder(FolderRecord folder) {
 }
 
 void StoreWriter::leave(std::string_view path) {
-    FolderRecord record = folder(path);
+    FolderRecord record = store_.folder(path);
     // Once is enough: from then on the digest stays open.
     if (left_.insert(record.id).second) setFolder(record);
 }
 
-void StoreWriter::forEachFolder(std::string_view path,
-                                const std::function<void(const FolderRecord&, std::string_view)>& visit) {
-    // Everything below "a" begins with "a/" and is less than "a0", '0' being the byte after '/'.
-    const std::string_view base = path == "/" ? std::string_view() : path;
-    const std::string below = std::string(base) + "/";
-    const std::string behind = std::string(base) + "0";
-    Statement statement(store_.connection(),
-                        "SELECT id, digest, gone, part, parts, path FROM folder WHERE path = ?1 OR (path >= "
-                        "?2 AND path < ?3)");
-    for (statement.bind(1, path).bind(2, below).bind(3, behind); statement.step();) {
-        visit(folderIn(statement), statement.bytes(5));
-    }
-}
-
 std::int64_t StoreWriter::folderId(std::string_view path) {
     if (lastFolderId_ != 0 && path == lastFolder_) return lastFolderId_;
-    std::int64_t id = folder(path).id;
+    std::int64_t id = store_.folder(path).id;
     if (id == 0) {
         putFolder_.bind(1, path).step();
         id = putFolder_.integer(0);

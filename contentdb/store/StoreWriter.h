@@ -1,10 +1,8 @@
 #pragma once
 
 #include "contentdb/store/ContentStore.h"
-#include "contentdb/store/Part.h"
 
 #include <cstdint>
-#include <map>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -13,22 +11,6 @@
 #include <vector>
 
 namespace qvct::contentdb {
-
-/// What the index remembers of a folder.
-struct FolderRecord {
-    std::int64_t id = 0;
-    std::uint64_t digest = 0;
-    std::int64_t gone = 0;
-    /// The share of its items that the digest speaks for.
-    Part part = {};
-};
-
-/// What the index remembers of a file in a folder.
-struct FileRecord {
-    ItemId id = 0;
-    FileStamp stamp;
-    bool hasFailed = false;
-};
 
 /// Whether no item lies at the path any more. What only cannot be looked at is not gone, nor what lies behind
 /// a link that leads nowhere at the moment: a disk may be away.
@@ -56,14 +38,8 @@ class StoreWriter {
     /// own.
     void setDescriber(std::uint64_t describer);
 
-    FolderRecord folder(std::string_view path);
-    std::map<std::string, FileRecord, std::less<>> files(std::int64_t folder);
     /// A folder that items have left since this writer was made keeps its digest open.
     void setFolder(FolderRecord folder);
-    /// Calls `visit` for every folder at or below the path.
-    void forEachFolder(std::string_view path,
-                       const std::function<void(const FolderRecord&, std::string_view)>& visit);
-
     ContentStore& store() { return store_; }
 
   private:
@@ -94,7 +70,6 @@ class StoreWriter {
     Statement dropPosting_;
     Statement sameFiles_;
     Statement samePayloads_;
-    Statement folder_;
     Statement putFolder_;
 };
 
