@@ -17,6 +17,7 @@ set(QVCT_PUBLIC_HEADERS
   platform/data/PropertyListFile.h
   platform/data/UserDefaults.h
   media/loopfile/RecordKeys.h
+  taxonomy/OptionalLabel.h
   taxonomy/QVTagIdentifierUtility.h
   taxonomy/TaggingSetAdditions.h
   taxonomy/TaggingTypes.h

@@ -6,6 +6,7 @@
 #include "platform/base/Export.h"
 #include "platform/base/Object.h"
 #include "platform/text/Url.h"
+#include "taxonomy/OptionalLabel.h"
 #include "taxonomy/TGRTTaxonomy.h"
 #include "taxonomy/TaggingTypes.h"
 
@@ -32,7 +33,7 @@ class QVCT_API TGRTIndexableContentObject : public Object, public QVContentTaggi
   public:
     using Taggings = ObjectSet<TGRTTagging>;
     using CategoryTaggings = std::map<std::string, Taggings, std::less<>>;
-    using OptionalLabel = std::optional<std::string_view>;
+    using OptionalLabel = qvct::OptionalLabel;
 
     /// An empty one.
     static std::shared_ptr<TGRTIndexableContentObject> init();

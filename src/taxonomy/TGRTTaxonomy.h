@@ -6,9 +6,11 @@
 #include "platform/base/ObjectSet.h"
 #include "platform/data/PropertyList.h"
 #include "platform/text/Url.h"
+#include "taxonomy/OptionalLabel.h"
 #include "taxonomy/TGRTCategory.h"
 #include "taxonomy/TGRTTag.h"
 
+#include <cstddef>
 #include <cstdint>
 #include <map>
 #include <memory>
@@ -35,7 +37,8 @@ class QVCT_API QVContentTaggingTaxonomy {
     using Localization = std::map<std::string, std::string>;
 
     virtual ~QVContentTaggingTaxonomy() = default;
-    virtual const ObjectSet<TGRTCategory>& categories() const = 0;
+    /// A copy, which outlives the taxonomy.
+    virtual ObjectSet<TGRTCategory> categories() const = 0;
     virtual Localization localizationDictionary() const = 0;
     virtual std::string localizedStrings() const = 0;
     /// Writes the property list. False, and an error, when it cannot be written: to a URL that is no file's,
@@ -56,7 +59,7 @@ class QVCT_API TGRTTaxonomy : public Object, public QVContentTaggingTaxonomy {
   public:
     using TagPointer = std::shared_ptr<TGRTTag>;
     using CategoryPointer = std::shared_ptr<TGRTCategory>;
-    using OptionalLabel = std::optional<std::string_view>;
+    using OptionalLabel = qvct::OptionalLabel;
 
     // Obtaining one.
 
@@ -104,7 +107,7 @@ class QVCT_API TGRTTaxonomy : public Object, public QVContentTaggingTaxonomy {
 
     bool readOnly() const { return readOnly_; }
     void setReadOnly(bool readOnly) { readOnly_ = readOnly; }
-    const ObjectSet<TGRTCategory>& categories() const override { return categories_; }
+    ObjectSet<TGRTCategory> categories() const override { return categories_; }
     /// Ignored when read-only.
     void addCategory(const CategoryPointer& category);
     /// The category, made when it is not there. Null when it would have to be made in a read-only taxonomy.
@@ -131,6 +134,7 @@ class QVCT_API TGRTTaxonomy : public Object, public QVContentTaggingTaxonomy {
     TagPointer findTagForLabel(std::string_view label, std::string_view categoryIdentifier) const;
     TagPointer findTagForLabel(std::string_view label, OptionalLabel parentLabel,
                                std::string_view categoryIdentifier) const;
+    TagPointer findTagForLabel(std::string_view label, std::nullptr_t) const = delete;
     /// @}
     /// Depth first, in order; a tag with the label under another parent is passed over with its children.
     static TagPointer findTagWithLabel(std::string_view label, OptionalLabel parentLabel,

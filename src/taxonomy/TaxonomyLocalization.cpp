@@ -66,7 +66,7 @@ std::string quoted(std::string text) {
 Localization localizationOf(const TGRTTaxonomy& taxonomy) {
     const bool reversed = UserDefaults::boolForKey("fakeLocalization");
     Localization strings;
-    std::vector<TagPointer> tags = taxonomy.allTags();
+    auto tags = taxonomy.allTags();
     std::stable_sort(tags.begin(), tags.end(),
                      [](const auto& a, const auto& b) { return a->label() < b->label(); });
     for (const auto& tag : tags) addTag(strings, *tag, reversed);

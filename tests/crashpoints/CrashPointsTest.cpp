@@ -6,6 +6,7 @@
 #include "formats/FormatsSupport.h"
 #include "formats/TGRTFileNode.h"
 #include "media/loopfile/LCFileWriter.h"
+#include "media/loopfile/LCFingerprint.h"
 #include "platform/files/EditLock.h"
 #include "platform/files/UnfinishedFile.h"
 #include "support/AudioFixtures.h"

@@ -3,6 +3,7 @@
 #include "formats/audiofile/TGRTAudioFileTypeValidator.h"
 #include "media/loopfile/LCFileParser.h"
 #include "media/loopfile/LCFileWriter.h"
+#include "media/loopfile/LCFingerprint.h"
 #include "support/AudioFixtures.h"
 
 #include <algorithm>

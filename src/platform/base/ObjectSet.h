@@ -68,7 +68,9 @@ class ObjectSet {
     std::size_t size() const { return objects_.size(); }
     bool empty() const { return objects_.empty(); }
     /// The objects in the order of insertion.
-    const std::vector<Pointer>& ordered() const { return objects_; }
+    const std::vector<Pointer>& ordered() const& { return objects_; }
+    /// Of a set that ends here: a loop over `set().ordered()` would outlive what it loops over.
+    std::vector<Pointer> ordered() && { return std::move(objects_); }
     auto begin() const { return objects_.begin(); }
     auto end() const { return objects_.end(); }
 
