@@ -7,7 +7,6 @@
 #include "Measure.h"
 #include "contentdb/ContentDatabase.h"
 #include "contentdb/ContentDescriber.h"
-#include "contentdb/index/LibraryWalk.h"
 #include "contentdb/store/StoreWriter.h"
 #include "contentdb/terms/Terms.h"
 #include "contentdb/terms/Words.h"

@@ -1,8 +1,8 @@
 #include "contentdb/index/IndexRun.h"
 
-#include "contentdb/store/Paths.h"
 #include "contentdb/terms/Terms.h"
 #include "platform/files/FileAccess.h"
+#include "platform/files/Paths.h"
 #include "platform/text/Text.h"
 
 #include <algorithm>
@@ -69,17 +69,12 @@ bool IndexRun::walk(const std::string& folder) {
     if (isStopped_) return areWorkersInOrder_;
     roots_.push_back(folder);
     listed_ = 0;
-    if (isDirectory(folder))
-        walkLibrary(
-            folder,
-            [this](const std::string& path, const std::vector<ListedItem>& items) {
-                return visit(path, items);
-            },
-            [this](const std::string& path, const Error& error) {
-                unreadable_.insert(path);
-                if (options_.failed) options_.failed(error);
-            },
-            options_.links);
+    const auto tell = [this](const std::string& path, const Error& error) {
+        unreadable_.insert(path);
+        if (options_.failed) options_.failed(error);
+    };
+    const auto show = [&](const ContentFolder& found) { return visit(found.path, listedItems(found, tell)); };
+    if (isDirectory(folder)) walkContentFolders(folder, show, tell, options_.links);
     if (listed_ == 0 && !options_.pruneRoots) bareRoots_.emplace(folder, 0);
     return areWorkersInOrder_;
 }

@@ -1,7 +1,7 @@
 #pragma once
 
 #include "contentdb/Indexer.h"
-#include "contentdb/index/LibraryWalk.h"
+#include "contentdb/index/ItemStamps.h"
 #include "contentdb/index/WorkerPool.h"
 #include "contentdb/store/StoreWriter.h"
 

@@ -1,7 +1,7 @@
 #include "contentdb/store/ContentStore.h"
 
 #include "contentdb/store/ItemCodec.h"
-#include "contentdb/store/Paths.h"
+#include "platform/files/Paths.h"
 #include "platform/text/Text.h"
 
 #include <fmt/format.h>

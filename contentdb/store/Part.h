@@ -1,7 +1,7 @@
 #pragma once
 
-#include "contentdb/store/Paths.h"
 #include "platform/base/Object.h"
+#include "platform/files/Paths.h"
 
 #include <string_view>
 

@@ -1,10 +1,10 @@
 #include "contentdb/store/StoreWriter.h"
 
 #include "contentdb/store/ItemCodec.h"
-#include "contentdb/store/Paths.h"
 #include "contentdb/terms/Terms.h"
 #include "contentdb/terms/Words.h"
 #include "formats/QVContentTaggingTypes.h"
+#include "platform/files/Paths.h"
 #include "platform/text/Text.h"
 #include "platform/text/Url.h"
 

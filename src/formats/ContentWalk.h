@@ -10,13 +10,6 @@
 
 namespace qvct {
 
-/// Whether a name is that of content: its extension is that of a file kind that the framework knows, it is
-/// not hidden, and it is not the recorded preview of another item.
-///
-/// Data files (".data") do not count: half of the world's programs call files so, and only a search through
-/// all of its bytes tells whether one carries a record. Who names one can read it.
-QVCT_API bool isContentName(const URL& url);
-
 /// What a walk does with links, and whom it tells.
 struct WalkedLinks {
     /// Who writes to the items should say none: else files outside of the folder are written to, too.
@@ -25,12 +18,13 @@ struct WalkedLinks {
     std::function<void(const URL& link)> passedOver;
 };
 
-/// Calls `item` for every content item at or below `path`, in the order of names.
+/// Calls `item` for every content item at or below `path`: those of a folder by name, then those below it.
 ///
-/// Folders are walked; a bundle is an item, what lies inside it is not. Links to folders are followed as
-/// `links` says, after all else, to folders that were not entered yet: each is entered once. `path` itself is
-/// followed always, and when it names a file, that is an item whatever its name. What cannot be read is
-/// reported to `failed`, and the walk goes on. Each function may be empty.
+/// Folders are walked; a bundle is an item, what lies inside it is not; pipes, sockets and devices are none.
+/// Links to folders are followed as `links` says, after all else, to folders that were not entered yet: each
+/// is entered once. `path` itself is followed always, and when it names a file, that is an item whatever its
+/// name. What cannot be read or listed, such as a folder whose path is too long for the system, is told to
+/// `failed`, and the walk goes on. Each function may be empty.
 /// @cost  One listing a folder; files are looked at only where the file system does not tell their kind.
 QVCT_API void walkContent(const std::string& path, const std::function<void(const URL& item)>& item,
                           const std::function<void(const Error& error)>& failed,

@@ -3,7 +3,7 @@
 #include "commands/Commands.h"
 #include "contentdb/ContentDatabase.h"
 #include "contentdb/ContentDescriber.h"
-#include "contentdb/index/LibraryWalk.h"
+#include "formats/ContentFolderWalk.h"
 #include "output/Progress.h"
 #include "output/StandardStreams.h"
 #include "platform/text/Text.h"
@@ -59,6 +59,17 @@ void printRun(const Json& run, const IndexProgress& progress, const ToolContext&
     print("; {:.1f} s, {:.0f} a second\n", run["seconds"].get<double>(), run["itemsPerSecond"].get<double>());
 }
 
+/// By listing alone, for the bar; what cannot be listed the run tells.
+std::uint64_t countItems(const std::string& folder, LinksOutside links) {
+    std::uint64_t count = 0;
+    const auto add = [&count](const ContentFolder& found) {
+        count += found.items.size();
+        return true;
+    };
+    walkContentFolders(folder, add, nullptr, {links, nullptr});
+    return count;
+}
+
 void run(Options& options, ToolContext& context) {
     const auto services = optionsForServices(options.services, context);
     if (context.exitStatus() != 0) return;  // half of the services would mark the items as done
@@ -69,7 +80,7 @@ void run(Options& options, ToolContext& context) {
     index.timeLimitPerItem = std::chrono::seconds(options.secondsPerItem);
     std::uint64_t total = 0;
     if (bar.isShown()) {
-        for (const std::string& folder : index.folders) total += contentdb::countContentNames(folder);
+        for (const std::string& folder : index.folders) total += countItems(folder, index.links.outside);
     }
     index.progress = [&](const IndexProgress& at) {
         bar.show(at.unchanged + at.described + at.failed, total / index.parts);

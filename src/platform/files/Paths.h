@@ -3,7 +3,7 @@
 #include <string>
 #include <string_view>
 
-namespace qvct::contentdb {
+namespace qvct {
 
 /// The path of what lies in a folder under a name. The root folder is "/".
 inline std::string pathIn(std::string_view folder, std::string_view name) {
@@ -13,4 +13,4 @@ inline std::string pathIn(std::string_view folder, std::string_view name) {
     return path;
 }
 
-}  // namespace qvct::contentdb
+}  // namespace qvct

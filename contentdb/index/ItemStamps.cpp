@@ -1,0 +1,82 @@
+#include "contentdb/index/ItemStamps.h"
+
+#include "platform/files/Paths.h"
+
+#include <algorithm>
+#include <array>
+#include <string>
+
+namespace qvct::contentdb {
+namespace {
+
+ItemStamp stampOf(const EntryStatus& status) {
+    return {status.size, status.modified, status.changed, status.inode};
+}
+
+/// Makes the stamp tell changes of a second file as well.
+void include(ItemStamp& stamp, const EntryStatus& other) {
+    stamp.size += other.size;
+    stamp.modified = std::max(stamp.modified, other.modified);
+    stamp.changed = std::max(stamp.changed, other.changed);
+    stamp.inode = stamp.inode * 31 + other.inode;
+}
+
+/// Takes in all that lies in a bundle, up to a bound that no bundle reaches. The bundle itself may be a link;
+/// one within it is part of it as it stands.
+class BundleStamp {
+  public:
+    explicit BundleStamp(ItemStamp& stamp) : stamp_(stamp) {}
+
+    void include(const FolderListing& parent, const FolderListing::Entry& bundle, int depth = 0) {
+        constexpr int deepest = 16;
+        const auto listing =
+            depth > deepest ? std::nullopt : parent.readIn(bundle, depth == 0 ? Links::follow : Links::keep);
+        if (!listing) return;
+        for (const FolderListing::Entry& entry : listing->entries()) {
+            const auto status = left_ == 0 ? std::nullopt : listing->status(entry, Links::keep);
+            if (!status) continue;
+            --left_;
+            contentdb::include(stamp_, *status);
+            if (status->kind == EntryKind::folder) include(*listing, entry, depth + 1);
+        }
+    }
+
+  private:
+    ItemStamp& stamp_;
+    int left_ = 10'000;
+};
+
+/// The record, description and preview that lie beside an item. The size stays the item's own.
+void includeCompanions(const FolderListing& listing, ListedItem& item) {
+    constexpr std::array<std::string_view, 4> endings = {"plist", "zxml", "xml", "caf"};
+    const std::uint64_t size = item.stamp.size;
+    const std::string start = std::string(item.name) + '.';
+    for (const FolderListing::Entry& companion : listing.entriesThatBegin(start)) {
+        const std::string_view ending = companion.name.substr(start.size());
+        if (std::find(endings.begin(), endings.end(), ending) == endings.end()) continue;
+        if (const auto status = listing.status(companion, Links::follow)) include(item.stamp, *status);
+    }
+    item.stamp.size = size;
+}
+
+}  // namespace
+
+std::vector<ListedItem> listedItems(const ContentFolder& folder, const WalkFailure& failed) {
+    std::vector<ListedItem> items;
+    items.reserve(folder.items.size());
+    for (const ContentFolder::Item& found : folder.items) {
+        Error error;
+        const auto status = folder.listing.status(found.entry, Links::follow, folder.path, &error);
+        if (!status) {
+            failed(pathIn(folder.path, found.entry.name), error);
+            continue;
+        }
+        ListedItem item{found.entry.name, stampOf(*status)};
+        includeCompanions(folder.listing, item);
+        if (found.kind == ContentKind::bundle) BundleStamp(item.stamp).include(folder.listing, found.entry);
+        items.push_back(item);
+    }
+    return items;
+}
+
+}  // namespace qvct::contentdb
