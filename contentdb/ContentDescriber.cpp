@@ -12,10 +12,9 @@
 #include "media/loopfile/LCFileData.h"
 #include "platform/base/Version.h"
 #include "platform/files/FileAccess.h"
-#include "platform/files/ResourceBundle.h"
 #include "platform/text/RegularExpression.h"
 #include "platform/text/Text.h"
-#include "resources/ResourceFiles.h"
+#include "resources/ReplacementFile.h"
 
 #include <array>
 #include <cmath>
@@ -173,11 +172,11 @@ std::uint64_t ContentDescriber::digest(std::uint64_t services) {
     digest.add(services);
     digest.add(version());
     digest.add(edition);
-    for (const auto& [name, extension] : kResourceFiles) {
-        const auto path = ResourceBundle::pathForResource(name, extension);
+    for (const ResourceFile& resource : kResourceFiles) {
+        const auto path = replacementFile(resource);
         const auto bytes = path ? readFile(*path) : std::nullopt;
         if (!bytes) continue;
-        digest.add(name);
+        digest.add(resource.name);
         digest.add({reinterpret_cast<const char*>(bytes->data()), bytes->size()});
     }
     return digest.value();

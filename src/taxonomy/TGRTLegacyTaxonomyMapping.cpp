@@ -2,10 +2,10 @@
 
 #include "platform/base/Log.h"
 #include "platform/files/FileAccess.h"
-#include "platform/files/ResourceBundle.h"
 #include "platform/text/Text.h"
+#include "resources/LegacyMappingTable.h"
 #include "resources/QVCTCompiledResources.h"
-#include "taxonomy/LegacyMappingTable.h"
+#include "resources/ReplacementFile.h"
 #include "taxonomy/LegacyTagLookup.h"
 
 #include <algorithm>
@@ -21,11 +21,10 @@ using MappingPointer = std::shared_ptr<const TGRTLegacyTaxonomyMapping>;
 constexpr std::string_view kSeparator = ";";
 
 std::optional<URL> tableURL(std::string_view name) {
-    const auto path = ResourceBundle::pathForResource(name, "csv");
+    const auto path = replacementFile({name, "csv"});
     return path ? std::optional(URL::fileURLWithPath(*path)) : std::nullopt;
 }
 
-/// The file wins over the compiled-in lines even when it is no table.
 MappingPointer sharedMapping(const std::optional<URL>& file,
                              std::optional<TGRTLegacyTaxonomyMapping::Lines> (*compiledLines)(),
                              const TGRTTaxonomy& taxonomy) {

@@ -2,10 +2,10 @@
 
 #include "platform/base/EvictableCache.h"
 #include "platform/data/PropertyListFile.h"
-#include "platform/files/ResourceBundle.h"
 #include "platform/text/Text.h"
+#include "resources/LegacyMappingTable.h"
 #include "resources/QVCTCompiledResources.h"
-#include "taxonomy/LegacyMappingTable.h"
+#include "resources/ReplacementFile.h"
 #include "taxonomy/TGRTTagging.h"
 #include "taxonomy/TaggingTypes.h"
 #include "taxonomy/TaxonomyLocalization.h"
@@ -110,7 +110,7 @@ std::shared_ptr<TGRTTaxonomy> TGRTTaxonomy::newTaxonomyOfType(std::int64_t type,
 std::optional<URL> TGRTTaxonomy::taxonomyURLForType(std::int64_t type) {
     constexpr std::array names = {"DefaultTaxonomy", "LegacyVorthalTaxonomy", "LegacyLoopTaxonomy"};
     if (type > kDefaultTaxonomy || type < kLegacyLoopTaxonomy) return std::nullopt;
-    const auto path = ResourceBundle::pathForResource(names[static_cast<std::size_t>(-type)], "plist");
+    const auto path = replacementFile({names[static_cast<std::size_t>(-type)], "plist"});
     return path ? std::optional(URL::fileURLWithPath(*path)) : std::nullopt;
 }
 

@@ -1,8 +1,8 @@
 #include "platform/base/Log.h"
 #include "platform/text/Text.h"
+#include "resources/LegacyMappingTable.h"
 #include "resources/QVCTCompiledResources.h"
 #include "support/TemporaryFolder.h"
-#include "taxonomy/LegacyMappingTable.h"
 #include "taxonomy/LegacyTagLookup.h"
 #include "taxonomy/TGRTLegacyTaxonomyMapping.h"
 

@@ -3,10 +3,10 @@
 #include "autotagging/keywords/KeywordExpression.h"
 #include "platform/base/Log.h"
 #include "platform/data/PropertyListFile.h"
-#include "platform/files/ResourceBundle.h"
 #include "platform/text/LiteralTrie.h"
 #include "platform/text/Text.h"
 #include "resources/QVCTCompiledResources.h"
+#include "resources/ReplacementFile.h"
 
 #include <algorithm>
 #include <unordered_set>
@@ -60,10 +60,10 @@ bool compiles(std::string_view keyword) {
 }  // namespace
 
 Dictionary QVCTKeywordExtractor::defaultKeywordMapping() {
-    if (const auto path = ResourceBundle::pathForResource("DefaultKeywordMapping", "plist")) {
-        if (auto mapping = readDictionaryFile(*path)) return *mapping;
-    }
-    return QVCTCompiledResources::DefaultKeywordMappingPlist().value_or(Dictionary{});
+    const auto read = [](const std::string& path) { return readDictionaryFile(path); };
+    return replacedOrBuiltIn({"DefaultKeywordMapping", "plist"}, read,
+                             QVCTCompiledResources::DefaultKeywordMappingPlist)
+        .value_or(Dictionary{});
 }
 
 std::shared_ptr<QVCTKeywordExtractor> QVCTKeywordExtractor::defaultKeywordExtractor() {

@@ -2,8 +2,8 @@
 
 #include "autotagging/xml/QVCTXMLDocument.h"
 #include "platform/files/FileAccess.h"
-#include "platform/files/ResourceBundle.h"
 #include "resources/QVCTCompiledResources.h"
+#include "resources/ReplacementFile.h"
 
 #include <mutex>
 #include <string>
@@ -19,11 +19,9 @@ ScriptLimits& currentLimits() {
 }
 
 std::string scriptResource(const std::string& name) {
-    if (const auto path = ResourceBundle::pathForResource(name, "js")) {
-        if (auto text = readTextFile(*path)) return *std::move(text);
-    }
-    static const std::string library = QVCTCompiledResources::QVSearchKitJS().value_or("");
-    return library;
+    static const auto library = QVCTCompiledResources::QVSearchKitJS();
+    const auto read = [](const std::string& path) { return readTextFile(path); };
+    return replacedOrBuiltIn({name, "js"}, read, [] { return library; }).value_or("");
 }
 
 }  // namespace

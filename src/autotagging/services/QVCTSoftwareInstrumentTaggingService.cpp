@@ -2,8 +2,8 @@
 
 #include "autotagging/scripts/QVCTJavaScriptUtilities.h"
 #include "platform/files/FileAccess.h"
-#include "platform/files/ResourceBundle.h"
 #include "resources/QVCTCompiledResources.h"
+#include "resources/ReplacementFile.h"
 
 #include <utility>
 
@@ -11,10 +11,10 @@ namespace qvct {
 namespace {
 
 std::string script() {
-    if (const auto path = ResourceBundle::pathForResource("ExtractSoftwareInstrumentsRule", "js")) {
-        if (auto text = readTextFile(*path)) return *std::move(text);
-    }
-    return QVCTCompiledResources::ExtractSoftwareInstrumentsRuleJS().value_or("");
+    const auto read = [](const std::string& path) { return readTextFile(path); };
+    return replacedOrBuiltIn({"ExtractSoftwareInstrumentsRule", "js"}, read,
+                             QVCTCompiledResources::ExtractSoftwareInstrumentsRuleJS)
+        .value_or("");
 }
 
 }  // namespace

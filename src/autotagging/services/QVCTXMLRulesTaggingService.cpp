@@ -7,9 +7,9 @@
 #include "platform/data/Json.h"
 #include "platform/data/PropertyListFile.h"
 #include "platform/files/FileAccess.h"
-#include "platform/files/ResourceBundle.h"
 #include "platform/text/Text.h"
 #include "resources/QVCTCompiledResources.h"
+#include "resources/ReplacementFile.h"
 
 #include <cstdlib>
 #include <string_view>
@@ -107,12 +107,9 @@ QVCTXMLRulesTaggingService::QVCTXMLRulesTaggingService(const PropertyList::Dicti
 }
 
 PropertyList::Dictionary QVCTXMLRulesTaggingService::defaultRules() {
-    if (const auto path = ResourceBundle::pathForResource("DefaultRules", "plist")) {
-        Error error;
-        if (auto rules = readDictionaryFile(*path, &error)) return *std::move(rules);
-        log(error.message);
-    }
-    return QVCTCompiledResources::DefaultRulesPlist().value_or(PropertyList::Dictionary{});
+    const auto read = [](const std::string& path) { return readDictionaryFile(path); };
+    return replacedOrBuiltIn({"DefaultRules", "plist"}, read, QVCTCompiledResources::DefaultRulesPlist)
+        .value_or(PropertyList::Dictionary{});
 }
 
 void QVCTXMLRulesTaggingService::setupWithRules(const PropertyList::Dictionary& rules) {

@@ -1,0 +1,112 @@
+#include "resources/ReplacementFile.h"
+
+#include "platform/base/Log.h"
+#include "platform/data/PropertyListFile.h"
+#include "platform/files/FileAccess.h"
+#include "platform/files/FileStamp.h"
+#include "platform/files/ResourceBundle.h"
+#include "platform/text/Text.h"
+#include "resources/LegacyMappingTable.h"
+
+#include <algorithm>
+#include <map>
+#include <mutex>
+#include <vector>
+
+#include <fmt/format.h>
+
+namespace qvct {
+namespace {
+
+constexpr std::string_view kRules = "DefaultRules";
+
+bool isMappingTable(std::string_view text, const std::string& path, Error* error) {
+    const std::vector<std::string> lines = split(replaceAll(text, "\r\n", "\n"), "\n");
+    if (lines.front() != kLegacyMappingHeader)
+        return fail(error, kErrorMalformed, fmt::format("{}, line 1: is not the header", printable(path)));
+    for (std::size_t i = 1; i < lines.size(); ++i) {
+        const auto separators = std::count(lines[i].begin(), lines[i].end(), ';');
+        if (lines[i].empty() || separators + 1 == kLegacyMappingFieldCount) continue;
+        return fail(error, kErrorMalformed,
+                    fmt::format("{}, line {}: has not {} fields", printable(path), i + 1,
+                                std::size_t{kLegacyMappingFieldCount}));
+    }
+    return true;
+}
+
+bool isUsable(const ResourceFile& resource, const std::string& path, Error* error) {
+    if (resource.extension == "plist") return readResourceDictionary(resource.name, path, error).has_value();
+    const auto text = readTextFile(path, error);
+    return text && (!resource.name.ends_with("TaxonomyMapping") || isMappingTable(*text, path, error));
+}
+
+/// What was found of a file, and in which state it was then.
+struct Verdict {
+    FileStamp stamp;
+    bool isUsable = false;
+    Error error;
+};
+
+Verdict judge(const ResourceFile& resource, const std::string& path, FileStamp stamp) {
+    Verdict verdict{stamp, false, {}};
+    verdict.isUsable = isUsable(resource, path, &verdict.error);
+    if (!verdict.isUsable) verdict.error.message += " (using the built-in one)";
+    return verdict;
+}
+
+/// The verdicts that were reached, by path: there are no more than resources.
+class Verdicts {
+  public:
+    std::optional<Verdict> of(const std::string& path, FileStamp stamp) {
+        const std::lock_guard lock(mutex_);
+        const auto known = verdicts_.find(path);
+        const bool isOfNow = known != verdicts_.end() && known->second.stamp == stamp;
+        return isOfNow ? std::optional(known->second) : std::nullopt;
+    }
+
+    /// Whether it is new: another thread may have come to the same meanwhile.
+    bool set(const std::string& path, const Verdict& verdict) {
+        const std::lock_guard lock(mutex_);
+        Verdict& known = verdicts_[path];
+        const bool isNew = known.stamp != verdict.stamp;
+        known = verdict;
+        return isNew;
+    }
+
+  private:
+    std::mutex mutex_;
+    std::map<std::string, Verdict> verdicts_;
+};
+
+}  // namespace
+
+std::optional<std::string> replacementFile(const ResourceFile& resource, Error* error) {
+    static Verdicts verdicts;
+    const auto path = ResourceBundle::pathForResource(resource.name, resource.extension);
+    if (!path) return std::nullopt;
+    const FileStamp stamp = FileStamp::ofFile(*path);
+    auto verdict = verdicts.of(*path, stamp);
+    if (!verdict) {
+        verdict = judge(resource, *path, stamp);
+        if (verdicts.set(*path, *verdict) && !verdict->isUsable) log(verdict->error.message);
+    }
+    if (verdict->isUsable) return path;
+    if (error != nullptr) *error = verdict->error;
+    return std::nullopt;
+}
+
+std::optional<PropertyList::Dictionary> readResourceDictionary(std::string_view name, const std::string& path,
+                                                               Error* error) {
+    auto dictionary = readDictionaryFile(path, error);
+    const std::string_view key = name == kRules ? name : name.ends_with("Taxonomy") ? "categories" : "";
+    if (!dictionary || key.empty()) return dictionary;
+    const PropertyList* value = dictionary->value(key);
+    if (value != nullptr && (name == kRules ? value->array() != nullptr : value->dictionary() != nullptr))
+        return dictionary;
+    fail(error, kErrorMalformed,
+         fmt::format("{}: {} \"{}\"", printable(path),
+                     value == nullptr ? "there is no key" : "there are no entries under", key));
+    return std::nullopt;
+}
+
+}  // namespace qvct
