@@ -8,6 +8,7 @@ set(QVCT_PUBLIC_HEADERS
   platform/base/Object.h
   platform/base/ObjectSet.h
   platform/base/Version.h
+  platform/text/DecimalFormatter.h
   platform/text/RegularExpression.h
   platform/text/Url.h
   platform/files/EditLock.h
@@ -17,6 +18,7 @@ set(QVCT_PUBLIC_HEADERS
   platform/data/PropertyListFile.h
   platform/data/UserDefaults.h
   media/loopfile/RecordKeys.h
+  resources/EmbeddedFiles.h
   taxonomy/OptionalLabel.h
   taxonomy/QVTagIdentifierUtility.h
   taxonomy/TaggingSetAdditions.h

@@ -91,9 +91,15 @@ std::string TGRTTagging::displayString() const {
 
 ObjectSet<TGRTTagging> TGRTTagging::taggingsWithTaggingDictionary(const PropertyList* dictionary,
                                                                   TGRTTaxonomy& taxonomy) {
+    const bool holdsTaggings = dictionary != nullptr && dictionary->dictionary() != nullptr;
+    return holdsTaggings ? taggingsWithTaggingDictionary(*dictionary->dictionary(), taxonomy)
+                         : ObjectSet<TGRTTagging>{};
+}
+
+ObjectSet<TGRTTagging> TGRTTagging::taggingsWithTaggingDictionary(const PropertyList::Dictionary& dictionary,
+                                                                  TGRTTaxonomy& taxonomy) {
     ObjectSet<TGRTTagging> taggings;
-    if (dictionary == nullptr || dictionary->dictionary() == nullptr) return taggings;
-    for (const auto& category : *dictionary->dictionary()) {
+    for (const auto& category : dictionary) {
         if (category.value.array() == nullptr) continue;
         for (const PropertyList& entry : *category.value.array()) {
             taggings.insert(taggingForEntry(entry, category.key, taxonomy));
@@ -103,6 +109,11 @@ ObjectSet<TGRTTagging> TGRTTagging::taggingsWithTaggingDictionary(const Property
 }
 
 ObjectSet<TGRTTagging> TGRTTagging::taggingsWithTaggingDictionary(const PropertyList* dictionary) {
+    return taggingsWithTaggingDictionary(dictionary, *TGRTTaxonomy::mutableDefaultTaxonomy());
+}
+
+ObjectSet<TGRTTagging> TGRTTagging::taggingsWithTaggingDictionary(
+    const PropertyList::Dictionary& dictionary) {
     return taggingsWithTaggingDictionary(dictionary, *TGRTTaxonomy::mutableDefaultTaxonomy());
 }
 

@@ -60,12 +60,20 @@ class QVCT_API TGRTTagging : public Object, public QVContentTaggingIndexableTagg
     /// How weights are written that are none of the four named levels: one decimal. Shared by all threads.
     static const DecimalFormatter& doubleFormatter();
 
-    /// The taggings that a tagging dictionary holds. Unknown labels are added to the taxonomy, or dropped
-    /// when it is read-only; entries that are not as they should be are passed over.
+    /// @{
+    /// The taggings that a tagging dictionary holds; none for null or another value. Unknown labels are added
+    /// to the taxonomy, or dropped when it is read-only; entries that are not as they should be are passed
+    /// over.
     static ObjectSet<TGRTTagging> taggingsWithTaggingDictionary(const PropertyList* dictionary,
                                                                 TGRTTaxonomy& taxonomy);
+    static ObjectSet<TGRTTagging> taggingsWithTaggingDictionary(const PropertyList::Dictionary& dictionary,
+                                                                TGRTTaxonomy& taxonomy);
+    /// @}
+    /// @{
     /// The same in the shared writable default taxonomy, which thereby may grow.
     static ObjectSet<TGRTTagging> taggingsWithTaggingDictionary(const PropertyList* dictionary);
+    static ObjectSet<TGRTTagging> taggingsWithTaggingDictionary(const PropertyList::Dictionary& dictionary);
+    /// @}
     /// Category identifier → entries by label, as files store them.
     static PropertyList::Dictionary taggingDictionaryForTaggings(const ObjectSet<TGRTTagging>& taggings);
     /// The same of an array: equal taggings each get an entry, in their order. Null ones are ignored.

@@ -137,6 +137,11 @@ std::shared_ptr<TGRTTaxonomy> TGRTTaxonomy::taxonomyWithData(std::span<const std
     return list && list->dictionary() != nullptr ? taxonomyWithDictionary(*list->dictionary()) : nullptr;
 }
 
+std::shared_ptr<TGRTTaxonomy> TGRTTaxonomy::taxonomyWithData(std::string_view data, Error* error) {
+    return taxonomyWithData(std::span(reinterpret_cast<const std::uint8_t*>(data.data()), data.size()),
+                            error);
+}
+
 std::shared_ptr<TGRTTaxonomy> TGRTTaxonomy::taxonomyWithDictionary(
     const PropertyList::Dictionary& dictionary) {
     auto taxonomy = init();
@@ -283,6 +288,12 @@ std::vector<TGRTTaxonomy::TagPointer> TGRTTaxonomy::allTags() const {
         tags.insert(tags.end(), category->tags().begin(), category->tags().end());
     }
     return tags;
+}
+
+ObjectSet<TGRTTag> TGRTTaxonomy::tagsForTaggings(const ObjectSet<TGRTTagging>& taggings,
+                                                 OptionalLabel categoryIdentifier,
+                                                 bool includingAncestors) const {
+    return tagsForTaggings(taggings.ordered(), categoryIdentifier, includingAncestors);
 }
 
 ObjectSet<TGRTTag> TGRTTaxonomy::tagsForTaggings(const std::vector<std::shared_ptr<TGRTTagging>>& taggings,

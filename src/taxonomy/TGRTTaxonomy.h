@@ -81,9 +81,12 @@ class QVCT_API TGRTTaxonomy : public Object, public QVContentTaggingTaxonomy {
     static std::optional<PropertyList::Dictionary> taxonomyDictionaryForType(std::int64_t type);
     /// An empty taxonomy, and an error, when the file cannot be read.
     static std::shared_ptr<TGRTTaxonomy> taxonomyWithContentsOfURL(const URL& url, Error* error = nullptr);
+    /// @{
     /// Null, and an error, when the bytes are no property list; null alone when they are no dictionary.
     static std::shared_ptr<TGRTTaxonomy> taxonomyWithData(std::span<const std::uint8_t> data,
                                                           Error* error = nullptr);
+    static std::shared_ptr<TGRTTaxonomy> taxonomyWithData(std::string_view data, Error* error = nullptr);
+    /// @}
     /// The taxonomy of a property list's dictionary. What is not of its type is passed over; never null.
     static std::shared_ptr<TGRTTaxonomy> taxonomyWithDictionary(const PropertyList::Dictionary& dictionary);
     /// An empty, writable one.
@@ -142,10 +145,15 @@ class QVCT_API TGRTTaxonomy : public Object, public QVContentTaggingTaxonomy {
     /// Whether the tag's category has an equal tag. False for null.
     bool doesContainTag(const TagPointer& tag) const;
     std::vector<TagPointer> allTags() const;
+    /// @{
     /// The tags of this taxonomy that the taggings name, in one category or in all.
+    ObjectSet<TGRTTag> tagsForTaggings(const ObjectSet<TGRTTagging>& taggings,
+                                       OptionalLabel categoryIdentifier,
+                                       bool includingAncestors = false) const;
     ObjectSet<TGRTTag> tagsForTaggings(const std::vector<std::shared_ptr<TGRTTagging>>& taggings,
                                        OptionalLabel categoryIdentifier,
                                        bool includingAncestors = false) const;
+    /// @}
     /// Adds the tag that the tagging names, if this taxonomy has it, and if asked for what it hangs below.
     void appendTagsOfTagging(const TGRTTagging& tagging, ObjectSet<TGRTTag>& set,
                              bool includingAncestors) const;

@@ -122,9 +122,7 @@ TEST(Taxonomy, SurvivesBeingWrittenAndReadBack) {
     const auto readTags = read->allTags();
     ASSERT_EQ(readTags.size(), originalTags.size());
     for (std::size_t i = 0; i < readTags.size(); ++i) EXPECT_TRUE(readTags[i]->isEqual(*originalTags[i]));
-    const std::string binary = original->serializedTaxonomyData();
-    const auto fromData =
-        TGRTTaxonomy::taxonomyWithData({reinterpret_cast<const std::uint8_t*>(binary.data()), binary.size()});
+    const auto fromData = TGRTTaxonomy::taxonomyWithData(original->serializedTaxonomyData());
     EXPECT_EQ(fromData->allTags().size(), originalTags.size());
 }
 
@@ -185,9 +183,7 @@ TEST(Taxonomy, SaysWhatCouldNotBeRead) {
     EXPECT_THAT(error.message, testing::HasSubstr("/no/such.plist"));
     const std::string noList = "<plist><string>x</string></plist>";
     Error none;
-    EXPECT_EQ(TGRTTaxonomy::taxonomyWithData(
-                  {reinterpret_cast<const std::uint8_t*>(noList.data()), noList.size()}, &none),
-              nullptr);
+    EXPECT_EQ(TGRTTaxonomy::taxonomyWithData(noList, &none), nullptr);
     EXPECT_EQ(none.message, "");
 }
 

@@ -1,5 +1,7 @@
 #pragma once
 
+#include "platform/base/Export.h"
+
 #include <memory>
 #include <string>
 
@@ -9,7 +11,7 @@ namespace qvct {
 ///
 /// The locale is that of the moment of creation. Making one takes some microseconds, using it is cheap and
 /// safe from every thread.
-class DecimalFormatter {
+class QVCT_API DecimalFormatter {
   public:
     explicit DecimalFormatter(int fractionDigits);
     DecimalFormatter(DecimalFormatter&&) noexcept;
