@@ -21,12 +21,10 @@ namespace {
 /// The tagging that a tag dictionary stands for, or null when the taxonomy does not know its label.
 std::shared_ptr<TGRTTagging> taggingForTagDictionary(const TagDictionary& dictionary,
                                                      const TGRTTaxonomy& taxonomy) {
-    const PropertyList* label = dictionary.value(kTagDictionaryLabelKey);
-    const std::string* text = label == nullptr ? nullptr : label->string();
-    if (text == nullptr) return nullptr;
-    const PropertyList* level = dictionary.value(kTagDictionaryLevelKey);
-    const std::optional<double> weight = level == nullptr ? std::nullopt : level->doubleValue();
-    auto tagging = TGRTTagging::initWithTag(taxonomy.findTagForLabel(*text),
+    const std::string* label = dictionary.string(kTagDictionaryLabelKey);
+    if (label == nullptr) return nullptr;
+    const std::optional<double> weight = dictionary.doubleValue(kTagDictionaryLevelKey);
+    auto tagging = TGRTTagging::initWithTag(taxonomy.findTagForLabel(*label),
                                             weight ? TGRTLevel::levelWithWeight(*weight) : nullptr);
     if (tagging) tagging->setIsAutoTagging(true);
     return tagging;

@@ -5,15 +5,6 @@
 #include <fmt/format.h>
 
 namespace qvct {
-namespace {
-
-std::optional<std::string> stringUnder(std::string_view key, const PropertyList::Dictionary& dictionary) {
-    const PropertyList* value = dictionary.value(key);
-    const std::string* text = value == nullptr ? nullptr : value->string();
-    return text == nullptr ? std::nullopt : std::optional(*text);
-}
-
-}  // namespace
 
 std::shared_ptr<TGRTApplicationInfo> TGRTApplicationInfo::init() {
     return std::shared_ptr<TGRTApplicationInfo>(new TGRTApplicationInfo);
@@ -22,10 +13,9 @@ std::shared_ptr<TGRTApplicationInfo> TGRTApplicationInfo::init() {
 std::shared_ptr<TGRTApplicationInfo> TGRTApplicationInfo::initWithDictionary(
     const PropertyList::Dictionary& dictionary) {
     auto info = init();
-    info->appIdentifier_ = stringUnder(QVContentInfoAppIdentifierKey, dictionary);
-    info->minimumVersion_ = stringUnder(QVContentInfoMinimumVersionKey, dictionary);
-    const PropertyList* legacy = dictionary.value(QVContentInfoLegacyKey);
-    info->legacy_ = legacy != nullptr && legacy->boolValue();
+    if (const auto* text = dictionary.string(QVContentInfoAppIdentifierKey)) info->appIdentifier_ = *text;
+    if (const auto* text = dictionary.string(QVContentInfoMinimumVersionKey)) info->minimumVersion_ = *text;
+    info->legacy_ = dictionary.boolValue(QVContentInfoLegacyKey);
     return info;
 }
 

@@ -5,14 +5,6 @@
 #include <fmt/format.h>
 
 namespace qvct {
-namespace {
-
-const PropertyList::Array* arrayUnder(std::string_view key, const PropertyList::Dictionary& dictionary) {
-    const PropertyList* value = dictionary.value(key);
-    return value == nullptr ? nullptr : value->array();
-}
-
-}  // namespace
 
 std::shared_ptr<TGRTContentInfo> TGRTContentInfo::init() {
     std::shared_ptr<TGRTContentInfo> info(new TGRTContentInfo);
@@ -23,14 +15,14 @@ std::shared_ptr<TGRTContentInfo> TGRTContentInfo::init() {
 std::shared_ptr<TGRTContentInfo> TGRTContentInfo::initWithDictionary(const PropertyList* dictionary) {
     auto info = init();
     if (dictionary == nullptr || dictionary->dictionary() == nullptr) return info;
-    if (const auto* dependencies = arrayUnder(QVContentInfoDependenciesKey, *dictionary->dictionary())) {
+    if (const auto* dependencies = dictionary->dictionary()->array(QVContentInfoDependenciesKey)) {
         std::vector<std::string> paths;
         for (const PropertyList& path : *dependencies) {
             if (path.string() != nullptr) paths.push_back(*path.string());
         }
         info->updateDependencyPaths(paths);
     }
-    if (const auto* infos = arrayUnder(QVContentInfoApplicationInfosKey, *dictionary->dictionary())) {
+    if (const auto* infos = dictionary->dictionary()->array(QVContentInfoApplicationInfosKey)) {
         info->setupApplicationInfosFromArray(*infos);
     }
     return info;

@@ -15,20 +15,9 @@
 namespace qvct {
 namespace {
 
-std::int64_t integerUnder(std::string_view key, const PropertyList::Dictionary& dictionary) {
-    const PropertyList* value = dictionary.value(key);
-    return value == nullptr ? 0 : value->integerValue().value_or(0);
-}
-
-const std::string* stringUnder(std::string_view key, const PropertyList::Dictionary& dictionary) {
-    const PropertyList* value = dictionary.value(key);
-    return value == nullptr ? nullptr : value->string();
-}
-
 /// A value that says the number already, in whatever type, stays.
 void setInteger(std::string_view key, std::int64_t number, PropertyList::Dictionary& dictionary) {
-    const PropertyList* value = std::as_const(dictionary).value(key);
-    if (value == nullptr || value->integerValue() != number) dictionary.set(key, number);
+    if (dictionary.integerValue(key) != number) dictionary.set(key, number);
 }
 
 bool isKeyOfRecord(std::string_view key) {
@@ -71,7 +60,7 @@ void TGRTMetaData::storeInto(PropertyList::Dictionary& stored) const {
     if (subFileType_ != 0) setInteger(QVContentTaggingSubTypeKeyName, subFileType_, stored);
     if (displayName_) {
         stored.set(QVContentTaggingDisplayKeyName, *displayName_);
-    } else if (stringUnder(QVContentTaggingDisplayKeyName, stored) != nullptr) {
+    } else if (stored.string(QVContentTaggingDisplayKeyName) != nullptr) {
         stored.remove(QVContentTaggingDisplayKeyName);
     }
 }
@@ -100,10 +89,9 @@ std::shared_ptr<TGRTMetaData> TGRTMetaData::metaDataFromDictionary(const Propert
                                                                    TGRTTaxonomy& taxonomy) {
     if (dictionary == nullptr) return nullptr;
     auto record = init();
-    if (const std::string* name = stringUnder(QVContentTaggingDisplayKeyName, *dictionary))
-        record->displayName_ = *name;
-    record->fileType_ = integerUnder(QVContentTaggingTypeKeyName, *dictionary);
-    record->subFileType_ = integerUnder(QVContentTaggingSubTypeKeyName, *dictionary);
+    if (const auto* name = dictionary->string(QVContentTaggingDisplayKeyName)) record->displayName_ = *name;
+    record->fileType_ = dictionary->integerValue(QVContentTaggingTypeKeyName).value_or(0);
+    record->subFileType_ = dictionary->integerValue(QVContentTaggingSubTypeKeyName).value_or(0);
     record->contentInfo_ = contentInfoFromDictionary(*dictionary);
     record->keyValues_ = keyValuesFromDictionary(*dictionary);
     record->taggings_ = taggingsFromDictionary(*dictionary, taxonomy);

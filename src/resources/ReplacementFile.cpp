@@ -100,12 +100,13 @@ std::optional<PropertyList::Dictionary> readResourceDictionary(std::string_view 
     auto dictionary = readDictionaryFile(path, error);
     const std::string_view key = name == kRules ? name : name.ends_with("Taxonomy") ? "categories" : "";
     if (!dictionary || key.empty()) return dictionary;
-    const PropertyList* value = dictionary->value(key);
-    if (value != nullptr && (name == kRules ? value->array() != nullptr : value->dictionary() != nullptr))
-        return dictionary;
+    const bool hasEntries =
+        name == kRules ? dictionary->array(key) != nullptr : dictionary->dictionary(key) != nullptr;
+    if (hasEntries) return dictionary;
     fail(error, kErrorMalformed,
          fmt::format("{}: {} \"{}\"", printable(path),
-                     value == nullptr ? "there is no key" : "there are no entries under", key));
+                     dictionary->value(key) == nullptr ? "there is no key" : "there are no entries under",
+                     key));
     return std::nullopt;
 }
 

@@ -145,9 +145,9 @@ std::shared_ptr<TGRTTaxonomy> TGRTTaxonomy::taxonomyWithData(std::string_view da
 std::shared_ptr<TGRTTaxonomy> TGRTTaxonomy::taxonomyWithDictionary(
     const PropertyList::Dictionary& dictionary) {
     auto taxonomy = init();
-    const PropertyList* categories = dictionary.value(kCategoriesKey);
-    if (categories == nullptr || categories->dictionary() == nullptr) return taxonomy;
-    for (const auto& entry : *categories->dictionary()) {
+    const PropertyList::Dictionary* categories = dictionary.dictionary(kCategoriesKey);
+    if (categories == nullptr) return taxonomy;
+    for (const auto& entry : *categories) {
         const auto category = TGRTCategory::initWithIdentifier(entry.key);
         taxonomy->addCategory(category);
         if (const auto* tags = entry.value.dictionary()) tagsFromDictionary(*tags, nullptr, category);

@@ -16,11 +16,11 @@ std::unordered_set<std::string> ownScripts() {
         if (text) scripts.insert(*text);
     }
     const auto rules = QVCTCompiledResources::DefaultRulesPlist();
-    const PropertyList* list = rules ? rules->value("DefaultRules") : nullptr;
-    if (list == nullptr || list->array() == nullptr) return scripts;
-    for (const PropertyList& rule : *list->array()) {
-        const PropertyList* text = rule.dictionary() != nullptr ? rule.dictionary()->value("rule") : nullptr;
-        if (text != nullptr && text->string() != nullptr) scripts.insert(*text->string());
+    const PropertyList::Array* list = rules ? rules->array("DefaultRules") : nullptr;
+    if (list == nullptr) return scripts;
+    for (const PropertyList& rule : *list) {
+        const auto* text = rule.dictionary() == nullptr ? nullptr : rule.dictionary()->string("rule");
+        if (text != nullptr) scripts.insert(*text);
     }
     return scripts;
 }

@@ -25,8 +25,7 @@ constexpr std::string_view kScriptType = "JavaScript";
 constexpr std::string_view kFileScheme = "file://";
 
 std::optional<std::string> textForKey(const PropertyList::Dictionary& dictionary, std::string_view key) {
-    const PropertyList* value = dictionary.value(key);
-    const std::string* text = value == nullptr ? nullptr : value->string();
+    const std::string* text = dictionary.string(key);
     return text == nullptr ? std::nullopt : std::optional(*text);
 }
 
@@ -113,11 +112,11 @@ PropertyList::Dictionary QVCTXMLRulesTaggingService::defaultRules() {
 }
 
 void QVCTXMLRulesTaggingService::setupWithRules(const PropertyList::Dictionary& rules) {
-    const PropertyList* list = rules.value("DefaultRules");
-    if (list == nullptr || list->array() == nullptr) return;
+    const PropertyList::Array* list = rules.array("DefaultRules");
+    if (list == nullptr) return;
     const PropertyList::Dictionary empty;
     std::size_t number = 0;
-    for (const PropertyList& element : *list->array()) {
+    for (const PropertyList& element : *list) {
         const PropertyList::Dictionary& rule =
             element.dictionary() != nullptr ? *element.dictionary() : empty;
         const bool hasType = rule.value("type") != nullptr;

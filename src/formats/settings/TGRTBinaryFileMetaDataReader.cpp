@@ -54,10 +54,9 @@ std::shared_ptr<TGRTMetaData> TGRTBinaryFileMetaDataReader::readMetaDataFromURL(
     const PropertyList::Dictionary dictionary = extracted.value_or(PropertyList::Dictionary{});
     auto record = TGRTMetaData::init();
     record->setTaggings(TGRTMetaData::taggingsFromDictionary(dictionary, *taxonomy()));
-    const PropertyList* type = dictionary.value(QVContentTaggingTypeKeyName);
-    if (type != nullptr) record->setFileType(type->integerValue().value_or(kFileTypeNone));
-    const PropertyList* name = dictionary.value(QVContentTaggingDisplayKeyName);
-    if (name != nullptr && name->string() != nullptr) record->setDisplayName(*name->string());
+    if (dictionary.value(QVContentTaggingTypeKeyName) != nullptr)
+        record->setFileType(dictionary.integerValue(QVContentTaggingTypeKeyName).value_or(kFileTypeNone));
+    if (const auto* name = dictionary.string(QVContentTaggingDisplayKeyName)) record->setDisplayName(*name);
     if (dictionary.value(QVContentInfoKey) != nullptr) {
         record->setContentInfo(TGRTMetaData::contentInfoFromDictionary(dictionary));
     }

@@ -55,8 +55,7 @@ float LCFileData::real(std::string_view key, double highest, float otherwise) co
 }
 
 std::optional<std::string> LCFileData::text(std::string_view key) const {
-    const PropertyList* value = record_.value(key);
-    const std::string* string = value == nullptr ? nullptr : value->string();
+    const std::string* string = record_.string(key);
     return string == nullptr ? std::nullopt : std::optional(*string);
 }
 
@@ -75,8 +74,7 @@ bool LCFileData::hasLoopTypeChunks() const {
 
 const LCFileData::Dictionary& LCFileData::taggingDictionary() const {
     static const Dictionary none;
-    const PropertyList* value = record_.value(QVContentTaggingKeyName);
-    const Dictionary* dictionary = value == nullptr ? nullptr : value->dictionary();
+    const Dictionary* dictionary = record_.dictionary(QVContentTaggingKeyName);
     return dictionary == nullptr ? none : *dictionary;
 }
 
@@ -86,8 +84,7 @@ void LCFileData::setTaggingDictionary(Dictionary value) {
 }
 
 const LCFileData::Dictionary* LCFileData::contentInfoDictionary() const {
-    const PropertyList* value = record_.value(QVContentInfoKey);
-    return value == nullptr ? nullptr : value->dictionary();
+    return record_.dictionary(QVContentInfoKey);
 }
 
 void LCFileData::setContentInfoDictionary(Dictionary value) {
@@ -171,8 +168,7 @@ void LCFileData::setLengthInSeconds(float value) {
 }
 
 std::set<std::string> LCFileData::descriptors() const {
-    const PropertyList* value = record_.value(kDescriptors);
-    const PropertyList::Array* items = value == nullptr ? nullptr : value->array();
+    const PropertyList::Array* items = record_.array(kDescriptors);
     if (items == nullptr) return facts_.descriptors;
     std::set<std::string> result;
     for (const PropertyList& item : *items) {
@@ -210,8 +206,7 @@ void LCFileData::setGenreTag(std::optional<std::string> value) {
 }
 
 const PropertyList::Data& LCFileData::midiData() const {
-    const PropertyList* value = record_.value(kMidiData);
-    const PropertyList::Data* data = value == nullptr ? nullptr : value->data();
+    const PropertyList::Data* data = record_.data(kMidiData);
     return data == nullptr ? facts_.midiData : *data;
 }
 
@@ -220,8 +215,7 @@ void LCFileData::setMidiData(PropertyList::Data value) {
 }
 
 std::vector<std::int64_t> LCFileData::transientMarkers() const {
-    const PropertyList* value = record_.value(kTransientMarkers);
-    const PropertyList::Array* items = value == nullptr ? nullptr : value->array();
+    const PropertyList::Array* items = record_.array(kTransientMarkers);
     if (items == nullptr) return facts_.transientMarkers;
     const bool isLengthKnown = facts_.frameCount > 0;
     const std::int64_t lastFrame = isLengthKnown ? static_cast<std::int64_t>(facts_.frameCount) : INT64_MAX;

@@ -26,6 +26,41 @@ PropertyList* PropertyList::Dictionary::value(std::string_view key) {
     return const_cast<PropertyList*>(std::as_const(*this).value(key));
 }
 
+const PropertyList::Dictionary* PropertyList::Dictionary::dictionary(std::string_view key) const {
+    const PropertyList* found = value(key);
+    return found == nullptr ? nullptr : found->dictionary();
+}
+
+const PropertyList::Array* PropertyList::Dictionary::array(std::string_view key) const {
+    const PropertyList* found = value(key);
+    return found == nullptr ? nullptr : found->array();
+}
+
+const std::string* PropertyList::Dictionary::string(std::string_view key) const {
+    const PropertyList* found = value(key);
+    return found == nullptr ? nullptr : found->string();
+}
+
+const PropertyList::Data* PropertyList::Dictionary::data(std::string_view key) const {
+    const PropertyList* found = value(key);
+    return found == nullptr ? nullptr : found->data();
+}
+
+std::optional<double> PropertyList::Dictionary::doubleValue(std::string_view key) const {
+    const PropertyList* found = value(key);
+    return found == nullptr ? std::nullopt : found->doubleValue();
+}
+
+std::optional<std::int64_t> PropertyList::Dictionary::integerValue(std::string_view key) const {
+    const PropertyList* found = value(key);
+    return found == nullptr ? std::nullopt : found->integerValue();
+}
+
+bool PropertyList::Dictionary::boolValue(std::string_view key) const {
+    const PropertyList* found = value(key);
+    return found != nullptr && found->boolValue();
+}
+
 void PropertyList::Dictionary::set(std::string_view key, PropertyList newValue) {
     if (PropertyList* present = value(key)) {
         *present = std::move(newValue);

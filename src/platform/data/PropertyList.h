@@ -54,6 +54,17 @@ class QVCT_API PropertyList {
         const PropertyList* value(std::string_view key) const;
         PropertyList* value(std::string_view key);
         /// @}
+        /// @{
+        /// What stands under `key`, if it is of that type (see PropertyList's operations of these names);
+        /// else null, nothing or false.
+        const Dictionary* dictionary(std::string_view key) const;
+        const Array* array(std::string_view key) const;
+        const std::string* string(std::string_view key) const;
+        const Data* data(std::string_view key) const;
+        std::optional<double> doubleValue(std::string_view key) const;
+        std::optional<std::int64_t> integerValue(std::string_view key) const;
+        bool boolValue(std::string_view key) const;
+        /// @}
         /// Replaces the value under `key` where it stands, or appends it.
         void set(std::string_view key, PropertyList value);
         /// Appends without looking for `key`, which the caller knows to be absent.
