@@ -119,9 +119,9 @@ void addAnyRhythm(const URL& url, const TGRTTaxonomy& taxonomy, ObjectSet<TGRTTa
     if (!rhythm) return;
     for (const TagDictionary& tag :
          QVCTRhythmicTaggingService::tagsForValues(rhythm->density, rhythm->complexity)) {
-        auto tagging = TGRTTagging::initWithTag(
-            taxonomy.findTagForLabel(*tag.value(kTagDictionaryLabelKey)->string()),
-            TGRTLevel::levelWithWeight(*tag.value(kTagDictionaryLevelKey)->doubleValue()));
+        auto tagging =
+            TGRTTagging::initWithTag(taxonomy.findTagForLabel(*tag.string(kTagDictionaryLabelKey)),
+                                     TGRTLevel::levelWithWeight(*tag.doubleValue(kTagDictionaryLevelKey)));
         if (tagging) tagging->setIsAutoTagging(true);
         taggings.insert(tagging);
     }

@@ -37,14 +37,10 @@ std::shared_ptr<QVCTXMLDocument> documentOf(const URL& url) {
 }
 
 std::string textOf(const TagDictionary& tag) {
-    const PropertyList* label = tag.value(kTagDictionaryLabelKey);
-    const PropertyList* level = tag.value(kTagDictionaryLevelKey);
-    std::string text =
-        label != nullptr && label->string() != nullptr ? printable(*label->string()) : "(no label)";
-    if (const auto weight = level == nullptr ? std::nullopt : level->doubleValue()) {
-        text += fmt::format(" {:.0f}%", *weight * 100);
-    }
-    return text;
+    const std::string* label = tag.string(kTagDictionaryLabelKey);
+    const auto level = tag.doubleValue(kTagDictionaryLevelKey);
+    return (label == nullptr ? "(no label)" : printable(*label)) +
+           (level ? fmt::format(" {:.0f}%", *level * 100) : "");
 }
 
 Json jsonOf(const TagDictionary& tag) {

@@ -1,7 +1,7 @@
 #include "output/Output.h"
 
-#include "contentdb/store/Decimal.h"
 #include "output/StandardStreams.h"
+#include "platform/text/Decimal.h"
 #include "platform/text/Text.h"
 
 #include <algorithm>
@@ -56,7 +56,7 @@ void printJson(const Json& items, Format format) {
 Json jsonOfNumber(double number) {
     constexpr double exact = 9007199254740992;  // up to which every whole number has its own double
     if (std::trunc(number) == number && std::abs(number) <= exact) return static_cast<std::int64_t>(number);
-    return contentdb::decimalOf(number);
+    return decimalOf(number);
 }
 
 Json jsonOfTagging(const TGRTTagging& tagging) {

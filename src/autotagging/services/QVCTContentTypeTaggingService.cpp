@@ -28,7 +28,7 @@ struct Item {
     const LCFileData* file;
     TagDictionarySet tags;
 
-    void add(std::string_view label) { tags.insert({{std::string(kTagDictionaryLabelKey), label}}); }
+    void add(std::string_view label) { tags.insert(tagDictionary(label)); }
     std::int64_t subType() const { return record == nullptr ? 0 : record->subFileType(); }
 };
 

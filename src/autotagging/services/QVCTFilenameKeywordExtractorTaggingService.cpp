@@ -26,11 +26,9 @@ TagDictionarySet QVCTFilenameKeywordExtractorTaggingService::tagsWithContentsOfU
     if ((options & QVCTAutoTaggingOptionFilenameKeywords) == 0 || !isValidUtf8(text)) return tags;
     for (const auto& [result, _] : keywordExtractor_->extractKeywordsFromString(text)) {
         std::optional<double> level;
-        std::string label = labelFromString(result, &level);
-        if (label.empty()) continue;
-        TagDictionary tag{{std::string(kTagDictionaryLabelKey), std::move(label)}};
-        if (level) tag.append(std::string(kTagDictionaryLevelKey), double{static_cast<float>(*level)});
-        tags.insert(std::move(tag));
+        const std::string label = labelFromString(result, &level);
+        if (level) level = static_cast<float>(*level);
+        if (!label.empty()) tags.insert(tagDictionary(label, level));
     }
     return tags;
 }

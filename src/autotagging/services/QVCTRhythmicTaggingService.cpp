@@ -10,13 +10,9 @@
 namespace qvct {
 
 TagDictionarySet QVCTRhythmicTaggingService::tagsForValues(float density, float complexity) {
-    const auto tag = [](std::string_view label, float level) {
-        return TagDictionary{{std::string(kTagDictionaryLabelKey), label},
-                             {std::string(kTagDictionaryLevelKey), double{level}}};
-    };
     TagDictionarySet tags;
-    tags.insert(tag("Rhythmic Density", density));
-    tags.insert(tag("Rhythmic Complexity", complexity));
+    tags.insert(tagDictionary("Rhythmic Density", density));
+    tags.insert(tagDictionary("Rhythmic Complexity", complexity));
     return tags;
 }
 

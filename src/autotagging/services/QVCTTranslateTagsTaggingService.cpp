@@ -30,9 +30,8 @@ TagDictionarySet QVCTTranslateTagsTaggingService::tagsWithContentsOfURL(
     TagDictionarySet tags;
     if ((options & QVCTAutoTaggingOptionTranslateTags) == 0) return tags;
     for (const auto& tagging : translatedTaggings(url, fileData)) {
-        TagDictionary tag{{std::string(kTagDictionaryLabelKey), tagging->label()}};
-        if (tagging->level()) tag.append(std::string(kTagDictionaryLevelKey), tagging->level()->weight());
-        tags.insert(std::move(tag));
+        const auto& level = tagging->level();
+        tags.insert(tagDictionary(tagging->label(), level ? std::optional(level->weight()) : std::nullopt));
     }
     return tags;
 }

@@ -36,7 +36,7 @@ TagDictionarySet QVCTUserGeneratedTaggingService::tagsWithContentsOfURL(
     TagDictionarySet tags;
     if ((options & QVCTAutoTaggingOptionUserGenerated) == 0 || liesInPackFolder(url)) return tags;
     if (metaData && !TGRTPackage::identifiersForMetaData(*metaData).empty()) return tags;
-    tags.insert({{std::string(kTagDictionaryLabelKey), kUserGenerated}});
+    tags.insert(tagDictionary(kUserGenerated));
     return tags;
 }
 

@@ -82,7 +82,7 @@ std::vector<TagDictionary> evaluate(std::string_view type, const std::string& te
                                     const std::shared_ptr<QVCTXMLDocument>& document, std::string* evidence) {
     if (type == kXPathType) {
         if (!tag || !matches(text, *document, evidence)) return {};
-        return {TagDictionary{{std::string(kTagDictionaryLabelKey), PropertyList(*tag)}}};
+        return {tagDictionary(*tag)};
     }
     auto result = QVCTJavaScriptUtilities::tagsForXMLDocument(document, text);
     if (evidence != nullptr && result) *evidence = jsonText(PropertyList(*result), JsonStyle::compact);

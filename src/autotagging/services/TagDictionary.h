@@ -3,6 +3,8 @@
 #include "platform/data/PropertyList.h"
 
 #include <algorithm>
+#include <optional>
+#include <string>
 #include <string_view>
 #include <utility>
 #include <vector>
@@ -16,6 +18,12 @@ using TagDictionary = PropertyList::Dictionary;
 inline constexpr std::string_view kTagDictionaryLabelKey = "label";
 /// Key of its level, a number in [0, 1].
 inline constexpr std::string_view kTagDictionaryLevelKey = "level";
+
+inline TagDictionary tagDictionary(std::string_view label, std::optional<double> level = std::nullopt) {
+    TagDictionary tag{{std::string(kTagDictionaryLabelKey), label}};
+    if (level) tag.append(std::string(kTagDictionaryLevelKey), *level);
+    return tag;
+}
 
 /// Tag dictionaries, each once, in the order in which they were added. Two are the same only when all their
 /// keys and values are.

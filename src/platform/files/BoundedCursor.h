@@ -71,8 +71,6 @@ class BoundedCursor {
     std::uint32_t fourCC() { return static_cast<std::uint32_t>(number(4, ByteOrder::big)); }
 
     void skip(std::uint64_t count);
-    /// Moves to an absolute place ahead.
-    void skipTo(std::uint64_t position) { skip(position - std::min(position, position_)); }
     std::vector<std::uint8_t> bytes(std::uint64_t count);
     std::string text(std::uint64_t count);
     /// A cursor over the next `count` bytes, which this one passes.

@@ -4,7 +4,7 @@
 #include <charconv>
 #include <cmath>
 
-namespace qvct::contentdb {
+namespace qvct {
 
 /// The number that was meant by one that was kept in single precision: 86.6 for 86.5999984741211, the
 /// shortest decimal that single precision keeps as the same. Whole numbers, and those of double precision,
@@ -19,4 +19,4 @@ inline double decimalOf(double number) {
     return number;
 }
 
-}  // namespace qvct::contentdb
+}  // namespace qvct
