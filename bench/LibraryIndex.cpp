@@ -296,9 +296,13 @@ void benchSearch(std::size_t count, const std::string& path) {
 int main(int argc, char** argv) {
     const std::string_view what = argc > 1 ? argv[1] : "";
     const std::size_t count = argc > 2 ? std::strtoull(argv[2], nullptr, 10) : 100000;
-    std::string pattern = (fs::temp_directory_path() / "qvct-bench-XXXXXX").string();
-    const std::string folder = argc > 3 ? argv[3] : ::mkdtemp(pattern.data());
-    fs::create_directories(folder);
+    const fs::path parent = argc > 3 ? fs::path(argv[3]) : fs::temp_directory_path();
+    std::string pattern = (parent / "qvct-bench-XXXXXX").string();
+    if (::mkdtemp(pattern.data()) == nullptr) {
+        fmt::print(stderr, "{}: {}\n", parent.string(), std::strerror(errno));
+        return 1;
+    }
+    const std::string& folder = pattern;
     if (what == "" || what == "index") benchIndex(count, folder);
     if (what == "" || what == "search") benchSearch(count, folder + "/search.db");
     fs::remove_all(folder);

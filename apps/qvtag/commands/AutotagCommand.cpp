@@ -8,6 +8,7 @@
 #include "formats/QVContentTaggingTypes.h"
 #include "formats/TGRTFileNode.h"
 #include "media/loopfile/LCFileParser.h"
+#include "output/ItemTable.h"
 #include "output/StandardStreams.h"
 #include "platform/data/PropertyListFile.h"
 #include "platform/text/Text.h"
@@ -70,28 +71,12 @@ Json jsonOfItem(const Item& item) {
     return json;
 }
 
-/// One heading a folder, below it a line an item: its name and its tags.
-void printTable(const std::vector<Item>& items, const Terminal& terminal) {
-    constexpr std::size_t widestName = 40;
-    std::size_t width = 0;
-    for (const Item& item : items) width = std::max(width, displayWidth(item.url.lastPathComponent()));
-    width = std::min(width, widestName);
-    std::string folder;
-    for (const Item& item : items) {
-        const std::string itsFolder = item.url.URLByDeletingLastPathComponent().path();
-        if (itsFolder != folder) {
-            print("{}{}\n", folder.empty() ? "" : "\n",
-                  colored(terminal, Color::strong, printable(itsFolder)));
-            folder = itsFolder;
-        }
-        std::vector<Word> words;
-        for (const auto& tagging : item.taggings) {
-            words.push_back({textOfTagging(*tagging), tagging->level() ? Color::accent : Color::plain});
-        }
-        if (words.empty()) words.push_back({"no tags", Color::faint});
-        print("  {}  {}\n", padded(printable(item.url.lastPathComponent()), width),
-              wrapped(terminal, words, width + 4));
-    }
+ItemRow rowOf(const Item& item) {
+    ItemRow row{item.url.path(), {}};
+    for (const auto& tagging : item.taggings)
+        row.words.push_back({textOfTagging(*tagging), tagging->level() ? Color::accent : Color::plain});
+    if (row.words.empty()) row.words.push_back({"no tags", Color::faint});
+    return row;
 }
 
 void noteTotals(const std::vector<Item>& items, const ToolContext& context) {
@@ -140,7 +125,9 @@ void run(const Options& options, ToolContext& context) {
         items.push_back({url, sortedTaggings(taggings)});
     }
     if (context.format == Format::table) {
-        printTable(items, context.terminal());
+        std::vector<ItemRow> rows;
+        for (const Item& item : items) rows.push_back(rowOf(item));
+        printItemTable(rows, context.terminal());
         return noteTotals(items, context);
     }
     Json json = Json::array();

@@ -2,6 +2,7 @@
 #include "commands/Commands.h"
 #include "contentdb/ContentDatabase.h"
 #include "formats/QVContentTaggingTypes.h"
+#include "output/ItemTable.h"
 #include "output/StandardStreams.h"
 #include "platform/text/Decimal.h"
 #include "platform/text/Text.h"
@@ -114,29 +115,16 @@ std::optional<double> tempoOf(const IndexedItem& item) {
     return tempo == nullptr ? std::nullopt : std::optional(*tempo);
 }
 
-/// A heading a folder, below it a line an item: its name, title, tempo and tags.
-void printItems(const std::vector<const IndexedItem*>& items, const std::vector<std::string>& notes,
-                const Terminal& terminal) {
-    constexpr std::size_t widest = 40;
-    std::size_t width = 0;
-    for (const IndexedItem* item : items) width = std::max(width, displayWidth(printable(item->name)));
-    width = std::min(width, widest);
-    std::string folder;
-    for (std::size_t i = 0; i < items.size(); ++i) {
-        const std::string its = URL::fileURLWithPath(items[i]->path).URLByDeletingLastPathComponent().path();
-        if (its != folder)
-            print("{}{}\n", i == 0 ? "" : "\n", colored(terminal, Color::strong, printable(its)));
-        folder = its;
-        std::vector<Word> words;
-        if (!notes.empty()) words.push_back({notes[i], Color::strong});
-        if (!items[i]->title.empty())
-            words.push_back({fmt::format("\"{}\"", printable(items[i]->title)), Color::plain});
-        if (const auto tempo = tempoOf(*items[i]))
-            words.push_back({fmt::format("{:g} bpm", *tempo), Color::faint});
-        for (const IndexedTagging& tagging : items[i]->taggings)
-            words.push_back({printable(textOf(tagging)), tagging.level ? Color::accent : Color::plain});
-        print("  {}  {}\n", padded(printable(items[i]->name), width), wrapped(terminal, words, width + 4));
-    }
+/// Its title, tempo and tags.
+ItemRow rowOf(const IndexedItem& item) {
+    ItemRow row{item.path, {}};
+    if (!item.title.empty())
+        row.words.push_back({fmt::format("\"{}\"", printable(item.title)), Color::plain});
+    if (const auto tempo = tempoOf(item))
+        row.words.push_back({fmt::format("{:g} bpm", *tempo), Color::faint});
+    for (const IndexedTagging& tagging : item.taggings)
+        row.words.push_back({printable(textOf(tagging)), tagging.level ? Color::accent : Color::plain});
+    return row;
 }
 
 std::unique_ptr<ContentDatabase> opened(const Options& options, ToolContext& context) {
@@ -182,13 +170,13 @@ void searchItems(const Options& options, ToolContext& context) {
         if (!error.message.empty()) return context.itemFailed(error.message);
         return printJson(json, context.format);
     }
-    std::vector<const IndexedItem*> items;
-    for (const Found& one : *found) items.push_back(&one.item);
-    printItems(items, {}, context.terminal());
-    const auto count = items.size() < options.limit ? std::optional(static_cast<std::int64_t>(items.size()))
-                                                    : database->count(*query, &error);
+    std::vector<ItemRow> rows;
+    for (const Found& one : *found) rows.push_back(rowOf(one.item));
+    printItemTable(rows, context.terminal());
+    const auto count = rows.size() < options.limit ? std::optional(static_cast<std::int64_t>(rows.size()))
+                                                   : database->count(*query, &error);
     if (!count) return context.itemFailed(error.message);
-    context.note(fmt::format("{} found, {} shown", *count, items.size()));
+    context.note(fmt::format("{} found, {} shown", *count, rows.size()));
 }
 
 void countTags(const Options& options, ToolContext& context) {
@@ -227,13 +215,13 @@ void findSimilar(const Options& options, ToolContext& context) {
         if (!error.message.empty()) return context.itemFailed(error.message);
         return printJson(json, context.format);
     }
-    std::vector<const IndexedItem*> items;
-    std::vector<std::string> notes;
+    std::vector<ItemRow> rows;
     for (const Similar& one : *found) {
-        items.push_back(&one.item);
-        notes.push_back(fmt::format("{:3.0f}%", one.similarity * 100));
+        rows.push_back(rowOf(one.item));
+        rows.back().words.insert(rows.back().words.begin(),
+                                 {fmt::format("{:3.0f}%", one.similarity * 100), Color::strong});
     }
-    printItems(items, notes, context.terminal());
+    printItemTable(rows, context.terminal());
 }
 
 CLI::App* addCommand(CLI::App& app, const char* name, const char* what,

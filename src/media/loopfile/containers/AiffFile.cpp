@@ -75,18 +75,7 @@ AiffFile::AiffFile(ReadWindow& window, std::uint32_t form) : IffFile(window, Byt
     BoundedCursor header(window, order_, 4, 4);
     const std::uint32_t formSize = header.u32();
     walk(formSize, formSize == 0 || formSize == 0xFFFFFFFF);
-    refuseContradictions();
-}
-
-/// Two descriptions of the audio that differ: which one its players follow cannot be known.
-void AiffFile::refuseContradictions() {
-    const Chunk* first = find(fourCC("COMM"));
-    for (Chunk& chunk : chunks_) {
-        if (chunk.id != fourCC("COMM") || &chunk == first || chunk.size > ReadWindow::kSize) continue;
-        if (cursor(chunk).bytes(chunk.size) != cursor(*first).bytes(first->size)) {
-            chunk.fault = "contradicts the one before it";
-        }
-    }
+    refuseContradictions(fourCC("COMM"));
 }
 
 bool AiffFile::readFacts(LCAudioFacts& facts, Error* error) const {

@@ -22,8 +22,6 @@ class AiffFile : public IffFile {
     std::string formHeader(std::uint64_t formSize) const override;
 
   private:
-    void refuseContradictions();
-
     std::uint32_t form_;
 };
 

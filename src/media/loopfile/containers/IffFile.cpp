@@ -21,6 +21,16 @@ bool lacksPad(const Chunk& chunk) {
 
 }  // namespace
 
+void IffFile::refuseContradictions(std::uint32_t id) {
+    const Chunk* first = find(id);
+    for (Chunk& chunk : chunks_) {
+        if (chunk.id != id || &chunk == first) continue;
+        const bool isSame = chunk.size == first->size && chunk.size <= ReadWindow::kSize &&
+                            cursor(chunk).bytes(chunk.size) == cursor(*first).bytes(chunk.size);
+        if (!isSame) chunk.fault = "contradicts the one before it";
+    }
+}
+
 Chunk IffFile::chunkAt(std::uint64_t offset) const {
     const std::uint64_t fileEnd = window_.size();
     BoundedCursor header(window_, order_, offset, formEnd_ - offset);

@@ -19,6 +19,9 @@ class IffFile : public Container {
     /// Lists the chunks of a form that says that `formSize` bytes follow its first 8; `isOpenEnded` when it
     /// does not know (a recorder that could not go back).
     void walk(std::uint64_t formSize, bool isOpenEnded);
+    /// Refuses further descriptions of the audio, chunks of this id, that differ from the first: which one
+    /// its players follow cannot be known.
+    void refuseContradictions(std::uint32_t id);
     std::optional<std::vector<FilePiece>> piecesWith(const std::string& record, Error* error) const override;
 
     /// The size of a chunk whose header says `size`.

@@ -49,7 +49,7 @@ WavFile::WavFile(ReadWindow& window, std::uint32_t magic)
     const bool isInLongSizes = isLong() && shortFormSize_ == kInLongSizes;
     const std::uint64_t formSize = isInLongSizes ? longSizes_.form : shortFormSize_;
     walk(std::min(formSize, std::uint64_t{1} << 62U), formSize == 0 || formSize == kInLongSizes);
-    refuseContradictions();
+    refuseContradictions(fourCC("fmt "));
 }
 
 /// `ds64` comes first, so that it is known before any size is needed.
@@ -75,17 +75,6 @@ std::uint64_t WavFile::sizeOf(std::uint32_t id, std::uint32_t size) const {
         if (other == id) return longSize;
     }
     return size;
-}
-
-/// Two descriptions of the audio that differ: which one its players follow cannot be known.
-void WavFile::refuseContradictions() {
-    const Chunk* first = find(fourCC("fmt "));
-    for (Chunk& chunk : chunks_) {
-        if (chunk.id != fourCC("fmt ") || &chunk == first || chunk.size > ReadWindow::kSize) continue;
-        if (cursor(chunk).bytes(chunk.size) != cursor(*first).bytes(first->size)) {
-            chunk.fault = "contradicts the one before it";
-        }
-    }
 }
 
 std::string_view WavFile::formatName() const {

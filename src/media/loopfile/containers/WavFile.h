@@ -44,7 +44,6 @@ class WavFile : public IffFile {
 
     bool isLong() const { return magic_ == fourCC("RF64") || magic_ == fourCC("BW64"); }
     void readLongSizes();
-    void refuseContradictions();
     bool readFormat(const Chunk& format, const Chunk& data, LCAudioFacts& facts, Error* error) const;
     std::uint64_t codedFrames(const Coding& coding, std::uint64_t bytes, const LCAudioFacts& facts) const;
     std::uint64_t factFrames() const;
