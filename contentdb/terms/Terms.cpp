@@ -1,6 +1,7 @@
 #include "contentdb/terms/Terms.h"
 
 #include "contentdb/terms/Words.h"
+#include "platform/base/ByteOrder.h"
 
 #include <algorithm>
 #include <bit>
@@ -23,12 +24,6 @@ double numberOfBits(std::uint64_t bits) {
     return std::bit_cast<double>((bits & kSign) != 0 ? bits & ~kSign : ~bits);
 }
 
-std::string bigEndian(std::uint64_t code) {
-    std::string bytes;
-    for (unsigned shift = 32; shift > 0; shift -= 8) bytes += static_cast<char>(code >> (shift - 8) & 0xFFU);
-    return bytes;
-}
-
 NumberGroup group(TermKind kind, std::string_view field, std::uint64_t code) {
     const unsigned shift = kind == TermKind::fineNumber ? kFineShift : kCoarseShift;
     // The lowest bit of a fine code tells the first number of the group from the others.
@@ -36,7 +31,7 @@ NumberGroup group(TermKind kind, std::string_view field, std::uint64_t code) {
     const std::uint64_t start = (isFine ? code >> 1U : code) << shift;
     const std::uint64_t end = start + ((std::uint64_t{1} << shift) - 1);
     const bool isFirstNumber = isFine && (code & 1U) == 0;
-    std::string name = term(kind, field) + '\0' + bigEndian(code);
+    std::string name = term(kind, field) + '\0' + bytesOf(code, 4, ByteOrder::big);
     return {std::move(name), numberOfBits(isFine && !isFirstNumber ? start + 1 : start),
             numberOfBits(isFirstNumber ? start : end)};
 }

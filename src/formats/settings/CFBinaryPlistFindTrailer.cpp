@@ -1,5 +1,7 @@
 #include "formats/settings/CFBinaryPlistFindTrailer.h"
 
+#include "platform/base/ByteOrder.h"
+
 #include <algorithm>
 #include <array>
 #include <cstring>
@@ -14,9 +16,7 @@ constexpr std::uint64_t kSignedLimit = std::uint64_t{1} << 63U;
 constexpr std::size_t kUnusedLength = 5;
 
 std::uint64_t bigEndian(std::span<const std::uint8_t> bytes) {
-    std::uint64_t value = 0;
-    for (const std::uint8_t byte : bytes.first(8)) value = value << 8U | byte;
-    return value;
+    return numberOf(bytes.first(8), ByteOrder::big);
 }
 
 bool fitsInBytes(std::uint64_t value, std::uint64_t width) {

@@ -1,5 +1,6 @@
 #include "formats/settings/TGRTSettingsHeaderReader.h"
 
+#include "platform/base/ByteOrder.h"
 #include "platform/files/RandomAccessReader.h"
 #include "platform/files/SwapData.h"
 #include "platform/text/Text.h"
@@ -19,9 +20,7 @@ constexpr std::size_t kProductOffset = 16;
 constexpr std::size_t kPlugInOffset = 20;
 
 std::uint32_t littleEndian(std::span<const std::uint8_t> bytes, std::size_t offset) {
-    std::uint32_t value = 0;
-    for (std::size_t i = 4; i-- > 0;) value = value << 8U | bytes[offset + i];
-    return value;
+    return static_cast<std::uint32_t>(numberOf(bytes.subspan(offset, 4), ByteOrder::little));
 }
 
 }  // namespace

@@ -1,6 +1,7 @@
 #include "media/midi/MidiSequence.h"
 
 #include "media/midi/MidiTrackReader.h"
+#include "platform/base/ByteOrder.h"
 #include "platform/files/FileAccess.h"
 #include "platform/text/Text.h"
 
@@ -22,9 +23,7 @@ constexpr std::size_t kHeaderLength = 6;
 constexpr double kDefaultBpm = 120;
 
 std::uint32_t bigEndian(std::span<const std::uint8_t> bytes) {
-    std::uint32_t value = 0;
-    for (const std::uint8_t byte : bytes) value = value << 8 | byte;
-    return value;
+    return static_cast<std::uint32_t>(numberOf(bytes, ByteOrder::big));
 }
 
 bool hasName(std::span<const std::uint8_t> bytes, std::string_view name) {

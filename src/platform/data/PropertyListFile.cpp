@@ -1,5 +1,6 @@
 #include "platform/data/PropertyListFile.h"
 
+#include "platform/base/ByteOrder.h"
 #include "platform/data/OldStylePropertyList.h"
 #include "platform/data/PropertyListBuilder.h"
 #include "platform/data/PropertyListEncoding.h"
@@ -169,13 +170,6 @@ Node nodeOfObject(std::string object) {
     return Node(node);
 }
 
-std::string bigEndian(std::uint64_t bits) {
-    std::string bytes;
-    for (int shift = 56; shift >= 0; shift -= 8)
-        bytes += static_cast<char>(bits >> static_cast<unsigned>(shift));
-    return bytes;
-}
-
 /// The value as the library has it; a container without what it holds.
 Node nodeOf(const PropertyList& value) {
     if (value.array() != nullptr) return Node(plist_new_array());
@@ -183,17 +177,20 @@ Node nodeOf(const PropertyList& value) {
     if (const bool* flag = value.boolean()) return Node(plist_new_bool(*flag ? 1 : 0));
     if (const double* number = value.real()) return Node(plist_new_real(*number));
     if (const std::uint64_t* number = value.unsignedInteger()) {
-        return nodeOfObject(kWideIntegerMarker + bigEndian(0) + bigEndian(*number));
+        return nodeOfObject(kWideIntegerMarker + bytesOf(0, 8, ByteOrder::big) +
+                            bytesOf(*number, 8, ByteOrder::big));
     }
     if (const std::int64_t* number = value.signedInteger()) {
         const auto bits = static_cast<std::uint64_t>(*number);
-        return *number < 0 ? nodeOfObject(kIntegerMarker + bigEndian(bits)) : Node(plist_new_uint(bits));
+        return *number < 0 ? nodeOfObject(kIntegerMarker + bytesOf(bits, 8, ByteOrder::big))
+                           : Node(plist_new_uint(bits));
     }
     if (const std::string* text = value.string()) return Node(plist_new_string(text->c_str()));
     if (const PropertyList::Uid* uid = value.uid()) return Node(plist_new_uid(uid->value));
     if (const PropertyList::Date* when = value.date()) {
-        return nodeOfObject(kDateMarker +
-                            bigEndian(std::bit_cast<std::uint64_t>(when->secondsSinceReferenceDate)));
+        return nodeOfObject(
+            kDateMarker +
+            bytesOf(std::bit_cast<std::uint64_t>(when->secondsSinceReferenceDate), 8, ByteOrder::big));
     }
     const PropertyList::Data& bytes = *value.data();
     return Node(plist_new_data(reinterpret_cast<const char*>(bytes.data()), bytes.size()));

@@ -1,5 +1,6 @@
 #include "platform/data/PropertyListGuard.h"
 
+#include "platform/base/ByteOrder.h"
 #include "platform/data/PropertyListFile.h"
 #include "platform/text/Text.h"
 
@@ -64,9 +65,7 @@ class BinaryGraph {
     }
 
     std::uint64_t bigEndian(std::size_t offset, std::size_t width) const {
-        std::uint64_t value = 0;
-        for (std::size_t i = 0; i < width; ++i) value = value << 8 | bytes_[offset + i];
-        return value;
+        return numberOf(bytes_.subspan(offset, width), ByteOrder::big);
     }
 
     bool readTrailer() {

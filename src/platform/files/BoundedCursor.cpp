@@ -38,11 +38,7 @@ std::uint64_t BoundedCursor::number(std::size_t width, ByteOrder order) {
     failed_ = bytes == nullptr;
     if (failed_) return 0;
     position_ += width;
-    std::uint64_t value = 0;
-    for (std::size_t i = 0; i < width; ++i) {
-        value = value << 8U | bytes[order == ByteOrder::big ? i : width - 1 - i];
-    }
-    return value;
+    return numberOf({bytes, width}, order);
 }
 
 void BoundedCursor::skip(std::uint64_t count) {

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "platform/base/ByteOrder.h"
 #include "platform/files/RandomAccessReader.h"
 
 #include <algorithm>
@@ -39,8 +40,6 @@ class ReadWindow {
     Buffer head_;   // the first bytes, to which parsers come back
     Buffer other_;  // the place that was read last
 };
-
-enum class ByteOrder { little, big };
 
 /// The one way in which containers read: it parses and advances, or fails, and never looks past its end.
 ///

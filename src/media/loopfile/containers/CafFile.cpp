@@ -1,6 +1,7 @@
 #include "media/loopfile/containers/CafFile.h"
 
 #include "media/loopfile/containers/CafMusic.h"
+#include "platform/base/ByteOrder.h"
 
 #include <algorithm>
 
@@ -13,13 +14,6 @@ constexpr std::uint64_t kFileHeader = 8;
 constexpr std::uint64_t kChunkHeader = 12;
 constexpr std::int64_t kToTheEnd = -1;
 constexpr std::uint64_t kEditCount = 4;  // bytes before the audio in its chunk
-
-std::string bigEndian(std::uint64_t value) {
-    std::string bytes;
-    for (int shift = 56; shift >= 0; shift -= 8)
-        bytes += static_cast<char>(value >> static_cast<unsigned>(shift));
-    return bytes;
-}
 
 }  // namespace
 
@@ -128,7 +122,7 @@ std::uint64_t CafFile::packetTableFrames(std::uint64_t bytes, std::uint32_t fram
 std::optional<std::vector<FilePiece>> CafFile::piecesWith(const std::string& record, Error* /*error*/) const {
     std::string ours;
     if (!record.empty()) {
-        ours = "uuid" + bigEndian(kRecordUuid.size() + record.size()) +
+        ours = "uuid" + bytesOf(kRecordUuid.size() + record.size(), 8, ByteOrder::big) +
                std::string(kRecordUuid.begin(), kRecordUuid.end()) + record;
     }
     const Chunk* openEnd = endsOpen_ ? &chunks_.back() : nullptr;

@@ -117,11 +117,7 @@ void IffFile::takeOverPad() {
 }
 
 std::string IffFile::number(std::uint64_t value, std::size_t width) const {
-    std::string bytes(width, '\0');
-    for (std::size_t i = 0; i < width; ++i) {
-        bytes[order_ == ByteOrder::big ? width - 1 - i : i] = static_cast<char>(value >> (8 * i) & 0xFFU);
-    }
-    return bytes;
+    return bytesOf(value, width, order_);
 }
 
 std::string IffFile::recordChunk(const std::string& record) const {
