@@ -1,5 +1,6 @@
 #include "taxonomy/TGRTCategory.h"
 
+#include "taxonomy/LabelIndex.h"
 #include "taxonomy/TGRTTag.h"
 
 #include <algorithm>
@@ -10,7 +11,11 @@
 namespace qvct {
 
 TGRTCategory::TGRTCategory(std::string identifier)
-    : identifier_(std::move(identifier)), hash_(stringHash(identifier_)) {}
+    : identifier_(std::move(identifier)),
+      hash_(stringHash(identifier_)),
+      index_(std::make_unique<LabelIndex>()) {}
+
+TGRTCategory::~TGRTCategory() = default;
 
 std::shared_ptr<TGRTCategory> TGRTCategory::initWithIdentifier(std::string identifier) {
     return std::shared_ptr<TGRTCategory>(new TGRTCategory(std::move(identifier)));
@@ -23,7 +28,6 @@ void TGRTCategory::setIdentifier(std::string identifier) {
 
 void TGRTCategory::addTag(const std::shared_ptr<TGRTTag>& tag) {
     if (!tag) return;
-    ++revision_;
     // A root tag that equals one that is here changes nothing.
     if (!tag->parent() && tag->children().empty() && tags_.contains(*tag)) return;
     const auto parent = tag->parent();
@@ -31,8 +35,7 @@ void TGRTCategory::addTag(const std::shared_ptr<TGRTTag>& tag) {
     // A tag that equals another one is only found below its own parent, and one from elsewhere brings a tree
     // along, which may grow without this category being told.
     if (!tags_.insert(tag) || !isOfThisTree || !tag->children().empty()) return treeChanged();
-    const auto [entry, isNew] = byLabel_.try_emplace(tag->label(), tag.get());
-    if (!isNew) entry->second = nullptr;
+    index_->add(*tag, tag->label());
 }
 
 void TGRTCategory::removeTag(const std::shared_ptr<TGRTTag>& tag) {
@@ -42,16 +45,7 @@ void TGRTCategory::removeTag(const std::shared_ptr<TGRTTag>& tag) {
 }
 
 void TGRTCategory::treeChanged() {
-    onlyCreated_ = false;
-    byLabel_.clear();
-    ++revision_;
-}
-
-TGRTCategory::IndexAnswer TGRTCategory::tagsWithLabel(const LabelKey& label) const {
-    if (!onlyCreated_) return {};
-    const auto hit = byLabel_.find(label);
-    if (hit == byLabel_.end()) return {nullptr, true};
-    return {hit->second, hit->second != nullptr};
+    index_->treeChanged();
 }
 
 bool TGRTCategory::doesContain(const TGRTTag& tag) const {

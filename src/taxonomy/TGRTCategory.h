@@ -6,15 +6,13 @@
 #include "platform/data/PropertyList.h"
 
 #include <atomic>
-#include <cstdint>
 #include <memory>
 #include <string>
-#include <string_view>
-#include <unordered_map>
 #include <vector>
 
 namespace qvct {
 
+class LabelIndex;
 class TGRTTag;
 
 /// What a host sees of a category.
@@ -37,13 +35,11 @@ class QVCT_API TGRTCategory : public Object,
   public:
     /// An empty category.
     static std::shared_ptr<TGRTCategory> initWithIdentifier(std::string identifier);
+    ~TGRTCategory() override;
 
     const std::string& identifier() const override { return identifier_; }
     /// Does not change hash and equality, which are those of the identifier at creation.
     void setIdentifier(std::string identifier);
-    /// Whether any category of this process has been given another identifier. While none has, each is found
-    /// by the hash of its identifier.
-    static bool anyWasRenamed() { return anyWasRenamed_; }
 
     /// Lets the tag join; its children do not come along. Null is ignored.
     void addTag(const std::shared_ptr<TGRTTag>& tag);
@@ -64,50 +60,23 @@ class QVCT_API TGRTCategory : public Object,
     std::size_t hash() const override { return hash_; }
     std::string description() const override;
 
-    /// A label with its hash, made once for a search in several categories.
-    struct LabelKey {
-        /// The label must live as long as the key.
-        explicit LabelKey(std::string_view label) : text(label), hash(stringHash(label)) {}
-        std::string_view text;
-        std::size_t hash;
-    };
-    /// What the index knows of a label. `exact` says that no other tag of the tree can have it; a tree that
-    /// was changed by anything but creating tags has no exact answers, and is to be searched.
-    struct IndexAnswer {
-        TGRTTag* only = nullptr;
-        bool exact = false;
-    };
-    /// What the index knows of the label. @cost O(1)
-    IndexAnswer tagsWithLabel(const LabelKey& label) const;
-    /// Counts changes, for whoever keeps something that he derived from the tags.
-    std::uint64_t revision() const { return revision_; }
-    /// Tells the index that the tree was changed by other means than creating tags.
-    void treeChanged();
-
   private:
-    struct LabelHash {
-        using is_transparent = void;
-        std::size_t operator()(const LabelKey& key) const { return key.hash; }
-        std::size_t operator()(const std::string& label) const { return stringHash(label); }
-    };
-    struct LabelEqual {
-        using is_transparent = void;
-        bool operator()(const std::string& a, const std::string& b) const { return a == b; }
-        bool operator()(const LabelKey& key, const std::string& label) const { return key.text == label; }
-        bool operator()(const std::string& label, const LabelKey& key) const { return key.text == label; }
-    };
+    friend class TGRTTag;
+    friend class TGRTTaxonomy;
 
     explicit TGRTCategory(std::string identifier);
 
+    /// Tells the index that the tree was changed by other means than creating tags.
+    void treeChanged();
+
+    /// Whether any category of this process has been given another identifier. While none has, each is found
+    /// by the hash of its identifier.
     static inline std::atomic<bool> anyWasRenamed_ = false;
 
     std::string identifier_;
     std::size_t hash_;
     ObjectSet<TGRTTag> tags_;
-    /// The tag with each label; null where several have it.
-    std::unordered_map<std::string, TGRTTag*, LabelHash, LabelEqual> byLabel_;
-    bool onlyCreated_ = true;
-    std::uint64_t revision_ = 0;
+    std::unique_ptr<LabelIndex> index_;
 };
 
 }  // namespace qvct

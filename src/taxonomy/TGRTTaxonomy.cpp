@@ -6,6 +6,7 @@
 #include "resources/LegacyMappingTable.h"
 #include "resources/QVCTCompiledResources.h"
 #include "resources/ReplacementFile.h"
+#include "taxonomy/LabelIndex.h"
 #include "taxonomy/TGRTTagging.h"
 #include "taxonomy/TaggingTypes.h"
 #include "taxonomy/TaxonomyLocalization.h"
@@ -31,13 +32,6 @@ bool hasParentLabel(const TGRTTag& tag, TGRTTaxonomy::OptionalLabel wanted) {
     if (!wanted) return true;
     const auto parent = tag.parent();
     return parent && parent->label() == *wanted;
-}
-
-TGRTTaxonomy::TagPointer findInCategory(const TGRTCategory& category, const TGRTCategory::LabelKey& label,
-                                        TGRTTaxonomy::OptionalLabel parentLabel) {
-    const auto [only, exact] = category.tagsWithLabel(label);
-    if (!exact) return TGRTTaxonomy::findTagWithLabel(label.text, parentLabel, category.tags());
-    return only != nullptr && hasParentLabel(*only, parentLabel) ? only->shared_from_this() : nullptr;
 }
 
 /// A tag of a property list that is still to be made, with what lies below it.
@@ -219,10 +213,10 @@ TGRTTaxonomy::TagPointer TGRTTaxonomy::findOrCreateTagWithLabel(std::string_view
                                                                 bool overwriteReadonly) {
     const auto category = findOrCreateCategoryWithIdentifier(categoryIdentifier, overwriteReadonly);
     if (!category) return nullptr;
-    auto found = findInCategory(*category, TGRTCategory::LabelKey(label), std::nullopt);
+    auto found = findInCategory(*category, LabelKey(label), std::nullopt);
     if (found || (readOnly_ && !overwriteReadonly)) return found;
     const auto parent =
-        parentLabel ? findInCategory(*category, TGRTCategory::LabelKey(*parentLabel), std::nullopt) : nullptr;
+        parentLabel ? findInCategory(*category, LabelKey(*parentLabel), std::nullopt) : nullptr;
     return TGRTTag::initWithLabel(label, parent, category);
 }
 
@@ -235,7 +229,7 @@ TGRTTaxonomy::CategoryPointer TGRTTaxonomy::findCategoryWithIdentifier(std::stri
     const auto hasIdentifier = [identifier](const TGRTCategory& category) {
         return category.identifier() == identifier;
     };
-    if (!TGRTCategory::anyWasRenamed()) {
+    if (!TGRTCategory::anyWasRenamed_) {
         TGRTCategory* category = categories_.findWithHash(stringHash(identifier), hasIdentifier);
         return category == nullptr ? nullptr : category->shared_from_this();
     }
@@ -245,8 +239,15 @@ TGRTTaxonomy::CategoryPointer TGRTTaxonomy::findCategoryWithIdentifier(std::stri
     return hit == categories_.end() ? nullptr : *hit;
 }
 
+TGRTTaxonomy::TagPointer TGRTTaxonomy::findInCategory(const TGRTCategory& category, const LabelKey& label,
+                                                      OptionalLabel parentLabel) {
+    const auto [only, exact] = category.index_->find(label);
+    if (!exact) return findTagWithLabel(label.text, parentLabel, category.tags());
+    return only != nullptr && hasParentLabel(*only, parentLabel) ? only->shared_from_this() : nullptr;
+}
+
 TGRTTaxonomy::TagPointer TGRTTaxonomy::findTagForLabel(std::string_view label) const {
-    const TGRTCategory::LabelKey key(label);
+    const LabelKey key(label);
     for (const auto& category : categories_) {
         if (auto tag = findInCategory(*category, key, std::nullopt)) return tag;
     }
@@ -261,7 +262,7 @@ TGRTTaxonomy::TagPointer TGRTTaxonomy::findTagForLabel(std::string_view label,
 TGRTTaxonomy::TagPointer TGRTTaxonomy::findTagForLabel(std::string_view label, OptionalLabel parentLabel,
                                                        std::string_view categoryIdentifier) const {
     const auto category = findCategoryWithIdentifier(categoryIdentifier);
-    return category ? findInCategory(*category, TGRTCategory::LabelKey(label), parentLabel) : nullptr;
+    return category ? findInCategory(*category, LabelKey(label), parentLabel) : nullptr;
 }
 
 TGRTTaxonomy::TagPointer TGRTTaxonomy::findTagWithLabel(std::string_view label, OptionalLabel parentLabel,
@@ -318,7 +319,7 @@ void TGRTTaxonomy::appendTagsOfTagging(const TGRTTagging& tagging, ObjectSet<TGR
 
 std::uint64_t TGRTTaxonomy::revision() const {
     std::uint64_t changes = categories_.size();
-    for (const auto& category : categories_) changes += category->revision();
+    for (const auto& category : categories_) changes += category->index_->revision();
     return changes;
 }
 

@@ -22,6 +22,7 @@
 
 namespace qvct {
 
+struct LabelKey;
 class TGRTTagging;
 
 /// Which resource a taxonomy is built from. Other numbers name none and give an empty taxonomy.
@@ -179,6 +180,8 @@ class QVCT_API TGRTTaxonomy : public Object, public QVContentTaggingTaxonomy {
 
   private:
     TGRTTaxonomy() = default;
+    static TagPointer findInCategory(const TGRTCategory& category, const LabelKey& label,
+                                     OptionalLabel parentLabel);
 
     ObjectSet<TGRTCategory> categories_;
     bool readOnly_ = false;
