@@ -308,6 +308,12 @@ ObjectSet<TGRTTag> TGRTTaxonomy::tagsForTaggings(const std::vector<std::shared_p
     return tags;
 }
 
+ObjectSet<TGRTTag> TGRTTaxonomy::tagsForTaggings(std::initializer_list<std::shared_ptr<TGRTTagging>> taggings,
+                                                 OptionalLabel categoryIdentifier,
+                                                 bool includingAncestors) const {
+    return tagsForTaggings(std::vector(taggings), categoryIdentifier, includingAncestors);
+}
+
 void TGRTTaxonomy::appendTagsOfTagging(const TGRTTagging& tagging, ObjectSet<TGRTTag>& set,
                                        bool includingAncestors) const {
     const auto tag = findTagForLabel(tagging.label(), tagging.category());

@@ -12,6 +12,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <initializer_list>
 #include <map>
 #include <memory>
 #include <optional>
@@ -152,6 +153,9 @@ class QVCT_API TGRTTaxonomy : public Object, public QVContentTaggingTaxonomy {
                                        OptionalLabel categoryIdentifier,
                                        bool includingAncestors = false) const;
     ObjectSet<TGRTTag> tagsForTaggings(const std::vector<std::shared_ptr<TGRTTagging>>& taggings,
+                                       OptionalLabel categoryIdentifier,
+                                       bool includingAncestors = false) const;
+    ObjectSet<TGRTTag> tagsForTaggings(std::initializer_list<std::shared_ptr<TGRTTagging>> taggings,
                                        OptionalLabel categoryIdentifier,
                                        bool includingAncestors = false) const;
     /// @}
