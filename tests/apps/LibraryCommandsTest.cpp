@@ -91,7 +91,7 @@ TEST_F(LibraryCommands, ShowTheNameOfTheFileAndItsTitle) {
     EXPECT_EQ(run({"search", "snare"}).json()[0]["title"], nullptr);
     EXPECT_EQ(names("type:audio name+").front(), "Automated Build");  // Dark Kick comes first
     EXPECT_THAT(runTool({"search", "dark", "--db", folder_.path("db")}).output,
-                HasSubstr("Dark Kick 01  \"Automated Build\""));
+                HasSubstr("Dark Kick 01.wav  \"Automated Build\""));
 }
 
 TEST_F(LibraryCommands, KnowItemsAgainThatWereMovedAndTagged) {
