@@ -13,11 +13,16 @@ namespace qvct {
 /// safe from every thread.
 class QVCT_API DecimalFormatter {
   public:
+    /// With so many decimals, rounded half to even.
     explicit DecimalFormatter(int fractionDigits);
+    /// @{
+    /// Moved, it can be used no more.
     DecimalFormatter(DecimalFormatter&&) noexcept;
     DecimalFormatter& operator=(DecimalFormatter&&) noexcept;
+    /// @}
     ~DecimalFormatter();
 
+    /// "-1,25" in a locale with decimal commas.
     std::string stringFromNumber(double number) const;
 
   private:
