@@ -40,6 +40,7 @@ set(QVCT_PUBLIC_HEADERS
   metadata/TGRTMetaData.h
   formats/ContentWalk.h
   formats/ContentWriters.h
+  formats/ItemFile.h
   formats/LinkRule.h
   formats/QVContentEditorFileUtilities.h
   formats/QVContentTaggingTypes.h
@@ -57,6 +58,7 @@ set(QVCT_PUBLIC_HEADERS
   autotagging/services/QVCTXMLRulesTaggingService.h
   autotagging/services/TagDictionary.h
   autotagging/services/TaggingServiceNames.h
+  autotagging/ContentItem.h
   autotagging/QVTaggingAggregator.h
   indexing/QVContentTaggingIndexableContentObject.h
   indexing/TGRTIndexableContentObject.h)

@@ -1,12 +1,10 @@
 #include "contentdb/ContentDescriber.h"
 
+#include "autotagging/ContentItem.h"
 #include "autotagging/QVTaggingAggregator.h"
-#include "autotagging/xml/QVCTXMLDocument.h"
 #include "contentdb/index/PayloadHash.h"
 #include "contentdb/store/Digest.h"
 #include "formats/QVContentTaggingTypes.h"
-#include "formats/TGRTFileNode.h"
-#include "formats/TGRTMetaDataReaderFactory.h"
 #include "indexing/TGRTIndexableContentObject.h"
 #include "media/loopfile/LCFileData.h"
 #include "platform/base/Version.h"
@@ -25,33 +23,6 @@ namespace qvct::contentdb {
 namespace {
 
 using Taggings = ObjectSet<TGRTTagging>;
-
-/// Asks one service after the other about an item that is prepared once.
-class OneItemAggregator : public QVTaggingAggregator {
-  public:
-    OneItemAggregator() : QVTaggingAggregator(defaultTaggingServicesWithRules(std::nullopt, std::nullopt)) {}
-
-    void prepare(const URL& url, std::shared_ptr<TGRTMetaData> record, std::uint64_t services) {
-        constexpr std::uint64_t readersOfXml = QVCTAutoTaggingOptionXMLRules |
-                                               QVCTAutoTaggingOptionSoftwareInstruments |
-                                               QVCTAutoTaggingOptionContentType;
-        xmlDocument_ = (services & readersOfXml) != 0 ? QVTaggingAggregator::xmlDocumentForURL(url) : nullptr;
-        fileData_ = QVTaggingAggregator::fileDataForURL(url);
-        record_ = std::move(record);
-    }
-    const std::shared_ptr<LCFileData>& fileData() const { return fileData_; }
-
-    std::shared_ptr<QVCTXMLDocument> xmlDocumentForURL(const URL& /*url*/) override { return xmlDocument_; }
-    std::shared_ptr<TGRTMetaData> metaDataForURL(const URL& /*url*/, std::uint64_t /*options*/) override {
-        return record_;
-    }
-    std::shared_ptr<LCFileData> fileDataForURL(const URL& /*url*/) override { return fileData_; }
-
-  private:
-    std::shared_ptr<QVCTXMLDocument> xmlDocument_;
-    std::shared_ptr<TGRTMetaData> record_;
-    std::shared_ptr<LCFileData> fileData_;
-};
 
 IndexedTagging indexed(const TGRTTagging& tagging, Provenance provenance, std::string_view service) {
     IndexedTagging result;
@@ -123,31 +94,24 @@ struct ContentDescriber::Implementation {
         TGRTIndexableContentObject::taxonomyForOptions(kOptions);
     std::shared_ptr<TGRTTaxonomy> taxonomyOfServices = TGRTTaxonomy::defaultTaxonomy();
     std::uint64_t services;
-    OneItemAggregator aggregator;
+    std::shared_ptr<QVTaggingAggregator> aggregator = QVTaggingAggregator::defaultTaggingAggregator();
     RegularExpression namedTempo = *RegularExpression::compile(
         R"((?<![\d.,])(\d{2,3}(?:[.,]\d+)?)[\s_-]?bpm(?![\p{L}\d]))", RegularExpression::Case::insensitive);
 
-    std::shared_ptr<TGRTMetaData> record(const URL& url, Error& error) const {
-        const auto node = TGRTFileNode::nodeWithFileURL(url);
-        const bool isContent = TGRTMetaDataReaderFactory::metaDataReaderForURL(url, taxonomyOfRecords) ||
-                               node->validator();  // audio, whatever its extension
-        return isContent ? node->readMetaDataWithOptions(kOptions, taxonomyOfRecords, &error) : nullptr;
-    }
-
-    void addAllTaggings(IndexedItem& item, const URL& url, const TGRTMetaData* record,
-                        const Taggings& withVirtual) {
+    void addAllTaggings(IndexedItem& item, const std::shared_ptr<ContentItem>& content,
+                        const TGRTMetaData* record, const Taggings& withVirtual) {
         Taggings known;
         if (record != nullptr) addTaggings(item, known, record->taggings(), Provenance::stored);
         addTaggings(item, known, withVirtual, Provenance::virtualTag);
         for (const auto& [name, option] : kTaggingServiceNames) {
             if ((services & option) == 0) continue;
-            addTaggings(item, known, aggregator.taggingsWithContentsOfURL(url, *taxonomyOfServices, option),
+            addTaggings(item, known, aggregator->taggingsOfItem(content, *taxonomyOfServices, option),
                         Provenance::automatic, name);
         }
     }
 
-    void addTempoAndBeats(IndexedItem& item, const std::string& fileName) {
-        if (const auto& file = aggregator.fileData()) {
+    void addTempoAndBeats(IndexedItem& item, const LCFileData* file, const std::string& fileName) {
+        if (file != nullptr) {
             addNumber(item, QVContentKeyBeatCount, file->beatCount());
             if (file->bpm() > 0) addNumber(item, "Tempo", double{file->bpm()});
         }
@@ -185,15 +149,16 @@ std::uint64_t ContentDescriber::digest(std::uint64_t services) {
 std::optional<IndexedItem> ContentDescriber::describe(const std::string& path, Error* error) {
     Implementation& its = *implementation_;
     const URL url = URL::fileURLWithPath(path);
+    const auto content = std::make_shared<ContentItem>(
+        url, ContentItem::RecordReading{Implementation::kOptions, its.taxonomyOfRecords});
     Error reason;
-    const auto record = its.record(url, reason);
-    if (!reason.message.empty()) {
+    const auto record = content->record(&reason);
+    if (reason.code != 0 && reason.code != kErrorNoContent) {
         if (error != nullptr) *error = reason;
         return std::nullopt;
     }
     const auto object = TGRTIndexableContentObject::indexableContentObjectForMetaData(record.get(), url,
                                                                                       *its.taxonomyOfRecords);
-    its.aggregator.prepare(url, record, its.services);
     IndexedItem item;
     item.name = url.lastPathComponentWithoutExtension();
     if (object->displayName() != item.name) item.title = object->displayName();
@@ -204,10 +169,10 @@ std::optional<IndexedItem> ContentDescriber::describe(const std::string& path, E
     item.packs.assign(object->packageIdentifiers().begin(), object->packageIdentifiers().end());
     for (const auto& dependency : object->dependencyItems())
         item.dependencies.push_back({dependency->UUID(), dependency->path()});
-    its.addAllTaggings(item, url, record.get(), object->taggingDatas());
+    its.addAllTaggings(item, content, record.get(), object->taggingDatas());
     addValues(item, object->valueDatas());
-    its.addTempoAndBeats(item, url.lastPathComponent());
-    item.payloadHash = payloadHash(url, its.aggregator.fileData().get());
+    its.addTempoAndBeats(item, content->fileData().get(), url.lastPathComponent());
+    item.payloadHash = payloadHash(content->file());
     return item;
 }
 

@@ -3,7 +3,7 @@
 #include "listening/onsets/OnsetDetector.h"
 #include "listening/rhythm/LoopRhythm.h"
 #include "media/audio/AudioDecoder.h"
-#include "media/loopfile/LCFileParser.h"
+#include "media/loopfile/LCFileData.h"
 #include "media/midi/MidiSequence.h"
 #include "platform/text/Text.h"
 
@@ -136,10 +136,15 @@ std::optional<RhythmResult> measureMidi(const URL& url, const MidiSequence& sequ
     return result;
 }
 
+std::unique_ptr<AudioDecoder> decoderOf(ItemFile& file, Error* error) {
+    const auto reader = file.reader(error);
+    return reader ? AudioDecoder::open(reader, file.url().path(), error) : nullptr;
+}
+
 /// The lowest and highest sample of equal slices of the file.
-std::vector<RhythmPlot::Peak> waveformOf(const std::string& path) {
+std::vector<RhythmPlot::Peak> waveformOf(ItemFile& file) {
     constexpr std::size_t slices = 1200;
-    const auto decoder = AudioDecoder::open(path);
+    const auto decoder = decoderOf(file, nullptr);
     if (!decoder || decoder->frames() <= 0) return {};
     std::vector<RhythmPlot::Peak> peaks(slices);
     const auto channels = static_cast<std::size_t>(decoder->channels());
@@ -158,9 +163,10 @@ std::vector<RhythmPlot::Peak> waveformOf(const std::string& path) {
     return peaks;
 }
 
-std::optional<RhythmResult> measureAudio(const URL& url, Metre metre, const RhythmRequest& request,
+std::optional<RhythmResult> measureAudio(ItemFile& file, Metre metre, const RhythmRequest& request,
                                          Error* error) {
-    const auto decoder = AudioDecoder::open(url.path(), error);
+    const URL& url = file.url();
+    const auto decoder = decoderOf(file, error);
     if (!decoder) return std::nullopt;
     const std::int64_t frames = decoder->frames();
     if (frames <= 0) {
@@ -181,25 +187,26 @@ std::optional<RhythmResult> measureAudio(const URL& url, Metre metre, const Rhyt
     if (metre.tempo == 0) metre.tempo = metre.beats / minutes / metre.beatsPerQuarter();
     auto result =
         measured(url, notesOfOnsets(OnsetDetector::detect(*decoder), frames, metre.beats), 1, metre, error);
-    if (result) result->plot.waveform = waveformOf(url.path());
+    if (result) result->plot.waveform = waveformOf(file);
     return result;
 }
 
 }  // namespace
 
-std::optional<RhythmResult> measureRhythm(const URL& url, const RhythmRequest& request, Error* error) {
+std::optional<RhythmResult> measureRhythm(ItemFile& file, const RhythmRequest& request, Error* error) {
+    const URL& url = file.url();
     if (MidiSequence::supportsFileExtension(url.pathExtension())) {
         const auto sequence = MidiSequence::read(url.path(), error);
         return sequence ? measureMidi(url, *sequence, {}, request, error) : std::nullopt;
     }
-    const auto data = LCFileParser::fileParserForURL(url)->enhancedFileData();
+    const auto data = file.audio();
     if (data && data->tavioLoopType() != 0 && !data->midiData().empty()) {
         const auto sequence = MidiSequence::parse(data->midiData());
         if (sequence && !sequence->tracks().empty()) {
             return measureMidi(url, *sequence, metreOf(data.get()), request, error);
         }
     }
-    return measureAudio(url, metreOf(data.get()), request, error);
+    return measureAudio(file, metreOf(data.get()), request, error);
 }
 
 }  // namespace qvct::tool

@@ -1,9 +1,9 @@
 #pragma once
 
+#include "formats/ItemFile.h"
 #include "listening/rhythm/QVCTMidiAnalysis.h"
 #include "output/RhythmPlot.h"
 #include "platform/base/Error.h"
-#include "platform/text/Url.h"
 
 #include <cstdint>
 #include <optional>
@@ -48,6 +48,6 @@ struct RhythmResult {
 /// does: by the notes of the first track where there is MIDI, unless a loop says that it is one of sound
 /// alone. What neither the request nor the file tells is derived: the beats from tempo and length, the
 /// signature as 4/4. Nothing, and an error, when the length in beats cannot be known or nothing sounds.
-std::optional<RhythmResult> measureRhythm(const URL& url, const RhythmRequest& request, Error* error);
+std::optional<RhythmResult> measureRhythm(ItemFile& file, const RhythmRequest& request, Error* error);
 
 }  // namespace qvct::tool

@@ -84,21 +84,28 @@ void ToolContext::notePassedOver(const std::vector<URL>& links) const {
                      printable(links.front().path()), all));
 }
 
-std::vector<URL> ToolContext::contentItems(const std::vector<std::string>& paths, LinksOutside links) {
-    std::vector<URL> items;
+void ToolContext::forEachContentItem(const std::vector<std::string>& paths, LinksOutside links,
+                                     const std::function<void(const URL&)>& show) {
     std::vector<URL> passedOver;
-    const auto add = [&](const URL& url) {
+    const auto visit = [&](const URL& url) {
         if (isValidUtf8(url.path())) {
-            items.push_back(url);
+            show(url);
         } else {
             itemFailed(fmt::format("{}: the name is not UTF-8", printable(url.path())));
         }
+        return !isOutputLost();
     };
     for (const std::string& path : paths) {
-        walkContent(path, add, [this](const Error& error) { itemFailed(error.message); },
+        if (isOutputLost()) break;
+        walkContent(path, visit, [this](const Error& error) { itemFailed(error.message); },
                     {links, [&passedOver](const URL& link) { passedOver.push_back(link); }});
     }
     notePassedOver(passedOver);
+}
+
+std::vector<URL> ToolContext::contentItems(const std::vector<std::string>& paths, LinksOutside links) {
+    std::vector<URL> items;
+    forEachContentItem(paths, links, [&items](const URL& url) { items.push_back(url); });
     return items;
 }
 

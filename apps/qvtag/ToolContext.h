@@ -5,6 +5,7 @@
 #include "platform/text/Url.h"
 
 #include <cstddef>
+#include <functional>
 #include <memory>
 #include <string>
 #include <string_view>
@@ -39,8 +40,12 @@ class ToolContext {
     /// 0 done, 1 some items failed, 2 wrong usage.
     int exitStatus() const { return exitStatus_; }
 
-    /// Every content item at or below the paths; what cannot be read is reported. Names that are not UTF-8
-    /// are reported and left out. Links that are not followed are told in one note.
+    /// Calls `show` for every content item at or below the paths as it is found, until nobody can see it any
+    /// more. What cannot be read is reported. Names that are not UTF-8 are reported and left out. Links that
+    /// are not followed are told in one note.
+    void forEachContentItem(const std::vector<std::string>& paths, LinksOutside links,
+                            const std::function<void(const URL&)>& show);
+    /// All of them, before anything is done with one.
     std::vector<URL> contentItems(const std::vector<std::string>& paths, LinksOutside links);
     /// That note, for a walk of one's own; nothing when there are none.
     void notePassedOver(const std::vector<URL>& links) const;

@@ -3,18 +3,15 @@
 #include "contentdb/store/Digest.h"
 #include "formats/QVContentTaggingTypes.h"
 #include "formats/preset/PresetRecord.h"
-#include "platform/files/FileAccess.h"
-#include "platform/files/FileDescriptor.h"
+#include "media/loopfile/LCFileData.h"
+#include "platform/files/RandomAccessReader.h"
 #include "taxonomy/TaggingTypes.h"
 
 #include <algorithm>
 #include <array>
 #include <filesystem>
+#include <span>
 #include <vector>
-
-#include <fcntl.h>
-#include <sys/stat.h>
-#include <unistd.h>
 
 namespace qvct::contentdb {
 namespace {
@@ -44,20 +41,15 @@ struct Payload {
     }
 };
 
-bool addBlock(Payload& payload, int file, std::uint64_t offset, std::uint64_t size) {
-    std::array<char, kBlock * kBlocks> buffer;
-    for (std::uint64_t filled = 0; filled < size;) {
-        const ssize_t count =
-            ::pread(file, buffer.data() + filled, size - filled, static_cast<off_t>(offset + filled));
-        if (count <= 0) return false;
-        filled += static_cast<std::uint64_t>(count);
-    }
-    payload.digest.add(std::string_view(buffer.data(), size));
+bool addBlock(Payload& payload, const RandomAccessReader& file, std::uint64_t offset, std::uint64_t size) {
+    std::array<std::uint8_t, kBlock * kBlocks> buffer;
+    if (!file.read(offset, std::span(buffer).first(size))) return false;
+    payload.digest.add(std::string_view(reinterpret_cast<const char*>(buffer.data()), size));
     return true;
 }
 
 /// Whether the range could be read.
-bool addRange(Payload& payload, int file, std::uint64_t offset, std::uint64_t size) {
+bool addRange(Payload& payload, const RandomAccessReader& file, std::uint64_t offset, std::uint64_t size) {
     payload.digest.add(size);
     payload.size += size;
     if (size <= kBlock * kBlocks) return addBlock(payload, file, offset, size);
@@ -69,24 +61,22 @@ bool addRange(Payload& payload, int file, std::uint64_t offset, std::uint64_t si
     return true;
 }
 
-bool addFile(Payload& payload, const std::string& path) {
-    const FileDescriptor file(::open(path.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
-    struct stat status {};
-    if (!file.isOpen() || ::fstat(file.number(), &status) != 0 || !S_ISREG(status.st_mode)) return false;
-    return addRange(payload, file.number(), 0, static_cast<std::uint64_t>(status.st_size));
+bool addFile(Payload& payload, ItemFile& file) {
+    const auto reader = file.reader();
+    return reader && addRange(payload, *reader, 0, reader->size());
 }
 
-bool addAudio(Payload& payload, const std::string& path, const LCFileData& audio) {
-    const LCAudioFacts& facts = audio.facts();
-    const PropertyList::Data& notes = audio.midiData();
+bool addAudio(Payload& payload, ItemFile& file) {
+    const auto audio = file.audio();
+    if (!audio) return false;
+    const LCAudioFacts& facts = audio->facts();
+    const PropertyList::Data& notes = audio->midiData();
     if (!notes.empty()) payload.add({reinterpret_cast<const char*>(notes.data()), notes.size()});
-    if (facts.audioSize == 0) return true;
-    const FileDescriptor file(::open(path.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
-    return file.isOpen() && addRange(payload, file.number(), facts.audioOffset, facts.audioSize);
+    return facts.audioSize == 0 || addRange(payload, *file.reader(), facts.audioOffset, facts.audioSize);
 }
 
-bool addPreset(Payload& payload, const std::string& path) {
-    const auto bytes = readFile(path);
+bool addPreset(Payload& payload, ItemFile& file) {
+    const auto bytes = file.bytes(kLargestPreset);
     if (!bytes) return false;
     const auto preset = PresetText::parse({reinterpret_cast<const char*>(bytes->data()), bytes->size()});
     if (preset) payload.add(textWithoutRecord(*preset));
@@ -110,35 +100,36 @@ bool addFolder(Payload& payload, const fs::path& folder, std::size_t& budget, st
         const fs::file_status status = entry.symlink_status(failure);
         payload.digest.add(entry.path().filename().string());
         if (fs::is_directory(status) && !addFolder(payload, entry.path(), budget, depth + 1)) return false;
-        if (fs::is_regular_file(status) && !addFile(payload, entry.path().string())) return false;
+        ItemFile file(URL::fileURLWithPath(entry.path().string()));
+        if (fs::is_regular_file(status) && !addFile(payload, file)) return false;
     }
     return true;
 }
 
-bool addContent(Payload& payload, const URL& url, const LCFileData* audio) {
+bool addContent(Payload& payload, ItemFile& file) {
     constexpr std::size_t mostFiles = 10000;
-    const std::string& path = url.path();
+    const URL& url = file.url();
     std::size_t budget = mostFiles;
     switch (QVContentTaggingTypes::fallBackFileTypeForURL(url)) {
         case kFileTypePatch:
         case kFileTypeProject:
-            return addFolder(payload, path, budget, 0);
+            return addFolder(payload, url.path(), budget, 0);
         case kFileTypeSynthPreset:
-            return addPreset(payload, path);
+            return addPreset(payload, file);
         case kFileTypeSamplerSettings:
         case kFileTypePlugInSettings:
         case kFileTypeChannelStrip:
-            return addFile(payload, path);
+            return addFile(payload, file);
         default:
-            return audio != nullptr && addAudio(payload, path, *audio);
+            return addAudio(payload, file);
     }
 }
 
 }  // namespace
 
-std::string payloadHash(const URL& url, const LCFileData* audio) {
+std::string payloadHash(ItemFile& file) {
     Payload payload;
-    return addContent(payload, url, audio) ? payload.hash() : std::string();
+    return addContent(payload, file) ? payload.hash() : std::string();
 }
 
 }  // namespace qvct::contentdb

@@ -1,5 +1,6 @@
 #include "autotagging/QVTaggingAggregator.h"
 
+#include "autotagging/ContentItem.h"
 #include "autotagging/services/QVCTContentTypeTaggingService.h"
 #include "autotagging/services/QVCTFilenameKeywordExtractorTaggingService.h"
 #include "autotagging/services/QVCTRhythmicTaggingService.h"
@@ -8,9 +9,6 @@
 #include "autotagging/services/QVCTUserGeneratedTaggingService.h"
 #include "autotagging/services/QVCTXMLRulesTaggingService.h"
 #include "autotagging/xml/QVCTXMLDocument.h"
-#include "formats/QVContentEditorFileUtilities.h"
-#include "formats/TGRTFileNode.h"
-#include "media/loopfile/LCFileParser.h"
 
 #include <string>
 #include <utility>
@@ -30,22 +28,34 @@ std::shared_ptr<TGRTTagging> taggingForTagDictionary(const TagDictionary& dictio
     return tagging;
 }
 
-/// Reads records in a taxonomy of its own.
-class IndependentAggregator : public QVTaggingAggregator {
+ObjectSet<TGRTTagging> taggingsForTags(const TagDictionarySet& tags, const TGRTTaxonomy& taxonomy) {
+    ObjectSet<TGRTTagging> taggings;
+    for (const TagDictionary& dictionary : tags)
+        taggings.insert(taggingForTagDictionary(dictionary, taxonomy));
+    return taggings;
+}
+
+/// Keeps the item of a call until the call ends, in whatever way.
+class AtHand {
   public:
-    IndependentAggregator()
-        : QVTaggingAggregator(defaultTaggingServicesWithRules(std::nullopt, std::nullopt)) {
-        setTaxonomy(TGRTTaxonomy::newTaxonomyOfType(kDefaultTaxonomy, false, false));
+    AtHand(std::shared_ptr<ContentItem>& place, const std::shared_ptr<ContentItem>& item) : place_(place) {
+        place_ = item;
     }
-    std::shared_ptr<TGRTMetaData> metaDataForURL(const URL& url, std::uint64_t options) override {
-        return TGRTFileNode::nodeWithFileURL(url)->readMetaDataWithOptions(options, taxonomy());
-    }
+    AtHand(const AtHand&) = delete;
+    AtHand& operator=(const AtHand&) = delete;
+    ~AtHand() { place_.reset(); }
+
+  private:
+    std::shared_ptr<ContentItem>& place_;
 };
 
 }  // namespace
 
 std::shared_ptr<QVTaggingAggregator> QVTaggingAggregator::independentTaggingAggregator() {
-    return std::make_shared<IndependentAggregator>();
+    auto aggregator = initWithRules(std::nullopt, std::nullopt);
+    aggregator->taxonomyOfRecords_ = TGRTTaxonomy::newTaxonomyOfType(kDefaultTaxonomy, false, false);
+    aggregator->setTaxonomy(aggregator->taxonomyOfRecords_);
+    return aggregator;
 }
 
 std::shared_ptr<QVTaggingAggregator> QVTaggingAggregator::defaultTaggingAggregator() {
@@ -75,20 +85,27 @@ QVTaggingAggregator::QVTaggingAggregator(Services services) : taggingServices_(s
     std::erase(taggingServices_, nullptr);
 }
 
+std::shared_ptr<ContentItem> QVTaggingAggregator::itemForURL(const URL& url, std::uint64_t options) const {
+    if (item_ && item_->url() == url) return item_;
+    return std::make_shared<ContentItem>(url, ContentItem::RecordReading{options, taxonomyOfRecords_});
+}
+
 std::shared_ptr<QVCTXMLDocument> QVTaggingAggregator::xmlDocumentForURL(const URL& url) {
-    const auto cache = QVContentEditorFileUtilities::intermediateCacheURLForURL(url);
-    return cache ? QVCTXMLDocument::initWithContentsOfURL(*cache) : nullptr;
+    return itemForURL(url, 0)->xmlDocument();
 }
 
 std::shared_ptr<TGRTMetaData> QVTaggingAggregator::metaDataForURL(const URL& url, std::uint64_t options) {
-    return TGRTFileNode::nodeWithFileURL(url)->readMetaDataWithOptions(options);
+    return itemForURL(url, options)->record();
 }
 
 std::shared_ptr<LCFileData> QVTaggingAggregator::fileDataForURL(const URL& url) {
-    return LCFileParser::fileParserForURL(url)->enhancedFileData();
+    return itemForURL(url, 0)->fileData();
 }
 
-TagDictionarySet QVTaggingAggregator::tagsWithContentsOfURL(const URL& url, std::uint64_t options) {
+TagDictionarySet QVTaggingAggregator::tagsOfItem(const std::shared_ptr<ContentItem>& item,
+                                                 std::uint64_t options) {
+    const AtHand atHand(item_, item);
+    const URL& url = item->url();
     const auto xmlDocument = xmlDocumentForURL(url);
     const auto metaData = metaDataForURL(url, options);
     const auto fileData = fileDataForURL(url);
@@ -99,14 +116,20 @@ TagDictionarySet QVTaggingAggregator::tagsWithContentsOfURL(const URL& url, std:
     return tags;
 }
 
+TagDictionarySet QVTaggingAggregator::tagsWithContentsOfURL(const URL& url, std::uint64_t options) {
+    return tagsOfItem(itemForURL(url, options), options);
+}
+
+ObjectSet<TGRTTagging> QVTaggingAggregator::taggingsOfItem(const std::shared_ptr<ContentItem>& item,
+                                                           const TGRTTaxonomy& taxonomy,
+                                                           std::uint64_t options) {
+    return taggingsForTags(tagsOfItem(item, options), taxonomy);
+}
+
 ObjectSet<TGRTTagging> QVTaggingAggregator::taggingsWithContentsOfURL(const URL& url,
                                                                       const TGRTTaxonomy& taxonomy,
                                                                       std::uint64_t options) {
-    ObjectSet<TGRTTagging> taggings;
-    for (const TagDictionary& dictionary : tagsWithContentsOfURL(url, options)) {
-        taggings.insert(taggingForTagDictionary(dictionary, taxonomy));
-    }
-    return taggings;
+    return taggingsForTags(tagsWithContentsOfURL(url, options), taxonomy);
 }
 
 }  // namespace qvct

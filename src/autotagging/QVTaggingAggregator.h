@@ -15,6 +15,8 @@
 
 namespace qvct {
 
+class ContentItem;
+
 /// Derives tags for content items: asks every tagging service that the options name and merges their answers.
 ///
 /// Nothing is kept between calls but what the services cache. An aggregator works from one thread at a time:
@@ -40,16 +42,22 @@ class QVCT_API QVTaggingAggregator {
 
     /// What the services say: each tag dictionary once. Labels need not be known to any taxonomy.
     TagDictionarySet tagsWithContentsOfURL(const URL& url, std::uint64_t options);
+    /// The same of an item of which something may have been read already. Its record counts as it was read,
+    /// whatever the options.
+    TagDictionarySet tagsOfItem(const std::shared_ptr<ContentItem>& item, std::uint64_t options);
     /// The same as taggings. Labels that the taxonomy does not know are dropped.
     ObjectSet<TGRTTagging> taggingsWithContentsOfURL(const URL& url, const TGRTTaxonomy& taxonomy,
                                                      std::uint64_t options);
+    ObjectSet<TGRTTagging> taggingsOfItem(const std::shared_ptr<ContentItem>& item,
+                                          const TGRTTaxonomy& taxonomy, std::uint64_t options);
 
     /// The taxonomy that belongs to this aggregator. Conversion uses the one it is given.
     const std::shared_ptr<TGRTTaxonomy>& taxonomy() const { return taxonomy_; }
     void setTaxonomy(std::shared_ptr<TGRTTaxonomy> taxonomy) { taxonomy_ = std::move(taxonomy); }
 
     // What the services are given of an item: prepared once a call, each null where the item has none. A host
-    // that has one at hand overrides.
+    // that has one at hand overrides. What the base class answers during a call stems from the item at hand,
+    // so that no file is opened twice.
 
     /// The XML description in or beside the item.
     virtual std::shared_ptr<QVCTXMLDocument> xmlDocumentForURL(const URL& url);
@@ -64,8 +72,13 @@ class QVCT_API QVTaggingAggregator {
     explicit QVTaggingAggregator(Services services);
 
   private:
+    std::shared_ptr<TGRTTaxonomy> taxonomyOfRecords_;  // null: the shared writable default taxonomy
+    /// The item at hand, or one for another URL.
+    std::shared_ptr<ContentItem> itemForURL(const URL& url, std::uint64_t options) const;
+
     Services taggingServices_;
     std::shared_ptr<TGRTTaxonomy> taxonomy_;
+    std::shared_ptr<ContentItem> item_;  // during a call, the one at hand
 };
 
 }  // namespace qvct

@@ -6,7 +6,7 @@
 
 namespace qvct {
 
-void walkContent(const std::string& path, const std::function<void(const URL& item)>& item,
+void walkContent(const std::string& path, const std::function<bool(const URL& item)>& item,
                  const std::function<void(const Error& error)>& failed, const WalkedLinks& links) {
     const URL start = URL::fileURLWithPath(path);
     const bool isFolder = isDirectory(start.path());
@@ -23,7 +23,7 @@ void walkContent(const std::string& path, const std::function<void(const URL& it
     const auto visit = [&item](const ContentFolder& folder) {
         const URL url = URL::fileURLWithPath(folder.path);
         for (const ContentFolder::Item& found : folder.items) {
-            if (item) item(url.URLByAppendingPathComponent(std::string(found.entry.name)));
+            if (item && !item(url.URLByAppendingPathComponent(std::string(found.entry.name)))) return false;
         }
         return true;
     };

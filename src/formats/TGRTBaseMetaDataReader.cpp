@@ -1,5 +1,6 @@
 #include "formats/TGRTBaseMetaDataReader.h"
 
+#include "formats/ItemFile.h"
 #include "platform/text/Text.h"
 
 #include <algorithm>
@@ -10,6 +11,12 @@ std::shared_ptr<TGRTMetaData> TGRTBaseMetaDataReader::readMetaDataFromURL(const 
                                                                           std::uint64_t /*options*/,
                                                                           Error* /*error*/) const {
     return nullptr;
+}
+
+std::shared_ptr<TGRTMetaData> TGRTBaseMetaDataReader::readMetaDataFromFile(ItemFile& file,
+                                                                           std::uint64_t options,
+                                                                           Error* error) const {
+    return readMetaDataFromURL(file.url(), options, error);
 }
 
 bool TGRTBaseMetaDataReader::readUUID(std::string* /*uuid*/, std::int64_t* fileType,

@@ -11,6 +11,8 @@
 
 namespace qvct {
 
+class ItemFile;
+
 /// Base of all readers. It reads nothing itself.
 ///
 /// Readers are immutable: several threads may use one, as far as its taxonomy allows. A writable taxonomy
@@ -31,6 +33,10 @@ class QVCT_API TGRTBaseMetaDataReader : public TGRTMetaDataReader, public TGRTTa
 
     std::shared_ptr<TGRTMetaData> readMetaDataFromURL(const URL& url, std::uint64_t options,
                                                       Error* error = nullptr) const override;
+    /// The same of a file that may be open already. A kind whose record lies in the item's own file is read
+    /// through it; others are read by their URL.
+    virtual std::shared_ptr<TGRTMetaData> readMetaDataFromFile(ItemFile& file, std::uint64_t options,
+                                                               Error* error = nullptr) const;
     bool readUUID(std::string* uuid, std::int64_t* fileType, ObjectSet<TGRTTagging>* taggings,
                   ObjectSet<TGRTKeyValue>* keyValues, std::uint64_t options, const URL& url) const override;
     ObjectSet<TGRTTagging> taggingsForFileURL(const URL& url) const override;

@@ -1,5 +1,6 @@
 #include "formats/TGRTFileNode.h"
 
+#include "formats/ItemFile.h"
 #include "formats/TGRTMetaDataReaderFactory.h"
 #include "formats/audiofile/TGRTAudioFileTypeValidator.h"
 #include "formats/bundle/TGRTBundleTypeValidators.h"
@@ -13,6 +14,18 @@
 #include <fmt/format.h>
 
 namespace qvct {
+namespace {
+
+/// For audio whose extension is that of no content; null for anything else.
+std::shared_ptr<TGRTBaseMetaDataReader> readerForAudio(ItemFile& file,
+                                                       const std::shared_ptr<TGRTTaxonomy>& taxonomy) {
+    const auto audio = file.audio();
+    if (!audio) return nullptr;
+    if (audio->hasLoopTypeChunks()) return TGRTTavioLoopMetaDataReader::initWithTaxonomy(taxonomy);
+    return TGRTAudioFileMetaDataReader::initWithTaxonomy(taxonomy);
+}
+
+}  // namespace
 
 std::shared_ptr<TGRTFileNode> TGRTFileNode::nodeWithFileURL(const URL& url) {
     return std::shared_ptr<TGRTFileNode>(new TGRTFileNode(url));
@@ -37,19 +50,23 @@ std::shared_ptr<TGRTMetaData> TGRTFileNode::readMetaDataWithOptions(std::uint64_
 
 std::shared_ptr<TGRTMetaData> TGRTFileNode::readMetaDataWithOptions(
     std::uint64_t options, const std::shared_ptr<TGRTTaxonomy>& taxonomy, Error* error) const {
+    ItemFile file(url_);
+    return readMetaDataOfFile(file, options, taxonomy, error);
+}
+
+std::shared_ptr<TGRTMetaData> TGRTFileNode::readMetaDataOfFile(ItemFile& file, std::uint64_t options,
+                                                               const std::shared_ptr<TGRTTaxonomy>& taxonomy,
+                                                               Error* error) {
+    const URL& url = file.url();
     if (!taxonomy) {
         fail(error, kErrorInvalidArgument,
-             fmt::format("{}: no taxonomy to read it with", printable(url_.path())));
+             fmt::format("{}: no taxonomy to read it with", printable(url.path())));
         return nullptr;
     }
-    auto reader = TGRTMetaDataReaderFactory::metaDataReaderForURL(url_, taxonomy);
-    if (!reader) {
-        // All of ours are of this class.
-        const auto kind = std::dynamic_pointer_cast<const BaseTypeValidator>(validator());
-        reader = kind ? kind->readerForFileURL(url_, taxonomy) : nullptr;
-    }
-    if (reader) return reader->readMetaDataFromURL(url_, options, error);
-    fail(error, kErrorInvalidArgument, fmt::format("{}: no kind of content", printable(url_.path())));
+    auto reader = TGRTMetaDataReaderFactory::metaDataReaderForURL(url, taxonomy);
+    if (!reader) reader = readerForAudio(file, taxonomy);
+    if (reader) return reader->readMetaDataFromFile(file, options, error);
+    fail(error, kErrorNoContent, fmt::format("{}: no kind of content", printable(url.path())));
     return nullptr;
 }
 

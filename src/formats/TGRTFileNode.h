@@ -15,6 +15,8 @@
 
 namespace qvct {
 
+class ItemFile;
+
 /// One file or bundle, seen as content: its validator, and through it its reader and writers.
 ///
 /// Nodes with equal URLs are equal. Immutable; what it answers follows the disk, nothing is remembered.
@@ -41,6 +43,10 @@ class QVCT_API TGRTFileNode : public Object, public FileURLNode {
     std::shared_ptr<TGRTMetaData> readMetaDataWithOptions(std::uint64_t options,
                                                           const std::shared_ptr<TGRTTaxonomy>& taxonomy,
                                                           Error* error = nullptr) const;
+    /// The same of a file that may be open already.
+    static std::shared_ptr<TGRTMetaData> readMetaDataOfFile(ItemFile& file, std::uint64_t options,
+                                                            const std::shared_ptr<TGRTTaxonomy>& taxonomy,
+                                                            Error* error = nullptr);
 
     /// The file that holds the item's record, whether it is there or not: the property list of a bundle or
     /// beside settings, else the item. Its `FileStamp` tells whether a record is still the one that was read.

@@ -1,6 +1,7 @@
 #include "listening/onsets/OnsetDetector.h"
 #include "media/audio/AudioDecoder.h"
 #include "platform/files/FileAccess.h"
+#include "platform/files/RandomAccessReader.h"
 #include "support/Corpus.h"
 #include "support/TemporaryFolder.h"
 
@@ -37,8 +38,9 @@ std::string floats(const std::vector<float>& samples) {
     return bytes;
 }
 
-std::span<const std::uint8_t> bytesOf(const std::string& text) {
-    return {reinterpret_cast<const std::uint8_t*>(text.data()), text.size()};
+std::unique_ptr<AudioDecoder> decoderOf(const std::string& file) {
+    const std::span bytes(reinterpret_cast<const std::uint8_t*>(file.data()), file.size());
+    return AudioDecoder::open(std::make_shared<MemoryReader>(bytes), "a file in memory");
 }
 
 std::vector<float> decoded(AudioDecoder& decoder, std::size_t blockFrames = 100) {
@@ -54,7 +56,7 @@ std::vector<float> decoded(AudioDecoder& decoder, std::size_t blockFrames = 100)
 
 TEST(AudioDecoder, GivesTheSamplesOfEveryDepth) {
     const std::string sixteen = wav(1, 2, 48000, 16, std::string("\x00\x40\x00\x80\xff\x7f\x01\x00", 8));
-    const auto decoder = AudioDecoder::open(bytesOf(sixteen));
+    const auto decoder = decoderOf(sixteen);
     ASSERT_TRUE(decoder);
     EXPECT_EQ(decoder->sampleRate(), 48000);
     EXPECT_EQ(decoder->channels(), 2);
@@ -62,11 +64,11 @@ TEST(AudioDecoder, GivesTheSamplesOfEveryDepth) {
     EXPECT_THAT(decoded(*decoder, 1), testing::ElementsAre(0.5F, -1.0F, 32767.0F / 32768, 1.0F / 32768));
 
     const std::string eight = wav(1, 1, 8000, 8, std::string("\x80\xc0\x00", 3));
-    EXPECT_THAT(decoded(*AudioDecoder::open(bytesOf(eight))), testing::ElementsAre(0.0F, 0.5F, -1.0F));
+    EXPECT_THAT(decoded(*decoderOf(eight)), testing::ElementsAre(0.0F, 0.5F, -1.0F));
     const std::string wide = wav(1, 1, 96000, 24, std::string("\x00\x00\x40\x00\x00\x80", 6));
-    EXPECT_THAT(decoded(*AudioDecoder::open(bytesOf(wide))), testing::ElementsAre(0.5F, -1.0F));
+    EXPECT_THAT(decoded(*decoderOf(wide)), testing::ElementsAre(0.5F, -1.0F));
     const std::string real = wav(3, 1, 44100, 32, floats({0.25F, -4.0F}));
-    EXPECT_THAT(decoded(*AudioDecoder::open(bytesOf(real))), testing::ElementsAre(0.25F, -4.0F));
+    EXPECT_THAT(decoded(*decoderOf(real)), testing::ElementsAre(0.25F, -4.0F));
 }
 
 TEST(AudioDecoder, ReadsFromAPathWhatItReadsFromMemory) {
@@ -74,7 +76,7 @@ TEST(AudioDecoder, ReadsFromAPathWhatItReadsFromMemory) {
     std::string data;
     for (std::uint32_t i = 0; i < 5000; ++i) data += littleEndian(i * 2654435761U, 2);
     const std::string file = wav(1, 1, 44100, 16, data);
-    const auto memory = AudioDecoder::open(bytesOf(file));
+    const auto memory = decoderOf(file);
     const auto path = AudioDecoder::open(folder.write("a.wav", file));
     ASSERT_TRUE(memory && path);
     EXPECT_EQ(decoded(*memory), decoded(*path, 4096));
@@ -86,16 +88,16 @@ TEST(AudioDecoder, RefusesWhatIsNoAudioAndNamesIt) {
         Error error;
         EXPECT_FALSE(AudioDecoder::open(folder.write("no.wav", bytes), &error));
         EXPECT_THAT(error.message, testing::HasSubstr("no.wav"));
-        EXPECT_FALSE(AudioDecoder::open(bytesOf(bytes)));
+        EXPECT_FALSE(decoderOf(bytes));
     }
     EXPECT_FALSE(AudioDecoder::open(folder.path("absent.wav")));
-    EXPECT_FALSE(AudioDecoder::open(bytesOf(wav(1, 0, 44100, 16, "abcd")))) << "no channels";
+    EXPECT_FALSE(decoderOf(wav(1, 0, 44100, 16, "abcd"))) << "no channels";
 }
 
 TEST(AudioDecoder, StopsAtTheEndOfATruncatedFile) {
     std::string file = wav(1, 1, 44100, 16, std::string(2000, '\x11'));
     file.resize(file.size() - 1001);
-    const auto decoder = AudioDecoder::open(bytesOf(file));
+    const auto decoder = decoderOf(file);
     ASSERT_TRUE(decoder);
     EXPECT_LE(decoded(*decoder).size(), 500U);
 }
@@ -104,11 +106,11 @@ TEST(AudioDecoder, FloatFilesWithoutNumbersHaveNoOnsetsOfTheirOwn) {
     std::vector<float> samples(30000, 0.0F);
     for (std::size_t i = 0; i < samples.size(); i += 3) samples[i] = i % 2 ? std::nanf("") : HUGE_VALF;
     const std::string file = wav(3, 1, 44100, 32, floats(samples));
-    const auto decoder = AudioDecoder::open(bytesOf(file));
+    const auto decoder = decoderOf(file);
     ASSERT_TRUE(decoder);
     EXPECT_THAT(OnsetDetector::detect(*decoder), testing::IsEmpty());
     const std::string none = wav(1, 1, 44100, 16, "");
-    const auto empty = AudioDecoder::open(bytesOf(none));
+    const auto empty = decoderOf(none);
     ASSERT_TRUE(empty);
     EXPECT_THAT(OnsetDetector::detect(*empty), testing::IsEmpty());
 }

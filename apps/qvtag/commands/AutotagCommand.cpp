@@ -2,12 +2,13 @@
 #include "Resources.h"
 #include "RhythmMeasurement.h"
 #include "Services.h"
+#include "autotagging/ContentItem.h"
 #include "autotagging/QVTaggingAggregator.h"
 #include "autotagging/services/QVCTRhythmicTaggingService.h"
 #include "commands/Commands.h"
 #include "formats/QVContentTaggingTypes.h"
-#include "formats/TGRTFileNode.h"
-#include "media/loopfile/LCFileParser.h"
+#include "media/loopfile/LCFileData.h"
+#include "metadata/TGRTMetaData.h"
 #include "output/ItemTable.h"
 #include "output/StandardStreams.h"
 #include "platform/data/PropertyListFile.h"
@@ -31,10 +32,7 @@ struct Options {
     bool measuresAnyRhythm = false;
 };
 
-struct Item {
-    URL url;
-    std::vector<std::shared_ptr<TGRTTagging>> taggings;
-};
+using Taggings = std::vector<std::shared_ptr<TGRTTagging>>;
 
 using Settings = QVTaggingAggregator::Settings;
 
@@ -56,38 +54,41 @@ Settings keywordsIn(const std::string& file, ToolContext& context) {
 }
 
 /// What the item's record says that it is, else its name.
-std::int64_t fileTypeOf(const URL& url) {
-    const auto record = TGRTFileNode::nodeWithFileURL(url)->readMetaDataWithOptions(0);
+std::int64_t fileTypeOf(ContentItem& item) {
+    const auto record = item.record();
     const std::int64_t stored = record ? record->fileType() : std::int64_t{kFileTypeNone};
-    return stored != kFileTypeNone ? stored : QVContentTaggingTypes::fallBackFileTypeForURL(url);
+    return stored != kFileTypeNone ? stored : QVContentTaggingTypes::fallBackFileTypeForURL(item.url());
 }
 
-Json jsonOfItem(const Item& item) {
+Json jsonOfItem(ContentItem& item, const Taggings& taggings) {
     Json json;
-    json["path"] = item.url.path();
-    json["type"] = QVContentTaggingTypes::nameForFileType(fileTypeOf(item.url));
+    json["path"] = item.url().path();
+    json["type"] = QVContentTaggingTypes::nameForFileType(fileTypeOf(item));
     json["taggings"] = Json::array();
-    for (const auto& tagging : item.taggings) json["taggings"].push_back(jsonOfTagging(*tagging));
+    for (const auto& tagging : taggings) json["taggings"].push_back(jsonOfTagging(*tagging));
     return json;
 }
 
-ItemRow rowOf(const Item& item) {
-    ItemRow row{item.url.path(), {}};
-    for (const auto& tagging : item.taggings)
+ItemRow rowOf(const URL& url, const Taggings& taggings) {
+    ItemRow row{url.path(), {}};
+    for (const auto& tagging : taggings)
         row.words.push_back({textOfTagging(*tagging), tagging->level() ? Color::accent : Color::plain});
     if (row.words.empty()) row.words.push_back({"no tags", Color::faint});
     return row;
 }
 
-void noteTotals(const std::vector<Item>& items, const ToolContext& context) {
-    std::size_t tags = 0;
+/// How many items and tags there were.
+struct Totals {
+    std::size_t items = 0;
     std::size_t tagged = 0;
-    for (const Item& item : items) {
-        tags += item.taggings.size();
-        tagged += item.taggings.empty() ? 0 : 1;
+    std::size_t tags = 0;
+
+    void add(const Taggings& taggings) {
+        ++items;
+        tagged += taggings.empty() ? 0 : 1;
+        tags += taggings.size();
     }
-    context.note(fmt::format("{} items, {} of them tagged, {} tags", items.size(), tagged, tags));
-}
+};
 
 bool isGraded(const ObjectSet<TGRTTagging>& taggings) {
     return std::any_of(taggings.begin(), taggings.end(),
@@ -95,12 +96,12 @@ bool isGraded(const ObjectSet<TGRTTagging>& taggings) {
 }
 
 /// Grades audio that the rhythm service leaves alone, where its length in beats is known.
-void addAnyRhythm(const URL& url, const TGRTTaxonomy& taxonomy, ObjectSet<TGRTTagging>& taggings) {
+void addAnyRhythm(ContentItem& item, const TGRTTaxonomy& taxonomy, ObjectSet<TGRTTagging>& taggings) {
     if (isGraded(taggings)) return;
-    const auto data = LCFileParser::fileParserForURL(url)->enhancedFileData();
+    const auto data = item.fileData();
     if (!data || data->beatCount() == 0) return;
     Error ignored;
-    const auto rhythm = measureRhythm(url, {}, &ignored);
+    const auto rhythm = measureRhythm(item.file(), {}, &ignored);
     if (!rhythm) return;
     for (const TagDictionary& tag :
          QVCTRhythmicTaggingService::tagsForValues(rhythm->density, rhythm->complexity)) {
@@ -118,21 +119,25 @@ void run(const Options& options, ToolContext& context) {
         QVTaggingAggregator::initWithRules(settingsIn(options.rulesFile, "rules", readRules, context),
                                            keywordsIn(options.keywordsFile, context));
     const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
-    std::vector<Item> items;
-    for (const URL& url : context.contentItems(options.paths, options.links)) {
-        auto taggings = aggregator->taggingsWithContentsOfURL(url, *taxonomy, bits);
-        if (options.measuresAnyRhythm) addAnyRhythm(url, *taxonomy, taggings);
-        items.push_back({url, sortedTaggings(taggings)});
-    }
-    if (context.format == Format::table) {
-        std::vector<ItemRow> rows;
-        for (const Item& item : items) rows.push_back(rowOf(item));
-        printItemTable(rows, context.terminal());
-        return noteTotals(items, context);
-    }
-    Json json = Json::array();
-    for (const Item& item : items) json.push_back(jsonOfItem(item));
-    printJson(json, context.format);
+    std::vector<ItemRow> rows;
+    JsonItems json(context.format);
+    Totals totals;
+    context.forEachContentItem(options.paths, options.links, [&](const URL& url) {
+        const auto item = std::make_shared<ContentItem>(url, ContentItem::RecordReading{bits, nullptr});
+        auto found = aggregator->taggingsOfItem(item, *taxonomy, bits);
+        if (options.measuresAnyRhythm) addAnyRhythm(*item, *taxonomy, found);
+        const Taggings taggings = sortedTaggings(found);
+        totals.add(taggings);
+        if (context.format == Format::table) {
+            rows.push_back(rowOf(url, taggings));
+        } else {
+            json.add(jsonOfItem(*item, taggings));
+        }
+    });
+    if (context.format != Format::table) return json.finish();
+    printItemTable(rows, context.terminal());
+    context.note(
+        fmt::format("{} items, {} of them tagged, {} tags", totals.items, totals.tagged, totals.tags));
 }
 
 }  // namespace

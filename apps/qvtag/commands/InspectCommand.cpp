@@ -40,24 +40,23 @@ void printPart(const InspectedPart& part, const Terminal& terminal, std::size_t 
 }
 
 void run(const Options& options, ToolContext& context) {
-    Json json = Json::array();
-    for (const URL& url : context.contentItems(options.paths, options.links)) {
-        if (isOutputLost()) break;
+    JsonItems json(context.format);
+    context.forEachContentItem(options.paths, options.links, [&](const URL& url) {
         Error error;
         const auto parts = partsOfItem(url, &error);
         if (!error.message.empty()) context.itemFailed(error.message);
-        if (parts.empty() && !error.message.empty()) continue;
+        if (parts.empty() && !error.message.empty()) return;
         if (context.format == Format::table) {
             print("{}\n", colored(context.terminal(), Color::strong, printable(url.path())));
             print("{}\n", colored(context.terminal(), Color::faint, "    offset       size  what"));
             for (const InspectedPart& part : parts) printPart(part, context.terminal(), 0);
-            continue;
+            return;
         }
         Json item{{"path", url.path()}, {"parts", Json::array()}};
         for (const InspectedPart& part : parts) item["parts"].push_back(jsonOfPart(part));
-        json.push_back(std::move(item));
-    }
-    if (context.format != Format::table) printJson(json, context.format);
+        json.add(item);
+    });
+    if (context.format != Format::table) json.finish();
 }
 
 }  // namespace

@@ -74,10 +74,9 @@ void printObject(const URL& url, const ContentObject& object, const Terminal& te
 }
 
 void run(const Options& options, ToolContext& context) {
-    Json json = Json::array();
+    JsonItems json(context.format);
     std::size_t withoutRecord = 0;
-    for (const URL& url : context.contentItems(options.paths, options.links)) {
-        if (isOutputLost()) break;
+    context.forEachContentItem(options.paths, options.links, [&](const URL& url) {
         Error error;
         const auto object = objectOf(url, options.bits, &error);
         if (!error.message.empty()) {
@@ -85,14 +84,14 @@ void run(const Options& options, ToolContext& context) {
         } else if (!object) {
             ++withoutRecord;
         }
-        if (!object) continue;
+        if (!object) return;
         if (context.format == Format::table) {
             printObject(url, *object, context.terminal());
         } else {
-            json.push_back(jsonOfObject(url, *object));
+            json.add(jsonOfObject(url, *object));
         }
-    }
-    if (context.format != Format::table) printJson(json, context.format);
+    });
+    if (context.format != Format::table) json.finish();
     if (withoutRecord > 0) {
         context.note(fmt::format("{} that {} nothing about {} left out; --options 256 shows {} too",
                                  withoutRecord == 1 ? "1 item" : fmt::format("{} items", withoutRecord),

@@ -75,18 +75,17 @@ void printRecord(const URL& url, const TGRTMetaData& record, const Terminal& ter
 void run(const Options& options, ToolContext& context) {
     const std::uint64_t bits = (options.legacy ? std::uint64_t{kReadLegacyTaggings} : 0) |
                                (options.mapped ? std::uint64_t{kReadMappedTaggings} : 0);
-    Json json = Json::array();
-    for (const URL& url : context.contentItems(options.paths, options.links)) {
-        if (isOutputLost()) break;
+    JsonItems json(context.format);
+    context.forEachContentItem(options.paths, options.links, [&](const URL& url) {
         const auto record = readRecord(url, bits, context);
-        if (!record) continue;
+        if (!record) return;
         if (context.format == Format::table) {
             printRecord(url, *record, context.terminal());
         } else {
-            json.push_back(jsonOfRecord(url, *record));
+            json.add(jsonOfRecord(url, *record));
         }
-    }
-    if (context.format != Format::table) printJson(json, context.format);
+    });
+    if (context.format != Format::table) json.finish();
 }
 
 }  // namespace

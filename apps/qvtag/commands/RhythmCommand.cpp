@@ -129,7 +129,8 @@ void run(Options options, ToolContext& context) {
     for (const std::string& path : options.paths) {
         if (isOutputLost()) break;
         Error error;
-        const auto result = measureRhythm(URL::fileURLWithPath(path), options.request, &error);
+        ItemFile file(URL::fileURLWithPath(path));
+        const auto result = measureRhythm(file, options.request, &error);
         if (!result) {
             context.itemFailed(error.message);
             continue;

@@ -94,19 +94,18 @@ Service serviceWith(const std::string& rulesFile, ToolContext& context) {
 void show(const Options& options, ToolContext& context) {
     const Service service = serviceWith(options.rulesFile, context);
     if (!service) return;
-    Json items = Json::array();
-    for (const URL& url : context.contentItems(options.paths, options.links)) {
-        if (isOutputLost()) break;
+    JsonItems items(context.format);
+    context.forEachContentItem(options.paths, options.links, [&](const URL& url) {
         const auto matches = matchesOf(service, url, context);
         if (context.format == Format::table) {
             printMatches(url, matches, context.terminal());
-            continue;
+            return;
         }
         Json rules = Json::array();
         for (const RuleOutcome& match : matches) rules.push_back(jsonOf(match));
-        items.push_back({{"path", url.path()}, {"rules", rules}});
-    }
-    if (context.format != Format::table) printJson(items, context.format);
+        items.add({{"path", url.path()}, {"rules", rules}});
+    });
+    if (context.format != Format::table) items.finish();
 }
 
 /// A tally of each rule, and a line on standard error for each that can never match.

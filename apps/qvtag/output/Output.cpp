@@ -41,16 +41,25 @@ std::string jsonText(const Json& value, bool onOneLine) {
     return value.dump(onOneLine ? -1 : 2, ' ', false, Json::error_handler_t::replace);
 }
 
+void JsonItems::add(const Json& item) {
+    if (format_ == Format::jsonLines) {
+        printText(jsonText(item, true) + "\n");
+        flushOutput();
+    } else {
+        printText((isEmpty_ ? "[\n  " : ",\n  ") + replaceAll(jsonText(item, false), "\n", "\n  "));
+    }
+    isEmpty_ = false;
+}
+
+void JsonItems::finish() {
+    if (format_ != Format::jsonLines) printText(isEmpty_ ? "[]\n" : "\n]\n");
+}
+
 void printJson(const Json& items, Format format) {
-    if (format == Format::json) {
-        printText(jsonText(items, false) + "\n");
-        return;
-    }
-    if (!items.is_array()) {
-        printText(jsonText(items, true) + "\n");
-        return;
-    }
-    for (const Json& item : items) printText(jsonText(item, true) + "\n");
+    if (!items.is_array()) return printText(jsonText(items, format == Format::jsonLines) + "\n");
+    JsonItems printed(format);
+    for (const Json& item : items) printed.add(item);
+    printed.finish();
 }
 
 Json jsonOfNumber(double number) {

@@ -35,6 +35,19 @@ std::string jsonText(const Json& value, bool onOneLine);
 /// Prints the items: as an array, or one a line.
 void printJson(const Json& items, Format format);
 
+/// Prints items as they come: the elements of one array, or one a line, each of which can be read at once.
+class JsonItems {
+  public:
+    explicit JsonItems(Format format) : format_(format) {}
+    void add(const Json& item);
+    /// Closes the array, also when it is empty.
+    void finish();
+
+  private:
+    Format format_;
+    bool isEmpty_ = true;
+};
+
 /// A number as it was meant: whole ones without a fraction, those of single precision as their decimal.
 Json jsonOfNumber(double number);
 /// {"label","parent","category","level","auto","weightLevel"}, null where absent.

@@ -27,9 +27,10 @@ TagDictionarySet QVCTRhythmicTaggingService::tagsFromMidiIfExisting(const LCFile
     return tagsForValues(density, analysis->computeRhythmicComplexity());
 }
 
-TagDictionarySet QVCTRhythmicTaggingService::tagsFromTransients(const URL& url) const {
+TagDictionarySet QVCTRhythmicTaggingService::tagsFromTransients(const URL& url,
+                                                                const LCFileData& fileData) const {
     AudioTransientComplexity transients;
-    if (!transients.computeRhythmicDensityAndComplexityUsingTransients(url, true)) return {};
+    if (!transients.computeRhythmicDensityAndComplexityUsingTransients(url, fileData, true)) return {};
     return tagsForValues(transients.getDensity(), transients.getComplexity());
 }
 
@@ -40,7 +41,7 @@ TagDictionarySet QVCTRhythmicTaggingService::tagsWithContentsOfURL(
     if (!fileData || (options & QVCTAutoTaggingOptionRhythm) == 0) return {};
     const int type = fileData->tavioLoopType();
     if (type < 0) return {};
-    return type > 0 ? tagsFromMidiIfExisting(*fileData) : tagsFromTransients(url);
+    return type > 0 ? tagsFromMidiIfExisting(*fileData) : tagsFromTransients(url, *fileData);
 }
 
 }  // namespace qvct

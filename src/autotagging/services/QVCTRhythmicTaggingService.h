@@ -21,7 +21,7 @@ class QVCTRhythmicTaggingService : public QVCTAutoTaggingService {
 
     TagDictionarySet tagsFromMidiIfExisting(const LCFileData& fileData) const;
     /// Decodes the whole file.
-    TagDictionarySet tagsFromTransients(const URL& url) const;
+    TagDictionarySet tagsFromTransients(const URL& url, const LCFileData& fileData) const;
 
     /// The two tags for two measured values.
     static TagDictionarySet tagsForValues(float density, float complexity);

@@ -1,7 +1,7 @@
 #include "formats/audiofile/TGRTAudioFileMetaDataReader.h"
 
+#include "formats/ItemFile.h"
 #include "formats/audiofile/TGRTAudioFileTypeValidator.h"
-#include "media/loopfile/LCFileParser.h"
 #include "platform/text/Text.h"
 
 #include <array>
@@ -18,13 +18,20 @@ bool TGRTAudioFileMetaDataReader::supportsFileExtension(std::string_view extensi
 std::shared_ptr<TGRTMetaData> TGRTAudioFileMetaDataReader::readMetaDataFromURL(const URL& url,
                                                                                std::uint64_t options,
                                                                                Error* error) const {
+    ItemFile file(url);
+    return readMetaDataFromFile(file, options, error);
+}
+
+std::shared_ptr<TGRTMetaData> TGRTAudioFileMetaDataReader::readMetaDataFromFile(ItemFile& file,
+                                                                                std::uint64_t options,
+                                                                                Error* error) const {
+    const URL& url = file.url();
     if (TGRTAudioFileTypeValidator::isPrelistenFile(url)) {
         fail(error, kErrorUnreadable,
              fmt::format("{}: is the recorded preview of another item", printable(url.path())));
         return nullptr;
     }
-    const std::shared_ptr<const LCFileData> fileData =
-        LCFileParser::fileParserForURL(url, false, kLCAllAudio)->enhancedFileData(error);
+    const std::shared_ptr<const LCFileData> fileData = file.audio(error);
     if (!readSuccessForFileData(fileData, url)) return nullptr;
     auto record = TGRTMetaData::init();
     record->setKeyValues(readKeyValuesFromFileData(fileData, url));

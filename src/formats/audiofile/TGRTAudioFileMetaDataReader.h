@@ -25,6 +25,8 @@ class TGRTAudioFileMetaDataReader : public TGRTBaseMetaDataReader {
 
     std::shared_ptr<TGRTMetaData> readMetaDataFromURL(const URL& url, std::uint64_t options,
                                                       Error* error = nullptr) const override;
+    std::shared_ptr<TGRTMetaData> readMetaDataFromFile(ItemFile& file, std::uint64_t options,
+                                                       Error* error = nullptr) const override;
     std::int64_t defaultFileType() const override { return kFileTypeAudioFile; }
 
     virtual bool readSuccessForFileData(const std::shared_ptr<const LCFileData>& fileData,

@@ -10,6 +10,9 @@
 
 namespace qvct {
 
+/// Largest preset that is read or written; presets are a few kilobytes.
+inline constexpr std::uint64_t kLargestPreset = 16ULL << 20U;
+
 /// The text of a synth preset (docs/formats/synth-preset.md): lines in sections, of which we read and rewrite
 /// those that we know. All others come out byte for byte, in their order, line ends included.
 class PresetText {

@@ -1,8 +1,8 @@
 #include "formats/preset/TGRTVorthalPresetMetaDataReader.h"
 
+#include "formats/ItemFile.h"
 #include "formats/preset/PresetRecord.h"
 #include "formats/preset/TGRTVorthalLegacyTaggingParser.h"
-#include "platform/files/FileAccess.h"
 #include "platform/text/Text.h"
 
 #include <array>
@@ -19,7 +19,15 @@ bool TGRTVorthalPresetMetaDataReader::supportsFileExtension(std::string_view ext
 std::shared_ptr<TGRTMetaData> TGRTVorthalPresetMetaDataReader::readMetaDataFromURL(const URL& url,
                                                                                    std::uint64_t options,
                                                                                    Error* error) const {
-    const auto bytes = readFile(url.path(), error, kLargestPreset);
+    ItemFile file(url);
+    return readMetaDataFromFile(file, options, error);
+}
+
+std::shared_ptr<TGRTMetaData> TGRTVorthalPresetMetaDataReader::readMetaDataFromFile(ItemFile& file,
+                                                                                    std::uint64_t options,
+                                                                                    Error* error) const {
+    const URL& url = file.url();
+    const auto bytes = file.bytes(kLargestPreset, error);
     if (!bytes) return nullptr;
     Error reason;
     const auto preset =

@@ -8,9 +8,6 @@
 
 namespace qvct {
 
-/// Largest preset that is read or written; presets are a few kilobytes.
-inline constexpr std::uint64_t kLargestPreset = 16ULL << 20U;
-
 /// Reads the record in the text of a synth preset (docs/formats/synth-preset.md), and on demand the tags that
 /// older versions wrote into it as codes. Its file type is always kFileTypeSynthPreset.
 class TGRTVorthalPresetMetaDataReader : public TGRTBaseMetaDataReader {
@@ -24,6 +21,8 @@ class TGRTVorthalPresetMetaDataReader : public TGRTBaseMetaDataReader {
 
     std::shared_ptr<TGRTMetaData> readMetaDataFromURL(const URL& url, std::uint64_t options,
                                                       Error* error = nullptr) const override;
+    std::shared_ptr<TGRTMetaData> readMetaDataFromFile(ItemFile& file, std::uint64_t options,
+                                                       Error* error = nullptr) const override;
     std::int64_t defaultFileType() const override { return kFileTypeSynthPreset; }
 
   protected:

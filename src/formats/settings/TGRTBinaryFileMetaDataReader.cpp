@@ -1,5 +1,6 @@
 #include "formats/settings/TGRTBinaryFileMetaDataReader.h"
 
+#include "formats/ItemFile.h"
 #include "formats/settings/CFBinaryPlistFindTrailer.h"
 #include "platform/base/Log.h"
 #include "platform/base/ProcessArguments.h"
@@ -48,9 +49,16 @@ bool TGRTBinaryFileMetaDataReader::supportsFileExtension(std::string_view extens
 }
 
 std::shared_ptr<TGRTMetaData> TGRTBinaryFileMetaDataReader::readMetaDataFromURL(const URL& url,
-                                                                                std::uint64_t /*options*/,
+                                                                                std::uint64_t options,
                                                                                 Error* error) const {
-    const auto extracted = _extractDictionaryFromURL(url, error);
+    ItemFile file(url);
+    return readMetaDataFromFile(file, options, error);
+}
+
+std::shared_ptr<TGRTMetaData> TGRTBinaryFileMetaDataReader::readMetaDataFromFile(ItemFile& file,
+                                                                                 std::uint64_t /*options*/,
+                                                                                 Error* error) const {
+    const auto extracted = _extractDictionaryFromFile(file, error);
     const PropertyList::Dictionary dictionary = extracted.value_or(PropertyList::Dictionary{});
     auto record = TGRTMetaData::init();
     record->setTaggings(TGRTMetaData::taggingsFromDictionary(dictionary, *taxonomy()));
@@ -65,9 +73,17 @@ std::shared_ptr<TGRTMetaData> TGRTBinaryFileMetaDataReader::readMetaDataFromURL(
 
 std::optional<PropertyList::Dictionary> TGRTBinaryFileMetaDataReader::_extractDictionaryFromURL(
     const URL& url, Error* error) const {
+    ItemFile file(url);
+    return _extractDictionaryFromFile(file, error);
+}
+
+std::optional<PropertyList::Dictionary> TGRTBinaryFileMetaDataReader::_extractDictionaryFromFile(
+    ItemFile& file, Error* error) const {
+    const URL& url = file.url();
     Error reason;
     std::optional<EmbeddedPropertyList> found;
-    if (const auto bytes = readFile(url.path(), &reason)) found = findEmbeddedPropertyList(*bytes, &reason);
+    if (const auto bytes = file.bytes(kLargestWholeFile, &reason))
+        found = findEmbeddedPropertyList(*bytes, &reason);
     if (found && found->value.dictionary() != nullptr) return std::move(*found->value.dictionary());
     if (found) fail(&reason, kErrorNoPropertyList, "the embedded property list is no dictionary");
 

@@ -26,9 +26,13 @@ class TGRTBinaryFileMetaDataReader : public TGRTBaseMetaDataReader {
     /// Never null. The error is set when nothing could be extracted.
     std::shared_ptr<TGRTMetaData> readMetaDataFromURL(const URL& url, std::uint64_t options,
                                                       Error* error = nullptr) const override;
+    std::shared_ptr<TGRTMetaData> readMetaDataFromFile(ItemFile& file, std::uint64_t options,
+                                                       Error* error = nullptr) const override;
     /// The dictionary from the first "bplist00" to the first trailer behind it.
     std::optional<PropertyList::Dictionary> _extractDictionaryFromURL(const URL& url,
                                                                       Error* error = nullptr) const;
+    std::optional<PropertyList::Dictionary> _extractDictionaryFromFile(ItemFile& file,
+                                                                       Error* error = nullptr) const;
 
   protected:
     using TGRTBaseMetaDataReader::TGRTBaseMetaDataReader;

@@ -4,6 +4,7 @@
 #include "listening/rhythm/QVCTMidiAnalysis.h"
 #include "media/audio/AudioDecoder.h"
 #include "media/loopfile/LCFileParser.h"
+#include "platform/files/RandomAccessReader.h"
 
 #include <string>
 #include <vector>
@@ -18,23 +19,35 @@ std::vector<std::int64_t> withoutEdges(std::vector<std::int64_t> markers, std::i
     return markers;
 }
 
+bool isMeasured(const URL& url) {
+    const std::string extension = url.pathExtension();
+    return extension == "aif" || extension == "caf";
+}
+
 }  // namespace
 
 bool AudioTransientComplexity::computeRhythmicDensityAndComplexityUsingTransients(const URL& url,
                                                                                   bool withNewAnalysis) {
     if (alreadyComputed_) return true;
-    const std::string extension = url.pathExtension();
-    if (extension != "aif" && extension != "caf") return false;
-    const auto data = LCFileParser::fileParserForURL(url)->enhancedFileData();
-    if (!data) return false;
-    const auto metre = LoopMetre::of(*data);
-    if (!metre.isMeasured()) return false;
+    if (!isMeasured(url)) return false;
+    const auto file = FileReader::open(url.path());
+    if (!file) return false;
+    const auto data = LCFileParser::fileParserForReader(file, url.path())->enhancedFileData();
+    return data && computeRhythmicDensityAndComplexityUsingTransients(url, *data, withNewAnalysis);
+}
 
-    const auto decoder = AudioDecoder::open(url.path());
+bool AudioTransientComplexity::computeRhythmicDensityAndComplexityUsingTransients(const URL& url,
+                                                                                  const LCFileData& data,
+                                                                                  bool withNewAnalysis) {
+    if (alreadyComputed_) return true;
+    const auto metre = LoopMetre::of(data);
+    if (!isMeasured(url) || !metre.isMeasured()) return false;
+    const auto file = data.openFile();
+    const auto decoder = file ? AudioDecoder::open(file, url.path()) : AudioDecoder::open(url.path());
     if (!decoder) return false;
     const std::int64_t frames = decoder->frames();
     return computeRhythmicDensityAndComplexity(
-        withNewAnalysis ? OnsetDetector::detect(*decoder) : withoutEdges(data->transientMarkers(), frames),
+        withNewAnalysis ? OnsetDetector::detect(*decoder) : withoutEdges(data.transientMarkers(), frames),
         frames, metre);
 }
 

@@ -8,6 +8,8 @@
 
 namespace qvct {
 
+class LCFileData;
+
 /// Rhythmic density and complexity of an audio loop: its onsets are measured as notes of equal loudness.
 ///
 /// The first success is kept: later calls give it again, whatever they are asked. Not safe to use from two
@@ -22,6 +24,9 @@ class AudioTransientComplexity {
     ///
     /// @cost  A fresh search decodes the whole file, in constant memory.
     bool computeRhythmicDensityAndComplexityUsingTransients(const URL& url, bool withNewAnalysis);
+    /// The same with what the file says at hand; while `LCFileData::openFile` is there, nothing is opened.
+    bool computeRhythmicDensityAndComplexityUsingTransients(const URL& url, const LCFileData& data,
+                                                            bool withNewAnalysis);
 
     /// Measures onsets at ascending sample-frame positions of a loop of `frames` frames.
     ///

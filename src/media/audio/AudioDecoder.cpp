@@ -1,11 +1,9 @@
 #include "media/audio/AudioDecoder.h"
 
-#include "platform/files/FileAccess.h"
-#include "platform/files/FileDescriptor.h"
+#include "platform/files/RandomAccessReader.h"
 
 #include <algorithm>
 #include <cstdio>
-#include <cstring>
 #include <utility>
 #include <vector>
 
@@ -15,13 +13,13 @@
 namespace qvct {
 namespace {
 
-/// A file in memory, as libsndfile wants to see it.
-struct MemoryFile {
-    std::span<const std::uint8_t> bytes;
+/// An open file with a position, as libsndfile wants to see it.
+struct PositionedFile {
+    std::shared_ptr<const RandomAccessReader> reader;
     sf_count_t position = 0;
 
-    sf_count_t size() const { return static_cast<sf_count_t>(bytes.size()); }
-    static MemoryFile& of(void* user) { return *static_cast<MemoryFile*>(user); }
+    sf_count_t size() const { return static_cast<sf_count_t>(reader->size()); }
+    static PositionedFile& of(void* user) { return *static_cast<PositionedFile*>(user); }
 
     sf_count_t seek(sf_count_t offset, int whence) {
         const sf_count_t base = whence == SEEK_SET ? 0 : whence == SEEK_CUR ? position : size();
@@ -31,31 +29,31 @@ struct MemoryFile {
     }
     sf_count_t read(void* target, sf_count_t count) {
         const sf_count_t given = std::clamp<sf_count_t>(count, 0, size() - position);
-        if (given > 0) std::memcpy(target, bytes.data() + position, static_cast<std::size_t>(given));
+        const std::span into(static_cast<std::uint8_t*>(target), static_cast<std::size_t>(given));
+        if (!reader->read(static_cast<std::uint64_t>(position), into)) return 0;
         position += given;
         return given;
     }
 };
 
-SF_VIRTUAL_IO memoryAccess() {
+SF_VIRTUAL_IO access() {
     SF_VIRTUAL_IO access{};
-    access.get_filelen = [](void* user) { return MemoryFile::of(user).size(); };
+    access.get_filelen = [](void* user) { return PositionedFile::of(user).size(); };
     access.seek = [](sf_count_t offset, int whence, void* user) {
-        return MemoryFile::of(user).seek(offset, whence);
+        return PositionedFile::of(user).seek(offset, whence);
     };
     access.read = [](void* target, sf_count_t count, void* user) {
-        return MemoryFile::of(user).read(target, count);
+        return PositionedFile::of(user).read(target, count);
     };
     access.write = [](const void*, sf_count_t, void*) { return sf_count_t{0}; };
-    access.tell = [](void* user) { return MemoryFile::of(user).position; };
+    access.tell = [](void* user) { return PositionedFile::of(user).position; };
     return access;
 }
 
 }  // namespace
 
 struct AudioDecoder::State {
-    MemoryFile memory;
-    FileDescriptor descriptor{-1};
+    PositionedFile source;
     SF_INFO info{};
     SNDFILE* file = nullptr;
     std::vector<short> shorts;
@@ -77,7 +75,7 @@ struct AudioDecoder::State {
         return given;
     }
 
-    bool isUsable(const std::string& name, Error* error) const {
+    bool isUsable(std::string_view name, Error* error) const {
         if (!file) return fail(error, kErrorUnreadable, fmt::format("{}: {}", name, sf_strerror(nullptr)));
         if (info.samplerate < 1 || info.channels < 1 || info.channels > kMostChannels) {
             return fail(error, kErrorMalformed,
@@ -92,20 +90,17 @@ AudioDecoder::AudioDecoder(std::unique_ptr<State> state) : state_(std::move(stat
 AudioDecoder::~AudioDecoder() = default;
 
 std::unique_ptr<AudioDecoder> AudioDecoder::open(const std::string& path, Error* error) {
-    auto state = std::make_unique<State>();
-    state->descriptor = openRegularFile(path, error);
-    if (!state->descriptor.isOpen()) return nullptr;
-    state->file = sf_open_fd(state->descriptor.number(), SFM_READ, &state->info, SF_FALSE);
-    if (!state->isUsable(path, error)) return nullptr;
-    return std::unique_ptr<AudioDecoder>(new AudioDecoder(std::move(state)));
+    auto file = FileReader::open(path, error);
+    return file ? open(std::move(file), path, error) : nullptr;
 }
 
-std::unique_ptr<AudioDecoder> AudioDecoder::open(std::span<const std::uint8_t> bytes, Error* error) {
+std::unique_ptr<AudioDecoder> AudioDecoder::open(std::shared_ptr<const RandomAccessReader> file,
+                                                 std::string_view name, Error* error) {
     auto state = std::make_unique<State>();
-    state->memory.bytes = bytes;
-    SF_VIRTUAL_IO access = memoryAccess();
-    state->file = sf_open_virtual(&access, SFM_READ, &state->info, &state->memory);
-    if (!state->isUsable("audio in memory", error)) return nullptr;
+    state->source.reader = std::move(file);
+    SF_VIRTUAL_IO callbacks = access();
+    state->file = sf_open_virtual(&callbacks, SFM_READ, &state->info, &state->source);
+    if (!state->isUsable(name, error)) return nullptr;
     return std::unique_ptr<AudioDecoder>(new AudioDecoder(std::move(state)));
 }
 

@@ -7,8 +7,11 @@
 #include <memory>
 #include <span>
 #include <string>
+#include <string_view>
 
 namespace qvct {
+
+class RandomAccessReader;
 
 /// Decodes an audio file block by block: every container, coding, rate, depth and channel count that
 /// libsndfile knows. Memory does not depend on the file's length.
@@ -21,8 +24,9 @@ class AudioDecoder {
 
     /// Null, and an error that names the path, when the file is unreadable or no known audio.
     static std::unique_ptr<AudioDecoder> open(const std::string& path, Error* error = nullptr);
-    /// Over bytes in memory, which must outlive the decoder.
-    static std::unique_ptr<AudioDecoder> open(std::span<const std::uint8_t> bytes, Error* error = nullptr);
+    /// Over what is open already; `name` stands in messages.
+    static std::unique_ptr<AudioDecoder> open(std::shared_ptr<const RandomAccessReader> file,
+                                              std::string_view name, Error* error = nullptr);
     ~AudioDecoder();
 
     /// Frames a second, at least 1.
@@ -38,6 +42,7 @@ class AudioDecoder {
 
   private:
     struct State;
+
     explicit AudioDecoder(std::unique_ptr<State> state);
 
     std::unique_ptr<State> state_;

@@ -8,9 +8,12 @@
 #include <set>
 #include <string>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 namespace qvct {
+
+class RandomAccessReader;
 
 /// What an audio file says about itself outside of our own record: its format, and the music in the chunks
 /// that other makers write.
@@ -118,6 +121,11 @@ class LCFileData {
     /// The same record on other facts.
     std::shared_ptr<LCFileData> withFacts(LCAudioFacts facts) const;
 
+    /// The file that this was read from, while its reader holds it open: who needs more of it need not open
+    /// it again. Null afterwards.
+    std::shared_ptr<const RandomAccessReader> openFile() const { return file_.lock(); }
+    void setOpenFile(std::weak_ptr<const RandomAccessReader> file) { file_ = std::move(file); }
+
   private:
     std::optional<double> number(std::string_view key, double lowest, double highest) const;
     int integer(std::string_view key, int lowest, int highest, int otherwise) const;
@@ -129,6 +137,7 @@ class LCFileData {
     LCAudioFacts facts_;
     Dictionary record_;
     bool hasRecord_ = false;
+    std::weak_ptr<const RandomAccessReader> file_;
 };
 
 }  // namespace qvct

@@ -112,9 +112,8 @@ std::shared_ptr<LCFileParser> LCFileParser::fileParserForBytes(std::span<const s
     return fileParserForReader(std::make_shared<MemoryReader>(bytes), name, allowedFileTypes);
 }
 
-std::shared_ptr<LCFileParser> LCFileParser::fileParserForReader(std::shared_ptr<RandomAccessReader> reader,
-                                                                std::string_view name,
-                                                                unsigned allowedFileTypes) {
+std::shared_ptr<LCFileParser> LCFileParser::fileParserForReader(
+    std::shared_ptr<const RandomAccessReader> reader, std::string_view name, unsigned allowedFileTypes) {
     std::shared_ptr<LCFileParser> parser(new LCFileParser());
     parser->reader_ = std::move(reader);
     parser->name_ = name;
@@ -122,7 +121,7 @@ std::shared_ptr<LCFileParser> LCFileParser::fileParserForReader(std::shared_ptr<
     return parser;
 }
 
-std::shared_ptr<RandomAccessReader> LCFileParser::open(Error* error) const {
+std::shared_ptr<const RandomAccessReader> LCFileParser::open(Error* error) const {
     return reader_ ? reader_ : FileReader::open(name_, error);
 }
 
@@ -131,7 +130,11 @@ std::shared_ptr<LCFileData> LCFileParser::fileData(Error* error) const {
     if (!reader) return nullptr;
     ReadWindow window(*reader);
     auto data = read(window, name_, allowedFileTypes_, error);
-    if (!data) putPathBefore(error, name_);
+    if (data) {
+        data->setOpenFile(reader);
+    } else {
+        putPathBefore(error, name_);
+    }
     return data;
 }
 

@@ -54,7 +54,7 @@ class LCFileParser {
     static std::shared_ptr<LCFileParser> fileParserForBytes(std::span<const std::uint8_t> bytes,
                                                             std::string_view name,
                                                             unsigned allowedFileTypes = kLCAllAudio);
-    static std::shared_ptr<LCFileParser> fileParserForReader(std::shared_ptr<RandomAccessReader> reader,
+    static std::shared_ptr<LCFileParser> fileParserForReader(std::shared_ptr<const RandomAccessReader> reader,
                                                              std::string_view name,
                                                              unsigned allowedFileTypes = kLCAllAudio);
 
@@ -70,9 +70,9 @@ class LCFileParser {
 
   private:
     LCFileParser() = default;
-    std::shared_ptr<RandomAccessReader> open(Error* error) const;
+    std::shared_ptr<const RandomAccessReader> open(Error* error) const;
 
-    std::shared_ptr<RandomAccessReader> reader_;  // null: the file at name_ is opened
+    std::shared_ptr<const RandomAccessReader> reader_;  // null: the file at name_ is opened
     std::string name_;
     bool extractsKeywords_ = false;
     unsigned allowedFileTypes_ = kLCAllAudio;

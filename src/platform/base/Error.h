@@ -23,12 +23,13 @@ struct Error {
 
 /// Codes used in QVCTErrorDomain.
 enum ErrorCode : int {
-    kErrorUnreadable = 1,      ///< A file or folder cannot be opened or read.
-    kErrorNoPropertyList = 2,  ///< A data file's embedded property list cannot be extracted.
-    kErrorMalformed = 3,       ///< The bytes are not what their format demands.
-    kErrorTooLarge = 4,        ///< A limit on size, depth or count was exceeded.
-    kErrorUnwritable = 5,      ///< A file cannot be written or replaced.
-    kErrorInvalidArgument = 6  ///< The caller asked for something that cannot be.
+    kErrorUnreadable = 1,       ///< A file or folder cannot be opened or read.
+    kErrorNoPropertyList = 2,   ///< A data file's embedded property list cannot be extracted.
+    kErrorMalformed = 3,        ///< The bytes are not what their format demands.
+    kErrorTooLarge = 4,         ///< A limit on size, depth or count was exceeded.
+    kErrorUnwritable = 5,       ///< A file cannot be written or replaced.
+    kErrorInvalidArgument = 6,  ///< The caller asked for something that cannot be.
+    kErrorNoContent = 7         ///< What lies there is no content of a kind that the framework knows.
 };
 
 /// Fills `error`, if asked for, with a framework error. Always false, so that a failing operation can

@@ -2,6 +2,7 @@
 
 #include "platform/files/FileDescriptor.h"
 #include "platform/files/FileReplacement.h"
+#include "platform/files/RandomAccessReader.h"
 #include "platform/text/Text.h"
 #include "platform/text/Url.h"
 
@@ -67,28 +68,8 @@ FileDescriptor openRegularFile(const std::string& path, Error* error, struct sta
 
 std::optional<std::vector<std::uint8_t>> readFile(const std::string& path, Error* error,
                                                   std::uint64_t limit) {
-    struct stat status {};
-    const FileDescriptor descriptor = openRegularFile(path, error, &status);
-    if (!descriptor.isOpen()) return std::nullopt;
-    const auto size = static_cast<std::uint64_t>(status.st_size);
-    if (size > limit) {
-        failFor(error, kErrorTooLarge, path, fmt::format("{} bytes are over the limit of {}", size, limit));
-        return std::nullopt;
-    }
-    std::vector<std::uint8_t> bytes(size);
-    std::size_t filled = 0;
-    while (filled < bytes.size()) {
-        const ssize_t got = ::read(descriptor.number(), bytes.data() + filled, bytes.size() - filled);
-        if (got < 0 && errno == EINTR) continue;
-        if (got < 0) {
-            failWithErrno(error, kErrorUnreadable, path);
-            return std::nullopt;
-        }
-        if (got == 0) break;  // the file shrank while it was read
-        filled += static_cast<std::size_t>(got);
-    }
-    bytes.resize(filled);
-    return bytes;
+    const auto file = FileReader::open(path, error);
+    return file ? readAll(*file, path, limit, error) : std::nullopt;
 }
 
 std::optional<std::string> readTextFile(const std::string& path, Error* error) {

@@ -1,10 +1,12 @@
 #include "platform/files/RandomAccessReader.h"
 
 #include "platform/files/FileAccess.h"
+#include "platform/text/Text.h"
 
 #include <cerrno>
 #include <cstring>
 
+#include <fmt/format.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -33,6 +35,22 @@ bool FileReader::read(std::uint64_t offset, std::span<std::uint8_t> into) const 
         offset += static_cast<std::uint64_t>(got);
     }
     return true;
+}
+
+std::optional<std::vector<std::uint8_t>> readAll(const RandomAccessReader& reader, std::string_view name,
+                                                 std::uint64_t limit, Error* error) {
+    if (reader.size() > limit) {
+        fail(error, kErrorTooLarge,
+             fmt::format("{}: {} bytes are over the limit of {}", printable(name), reader.size(), limit));
+        return std::nullopt;
+    }
+    std::vector<std::uint8_t> bytes(reader.size());
+    errno = 0;
+    if (reader.read(0, bytes)) return bytes;
+    fail(error, kErrorUnreadable,
+         fmt::format("{}: {}", printable(name),
+                     errno != 0 ? std::strerror(errno) : "shrank while it was read"));
+    return std::nullopt;
 }
 
 }  // namespace qvct

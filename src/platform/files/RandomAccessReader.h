@@ -6,8 +6,10 @@
 
 #include <cstdint>
 #include <memory>
+#include <optional>
 #include <span>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace qvct {
@@ -49,5 +51,9 @@ class FileReader : public RandomAccessReader {
     FileDescriptor descriptor_;
     FileStamp stamp_;
 };
+
+/// All bytes; nothing, and an error with the name, when they are more than the limit or cannot be read.
+std::optional<std::vector<std::uint8_t>> readAll(const RandomAccessReader& reader, std::string_view name,
+                                                 std::uint64_t limit, Error* error = nullptr);
 
 }  // namespace qvct

@@ -1,0 +1,40 @@
+#include "autotagging/ContentItem.h"
+
+#include "autotagging/xml/QVCTXMLDocument.h"
+#include "formats/QVContentEditorFileUtilities.h"
+#include "formats/TGRTFileNode.h"
+
+#include <utility>
+
+namespace qvct {
+
+ContentItem::ContentItem(URL url) : ContentItem(std::move(url), RecordReading{}) {}
+
+ContentItem::ContentItem(URL url, RecordReading reading)
+    : file_(std::move(url)), reading_(std::move(reading)) {
+    if (!reading_.taxonomy) reading_.taxonomy = TGRTTaxonomy::mutableDefaultTaxonomy();
+}
+
+ContentItem::~ContentItem() = default;
+
+std::shared_ptr<QVCTXMLDocument> ContentItem::xmlDocument() {
+    if (!xmlDocument_) {
+        const auto cache = QVContentEditorFileUtilities::intermediateCacheURLForURL(url());
+        xmlDocument_ = cache ? QVCTXMLDocument::initWithContentsOfURL(*cache) : nullptr;
+    }
+    return *xmlDocument_;
+}
+
+std::shared_ptr<TGRTMetaData> ContentItem::record(Error* error) {
+    if (!record_) {
+        Error reason;
+        record_.emplace();
+        record_->record =
+            TGRTFileNode::readMetaDataOfFile(file_, reading_.options, reading_.taxonomy, &reason);
+        if (reason.code != 0) record_->error = std::move(reason);
+    }
+    if (record_->error && error != nullptr) *error = *record_->error;
+    return record_->record;
+}
+
+}  // namespace qvct

@@ -1,0 +1,60 @@
+#pragma once
+
+#include "formats/ItemFile.h"
+#include "platform/base/Error.h"
+#include "platform/base/Export.h"
+#include "platform/text/Url.h"
+#include "taxonomy/TGRTTaxonomy.h"
+
+#include <cstdint>
+#include <memory>
+#include <optional>
+
+namespace qvct {
+
+class QVCTXMLDocument;
+class TGRTMetaData;
+
+/// A content item as it is prepared for tagging, listing and indexing: its XML description, its record and
+/// what its chunks say, each read on first use, once.
+///
+/// Whoever asks several things about an item hands one of these around; the item's own file is opened once.
+/// It shows the item as it was when it was read. Not thread-safe.
+class QVCT_API ContentItem {
+  public:
+    /// How the record is to be read: MetaDataReaderOptions, and the taxonomy in which labels are resolved;
+    /// without one the shared writable default taxonomy.
+    struct RecordReading {
+        std::uint64_t options = 0;
+        std::shared_ptr<TGRTTaxonomy> taxonomy;
+    };
+
+    explicit ContentItem(URL url);
+    ContentItem(URL url, RecordReading reading);
+    ~ContentItem();
+
+    const URL& url() const { return file_.url(); }
+    /// The item's own file; of a bundle there is none.
+    ItemFile& file() { return file_; }
+
+    /// The XML description in or beside the item; null without one.
+    std::shared_ptr<QVCTXMLDocument> xmlDocument();
+    /// The stored record, as `TGRTFileNode::readMetaDataWithOptions` answers it: null without one, and with
+    /// an error when it cannot be read.
+    std::shared_ptr<TGRTMetaData> record(Error* error = nullptr);
+    /// What the chunks of an audio file say; null for anything else.
+    std::shared_ptr<LCFileData> fileData() { return file_.audio(); }
+
+  private:
+    struct Record {
+        std::shared_ptr<TGRTMetaData> record;
+        std::optional<Error> error;
+    };
+
+    ItemFile file_;
+    RecordReading reading_;
+    std::optional<std::shared_ptr<QVCTXMLDocument>> xmlDocument_;
+    std::optional<Record> record_;
+};
+
+}  // namespace qvct

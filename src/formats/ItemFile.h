@@ -1,0 +1,55 @@
+#pragma once
+
+#include "platform/base/Error.h"
+#include "platform/base/Export.h"
+#include "platform/text/Url.h"
+
+#include <cstdint>
+#include <memory>
+#include <optional>
+#include <utility>
+#include <vector>
+
+namespace qvct {
+
+class LCFileData;
+class RandomAccessReader;
+
+/// The file that lies at an item's URL: opened on first use, once, and what it says parsed once.
+///
+/// It stays open as long as this lives. What cannot be opened or parsed is not tried again; the reason is
+/// told each time. Of a folder or a missing file there is nothing. Not thread-safe.
+class QVCT_API ItemFile {
+  public:
+    explicit ItemFile(URL url);
+    ~ItemFile();
+
+    const URL& url() const { return url_; }
+
+    /// Null, and an error with the path, for anything but a regular file that can be read.
+    std::shared_ptr<const RandomAccessReader> reader(Error* error = nullptr);
+    /// What an audio file says, with what can be derived from it (`LCFileParser::enhancedFileData`). Null,
+    /// and an error, for what is no audio.
+    std::shared_ptr<LCFileData> audio(Error* error = nullptr);
+    /// All bytes. They are not kept.
+    std::optional<std::vector<std::uint8_t>> bytes(std::uint64_t limit, Error* error = nullptr);
+
+  private:
+    /// Something that was looked for, and what came of it.
+    template <typename Value>
+    struct Attempt {
+        std::shared_ptr<Value> value;
+        Error error;
+
+        std::shared_ptr<Value> answer(Error* reason) const {
+            if (!value && reason != nullptr) *reason = error;
+            return value;
+        }
+    };
+
+    URL url_;
+    std::optional<Attempt<const RandomAccessReader>> reader_;
+    std::optional<Attempt<LCFileData>> audio_;
+};
+
+}  // namespace qvct
