@@ -7,7 +7,7 @@ find_package(ZLIB REQUIRED)
 find_package(fmt REQUIRED)
 find_package(spdlog REQUIRED)
 # Name and module of each; the installed package says the same to hosts that link the static library.
-foreach(entry IN ITEMS javascriptcore:javascriptcoregtk-4.1 kissfft:kissfft-float libplist:libplist-2.0
+foreach(entry IN ITEMS kissfft:kissfft-float libplist:libplist-2.0
                        sndfile:sndfile uuid:uuid zstd:libzstd)
   string(REPLACE ":" ";" entry "${entry}")
   list(GET entry 0 name)
@@ -16,6 +16,12 @@ foreach(entry IN ITEMS javascriptcore:javascriptcoregtk-4.1 kissfft:kissfft-floa
   string(APPEND QVCT_PKG_CONFIG_MODULES " ${module}")
   string(APPEND QVCT_PKG_CONFIG_CALLS "  pkg_check_modules(${name} REQUIRED IMPORTED_TARGET ${module})\n")
 endforeach()
+# Loaded while the program runs, when the first script does: only its headers are built with, and the name of its
+# library with the version that they belong to.
+pkg_check_modules(javascriptcore REQUIRED javascriptcoregtk-4.1)
+find_library(QVCT_SCRIPT_ENGINE javascriptcoregtk-4.1 HINTS ${javascriptcore_LIBRARY_DIRS} REQUIRED)
+file(REAL_PATH "${QVCT_SCRIPT_ENGINE}" engine_file)
+string(REGEX MATCH "[^/]+[.]so[.][0-9]+" QVCT_SCRIPT_ENGINE_LIBRARY "${engine_file}")
 if(QVCT_BUILD_TOOL)
   find_package(CLI11 REQUIRED)
   find_package(nlohmann_json REQUIRED)

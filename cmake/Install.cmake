@@ -1,6 +1,7 @@
-# What `cmake --install` and `cpack` give: libraries with their headers, the CMake package and the pkg-config files; the
-# tool with its manual page and completions; resources and documents.
+# What `cmake --install` and `cpack` give. Who runs the tool or a host gets the tool, the shared libraries, resources and
+# documents; who builds a host also headers, static libraries, the CMake package and the pkg-config files.
 include(CMakePackageConfigHelpers)
+set(CMAKE_INSTALL_DEFAULT_COMPONENT_NAME runtime)
 
 # Headers include each other by paths from src/. Installed they lie in one folder, <qvcontenttagging/Error.h>, so that
 # no host is touched when a file moves to another room.
@@ -15,7 +16,7 @@ foreach(header IN LISTS headers database_headers)
     DEPENDS "${header}" "${PROJECT_SOURCE_DIR}/cmake/InstalledHeader.cmake" VERBATIM
     COMMENT "Header ${name} as it is installed")
   list(APPEND installed_headers "${installed}")
-  install(FILES "${installed}" DESTINATION "${CMAKE_INSTALL_INCLUDEDIR}/qvcontenttagging")
+  install(FILES "${installed}" DESTINATION "${CMAKE_INSTALL_INCLUDEDIR}/qvcontenttagging" COMPONENT dev)
 endforeach()
 add_custom_target(qvct_installed_headers ALL DEPENDS ${installed_headers})
 
@@ -25,12 +26,20 @@ set_target_properties(qvct_contentdb_shared PROPERTIES EXPORT_NAME contentdb)
 set_target_properties(qvcontenttagging PROPERTIES EXPORT_NAME qvcontenttagging_static)
 set_target_properties(qvct_contentdb PROPERTIES EXPORT_NAME contentdb_static)
 install(TARGETS qvcontenttagging_shared qvct_contentdb_shared EXPORT QVContentTaggingShared
+        LIBRARY NAMELINK_COMPONENT dev
         INCLUDES DESTINATION "${CMAKE_INSTALL_INCLUDEDIR}")
 install(TARGETS qvcontenttagging qvct_contentdb EXPORT QVContentTaggingStatic
+        ARCHIVE COMPONENT dev
         INCLUDES DESTINATION "${CMAKE_INSTALL_INCLUDEDIR}")
+# `--strip` and cpack pass archives over.
+foreach(library IN ITEMS qvcontenttagging qvcontentdb)
+  set(archive "\$ENV{DESTDIR}\${CMAKE_INSTALL_PREFIX}/${CMAKE_INSTALL_LIBDIR}/lib${library}.a")
+  install(CODE "execute_process(COMMAND \"${CMAKE_STRIP}\" --strip-debug \"${archive}\" COMMAND_ERROR_IS_FATAL ANY)"
+          COMPONENT dev)
+endforeach()
 set(package_folder "${CMAKE_INSTALL_LIBDIR}/cmake/QVContentTagging")
 foreach(kind IN ITEMS Shared Static)
-  install(EXPORT QVContentTagging${kind} NAMESPACE qvct:: DESTINATION "${package_folder}")
+  install(EXPORT QVContentTagging${kind} NAMESPACE qvct:: DESTINATION "${package_folder}" COMPONENT dev)
 endforeach()
 configure_package_config_file("${PROJECT_SOURCE_DIR}/cmake/QVContentTaggingConfig.cmake.in"
   "${PROJECT_BINARY_DIR}/QVContentTaggingConfig.cmake" INSTALL_DESTINATION "${package_folder}"
@@ -39,13 +48,14 @@ configure_package_config_file("${PROJECT_SOURCE_DIR}/cmake/QVContentTaggingConfi
 write_basic_package_version_file("${PROJECT_BINARY_DIR}/QVContentTaggingConfigVersion.cmake"
   COMPATIBILITY SameMinorVersion)
 install(FILES "${PROJECT_BINARY_DIR}/QVContentTaggingConfig.cmake"
-  "${PROJECT_BINARY_DIR}/QVContentTaggingConfigVersion.cmake" DESTINATION "${package_folder}")
+  "${PROJECT_BINARY_DIR}/QVContentTaggingConfigVersion.cmake" DESTINATION "${package_folder}" COMPONENT dev)
 
 file(RELATIVE_PATH QVCT_PREFIX_FROM_PKGCONFIG
   "${CMAKE_INSTALL_FULL_LIBDIR}/pkgconfig" "${CMAKE_INSTALL_PREFIX}")
-foreach(name IN ITEMS qvcontenttagging qvcontentdb)
+# Whoever links the shared libraries needs no other development package; the static ones have files of their own.
+foreach(name IN ITEMS qvcontenttagging qvcontentdb qvcontenttagging-static qvcontentdb-static)
   configure_file("${PROJECT_SOURCE_DIR}/cmake/${name}.pc.in" "${PROJECT_BINARY_DIR}/${name}.pc" @ONLY)
-  install(FILES "${PROJECT_BINARY_DIR}/${name}.pc" DESTINATION "${CMAKE_INSTALL_LIBDIR}/pkgconfig")
+  install(FILES "${PROJECT_BINARY_DIR}/${name}.pc" DESTINATION "${CMAKE_INSTALL_LIBDIR}/pkgconfig" COMPONENT dev)
 endforeach()
 
 install(DIRECTORY "${PROJECT_SOURCE_DIR}/src/resources/data/"
@@ -54,7 +64,7 @@ install(FILES "${PROJECT_SOURCE_DIR}/README.md" "${PROJECT_SOURCE_DIR}/CHANGELOG
   DESTINATION "${CMAKE_INSTALL_DOCDIR}")
 install(DIRECTORY "${PROJECT_SOURCE_DIR}/docs" DESTINATION "${CMAKE_INSTALL_DOCDIR}"
   FILES_MATCHING PATTERN "*.md" PATTERN "*.svg")
-install(DIRECTORY "${PROJECT_SOURCE_DIR}/examples/host" DESTINATION "${CMAKE_INSTALL_DOCDIR}/examples")
+install(DIRECTORY "${PROJECT_SOURCE_DIR}/examples/host" DESTINATION "${CMAKE_INSTALL_DOCDIR}/examples" COMPONENT dev)
 
 if(QVCT_BUILD_TOOL)
   install(TARGETS qvtag)
@@ -66,18 +76,28 @@ if(QVCT_BUILD_TOOL)
     DESTINATION "${CMAKE_INSTALL_DATADIR}/fish/vendor_completions.d")
 endif()
 
+# Three Debian packages: what runs, what hosts are built with, and the debug symbols of what runs.
 set(CPACK_GENERATOR DEB)
 set(CPACK_PACKAGE_NAME qvcontenttagging)
 set(CPACK_PACKAGE_VENDOR "QVContentTagging")
 set(CPACK_PACKAGE_CONTACT "QVContentTagging <maintainers@qvcontenttagging.invalid>")
 set(CPACK_PACKAGING_INSTALL_PREFIX /usr)
-set(CPACK_STRIP_FILES ON)
+set(CPACK_COMPONENTS_ALL runtime dev)
+set(CPACK_DEB_COMPONENT_INSTALL ON)
 set(CPACK_DEBIAN_FILE_NAME DEB-DEFAULT)
-set(CPACK_DEBIAN_PACKAGE_SECTION sound)
-# The tool and the libraries name what they load; dpkg-shlibdeps turns that into packages.
+set(CPACK_DEBIAN_RUNTIME_PACKAGE_NAME qvcontenttagging)
+set(CPACK_DEBIAN_RUNTIME_PACKAGE_SECTION sound)
+set(CPACK_DEBIAN_RUNTIME_DEBUGINFO_PACKAGE ON)
+set(CPACK_DEBIAN_DEV_PACKAGE_NAME qvcontenttagging-dev)
+set(CPACK_DEBIAN_DEV_PACKAGE_SECTION libdevel)
+set(CPACK_COMPONENT_DEV_DEPENDS runtime)
+set(CPACK_DEBIAN_ENABLE_COMPONENT_DEPENDS ON)
+# The tool and the libraries name what they load, and dpkg-shlibdeps turns that into packages; but for the script
+# engine, which is loaded by its name.
 set(CPACK_DEBIAN_PACKAGE_SHLIBDEPS ON)
 set(CPACK_DEBIAN_PACKAGE_SHLIBDEPS_PRIVATE_DIRS "${PROJECT_BINARY_DIR}/src" "${PROJECT_BINARY_DIR}/contentdb")
+string(REPLACE ".so." "-" CPACK_DEBIAN_RUNTIME_PACKAGE_DEPENDS "${QVCT_SCRIPT_ENGINE_LIBRARY}")
 set(CPACK_DEBIAN_PACKAGE_GENERATE_SHLIBS ON)
-set(CPACK_DEBIAN_PACKAGE_CONTROL_EXTRA "${PROJECT_BINARY_DIR}/triggers")
+set(CPACK_DEBIAN_RUNTIME_PACKAGE_CONTROL_EXTRA "${PROJECT_BINARY_DIR}/triggers")
 file(WRITE "${PROJECT_BINARY_DIR}/triggers" "activate-noawait ldconfig\n")
 include(CPack)

@@ -30,6 +30,7 @@ std::optional<PropertyList::Array> QVCTJavaScriptUtilities::tagsForXMLDocument(
     const std::shared_ptr<QVCTXMLDocument>& document, std::string_view javaScript) {
     if (!document) return PropertyList::Array{};
     const std::shared_ptr<ScriptContext> context = ScriptContext::make(limits());
+    if (!context) return std::nullopt;
     includeJSResourceWithName("QVSearchKit", *context);
     document->setContext(context);
     context->exposeDocument(*document);

@@ -15,15 +15,6 @@
 
 #include <fmt/format.h>
 
-// Exported by the engine, but not declared in its headers.
-extern "C" {
-using JSShouldTerminateCallback = bool (*)(JSContextRef, void*);
-void JSContextGroupSetExecutionTimeLimit(JSContextGroupRef, double seconds, JSShouldTerminateCallback, void*);
-void JSContextGroupClearExecutionTimeLimit(JSContextGroupRef);
-void JSGlobalContextSetEvalEnabled(JSGlobalContextRef, bool isEnabled, JSStringRef message);
-JSObjectRef JSGetMemoryUsageStatistics(JSContextRef);
-}
-
 namespace qvct {
 namespace {
 
@@ -39,10 +30,10 @@ constexpr std::size_t kHardMemory = std::size_t{64} << 20;
 /// The virtual machine of a thread, which its contexts share.
 class ContextGroup {
   public:
-    ContextGroup() : group_(JSContextGroupCreate()) {}
+    ContextGroup() : group_(engine().JSContextGroupCreate()) {}
     ContextGroup(const ContextGroup&) = delete;
     ContextGroup& operator=(const ContextGroup&) = delete;
-    ~ContextGroup() { JSContextGroupRelease(group_); }
+    ~ContextGroup() { engine().JSContextGroupRelease(group_); }
     JSContextGroupRef reference() const { return group_; }
 
   private:
@@ -61,24 +52,27 @@ std::shared_ptr<ContextGroup> sharedGroup() {
 }
 
 std::u16string_view viewOf(JSStringRef string) {
-    return {reinterpret_cast<const char16_t*>(JSStringGetCharactersPtr(string)), JSStringGetLength(string)};
+    return {reinterpret_cast<const char16_t*>(engine().JSStringGetCharactersPtr(string)),
+            engine().JSStringGetLength(string)};
 }
 
 std::string argument(JSContextRef context, std::size_t count, const JSValueRef values[], std::size_t index,
                      JSValueRef* exception) {
-    return textOf(context, index < count ? values[index] : JSValueMakeUndefined(context), exception);
+    return textOf(context, index < count ? values[index] : engine().JSValueMakeUndefined(context), exception);
 }
 
 JSValueRef valueOf(JSContextRef context, const std::optional<std::string>& text) {
-    return text ? JSValueMakeString(context, scriptString(*text).get()) : JSValueMakeNull(context);
+    return text ? engine().JSValueMakeString(context, scriptString(*text).get())
+                : engine().JSValueMakeNull(context);
 }
 
 void setProperty(JSContextRef context, JSObjectRef object, std::string_view name, JSValueRef value) {
-    JSObjectSetProperty(context, object, scriptString(name).get(), value, kJSPropertyAttributeNone, nullptr);
+    engine().JSObjectSetProperty(context, object, scriptString(name).get(), value, kJSPropertyAttributeNone,
+                                 nullptr);
 }
 
 JSValueRef property(JSContextRef context, JSObjectRef object, std::string_view name, JSValueRef* exception) {
-    return JSObjectGetProperty(context, object, scriptString(name).get(), exception);
+    return engine().JSObjectGetProperty(context, object, scriptString(name).get(), exception);
 }
 
 /// Writes the first letter of a word as an escape, wherever the word stands: in texts, expressions and names
@@ -131,21 +125,21 @@ struct ScriptContext::Implementation {
     int messages = 0;
     const QVCTXMLDocument* document = nullptr;
     std::shared_ptr<ContextGroup> group = sharedGroup();
-    JSGlobalContextRef context = JSGlobalContextCreateInGroup(group->reference(), nullptr);
+    JSGlobalContextRef context = engine().JSGlobalContextCreateInGroup(group->reference(), nullptr);
     bool isGuarded = false;
     std::optional<HardLimit> hardLimit;  ///< For foreign scripts, until the context has gone.
 
     explicit Implementation(const ScriptLimits& chosen) : limits(chosen) {
         outer = std::exchange(current, this);
-        JSContextGroupSetExecutionTimeLimit(group->reference(), kSlice, shouldTerminate, this);
+        engine().JSContextGroupSetExecutionTimeLimit(group->reference(), kSlice, shouldTerminate, this);
     }
     Implementation(const Implementation&) = delete;
     Implementation& operator=(const Implementation&) = delete;
 
     ~Implementation() {
-        JSContextGroupClearExecutionTimeLimit(group->reference());
+        engine().JSContextGroupClearExecutionTimeLimit(group->reference());
         current = outer;
-        JSGlobalContextRelease(context);
+        engine().JSGlobalContextRelease(context);
         // A machine that was stopped may hold much memory: the thread's next context begins with a new one.
         if (stop != Stop::none && groupOfThisThread() == group) groupOfThisThread().reset();
     }
@@ -154,7 +148,7 @@ struct ScriptContext::Implementation {
     /// the variables of a global object with private data slowly.
     static Implementation& running() { return *current; }
 
-    JSObjectRef global() const { return JSContextGetGlobalObject(context); }
+    JSObjectRef global() const { return engine().JSContextGetGlobalObject(context); }
 
     void logException(JSValueRef thrown, std::string_view script = {}) {
         if (stop == Stop::none && thrown != nullptr)
@@ -198,13 +192,15 @@ struct ScriptContext::Implementation {
         } else if (memoryInUse(context) > static_cast<double>(implementation.limits.memory)) {
             implementation.stop = Stop::memory;
         }
-        JSContextGroupSetExecutionTimeLimit(implementation.group->reference(), kSlice, shouldTerminate, self);
+        engine().JSContextGroupSetExecutionTimeLimit(implementation.group->reference(), kSlice,
+                                                     shouldTerminate, self);
         return implementation.stop != Stop::none;
     }
 
     static double memoryInUse(JSContextRef context) {
-        const JSObjectRef statistics = JSGetMemoryUsageStatistics(context);
-        return JSValueToNumber(context, property(context, statistics, "heapCapacity", nullptr), nullptr);
+        const JSObjectRef statistics = engine().JSGetMemoryUsageStatistics(context);
+        return engine().JSValueToNumber(context, property(context, statistics, "heapCapacity", nullptr),
+                                        nullptr);
     }
 
     void defineLog();
@@ -236,18 +232,18 @@ JSClassRef ScriptContext::Implementation::documentClass() {
                                                      {"JSONStringForXPath", jsonStringForXPath, fixed},
                                                      {"JSONString", jsonString, fixed},
                                                      {nullptr, nullptr, 0}};
-        JSClassDefinition definition = kJSClassDefinitionEmpty;
+        JSClassDefinition definition{};
         definition.className = "QVCTXMLDocument";
         definition.staticFunctions = functions;
-        return JSClassCreate(&definition);
+        return engine().JSClassCreate(&definition);
     }();
     return made;
 }
 
 /// `console` is an object of our own, since the engine's takes longer to make than most scripts run.
 void ScriptContext::Implementation::defineLog() {
-    const JSObjectRef logFunction = JSObjectMakeFunctionWithCallback(context, nullptr, logMessage);
-    const JSObjectRef console = JSObjectMake(context, nullptr, nullptr);
+    const JSObjectRef logFunction = engine().JSObjectMakeFunctionWithCallback(context, nullptr, logMessage);
+    const JSObjectRef console = engine().JSObjectMake(context, nullptr, nullptr);
     for (const char* name : {"log", "info", "warn", "error", "debug"}) {
         setProperty(context, console, name, logFunction);
     }
@@ -261,12 +257,14 @@ void ScriptContext::Implementation::guard() {
     hardLimit.emplace(limits.time + kHardTime, limits.memory + kHardMemory,
                       LogScope::prefix() + "JavaScript");
     thread_local const ScriptString program = scriptString(scriptGuard());
-    JSGlobalContextSetEvalEnabled(context, false, scriptString("not available to rules").get());
-    const JSValueRef function = JSEvaluateScript(context, program.get(), nullptr, nullptr, 1, nullptr);
-    const JSValueRef check = JSObjectMakeFunctionWithCallback(context, nullptr, checkExpression);
+    engine().JSGlobalContextSetEvalEnabled(context, false, scriptString("not available to rules").get());
+    const JSValueRef function =
+        engine().JSEvaluateScript(context, program.get(), nullptr, nullptr, 1, nullptr);
+    const JSValueRef check = engine().JSObjectMakeFunctionWithCallback(context, nullptr, checkExpression);
     JSValueRef exception = nullptr;
-    const JSObjectRef callee = function != nullptr ? JSValueToObject(context, function, nullptr) : nullptr;
-    if (callee != nullptr) JSObjectCallAsFunction(context, callee, nullptr, 1, &check, &exception);
+    const JSObjectRef callee =
+        function != nullptr ? engine().JSValueToObject(context, function, nullptr) : nullptr;
+    if (callee != nullptr) engine().JSObjectCallAsFunction(context, callee, nullptr, 1, &check, &exception);
     if (callee != nullptr && exception == nullptr) return;
     logProblem("the guard of scripts does not run");
     stop = Stop::unguarded;
@@ -282,33 +280,33 @@ JSValueRef ScriptContext::Implementation::logMessage(JSContextRef context, JSObj
     } else if (number == kMostScriptMessages + 1) {
         log("JavaScript: (further messages of this script are dropped)");
     }
-    return JSValueMakeUndefined(context);
+    return engine().JSValueMakeUndefined(context);
 }
 
 JSValueRef ScriptContext::Implementation::checkExpression(JSContextRef context, JSObjectRef /*function*/,
                                                           JSObjectRef /*self*/, size_t count,
                                                           const JSValueRef values[], JSValueRef* exception) {
-    if (count < 4) return JSValueMakeUndefined(context);
-    const ScriptString pattern(JSValueToStringCopy(context, values[0], exception));
-    const ScriptString flags(JSValueToStringCopy(context, values[1], exception));
-    const ScriptString text(JSValueToStringCopy(context, values[2], exception));
-    const double last = JSValueToNumber(context, values[3], exception);
-    if (!pattern || !flags || !text) return JSValueMakeUndefined(context);
+    if (count < 4) return engine().JSValueMakeUndefined(context);
+    const ScriptString pattern(engine().JSValueToStringCopy(context, values[0], exception));
+    const ScriptString flags(engine().JSValueToStringCopy(context, values[1], exception));
+    const ScriptString text(engine().JSValueToStringCopy(context, values[2], exception));
+    const double last = engine().JSValueToNumber(context, values[3], exception);
+    if (!pattern || !flags || !text) return engine().JSValueMakeUndefined(context);
     const std::size_t start = last > 0 && last < 1e9 ? static_cast<std::size_t>(last) : 0;
     if (!isRegularExpressionBounded(viewOf(pattern.get()), viewOf(flags.get()), viewOf(text.get()), start,
                                     running().deadline)) {
         const std::string reason =
             fmt::format("regular expression takes too long: /{}/", textOf(pattern.get()));
-        *exception = JSValueMakeString(context, scriptString(reason).get());
+        *exception = engine().JSValueMakeString(context, scriptString(reason).get());
     }
-    return JSValueMakeUndefined(context);
+    return engine().JSValueMakeUndefined(context);
 }
 
 JSValueRef ScriptContext::Implementation::isMatchingXPath(JSContextRef context, JSObjectRef /*function*/,
                                                           JSObjectRef /*self*/, size_t count,
                                                           const JSValueRef values[], JSValueRef* exception) {
     const std::string expression = argument(context, count, values, 0, exception);
-    return JSValueMakeBoolean(context, running().document->isMatchingXPath(expression));
+    return engine().JSValueMakeBoolean(context, running().document->isMatchingXPath(expression));
 }
 
 JSValueRef ScriptContext::Implementation::jsonStringForXPath(JSContextRef context, JSObjectRef /*function*/,
@@ -330,7 +328,8 @@ ScriptContext::ScriptContext(std::unique_ptr<Implementation> implementation)
     : implementation_(std::move(implementation)) {}
 ScriptContext::~ScriptContext() = default;
 
-std::shared_ptr<ScriptContext> ScriptContext::make(const ScriptLimits& limits) {
+std::shared_ptr<ScriptContext> ScriptContext::make(const ScriptLimits& limits, Error* error) {
+    if (!ScriptEngine::load(error)) return nullptr;
     auto implementation = std::make_unique<Implementation>(limits);
     implementation->defineLog();
     return std::shared_ptr<ScriptContext>(new ScriptContext(std::move(implementation)));
@@ -340,7 +339,7 @@ void ScriptContext::exposeDocument(const QVCTXMLDocument& document) {
     Implementation& self = *implementation_;
     self.document = &document;
     setProperty(self.context, self.global(), "document",
-                JSObjectMake(self.context, Implementation::documentClass(), nullptr));
+                engine().JSObjectMake(self.context, Implementation::documentClass(), nullptr));
 }
 
 bool ScriptContext::evaluate(std::string_view script) {
@@ -350,7 +349,7 @@ bool ScriptContext::evaluate(std::string_view script) {
     const bool ran = self.run([&] {
         if (!program.isOwn) self.guard();
         if (self.stop != Implementation::Stop::none) return;
-        JSEvaluateScript(self.context, program.text.get(), nullptr, nullptr, 1, &exception);
+        engine().JSEvaluateScript(self.context, program.text.get(), nullptr, nullptr, 1, &exception);
         if (exception != nullptr) self.logException(exception, script);
     });
     return ran && exception == nullptr;
@@ -362,16 +361,18 @@ std::optional<PropertyList::Array> ScriptContext::callForArray(std::string_view 
     self.run([&] {
         JSValueRef exception = nullptr;
         const JSValueRef callee = property(self.context, self.global(), function, &exception);
-        if (exception == nullptr && (!JSValueIsObject(self.context, callee) ||
-                                     !JSObjectIsFunction(self.context, const_cast<JSObjectRef>(callee)))) {
+        if (exception == nullptr &&
+            (!engine().JSValueIsObject(self.context, callee) ||
+             !engine().JSObjectIsFunction(self.context, const_cast<JSObjectRef>(callee)))) {
             return Implementation::logProblem(fmt::format("TypeError: {} is not a function", function));
         }
-        const JSValueRef value = exception != nullptr
-                                     ? nullptr
-                                     : JSObjectCallAsFunction(self.context, const_cast<JSObjectRef>(callee),
-                                                              nullptr, 0, nullptr, &exception);
+        const JSValueRef value = exception != nullptr ? nullptr
+                                                      : engine().JSObjectCallAsFunction(
+                                                            self.context, const_cast<JSObjectRef>(callee),
+                                                            nullptr, 0, nullptr, &exception);
         if (value == nullptr || exception != nullptr) return self.logException(exception);
-        if (JSValueIsUndefined(self.context, value) || JSValueIsNull(self.context, value)) return;
+        if (engine().JSValueIsUndefined(self.context, value) || engine().JSValueIsNull(self.context, value))
+            return;
         std::string problem;
         result = arrayOf(self.context, value, problem);
         if (!result && self.stop == Implementation::Stop::none) Implementation::logProblem(problem);
@@ -384,12 +385,14 @@ bool ScriptContext::isStopped() const {
 }
 
 bool ScriptContext::checkSyntax(std::string_view script, Error* error) {
-    const auto context = make({});
+    const auto context = make({}, error);
+    if (!context) return false;
     const JSGlobalContextRef reference = context->implementation_->context;
     JSValueRef exception = nullptr;
-    if (JSCheckScriptSyntax(reference, prepared(script).text.get(), nullptr, 1, &exception)) return true;
+    if (engine().JSCheckScriptSyntax(reference, prepared(script).text.get(), nullptr, 1, &exception))
+        return true;
     const JSValueRef line =
-        property(reference, JSValueToObject(reference, exception, nullptr), "line", nullptr);
+        property(reference, engine().JSValueToObject(reference, exception, nullptr), "line", nullptr);
     return fail(error, kErrorMalformed,
                 fmt::format("script, line {}: {}", textOf(reference, line, nullptr),
                             withReason(textOf(reference, exception, nullptr), script)));

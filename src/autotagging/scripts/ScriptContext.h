@@ -36,8 +36,9 @@ inline constexpr int kMostScriptMessages = 100;
 /// @cost  About a tenth of a millisecond for making one.
 class ScriptContext {
   public:
-    /// With `console.log` and `__log` ("JavaScript: ..." in the log). The limits count from here.
-    static std::shared_ptr<ScriptContext> make(const ScriptLimits& limits);
+    /// With `console.log` and `__log` ("JavaScript: ..." in the log). The limits count from here. Null, and
+    /// an error, where there is no script engine.
+    static std::shared_ptr<ScriptContext> make(const ScriptLimits& limits, Error* error = nullptr);
     ScriptContext(const ScriptContext&) = delete;
     ScriptContext& operator=(const ScriptContext&) = delete;
     ~ScriptContext();

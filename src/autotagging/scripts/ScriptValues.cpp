@@ -20,11 +20,12 @@ class Converter {
     Converter(JSContextRef context, std::string& problem) : context_(context), problem_(problem) {}
 
     std::optional<PropertyList::Array> array(JSObjectRef object, int depth) {
-        const double length = JSValueToNumber(context_, property(object, lengthName_.get()), &exception_);
+        const double length =
+            engine().JSValueToNumber(context_, property(object, lengthName_.get()), &exception_);
         if (failed() || !enters(depth) || !takes(length)) return std::nullopt;
         PropertyList::Array elements;
         for (unsigned i = 0; i < static_cast<unsigned>(length); ++i) {
-            const JSValueRef element = JSObjectGetPropertyAtIndex(context_, object, i, &exception_);
+            const JSValueRef element = engine().JSObjectGetPropertyAtIndex(context_, object, i, &exception_);
             std::optional<PropertyList> converted = failed() ? std::nullopt : value(element, depth + 1);
             if (hasFailed_) return std::nullopt;
             if (converted) elements.push_back(std::move(*converted));
@@ -35,11 +36,11 @@ class Converter {
   private:
     /// Nothing for what a property list has no form for, or after a failure.
     std::optional<PropertyList> value(JSValueRef value, int depth) {
-        switch (JSValueGetType(context_, value)) {
+        switch (engine().JSValueGetType(context_, value)) {
             case kJSTypeBoolean:
-                return PropertyList(JSValueToBoolean(context_, value));
+                return PropertyList(engine().JSValueToBoolean(context_, value));
             case kJSTypeNumber:
-                return PropertyList(JSValueToNumber(context_, value, nullptr));
+                return PropertyList(engine().JSValueToNumber(context_, value, nullptr));
             case kJSTypeString:
                 return text(value);
             case kJSTypeObject:
@@ -50,21 +51,22 @@ class Converter {
     }
 
     std::optional<PropertyList> text(JSValueRef value) {
-        const ScriptString string(JSValueToStringCopy(context_, value, &exception_));
+        const ScriptString string(engine().JSValueToStringCopy(context_, value, &exception_));
         if (failed() || !string) return std::nullopt;
-        return takesText(JSStringGetLength(string.get())) ? std::optional(PropertyList(textOf(string.get())))
-                                                          : std::nullopt;
+        return takesText(engine().JSStringGetLength(string.get()))
+                   ? std::optional(PropertyList(textOf(string.get())))
+                   : std::nullopt;
     }
 
     std::optional<PropertyList> object(JSValueRef value, int depth) {
-        const JSObjectRef object = JSValueToObject(context_, value, &exception_);
+        const JSObjectRef object = engine().JSValueToObject(context_, value, &exception_);
         if (failed()) return std::nullopt;
-        if (JSValueIsDate(context_, value)) {
-            const double milliseconds = JSValueToNumber(context_, value, &exception_);
+        if (engine().JSValueIsDate(context_, value)) {
+            const double milliseconds = engine().JSValueToNumber(context_, value, &exception_);
             if (failed()) return std::nullopt;
             return PropertyList(PropertyList::Date{milliseconds / 1000 - kReferenceDate});
         }
-        if (JSValueIsArray(context_, value)) {
+        if (engine().JSValueIsArray(context_, value)) {
             auto elements = array(object, depth);
             return elements ? std::optional(PropertyList(std::move(*elements))) : std::nullopt;
         }
@@ -75,14 +77,14 @@ class Converter {
     std::optional<PropertyList::Dictionary> dictionary(JSObjectRef object, int depth) {
         const std::unique_ptr<std::remove_pointer_t<JSPropertyNameArrayRef>,
                               decltype(&JSPropertyNameArrayRelease)>
-            names(JSObjectCopyPropertyNames(context_, object), JSPropertyNameArrayRelease);
-        const std::size_t count = JSPropertyNameArrayGetCount(names.get());
+            names(engine().JSObjectCopyPropertyNames(context_, object), engine().JSPropertyNameArrayRelease);
+        const std::size_t count = engine().JSPropertyNameArrayGetCount(names.get());
         if (!enters(depth) || !takes(static_cast<double>(count))) return std::nullopt;
         PropertyList::Dictionary members;
         for (std::size_t i = 0; i < count; ++i) {
-            const JSStringRef name = JSPropertyNameArrayGetNameAtIndex(names.get(), i);
+            const JSStringRef name = engine().JSPropertyNameArrayGetNameAtIndex(names.get(), i);
             const JSValueRef member = property(object, name);
-            if (failed() || !takesText(JSStringGetLength(name))) return std::nullopt;
+            if (failed() || !takesText(engine().JSStringGetLength(name))) return std::nullopt;
             std::optional<PropertyList> converted = value(member, depth + 1);
             if (hasFailed_) return std::nullopt;
             if (converted) members.set(textOf(name), std::move(*converted));
@@ -91,7 +93,7 @@ class Converter {
     }
 
     JSValueRef property(JSObjectRef object, JSStringRef name) {
-        return JSObjectGetProperty(context_, object, name, &exception_);
+        return engine().JSObjectGetProperty(context_, object, name, &exception_);
     }
 
     bool fail(std::string problem) {
@@ -154,30 +156,30 @@ std::string_view nameOf(JSType type) {
 ScriptString scriptString(std::string_view text) {
     const auto isPlain = [](char c) { return c > 0; };
     if (std::all_of(text.begin(), text.end(), isPlain)) {  // the engine works faster on narrow strings
-        return ScriptString(JSStringCreateWithUTF8CString(std::string(text).c_str()));
+        return ScriptString(engine().JSStringCreateWithUTF8CString(std::string(text).c_str()));
     }
     const std::u16string wide = utf16FromUtf8(text);
     return ScriptString(
-        JSStringCreateWithCharacters(reinterpret_cast<const JSChar*>(wide.data()), wide.size()));
+        engine().JSStringCreateWithCharacters(reinterpret_cast<const JSChar*>(wide.data()), wide.size()));
 }
 
 std::string textOf(JSStringRef string) {
-    return utf8FromUtf16(
-        {reinterpret_cast<const char16_t*>(JSStringGetCharactersPtr(string)), JSStringGetLength(string)});
+    return utf8FromUtf16({reinterpret_cast<const char16_t*>(engine().JSStringGetCharactersPtr(string)),
+                          engine().JSStringGetLength(string)});
 }
 
 std::string textOf(JSContextRef context, JSValueRef value, JSValueRef* exception) {
-    const ScriptString string(JSValueToStringCopy(context, value, exception));
+    const ScriptString string(engine().JSValueToStringCopy(context, value, exception));
     return string ? textOf(string.get()) : std::string{};
 }
 
 std::optional<PropertyList::Array> arrayOf(JSContextRef context, JSValueRef value, std::string& problem) {
-    if (!JSValueIsArray(context, value)) {
-        problem =
-            fmt::format("TypeError: not an array of tags but {}", nameOf(JSValueGetType(context, value)));
+    if (!engine().JSValueIsArray(context, value)) {
+        problem = fmt::format("TypeError: not an array of tags but {}",
+                              nameOf(engine().JSValueGetType(context, value)));
         return std::nullopt;
     }
-    return Converter(context, problem).array(JSValueToObject(context, value, nullptr), 0);
+    return Converter(context, problem).array(engine().JSValueToObject(context, value, nullptr), 0);
 }
 
 }  // namespace qvct

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "autotagging/scripts/ScriptEngine.h"
 #include "platform/data/PropertyList.h"
 
 #include <memory>
@@ -8,13 +9,11 @@
 #include <string_view>
 #include <type_traits>
 
-#include <JavaScriptCore/JavaScript.h>
-
 /// Passing values between scripts and us. Includes the engine's header: for the .cpp files of scripts only.
 namespace qvct {
 
 struct ScriptStringReleaser {
-    void operator()(JSStringRef string) const { JSStringRelease(string); }
+    void operator()(JSStringRef string) const { engine().JSStringRelease(string); }
 };
 using ScriptString = std::unique_ptr<std::remove_pointer_t<JSStringRef>, ScriptStringReleaser>;
 

@@ -1,0 +1,22 @@
+#include "platform/base/SharedLibrary.h"
+
+#include <dlfcn.h>
+#include <fmt/format.h>
+
+namespace qvct {
+
+std::optional<SharedLibrary> SharedLibrary::load(const std::string& name, Error* error) {
+    // Its names stay its own: a host may have loaded another version.
+    if (void* handle = ::dlopen(name.c_str(), RTLD_LAZY | RTLD_LOCAL)) return SharedLibrary(name, handle);
+    const char* reason = ::dlerror();
+    fail(error, kErrorUnreadable, reason == nullptr ? name + ": cannot be loaded" : reason);
+    return std::nullopt;
+}
+
+void* SharedLibrary::address(const char* name, Error* error) const {
+    void* found = ::dlsym(handle_, name);
+    if (found == nullptr) fail(error, kErrorUnreadable, fmt::format("{}: has no function {}", name_, name));
+    return found;
+}
+
+}  // namespace qvct
