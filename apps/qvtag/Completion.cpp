@@ -110,19 +110,23 @@ std::string fishLines(const CommandDescription& command, const CommandDescriptio
     return text;
 }
 
+/// Finds the command among the words before the one that is typed, and does what the branch of it says.
+template <typename Branch>
+std::string wordsOfCommand(std::string_view words, const CommandDescription& tool, Branch branch) {
+    return fmt::format(
+        "  for word in {}; do\n    case \"$command $word\" in {}) command=\"$command $word\" ;; esac\n"
+        "  done\n  case \"$command\" in\n{}  esac\n",
+        words, patternOfCommands(tool),
+        branches(tool, [&](const auto& command) { return branch(command, tool); }));
+}
+
 }  // namespace
 
 std::string bashCompletion(const CommandDescription& tool) {
     return R"(_qvtag() {
   local command=qvtag word commands options files values takesfiles current=${COMP_WORDS[COMP_CWORD]}
-  for word in "${COMP_WORDS[@]:1:COMP_CWORD-1}"; do
-    case "$command $word" in )" +
-           patternOfCommands(tool) + R"() command="$command $word" ;; esac
-  done
-  case "$command" in
-)" + branches(tool, [&](const auto& command) { return bashBranch(command, tool); }) +
-           R"(  esac
-  local before=" ${COMP_WORDS[COMP_CWORD-1]} "
+)" + wordsOfCommand(R"("${COMP_WORDS[@]:1:COMP_CWORD-1}")", tool, bashBranch) +
+           R"(  local before=" ${COMP_WORDS[COMP_CWORD-1]} "
   if [[ " $files " == *"$before"* ]]; then compopt -o filenames; mapfile -t COMPREPLY < <(compgen -f -- "$current")
   elif [[ " $values " == *"$before"* ]]; then COMPREPLY=()
   elif [[ $current == -* ]]; then mapfile -t COMPREPLY < <(compgen -W "$options" -- "$current")
@@ -140,14 +144,8 @@ std::string zshCompletion(const CommandDescription& tool) {
 _qvtag() {
   local command=qvtag word takesfiles
   local -a commands options
-  for word in "${(@)words[2,CURRENT-1]}"; do
-    case "$command $word" in )" +
-           patternOfCommands(tool) + R"() command="$command $word" ;; esac
-  done
-  case "$command" in
-)" + branches(tool, [&](const auto& command) { return zshBranch(command, tool); }) +
-           R"(  esac
-  if [[ $PREFIX == -* ]]; then _describe option options
+)" + wordsOfCommand(R"("${(@)words[2,CURRENT-1]}")", tool, zshBranch) +
+           R"(  if [[ $PREFIX == -* ]]; then _describe option options
   else
     (( $#commands )) && _describe command commands
     [[ -n $takesfiles ]] && _files

@@ -1,7 +1,9 @@
 #include "autotagging/scripts/RegularExpressionGuard.h"
 
 #include <algorithm>
+#include <array>
 #include <memory>
+#include <utility>
 
 #include <unicode/uregex.h>
 
@@ -111,33 +113,22 @@ class Translation {
     void escape() {
         if (rest_.empty()) return;
         const char16_t c = take();
-        switch (c) {
-            case u'd':
-                out_ += u"[0-9]";
-                break;
-            case u'D':
-                out_ += u"[^0-9]";
-                break;
-            case u'w':
-                out_ += u"[A-Za-z0-9_]";
-                break;
-            case u'W':
-                out_ += u"[^A-Za-z0-9_]";
-                break;
-            case u'v':
-                out_ += u"\\x0B";
-                break;
-            case u'0':
-                out_ += u"\\x00";
-                break;
-            case u'b':
-                out_ += isInClass_ ? u"\\x08" : u"\\b";
-                break;
-            case u'u':
-                out_ += take(u"{") ? u"\\x{" : u"\\u";
-                break;
-            default:
-                out_ += {u'\\', c};
+        constexpr std::array<std::pair<char16_t, std::u16string_view>, 6> fixed = {{{u'd', u"[0-9]"},
+                                                                                    {u'D', u"[^0-9]"},
+                                                                                    {u'w', u"[A-Za-z0-9_]"},
+                                                                                    {u'W', u"[^A-Za-z0-9_]"},
+                                                                                    {u'v', u"\\x0B"},
+                                                                                    {u'0', u"\\x00"}}};
+        const auto* known =
+            std::find_if(fixed.begin(), fixed.end(), [c](const auto& entry) { return entry.first == c; });
+        if (known != fixed.end()) {
+            out_ += known->second;
+        } else if (c == u'b') {
+            out_ += isInClass_ ? u"\\x08" : u"\\b";
+        } else if (c == u'u') {
+            out_ += take(u"{") ? u"\\x{" : u"\\u";
+        } else {
+            out_ += {u'\\', c};
         }
     }
 

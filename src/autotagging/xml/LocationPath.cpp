@@ -21,7 +21,7 @@ using Relation = LocationPath::Relation;
 constexpr std::size_t kMostPredicates = 8;
 
 bool isNamed(const xmlChar* name, const xmlNs* nameSpace, const std::string& wanted) {
-    return nameSpace == nullptr && std::strcmp(reinterpret_cast<const char*>(name), wanted.c_str()) == 0;
+    return nameSpace == nullptr && viewOf(name) == wanted;
 }
 
 const xmlAttr* attributeNamed(const xmlNode& element, const std::string& name) {
@@ -67,8 +67,7 @@ bool holdsText(Relation relation, const char* value, const std::string& constant
 
 bool holdsFor(const Comparison& comparison, const char* value) {
     if (const double* number = std::get_if<double>(&comparison.constant)) {
-        return holdsNumber(comparison.relation,
-                           xmlXPathCastStringToNumber(reinterpret_cast<const xmlChar*>(value)), *number);
+        return holdsNumber(comparison.relation, xmlXPathCastStringToNumber(xmlText(value)), *number);
     }
     return holdsText(comparison.relation, value, std::get<std::string>(comparison.constant));
 }
@@ -87,8 +86,7 @@ bool holds(const Comparison& comparison, const xmlNode& element) {
     if (text->type == XML_TEXT_NODE && text->next == nullptr && text->content != nullptr) {
         return holdsFor(comparison, reinterpret_cast<const char*>(text->content));
     }
-    const std::unique_ptr<xmlChar, decltype(xmlFree)> content(
-        xmlNodeGetContent(reinterpret_cast<const xmlNode*>(attribute)), xmlFree);
+    const XmlOwned<xmlChar> content(xmlNodeGetContent(reinterpret_cast<const xmlNode*>(attribute)));
     return holdsFor(comparison, content ? reinterpret_cast<const char*>(content.get()) : "");
 }
 

@@ -1,14 +1,13 @@
 #pragma once
 
+#include "platform/data/XmlLibrary.h"
+
 #include <cstdint>
 #include <optional>
 #include <string>
 #include <string_view>
 #include <variant>
 #include <vector>
-
-struct _xmlDoc;   // NOLINT(bugprone-reserved-identifier): libxml2's name
-struct _xmlNode;  // NOLINT(bugprone-reserved-identifier): libxml2's name
 
 namespace qvct {
 

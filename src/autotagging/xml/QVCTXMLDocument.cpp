@@ -42,7 +42,7 @@ std::string_view textOf(const std::vector<std::uint8_t>& bytes) {
 }  // namespace
 
 struct QVCTXMLDocument::Implementation {
-    XmlTree document;
+    XmlOwned<xmlDoc> document;
     std::size_t textSize = 0;
     bool isPlain = false;
     mutable std::optional<XPathScope> scope;  // after the document, on which it depends
@@ -161,7 +161,7 @@ std::string QVCTXMLDocument::XMLData() const {
     xmlChar* raw = nullptr;
     int size = 0;
     xmlDocDumpFormatMemory(implementation_->document.get(), &raw, &size, 0);
-    const std::unique_ptr<xmlChar, decltype(xmlFree)> text(raw, xmlFree);
+    const XmlOwned<xmlChar> text(raw);
     return size > 0 ? std::string(reinterpret_cast<const char*>(raw), static_cast<std::size_t>(size))
                     : std::string{};
 }

@@ -20,10 +20,6 @@ constexpr std::size_t kIndexedMembers = 16;
 /// An ordinary element's.
 constexpr std::size_t kUsualMembers = 4;
 
-std::string_view viewOf(const xmlChar* text) {
-    return text == nullptr ? std::string_view{} : reinterpret_cast<const char*>(text);
-}
-
 QVCTXMLParser& parserOf(void* context) {
     return *static_cast<QVCTXMLParser*>(static_cast<xmlParserCtxt*>(context)->_private);
 }
@@ -113,14 +109,6 @@ QVCTXMLParser::Attributes attributesOf(const xmlNode& element) {
     return attributes;
 }
 
-struct ContextCloser {
-    void operator()(xmlParserCtxt* context) const {
-        xmlFreeDoc(context->myDoc);  // holds the declared entities only
-        context->myDoc = nullptr;
-        xmlFreeParserCtxt(context);
-    }
-};
-
 Error errorOf(const xmlParserCtxt& context) {
     const xmlError& last = context.lastError;
     const std::string_view reason = last.message == nullptr ? "not well-formed" : last.message;
@@ -183,7 +171,7 @@ std::optional<PropertyList::Dictionary> QVCTXMLParser::objectWithData(std::strin
         parseErrorOccurred(std::move(error));
         return std::nullopt;
     }
-    const std::unique_ptr<xmlParserCtxt, ContextCloser> context(
+    const XmlOwned<xmlParserCtxt> context(
         xmlCreateMemoryParserCtxt(data.data(), static_cast<int>(data.size())));
     if (!context) return std::nullopt;
     xmlCtxtUseOptions(context.get(), XML_PARSE_NONET | XML_PARSE_NOENT | XML_PARSE_SAX1);

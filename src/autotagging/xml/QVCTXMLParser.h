@@ -2,6 +2,7 @@
 
 #include "platform/base/Error.h"
 #include "platform/data/PropertyList.h"
+#include "platform/data/XmlLibrary.h"
 
 #include <optional>
 #include <string>
@@ -9,8 +10,6 @@
 #include <unordered_map>
 #include <utility>
 #include <vector>
-
-struct _xmlNode;  // NOLINT(bugprone-reserved-identifier): libxml2's name
 
 namespace qvct {
 

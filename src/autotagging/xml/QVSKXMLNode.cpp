@@ -1,12 +1,14 @@
 #include "autotagging/xml/QVSKXMLNode.h"
 
+#include "platform/data/XmlLibrary.h"
+
 #include <libxml/tree.h>
 
 namespace qvct {
 
 std::shared_ptr<QVSKXMLNode> QVSKXMLNode::initWithXMLNode(_xmlNode* node) {
     if (node == nullptr) return nullptr;
-    const std::unique_ptr<xmlBuffer, decltype(&xmlBufferFree)> buffer(xmlBufferCreate(), xmlBufferFree);
+    const XmlOwned<xmlBuffer> buffer(xmlBufferCreate());
     if (!buffer) return nullptr;
     std::string text;
     if (xmlNodeDump(buffer.get(), node->doc, node, 0, 0) > 0) {

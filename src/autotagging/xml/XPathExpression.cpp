@@ -94,15 +94,7 @@ void logEvaluationError(void* evaluation, xmlErrorPtr raised) {
     logProblem(static_cast<const XPathEvaluation*>(evaluation)->expression, reasonOf(raised->code));
 }
 
-struct ObjectCloser {
-    void operator()(xmlXPathObject* object) const { xmlXPathFreeObject(object); }
-};
-
 }  // namespace
-
-void XPathScope::Closer::operator()(_xmlXPathContext* context) const {
-    xmlXPathFreeContext(context);
-}
 
 XPathScope::XPathScope(_xmlDoc& document) : context_(xmlXPathNewContext(&document)) {
     if (!context_) return;
@@ -135,26 +127,20 @@ std::size_t XPathScope::workOfStep(const XPathCost& cost) {
     return 1 + nodes + copied / bytesOfWork + lookedUp;
 }
 
-void XPathExpression::Closer::operator()(xmlXPathCompExpr* expression) const {
-    xmlXPathFreeCompExpr(expression);
-}
-
 std::shared_ptr<const XPathExpression> XPathExpression::compile(std::string_view text, Error* error) {
     if (text.empty() || text.size() > kLongestXPath || text.find('\0') != std::string_view::npos) {
         fail(error, kErrorMalformed,
              fmt::format("XPath of {} bytes: empty, too long or binary", text.size()));
         return nullptr;
     }
-    const std::unique_ptr<xmlXPathContext, decltype(&xmlXPathFreeContext)> context(
-        xmlXPathNewContext(nullptr), xmlXPathFreeContext);
+    const XmlOwned<xmlXPathContext> context(xmlXPathNewContext(nullptr));
     if (!context) return nullptr;
     Error raised;
     context->error = keepSyntaxError;
     context->userData = &raised;
     auto expression = std::make_shared<XPathExpression>();
     expression->text_ = text;
-    expression->compiled_.reset(
-        xmlXPathCtxtCompile(context.get(), reinterpret_cast<const xmlChar*>(expression->text_.c_str())));
+    expression->compiled_.reset(xmlXPathCtxtCompile(context.get(), xmlText(expression->text_.c_str())));
     // The library finds these when it comes to them, in some documents and not in others.
     const auto unknown = expression->compiled_ ? unknownXPathName(text) : std::nullopt;
     if (unknown) raised = syntaxError(text, unknown->offset, unknown->reason);
@@ -198,8 +184,7 @@ std::vector<xmlNode*> XPathExpression::nodes(XPathScope& scope) const {
     context.opCount = 0;
     context.node = nullptr;
     context.userData = &evaluation;
-    const std::unique_ptr<xmlXPathObject, ObjectCloser> result(
-        xmlXPathCompiledEval(compiled_.get(), &context));
+    const XmlOwned<xmlXPathObject> result(xmlXPathCompiledEval(compiled_.get(), &context));
     scope.isComplete_ = result != nullptr;
     if (!result || result->type != XPATH_NODESET || result->nodesetval == nullptr) return {};
     std::vector<xmlNode*> selected;

@@ -4,17 +4,13 @@
 #include "autotagging/xml/XPathCost.h"
 #include "autotagging/xml/XmlExtent.h"
 #include "platform/base/Error.h"
+#include "platform/data/XmlLibrary.h"
 
 #include <memory>
 #include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
-
-struct _xmlDoc;            // NOLINT(bugprone-reserved-identifier): libxml2's name
-struct _xmlNode;           // NOLINT(bugprone-reserved-identifier): libxml2's name
-struct _xmlXPathCompExpr;  // NOLINT(bugprone-reserved-identifier): libxml2's name
-struct _xmlXPathContext;   // NOLINT(bugprone-reserved-identifier): libxml2's name
 
 namespace qvct {
 
@@ -38,15 +34,11 @@ class XPathScope {
 
   private:
     friend class XPathExpression;
-    struct Closer {
-        void operator()(_xmlXPathContext* context) const;
-    };
-
     const XmlExtent& extent();
     bool holdsTooMuchText(const XPathCost& cost);
     std::size_t workOfStep(const XPathCost& cost);
 
-    std::unique_ptr<_xmlXPathContext, Closer> context_;
+    XmlOwned<_xmlXPathContext> context_;
     bool isComplete_ = true;
     std::optional<XmlExtent> extent_;  // when an expression first needs it
 };
@@ -72,12 +64,8 @@ class XPathExpression {
     bool isLocationPath() const { return locationPath_.has_value(); }
 
   private:
-    struct Closer {
-        void operator()(_xmlXPathCompExpr* expression) const;
-    };
-
     std::string text_;
-    std::unique_ptr<_xmlXPathCompExpr, Closer> compiled_;
+    XmlOwned<_xmlXPathCompExpr> compiled_;
     std::optional<LocationPath> locationPath_;
     XPathCost cost_;
 };

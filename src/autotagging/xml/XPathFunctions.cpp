@@ -1,5 +1,7 @@
 #include "autotagging/xml/XPathFunctions.h"
 
+#include "platform/data/XmlLibrary.h"
+
 #include <cstring>
 #include <memory>
 #include <string>
@@ -11,10 +13,6 @@
 namespace qvct {
 namespace {
 
-struct TextCloser {
-    void operator()(xmlChar* text) const { xmlFree(text); }
-};
-
 /// The last argument, as a text.
 class PoppedText {
   public:
@@ -24,7 +22,7 @@ class PoppedText {
     xmlChar* release() { return text_.release(); }
 
   private:
-    std::unique_ptr<xmlChar, TextCloser> text_;
+    XmlOwned<xmlChar> text_;
 };
 
 bool hasArguments(xmlXPathParserContext& parser, int count, int wanted) {
@@ -34,7 +32,7 @@ bool hasArguments(xmlXPathParserContext& parser, int count, int wanted) {
 
 void returnText(xmlXPathParserContext& parser, std::string_view text) {
     if (parser.error != XPATH_EXPRESSION_OK) return;
-    xmlChar* copy = xmlStrndup(reinterpret_cast<const xmlChar*>(text.data()), static_cast<int>(text.size()));
+    xmlChar* copy = xmlStrndup(xmlText(text.data()), static_cast<int>(text.size()));
     if (copy == nullptr) return xmlXPathErr(&parser, XPATH_MEMORY_ERROR);
     xmlXPathReturnString(&parser, copy);
 }
@@ -129,7 +127,7 @@ xmlXPathFunction linearXPathFunction(void* /*unused*/, const xmlChar* name, cons
         {"substring-before", substringBefore},
         {"translate", translate}};
     if (nameSpace != nullptr) return nullptr;
-    const auto hit = functions.find(reinterpret_cast<const char*>(name));
+    const auto hit = functions.find(viewOf(name));
     return hit == functions.end() ? nullptr : hit->second;
 }
 

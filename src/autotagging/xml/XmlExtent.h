@@ -1,8 +1,8 @@
 #pragma once
 
-#include <cstddef>
+#include "platform/data/XmlLibrary.h"
 
-struct _xmlDoc;  // NOLINT(bugprone-reserved-identifier): libxml2's name
+#include <cstddef>
 
 namespace qvct {
 

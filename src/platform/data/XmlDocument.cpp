@@ -13,14 +13,6 @@
 namespace qvct {
 namespace {
 
-struct Closer {
-    void operator()(xmlXPathContext* context) const { xmlXPathFreeContext(context); }
-    void operator()(xmlXPathObject* result) const { xmlXPathFreeObject(result); }
-    void operator()(xmlChar* text) const { xmlFree(text); }
-};
-template <typename T>
-using Owned = std::unique_ptr<T, Closer>;
-
 /// A file this large takes several times its size in memory once it is parsed.
 constexpr std::uint64_t kLargestXmlFile = 64ULL << 20U;
 
@@ -28,14 +20,10 @@ std::string_view textOf(const std::vector<std::uint8_t>& bytes) {
     return {reinterpret_cast<const char*>(bytes.data()), bytes.size()};
 }
 
-const xmlChar* xmlText(const std::string& text) {
-    return reinterpret_cast<const xmlChar*>(text.c_str());
-}
-
 }  // namespace
 
 struct XmlDocument::Implementation {
-    XmlTree document;
+    XmlOwned<xmlDoc> document;
 };
 
 XmlDocument::XmlDocument(std::unique_ptr<Implementation> implementation)
@@ -68,17 +56,17 @@ std::shared_ptr<XmlDocument> XmlDocument::fromText(std::string_view text, std::s
 
 std::vector<std::string> XmlDocument::attributeValues(const std::string& xpath,
                                                       const std::string& attribute) const {
-    const Owned<xmlXPathContext> context(xmlXPathNewContext(implementation_->document.get()));
-    const Owned<xmlXPathObject> result(context ? xmlXPathEvalExpression(xmlText(xpath), context.get())
-                                               : nullptr);
+    const XmlOwned<xmlXPathContext> context(xmlXPathNewContext(implementation_->document.get()));
+    const XmlOwned<xmlXPathObject> result(
+        context ? xmlXPathEvalExpression(xmlText(xpath.c_str()), context.get()) : nullptr);
     std::vector<std::string> values;
     if (!result || result->type != XPATH_NODESET || result->nodesetval == nullptr) return values;
     xmlXPathNodeSetSort(result->nodesetval);
     for (int i = 0; i < result->nodesetval->nodeNr; ++i) {
         const xmlNode* node = result->nodesetval->nodeTab[i];
-        const Owned<xmlChar> value(node->type == XML_ELEMENT_NODE ? xmlGetProp(node, xmlText(attribute))
-                                                                  : nullptr);
-        values.emplace_back(value ? reinterpret_cast<const char*>(value.get()) : "");
+        const XmlOwned<xmlChar> value(
+            node->type == XML_ELEMENT_NODE ? xmlGetProp(node, xmlText(attribute.c_str())) : nullptr);
+        values.emplace_back(viewOf(value.get()));
     }
     return values;
 }

@@ -18,10 +18,6 @@ namespace {
 /// Damaged documents may cause a fault for each line.
 constexpr std::size_t kMostFaults = 5;
 
-struct ParserCloser {
-    void operator()(xmlParserCtxt* context) const { xmlFreeParserCtxt(context); }
-};
-
 /// Declared, these change nothing for the library: it has told the width of characters by the first bytes.
 constexpr std::array<std::string_view, 4> kUnswitchedEncodings = {"utf-8", "utf8", "utf-16", "utf16"};
 
@@ -205,7 +201,7 @@ class Parser {
 
     std::string_view text_;
     std::size_t mostNodes_;
-    std::unique_ptr<xmlParserCtxt, ParserCloser> context_;
+    XmlOwned<xmlParserCtxt> context_;
     ParsedXml result_;
     std::size_t nodes_ = 0;
     int declarations_ = 0;
@@ -213,10 +209,6 @@ class Parser {
 };
 
 }  // namespace
-
-void XmlTreeCloser::operator()(_xmlDoc* document) const {
-    xmlFreeDoc(document);
-}
 
 ParsedXml parseXml(std::string_view text) {
     return Parser(text).parse();

@@ -1,15 +1,13 @@
 #pragma once
 
 #include "platform/base/Error.h"
+#include "platform/data/XmlLibrary.h"
 
 #include <cstddef>
-#include <memory>
 #include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
-
-struct _xmlDoc;  // NOLINT(bugprone-reserved-identifier): libxml2's name
 
 namespace qvct {
 
@@ -22,14 +20,9 @@ inline constexpr int kMostXmlNameSpaces = 256;
 inline constexpr std::size_t kMostXmlNodes = 100'000;
 inline constexpr std::size_t kXmlBytesOfNode = 40;
 
-struct XmlTreeCloser {
-    void operator()(_xmlDoc* document) const;
-};
-using XmlTree = std::unique_ptr<_xmlDoc, XmlTreeCloser>;
-
 /// A parsed text, malformed XML being recovered up to where it makes sense.
 struct ParsedXml {
-    XmlTree tree;                     ///< Null when there is nothing to recover, or too much.
+    XmlOwned<_xmlDoc> tree;           ///< Null when there is nothing to recover, or too much.
     bool isWellFormed = false;        ///< Whether the tree is all of the text.
     std::vector<std::string> faults;  ///< The first few, each with its line.
     std::size_t moreFaults = 0;       ///< Those behind.

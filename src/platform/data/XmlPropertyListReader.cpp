@@ -273,10 +273,6 @@ class Reader {
     bool isComplete_ = false;
 };
 
-std::string_view view(const xmlChar* text) {
-    return reinterpret_cast<const char*>(text);
-}
-
 /// The parser, fed at once and stopped at the first fault or at the end of the root element.
 class Parser {
   public:
@@ -288,7 +284,7 @@ class Parser {
             tell(self, [&](Parser& p) {
                 if (p.context_->nsNr / 2 > kMostXmlNameSpaces)  // a prefix and an address each
                     return p.reader_.refuse("too many name spaces", p.lastTag(), kErrorTooLarge);
-                p.reader_.start(view(name), prefix != nullptr, [&p] { return p.lastTag(); });
+                p.reader_.start(viewOf(name), prefix != nullptr, [&p] { return p.lastTag(); });
             });
         };
         handler.endElementNs = [](void* self, const xmlChar*, const xmlChar*, const xmlChar*) {
@@ -341,13 +337,6 @@ class Parser {
     }
 
   private:
-    struct Deleter {
-        void operator()(xmlParserCtxt* context) const {
-            xmlFreeDoc(context->myDoc);
-            xmlFreeParserCtxt(context);
-        }
-    };
-
     template <typename Event>
     static void tell(void* self, Event event) {
         auto& parser = *static_cast<Parser*>(self);
@@ -386,7 +375,7 @@ class Parser {
     Reader reader_;
     bool isStopped_ = false;
     std::size_t stoppedAt_ = 0;
-    std::unique_ptr<xmlParserCtxt, Deleter> context_;
+    XmlOwned<xmlParserCtxt> context_;
 };
 
 }  // namespace
