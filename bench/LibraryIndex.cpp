@@ -6,7 +6,6 @@
 
 #include "Measure.h"
 #include "contentdb/ContentDatabase.h"
-#include "contentdb/ContentDescriber.h"
 #include "contentdb/store/StoreWriter.h"
 #include "contentdb/terms/Terms.h"
 #include "contentdb/terms/Words.h"
@@ -86,10 +85,10 @@ IndexProgress index(const std::string& folder, const std::string& database) {
     IndexOptions options;
     options.folders = {folder};
     options.database = database;
+    options.services = QVCTAutoTaggingOptionFilenameKeywords;
+    options.worker.path = QVCT_INDEX_WORKER;
     Error error;
-    const auto progress = indexLibrary(
-        options, [] { return std::make_unique<ContentDescriber>(QVCTAutoTaggingOptionFilenameKeywords); },
-        &error);
+    const auto progress = indexLibrary(options, &error);
     if (!progress) {
         fmt::print(stderr, "{}\n", error.message);
         std::exit(1);

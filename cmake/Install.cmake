@@ -37,6 +37,8 @@ foreach(library IN ITEMS qvcontenttagging qvcontentdb)
   install(CODE "execute_process(COMMAND \"${CMAKE_STRIP}\" --strip-debug \"${archive}\" COMMAND_ERROR_IS_FATAL ANY)"
           COMPONENT dev)
 endforeach()
+# Where the libraries look for it.
+install(TARGETS qvct_index_worker DESTINATION "${CMAKE_INSTALL_LIBEXECDIR}/qvcontenttagging")
 set(package_folder "${CMAKE_INSTALL_LIBDIR}/cmake/QVContentTagging")
 foreach(kind IN ITEMS Shared Static)
   install(EXPORT QVContentTagging${kind} NAMESPACE qvct:: DESTINATION "${package_folder}" COMPONENT dev)

@@ -14,6 +14,7 @@ set(QVCT_PUBLIC_HEADERS
   platform/files/EditLock.h
   platform/files/FileStamp.h
   platform/files/ResourceBundle.h
+  platform/processes/HardLimit.h
   platform/data/PropertyList.h
   platform/data/PropertyListFile.h
   platform/data/UserDefaults.h
@@ -69,5 +70,6 @@ set(QVCT_PUBLIC_DATABASE_HEADERS
   contentdb/ContentDescriber.h
   contentdb/IndexedItem.h
   contentdb/Indexer.h
+  contentdb/IndexWorker.h
   contentdb/Query.h
   contentdb/SearchResults.h)

@@ -88,10 +88,11 @@ void addValues(IndexedItem& item, const ObjectSet<TGRTKeyValue>& values) {
 struct ContentDescriber::Implementation {
     explicit Implementation(std::uint64_t options) : services(options) {}
 
-    // The record may name tags of the user's own; services speak of the taxonomy's.
     static constexpr std::uint64_t kOptions = kIndexInMutableTaxonomy | kIndexWithoutRecord;
+    // The record may name tags of the user's own; services speak of the taxonomy's. They are added to one of
+    // its own, since other threads may describe, too.
     std::shared_ptr<TGRTTaxonomy> taxonomyOfRecords =
-        TGRTIndexableContentObject::taxonomyForOptions(kOptions);
+        TGRTTaxonomy::newTaxonomyOfType(kDefaultTaxonomy, false, false);
     std::shared_ptr<TGRTTaxonomy> taxonomyOfServices = TGRTTaxonomy::defaultTaxonomy();
     std::uint64_t services;
     std::shared_ptr<QVTaggingAggregator> aggregator = QVTaggingAggregator::defaultTaggingAggregator();

@@ -101,7 +101,7 @@ class ItemDescriber {
     virtual std::optional<IndexedItem> describe(const std::string& path, Error* error) = 0;
 };
 
-/// Makes a describer of its own for each worker, inside the worker's process.
+/// Makes a describer of its own for each worker, inside the worker's process or thread.
 using DescriberFactory = std::function<std::unique_ptr<ItemDescriber>()>;
 
 }  // namespace qvct::contentdb

@@ -1,6 +1,9 @@
 #include "contentdb/Indexer.h"
 
+#include "contentdb/index/DescriberThreads.h"
 #include "contentdb/index/IndexRun.h"
+#include "contentdb/index/WorkerPool.h"
+#include "contentdb/index/WorkerProgram.h"
 #include "contentdb/store/DatabaseFiles.h"
 #include "contentdb/store/Merge.h"
 #include "contentdb/store/RunLock.h"
@@ -9,6 +12,7 @@
 #include "contentdb/store/StoreCheck.h"
 #include "platform/files/FileAccess.h"
 #include "platform/files/FileReplacement.h"
+#include "platform/processes/ProcessArguments.h"
 #include "platform/text/Text.h"
 #include "platform/text/Url.h"
 
@@ -18,6 +22,24 @@
 
 namespace qvct::contentdb {
 namespace {
+
+using PoolFactory = std::function<std::unique_ptr<DescriberPool>()>;
+
+unsigned numberOfWorkers(const IndexOptions& options) {
+    return options.workers != 0 ? options.workers : std::max(1U, std::thread::hardware_concurrency());
+}
+
+std::unique_ptr<DescriberPool> workerPool(const IndexOptions& options) {
+    constexpr const char* kOfTests = "-XCTest";  // an argument that readers know
+    WorkerPool::Settings settings;
+    settings.program = pathOfWorkerProgram(options.worker);
+    settings.arguments = options.worker.arguments;
+    if (options.worker.path.empty()) settings.arguments = {std::to_string(options.services)};
+    if (processHasArgument(kOfTests)) settings.arguments.emplace_back(kOfTests);
+    settings.workers = numberOfWorkers(options);
+    settings.timeLimit = options.timeLimitPerItem;
+    return std::make_unique<WorkerPool>(std::move(settings));
+}
 
 /// Puts a database that an earlier run has rebuilt, but not into its place, there.
 void finishRebuild(const IndexOptions& options) {
@@ -31,28 +53,25 @@ void finishRebuild(const IndexOptions& options) {
 }
 
 IndexProgress runOnce(const IndexOptions& options, const std::vector<std::string>& folders,
-                      const DescriberFactory& factory) {
-    const unsigned processors = std::max(1U, std::thread::hardware_concurrency());
-    WorkerPool workers(factory,
-                       {options.workers != 0 ? options.workers : processors, options.timeLimitPerItem});
+                      const PoolFactory& makePool) {
+    const auto describers = makePool();
     const auto connection = openDatabase(options.database, Access::write);
     connection->checkPages();
     if (options.check) {
         ContentStore store(*connection);
         checkStore(store);
     }
-    IndexRun run(options, *connection, workers);
+    IndexRun run(options, *connection, *describers);
     bool isInOrder = true;
     for (const std::string& folder : folders) isInOrder = isInOrder && run.walk(folder);
-    if (!run.finish() || !isInOrder)
-        throw DatabaseFailure(kErrorUnreadable, "the processes that read items cannot be kept running");
+    if (!run.finish() || !isInOrder) throw DatabaseFailure(kErrorUnreadable, describers->problem());
     return run.progress();
 }
 
 /// Puts a damaged database aside, and into its place what can be read of it with what the folders that were
 /// in it have now: all at once, so that no folder is forgotten when this is interrupted. Whether it came to
 /// its end.
-bool replaceDamaged(const IndexOptions& options, const DescriberFactory& factory,
+bool replaceDamaged(const IndexOptions& options, const PoolFactory& makePool,
                     const DatabaseFailure& failure) {
     IndexOptions rebuilding = options;
     rebuilding.prune = false;
@@ -62,7 +81,7 @@ bool replaceDamaged(const IndexOptions& options, const DescriberFactory& factory
     const bool knowsFolders = !saved.folders.empty();
     std::erase_if(saved.folders, [](const std::string& folder) { return !isDirectory(folder); });
     if (!saved.folders.empty()) {
-        runOnce(rebuilding, saved.folders, factory);
+        runOnce(rebuilding, saved.folders, makePool);
         openDatabase(rebuilding.database, Access::write)->emptyLog();
     }
     if (options.isCancelled && options.isCancelled()) return false;
@@ -77,10 +96,7 @@ bool replaceDamaged(const IndexOptions& options, const DescriberFactory& factory
     return true;
 }
 
-}  // namespace
-
-std::optional<IndexProgress> indexLibrary(const IndexOptions& wanted, const DescriberFactory& factory,
-                                          Error* error) {
+std::optional<IndexProgress> indexBy(const PoolFactory& makePool, const IndexOptions& wanted, Error* error) {
     IndexOptions options = wanted;
     options.database = pathOfDatabase(wanted.database);
     const auto refuse = [error](ErrorCode code, const std::string& message) {
@@ -90,7 +106,6 @@ std::optional<IndexProgress> indexLibrary(const IndexOptions& wanted, const Desc
     if (options.parts == 0 || options.part == 0 || options.part > options.parts)
         return refuse(kErrorInvalidArgument,
                       fmt::format("there is no part {} of {}", options.part, options.parts));
-    if (!factory) return refuse(kErrorInvalidArgument, "there is nothing that describes items");
     std::vector<std::string> folders;
     for (const std::string& folder : options.folders) {
         folders.push_back(URL::fileURLWithPath(folder).path());
@@ -107,15 +122,33 @@ std::optional<IndexProgress> indexLibrary(const IndexOptions& wanted, const Desc
     return guarded(error, std::optional<IndexProgress>(), [&]() -> std::optional<IndexProgress> {
         finishRebuild(options);
         try {
-            return runOnce(options, folders, factory);
+            return runOnce(options, folders, makePool);
         } catch (const DatabaseFailure& failure) {
             const bool isOurs =
                 failure.code() == kErrorMalformed && isMarkedAsContentDatabase(options.database);
             if (!isOurs) throw;
-            if (!replaceDamaged(options, factory, failure)) return IndexProgress{};
+            if (!replaceDamaged(options, makePool, failure)) return IndexProgress{};
         }
-        return runOnce(options, folders, factory);
+        return runOnce(options, folders, makePool);
     });
+}
+
+}  // namespace
+
+std::optional<IndexProgress> indexLibrary(const IndexOptions& options, Error* error) {
+    return indexBy([&] { return workerPool(options); }, options, error);
+}
+
+std::optional<IndexProgress> indexLibrary(const IndexOptions& options, const DescriberFactory& factory,
+                                          Error* error) {
+    if (!factory) {
+        qvct::fail(error, kErrorInvalidArgument, "there is nothing that describes items");
+        return std::nullopt;
+    }
+    const auto threads = [&] {
+        return std::make_unique<DescriberThreads>(factory, numberOfWorkers(options));
+    };
+    return indexBy(threads, options, error);
 }
 
 bool mergeDatabases(const std::vector<std::string>& databases, const std::string& name, Error* error) {

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "autotagging/services/TaggingServiceNames.h"
 #include "contentdb/IndexedItem.h"
 #include "formats/ContentWalk.h"
 #include "platform/base/Error.h"
@@ -23,6 +24,16 @@ struct IndexProgress {
     std::uint64_t failed = 0;     ///< could not be read; stored with the reason
     std::uint64_t missing = 0;    ///< known to the index, but gone from the disk
     std::uint64_t pruned = 0;     ///< of these, taken out of the index
+};
+
+/// A program that describes items by `runIndexWorker`.
+struct WorkerProgram {
+    /// Empty: our own, `qvct-index-worker`, which describes as `ContentDescriber` does. It is looked for
+    /// where the environment variable QVCT_INDEX_WORKER says, beside the library or program that has this
+    /// code, and where it is installed, in libexec/qvcontenttagging.
+    std::string path;
+    /// For a program of the host's own.
+    std::vector<std::string> arguments;
 };
 
 /// What a run is to do. Only `folders` and `database` have to be given.
@@ -50,8 +61,13 @@ struct IndexOptions {
     /// Takes only this part of the items (from 1), to be united with the others by `mergeDatabases`.
     unsigned part = 1;
     unsigned parts = 1;
-    /// 0: as many as there are processors.
+    /// How many items are described at a time. 0: as many as there are processors.
     unsigned workers = 0;
+    /// What describes them, unless a describer is given.
+    WorkerProgram worker;
+    /// The tagging services that our own worker program asks, a sum of QVCTAutoTaggingOptions.
+    std::uint64_t services = optionsForAllTaggingServices();
+    /// Longest that a worker program may take for one item.
     std::chrono::milliseconds timeLimitPerItem{30000};
     /// Longest that an item waits, once read, until it is stored: what an interruption may cost. Shorter
     /// costs speed.
@@ -72,14 +88,24 @@ struct IndexOptions {
 /// Brings the database up to date with the folders, making it if there is none.
 ///
 /// Only items that are new, whose size, times or inode have changed (or those of what lies beside them:
-/// record, description, preview), or that another describer has described are read, each in a worker process
-/// (see WorkerPool). Batches of items are stored whole or not at all: a run that was interrupted at any point
-/// is continued by the next. An item with the payload of one that is gone is that item, moved.
+/// record, description, preview), or that another describer has described are read, each in the process of a
+/// worker program: one that crashes it, or takes too long, has failed, and costs no other item. The programs
+/// are started with what replaces resources here, end with this process, and have none of its open files but
+/// standard error; what they log is logged here, from the calling thread.
 ///
-/// Nothing, and an error, when there is no such folder, the database cannot be written, or another run is
-/// going on. What was stored until then stays.
+/// Batches of items are stored whole or not at all: a run that was interrupted at any point is continued by
+/// the next. An item with the payload of one that is gone is that item, moved.
+///
+/// Nothing, and an error, when there is no such folder, the database cannot be written, another run is going
+/// on, or the worker program cannot be run. What was stored until then stays.
 /// @cost  One reading of the database file, 25 ms for 100,000 items. An unchanged folder: one listing and one
 ///   look at each file. Memory is bounded whatever the size.
+QVCT_API std::optional<IndexProgress> indexLibrary(const IndexOptions& options, Error* error = nullptr);
+
+/// The same in threads of this process, `IndexOptions::workers` of them, each with a describer that the
+/// factory makes in it. Nothing protects the process from what describes: an item that crashes it crashes the
+/// host, one that hangs it hangs the run, and no time limit holds. For a describer that cannot be in a
+/// program of its own, or a host that may start none.
 QVCT_API std::optional<IndexProgress> indexLibrary(const IndexOptions& options,
                                                    const DescriberFactory& factory, Error* error = nullptr);
 

@@ -1,8 +1,8 @@
 #include "commands/Commands.h"
 #include "output/StandardStreams.h"
-#include "platform/base/HardLimit.h"
 #include "platform/base/Version.h"
 #include "platform/files/UnfinishedFile.h"
+#include "platform/processes/HardLimit.h"
 
 #include <algorithm>
 #include <exception>

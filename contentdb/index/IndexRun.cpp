@@ -53,10 +53,10 @@ std::optional<std::pair<std::uint64_t, std::uint64_t>> inodeOf(const std::string
 
 }  // namespace
 
-IndexRun::IndexRun(const IndexOptions& options, Connection& connection, WorkerPool& workers)
+IndexRun::IndexRun(const IndexOptions& options, Connection& connection, DescriberPool& describers)
     : options_(options),
       part_{options.part, options.parts},
-      workers_(workers),
+      describers_(describers),
       writer_(connection),
       nextId_(writer_.store().lastId() + 1),
       isNewDatabase_(nextId_ == 1),
@@ -66,7 +66,7 @@ IndexRun::IndexRun(const IndexOptions& options, Connection& connection, WorkerPo
 }
 
 bool IndexRun::walk(const std::string& folder) {
-    if (isStopped_) return areWorkersInOrder_;
+    if (isStopped_) return canDescribe_;
     roots_.push_back(folder);
     listed_ = 0;
     const auto tell = [this](const std::string& path, const Error& error) {
@@ -76,7 +76,7 @@ bool IndexRun::walk(const std::string& folder) {
     const auto show = [&](const ContentFolder& found) { return visit(found.path, listedItems(found, tell)); };
     if (isDirectory(folder)) walkContentFolders(folder, show, tell, options_.links);
     if (listed_ == 0 && !options_.pruneRoots) bareRoots_.emplace(folder, 0);
-    return areWorkersInOrder_;
+    return canDescribe_;
 }
 
 bool IndexRun::visit(const std::string& path, const std::vector<ListedItem>& all) {
@@ -148,24 +148,24 @@ bool IndexRun::submitChanged(const std::shared_ptr<OpenFolder>& folder, std::int
 }
 
 bool IndexRun::submit(const ListedItem& item, ItemId id, const std::shared_ptr<OpenFolder>& folder) {
-    while (!workers_.hasRoom()) {
+    while (!describers_.hasRoom()) {
         if (!collect()) return false;
     }
     ++folder->remaining;
     pending_[++lastTicket_] = {id != 0 ? id : nextId_++, id == 0, folder};
-    workers_.submit(lastTicket_, pathIn(folder->path, item.name), item.stamp);
+    describers_.submit({lastTicket_, pathIn(folder->path, item.name), item.stamp});
     return true;
 }
 
 bool IndexRun::collect() {
-    areWorkersInOrder_ = workers_.collect([this](Described described) {
+    canDescribe_ = describers_.collect([this](Described described) {
         termsInBatch_ += described.terms.size();
         batch_.push_back(std::move(described));
     });
     stopIfCancelled();
     flushIfDue();
     report();
-    return areWorkersInOrder_ && !isStopped_;
+    return canDescribe_ && !isStopped_;
 }
 
 void IndexRun::flushIfDue() {
@@ -236,11 +236,11 @@ void IndexRun::storeFolder(const OpenFolder& folder) {
 
 bool IndexRun::finish() {
     stopIfCancelled();
-    while (areWorkersInOrder_ && !isStopped_ && workers_.isBusy()) collect();
+    while (canDescribe_ && !isStopped_ && describers_.isBusy()) collect();
     flush();
-    if (options_.prune && areWorkersInOrder_ && !isStopped_) prune();
+    if (options_.prune && canDescribe_ && !isStopped_) prune();
     if (options_.progress) options_.progress(progress_);
-    return areWorkersInOrder_;
+    return canDescribe_;
 }
 
 void IndexRun::prune() {

@@ -1,8 +1,8 @@
 #pragma once
 
 #include "contentdb/Indexer.h"
+#include "contentdb/index/DescriberPool.h"
 #include "contentdb/index/ItemStamps.h"
-#include "contentdb/index/WorkerPool.h"
 #include "contentdb/store/StoreWriter.h"
 
 #include <chrono>
@@ -21,9 +21,9 @@ namespace qvct::contentdb {
 /// One run of the indexer over an open database. Throws DatabaseFailure.
 class IndexRun {
   public:
-    IndexRun(const IndexOptions& options, Connection& connection, WorkerPool& workers);
+    IndexRun(const IndexOptions& options, Connection& connection, DescriberPool& describers);
 
-    /// False when the workers cannot be kept running.
+    /// False when nothing can be described any more.
     bool walk(const std::string& folder);
     bool finish();
     const IndexProgress& progress() const { return progress_; }
@@ -64,13 +64,13 @@ class IndexRun {
 
     const IndexOptions& options_;
     const Part part_;
-    WorkerPool& workers_;
+    DescriberPool& describers_;
     StoreWriter writer_;
     IndexProgress progress_;
     ItemId nextId_;
     bool isNewDatabase_;
     bool isStopped_ = false;
-    bool areWorkersInOrder_ = true;
+    bool canDescribe_ = true;
     std::uint64_t lastTicket_ = 0;
     std::unordered_map<std::uint64_t, Pending> pending_;
     std::vector<Described> batch_;

@@ -1,227 +1,177 @@
 #include "contentdb/index/WorkerPool.h"
 
-#include "contentdb/index/Worker.h"
-#include "contentdb/terms/Terms.h"
+#include "contentdb/index/WorkerMessages.h"
+#include "contentdb/index/WorkerSettings.h"
+#include "platform/base/Log.h"
+#include "platform/base/Version.h"
+#include "platform/processes/ChildProcess.h"
+#include "platform/text/Text.h"
 
 #include <algorithm>
-#include <cerrno>
-#include <csignal>
-#include <cstring>
 #include <map>
 #include <utility>
 
-#include <fcntl.h>
 #include <fmt/format.h>
-#include <poll.h>
-#include <sys/mman.h>
-#include <sys/socket.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 namespace qvct::contentdb {
 namespace {
 
 /// Items that one worker may have before it; enough that it never waits.
 constexpr std::size_t kQueuePerWorker = 128;
-/// Longest that a worker may take to make its describer: forked while another thread of the host had a lock
-/// that this needs, it would wait for ever.
+/// Longest that a worker may take to make its describer.
 constexpr std::chrono::milliseconds kLongestStart{30000};
-/// Workers in a row that may end without having described anything.
 constexpr unsigned kMostBarrenWorkers = 5;
-
-struct Waiting {
-    std::string path;
-    ItemStamp stamp;
-};
-
-struct Process {
-    pid_t id = -1;
-    int socket = -1;
-    WorkerStatus* status = nullptr;
-    std::string output;
-    std::string input;
-    std::map<std::uint64_t, Waiting> waiting;  // in the order of tickets, which is that of submission
-    bool wasLate = false;
-};
-
-WorkerStatus* sharedStatus() {
-    void* memory =
-        ::mmap(nullptr, sizeof(WorkerStatus), PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS, -1, 0);
-    return memory == MAP_FAILED ? nullptr : new (memory) WorkerStatus{};
-}
 
 }  // namespace
 
-struct WorkerPool::Implementation {
-    DescriberFactory factory;
-    Settings settings;
-    std::vector<Process> processes;
-    unsigned barren = 0;
+struct WorkerPool::Worker {
+    std::unique_ptr<ChildProcess> process;  // none while there is no work for it
+    std::int64_t started = 0;
+    bool isOfOurVersion = false;
+    bool wasLate = false;
+    std::string output;
+    std::string input;
+    std::map<std::uint64_t, ItemTask> waiting;  // in the order of tickets, which is that of submission
 
-    bool start(Process& process) {
-        int pair[2];
-        if (process.status == nullptr) process.status = sharedStatus();
-        if (process.status == nullptr) return false;
-        process.status->ticket = 0;
-        process.status->isStarting = true;
-        process.status->since = monotonicNanoseconds();
-        if (::socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, pair) != 0) return false;
-        const pid_t id = ::fork();
-        if (id == 0) {
-            ::close(pair[0]);
-            // A worker that held another's socket would keep it waiting for ever.
-            for (const Process& other : processes) {
-                if (other.socket >= 0) ::close(other.socket);
-            }
-            runWorker(pair[1], *process.status, factory);
-        }
-        ::close(pair[1]);
-        if (id < 0) {
-            ::close(pair[0]);
-            return false;
-        }
-        ::fcntl(pair[0], F_SETFL, O_NONBLOCK);
-        process.id = id;
-        process.socket = pair[0];
-        process.wasLate = false;
-        process.input.clear();
-        process.output.clear();
-        for (const auto& [ticket, task] : process.waiting)
-            appendMessage(process.output, encodedTask(ticket, task.path, task.stamp));
-        return true;
-    }
-
-    /// Ends the process and answers how it came to its end.
-    std::string end(Process& process) {
-        ::close(process.socket);
-        process.socket = -1;
-        int status = 0;
-        ::kill(process.id, SIGKILL);  // it may be about to end by itself; then this does nothing
-        while (::waitpid(process.id, &status, 0) < 0 && errno == EINTR) {
-        }
-        process.id = -1;
-        if (process.wasLate) return fmt::format("reading it took longer than {} s", seconds());
-        if (WIFSIGNALED(status)) return fmt::format("reading it crashed ({})", ::strsignal(WTERMSIG(status)));
-        return fmt::format("reading it ended the process (status {})", WEXITSTATUS(status));
-    }
-
-    double seconds() const { return static_cast<double>(settings.timeLimit.count()) / 1000; }
-
-    void send(Process& process) {
-        while (!process.output.empty()) {
-            const ssize_t sent =
-                ::send(process.socket, process.output.data(), process.output.size(), MSG_NOSIGNAL);
-            if (sent <= 0) return;  // full, or gone: then reading tells
-            process.output.erase(0, static_cast<std::size_t>(sent));
-        }
-    }
-
-    /// Whether the process is still there.
-    bool receive(Process& process, const std::function<void(Described)>& take) {
-        char chunk[1U << 16U];
-        bool isThere = true;
-        while (true) {
-            const ssize_t count = ::recv(process.socket, chunk, sizeof chunk, 0);
-            if (count < 0 && errno == EINTR) continue;
-            isThere = count > 0 || (count < 0 && (errno == EAGAIN || errno == EWOULDBLOCK));
-            if (count <= 0) break;
-            process.input.append(chunk, static_cast<std::size_t>(count));
-        }
-        std::size_t at = 0;
-        for (std::string_view message; nextMessage(process.input, at, message);) {
-            Described described;
-            if (!decodeAnswer(message, described) || process.waiting.erase(described.ticket) == 0)
-                return false;
-            barren = 0;
-            take(std::move(described));
-        }
-        process.input.erase(0, at);
-        return isThere;
-    }
-
-    /// Starts another process in the place of one that has ended; the item that it was at has failed.
-    bool replace(Process& process, const std::function<void(Described)>& take) {
-        const std::uint64_t culprit = process.status->ticket;
-        const std::string reason = end(process);
-        const auto hit = process.waiting.find(culprit);
-        if (hit != process.waiting.end()) {
-            Described failed;
-            failed.ticket = culprit;
-            failed.item.path = hit->second.path;
-            failed.item.stamp = hit->second.stamp;
-            failed.item.failure = reason;
-            process.waiting.erase(hit);
-            take(std::move(failed));
-        } else if (++barren > kMostBarrenWorkers) {
-            return false;
-        }
-        return start(process);
-    }
-
-    void endIfLate(Process& process) const {
-        const std::uint64_t ticket = process.status->ticket;
-        const bool isStarting = ticket == 0 && process.status->isStarting;
-        if (ticket == 0 && !isStarting) return;
-        const std::chrono::nanoseconds limit = isStarting ? kLongestStart : settings.timeLimit;
-        if (monotonicNanoseconds() - process.status->since < limit.count()) return;
-        if (process.status->ticket != ticket) return;  // it has gone on meanwhile
-        process.wasLate = true;
-        ::kill(process.id, SIGKILL);
-    }
+    const WorkerStatus& status() const { return WorkerStatus::in(process->memory()); }
 };
 
-WorkerPool::WorkerPool(DescriberFactory factory, Settings settings)
-    : implementation_(std::make_unique<Implementation>()) {
-    implementation_->factory = std::move(factory);
-    implementation_->settings = settings;
-    implementation_->processes.resize(std::max(1U, settings.workers));
-}
+WorkerPool::WorkerPool(Settings settings)
+    : settings_(std::move(settings)), workers_(std::max(1U, settings_.workers)) {}
 
-WorkerPool::~WorkerPool() {
-    for (Process& process : implementation_->processes) {
-        if (process.id > 0) implementation_->end(process);
-        if (process.status != nullptr) ::munmap(process.status, sizeof(WorkerStatus));
-    }
-}
+WorkerPool::~WorkerPool() = default;
 
 bool WorkerPool::hasRoom() const {
-    return std::any_of(implementation_->processes.begin(), implementation_->processes.end(),
-                       [](const Process& process) { return process.waiting.size() < kQueuePerWorker; });
+    return std::any_of(workers_.begin(), workers_.end(),
+                       [](const Worker& worker) { return worker.waiting.size() < kQueuePerWorker; });
 }
 
-void WorkerPool::submit(std::uint64_t ticket, std::string path, const ItemStamp& stamp) {
-    auto& processes = implementation_->processes;
-    Process& process = *std::min_element(
-        processes.begin(), processes.end(),
-        [](const Process& a, const Process& b) { return a.waiting.size() < b.waiting.size(); });
-    appendMessage(process.output, encodedTask(ticket, path, stamp));
-    process.waiting.emplace(ticket, Waiting{std::move(path), stamp});
+void WorkerPool::submit(ItemTask task) {
+    Worker& worker = *std::min_element(
+        workers_.begin(), workers_.end(),
+        [](const Worker& a, const Worker& b) { return a.waiting.size() < b.waiting.size(); });
+    if (worker.process) appendMessage(worker.output, encodedTask(task));
+    worker.waiting.emplace(task.ticket, std::move(task));
 }
 
 bool WorkerPool::isBusy() const {
-    return std::any_of(implementation_->processes.begin(), implementation_->processes.end(),
-                       [](const Process& process) { return !process.waiting.empty(); });
+    return std::any_of(workers_.begin(), workers_.end(),
+                       [](const Worker& worker) { return !worker.waiting.empty(); });
 }
 
 bool WorkerPool::collect(const std::function<void(Described)>& take) {
-    constexpr int patience = 100;  // milliseconds until the time limits are looked at again
-    std::vector<pollfd> sockets;
-    for (Process& process : implementation_->processes) {
+    constexpr std::chrono::milliseconds patience(100);  // until the time limits are looked at again
+    std::vector<ChildProcess::Awaited> awaited;
+    for (Worker& worker : workers_) {
         // A process is made when there is work for it: a run that finds nothing new makes none.
-        if (process.id < 0 && !process.waiting.empty() && !implementation_->start(process)) return false;
-        if (process.id < 0) continue;
-        implementation_->send(process);
-        const int events = process.output.empty() ? POLLIN : POLLIN | POLLOUT;
-        sockets.push_back({process.socket, static_cast<short>(events), 0});
+        if (!worker.process && !worker.waiting.empty() && !start(worker)) return false;
+        if (!worker.process) continue;
+        worker.process->send(worker.output);
+        awaited.push_back({worker.process.get(), !worker.output.empty()});
     }
-    ::poll(sockets.data(), sockets.size(), patience);
-    for (Process& process : implementation_->processes) {
-        if (process.id < 0) continue;
-        implementation_->endIfLate(process);
-        if (!implementation_->receive(process, take) && !implementation_->replace(process, take))
+    ChildProcess::await(awaited, patience);
+    for (Worker& worker : workers_) {
+        if (!worker.process) continue;
+        endIfLate(worker);
+        const Receipt receipt = receive(worker, take);
+        if (receipt == Receipt::refused || (receipt == Receipt::ended && !replace(worker, take)))
             return false;
     }
     return true;
+}
+
+bool WorkerPool::start(Worker& worker) {
+    Error error;
+    worker.process =
+        ChildProcess::start(settings_.program, settings_.arguments, sizeof(WorkerStatus), &error);
+    if (!worker.process) {
+        problem_ = error.message;
+        return false;
+    }
+    worker.started = WorkerStatus::now();
+    worker.isOfOurVersion = false;
+    worker.wasLate = false;
+    worker.input.clear();
+    worker.output.clear();
+    appendMessage(worker.output, encodedWorkerSettings());
+    for (const auto& [ticket, task] : worker.waiting) appendMessage(worker.output, encodedTask(task));
+    return true;
+}
+
+WorkerPool::Receipt WorkerPool::receive(Worker& worker, const std::function<void(Described)>& take) {
+    const bool isThere = worker.process->receive(worker.input);
+    std::size_t at = 0;
+    for (std::string_view message; nextMessage(worker.input, at, message);) {
+        const Receipt receipt = takeReport(worker, message, take);
+        if (receipt != Receipt::intact) return receipt;
+    }
+    worker.input.erase(0, at);
+    return isThere ? Receipt::intact : Receipt::ended;
+}
+
+WorkerPool::Receipt WorkerPool::takeReport(Worker& worker, std::string_view message,
+                                           const std::function<void(Described)>& take) {
+    auto report = decodedReport(message);
+    if (!report) return Receipt::ended;
+    if (report->kind == WorkerReport::Kind::version) worker.isOfOurVersion = report->text == version();
+    if (!worker.isOfOurVersion) {
+        fail(fmt::format("is of version \"{}\", and \"{}\" is needed", printable(report->text), version()));
+        return Receipt::refused;
+    }
+    if (report->kind == WorkerReport::Kind::logged) log(report->text);
+    if (report->kind == WorkerReport::Kind::described) {
+        if (worker.waiting.erase(report->described.ticket) == 0) return Receipt::ended;
+        barren_ = 0;
+        take(std::move(report->described));
+    }
+    return Receipt::intact;
+}
+
+/// Starts another process in the place of one that has ended; the item that it was at has failed.
+bool WorkerPool::replace(Worker& worker, const std::function<void(Described)>& take) {
+    const std::uint64_t culprit = worker.status().ticket;
+    const std::string reason = end(worker);
+    const auto hit = worker.waiting.find(culprit);
+    if (hit != worker.waiting.end()) {
+        Described failed;
+        failed.ticket = culprit;
+        failed.item.path = std::move(hit->second.path);
+        failed.item.stamp = hit->second.stamp;
+        failed.item.failure = "reading it " + reason;
+        worker.waiting.erase(hit);
+        take(std::move(failed));
+    } else if (++barren_ > kMostBarrenWorkers) {
+        return fail(fmt::format("{} before it described anything, {} times in a row", reason, barren_));
+    }
+    return start(worker);
+}
+
+/// Ends the process and answers how it came to its end.
+std::string WorkerPool::end(Worker& worker) const {
+    const ProcessEnd end = worker.process->end();
+    worker.process.reset();
+    if (worker.wasLate)
+        return fmt::format("took longer than {} s", static_cast<double>(settings_.timeLimit.count()) / 1000);
+    if (!end.signal.empty()) return fmt::format("crashed ({})", end.signal);
+    return fmt::format("ended the process (status {})", end.status);
+}
+
+void WorkerPool::endIfLate(Worker& worker) const {
+    const WorkerStatus& status = worker.status();
+    const std::uint64_t ticket = status.ticket;
+    const bool isStarting = ticket == 0 && !status.hasDescriber;
+    if (ticket == 0 && !isStarting) return;
+    const std::chrono::nanoseconds limit = isStarting ? kLongestStart : settings_.timeLimit;
+    const std::int64_t since = isStarting ? worker.started : status.since.load();
+    if (WorkerStatus::now() - since < limit.count()) return;
+    if (status.ticket != ticket) return;  // it has gone on meanwhile
+    worker.wasLate = true;
+    worker.process->kill();
+}
+
+bool WorkerPool::fail(std::string_view reason) {
+    problem_ = fmt::format("{}: {}", printable(settings_.program), reason);
+    return false;
 }
 
 }  // namespace qvct::contentdb

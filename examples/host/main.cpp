@@ -5,7 +5,6 @@
 #include <iostream>
 
 #include <qvcontenttagging/ContentDatabase.h>
-#include <qvcontenttagging/ContentDescriber.h>
 #include <qvcontenttagging/ContentWalk.h>
 #include <qvcontenttagging/Indexer.h>
 #include <qvcontenttagging/QVTaggingAggregator.h>
@@ -87,8 +86,7 @@ int main(int argc, char** argv) {
     IndexOptions options;
     options.folders = {argv[1]};
     options.database = argv[2];
-    const auto run = indexLibrary(
-        options, [] { return std::make_unique<ContentDescriber>(); }, &error);
+    const auto run = indexLibrary(options, &error);
     if (!run) return fail(error.message);
     std::cout << run->described << " read, " << run->failed << " failed\n";
 

@@ -1,8 +1,11 @@
 #include "Library.h"
+#include "NameDescriber.h"
+#include "contentdb/ContentDescriber.h"
 #include "contentdb/store/RunLock.h"
-#include "platform/files/FileAccess.h"
-#include "platform/text/Url.h"
-#include "support/RunTool.h"
+#include "platform/base/Version.h"
+#include "platform/files/ResourceBundle.h"
+#include "resources/ReplacementFile.h"
+#include "support/CapturedLog.h"
 
 #include <chrono>
 #include <csignal>
@@ -12,6 +15,7 @@
 #include <set>
 #include <thread>
 
+#include <fcntl.h>
 #include <fmt/format.h>
 #include <gmock/gmock.h>
 #include <sched.h>
@@ -29,37 +33,6 @@ using testing::Contains;
 using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::UnorderedElementsAre;
-
-/// Describes a file by its name and bytes; some names make it fail, crash or hang.
-class NameDescriber : public ItemDescriber {
-  public:
-    std::optional<IndexedItem> describe(const std::string& path, Error* error) override {
-        const URL url = URL::fileURLWithPath(path);
-        IndexedItem item;
-        item.name = url.lastPathComponentWithoutExtension();
-        if (item.name.find("vanishes") != std::string::npos) std::filesystem::remove(path);
-        if (item.name.find("fails") != std::string::npos || !std::filesystem::exists(path)) {
-            qvct::fail(error, kErrorMalformed, "it is broken");
-            return std::nullopt;
-        }
-        if (item.name.find("crashes") != std::string::npos) {
-            ::signal(SIGSEGV, SIG_DFL);  // a sanitizer would report it and exit
-            ::raise(SIGSEGV);
-        }
-        if (item.name.find("exits") != std::string::npos) ::_exit(3);
-        if (item.name.find("hangs") != std::string::npos) std::this_thread::sleep_for(std::chrono::hours(1));
-        if (item.name.find("throws") != std::string::npos) throw std::runtime_error("out of luck");
-        if (item.name.find("slow") != std::string::npos)
-            std::this_thread::sleep_for(std::chrono::milliseconds(2));
-        item.fileType = kFileTypeAudioFile;
-        const std::filesystem::path folder = std::filesystem::path(path).parent_path();
-        if (std::filesystem::remove(folder / "leaves")) std::filesystem::rename(folder, folder / "../away");
-        if (!isDirectory(path)) item.payloadHash = readAll(path);
-        if (item.payloadHash == "before") std::ofstream(path) << "after!";
-        item.taggings = {{"Drums", "Source", {}, {}, Provenance::automatic, "names"}};
-        return item;
-    }
-};
 
 /// A child process tells its parent how far it is, and waits there until it may go on.
 class Milestone {
@@ -105,8 +78,10 @@ class Indexing : public testing::Test {
         options.note = [this](const std::string& message) { notes_.push_back(message); };
         if (change) change(options);
         Error error;
-        const auto progress = indexLibrary(
-            options, [] { return std::make_unique<NameDescriber>(); }, &error);
+        const auto progress = options.worker.path.empty()
+                                  ? indexLibrary(
+                                        options, [] { return std::make_unique<NameDescriber>(); }, &error)
+                                  : indexLibrary(options, &error);
         EXPECT_TRUE(progress) << error.message;
         return progress.value_or(IndexProgress{});
     }
@@ -123,6 +98,7 @@ class Indexing : public testing::Test {
     void write(const std::string& name, const std::string& bytes) const {
         folder_.write("library/" + name, bytes);
     }
+    static void useWorkers(IndexOptions& options) { options.worker.path = QVCT_TEST_INDEX_WORKER; }
     /// Until what was written is older than a tick of the file system's clock.
     static void settle() { std::this_thread::sleep_for(std::chrono::milliseconds(40)); }
     std::string library() const { return folder_.path("library"); }
@@ -459,6 +435,7 @@ TEST_F(Indexing, LosesOneItemToEachThatFailsCrashesOrHangs) {
         write(name, "");
     settle();
     const auto limit = [](IndexOptions& options) {
+        useWorkers(options);
         options.timeLimitPerItem = std::chrono::milliseconds(1500);
         options.retryFailed = true;
     };
@@ -476,8 +453,87 @@ TEST_F(Indexing, LosesOneItemToEachThatFailsCrashesOrHangs) {
                             HasSubstr("B crashes.wav: reading it crashed (Segmentation fault"),
                             HasSubstr("Kick15 exits.wav: reading it ended the process (status 3)"),
                             "L hangs.wav: reading it took longer than 1.5 s", "M throws.wav: out of luck"));
-    EXPECT_EQ(index().failed, 0U);
+    EXPECT_EQ(index(useWorkers).failed, 0U);
     EXPECT_EQ(index(limit).failed, 5U);
+}
+
+TEST_F(Indexing, HearsWhatItsWorkersLogAndLeavesThemNoFile) {
+    for (const char* name : {"A logs.wav", "B logs and crashes.wav", "C tells.wav", "D throws.wav"})
+        write(name, name);
+    settle();
+    const CapturedLog log;
+    const int left = ::open(library().c_str(), O_RDONLY);
+    const IndexProgress progress = index(useWorkers);
+    ::close(left);
+    EXPECT_EQ(progress.described, 2U);
+    EXPECT_THAT(log.messages(), UnorderedElementsAre("about A logs", "about B logs and crashes"));
+    const auto item = ContentDatabase::open(database())->item(library() + "/C tells.wav");
+    EXPECT_EQ(item->item.title, "/dev/nu /dev/nu socket: /memfd: ");
+    // In threads of the host the same is described, and fails, but for what crashes it.
+    std::filesystem::remove(library() + "/B logs and crashes.wav");
+    const IndexProgress again = index([](IndexOptions& options) { options.describer = 2; });
+    EXPECT_EQ(again.described + again.failed, 3U);
+}
+
+TEST_F(Indexing, SaysWhyNothingDescribes) {
+    write("Kick.wav", "");
+    settle();
+    IndexOptions options;
+    options.folders = {library()};
+    options.database = database();
+    const auto problem = [&options](const WorkerProgram& program) {
+        options.worker = program;
+        Error error;
+        EXPECT_FALSE(indexLibrary(options, &error));
+        return error.message;
+    };
+    const std::string missing = folder_.path("none");
+    EXPECT_EQ(problem({missing, {}}), missing + ": cannot be started: No such file or directory");
+    EXPECT_EQ(problem({"/bin/false", {}}),
+              "/bin/false: ended the process (status 1) before it described anything, 6 times in a row");
+    const std::string answer = R"(printf '\7\0\0\0\0\0050.0.9' >&0; read -r line)";
+    EXPECT_EQ(problem({"/bin/sh", {"-c", answer}}),
+              fmt::format("/bin/sh: is of version \"0.0.9\", and \"{}\" is needed", version()));
+    Error error;
+    EXPECT_FALSE(indexLibrary(
+        options, [] { return std::unique_ptr<NameDescriber>(); }, &error));
+    EXPECT_EQ(error.message, "there is nothing that describes items");
+    const auto failing = []() -> std::unique_ptr<NameDescriber> { throw std::runtime_error("out of luck"); };
+    EXPECT_FALSE(indexLibrary(options, failing, &error));
+    EXPECT_EQ(error.message, "out of luck");
+    EXPECT_EQ(index().described, 1U);
+}
+
+TEST_F(Indexing, IsDescribedByOurWorkersAsInThisProcess) {
+    write("Zorp Kick.wav", "no sound");
+    write("Zorp Pad.cst", "settings");
+    const std::string mapping = folder_.write(
+        "Words.plist", R"(<plist version="1.0"><dict><key>Zorp</key><string>House</string></dict></plist>)");
+    const std::string broken = folder_.write("Rules.plist", "no rules");
+    settle();
+    ResourceBundle::setPathForResource("DefaultKeywordMapping", "plist", mapping);
+    ResourceBundle::setPathForResource("DefaultRules", "plist", broken);
+    const CapturedLog log;
+    IndexOptions options;
+    options.folders = {library()};
+    options.workers = 2;
+    options.services = QVCTAutoTaggingOptionFilenameKeywords;
+    options.database = folder_.path("threads");
+    Error error;
+    EXPECT_TRUE(indexLibrary(
+        options, [&] { return std::make_unique<ContentDescriber>(options.services); }, &error))
+        << error.message;
+    options.database = folder_.path("workers");
+    ::setenv("QVCT_INDEX_WORKER", QVCT_INDEX_WORKER, 1);
+    EXPECT_TRUE(indexLibrary(options, &error)) << error.message;
+    ::unsetenv("QVCT_INDEX_WORKER");
+    for (const auto& [name, extension] : kResourceFiles)
+        ResourceBundle::setPathForResource(name, extension, std::nullopt);
+    const std::string path = library() + "/Zorp Pad.cst";
+    const auto item = ContentDatabase::open(options.database)->item(path)->item;
+    EXPECT_EQ(item, ContentDatabase::open(folder_.path("threads"))->item(path)->item);
+    EXPECT_THAT(item.taggings, Contains(testing::Field(&IndexedTagging::label, "House")));
+    EXPECT_THAT(log.messages(), ElementsAre(HasSubstr(broken + ": ")));
 }
 
 TEST_F(Indexing, GoesOnWhereItWasKilled) {
@@ -490,6 +546,7 @@ TEST_F(Indexing, GoesOnWhereItWasKilled) {
         const pid_t child = ::fork();
         if (child == 0) {
             index([&](IndexOptions& options) {
+                useWorkers(options);
                 options.longestBatch = std::chrono::milliseconds(10);
                 options.progress = [&](const IndexProgress& at) {
                     if (at.described >= enough) milestone.reach();
@@ -510,6 +567,28 @@ TEST_F(Indexing, GoesOnWhereItWasKilled) {
     EXPECT_EQ(last.described, 2500 - stored);
     EXPECT_EQ(names().size(), 2500U);
     EXPECT_TRUE(ContentDatabase::open(database())->check());
+}
+
+TEST_F(Indexing, TakesItsWorkersWithItWhenItIsKilled) {
+    write("noted and hangs.wav", "");
+    settle();
+    const pid_t child = ::fork();
+    if (child == 0) {
+        index(useWorkers);
+        ::_exit(0);
+    }
+    std::string worker;
+    while (worker.empty()) worker = readAll(library() + "/noted and hangs.wav");
+    ::kill(child, SIGKILL);
+    ::waitpid(child, nullptr, 0);
+    // Gone, or waiting for whoever inherits it to ask how it ended.
+    const auto isGone = [&worker] {
+        const std::string status = readAll("/proc/" + worker + "/stat");
+        return status.empty() || status.find(") Z ") != std::string::npos;
+    };
+    for (int i = 0; i < 500 && !isGone(); ++i) std::this_thread::sleep_for(std::chrono::milliseconds(10));
+    EXPECT_TRUE(isGone());
+    if (!isGone()) ::kill(std::stoi(worker), SIGKILL);
 }
 
 TEST_F(Indexing, StopsWhenToldThoughNothingIsNew) {

@@ -2,6 +2,7 @@
 
 #include "demo/AudioFiles.h"
 #include "demo/Library.h"
+#include "support/Places.h"
 #include "support/TemporaryFolder.h"
 
 #include <atomic>
@@ -246,12 +247,16 @@ void indexWithNames(const std::string& folder, const std::string& database) {
     options.workers = 2;
     options.retryFailed = true;
     options.longestBatch = std::chrono::milliseconds(10);
+    options.worker.path = QVCT_INDEX_WORKER;
+    options.services = QVCTAutoTaggingOptionFilenameKeywords;
     Error error;
-    EXPECT_TRUE(contentdb::indexLibrary(
-        options,
-        [] { return std::make_unique<contentdb::ContentDescriber>(QVCTAutoTaggingOptionFilenameKeywords); },
-        &error))
-        << error.message;
+    EXPECT_TRUE(contentdb::indexLibrary(options, &error)) << error.message;
+    // And once more in threads of the host.
+    options.describer = 2;
+    const auto describer = [&options] {
+        return std::make_unique<contentdb::ContentDescriber>(options.services);
+    };
+    EXPECT_TRUE(contentdb::indexLibrary(options, describer, &error)) << error.message;
 }
 
 /// How many items it finds; opens the database anew, as a host does that was just started.
@@ -275,8 +280,7 @@ TEST(Threads, IndexSearchAndWriteAtOnce) {
     for (const URL& url : items)
         if (TGRTMetaDataWriterFactory::taggingWriterForURL(url)) taken.push_back(url);
     ASSERT_GT(taken.size(), 4U);
-    // What is made once is made before workers are forked; and there is something to be found from the start,
-    // however slow the machine is.
+    // Something is to be found from the start, however slow the machine is.
     tagAgain({taken[0]}, 1);
     indexWithNames(folder.path(), database);
     std::atomic<bool> isOver = false;

@@ -6,10 +6,10 @@
 #include "formats/ContentFolderWalk.h"
 #include "output/Progress.h"
 #include "output/StandardStreams.h"
+#include "platform/processes/Interruption.h"
 #include "platform/text/Text.h"
 
 #include <chrono>
-#include <csignal>
 #include <memory>
 
 #include <CLI/CLI.hpp>
@@ -25,16 +25,6 @@ struct Options {
     std::vector<std::string> services;
     unsigned secondsPerItem = 30;
 };
-
-volatile std::sig_atomic_t wasInterrupted = 0;
-
-/// Ctrl-C ends the run at the next batch; a second one ends the tool.
-void interruptGently() {
-    struct sigaction action {};
-    action.sa_handler = [](int) { wasInterrupted = 1; };
-    action.sa_flags = static_cast<int>(SA_RESETHAND);
-    ::sigaction(SIGINT, &action, nullptr);
-}
 
 Json jsonOfRun(const IndexOptions& options, const IndexProgress& progress, double seconds) {
     Json json;
@@ -73,9 +63,9 @@ std::uint64_t countItems(const std::string& folder, LinksOutside links) {
 void run(Options& options, ToolContext& context) {
     const auto services = optionsForServices(options.services, context);
     if (context.exitStatus() != 0) return;  // half of the services would mark the items as done
-    const auto factory = [&services] { return std::make_unique<contentdb::ContentDescriber>(services); };
     Progress bar(context.quiet);
     IndexOptions& index = options.index;
+    index.services = services;
     index.describer = contentdb::ContentDescriber::digest(services);
     index.timeLimitPerItem = std::chrono::seconds(options.secondsPerItem);
     std::uint64_t total = 0;
@@ -96,14 +86,14 @@ void run(Options& options, ToolContext& context) {
     std::vector<URL> passedOver;
     index.links.passedOver = [&passedOver](const URL& link) { passedOver.push_back(link); };
     interruptGently();
-    index.isCancelled = [] { return wasInterrupted != 0; };
+    index.isCancelled = wasInterrupted;
     Error error;
-    const auto progress = indexLibrary(index, factory, &error);
+    const auto progress = indexLibrary(index, &error);
     bar.hide();
     if (!progress) return context.itemFailed(error.message);
     context.notePassedOver(passedOver);
     printRun(jsonOfRun(index, *progress, bar.seconds()), *progress, context);
-    if (wasInterrupted != 0) context.itemFailed("interrupted; the next run goes on from here");
+    if (wasInterrupted()) context.itemFailed("interrupted; the next run goes on from here");
 }
 
 }  // namespace

@@ -5,8 +5,8 @@
 #include "autotagging/scripts/ScriptValues.h"
 #include "autotagging/xml/QVCTXMLDocument.h"
 #include "autotagging/xml/XPathDeadline.h"
-#include "platform/base/HardLimit.h"
 #include "platform/base/Log.h"
+#include "platform/processes/HardLimit.h"
 #include "platform/text/Text.h"
 
 #include <string>

@@ -3,9 +3,9 @@
 #include "formats/ItemFile.h"
 #include "formats/settings/CFBinaryPlistFindTrailer.h"
 #include "platform/base/Log.h"
-#include "platform/base/ProcessArguments.h"
 #include "platform/data/PropertyListFile.h"
 #include "platform/files/FileAccess.h"
+#include "platform/processes/ProcessArguments.h"
 #include "platform/text/Text.h"
 
 #include <algorithm>

@@ -1,5 +1,6 @@
 #include "platform/files/ResourceBundle.h"
 
+#include "platform/base/ImagePath.h"
 #include "platform/files/FileAccess.h"
 
 #include <cstdlib>
@@ -7,9 +8,7 @@
 #include <map>
 #include <utility>
 
-#include <dlfcn.h>
 #include <fmt/format.h>
-#include <link.h>
 
 namespace qvct {
 namespace {
@@ -24,20 +23,10 @@ std::map<std::string, std::optional<std::string>>& chosenPaths() {
     return paths;
 }
 
-/// The file that this code was loaded from: the shared library, or the program.
-std::filesystem::path imagePath() {
-    Dl_info image{};
-    link_map* map = nullptr;
-    const auto* code = reinterpret_cast<const void*>(&ResourceBundle::directory);
-    if (::dladdr1(code, &image, reinterpret_cast<void**>(&map), RTLD_DL_LINKMAP) == 0) return {};
-    const bool isProgram = *map->l_name == '\0';
-    std::error_code ignored;
-    return std::filesystem::canonical(isProgram ? "/proc/self/exe" : map->l_name, ignored);
-}
-
 std::string installedDirectory() {
     static const std::string directory = [] {
-        const std::filesystem::path folder = imagePath().parent_path();
+        const auto* code = reinterpret_cast<const void*>(&ResourceBundle::directory);
+        const std::filesystem::path folder = imagePath(code).parent_path();
         std::error_code ignored;
         for (const char* place : {QVCT_RESOURCES_FROM_LIBRARY, QVCT_RESOURCES_FROM_PROGRAM}) {
             const auto resources = (folder / place).lexically_normal();

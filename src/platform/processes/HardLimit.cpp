@@ -1,4 +1,4 @@
-#include "platform/base/HardLimit.h"
+#include "platform/processes/HardLimit.h"
 
 #include <array>
 #include <atomic>

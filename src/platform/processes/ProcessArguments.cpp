@@ -1,4 +1,4 @@
-#include "platform/base/ProcessArguments.h"
+#include "platform/processes/ProcessArguments.h"
 
 #include <algorithm>
 #include <fstream>

@@ -1,5 +1,7 @@
 #pragma once
 
+#include "platform/base/Export.h"
+
 #include <chrono>
 #include <cstddef>
 #include <string>
@@ -13,7 +15,7 @@ namespace qvct {
 /// Does nothing in processes that did not ask for it: a library must not end its host. One inside another
 /// changes nothing. Use it from one thread at a time.
 /// @cost  Some microseconds.
-class HardLimit {
+class QVCT_API HardLimit {
   public:
     /// For programs of our own, where a run or a worker may be lost. Takes the signal SIGALRM and the
     /// process's interval timer. `prepare` is called before each work, to write what must not be lost.

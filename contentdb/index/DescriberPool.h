@@ -1,0 +1,45 @@
+#pragma once
+
+#include "contentdb/IndexedItem.h"
+
+#include <cstdint>
+#include <functional>
+#include <string>
+#include <vector>
+
+namespace qvct::contentdb {
+
+/// An item that is to be described. Later ones have higher tickets.
+struct ItemTask {
+    std::uint64_t ticket = 0;
+    std::string path;
+    ItemStamp stamp;
+};
+
+/// A described item, or a failed one, with its index terms.
+struct Described {
+    std::uint64_t ticket = 0;
+    IndexedItem item;
+    std::vector<std::string> terms;
+};
+
+/// What the describer makes of the item; a failed item where it makes nothing of it.
+Described describedBy(ItemDescriber& describer, const ItemTask& task);
+
+/// Those who describe the items of a run, several at a time.
+class DescriberPool {
+  public:
+    virtual ~DescriberPool() = default;
+
+    /// Whether another item can be taken without more memory than a bounded queue.
+    virtual bool hasRoom() const = 0;
+    virtual void submit(ItemTask task) = 0;
+    /// Whether items are on their way.
+    virtual bool isBusy() const = 0;
+    /// Waits a little for what is ready and calls `take` for each, in any order. False when nothing can be
+    /// described any more; `problem` is the reason then.
+    virtual bool collect(const std::function<void(Described)>& take) = 0;
+    virtual std::string problem() const = 0;
+};
+
+}  // namespace qvct::contentdb

@@ -1,0 +1,48 @@
+#pragma once
+
+#include "contentdb/index/DescriberPool.h"
+
+#include <condition_variable>
+#include <deque>
+#include <mutex>
+#include <thread>
+
+namespace qvct::contentdb {
+
+/// Describes items in threads of this process, each with a describer of its own. What crashes or hangs one of
+/// them does so to the process.
+class DescriberThreads : public DescriberPool {
+  public:
+    DescriberThreads(DescriberFactory factory, unsigned threads);
+    DescriberThreads(const DescriberThreads&) = delete;
+    DescriberThreads& operator=(const DescriberThreads&) = delete;
+    /// Waits for the items that the threads are at.
+    ~DescriberThreads() override;
+
+    bool hasRoom() const override;
+    void submit(ItemTask task) override;
+    bool isBusy() const override;
+    bool collect(const std::function<void(Described)>& take) override;
+    std::string problem() const override;
+
+  private:
+    void start();
+    void work();
+    void describeAll(ItemDescriber& describer);
+    void give(std::string problem);
+
+    DescriberFactory factory_;
+    const unsigned threads_;
+    std::vector<std::thread> running_;
+
+    mutable std::mutex mutex_;
+    std::condition_variable hasTask_;
+    std::condition_variable hasResult_;
+    std::deque<ItemTask> waiting_;
+    std::vector<Described> ready_;
+    std::size_t onTheirWay_ = 0;  ///< Submitted and not yet taken.
+    std::string problem_;
+    bool isOver_ = false;
+};
+
+}  // namespace qvct::contentdb

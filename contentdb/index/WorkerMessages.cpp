@@ -1,0 +1,96 @@
+#include "contentdb/index/WorkerMessages.h"
+
+#include "contentdb/store/ItemCodec.h"
+
+#include <chrono>
+
+namespace qvct::contentdb {
+namespace {
+
+constexpr std::size_t kLengthBytes = 4;
+
+}  // namespace
+
+static_assert(std::atomic<std::int64_t>::is_always_lock_free, "other processes see no lock of ours");
+
+std::int64_t WorkerStatus::now() {
+    return std::chrono::nanoseconds(std::chrono::steady_clock::now().time_since_epoch()).count();
+}
+
+void appendMessage(std::string& stream, std::string_view message) {
+    for (std::size_t i = 0; i < kLengthBytes; ++i)
+        stream += static_cast<char>(message.size() >> (8 * i) & 0xFFU);
+    stream += message;
+}
+
+bool nextMessage(std::string_view stream, std::size_t& at, std::string_view& message) {
+    if (stream.size() - at < kLengthBytes) return false;
+    std::size_t size = 0;
+    for (std::size_t i = kLengthBytes; i > 0; --i)
+        size = size << 8U | static_cast<unsigned char>(stream[at + i - 1]);
+    if (stream.size() - at - kLengthBytes < size) return false;
+    message = stream.substr(at + kLengthBytes, size);
+    at += kLengthBytes + size;
+    return true;
+}
+
+std::string encodedTask(const ItemTask& task) {
+    ByteWriter out;
+    out.number(task.ticket);
+    out.text(task.path);
+    out.stamp(task.stamp);
+    return out.take();
+}
+
+ItemTask decodedTask(std::string_view message) {
+    ByteReader in(message);
+    ItemTask task;
+    task.ticket = in.number();
+    task.path = in.text();
+    task.stamp = in.stamp();
+    return task;
+}
+
+std::string encodedReport(WorkerReport::Kind kind, std::string_view text) {
+    ByteWriter out;
+    out.number(static_cast<std::uint64_t>(kind));
+    out.text(text);
+    return out.take();
+}
+
+std::string encodedReport(const Described& described) {
+    const IndexedItem& item = described.item;
+    ByteWriter out;
+    out.number(static_cast<std::uint64_t>(WorkerReport::Kind::described));
+    out.number(described.ticket);
+    out.text(item.path);
+    out.stamp(item.stamp);
+    out.text(item.payloadHash);
+    out.text(encodedDescription(item));
+    out.number(described.terms.size());
+    for (const std::string& term : described.terms) out.text(term);
+    return out.take();
+}
+
+std::optional<WorkerReport> decodedReport(std::string_view message) {
+    ByteReader in(message);
+    WorkerReport report;
+    const std::uint64_t kind = in.number();
+    if (kind > static_cast<std::uint64_t>(WorkerReport::Kind::logged)) return std::nullopt;
+    report.kind = static_cast<WorkerReport::Kind>(kind);
+    bool isWhole = true;
+    if (report.kind == WorkerReport::Kind::described) {
+        Described& described = report.described;
+        described.ticket = in.number();
+        described.item.path = in.text();
+        described.item.stamp = in.stamp();
+        described.item.payloadHash = in.text();
+        isWhole = decodeDescription(in.text(), described.item);
+        for (std::size_t left = in.count(); left > 0; --left) described.terms.emplace_back(in.text());
+    } else {
+        report.text = in.text();
+    }
+    return isWhole && in.isIntact() && in.isAtEnd() ? std::optional(std::move(report)) : std::nullopt;
+}
+
+}  // namespace qvct::contentdb

@@ -1,0 +1,32 @@
+#include "contentdb/index/WorkerSettings.h"
+
+#include "contentdb/store/ItemCodec.h"
+#include "platform/files/ResourceBundle.h"
+#include "resources/ReplacementFile.h"
+
+#include <optional>
+
+namespace qvct::contentdb {
+
+std::string encodedWorkerSettings() {
+    ByteWriter out;
+    out.text(ResourceBundle::directory());
+    for (const ResourceFile& resource : kResourceFiles) {
+        // Decided here, so that every worker takes the same, and a broken file is told once.
+        const auto path = replacementFile(resource);
+        out.text(path.value_or(std::string()));
+    }
+    return out.take();
+}
+
+void applyWorkerSettings(std::string_view settings) {
+    ByteReader in(settings);
+    ResourceBundle::setDirectory(std::string(in.text()));
+    for (const ResourceFile& resource : kResourceFiles) {
+        const std::string path(in.text());
+        ResourceBundle::setPathForResource(resource.name, resource.extension,
+                                           path.empty() ? std::nullopt : std::optional(path));
+    }
+}
+
+}  // namespace qvct::contentdb

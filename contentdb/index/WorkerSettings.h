@@ -1,0 +1,13 @@
+#pragma once
+
+#include <string>
+#include <string_view>
+
+namespace qvct::contentdb {
+
+/// What was set in this process and counts in its workers, too: the files that replace resources.
+std::string encodedWorkerSettings();
+/// Sets the same in this process. To be called before anything reads a resource.
+void applyWorkerSettings(std::string_view settings);
+
+}  // namespace qvct::contentdb

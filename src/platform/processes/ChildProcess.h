@@ -1,0 +1,66 @@
+#pragma once
+
+#include "platform/base/Error.h"
+#include "platform/files/FileDescriptor.h"
+#include "platform/processes/SharedMemory.h"
+
+#include <chrono>
+#include <cstddef>
+#include <memory>
+#include <span>
+#include <string>
+#include <vector>
+
+namespace qvct {
+
+/// How a process came to its end.
+struct ProcessEnd {
+    int status = 0;      ///< What it answered.
+    std::string signal;  ///< The signal that ended it, in the system's words; empty for none.
+};
+
+/// A program of our own that runs beside this process, and no longer than it. Both send bytes to each other,
+/// and see one stretch of memory; `ParentProcess` is the other end.
+///
+/// It is a new process image, not a copy of this one: whatever locks other threads have at that moment, it
+/// can do its work. It has this process's environment, current folder and standard error, and no other file.
+class ChildProcess {
+  public:
+    /// With `memory` bytes to be seen by both. Null, and an error, when it cannot be started.
+    static std::unique_ptr<ChildProcess> start(const std::string& program,
+                                               const std::vector<std::string>& arguments, std::size_t memory,
+                                               Error* error);
+    ChildProcess(const ChildProcess&) = delete;
+    ChildProcess& operator=(const ChildProcess&) = delete;
+    /// Ends it.
+    ~ChildProcess();
+
+    /// Sends what is taken at once, and removes it from the beginning of `bytes`.
+    void send(std::string& bytes);
+    /// Appends what has arrived, without waiting. False when nothing will arrive any more.
+    bool receive(std::string& bytes);
+    void* memory() const { return memory_.address(); }
+
+    /// Ends it without asking; `end` then tells of it.
+    void kill();
+    /// Waits until it is gone, which it is at once: it is ended unless it is about to end by itself.
+    ProcessEnd end();
+
+    struct Awaited {
+        const ChildProcess* process;
+        bool hasToSend;
+    };
+    /// Waits until there is something to receive from one of them, or one takes what is to be sent to it; not
+    /// longer than `patience`.
+    static void await(std::span<const Awaited> processes, std::chrono::milliseconds patience);
+
+  private:
+    ChildProcess(int id, FileDescriptor socket, SharedMemory memory)
+        : id_(id), socket_(std::move(socket)), memory_(std::move(memory)) {}
+
+    int id_;  ///< 0 when it is gone.
+    FileDescriptor socket_;
+    SharedMemory memory_;
+};
+
+}  // namespace qvct

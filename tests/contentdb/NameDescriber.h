@@ -1,0 +1,70 @@
+#pragma once
+
+#include "contentdb/IndexedItem.h"
+#include "platform/base/Log.h"
+#include "platform/files/FileAccess.h"
+#include "platform/text/Url.h"
+#include "support/RunTool.h"
+#include "taxonomy/TaggingTypes.h"
+
+#include <chrono>
+#include <csignal>
+#include <filesystem>
+#include <fstream>
+#include <optional>
+#include <stdexcept>
+#include <string>
+#include <thread>
+
+#include <unistd.h>
+
+namespace qvct::test {
+
+/// Describes a file by its name and bytes; some names make it fail, crash or hang.
+class NameDescriber : public contentdb::ItemDescriber {
+  public:
+    std::optional<contentdb::IndexedItem> describe(const std::string& path, Error* error) override {
+        const URL url = URL::fileURLWithPath(path);
+        contentdb::IndexedItem item;
+        item.name = url.lastPathComponentWithoutExtension();
+        const auto is = [&item](std::string_view word) { return item.name.find(word) != std::string::npos; };
+        if (is("vanishes")) std::filesystem::remove(path);
+        if (is("fails") || !std::filesystem::exists(path)) {
+            qvct::fail(error, kErrorMalformed, "it is broken");
+            return std::nullopt;
+        }
+        if (is("logs")) log("about " + item.name);
+        if (is("tells")) item.title = openFiles();
+        if (is("crashes")) {
+            ::signal(SIGSEGV, SIG_DFL);  // a sanitizer would report it and exit
+            ::raise(SIGSEGV);
+        }
+        if (is("exits")) ::_exit(3);
+        if (is("noted")) std::ofstream(path) << ::getpid();
+        if (is("hangs")) std::this_thread::sleep_for(std::chrono::hours(1));
+        if (is("throws")) throw std::runtime_error("out of luck");
+        if (is("slow")) std::this_thread::sleep_for(std::chrono::milliseconds(2));
+        item.fileType = kFileTypeAudioFile;
+        const std::filesystem::path folder = std::filesystem::path(path).parent_path();
+        if (std::filesystem::remove(folder / "leaves")) std::filesystem::rename(folder, folder / "../away");
+        if (!isDirectory(path)) item.payloadHash = readAll(path);
+        if (item.payloadHash == "before") std::ofstream(path) << "after!";
+        item.taggings = {{"Drums", "Source", {}, {}, contentdb::Provenance::automatic, "names"}};
+        return item;
+    }
+
+  private:
+    /// What this process has open, apart from standard error.
+    static std::string openFiles() {
+        std::string targets;
+        for (int file = 0; file < 1000; ++file) {
+            std::error_code isNotOpen;
+            const auto target =
+                std::filesystem::read_symlink("/proc/self/fd/" + std::to_string(file), isNotOpen);
+            if (!isNotOpen && file != STDERR_FILENO) targets += target.string().substr(0, 7) + ' ';
+        }
+        return targets;
+    }
+};
+
+}  // namespace qvct::test
