@@ -1,16 +1,16 @@
 #include "contentdb/index/IndexRun.h"
 
 #include "contentdb/terms/Terms.h"
+#include "platform/files/EntryStatus.h"
 #include "platform/files/FileAccess.h"
 #include "platform/files/Paths.h"
 #include "platform/text/Text.h"
 
 #include <algorithm>
-#include <ctime>
+#include <chrono>
 #include <utility>
 
 #include <fmt/format.h>
-#include <sys/stat.h>
 
 namespace qvct::contentdb {
 namespace {
@@ -27,10 +27,7 @@ constexpr std::int64_t kTick = 20'000'000;
 constexpr std::int64_t kClockSkew = 2'000'000'000;
 
 std::int64_t wallNanoseconds() {
-    timespec now{};
-    ::clock_gettime(CLOCK_REALTIME, &now);
-    constexpr std::int64_t second = 1'000'000'000;
-    return now.tv_sec * second + now.tv_nsec;
+    return std::chrono::nanoseconds(std::chrono::system_clock::now().time_since_epoch()).count();
 }
 
 bool isAtOrBelow(std::string_view path, std::string_view folder) {
@@ -46,9 +43,9 @@ bool isBelow(std::string_view path, const Folders& folders) {
 
 /// Device and inode of a folder, links followed.
 std::optional<std::pair<std::uint64_t, std::uint64_t>> inodeOf(const std::string& path) {
-    struct stat status {};
-    if (::stat(path.c_str(), &status) != 0) return std::nullopt;
-    return std::pair<std::uint64_t, std::uint64_t>(status.st_dev, status.st_ino);
+    EntryStatus status;
+    if (lookAt(path, Links::follow, status) != Presence::there) return std::nullopt;
+    return std::pair(status.device, status.inode);
 }
 
 }  // namespace

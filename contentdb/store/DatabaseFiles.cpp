@@ -1,22 +1,16 @@
 #include "contentdb/store/DatabaseFiles.h"
 
 #include "contentdb/store/Sqlite.h"
+#include "platform/files/EmptyFile.h"
 #include "platform/files/FileAccess.h"
-#include "platform/files/FileDescriptor.h"
 #include "platform/files/FileReplacement.h"
-#include "platform/text/Text.h"
 
-#include <cerrno>
-#include <cstring>
 #include <filesystem>
 #include <fstream>
 #include <string_view>
 #include <system_error>
 
-#include <fcntl.h>
 #include <fmt/format.h>
-#include <sys/stat.h>
-#include <unistd.h>
 
 namespace qvct::contentdb {
 namespace {
@@ -59,17 +53,8 @@ std::string pathOfDatabase(const std::string& name) {
 }
 
 void makeEmptyLike(const std::string& model, const std::string& path) {
-    struct stat status {};
-    const bool isThere = ::stat(model.c_str(), &status) == 0;
-    const mode_t mode = isThere ? status.st_mode & 0777U : 0666U;
-    const FileDescriptor file(::open(path.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, mode));
-    const bool isMade = file.isOpen() && (!isThere || ::fchmod(file.number(), mode) == 0);
-    if (!isMade) {
-        throw DatabaseFailure(kErrorUnwritable,
-                              fmt::format("{}: cannot be made: {}", printable(path), std::strerror(errno)));
-    }
-    if (isThere) [[maybe_unused]]
-        const int ignored = ::fchown(file.number(), status.st_uid, status.st_gid);
+    Error error;
+    if (!makeEmptyFileLike(model, path, &error)) throw DatabaseFailure(kErrorUnwritable, error.message);
 }
 
 bool isMarkedAsContentDatabase(const std::string& path) {

@@ -7,13 +7,10 @@
 #include "platform/text/Text.h"
 
 #include <array>
-#include <cerrno>
 #include <cstdint>
-#include <cstring>
 #include <filesystem>
 
 #include <fmt/format.h>
-#include <unistd.h>
 
 namespace qvct::contentdb {
 namespace {
@@ -145,7 +142,7 @@ std::unique_ptr<Connection> openForReading(const std::string& path) {
         const bool isOfFolder = failure.code() == kErrorUnreadable || failure.code() == kErrorUnwritable;
         std::error_code ignored;
         const std::string folder = std::filesystem::absolute(path, ignored).parent_path().string();
-        if (!isOfFolder || ::access(path.c_str(), R_OK) != 0 || ::access(folder.c_str(), W_OK) == 0) throw;
+        if (!isOfFolder || !mayRead(path) || mayWrite(folder)) throw;
     }
     if (fileExists(path + "-wal") && std::filesystem::file_size(path + "-wal") > 0) {
         refuse(path, kErrorUnreadable,
@@ -170,7 +167,8 @@ std::unique_ptr<Connection> openDatabase(const std::string& path, Access access)
     const bool exists = fileExists(path);
     if (!exists && access == Access::read) refuse(path, kErrorUnreadable, "there is no such database");
     if (access == Access::write && (!exists || isEmptyFile(path))) create(path);
-    if (::access(path.c_str(), R_OK) != 0) refuse(path, kErrorUnreadable, std::strerror(errno));
+    Error error;
+    if (!mayRead(path, &error)) throw DatabaseFailure(kErrorUnreadable, error.message);
     if (!isMarkedAsContentDatabase(path)) {
         refuse(path, kErrorInvalidArgument,
                "not a content database, or one whose beginning is damaged; if it was one, move it away and "

@@ -4,15 +4,14 @@
 #include "contentdb/terms/Terms.h"
 #include "contentdb/terms/Words.h"
 #include "formats/QVContentTaggingTypes.h"
+#include "platform/files/EntryStatus.h"
 #include "platform/files/Paths.h"
 #include "platform/text/Text.h"
 #include "platform/text/Url.h"
 
 #include <algorithm>
-#include <cerrno>
 
 #include <fmt/format.h>
-#include <sys/stat.h>
 
 namespace qvct::contentdb {
 namespace {
@@ -24,10 +23,10 @@ constexpr std::size_t kMostCachedTerms = 200000;
 constexpr int kMostCandidates = 16;
 
 /// Whether what lies there is of the kind that the name promises.
-bool isItem(const std::string& path, const struct stat& status) {
+bool isItem(const std::string& path, EntryKind kind) {
     const auto type = QVContentTaggingTypes::fallBackFileTypeForURL(URL::fileURLWithPath(path));
-    return type == kFileTypePatch || type == kFileTypeProject ? S_ISDIR(status.st_mode)
-                                                              : S_ISREG(status.st_mode);
+    const bool isBundle = type == kFileTypePatch || type == kFileTypeProject;
+    return kind == (isBundle ? EntryKind::folder : EntryKind::file);
 }
 
 std::string candidatesWhere(std::string_view condition) {
@@ -40,15 +39,16 @@ std::string candidatesWhere(std::string_view condition) {
 }  // namespace
 
 bool isGone(const std::string& path) {
-    struct stat status {};
-    if (::lstat(path.c_str(), &status) == 0)
-        return ::stat(path.c_str(), &status) == 0 && !isItem(path, status);
-    if (errno != ENOENT && errno != ENOTDIR) return false;
+    EntryStatus status;
+    const Presence presence = lookAt(path, Links::keep, status);
+    if (presence == Presence::there)
+        return lookAt(path, Links::follow, status) == Presence::there && !isItem(path, status.kind);
+    if (presence == Presence::unknown) return false;
     // What is nearest to it decides: a link there would lead to it, were there something behind it.
     for (std::string_view above = placeOf(path).folder; !above.empty(); above = placeOf(above).folder) {
         const std::string nearest(above);
-        if (::lstat(nearest.c_str(), &status) != 0) continue;
-        return !S_ISLNK(status.st_mode) || ::stat(nearest.c_str(), &status) == 0;
+        if (lookAt(nearest, Links::keep, status) != Presence::there) continue;
+        return status.kind != EntryKind::link || lookAt(nearest, Links::follow, status) == Presence::there;
     }
     return true;
 }

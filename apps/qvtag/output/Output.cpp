@@ -1,6 +1,7 @@
 #include "output/Output.h"
 
 #include "output/StandardStreams.h"
+#include "platform/processes/StandardStreams.h"
 #include "platform/text/Decimal.h"
 #include "platform/text/Text.h"
 
@@ -11,18 +12,14 @@
 #include <tuple>
 
 #include <fmt/format.h>
-#include <sys/ioctl.h>
-#include <unistd.h>
 
 namespace qvct::tool {
 
 Terminal Terminal::ofStandardOutput() {
     Terminal terminal;
-    if (::isatty(STDOUT_FILENO) == 0) return terminal;
-    winsize size{};
+    if (!isTerminal(StandardStream::output)) return terminal;
     constexpr std::size_t usual = 80;
-    const bool isKnown = ::ioctl(STDOUT_FILENO, TIOCGWINSZ, &size) == 0 && size.ws_col > 0;
-    terminal.width = isKnown ? size.ws_col : usual;
+    terminal.width = columnsOf(StandardStream::output).value_or(usual);
     terminal.hasColor = std::getenv("NO_COLOR") == nullptr;
     return terminal;
 }

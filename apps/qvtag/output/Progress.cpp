@@ -1,13 +1,13 @@
 #include "output/Progress.h"
 
 #include "output/StandardStreams.h"
+#include "platform/processes/StandardStreams.h"
 
 #include <algorithm>
 #include <cmath>
 #include <string>
 
 #include <fmt/format.h>
-#include <unistd.h>
 
 namespace qvct::tool {
 namespace {
@@ -23,7 +23,7 @@ std::string duration(double seconds) {
 }  // namespace
 
 Progress::Progress(bool isQuiet)
-    : start_(std::chrono::steady_clock::now()), isShown_(!isQuiet && ::isatty(STDERR_FILENO) != 0) {}
+    : start_(std::chrono::steady_clock::now()), isShown_(!isQuiet && isTerminal(StandardStream::error)) {}
 
 double Progress::seconds() const {
     return std::chrono::duration<double>(std::chrono::steady_clock::now() - start_).count();

@@ -1,12 +1,10 @@
 #include "output/StandardStreams.h"
 
+#include "platform/processes/StandardStreams.h"
+
 #include <cerrno>
-#include <csignal>
 #include <cstdio>
 #include <cstring>
-
-#include <fcntl.h>
-#include <unistd.h>
 
 namespace qvct::tool {
 namespace {
@@ -20,13 +18,8 @@ void keepLoss() {
 }  // namespace
 
 void prepareStandardStreams() {
-    for (const int stream : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO}) {
-        // Against its direction, so that its use fails as on a closed one. It gets the lowest free number,
-        // which is this one.
-        if (::fcntl(stream, F_GETFD) < 0)
-            static_cast<void>(::open("/dev/null", stream == STDIN_FILENO ? O_WRONLY : O_RDONLY));
-    }
-    std::signal(SIGPIPE, SIG_IGN);
+    openStandardStreams();
+    ignoreBrokenPipes();
 }
 
 void printText(std::string_view text) {
@@ -51,7 +44,7 @@ bool isOutputLost() {
 bool finishOutput() {
     flushOutput();
     errno = 0;
-    if (::close(STDOUT_FILENO) != 0) keepLoss();  // some file systems tell of a full disk only now
+    if (!closeStream(StandardStream::output)) keepLoss();
     if (lossOfOutput != 0 && lossOfOutput != EPIPE)
         printError("qvtag: standard output: {}\n", std::strerror(lossOfOutput));
     return lossOfOutput == 0;

@@ -5,13 +5,11 @@
 #include "media/loopfile/containers/LoopDataFile.h"
 #include "platform/data/PropertyListFile.h"
 #include "platform/files/EditLock.h"
+#include "platform/files/EntryStatus.h"
 #include "platform/files/FileReplacement.h"
 #include "platform/text/Text.h"
 
-#include <cerrno>
-
 #include <fmt/format.h>
-#include <sys/stat.h>
 
 namespace qvct {
 namespace {
@@ -69,8 +67,8 @@ bool makeLoopDataFile(const std::string& path, const std::string& record, const 
 }
 
 bool isMissing(const std::string& path) {
-    struct stat status {};
-    return ::stat(path.c_str(), &status) != 0 && errno == ENOENT;
+    EntryStatus status;
+    return lookAt(path, Links::follow, status) == Presence::absent;
 }
 
 }  // namespace

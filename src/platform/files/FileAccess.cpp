@@ -46,6 +46,14 @@ bool isRegularFile(const std::string& path) {
     return statOf(path, status) && S_ISREG(status.st_mode);
 }
 
+bool mayRead(const std::string& path, Error* error) {
+    return ::access(path.c_str(), R_OK) == 0 || failWithErrno(error, kErrorUnreadable, path);
+}
+
+bool mayWrite(const std::string& path) {
+    return ::access(path.c_str(), W_OK) == 0;
+}
+
 FileDescriptor openRegularFile(const std::string& path, Error* error, struct stat* status) {
     if (isURLText(path)) {
         failFor(error, kErrorInvalidArgument, path, "is no file URL");

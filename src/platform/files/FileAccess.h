@@ -22,6 +22,12 @@ bool fileExists(const std::string& path);
 bool isDirectory(const std::string& path);
 bool isRegularFile(const std::string& path);
 
+/// Whether this user may read the file; else an error. Whether there is anything to be read is another
+/// matter.
+bool mayRead(const std::string& path, Error* error = nullptr);
+/// Whether this user may write it, or make files in it if it is a folder.
+bool mayWrite(const std::string& path);
+
 /// Opens a regular file to be read, without ever waiting; with `status`, tells what the system knows of it.
 /// None, and an error: no such file, a folder, a pipe or a device.
 FileDescriptor openRegularFile(const std::string& path, Error* error = nullptr,

@@ -15,32 +15,13 @@
 namespace qvct {
 namespace {
 
-EntryKind kindOf(mode_t mode) {
-    if (S_ISREG(mode)) return EntryKind::file;
-    if (S_ISDIR(mode)) return EntryKind::folder;
-    return S_ISLNK(mode) ? EntryKind::link : EntryKind::other;
-}
-
-std::int64_t nanoseconds(const timespec& time) {
-    constexpr std::int64_t second = 1'000'000'000;
-    return time.tv_sec * second + time.tv_nsec;
-}
-
-EntryStatus statusOf(const struct stat& status) {
-    return {kindOf(status.st_mode),
-            status.st_dev,
-            status.st_ino,
-            static_cast<std::uint64_t>(status.st_size),
-            nanoseconds(status.st_mtim),
-            nanoseconds(status.st_ctim)};
-}
-
 /// Some file systems do not tell the kind in their lists.
 EntryKind kindOf(int folder, const dirent& entry) {
     struct stat status {};
-    if (entry.d_type != DT_UNKNOWN) return kindOf(DTTOIF(entry.d_type));
-    const bool isThere = ::fstatat(folder, entry.d_name, &status, AT_SYMLINK_NOFOLLOW) == 0;
-    return isThere ? kindOf(status.st_mode) : EntryKind::other;
+    status.st_mode = DTTOIF(entry.d_type);
+    const bool isThere =
+        entry.d_type != DT_UNKNOWN || ::fstatat(folder, entry.d_name, &status, AT_SYMLINK_NOFOLLOW) == 0;
+    return isThere ? EntryStatus::of(status).kind : EntryKind::other;
 }
 
 }  // namespace
@@ -100,14 +81,14 @@ std::span<const FolderListing::Entry> FolderListing::entriesThatBegin(std::strin
 
 EntryStatus FolderListing::status() const {
     struct stat status {};
-    return ::fstat(descriptor(), &status) == 0 ? statusOf(status) : EntryStatus{};
+    return ::fstat(descriptor(), &status) == 0 ? EntryStatus::of(status) : EntryStatus{};
 }
 
 std::optional<EntryStatus> FolderListing::status(const Entry& entry, Links links, std::string_view path,
                                                  Error* error) const {
     struct stat status {};
     const int kept = links == Links::keep ? AT_SYMLINK_NOFOLLOW : 0;
-    if (::fstatat(descriptor(), entry.name.data(), &status, kept) == 0) return statusOf(status);
+    if (::fstatat(descriptor(), entry.name.data(), &status, kept) == 0) return EntryStatus::of(status);
     fail(error, kErrorUnreadable,
          fmt::format("{}/{}: {}", printable(path), printable(entry.name), std::strerror(errno)));
     return std::nullopt;

@@ -1,8 +1,8 @@
 #pragma once
 
 #include "platform/base/Error.h"
+#include "platform/files/EntryStatus.h"
 
-#include <cstdint>
 #include <memory>
 #include <optional>
 #include <span>
@@ -13,26 +13,6 @@
 #include <dirent.h>
 
 namespace qvct {
-
-/// What stands under a name.
-enum class EntryKind : unsigned char {
-    file,
-    folder,
-    link,
-    other  ///< A pipe, a socket or a device.
-};
-
-/// What the system says of an entry. Times are nanoseconds since 1970.
-struct EntryStatus {
-    EntryKind kind = EntryKind::other;
-    std::uint64_t device = 0;
-    std::uint64_t inode = 0;
-    std::uint64_t size = 0;
-    std::int64_t modified = 0;
-    std::int64_t changed = 0;
-};
-
-enum class Links { follow, keep };
 
 /// The names in a folder, sorted by their bytes, without those that begin with a dot. The folder stays open
 /// as long as the listing lives, so that its entries are found in it, wherever it is moved meanwhile.
