@@ -8,6 +8,8 @@
 #include "support/Corpus.h"
 #include "support/TemporaryFolder.h"
 
+#include <functional>
+
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
@@ -155,6 +157,61 @@ TEST(LoopFileWrite, TheRecordGoesBehindTheAudioExceptWhereTheAudioIsOpenEnded) {
     EXPECT_LT(contentsOf(closed).find(audio), contentsOf(closed).find("bplist"));
     EXPECT_GT(contentsOf(open).find(audio), contentsOf(open).find("bplist"));
     EXPECT_TRUE(contentsOf(open).ends_with(audio));
+}
+
+/// Other versions and other programs may have put our record anywhere.
+TEST(LoopFileWrite, ARecordBeforeOrBetweenTheAudioIsReplacedWithoutTouchingTheSound) {
+    const Wav wav;
+    struct {
+        const char* name;
+        std::function<std::string(const std::string&)> file;
+        std::size_t first;  // place of a record among the chunks
+        std::vector<std::string> chunks;
+    } const kinds[] = {
+        {"a.wav",
+         [&wav](const std::string& chunks) { return wav.file(chunks); },
+         0,
+         {wav.format(), wav.chunk("odd ", "abc"), wav.data(), wav.cues({5, 9})}},
+        {"a.aif",
+         [](const std::string& chunks) { return Aiff::file(chunks); },
+         0,
+         {Aiff::common(), Aiff::chunk("NAME", "Sea"), Aiff::sound(), Aiff::chunk("APPL", "otherdata")}},
+        {"a.caf",
+         [](const std::string& chunks) { return Caf::file(chunks); },
+         1,
+         {Caf::description(), Caf::chunk("free", "xyz"), Caf::data(4001),
+          Caf::chunk("uuid", test::noise(40))}}};
+    for (const auto& kind : kinds) {
+        const auto fileWith = [&kind](std::size_t place, const std::string& record) {
+            std::string chunks;
+            for (std::size_t i = 0; i <= kind.chunks.size(); ++i) {
+                if (i == place) chunks += record;
+                if (i < kind.chunks.size()) chunks += kind.chunks[i];
+            }
+            return kind.file(chunks);
+        };
+        const TemporaryFolder folder;
+        const std::string plain = fileWith(0, "");
+        const std::string appended = folder.write(kind.name, plain);
+        const auto samples = samplesOf(appended);
+        ASSERT_TRUE(!samples.empty() && tag(appended));
+        const std::string record = contentsOf(appended).substr(plain.size());
+        for (std::size_t place = kind.first; place <= kind.chunks.size(); ++place) {
+            SCOPED_TRACE(std::string(kind.name) + ", place " + std::to_string(place));
+            const std::string path = folder.write(kind.name, fileWith(place, record));
+            ASSERT_EQ(read(path)->taggingDictionary(), kTagging);
+            for (const std::size_t length : {5000, 1, 200}) {
+                const auto data = read(path);
+                data->setDisplayName(std::string(length, 'n'));
+                Error error;
+                ASSERT_TRUE(write(path, data, &error, {})) << error.message;
+                EXPECT_EQ(read(path)->displayName(), data->displayName());
+                EXPECT_EQ(samplesOf(path), samples);
+            }
+            ASSERT_TRUE(untag(path));
+            EXPECT_TRUE(contentsOf(path) == plain);
+        }
+    }
 }
 
 /// Sizes and pad bytes that others write wrong, where all bytes are accounted for: afterwards they are right,
