@@ -46,6 +46,7 @@ bool tagAll(const std::string& folder, const TGRTTaxonomy& taxonomy, Error& erro
                 std::cout << ' ' << tagging->label();
             std::cout << '\n';
             isDone = store(taxonomy.findTagForLabel("Cinematic", "Genres"), url, error) && isDone;
+            return true;
         },
         [&](const Error& failure) {
             error = failure;

@@ -29,7 +29,9 @@ class QVCT_API ContentItem {
         std::shared_ptr<TGRTTaxonomy> taxonomy;
     };
 
+    /// With the stored record alone, its labels resolved in the shared writable default taxonomy.
     explicit ContentItem(URL url);
+    /// With a record that is read in another way.
     ContentItem(URL url, RecordReading reading);
     ~ContentItem();
 

@@ -48,6 +48,7 @@ class QVCT_API QVTaggingAggregator {
     /// The same as taggings. Labels that the taxonomy does not know are dropped.
     ObjectSet<TGRTTagging> taggingsWithContentsOfURL(const URL& url, const TGRTTaxonomy& taxonomy,
                                                      std::uint64_t options);
+    /// What `tagsOfItem` answers, as taggings.
     ObjectSet<TGRTTagging> taggingsOfItem(const std::shared_ptr<ContentItem>& item,
                                           const TGRTTaxonomy& taxonomy, std::uint64_t options);
 

@@ -21,6 +21,7 @@ class RandomAccessReader;
 /// told each time. Of a folder or a missing file there is nothing. Not thread-safe.
 class QVCT_API ItemFile {
   public:
+    /// Looks at nothing yet.
     explicit ItemFile(URL url);
     ~ItemFile();
 
