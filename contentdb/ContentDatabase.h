@@ -26,8 +26,8 @@ class QVCT_API ContentDatabase {
   public:
     /// Null, and an error, when there is no such database, or it is damaged or of another version.
     ///
-    /// One that `indexLibrary` is making at this moment is waited for until the first items are in it, ten
-    /// seconds at most. What a search then finds is what has been stored so far.
+    /// If `indexLibrary` is just making it, this waits up to ten seconds for the first items. A search then
+    /// finds what has been stored so far.
     static std::unique_ptr<ContentDatabase> open(const std::string& path, Error* error = nullptr);
     ~ContentDatabase();
 
@@ -37,12 +37,12 @@ class QVCT_API ContentDatabase {
     /// At most `limit` items, in the query's order.
     std::optional<std::vector<Found>> search(const Query& query, std::size_t limit, Error* error = nullptr);
     /// How many items the query finds.
-    /// @cost  That of `search` without reading what the index decides.
+    /// @cost  That of `search`, but without reading items that the index alone can decide.
     std::optional<std::int64_t> count(const Query& query, Error* error = nullptr);
     /// How many of the found items have each tag, the most frequent first.
     std::optional<std::vector<Facet>> facets(const Query& query, Error* error = nullptr);
-    /// The items nearest to the one at the path, best first. Nothing and an error when that one could not be
-    /// read, or has no tags, rhythm or tempo.
+    /// The items nearest to the one at the path, best first. Nothing and an error when the item at the path
+    /// could not be read, or has no tags, rhythm or tempo.
     std::optional<std::vector<Similar>> similar(std::string_view path, std::size_t limit,
                                                 Error* error = nullptr);
     /// The item at the path; nothing and an error when there is none.
@@ -64,8 +64,8 @@ class QVCT_API ContentDatabase {
     /// soon.
     bool isBeingIndexed() const;
 
-    /// Reads everything: each page and its checksum, each tree, each record, and whether the index says of
-    /// each item what the item says. @cost O(items), some minutes for a million.
+    /// Reads everything: each page and its checksum, each tree, each record; and checks that the index agrees
+    /// with the items. @cost  O(items), some minutes for a million.
     bool check(Error* error = nullptr);
 
   private:

@@ -89,8 +89,8 @@ struct ContentDescriber::Implementation {
     explicit Implementation(std::uint64_t options) : services(options) {}
 
     static constexpr std::uint64_t kOptions = kIndexInMutableTaxonomy | kIndexWithoutRecord;
-    // The record may name tags of the user's own; services speak of the taxonomy's. They are added to one of
-    // its own, since other threads may describe, too.
+    // The record may name tags of the user's own, while services name the taxonomy's. The user's are added to
+    // a taxonomy of this describer's own, since other threads may be describing, too.
     std::shared_ptr<TGRTTaxonomy> taxonomyOfRecords =
         TGRTTaxonomy::newTaxonomyOfType(kDefaultTaxonomy, false, false);
     std::shared_ptr<TGRTTaxonomy> taxonomyOfServices = TGRTTaxonomy::defaultTaxonomy();
@@ -131,7 +131,7 @@ ContentDescriber::ContentDescriber(std::uint64_t services)
 ContentDescriber::~ContentDescriber() = default;
 
 std::uint64_t ContentDescriber::digest(std::uint64_t services) {
-    // Raised when items are described otherwise than by the same version before.
+    // Raised when a change makes items be described differently although the version stays the same.
     constexpr std::uint64_t edition = 3;
     Digest digest;
     digest.add(services);

@@ -12,12 +12,12 @@ namespace qvct::contentdb {
 /// Describes content items as the framework sees them: the indexable object of the record, with taggings from
 /// the record, taggings that follow from it, and those that tagging services derive.
 ///
-/// A tagging that several of them have (the same label, category and level) is listed once, with the first of
-/// these origins; services come in the order of `kTaggingServiceNames`. What services say together is what
-/// the aggregator says. Labels that the taxonomy does not know are kept where the record has them.
+/// A tagging that has several of these origins (the same label, category and level) is listed once, with the
+/// first of them; services come in the order of `kTaggingServiceNames`. All services together give what the
+/// aggregator gives. Labels that the taxonomy does not know are kept if they come from the record.
 ///
-/// Values are those of the record, without the numbers that stand for an unknown one; "Tempo" and
-/// "BeatCount" also come from chunks of other makers, and the tempo at last from a name as "Beat 122bpm".
+/// Values are those of the record, without numbers that mean "unknown". "Tempo" and "BeatCount" may also come
+/// from chunks of other makers, and failing that the tempo from a name such as "Beat 122bpm".
 ///
 /// An item has failed when its record, or an audio file's header, cannot be read. One without record is
 /// described by its name and the services.
@@ -27,8 +27,8 @@ class QVCT_API ContentDescriber : public ItemDescriber {
     explicit ContentDescriber(std::uint64_t services = optionsForAllTaggingServices());
     ~ContentDescriber() override;
 
-    /// A number that changes with what descriptions depend on besides the item: the services, the files that
-    /// replace resources, the version of the library. For `IndexOptions::describer`.
+    /// A number for `IndexOptions::describer` that changes with whatever descriptions depend on besides the
+    /// item: the services, the files that replace resources, the version of the library.
     /// @cost  Reads the files that replace resources.
     static std::uint64_t digest(std::uint64_t services);
 

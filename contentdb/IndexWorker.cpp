@@ -14,7 +14,7 @@
 namespace qvct::contentdb {
 namespace {
 
-/// Answers are sent together up to this size, or as soon as there is nothing else to do.
+/// Answers are gathered up to this size and then sent, or as soon as there is nothing else to do.
 constexpr std::size_t kAnswersAtOnce = 1U << 16U;
 
 class Worker {
@@ -69,7 +69,7 @@ class Worker {
         return true;
     }
 
-    /// At once: the next thing that happens may be the end of this process.
+    /// Sent at once, since this process may end at any moment.
     void logToParent(std::string_view line) {
         appendMessage(output_, encodedReport(WorkerReport::Kind::logged, line));
         parent_.send(output_);

@@ -29,7 +29,7 @@ struct IndexedTagging {
     /// Weight in [0, 1].
     std::optional<float> level;
     Provenance provenance = Provenance::stored;
-    /// The tagging service, of automatic taggings.
+    /// The tagging service that found it; empty unless it is automatic.
     std::string service;
     /// A service made it, now or before it was stored.
     bool isAuto = false;

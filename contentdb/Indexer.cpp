@@ -41,7 +41,7 @@ std::unique_ptr<DescriberPool> workerPool(const IndexOptions& options) {
     return std::make_unique<WorkerPool>(std::move(settings));
 }
 
-/// Puts a database that an earlier run has rebuilt, but not into its place, there.
+/// Moves a rebuilt database into its place if an earlier run was interrupted before it could.
 void finishRebuild(const IndexOptions& options) {
     if (!isRebuilt(options.database)) return;
     const std::string aside = putAside(options.database);
@@ -68,9 +68,9 @@ IndexProgress runOnce(const IndexOptions& options, const std::vector<std::string
     return run.progress();
 }
 
-/// Puts a damaged database aside, and into its place what can be read of it with what the folders that were
-/// in it have now: all at once, so that no folder is forgotten when this is interrupted. Whether it came to
-/// its end.
+/// Replaces a damaged database by a new one made from what can be read of it and from what its folders hold
+/// now. The new one takes its place only when it is complete, so that an interruption loses no folder. False
+/// when the run was cancelled.
 bool replaceDamaged(const IndexOptions& options, const PoolFactory& makePool,
                     const DatabaseFailure& failure) {
     IndexOptions rebuilding = options;
@@ -157,7 +157,7 @@ bool mergeDatabases(const std::vector<std::string>& databases, const std::string
     if (!lock) return false;
     if (fileExists(target) || isRebuilt(target))
         return fail(error, kErrorInvalidArgument, fmt::format("{}: exists already", printable(target)));
-    // Built beside its place, so that a merge that was interrupted leaves no half database there.
+    // Built beside its place, so that an interrupted merge leaves no half-finished database there.
     const std::string unfinished = unfinishedPath(target);
     removeDatabase(unfinished);
     const bool isDone = guarded(error, false, [&] {

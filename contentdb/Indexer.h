@@ -42,23 +42,24 @@ struct IndexOptions {
     std::vector<std::string> folders;
     /// Path of the database; made when there is none.
     std::string database;
-    /// A number for what describes items, such as `ContentDescriber::digest`. The database keeps it; when it
-    /// is another than before, every item counts as changed, also those that only a later run comes to.
+    /// A number that identifies what describes items, such as `ContentDescriber::digest`. The database keeps
+    /// it; when it differs from the one before, every item counts as changed, even one that only a later run
+    /// reaches.
     std::uint64_t describer = 0;
-    /// Which links out of a folder are followed, and who is told of the others. A link that is passed over
-    /// takes nothing out of the index, unless what it leads to is indexed under a path of its own.
+    /// Which links out of a folder are followed, and who is told of the others. Items behind a link that is
+    /// no longer followed stay in the index, unless they are indexed under a path of their own.
     WalkedLinks links;
-    /// Takes items out of the index whose files are gone, but for those below a folder of `folders` in which
-    /// nothing is left: a disk that is away looks like this. `failed` is told of it.
+    /// Removes items whose files are gone from the index, except below a folder of `folders` in which nothing
+    /// is left: that is what a disk that is not mounted looks like. `failed` is told of it.
     bool prune = false;
-    /// With `prune`: takes those out as well, and those of a folder of `folders` that is not there.
+    /// With `prune`: removes those as well, and the items of a folder of `folders` that does not exist.
     bool pruneRoots = false;
     /// Reads items again that failed before, though they have not changed.
     bool retryFailed = false;
-    /// Reads the database whole before, each record and index entry, as `ContentDatabase::check` does;
-    /// without, every page is held against its checksum.
+    /// First reads the whole database, each record and index entry, as `ContentDatabase::check` does;
+    /// otherwise only the checksum of every page is checked.
     bool check = false;
-    /// Takes only this part of the items (from 1), to be united with the others by `mergeDatabases`.
+    /// Indexes only this part of the items (from 1); `mergeDatabases` unites the parts.
     unsigned part = 1;
     unsigned parts = 1;
     /// How many items are described at a time. 0: as many as there are processors.
@@ -69,32 +70,32 @@ struct IndexOptions {
     std::uint64_t services = optionsForAllTaggingServices();
     /// Longest that a worker program may take for one item.
     std::chrono::milliseconds timeLimitPerItem{30000};
-    /// Longest that an item waits, once read, until it is stored: what an interruption may cost. Shorter
-    /// costs speed.
+    /// How long an item that was read may wait to be stored, and so how much work an interruption can lose. A
+    /// shorter time makes the run slower.
     std::chrono::milliseconds longestBatch{3000};
 
     /// Called now and then from the calling thread.
     std::function<void(const IndexProgress&)> progress;
     /// Called for each item or folder that cannot be read, with path and reason.
     std::function<void(const Error&)> failed;
-    /// Told when a damaged database was put aside ("<database>.damaged") and built anew, from what can still
-    /// be read of it and from all folders that are known to it.
+    /// Told when a damaged database was set aside ("<database>.damaged") and rebuilt, from what could still
+    /// be read of it and from all the folders that it knew.
     std::function<void(const std::string& message)> note;
-    /// Asked after each folder and while items are read; true ends the run early, with all that was read so
-    /// far stored and nothing taken out.
+    /// Asked after each folder and while items are read; true ends the run early: what was read so far is
+    /// stored, and nothing is removed.
     std::function<bool()> isCancelled;
 };
 
 /// Brings the database up to date with the folders, making it if there is none.
 ///
-/// Only items that are new, whose size, times or inode have changed (or those of what lies beside them:
-/// record, description, preview), or that another describer has described are read, each in the process of a
-/// worker program: one that crashes it, or takes too long, has failed, and costs no other item. The programs
-/// are started with what replaces resources here, end with this process, and have none of its open files but
-/// standard error; what they log is logged here, from the calling thread.
+/// An item is read when it is new, when its size, times or inode have changed (or those of the record,
+/// description or preview beside it), or when another describer described it. Items are read in worker
+/// programs: one that crashes its worker, or takes too long, is stored as failed and costs no other item. The
+/// workers are given the files that replace resources here, end with this process, and inherit none of its
+/// open files but standard error; what they log is logged here, from the calling thread.
 ///
 /// Batches of items are stored whole or not at all: a run that was interrupted at any point is continued by
-/// the next. An item with the payload of one that is gone is that item, moved.
+/// the next. A new item with the payload of one that is gone is taken to be that item, moved.
 ///
 /// Nothing, and an error, when there is no such folder, the database cannot be written, another run is going
 /// on, or the worker program cannot be run. What was stored until then stays.
@@ -103,16 +104,16 @@ struct IndexOptions {
 QVCT_API std::optional<IndexProgress> indexLibrary(const IndexOptions& options, Error* error = nullptr);
 
 /// The same in threads of this process, `IndexOptions::workers` of them, each with a describer that the
-/// factory makes in it. Nothing protects the process from what describes: an item that crashes it crashes the
-/// host, one that hangs it hangs the run, and no time limit holds. For a describer that cannot be in a
-/// program of its own, or a host that may start none.
+/// factory makes in it. Nothing protects the process from the describer: an item that crashes it crashes the
+/// host, one that hangs it hangs the run, and no time limit applies. Meant for a describer that cannot run in
+/// a program of its own, or a host that may not start programs.
 QVCT_API std::optional<IndexProgress> indexLibrary(const IndexOptions& options,
                                                    const DescriberFactory& factory, Error* error = nullptr);
 
-/// Unites the databases into a new one with the content that one run over everything would have made. The
-/// first database that has an item counts. Unless one describer described them all, the next run with one
-/// reads every item again.
-/// False, and an error, when one cannot be read or `target` exists already; then no new database is left.
+/// Unites the databases into a new one, with the content that a single run over everything would have given.
+/// Of an item that several have, the first one's is taken. Unless one describer described them all, the next
+/// run that names a describer reads every item again. False, and an error, when one cannot be read or
+/// `target` exists already; then no new database is left.
 QVCT_API bool mergeDatabases(const std::vector<std::string>& databases, const std::string& target,
                              Error* error = nullptr);
 

@@ -37,7 +37,8 @@ struct TagMatch {
     std::string label;
     std::string category;
 };
-/// One of the item's numbers in the field lies in the range. For levels the field is `levelField(label)`.
+/// One of the item's numbers in the field lies in the range. The field of a tag's level is
+/// `levelField(label)`.
 struct NumberMatch {
     std::string field;
     double low;
@@ -67,7 +68,7 @@ struct ExpressionMatch {
 
 /// A condition on an item: a tree of all, any and not over matches.
 struct Condition;
-/// Every part holds; so does none at all.
+/// Every part holds; true when there are no parts.
 struct AllOf {
     std::vector<Condition> parts;
 };
@@ -95,7 +96,7 @@ struct SortKey {
 /// A parsed query. Belongs to one thread at a time, because of its regular expressions.
 struct Query {
     Condition condition;
-    /// Without any: in the order in which items came into the database.
+    /// Empty for the order in which items came into the database.
     std::vector<SortKey> order;
 };
 
@@ -123,8 +124,8 @@ QVCT_API std::optional<Query> parseQuery(std::string_view text, const Vocabulary
 /// when a regular expression of the query takes too long on the item.
 QVCT_API bool matches(const Query& query, const IndexedItem& item, Error* error = nullptr);
 
-/// Whether `a` comes before `b` in the query's order; items without the field last. Equal items are not
-/// before each other: whoever sorts keeps them in the order of the database.
+/// Whether `a` comes before `b` in the query's order; items without the field last. Neither of two equal
+/// items comes before the other: a stable sort keeps the order of the database.
 QVCT_API bool comesBefore(const Query& query, const IndexedItem& a, const IndexedItem& b);
 
 }  // namespace qvct::contentdb

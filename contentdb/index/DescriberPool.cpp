@@ -29,7 +29,8 @@ IndexedItem itemBy(ItemDescriber& describer, const std::string& path) {
 Described describedBy(ItemDescriber& describer, const ItemTask& task) {
     Described described{task.ticket, itemBy(describer, task.path), {}};
     described.item.path = task.path;
-    // Away, perhaps for a moment: what was read may not be all, and a failure not the item's own.
+    // The file is gone, perhaps only for a moment: what was read may be incomplete, and a failure may not be
+    // the item's fault.
     described.item.stamp = fileExists(task.path) ? task.stamp : ItemStamp{};
     described.terms = termsOf(described.item);
     return described;

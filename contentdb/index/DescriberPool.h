@@ -23,10 +23,10 @@ struct Described {
     std::vector<std::string> terms;
 };
 
-/// What the describer makes of the item; a failed item where it makes nothing of it.
+/// The item as the describer describes it; a failed item if it cannot.
 Described describedBy(ItemDescriber& describer, const ItemTask& task);
 
-/// Those who describe the items of a run, several at a time.
+/// Workers that describe the items of a run, several at a time.
 class DescriberPool {
   public:
     virtual ~DescriberPool() = default;
@@ -36,8 +36,8 @@ class DescriberPool {
     virtual void submit(ItemTask task) = 0;
     /// Whether items are on their way.
     virtual bool isBusy() const = 0;
-    /// Waits a little for what is ready and calls `take` for each, in any order. False when nothing can be
-    /// described any more; `problem` is the reason then.
+    /// Waits briefly for described items and calls `take` for each that is ready, in any order. False when
+    /// nothing can be described any more; `problem` then says why.
     virtual bool collect(const std::function<void(Described)>& take) = 0;
     virtual std::string problem() const = 0;
 };

@@ -9,14 +9,14 @@
 
 namespace qvct::contentdb {
 
-/// Describes items in threads of this process, each with a describer of its own. What crashes or hangs one of
-/// them does so to the process.
+/// Describes items in threads of this process, each with a describer of its own. An item that crashes or
+/// hangs one of them crashes or hangs the process.
 class DescriberThreads : public DescriberPool {
   public:
     DescriberThreads(DescriberFactory factory, unsigned threads);
     DescriberThreads(const DescriberThreads&) = delete;
     DescriberThreads& operator=(const DescriberThreads&) = delete;
-    /// Waits for the items that the threads are at.
+    /// Waits until each thread has finished the item that it is working on.
     ~DescriberThreads() override;
 
     bool hasRoom() const override;

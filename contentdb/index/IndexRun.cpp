@@ -19,10 +19,10 @@ using Clock = std::chrono::steady_clock;
 
 /// Items stored in one transaction, at most; fewer when reading them takes long.
 constexpr std::size_t kBatch = 8192;
-/// And fewer when they have many terms, so that a batch stays small in memory.
+/// Also fewer when they have many terms, so that a batch stays small in memory.
 constexpr std::size_t kMostTermsInBatch = 1'000'000;
-/// A file that changed this shortly before it was looked at may change again within the same tick of the file
-/// system's clock: its stamp would not tell. It is read again by the next run.
+/// A file that changed so recently may change again within the same tick of the file system's clock, and its
+/// stamp would not show it. The next run reads it again.
 constexpr std::int64_t kTick = 20'000'000;
 constexpr std::int64_t kClockSkew = 2'000'000'000;
 
@@ -86,7 +86,7 @@ bool IndexRun::visit(const std::string& path, const std::vector<ListedItem>& all
     const FolderRecord known = writer_.store().folder(path);
     if (known.id != 0) visited_.insert(known.id);
     const std::uint64_t digest = digestOf(items);
-    // What is missing may have turned up elsewhere.
+    // A folder with missing items is always gone through: they may have turned up elsewhere.
     const bool isUnchanged = known.digest == digest && known.part == part_ && known.gone == 0;
     if ((isUnchanged && !options_.retryFailed) || (known.id == 0 && items.empty())) {
         progress_.unchanged += items.size();
@@ -201,7 +201,7 @@ void IndexRun::storeOne(const Described& described, Pending& pending) {
     const bool hasFailed = !item.failure.empty();
     const bool wasAway = item.stamp == ItemStamp{} || (hasFailed && isGone(item.path));
     if (wasAway) pending.folder->digest = 0;  // the next run reads it again
-    if (wasAway && hasFailed) return;         // it is missing, and not broken
+    if (wasAway && hasFailed) return;         // the item is missing, not broken
     if (hasFailed) {
         ++progress_.failed;
         if (options_.failed) {
@@ -265,7 +265,7 @@ void IndexRun::pruneUnvisited(const std::string& root) {
         writer_.begin();
         pruneFolder(folder, path);
         writer_.commit();
-        visited_.insert(folder.id);  // below another root as well
+        visited_.insert(folder.id);  // a root inside another one would visit it again
     }
 }
 
@@ -291,7 +291,7 @@ void IndexRun::removeIfGone(ItemId id) {
     ++progress_.pruned;
 }
 
-/// Whether the item stays because nothing at all is left where it was.
+/// Whether the item stays because nothing is left in its whole root, as when a disk is not mounted.
 bool IndexRun::isSpared(std::string_view path) {
     for (auto& [root, missing] : bareRoots_) {
         if (!isAtOrBelow(path, root)) continue;
@@ -301,7 +301,8 @@ bool IndexRun::isSpared(std::string_view path) {
     return false;
 }
 
-/// The path by which the walk came to a folder, when it was not this one: through another link, or past one.
+/// The path by which the walk reached this folder, if it was another one: the folder was reached through
+/// another link, or through none.
 std::optional<std::string> IndexRun::otherPathOf(const std::string& folder) {
     const auto inode = inodeOf(folder);
     if (!inode) return std::nullopt;

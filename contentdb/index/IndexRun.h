@@ -29,7 +29,7 @@ class IndexRun {
     const IndexProgress& progress() const { return progress_; }
 
   private:
-    /// A folder some of whose items are still to be stored; then its digest can be.
+    /// A folder with items that are still to be stored; its digest is stored after the last of them.
     struct OpenFolder {
         std::string path;
         std::uint64_t digest = 0;
@@ -76,14 +76,14 @@ class IndexRun {
     std::vector<Described> batch_;
     std::size_t termsInBatch_ = 0;
     std::vector<std::shared_ptr<OpenFolder>> complete_;  // to be stored with the batch
-    std::uint64_t listed_ = 0;                           // in the root at which the walk is, of all parts
+    std::uint64_t listed_ = 0;  // items of all parts in the root that is being walked
     std::vector<std::string> roots_;
-    std::map<std::string, std::uint64_t, std::less<>> bareRoots_;  // nothing is there; how much is missing
+    std::map<std::string, std::uint64_t, std::less<>> bareRoots_;  // nothing is left there; items missing
     std::unordered_set<std::string> shown_;                        // folders, by path
     std::unordered_set<std::int64_t> visited_;                     // folders, by number
     std::map<std::pair<std::uint64_t, std::uint64_t>, std::string> shownByInode_;  // made when asked
     std::set<std::string, std::less<>> unreadable_;
-    std::set<ItemId> missing_;  // of the folders that were visited
+    std::set<ItemId> missing_;  // items missing from folders that were visited
     std::chrono::steady_clock::time_point lastFlush_;
     std::chrono::steady_clock::time_point lastReport_;
 };

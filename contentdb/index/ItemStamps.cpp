@@ -21,8 +21,8 @@ void include(ItemStamp& stamp, const EntryStatus& other) {
     stamp.inode = stamp.inode * 31 + other.inode;
 }
 
-/// Takes in all that lies in a bundle, up to a bound that no bundle reaches. The bundle itself may be a link;
-/// one within it is part of it as it stands.
+/// Includes everything that lies in a bundle, up to a bound that no real bundle reaches. The bundle itself
+/// may be a link and is followed; links inside it are not.
 class BundleStamp {
   public:
     explicit BundleStamp(ItemStamp& stamp) : stamp_(stamp) {}

@@ -9,9 +9,9 @@ namespace qvct::contentdb {
 /// 16 bytes for the content of an item apart from its record: the same wherever it lies and however it is
 /// tagged. Empty when there is no such content, or it cannot be read.
 ///
-/// Of audio the sound and the notes; of a preset its text without the record;
-/// of a bundle the files in it with their places; of other settings the file. Of anything over 64 KB only 16
-/// blocks at even distances count, and the size: that tells any two recordings apart.
+/// What counts is the sound and the notes of audio, the text of a preset without the record, the files in a
+/// bundle with their places, and any other settings file whole. Of a sound or file over 64 KB only the size
+/// and 16 blocks at even distances are hashed, which is enough to tell recordings apart.
 /// @cost  At most 17 reads for each file; the item's own is not opened again.
 std::string payloadHash(ItemFile& file);
 

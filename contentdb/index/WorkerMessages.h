@@ -14,7 +14,7 @@ namespace qvct::contentdb {
 /// What a worker shows to the process that started it, in memory that both see and that begins as zeros.
 struct WorkerStatus {
     std::atomic<bool> hasDescriber;
-    std::atomic<std::uint64_t> ticket;  ///< The item that it is at; 0 for none.
+    std::atomic<std::uint64_t> ticket;  ///< The item that it is working on; 0 for none.
     std::atomic<std::int64_t> since;    ///< When it began, as `now` tells.
 
     static WorkerStatus& in(void* memory) { return *static_cast<WorkerStatus*>(memory); }

@@ -16,7 +16,7 @@
 namespace qvct::contentdb {
 namespace {
 
-/// Items that one worker may have before it; enough that it never waits.
+/// Most items that are queued for one worker; enough that it never waits.
 constexpr std::size_t kQueuePerWorker = 128;
 /// Longest that a worker may take to make its describer.
 constexpr std::chrono::milliseconds kLongestStart{30000};
@@ -127,7 +127,7 @@ WorkerPool::Receipt WorkerPool::takeReport(Worker& worker, std::string_view mess
     return Receipt::intact;
 }
 
-/// Starts another process in the place of one that has ended; the item that it was at has failed.
+/// Starts another process in place of one that has ended; the item that it was working on has failed.
 bool WorkerPool::replace(Worker& worker, const std::function<void(Described)>& take) {
     const std::uint64_t culprit = worker.status().ticket;
     const std::string reason = end(worker);

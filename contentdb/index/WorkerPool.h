@@ -46,7 +46,7 @@ class WorkerPool : public DescriberPool {
 
     const Settings settings_;
     std::vector<Worker> workers_;
-    unsigned barren_ = 0;  ///< Workers in a row that have ended without having described anything.
+    unsigned barren_ = 0;  ///< Workers that ended, one after the other, without having described anything.
     std::string problem_;
 };
 

@@ -12,7 +12,7 @@ std::string encodedWorkerSettings() {
     ByteWriter out;
     out.text(ResourceBundle::directory());
     for (const ResourceFile& resource : kResourceFiles) {
-        // Decided here, so that every worker takes the same, and a broken file is told once.
+        // Decided here, so that every worker uses the same file and a broken one is reported only once.
         const auto path = replacementFile(resource);
         out.text(path.value_or(std::string()));
     }

@@ -5,7 +5,7 @@
 
 namespace qvct::contentdb {
 
-/// What was set in this process and counts in its workers, too: the files that replace resources.
+/// The settings of this process that its workers take over: the files that replace resources.
 std::string encodedWorkerSettings();
 /// Sets the same in this process. To be called before anything reads a resource.
 void applyWorkerSettings(std::string_view settings);

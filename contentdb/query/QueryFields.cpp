@@ -39,7 +39,7 @@ constexpr std::array<Name, 17> kNames = {{{"name", Field::Kind::name, ""},
                                           {"top", Field::Kind::number, "signaturetop"},
                                           {"bottom", Field::Kind::number, "signaturebottom"}}};
 
-/// The categories whose name is the word, its plural, or begins with it; the better kind of match only.
+/// The categories whose name is the word or its plural; if there are none, those whose name begins with it.
 std::vector<std::string> categoriesNamed(const std::string& bare, const Vocabulary& vocabulary) {
     constexpr std::size_t shortest = 3;
     std::vector<std::string> same;

@@ -13,7 +13,8 @@ namespace qvct::contentdb {
 /// The field that a word names, or nothing and a reason.
 std::optional<Field> fieldNamed(std::string_view word, const Vocabulary& vocabulary, std::string& reason);
 
-/// Labels of the tags that a musical key consists of ("A", "C#", "Bbm", "A minor"); empty when it is no key.
+/// The labels of the tags that stand for a musical key, such as "A", "C#", "Bbm" or "A minor"; empty when the
+/// text is no key.
 std::vector<std::string> keyLabels(std::string_view text);
 /// The terms of the tags that are keys.
 std::set<std::string> keyTerms();

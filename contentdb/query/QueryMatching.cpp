@@ -28,7 +28,7 @@ bool occursInWords(const WordsMatch& match, std::string_view text) {
     return false;
 }
 
-/// Whether one item meets a match, one overload a kind.
+/// Whether one item meets a match; there is one overload for each kind of match.
 class Matching {
   public:
     Matching(const IndexedItem& item, Error& fault) : item_(item), fault_(fault) {}

@@ -4,8 +4,8 @@
 
 namespace qvct::contentdb {
 
-/// Whether the item meets the condition. `fault` is that of a regular expression which was given up: then the
-/// answer is none.
+/// Whether the item meets the condition. When a regular expression took too long, `fault` is set and the
+/// result means nothing.
 bool meets(const Condition& condition, const IndexedItem& item, Error& fault);
 
 }  // namespace qvct::contentdb

@@ -17,7 +17,7 @@
 namespace qvct::contentdb {
 namespace {
 
-/// A run of the query: what it says without its quotes, and where it stands.
+/// A stretch of the query: its text without quotes, and where it stands.
 struct Piece {
     std::string text;
     std::size_t start = 0;
@@ -69,7 +69,8 @@ class Parser {
         return true;
     }
 
-    /// Up to a blank, a comma or one of `stops`; or what stands in quotes, where \" and \\ are characters.
+    /// Reads up to a blank, a comma or one of `stops`; or a text in quotes, in which \" and \\ stand for "
+    /// and \.
     Piece piece(std::string_view stops) {
         Piece result{{}, at_, at_, false};
         if (accept("\"")) {
@@ -100,7 +101,8 @@ class Parser {
         }
         std::optional<Field> field;
         AnyOf any{{factor(field)}};
-        // "kick,snare", "genre:House,Techno": a comma with no blank behind it offers another word, or value.
+        // "kick,snare", "genre:House,Techno": a comma that no blank follows adds an alternative word or
+        // value.
         while (at_ + 1 < text_.size() && text_[at_] == ',' && !isBlank(text_[at_ + 1]) &&
                text_[at_ + 1] != ',') {
             ++at_;

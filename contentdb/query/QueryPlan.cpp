@@ -6,7 +6,7 @@
 namespace qvct::contentdb {
 namespace {
 
-/// Behind every text that begins with `start`: no byte of UTF-8 is this high.
+/// A key that sorts after every text that begins with `start`: UTF-8 has no byte this high.
 std::string behind(std::string_view start) {
     return std::string(start) + '\xff';
 }

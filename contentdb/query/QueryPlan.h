@@ -42,7 +42,7 @@ class QueryPlan {
     std::vector<TermId> sureTerms_;
     std::vector<TermId> possibleTerms_;
     bool isEverythingPossible_ = false;
-    bool isOnlyPossible_ = false;  // of `all`: the parts are needed but do not suffice
+    bool isOnlyPossible_ = false;  // for Kind::all: the parts are necessary but not sufficient
 };
 
 }  // namespace qvct::contentdb

@@ -91,7 +91,7 @@ std::vector<Found> search(ContentStore& store, const Query& query, std::size_t l
     Evaluation(store, query).forEachMatch([&](Found&& found) {
         result.push_back(std::move(found));
         if (!isOrdered) return result.size() < limit;
-        // A heap with the last of the best on top.
+        // A heap of the best so far, with the worst of them on top.
         std::push_heap(result.begin(), result.end(), isBefore);
         if (result.size() > limit) {
             std::pop_heap(result.begin(), result.end(), isBefore);

@@ -13,7 +13,7 @@
 namespace qvct::contentdb {
 namespace {
 
-/// The numbers that count, and how far apart two of them are half alike.
+/// The numbers that are compared, and the distance at which two of them count as half alike.
 struct Measure {
     const char* field;
     bool isOfLevel;
@@ -60,18 +60,18 @@ Facts factsOf(const IndexedItem& item) {
     return facts;
 }
 
-/// 1 when equal, falling to half.
+/// 1 when they are equal, 1/2 at the distance `half`.
 double closeness(const Measure& measure, double a, double b) {
     const double distance = measure.isRatio ? std::log2(a) - std::log2(b) : a - b;
     return 1 / (1 + std::abs(distance) / measure.half);
 }
 
-/// Stands for how alike two items are in what one of them does not have.
+/// The closeness of two items in a respect that is unknown of one of them.
 constexpr double kUnknown = -1;
 using Closenesses = std::array<double, kMeasures.size()>;
 constexpr Closenesses kAllUnknown = {kUnknown, kUnknown, kUnknown};
 
-/// In which respects two items are alike, and how much: 0 to 1.
+/// How alike two items are in each respect, from 0 to 1.
 struct Likeness {
     double tags = kUnknown;
     double key = kUnknown;
@@ -95,7 +95,7 @@ struct Likeness {
     }
 };
 
-/// The tags of an item with what each tells: the fewer items have it, the more.
+/// The tags of an item, each weighed by how much it tells: a tag that few items have tells more.
 class WeighedTags {
   public:
     WeighedTags(ContentStore& store, const Facts& facts, std::int64_t lastChunk) {
@@ -117,11 +117,12 @@ class WeighedTags {
         const auto hit = weights_.find(tag);
         return hit == weights_.end() ? 0 : hit->second;
     }
-    /// How alike are the tags of an item that has so many, and of these in common what weighs so much.
+    /// How alike the tags of another item are, which has `tagsOfOther` of them: `shared` is the weight of
+    /// those that both items have.
     double likeness(double shared, std::size_t tagsOfOther) const {
         if (weights_.empty()) return kUnknown;
         const double meanWeight = all_ / static_cast<double>(weights_.size());
-        // What the other has beyond the common tags counts as so many tags of middling weight.
+        // The other item's further tags are taken to weigh as much, each, as a tag of this item on average.
         const double beyond = std::max(0.0, static_cast<double>(tagsOfOther) - shared / meanWeight);
         return std::min(1.0, shared / (all_ + beyond * meanWeight));
     }
@@ -144,8 +145,8 @@ Likeness likeness(const Facts& item, const WeighedTags& tags, const Facts& other
     return result;
 }
 
-/// What the index says of likeness, without reading items: tags and keys as they are, of numbers the most
-/// that is possible in their group.
+/// How alike items can be at most, from the index alone: it knows their tags and keys exactly, and of each
+/// number the group that it lies in, whose nearest value is taken.
 class LikenessIndex {
   public:
     LikenessIndex(ContentStore& store, const Facts& item, const WeighedTags& tags)
@@ -162,7 +163,7 @@ class LikenessIndex {
         for (std::size_t i = 0; i < kMeasures.size(); ++i) addGroups(i);
     }
 
-    /// Calls `visit` with the most likeness that each item of the chunk can have.
+    /// Calls `visit` for each item of the chunk with an upper bound of its likeness.
     template <typename Visit>
     void forEachBound(std::int64_t chunk, Visit visit) {
         entries_.assign(kChunkSize, {});
@@ -249,7 +250,7 @@ class LikenessIndex {
     std::vector<Entry> entries_;
 };
 
-/// By falling likeness, then by number.
+/// Sorts the most alike first, then by number: the likeness is negated.
 using Rank = std::pair<double, ItemId>;
 
 }  // namespace
@@ -271,7 +272,7 @@ std::vector<Similar> similarItems(ContentStore& store, ItemId id, std::size_t li
             if (bound > 0 && candidate != id) candidates.emplace_back(-bound, candidate);
         });
     }
-    // Items are read in the order of their bounds until none that is left can come before those that were.
+    // Items are read in the order of their bounds until no further one can beat the best so far.
     std::make_heap(candidates.begin(), candidates.end(), std::greater<>());
     std::map<Rank, IndexedItem> best;
     while (!candidates.empty()) {

@@ -4,8 +4,8 @@
 
 namespace qvct::contentdb {
 
-/// Stores many items in batches that no memory is too small for: from the first on a batch is open, and
-/// whoever has put all ends the last one.
+/// Stores many items in batches of bounded size. A batch is open from the beginning; call `end` after the
+/// last item.
 class Batches {
   public:
     explicit Batches(StoreWriter& writer) : writer_(writer) { writer_.begin(); }

@@ -41,7 +41,7 @@ std::uint64_t checksum(const unsigned char* page, sqlite3_int64 offset) {
 
 int read(sqlite3_file* file, void* bytes, int count, sqlite3_int64 offset) {
     const int result = below(file)->pMethods->xRead(below(file), bytes, count, offset);
-    // SQLite looks at parts of the header before it reads pages; whatever these say, pages have our size.
+    // SQLite reads parts of the header before it reads pages; whatever they say, pages have our size.
     constexpr int largestPeek = 100;
     if (result != SQLITE_OK || count <= largestPeek) return result;
     if (count != kPageSize || offset % kPageSize != 0) return SQLITE_IOERR_DATA;
@@ -61,7 +61,7 @@ int write(sqlite3_file* file, const void* bytes, int count, sqlite3_int64 offset
 }
 
 const sqlite3_io_methods kMethods = {
-    2,  // with shared memory, for the write-ahead log, but without mapping, which would pass by the checksums
+    2,  // with shared memory, for the write-ahead log; no mapping, which would bypass the checksums
     [](sqlite3_file* f) { return below(f)->pMethods->xClose(below(f)); },
     read,
     write,

@@ -11,11 +11,11 @@ inline constexpr int kPageSize = 8192;
 inline constexpr int kChecksumBytes = 8;
 
 /// Puts a layer between SQLite and the file: each page of the database is written with a checksum of its
-/// bytes and its place, and read only if that is right, so that a flipped bit is told ("damaged") instead of
-/// believed.
+/// bytes and its place, and reading a page whose checksum is wrong fails ("damaged"), so that a flipped bit
+/// is never believed.
 ///
-/// The log of a database in write-ahead mode has checksums of its own, which SQLite checks when it is opened.
-/// Safe to call any number of times, from one thread first.
+/// The write-ahead log has checksums of its own, which SQLite checks when it opens the log. May be called any
+/// number of times; the first call must have returned before other threads call it.
 void registerChecksumVfs();
 
 }  // namespace qvct::contentdb

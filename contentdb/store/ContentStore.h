@@ -32,7 +32,7 @@ struct FolderRecord {
     std::int64_t id = 0;
     std::uint64_t digest = 0;
     std::int64_t gone = 0;
-    /// The share of its items that the digest speaks for.
+    /// The share of its items that the digest covers.
     Part part = {};
 };
 
@@ -60,7 +60,7 @@ class ContentStore {
     /// Paths and reasons, in the order of items, until `visit` answers false.
     void forEachFailure(const std::function<bool(const IndexedItem&)>& visit);
 
-    /// With the number 0 when the index does not know it.
+    /// The folder's record; its `id` is 0 when the index does not know the folder.
     FolderRecord folder(std::string_view path);
     /// By name.
     std::map<std::string, FileRecord, std::less<>> files(std::int64_t folder);

@@ -29,7 +29,7 @@ std::string header(const std::string& path) {
     return bytes;
 }
 
-/// The names beside the database that are taken in turn, from 1.
+/// The names for damaged databases: the first free one is taken, counting from 1.
 std::string nameForDamaged(const std::string& database, int number) {
     return number == 1 ? database + ".damaged" : fmt::format("{}.damaged-{}", database, number);
 }
@@ -88,9 +88,9 @@ bool isRebuilt(const std::string& database) {
 std::string putAside(const std::string& database) {
     int number = 1;
     while (fileExists(nameForDamaged(database, number))) ++number;
-    const bool isAside = number > 1 && !fileExists(database);  // since it was interrupted
+    const bool isAside = number > 1 && !fileExists(database);  // by a call that was interrupted
     const std::string aside = nameForDamaged(database, number);
-    // The log first, which nobody may take for that of the database to come.
+    // The log first, lest it be taken for the log of the new database.
     for (const char* part : {"-shm", "-wal", ""}) moveIfThere(database + part, aside + part);
     moveIfThere(rebuiltPath(database), database);
     return isAside ? nameForDamaged(database, number - 1) : aside;

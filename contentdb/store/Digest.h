@@ -7,8 +7,8 @@
 
 namespace qvct::contentdb {
 
-/// A number for bytes, to tell whether they are the same again. Fast, the same in every process, and no
-/// defence against those who want two to be equal.
+/// A number computed from bytes, to tell later whether they are still the same. Fast, the same in every
+/// process, and no defence against deliberate collisions.
 class Digest {
   public:
     void add(std::uint64_t word) {

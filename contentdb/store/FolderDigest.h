@@ -11,7 +11,7 @@ namespace qvct::contentdb {
 /// A content item as a folder lists it.
 struct ListedItem {
     std::string_view name;
-    /// Tells changes of the record, description and preview beside it as well, and of all that lies in a
+    /// Also shows changes of the record, description and preview beside the item, and of everything in a
     /// bundle.
     ItemStamp stamp;
 };

@@ -44,7 +44,7 @@ class IdSet {
 
     /// Sorted 16-bit numbers, little endian; or, for 4,096 members and more, the bits.
     std::string encoded() const;
-    /// Adds the members of an encoded set. Whether the bytes are one.
+    /// Adds the members of an encoded set. False when the bytes are no such set.
     bool insertEncoded(std::string_view bytes);
 
   private:

@@ -45,7 +45,7 @@ class ByteReader {
 
 /// What a describer said of an item: all but path, payload hash and stamp.
 std::string encodedDescription(const IndexedItem& item);
-/// Fills in what `encodedDescription` wrote. Whether the bytes are that.
+/// Fills in what `encodedDescription` wrote. False when the bytes are no such description.
 bool decodeDescription(std::string_view bytes, IndexedItem& item);
 
 }  // namespace qvct::contentdb

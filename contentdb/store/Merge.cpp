@@ -35,7 +35,7 @@ class Merge {
         : connection_(openDatabase(target, Access::write)), writer_(*connection_) {
         for (const std::string& database : databases) {
             auto connection = openToRead(database);
-            connection->run("BEGIN");  // all of it in one state, whatever a run writes meanwhile
+            connection->run("BEGIN");  // one consistent state, whatever a run writes meanwhile
             auto store = std::make_unique<ContentStore>(*connection);
             sources_.push_back({std::move(connection), std::move(store)});
         }
@@ -56,7 +56,8 @@ class Merge {
     };
     using Folders = std::map<std::string, std::vector<Part>, WalkOrder>;
 
-    /// Of all the sources; 0 when they differ, so that the next run reads everything again.
+    /// The describer that all the sources have in common; 0 when they differ, so that the next run reads
+    /// everything again.
     std::uint64_t describer() {
         std::set<std::uint64_t> describers;
         for (const Source& source : sources_) describers.insert(source.store->describer());

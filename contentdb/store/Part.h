@@ -7,7 +7,8 @@
 
 namespace qvct::contentdb {
 
-/// Which share of the items a run takes, from 1; by the path, so that all runs agree.
+/// The share of the items that a run takes, numbered from 1. An item's path decides which share it belongs
+/// to, so that all runs agree.
 struct Part {
     unsigned number = 1;
     unsigned count = 1;

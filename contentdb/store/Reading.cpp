@@ -17,7 +17,7 @@ namespace {
 constexpr std::chrono::seconds kPatience{10};
 constexpr std::chrono::milliseconds kPause{20};
 
-/// Nothing where a run that goes on has yet to put something.
+/// Null when the running run has stored nothing yet.
 std::unique_ptr<Connection> openUnlessEmpty(const std::string& path) {
     if (!fileExists(path)) return nullptr;
     auto connection = openDatabase(path, Access::read);
@@ -37,7 +37,7 @@ void finishRebuild(const std::string& path) {
 std::unique_ptr<Connection> openToRead(const std::string& name) {
     const std::string path = pathOfDatabase(name);
     const auto end = std::chrono::steady_clock::now() + kPatience;
-    // Asked before the database is looked at: all that a run has stored is there when it has ended.
+    // Asked before the database is looked at, so that a run that has ended has stored everything by then.
     while (RunLock::isHeld(path)) {
         if (auto connection = openUnlessEmpty(path)) return connection;
         if (std::chrono::steady_clock::now() > end) {

@@ -17,8 +17,8 @@
 namespace qvct::contentdb {
 namespace {
 
-/// Where the end of a table is damaged its last number is not known. No page stands for more rows than this,
-/// and no row is shorter.
+/// Where the end of a table is damaged, its last number is not known; the search then ends after so many
+/// numbers without a row. No page stands for more rows than that, and no row is shorter than `kShortestRow`.
 constexpr std::int64_t kMostMisses = 1 << 16;
 constexpr std::int64_t kShortestRow = 16;
 
@@ -32,8 +32,7 @@ auto readable(Read read) -> decltype(read()) {
     }
 }
 
-/// Null where the database is too damaged to be opened. A disk that is full, or does not answer, damages
-/// none.
+/// Null when the database is too damaged to be opened. A full or unreadable disk is not damage and throws.
 std::unique_ptr<Connection> openedIfReadable(const std::string& path) {
     try {
         return openDatabase(path, Access::read);
@@ -48,7 +47,7 @@ template <typename Visit>
 void forEachNumber(Connection& connection, const char* table, Visit visit) {
     const std::string sql = fmt::format("SELECT max(id) FROM {}", table);
     const std::int64_t bytes = connection.number("PRAGMA page_count") * kPageSize;
-    // Numbers far beyond what the file has room for are nobody's, whatever it says.
+    // The file has no room for numbers beyond this, whatever it claims.
     const std::int64_t last = std::min(bytes, readable([&] { return connection.number(sql.c_str()); }));
     const std::int64_t mostMisses = std::min(bytes / kShortestRow, kMostMisses);
     std::int64_t misses = 0;
@@ -65,7 +64,7 @@ std::set<std::string> knownFolders(Connection& connection) {
         row.reset();
         return isThere;
     });
-    // The index by path has them a second time.
+    // The index by path holds every path a second time.
     Statement all(connection, "SELECT path FROM folder ORDER BY path");
     while (readable([&all] { return all.step(); })) folders.emplace(all.bytes(0));
     return folders;
@@ -75,7 +74,7 @@ std::set<std::string> knownFolders(Connection& connection) {
 bool isInAnother(const std::string& path, const std::set<std::string>& folders) {
     std::string_view folder = path;
     while (folder != "/" && !folder.empty()) {
-        if (std::filesystem::is_symlink(folder)) return false;  // which its walk may pass over
+        if (std::filesystem::is_symlink(folder)) return false;  // the walk may not follow it
         folder = placeOf(folder).folder;
         if (folders.contains(std::string(folder))) return true;
     }

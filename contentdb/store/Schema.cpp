@@ -19,9 +19,8 @@ constexpr std::uint32_t kApplicationId = 0x51564344;  // "QVCD"
 
 /// Step N brings a database of version N to version N + 1. Steps are never changed, only added.
 constexpr std::array kMigrations = {
-    // Paths and names are blobs, since they need not be UTF-8. An item's folder is kept apart, so that a
-    // folder
-    // in which nothing has changed is passed over by its digest alone.
+    // Paths and names are blobs, since they need not be UTF-8. Folders have a table of their own, so that one
+    // in which nothing has changed can be passed over by its digest alone.
     R"(CREATE TABLE folder (
            id INTEGER PRIMARY KEY,
            path BLOB NOT NULL UNIQUE,
@@ -47,12 +46,12 @@ constexpr std::array kMigrations = {
        -- Tags as they are written, and the categories and number fields that a query may name.
        CREATE TABLE tag (term INTEGER PRIMARY KEY, label BLOB NOT NULL, category BLOB NOT NULL);
        CREATE TABLE field (isNumber INTEGER, name BLOB, PRIMARY KEY (isNumber, name)) WITHOUT ROWID;)",
-    // Of many copies the one of the same inode is found at once.
+    // Finds the copy with the same inode at once, however many copies there are.
     R"(CREATE TABLE setting (name TEXT PRIMARY KEY, value INTEGER NOT NULL) WITHOUT ROWID;
        DROP INDEX item_payload;
        CREATE INDEX item_payload ON item (payload, inode) WHERE length(payload) > 0;)",
-    // A digest speaks for the items of one part. Those of before may have outlived the items that they spoke
-    // for.
+    // A digest covers the items of one part only. Digests from before this step may be out of date, and are
+    // dropped.
     R"(ALTER TABLE folder ADD COLUMN part INTEGER NOT NULL DEFAULT 1;
        ALTER TABLE folder ADD COLUMN parts INTEGER NOT NULL DEFAULT 1;
        UPDATE folder SET digest = 0;)"};
@@ -124,7 +123,7 @@ void create(const std::string& path) {
     if (!renameFlushed(unborn, path, &error)) throw DatabaseFailure(kErrorUnwritable, error.message);
 }
 
-/// The file by an URI that says that nobody writes to it, so that no log is needed beside it.
+/// A URI of the file that says that nobody writes to it, so that no log is needed beside it.
 std::string immutableUri(const std::string& path) {
     std::string uri = "file:";
     for (const char c : std::filesystem::absolute(path).string())
@@ -138,7 +137,7 @@ std::unique_ptr<Connection> openForReading(const std::string& path) {
         prepare(*connection, Access::read);
         return connection;
     } catch (const DatabaseFailure& failure) {
-        // In a folder that cannot be written the shared state of the log cannot be made.
+        // In a folder that is not writable, the shared memory of the log cannot be created.
         const bool isOfFolder = failure.code() == kErrorUnreadable || failure.code() == kErrorUnwritable;
         std::error_code ignored;
         const std::string folder = std::filesystem::absolute(path, ignored).parent_path().string();

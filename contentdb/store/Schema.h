@@ -10,8 +10,9 @@ namespace qvct::contentdb {
 
 enum class Access { read, write };
 
-/// Opens a content database, making it (for `Access::write`) where there is none, and brings an older one to
-/// the present form. Refuses a file that is something else, damaged, or made by a newer version.
+/// Opens a content database. With `Access::write` a missing one is made and an older one is brought to the
+/// present form; with `Access::read` both are refused. So is a file that is something else, damaged, or made
+/// by a newer version.
 /// @throws DatabaseFailure: kErrorMalformed when it is a content database that is damaged.
 std::unique_ptr<Connection> openDatabase(const std::string& path, Access access);
 

@@ -78,7 +78,7 @@ std::string Connection::text(const char* sql) {
 }
 
 void Connection::checkPages() {
-    // A page whose writing was interrupted by a power failure is whole in the log.
+    // A page that a power failure left half written is still whole in the log.
     run("PRAGMA wal_checkpoint(PASSIVE)");
     sqlite3_file* file = nullptr;
     sqlite3_file_control(handle_, "main", SQLITE_FCNTL_FILE_POINTER, &file);

@@ -41,10 +41,10 @@ class Connection {
     /// The one number that a statement answers; 0 when it answers none.
     std::int64_t number(const char* sql);
     std::string text(const char* sql);
-    /// Reads every page of the file, so that each is held against its checksum; for a writer, as it takes
-    /// what the log has into the file before. @cost  That of reading the file.
+    /// Reads every page of the file, so that each checksum is checked. Only for a writer, since it moves the
+    /// log into the file first. @cost  That of reading the file.
     void checkPages();
-    /// Takes the log into the file. Closing does so as well, but does not tell when it fails.
+    /// Moves the log into the file. Closing does so as well, but does not report a failure.
     void emptyLog();
     [[noreturn]] void fail(std::string_view doing) const;
     const std::string& path() const { return path_; }
@@ -98,8 +98,8 @@ class Transaction {
     bool isOpen_ = true;
 };
 
-/// Runs `work` and answers its result; a failure becomes the error and `otherwise` the result. That of a
-/// damaged database names the remedy.
+/// Runs `work` and answers its result; when it throws, the failure becomes the error and `otherwise` the
+/// result. The error of a damaged database names the remedy.
 template <typename Result, typename Work>
 Result guarded(Error* error, Result otherwise, Work work) {
     try {

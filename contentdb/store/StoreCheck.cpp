@@ -30,7 +30,8 @@ class Tally {
     std::uint64_t count_ = 0;
 };
 
-/// The folder that does not hold what it is passed over for: its digest speaks of other items than it has.
+/// The first folder whose digest does not match the items that are stored for it, so that runs would wrongly
+/// pass it over.
 std::optional<std::string> misjudgedFolder(Connection& connection) {
     Statement folder(connection,
                      "SELECT id, path, digest, part, parts FROM folder WHERE digest <> 0 AND gone = 0");

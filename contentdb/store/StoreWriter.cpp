@@ -19,7 +19,7 @@ namespace {
 /// Most terms whose numbers are remembered; beyond that they are looked up again.
 constexpr std::size_t kMostCachedTerms = 200000;
 
-/// Most items of one payload that are asked whether they are gone.
+/// Of the items with one payload, at most so many are checked for being gone.
 constexpr int kMostCandidates = 16;
 
 /// Whether what lies there is of the kind that the name promises.
@@ -44,7 +44,8 @@ bool isGone(const std::string& path) {
     if (presence == Presence::there)
         return lookAt(path, Links::follow, status) == Presence::there && !isItem(path, status.kind);
     if (presence == Presence::unknown) return false;
-    // What is nearest to it decides: a link there would lead to it, were there something behind it.
+    // The nearest ancestor that exists decides. If that is a link that leads nowhere, the item may still be
+    // behind it.
     for (std::string_view above = placeOf(path).folder; !above.empty(); above = placeOf(above).folder) {
         const std::string nearest(above);
         if (lookAt(nearest, Links::keep, status) != Presence::there) continue;
@@ -125,8 +126,8 @@ std::optional<ItemId> StoreWriter::idOfMoved(const IndexedItem& item) {
         candidates.reset();
         return id;
     };
-    // A file that was only moved is the same to the file system. Else, of the copies that one sound may have,
-    // a few that are still where they were say enough.
+    // A file that was only moved keeps its inode. Otherwise a few of the copies that a sound may have are
+    // checked; if all of those are still in place, it counts as a new copy.
     const auto same = firstGone(sameFiles_.bind(1, item.payloadHash).bind(2, item.stamp.inode));
     return same ? same : firstGone(samePayloads_.bind(1, item.payloadHash));
 }
@@ -161,7 +162,7 @@ void StoreWriter::setFolder(FolderRecord folder) {
 
 void StoreWriter::leave(std::string_view path) {
     FolderRecord record = store_.folder(path);
-    // Once is enough: from then on the digest stays open.
+    // Once is enough: `setFolder` stores 0 for this folder from now on.
     if (left_.insert(record.id).second) setFolder(record);
 }
 
@@ -203,7 +204,7 @@ void StoreWriter::noteNames(const IndexedItem& item) {
     const auto noteTag = [&](const std::string& label, const std::string& category) {
         if (!names_.insert("t" + label + '\0' + category).second) return;
         noteField(false, category);
-        // Of spellings that differ in case one stands for all, the same whatever came first.
+        // Of spellings that differ only in case, one is kept for all; which one does not depend on the order.
         Statement(store_.connection(),
                   "INSERT INTO tag VALUES (?, ?, ?) ON CONFLICT DO UPDATE SET "
                   "label = min(label, excluded.label), category = min(category, excluded.category)")

@@ -12,8 +12,8 @@
 
 namespace qvct::contentdb {
 
-/// Whether no item lies at the path any more. What only cannot be looked at is not gone, nor what lies behind
-/// a link that leads nowhere at the moment: a disk may be away.
+/// Whether there is no item at the path any more. An item that merely cannot be looked at is not gone, and
+/// neither is one behind a link that leads nowhere at the moment: its disk may not be mounted.
 bool isGone(const std::string& path);
 
 /// Changes items and the index in batches: what lies between `begin` and `commit` is written whole or not at
@@ -26,19 +26,20 @@ class StoreWriter {
     void begin();
     void commit();
 
-    /// Stores the item under `id`, new or known; it replaces another that is in its place. `terms` are its
-    /// terms, sorted (see termsOf).
+    /// Stores the item under `id`, which may be new or known, in place of another item with the same path.
+    /// `terms` are its terms, sorted (see termsOf).
     void put(ItemId id, const IndexedItem& item, const std::vector<std::string>& terms);
     void remove(ItemId id);
     /// A known item of the same payload whose file is no longer there: the same item, moved.
     std::optional<ItemId> idOfMoved(const IndexedItem& item);
     void addEarlierPath(ItemId id, std::string_view path);
 
-    /// Notes what describes items from now on. What another has described counts as changed. A batch of its
-    /// own.
+    /// Notes which describer describes items from now on. If it is another one, all items count as changed.
+    /// This is a batch of its own.
     void setDescriber(std::uint64_t describer);
 
-    /// A folder that items have left since this writer was made keeps its digest open.
+    /// If items have left the folder since this writer was made, its digest is stored as 0: to be looked at
+    /// again.
     void setFolder(FolderRecord folder);
     ContentStore& store() { return store_; }
 

@@ -14,7 +14,7 @@ constexpr unsigned kFineShift = 44;    // sign, exponent and 8 bits of the manti
 constexpr unsigned kCoarseShift = 48;  // 4 bits of the mantissa stay
 constexpr std::uint64_t kSign = std::uint64_t{1} << 63U;
 
-/// Bits that order as the numbers do.
+/// Bits that sort as the numbers do.
 std::uint64_t orderedBits(double value) {
     const auto bits = std::bit_cast<std::uint64_t>(value == 0 ? 0.0 : value);  // one zero
     return (bits & kSign) != 0 ? ~bits : bits | kSign;

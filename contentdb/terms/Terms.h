@@ -10,13 +10,13 @@
 
 namespace qvct::contentdb {
 
-/// What an item is found by. A term is one such thing as bytes: the kind, then the value.
+/// The kinds of things that an item is found by. A term is one such thing as bytes: the kind, then the value.
 enum class TermKind : char {
     everything = 'a',  ///< every item that could be described
     coarseNumber = 'c',
     fineNumber = 'n',
     pack = 'k',
-    prefix = 'p',  ///< the first characters of a word, for words shorter than what is listed one by one
+    prefix = 'p',  ///< the first characters of a word, to find words by a short beginning
     tag = 't',     ///< a tag of the item, or one above it
     type = 'y',
     word = 'w'
@@ -30,9 +30,9 @@ std::string term(TermKind kind, std::string_view value = {});
 std::string tagTerm(std::string_view label, std::string_view category);
 std::string typeTerm(std::int64_t fileType);
 
-/// Numbers are grouped so that few terms cover any range: a fine group is a 256th of a power of two (its
-/// first number, such as a whole tempo, is a group of its own), a coarse one a 16th. Orders as the numbers
-/// do.
+/// A group of neighbouring numbers, so that few terms cover any range. A fine group spans a 256th of a power
+/// of two, but its first number, such as a whole tempo, is a group of its own; a coarse one spans a 16th.
+/// Terms sort as the numbers do.
 struct NumberGroup {
     std::string term;
     double first;
