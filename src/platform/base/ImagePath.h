@@ -4,8 +4,8 @@
 
 namespace qvct {
 
-/// The file that the code at this address was loaded from: a shared library, or the program. Links followed;
-/// empty when the system does not tell.
+/// The file that the code at this address was loaded from: a shared library, or the program. Links are
+/// followed; empty when the system does not know.
 std::filesystem::path imagePath(const void* code);
 
 }  // namespace qvct

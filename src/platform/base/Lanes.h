@@ -5,14 +5,15 @@
 
 namespace qvct {
 
-/// Four floats that are worked on at once, with the arithmetic of one; for the compilers' vector units.
+/// Four floats that are computed with at once, as if they were one; compilers use vector instructions for it.
 struct Lanes {
     using Vector = float __attribute__((vector_size(16)));
 
     Lanes() = default;
     Lanes(float all) : v{all, all, all, all} {}  // NOLINT(google-explicit-constructor): stands in for a float
     Lanes(Vector lanes) : v(lanes) {}            // NOLINT(google-explicit-constructor)
-    /// The first lane: how code that is written for numbers takes the cosine of one it repeated in all lanes.
+    /// The first lane: lets code written for numbers take the cosine of a value that is the same in all
+    /// lanes.
     operator float() const { return v[0]; }  // NOLINT(google-explicit-constructor)
 
     Lanes& operator+=(Lanes other) { return v += other.v, *this; }

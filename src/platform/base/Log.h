@@ -23,7 +23,7 @@ QVCT_API LogHandler setLogHandler(LogHandler handler);
 /// While it lives, messages of its thread begin with its prefix. Scopes do not nest.
 class QVCT_API LogScope {
   public:
-    /// From here on; what it replaces is not brought back.
+    /// Sets the prefix; when the scope ends, the one that it replaced does not come back.
     explicit LogScope(std::string prefix);
     LogScope(const LogScope&) = delete;
     LogScope& operator=(const LogScope&) = delete;

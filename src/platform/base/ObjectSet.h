@@ -39,7 +39,7 @@ class ObjectSet {
         for (const Pointer& object : other) insert(object);
     }
 
-    /// Removes the equal object. Whether there was one.
+    /// Removes the equal object. False when there was none.
     bool erase(const T& object) {
         const T* member = find(object);
         if (member == nullptr) return false;
@@ -69,7 +69,7 @@ class ObjectSet {
     bool empty() const { return objects_.empty(); }
     /// The objects in the order of insertion.
     const std::vector<Pointer>& ordered() const& { return objects_; }
-    /// Of a set that ends here: a loop over `set().ordered()` would outlive what it loops over.
+    /// A copy when called on a temporary: a loop over `set().ordered()` would otherwise outlive the set.
     std::vector<Pointer> ordered() && { return std::move(objects_); }
     auto begin() const { return objects_.begin(); }
     auto end() const { return objects_.end(); }

@@ -6,7 +6,7 @@
 namespace qvct {
 
 std::optional<SharedLibrary> SharedLibrary::load(const std::string& name, Error* error) {
-    // Its names stay its own: a host may have loaded another version.
+    // Its symbols stay local, since the host may have loaded another version of the library.
     if (void* handle = ::dlopen(name.c_str(), RTLD_LAZY | RTLD_LOCAL)) return SharedLibrary(name, handle);
     const char* reason = ::dlerror();
     fail(error, kErrorUnreadable, reason == nullptr ? name + ": cannot be loaded" : reason);

@@ -8,14 +8,16 @@
 
 namespace qvct {
 
-/// A library of the system that is loaded while the program runs. It stays until the process ends: what runs
-/// in threads of its own cannot be unloaded safely.
+/// A library of the system that is loaded while the program runs. It stays until the process ends: a library
+/// that has threads of its own cannot be unloaded safely.
 class SharedLibrary {
   public:
-    /// By its name with version, as the system's loader finds it. Nothing, and an error, when it does not.
+    /// Loads a library by its name with version, as the system's loader finds it. Nothing, and an error, when
+    /// the loader does not find it.
     static std::optional<SharedLibrary> load(const std::string& name, Error* error = nullptr);
 
-    /// Whether the library has such a function; it is put into `function`, whose type is the caller's word.
+    /// Whether the library has such a function, which is then put into `function`. The caller vouches for its
+    /// type.
     template <typename Function>
     bool find(const char* name, Function*& function, Error* error = nullptr) const {
         function = reinterpret_cast<Function*>(address(name, error));

@@ -12,7 +12,7 @@
 namespace qvct {
 namespace {
 
-/// Octal escapes above 0177 are characters of the encoding of the system that this form comes from.
+/// Octal escapes above 0177 are characters in the native encoding of the system that this form comes from.
 constexpr std::array<char16_t, 128> kUpperHalf = {
     0x00A0, 0x00C0, 0x00C1, 0x00C2, 0x00C3, 0x00C4, 0x00C5, 0x00C7, 0x00C8, 0x00C9, 0x00CA, 0x00CB, 0x00CC,
     0x00CD, 0x00CE, 0x00CF, 0x00D0, 0x00D1, 0x00D2, 0x00D3, 0x00D4, 0x00D5, 0x00D6, 0x00D9, 0x00DA, 0x00DB,
@@ -248,7 +248,7 @@ class Reader {
     PropertyListFault& fault_;
     std::size_t at_ = 0;
     std::size_t values_ = 0;
-    bool isFirst_ = false;  // nothing stands in the innermost container yet
+    bool isFirst_ = false;  // nothing was read in the innermost container yet
     PropertyListBuilder builder_;
 };
 

@@ -11,9 +11,9 @@ namespace qvct {
 /// Reads the oldest form of a property list: `{ key = value; }`, `(a, b)`, `<00ff>`, "quoted" or 'quoted'
 /// with escapes, bare words, comments as in C. It knows only dictionaries, arrays, texts and data.
 ///
-/// A bare word is no list by itself: nearly any text would begin with one. Nothing, and the fault, for a text
-/// that is none, nests over kDeepestPropertyList, has more than mostPropertyListValues, or goes on behind the
-/// value.
+/// A bare word alone is not taken for a list, since nearly any text begins with one. Nothing, and the fault,
+/// for a text that is no list, is nested deeper than kDeepestPropertyList, has more than
+/// mostPropertyListValues, or goes on behind the value.
 /// @cost  O(size), without recursion.
 std::optional<PropertyList> parseOldStylePropertyList(std::string_view text, PropertyListFault& fault);
 

@@ -8,9 +8,9 @@
 
 namespace qvct {
 
-/// Builds a property list from its parts in the order in which they stand, however deep, without recursion.
+/// Builds a property list, however deep, without recursion from its parts in the order of the text.
 ///
-/// Of a key that comes twice the last value holds, where the first one stood: most readers have it so.
+/// When a key comes twice, its last value takes the place of the first, as in most readers.
 class PropertyListBuilder {
   public:
     /// XML has no element for a UID: it is a dictionary with this one key, and a number that is not negative.

@@ -154,8 +154,8 @@ class TreeReader {
     PropertyListBuilder builder_;
 };
 
-/// A value as the library reads it from a binary list with this one object: the only way to hand it a date of
-/// more than 32 bits of seconds, a negative number or an unsigned one above the signed range.
+/// A value of the library's, made by letting it read a binary list with this one object: the only way to give
+/// it a date of more than 32 bits of seconds, a negative number or an unsigned one above the signed range.
 Node nodeOfObject(std::string object) {
     const std::size_t tableOffset = kFirstObject + object.size();
     std::array<char, 33> tail{};  // offset table of one entry, then the trailer
@@ -170,7 +170,7 @@ Node nodeOfObject(std::string object) {
     return Node(node);
 }
 
-/// The value as the library has it; a container without what it holds.
+/// The value as one of the library's; containers are empty.
 Node nodeOf(const PropertyList& value) {
     if (value.array() != nullptr) return Node(plist_new_array());
     if (value.dictionary() != nullptr) return Node(plist_new_dict());
@@ -219,9 +219,9 @@ Node treeOf(const PropertyList& value) {
     return root;
 }
 
-/// Why a text could not be read back, or null: the library ends texts at their first NUL and does not mind
-/// what is not Unicode, nor that XML knows no other control characters than tab and line ends and neither
-/// U+FFFE nor U+FFFF.
+/// Why a text could not be read back, or null. The library does not check: it ends texts at their first NUL,
+/// and writes bytes that are not Unicode, and into XML characters that XML forbids: control characters other
+/// than tab and line ends, U+FFFE and U+FFFF.
 const char* textFault(std::string_view text, PropertyListFormat format) {
     if (text.find('\0') != std::string_view::npos) return "a text with a NUL character";
     if (!isValidUtf8(text)) return "a text that is not valid Unicode";
@@ -234,7 +234,7 @@ const char* textFault(std::string_view text, PropertyListFormat format) {
     return isForbidden ? "a text with a character that XML forbids" : nullptr;
 }
 
-/// Why a value without what it holds could not be read back, or null.
+/// Why a value by itself, without what it contains, could not be read back, or null.
 const char* leafFault(const PropertyList& value, PropertyListFormat format) {
     if (const std::string* text = value.string()) return textFault(*text, format);
     const PropertyList::Date* when = value.date();
@@ -285,7 +285,7 @@ bool isBinary(std::span<const std::uint8_t> bytes) {
     return bytes.size() >= 6 && std::memcmp(bytes.data(), "bplist", 6) == 0;
 }
 
-/// Whether it is meant as XML: a "<" that opens no data of the old text form.
+/// Whether it is meant as XML: it begins with a "<" that does not open data of the old text form.
 bool isXml(std::string_view text) {
     const std::size_t start = std::min(text.find_first_not_of(" \t\r\n"), text.size());
     if (!text.substr(start).starts_with('<')) return false;
@@ -293,7 +293,7 @@ bool isXml(std::string_view text) {
     return end == std::string_view::npos || text[end] != '>';
 }
 
-/// The first byte behind the root element that is none of blanks, zeros, comments and instructions.
+/// The first byte behind the root element that is not part of a blank, zero, comment or instruction.
 std::optional<std::size_t> remainder(std::string_view text, std::size_t end) {
     constexpr std::string_view blanks(" \t\r\n\0", 5);
     constexpr std::array<std::pair<std::string_view, std::string_view>, 2> passedOver = {

@@ -19,18 +19,19 @@ namespace qvct {
 // values to 150,000 and one more for every 64 bytes, the texts and data that a binary list's shared
 // references expand to by its size. Everything that a property list can hold survives a read and a write in
 // either encoding, in its order, but for this: of a key that comes twice the last value holds, dates lose
-// fractions of a second in XML, and what carries no value (comments, attributes, the encoding, how a number
-// is spelled) is not kept.
+// fractions of a second in XML, and what is not part of a value (comments, attributes, the encoding, the
+// spelling of a number) is not kept.
 
-/// How many dictionaries and arrays of a property list may lie in each other. Deeper ones are refused as too
-/// large, when read and when written alike, so that what is written can be read.
+/// How deep dictionaries and arrays of a property list may be nested. Deeper ones are refused as too large,
+/// when read and when written alike, so that what is written can be read.
 inline constexpr int kDeepestPropertyList = 1024;
 
 /// The two encodings in which property lists are written.
 enum class PropertyListFormat { xml, binary };
 
 /// What a list is read for. Bytes behind the root element of an XML list (other than blanks, zeros and
-/// comments) do not keep it from being read, but rewriting would lose them: then they are an error.
+/// comments) are ignored when it is only read; they are an error when it is to be rewritten, since they would
+/// be lost.
 enum class PropertyListUse { reading, rewriting };
 
 /// @{
@@ -47,7 +48,7 @@ QVCT_API std::optional<PropertyList> parsePropertyList(std::string_view bytes, E
 
 /// XML with header, document type and tabs, or binary format 1.0. Empty, and an error, for what could not be
 /// read back: nesting over kDeepestPropertyList; too many keys and values; a text that is not UTF-8, with a
-/// NUL character or, in XML, with a character that XML forbids; a date outside of the years 1 to 9999.
+/// NUL character or, in XML, with a character that XML forbids; a date outside the years 1 to 9999.
 QVCT_API std::string serializePropertyList(const PropertyList& value, PropertyListFormat format,
                                            Error* error = nullptr);
 

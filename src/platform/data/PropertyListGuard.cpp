@@ -17,8 +17,9 @@ namespace {
 
 constexpr std::size_t kHeaderSize = 8;
 constexpr std::size_t kTrailerSize = 32;
-/// Most bytes of texts, as UTF-8, and data: those that come twice are often stored once, and three bytes of
-/// UTF-8 stand for two of UTF-16. There are two copies of them while the list is read.
+/// Most bytes of data, and of texts as UTF-8. They may exceed the file's size, since equal ones are often
+/// stored once and two bytes of UTF-16 become three of UTF-8. While the list is read, memory holds two copies
+/// of them.
 constexpr std::uint64_t mostPayload(std::size_t size) {
     return (std::uint64_t{8} << 20U) + std::uint64_t{size} / 2 * 3;
 }
@@ -189,7 +190,7 @@ class BinaryGraph {
         return !openPair;
     }
 
-    /// The library ends the process at a key with a NUL character.
+    /// The library aborts the process at a key with a NUL character.
     bool isKey(std::uint64_t index, std::size_t place) {
         Object object;
         if (!readObject(index, object)) return false;
@@ -250,7 +251,7 @@ class BinaryGraph {
 
     void close() {
         const Visit& visit = open_.back();
-        expanded_.values -= visit.totals.values;  // the container's place counts them once more
+        expanded_.values -= visit.totals.values;  // adding them to the container below counts them again
         expanded_.payload -= visit.totals.payload;
         states_[static_cast<std::size_t>(visit.index)] = State::done;
         totals_[static_cast<std::size_t>(visit.index)] = visit.totals;

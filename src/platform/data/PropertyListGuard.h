@@ -23,8 +23,8 @@ constexpr bool isPropertyListDate(double secondsSinceReferenceDate) {
     return secondsSinceReferenceDate >= -63114076800.0 && secondsSinceReferenceDate <= 252423993599.0;
 }
 
-/// Most keys and values, together, of a list of so many bytes, however it is spelled. One byte can spell one,
-/// which takes 200 in memory while it is read.
+/// Most keys and values, together, of a list of so many bytes, in whatever form. A single byte can stand for
+/// one, which takes 200 bytes of memory while it is read.
 constexpr std::size_t mostPropertyListValues(std::size_t size) {
     return 150'000 + size / 64;
 }

@@ -13,8 +13,8 @@ namespace qvct {
 ///
 /// Malformed XML is recovered up to where it makes sense. Nothing outside the text is ever read: no network,
 /// no external entities or document types. The XML library's own bounds on depth, names and the growth of
-/// entities hold, and those of XmlParsing.h on attributes, name spaces, elements and encodings: what is
-/// behind them is left out, or nothing is read. Use a document from one thread at a time.
+/// entities apply, and those of XmlParsing.h on attributes, name spaces, elements and encodings: what exceeds
+/// them is left out, or nothing is read. Use a document from one thread at a time.
 class XmlDocument {
   public:
     /// A name that ends in ".zxml" says that the file is compressed. Null, and an error, when the file cannot

@@ -17,7 +17,7 @@ struct _xmlXPathObject;
 
 namespace qvct {
 
-/// Frees what the XML library hands out; a parser with the document that it has made so far.
+/// Frees objects of the XML library; a parser together with the document that it has built so far.
 struct XmlCloser {
     void operator()(_xmlBuffer* buffer) const;
     void operator()(_xmlDoc* document) const;

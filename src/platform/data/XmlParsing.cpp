@@ -15,26 +15,27 @@
 namespace qvct {
 namespace {
 
-/// Damaged documents may cause a fault for each line.
+/// Limited, since a damaged document may cause a fault on every line.
 constexpr std::size_t kMostFaults = 5;
 
-/// Declared, these change nothing for the library: it has told the width of characters by the first bytes.
+/// Declaring one of these changes nothing for the library: it knows the width of characters from the first
+/// bytes.
 constexpr std::array<std::string_view, 4> kUnswitchedEncodings = {"utf-8", "utf8", "utf-16", "utf16"};
 
-/// Encodings in which the bytes of markup occur in no other character, by how their names begin. Shifted ones
-/// such as ISO 2022 are none.
+/// How the names of those encodings begin in which the bytes of markup occur in no other character. Encodings
+/// with shift sequences, such as ISO 2022, are not among them.
 constexpr std::array<std::string_view, 21> kAsciiEncodings = {
     "ascii",     "us-ascii",  "iso-8859", "iso8859", "latin", "iso_8859",  "windows-",
     "cp125",     "cp85",      "cp86",     "gb",      "big5",  "x-sjis",    "sjis",
     "shift_jis", "shift-jis", "euc-",     "x-euc",   "koi8-", "macintosh", "x-mac-"};
 
-/// How many bytes a character of markup takes, and which of them has its letter.
+/// How many bytes a character of markup takes, and which of them holds its ASCII code.
 struct Characters {
     std::size_t width = 1;
     std::size_t letter = 0;
 };
 
-/// As the library tells them by the first bytes.
+/// What the library concludes from the first bytes.
 Characters charactersOf(std::string_view text) {
     using namespace std::string_view_literals;
     if (text.starts_with("<\0\0\0"sv)) return {4, 0};
@@ -103,7 +104,8 @@ std::size_t lineAt(std::string_view text, std::size_t offset) {
                    std::count(text.begin(), text.begin() + static_cast<std::ptrdiff_t>(offset), '\n'));
 }
 
-/// Where the value begins whose "=" stands at that place, its quote; the size when there is none.
+/// The offset of the quote that opens the value after the "=" at `equals`; the text's size when there is
+/// none.
 std::size_t valueBehind(std::string_view text, std::size_t equals) {
     std::size_t at = equals + 1;
     while (at < text.size() && isBlank(text[at])) ++at;
@@ -179,7 +181,8 @@ class Parser {
                               defaultedCount, attributes);
     }
 
-    /// What an entity holds is parsed as it stands here, character references replaced.
+    /// The content is parsed where the entity is used, in the form in which it is given here: with character
+    /// references replaced.
     static void declareEntity(void* context, const xmlChar* name, int type, const xmlChar* publicId,
                               const xmlChar* systemId, xmlChar* content) {
         const auto* text = reinterpret_cast<const char*>(content);
@@ -218,7 +221,7 @@ std::optional<std::size_t> attributeTooMany(std::string_view text) {
     std::size_t at = 0;
     while ((at = text.find('<', at)) != std::string_view::npos) {
         int count = 0;
-        // No attribute goes on behind a "<", whatever is wrong with the text.
+        // A "<" always ends the attributes of a tag, however malformed the text is.
         for (++at; at < text.size() && text[at] != '<' && text[at] != '>'; ++at) {
             if (text[at] != '=') continue;
             const std::size_t quote = valueBehind(text, at);

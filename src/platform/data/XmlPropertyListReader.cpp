@@ -46,7 +46,7 @@ std::optional<Element> elementNamed(std::string_view name) {
     return hit == names.end() ? std::nullopt : std::optional(hit->second);
 }
 
-/// Whether its characters are more than blanks between elements.
+/// Whether the element holds characters: in others only blanks may stand, between elements.
 bool holdsCharacters(Element element) {
     return element == Element::key || element == Element::text || element == Element::integer ||
            element == Element::real || element == Element::date || element == Element::data;
@@ -144,8 +144,8 @@ std::optional<PropertyList> dateOf(std::string_view text) {
     return PropertyList::Date{sinceReference.count()};
 }
 
-/// Builds the value from the events of the XML parser, and says the first thing that no property list has.
-/// `where` tells the offset of an event's first byte, when it is asked.
+/// Builds the value from the events of the XML parser, and keeps the first fault: the first thing that may
+/// not be in a property list. `where()` answers the offset of an event's first byte.
 class Reader {
   public:
     explicit Reader(std::size_t size) : mostValues_(mostPropertyListValues(size)) {}
@@ -221,7 +221,7 @@ class Reader {
     struct Open {
         Element element;
         std::size_t children;
-        std::size_t offset;  // of what holds characters
+        std::size_t offset;  // of its characters, where it holds some
     };
 
     bool mayStandHere(Element element) const {
@@ -296,11 +296,12 @@ class Parser {
                                [&] { return p.offsetOf(part); });
             });
         };
-        // Entities of one's own multiply; nothing that writes property lists makes any.
+        // Declared entities can multiply the text; no program that writes property lists declares any.
         handler.entityDecl = [](void* self, const xmlChar*, int, const xmlChar*, const xmlChar*, xmlChar*) {
             tell(self, [](Parser& p) { p.reader_.refuse("an entity declaration", p.lastTag()); });
         };
-        // Nothing that reads a property list looks at attributes; the parser compares each with all others.
+        // Attributes mean nothing in a property list, and the parser compares each declaration with all
+        // others.
         handler.attributeDecl = [](void* self, const xmlChar*, const xmlChar*, int, int, const xmlChar*,
                                    xmlEnumerationPtr choices) {
             xmlFreeEnumeration(choices);
@@ -317,7 +318,8 @@ class Parser {
             parser.isStopped_ = true;  // the parser stops by itself, and must not be stopped amid an error
         };
         context_.reset(xmlCreatePushParserCtxt(&handler, this, nullptr, 0, nullptr));
-        // Its own limit of depth lies below ours; the encoding is known, and not always the declared one.
+        // The library's limit of depth is below ours, so it is switched off; the encoding is known, and not
+        // always the declared one.
         if (context_)
             xmlCtxtUseOptions(context_.get(), XML_PARSE_NONET | XML_PARSE_HUGE | XML_PARSE_IGNORE_ENC);
     }
@@ -354,14 +356,15 @@ class Parser {
         return std::min(static_cast<std::size_t>(std::max(consumed, 0L)), text_.size());
     }
 
-    /// Where the tag begins that the parser has just read.
+    /// The offset of the tag that the parser has just read.
     std::size_t lastTag() const {
         const std::size_t here = offset();
         const std::size_t tag = here == 0 ? std::string_view::npos : text_.rfind('<', here - 1);
         return tag == std::string_view::npos ? here : tag;
     }
 
-    /// Where the characters stand that the parser hands out: mostly in its input, else just before.
+    /// The offset of characters that the parser hands out. Mostly they point into its input; otherwise they
+    /// begin behind the last tag.
     std::size_t offsetOf(const xmlChar* characters) const {
         const xmlParserInput& input = *context_->input;
         if (characters >= input.base && characters < input.end)

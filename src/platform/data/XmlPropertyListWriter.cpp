@@ -114,7 +114,7 @@ class Writer {
         writeLine("</dict>");
     }
 
-    /// A reader takes a carriage return that stands for itself as the end of a line.
+    /// A carriage return is escaped: readers would turn a plain one into a line feed.
     void writeText(std::string_view element, std::string_view text) {
         out_ += fmt::format("<{}>", element);
         for (std::size_t special = 0; (special = text.find_first_of("&<>\r")) != std::string_view::npos;

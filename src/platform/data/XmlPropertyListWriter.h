@@ -6,7 +6,7 @@
 
 namespace qvct {
 
-/// The value as XML, which has to be able to hold it, with header, document type and tabs.
+/// The value as XML, with header, document type and tabs. The value must be one that XML can hold.
 std::string xmlPropertyList(const PropertyList& value);
 
 }  // namespace qvct

@@ -23,7 +23,7 @@ class ReadWindow {
     std::uint64_t size() const { return size_; }
     /// `count` (at most kSize) bytes at `offset`, valid until the next call; null when they cannot be read.
     const std::uint8_t* at(std::uint64_t offset, std::size_t count);
-    /// Past the buffer when `into` is larger than it.
+    /// Reads directly, bypassing the buffer, when `into` is larger than it.
     bool copy(std::uint64_t offset, std::span<std::uint8_t> into);
 
   private:
@@ -41,10 +41,11 @@ class ReadWindow {
     Buffer other_;  // the place that was read last
 };
 
-/// The one way in which containers read: it parses and advances, or fails, and never looks past its end.
+/// All reading of containers goes through this: it parses and advances, or fails, and never looks past its
+/// end.
 ///
 /// A read that does not fit fails the cursor for good: it and all later ones give 0 or nothing, and `failed`
-/// says so. So a parser reads a whole header and asks once.
+/// says so. So a parser can read a whole header and check once.
 class BoundedCursor {
   public:
     /// Over `size` bytes at `offset`, less where the file ends before.

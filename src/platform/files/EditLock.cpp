@@ -28,7 +28,7 @@ struct Held {
     int count = 1;
 };
 
-/// Without the copies that a forked process has of its parent's.
+/// The locks that this thread holds, without those that a forked process inherited from its parent.
 std::vector<Held>& heldByThisThread() {
     thread_local std::vector<Held> held;
     std::erase_if(held, [](const Held& each) { return std::get<int>(each.key) != ::getpid(); });
@@ -64,8 +64,8 @@ std::string holderOf(std::uint64_t inode) {
     return {};
 }
 
-/// Asked for again and again: a wait that the system ends after a time would need signals. Zero or the reason
-/// why not.
+/// Tries again and again, since a blocking wait with a time limit would need signals. Zero, or an error
+/// number.
 int lockWithin(int folder, std::chrono::milliseconds patience) {
     using Clock = std::chrono::steady_clock;
     constexpr std::chrono::milliseconds kLongestPause(10);

@@ -11,22 +11,21 @@
 
 namespace qvct {
 
-/// A turn at editing what lies at a path. All writers of the framework take one from before they read what
-/// they change until it is written; a host that reads an item, decides and writes holds one around all three,
-/// and no tag of another writer is lost.
+/// A turn at editing what lies at a path. All writers of the framework hold one from before they read until
+/// they have written; a host that reads an item, decides and writes holds one around all three, so that no
+/// tag of another writer is lost.
 ///
 /// It is an advisory lock (`flock`) on the folder that the item lies in, links followed. It leaves no file
 /// behind and ends with the process, however that ends. A thread that holds it takes it again at once; it is
 /// to be given back by the thread that took it. A process that is forked meanwhile has no part in it. Where
-/// the folder cannot be opened or its file system has no locks, everybody is let through: then a write over
-/// what another writer changed meanwhile is an error.
+/// the folder cannot be opened or its file system has no locks, nobody waits; a write then fails if another
+/// writer changed the file meanwhile.
 class QVCT_API EditLock {
   public:
-    /// How long a turn is waited for.
+    /// How long `acquire` waits for its turn.
     static constexpr std::chrono::milliseconds kPatience = std::chrono::seconds(30);
 
-    /// Null, and an error that names the process whose turn it is then, when it is still another's after
-    /// `patience`.
+    /// Null when another process still holds the turn after `patience`; the error names that process.
     static std::unique_ptr<EditLock> acquire(const std::string& path, Error* error = nullptr,
                                              std::chrono::milliseconds patience = kPatience);
     EditLock(const EditLock&) = delete;

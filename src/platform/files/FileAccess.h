@@ -22,8 +22,7 @@ bool fileExists(const std::string& path);
 bool isDirectory(const std::string& path);
 bool isRegularFile(const std::string& path);
 
-/// Whether this user may read the file; else an error. Whether there is anything to be read is another
-/// matter.
+/// Whether this user may read the file; else false and an error. It need not hold anything readable.
 bool mayRead(const std::string& path, Error* error = nullptr);
 /// Whether this user may write it, or make files in it if it is a folder.
 bool mayWrite(const std::string& path);
@@ -40,7 +39,8 @@ std::optional<std::vector<std::uint8_t>> readFile(const std::string& path, Error
 std::optional<std::string> readTextFile(const std::string& path, Error* error = nullptr);
 
 /// Replaces the file at `path` (or makes it) so that at any instant, and after a crash at any instant, either
-/// the old or the new contents stand there, whole; how, and what it takes over: `replaceFileByPieces`.
+/// the old or the new contents stand there, whole. See `replaceFileByPieces` for how, and for what the new
+/// file takes over.
 bool replaceFile(const std::string& path, std::string_view bytes, Error* error = nullptr);
 
 }  // namespace qvct

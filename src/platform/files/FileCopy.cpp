@@ -11,7 +11,7 @@
 namespace qvct {
 namespace {
 
-/// Where the kernel cannot copy by itself, and where no whole block is left to share.
+/// Copies by reading and writing: where the kernel cannot copy, and where no whole block is left to share.
 bool copyThroughBuffer(FileRange range) {
     std::vector<char> buffer(std::min<std::uint64_t>(range.length, 1U << 18U));
     while (range.length > 0) {

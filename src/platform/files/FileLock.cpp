@@ -15,9 +15,9 @@ namespace {
 
 using Identity = std::pair<dev_t, ino_t>;
 
-/// The locks that this process has: the system tells it of others' only, and lifts its own as soon as the
-/// file is closed anywhere in the process. So no lock of ours is looked at, and looking is done by one thread
-/// at a time.
+/// The locks that this process holds. The system reports only other processes' locks, and lifts ours as soon
+/// as any descriptor of the file is closed in this process. So a file that we hold is never opened again, and
+/// one thread at a time checks.
 struct Own {
     std::mutex mutex;
     std::set<Identity> locks;
@@ -28,7 +28,7 @@ Own& own() {
     return own;
 }
 
-/// Of the file at the path, or that is open.
+/// The identity of the file at the path; the second one takes an open file.
 std::optional<Identity> identityOf(const std::string& path) {
     struct stat status {};
     return ::stat(path.c_str(), &status) == 0 ? std::optional(Identity(status.st_dev, status.st_ino))
@@ -52,7 +52,7 @@ struct flock wholeFile() {
     return lock;
 }
 
-/// The process that has the lock; not the one that asks.
+/// The other process that has the lock, if there is one.
 std::optional<pid_t> holderOf(int file) {
     struct flock lock = wholeFile();
     const bool isHeld = ::fcntl(file, F_GETLK, &lock) == 0 && lock.l_type != F_UNLCK;

@@ -36,8 +36,8 @@ std::uint64_t lengthOf(const FilePiece& piece) {
     return piece.length > 0 ? piece.length : piece.bytes.size();
 }
 
-/// Where the ranges end that keep their place in the file, from its beginning on. They are copied in one go,
-/// which is fastest and shares most, and the new bytes between them are then written over it.
+/// The end of the leading ranges that keep their place in the file. All up to there is copied in one go,
+/// which is fastest and shares most blocks; the new bytes between the ranges are then written over the copy.
 std::uint64_t endOfUnmoved(std::span<const FilePiece> pieces) {
     std::uint64_t position = 0;
     std::uint64_t end = 0;
@@ -60,14 +60,15 @@ std::string folderOf(const std::string& path) {
     return slash == std::string::npos ? "./" : path.substr(0, slash + 1);
 }
 
-/// False, and the reason in `errno`, when it cannot be renamed; else its folder knows of it on the disk, too.
+/// Renames the file and flushes its folder, so that the new name is on the disk. False, and `errno` says why,
+/// when it cannot be renamed.
 bool renameOnDisk(const std::string& from, const std::string& to) {
     if (::rename(from.c_str(), to.c_str()) != 0) return false;
     flushFolder(folderOf(to));
     return true;
 }
 
-/// A user's attributes must come along; labels that the system guards are its own affair.
+/// Attributes that the system guards may be left behind; a user's may not.
 bool isOptionalAttribute(std::string_view name) {
     return name.starts_with("security.") || name.starts_with("trusted.");
 }
@@ -90,7 +91,7 @@ bool takeOverAttributes(int from, int to) {
     return true;
 }
 
-/// What members of the group could do, where the new file is another group's: no more than everybody could.
+/// The mode for a file that could not keep its group: the new group may do no more than everybody may.
 mode_t withoutGroup(mode_t mode) {
     const mode_t others = mode & 07U;
     return (mode & ~mode_t{070}) | (mode & (others << 3U));
@@ -101,8 +102,8 @@ void takeOverOwner(const struct stat& old, int to) {
     [[maybe_unused]] const int ignored = ::fchown(to, static_cast<uid_t>(-1), old.st_gid);
 }
 
-/// After the owner, since changing that clears bits of the mode, and the attributes, since some are about
-/// access, too.
+/// To be called after the owner was changed, which clears bits of the mode, and after the attributes were,
+/// some of which control access.
 bool takeOverMode(const struct stat& old, int to) {
     struct stat now {};
     if (::fstat(to, &now) != 0) return false;
@@ -117,12 +118,12 @@ bool takeOverTimes(const struct stat& old, int to) {
     return ::futimens(to, times) == 0;
 }
 
-/// Whether the file system said that it has no such way to rename.
+/// Whether the error means that the file system does not support this kind of renaming.
 bool isUnsupported(int reason) {
     return reason == EINVAL || reason == ENOSYS || reason == ENOTSUP;
 }
 
-/// Whether a file keeps its number however often it is renamed.
+/// Whether files keep their inode number when they are renamed: on an overlay they may not.
 bool keepsInodes(int file) {
     struct statfs system {};
     return ::fstatfs(file, &system) != 0 || system.f_type != OVERLAYFS_SUPER_MAGIC;
@@ -142,7 +143,7 @@ class Replacement {
     bool run(std::span<const FilePiece> pieces) {
         if (!openOld()) return false;
         if (options_.isDryRun) return canMakeFile();
-        std::error_code notMade;  // the file cannot be made then, either
+        std::error_code notMade;  // making the file will fail, and say why
         if (options_.makesFolders) std::filesystem::create_directories(folder_, notMade);
         removeLeftFiles(folder_);
         UnfinishedFile made(folder_, old_ ? 0600 : 0666);
@@ -153,7 +154,7 @@ class Replacement {
     }
 
   private:
-    /// False when there is an old file that must not be replaced, or it cannot be told.
+    /// Opens the old file, if there is one. False when it must not be replaced, or that cannot be found out.
     bool openOld() {
         struct stat status {};
         if (::stat(target_.c_str(), &status) != 0) {
@@ -174,8 +175,8 @@ class Replacement {
         return isReplaceable() && isExpected(FileStamp::of(status_));
     }
 
-    /// Where everybody may make files (the folder for temporary ones), others' may be written but not
-    /// replaced.
+    /// In a folder where everybody may make files (such as that for temporary files), only its owner may
+    /// replace a file.
     bool isReplaceable() const {
         struct stat folder {};
         const uid_t user = ::geteuid();
@@ -218,7 +219,7 @@ class Replacement {
         return endsAt(position, to) || failToWrite(position);
     }
 
-    /// A hole at the end is one only because the file is said to be that long.
+    /// A hole at the end was not written, so the file must be extended to its full length.
     static bool endsAt(std::uint64_t size, int to) {
         struct stat status {};
         if (::fstat(to, &status) != 0) return false;
@@ -280,7 +281,7 @@ class Replacement {
     }
 
     bool exchange(UnfinishedFile& made) const {
-        ::flock(old_->number(), LOCK_SH | LOCK_NB);  // not left behind, while it has the other's name
+        ::flock(old_->number(), LOCK_SH | LOCK_NB);  // so that nobody removes it as left behind
         if (!made.renameForExchangeWith(*options_.expected)) {
             return failWithErrno(error_, path_, "cannot be replaced");
         }
@@ -291,7 +292,7 @@ class Replacement {
             return failWithErrno(error_, path_, "cannot be replaced");
         }
         if (!isOld(FileStamp::ofFile(made.path()))) return putBack(made, placed);
-        // The old file may go when the disk knows of the new one.
+        // The old file is removed only after the new one's name is on the disk.
         flushFolder(folder_);
         return true;
     }
@@ -308,7 +309,8 @@ class Replacement {
         return stamp == *options_.expected;
     }
 
-    /// Puts what another program saved back to its place, until nothing newer of it comes out.
+    /// Puts back what another program saved, again and again if it saves meanwhile, until our own file comes
+    /// out.
     bool putBack(UnfinishedFile& made, FileStamp placed) const {
         for (bool isDone = false; !isDone;) {
             const FileStamp saved = FileStamp::ofFile(made.path());

@@ -15,7 +15,7 @@
 namespace qvct {
 namespace {
 
-/// Some file systems do not tell the kind in their lists.
+/// Some file systems do not report the kind of an entry in their listings.
 EntryKind kindOf(int folder, const dirent& entry) {
     struct stat status {};
     status.st_mode = DTTOIF(entry.d_type);

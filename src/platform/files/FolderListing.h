@@ -15,7 +15,7 @@
 namespace qvct {
 
 /// The names in a folder, sorted by their bytes, without those that begin with a dot. The folder stays open
-/// as long as the listing lives, so that its entries are found in it, wherever it is moved meanwhile.
+/// as long as the listing lives, so that its entries are found even if it is moved meanwhile.
 class FolderListing {
   public:
     struct Entry {
@@ -25,7 +25,7 @@ class FolderListing {
 
     /// Nothing, and an error, for what is no folder or cannot be read to its end.
     static std::optional<FolderListing> read(const std::string& path, Error* error = nullptr);
-    /// Of a folder in this one; nothing when it is none, or cannot be read to its end.
+    /// Lists a folder in this one; nothing when the entry is no folder, or cannot be read to its end.
     std::optional<FolderListing> readIn(const Entry& folder, Links links) const;
 
     const std::vector<Entry>& entries() const { return entries_; }

@@ -16,11 +16,11 @@ namespace qvct {
 /// start-up, before the first look-up of another thread.
 class QVCT_API ResourceBundle {
   public:
-    /// An empty path sets nothing again.
+    /// An empty path undoes the setting.
     static void setDirectory(std::string path);
     /// The folder set by `setDirectory` or the environment; empty when none is.
     static std::string directory();
-    /// Takes one resource from a file of its own; nothing leaves it to the compiled-in copy.
+    /// Takes one resource from a file of its own; without a path the compiled-in copy is used.
     static void setPathForResource(std::string_view name, std::string_view extension,
                                    std::optional<std::string> path);
     /// The path of the resource if a file of that name exists in one of the folders.

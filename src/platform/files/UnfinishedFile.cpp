@@ -31,14 +31,14 @@ constexpr std::string_view kSuffix = ".tmp";
 struct Slot {
     enum State { free, changing, used, removing };
     std::atomic<int> state = free;
-    std::atomic<pid_t> owner = 0;  // a forked process has a copy
+    std::atomic<pid_t> owner = 0;  // tells this process from one forked from it
     std::array<char, PATH_MAX> path{};
 };
 std::array<Slot, 16> slots;
 
 constexpr std::array kEndingSignals = {SIGINT, SIGTERM, SIGHUP};
 
-/// The signal comes again, and ends the process, when this returns. Until then other threads go on.
+/// Raises the signal again, which ends the process when this returns. Until then other threads go on.
 void removeUnfinishedFilesAndEnd(int signal) {
     for (Slot& slot : slots) {
         int expected = Slot::used;
@@ -48,7 +48,7 @@ void removeUnfinishedFilesAndEnd(int signal) {
     ::raise(signal);
 }
 
-/// The number of a slot of one's own; one past the last when there is none.
+/// Reserves a free slot and answers its number; one past the last when there is none.
 std::size_t takeSlot() {
     for (std::size_t i = 0; i < slots.size(); ++i) {
         int expected = Slot::free;
@@ -70,7 +70,7 @@ void freeSlot(std::size_t slot) {
     if (state != Slot::removing) slots[slot].state.compare_exchange_strong(state, Slot::free);
 }
 
-/// FNV-1a of a stamp, which stands for it in names.
+/// FNV-1a hash of a stamp, by which file names refer to it.
 std::uint64_t markOf(const FileStamp& stamp) {
     std::uint64_t hash = 0xcbf29ce484222325U;
     for (std::uint64_t value :
@@ -123,7 +123,7 @@ void removeIfLeft(int folder, const char* name) {
     if (isKnown) ::unlinkat(folder, name, 0);
 }
 
-/// Whether a folder was looked through within the last second.
+/// Whether this folder was the last to be searched, less than a second ago.
 bool isLookedThrough(const std::string& folder) {
     using Clock = std::chrono::steady_clock;
     static std::mutex guard;
@@ -156,7 +156,7 @@ bool UnfinishedFile::make(const std::string& name, mode_t mode) {
     const std::string path = folder_ + name;
     FileDescriptor file(::open(path.c_str(), O_RDWR | O_CREAT | O_EXCL | O_CLOEXEC, mode));
     if (!file.isOpen()) return false;
-    // Before the lock it may be taken for one that was left behind.
+    // Until it is locked, another process may take it for one that was left behind and remove it.
     const bool isTaken = ::flock(file.number(), LOCK_EX | LOCK_NB) != 0 && errno == EWOULDBLOCK;
     struct stat status {};
     const bool isPrivate = ::fstat(file.number(), &status) == 0 &&

@@ -18,9 +18,9 @@ namespace qvct {
 /// killed process left behind can be told from what is being written.
 class UnfinishedFile {
   public:
-    /// Makes one in a folder, whose path ends with "/". `mode` is that of its creation, of which the
-    /// process's mask and the folder take their part; whatever that leaves, only the owner may read what is
-    /// written.
+    /// Makes one in a folder, whose path ends with "/". It is created with `mode`, from which the process's
+    /// mask and the folder take away bits (see `modeAtCreation`); until it is finished only its owner can
+    /// read it.
     UnfinishedFile(const std::string& folder, mode_t mode);
     UnfinishedFile(const UnfinishedFile&) = delete;
     UnfinishedFile& operator=(const UnfinishedFile&) = delete;
@@ -33,14 +33,15 @@ class UnfinishedFile {
     /// The mode that it was made with, less what the mask and the folder took from it.
     mode_t modeAtCreation() const { return modeAtCreation_; }
 
-    /// Gives it a name that tells which file is to come out when it is exchanged for the one at its place.
-    /// What stands under such a name is removed by a later write only when it is one of these two, for else
-    /// it is what another program saved at that moment. Signals that end the program leave it alone for the
-    /// same reason. False, and `errno`, on failure.
+    /// Gives it a name that identifies both this file and the old one that it is to be exchanged with. A
+    /// later write removes a file of such a name only if it is one of these two; any other is what another
+    /// program saved at that moment. Signals that end the program leave it alone for the same reason. False,
+    /// and `errno` says why, on failure.
     bool renameForExchangeWith(const FileStamp& old);
     /// Removes what stands under its name now, unless it was released.
     void remove();
-    /// Nothing is left to remove: it took its place, or what stands under its name is not ours.
+    /// Keeps `remove` from doing anything: the file took its place, or what stands under its name is not
+    /// ours.
     void release();
 
   private:
@@ -51,7 +52,7 @@ class UnfinishedFile {
     std::string path_;
     FileDescriptor file_{-1};
     mode_t modeAtCreation_ = 0;
-    pid_t owner_;  // a forked process has a copy
+    pid_t owner_;  // tells this process from one forked from it
     std::size_t slot_;
 };
 
@@ -61,13 +62,14 @@ class UnfinishedFile {
 void removeLeftFiles(const std::string& folder);
 
 /// Has the signals by which a user ends a program (interrupt, terminate, hang up) remove the unfinished files
-/// of this process before they end it. One that another thread is just exchanging stays; the next write in
-/// its folder removes it. Those signals that the process ignores stay ignored. For programs of their own: a
-/// host's signals are its own affair.
+/// of this process before they end it. A file that another thread is just exchanging stays; the next write in
+/// its folder removes it. Signals that the process ignores stay ignored. For stand-alone programs only: a
+/// library must not touch its host's signals.
 void removeUnfinishedFilesWhenEnded();
 
-/// Holds back the signals by which a user ends a program, for the moments in which nothing knows of a file
-/// that is to be removed. In this thread alone: another one may end the program meanwhile.
+/// Blocks the signals by which a user ends a program, during the moments in which a file exists that the
+/// signal handler does not know of. Blocks them in this thread alone: another thread may still receive one
+/// and end the program.
 class EndingSignalsHeld {
   public:
     EndingSignalsHeld();

@@ -20,15 +20,16 @@
 namespace qvct {
 namespace {
 
-/// Clear of the numbers that the child gets its files under. A host may have closed some of these.
+/// A copy of the descriptor whose number is none of the child's standard streams: a host may have closed its
+/// own, so that new files get these numbers. Closes the one given.
 FileDescriptor raised(int descriptor) {
     constexpr int kFirst = STDERR_FILENO + 1;
     const FileDescriptor given(descriptor);
     return FileDescriptor(::fcntl(given.number(), F_DUPFD_CLOEXEC, kFirst));
 }
 
-/// What the child gets: its files, and signals as if nobody had ever touched them, except that the interrupt
-/// of a terminal, which reaches all of its processes, is this process's affair.
+/// What the child gets: its files, and default signal handling, except that SIGINT is blocked: a terminal
+/// sends it to all of its processes, and this one decides what it means.
 class SpawnPlan {
   public:
     SpawnPlan(int input, int output) {
@@ -52,7 +53,7 @@ class SpawnPlan {
         ::posix_spawnattr_destroy(&attributes_);
     }
 
-    /// The number of the process, or nothing, and `errno` says why.
+    /// The process's id; or nothing, and `errno` says why.
     std::optional<pid_t> start(std::string program, std::vector<std::string> arguments) const {
         std::vector<char*> words = {program.data()};
         for (std::string& argument : arguments) words.push_back(argument.data());

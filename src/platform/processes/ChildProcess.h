@@ -22,8 +22,9 @@ struct ProcessEnd {
 /// A program of our own that runs beside this process, and no longer than it. Both send bytes to each other,
 /// and see one stretch of memory; `ParentProcess` is the other end.
 ///
-/// It is a new process image, not a copy of this one: whatever locks other threads have at that moment, it
-/// can do its work. It has this process's environment, current folder and standard error, and no other file.
+/// It is a new program, not a copy of this process, so that locks which other threads hold at that moment
+/// cannot block it. It inherits this process's environment, current folder and standard error, and no other
+/// file.
 class ChildProcess {
   public:
     /// With `memory` bytes to be seen by both. Null, and an error, when it cannot be started.
@@ -35,15 +36,15 @@ class ChildProcess {
     /// Ends it.
     ~ChildProcess();
 
-    /// Sends what is taken at once, and removes it from the beginning of `bytes`.
+    /// Sends as much as the system takes without waiting, and removes that from the beginning of `bytes`.
     void send(std::string& bytes);
     /// Appends what has arrived, without waiting. False when nothing will arrive any more.
     bool receive(std::string& bytes);
     void* memory() const { return memory_.address(); }
 
-    /// Ends it without asking; `end` then tells of it.
+    /// Kills it; `end` then says how it ended.
     void kill();
-    /// Waits until it is gone, which it is at once: it is ended unless it is about to end by itself.
+    /// Kills it unless it has ended by itself, and answers how it ended.
     ProcessEnd end();
 
     struct Awaited {

@@ -2,11 +2,11 @@
 
 namespace qvct {
 
-/// Has the interrupt of a terminal remembered instead of ending the program; a second one ends it as always.
-/// For programs of our own.
+/// Makes the first interrupt from a terminal be remembered instead of ending the program; a second one ends
+/// it as usual. For programs of our own.
 void interruptGently();
 
-/// Whether it was interrupted since then.
+/// Whether there was an interrupt since `interruptGently` was called.
 bool wasInterrupted();
 
 }  // namespace qvct

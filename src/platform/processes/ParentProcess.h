@@ -13,10 +13,10 @@ namespace qvct {
 class ParentProcess {
   public:
     /// To be called first in such a program, which cannot use standard input and output from then on. Nothing
-    /// when the process was not started as one with that much memory.
+    /// when the process was not started as a `ChildProcess` with that much memory.
     static std::optional<ParentProcess> connect(std::size_t memory);
 
-    /// Waits until all was taken, and empties `bytes`. False when nobody takes it any more.
+    /// Waits until all was sent, and empties `bytes`. False when nobody receives any more.
     bool send(std::string& bytes);
     /// Waits for something, and appends it. False when nothing will arrive any more.
     bool receive(std::string& bytes);

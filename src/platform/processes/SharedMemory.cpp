@@ -18,7 +18,7 @@ std::optional<SharedMemory> SharedMemory::make(std::size_t size) {
 
 std::optional<SharedMemory> SharedMemory::open(FileDescriptor descriptor, std::size_t size) {
     struct stat status {};
-    // What lies behind the end of a file cannot be touched, though it can be mapped.
+    // Bytes behind the end of a file can be mapped, but touching them ends the process.
     if (::fstat(descriptor.number(), &status) != 0 || static_cast<std::size_t>(status.st_size) < size)
         return std::nullopt;
     void* address = ::mmap(nullptr, size, PROT_READ | PROT_WRITE, MAP_SHARED, descriptor.number(), 0);

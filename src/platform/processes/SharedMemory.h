@@ -8,7 +8,7 @@
 
 namespace qvct {
 
-/// Memory that processes see together: whoever has its descriptor. Filled with zeros when it is made.
+/// Memory that is shared by all processes that have its descriptor. Filled with zeros when it is made.
 class SharedMemory {
   public:
     /// Nothing where the system has no more.

@@ -17,8 +17,8 @@ int numberOf(StandardStream stream) {
 
 void openStandardStreams() {
     for (const int stream : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO}) {
-        // Against its direction, so that its use fails as on a closed one. It gets the lowest free number,
-        // which is this one.
+        // Opened in the wrong direction, so that using it fails as on a closed stream. It gets the lowest
+        // free number, which is this one.
         if (::fcntl(stream, F_GETFD) < 0)
             static_cast<void>(::open("/dev/null", stream == STDIN_FILENO ? O_WRONLY : O_RDONLY));
     }

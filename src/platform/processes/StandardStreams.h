@@ -5,12 +5,12 @@
 
 namespace qvct {
 
-/// Opens those of the three standard streams that whoever started the program has closed, for nothing: the
-/// next file to be opened would take their place otherwise, and what is meant for them would end in it. Using
-/// them fails as before.
+/// Opens those standard streams that were closed when the program started, in a way that using them still
+/// fails. Otherwise the next file to be opened would take their place, and messages would be written into it.
 void openStandardStreams();
 
-/// Makes writing to a pipe that nobody reads an error like others. For programs of our own.
+/// Makes writing to a pipe that nobody reads an ordinary error instead of a signal that ends the program. For
+/// programs of our own.
 void ignoreBrokenPipes();
 
 enum class StandardStream { output, error };
@@ -19,8 +19,8 @@ enum class StandardStream { output, error };
 bool isTerminal(StandardStream stream);
 /// Columns of the terminal; nothing when it is none, or does not tell.
 std::optional<std::size_t> columnsOf(StandardStream stream);
-/// Closes it, since some systems tell of a full disk only then. What was held back is to be written before.
-/// False, and `errno` says why, when not all was taken.
+/// Closes the stream, since some systems report a full disk only then. Write buffered output before. False,
+/// and `errno` says why, when not all was written.
 bool closeStream(StandardStream stream);
 
 }  // namespace qvct

@@ -6,9 +6,9 @@
 
 namespace qvct {
 
-/// The number that was meant by one that was kept in single precision: 86.6 for 86.5999984741211, the
-/// shortest decimal that single precision keeps as the same. Whole numbers, and those of double precision,
-/// stay.
+/// The decimal that was meant by a number that was stored in single precision: 86.6 for 86.5999984741211,
+/// being the shortest decimal with the same value in single precision. Whole numbers, and those that need
+/// double precision, stay as they are.
 inline double decimalOf(double number) {
     const auto single = static_cast<float>(number);
     if (double{single} != number || std::trunc(number) == number) return number;

@@ -16,7 +16,7 @@ class QVCT_API DecimalFormatter {
     /// With so many decimals, rounded half to even.
     explicit DecimalFormatter(int fractionDigits);
     /// @{
-    /// Moved, it can be used no more.
+    /// A moved-from formatter must not be used.
     DecimalFormatter(DecimalFormatter&&) noexcept;
     DecimalFormatter& operator=(DecimalFormatter&&) noexcept;
     /// @}

@@ -30,7 +30,7 @@ class QVCT_API RegularExpression {
                                                     Error* error = nullptr);
 
     /// @{
-    /// What was moved from can only be assigned to or destroyed.
+    /// A moved-from expression can only be assigned to or destroyed.
     RegularExpression(RegularExpression&&) noexcept;
     RegularExpression& operator=(RegularExpression&&) noexcept;
     /// @}

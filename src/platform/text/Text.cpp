@@ -100,7 +100,7 @@ bool isWordCharacter(UChar32 c) {
            c == zeroWidthJoiner;
 }
 
-/// Whether the character is no word's beginning but goes with what stands before it.
+/// Whether the character belongs to the one before it and cannot begin a word.
 bool isCombining(UChar32 c) {
     return u_hasBinaryProperty(c, UCHAR_GRAPHEME_EXTEND) != 0 || u_charType(c) == U_FORMAT_CHAR;
 }

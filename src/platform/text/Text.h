@@ -15,7 +15,7 @@ std::u16string utf16FromUtf8(std::string_view text);
 std::string utf8FromUtf16(std::u16string_view text);
 
 /// The user's locale, such as "de_DE"; the root locale's empty name where none is set ("C"), so that texts
-/// sort as people do.
+/// are sorted as people would sort them.
 std::string userLocaleName();
 /// Order of two texts for people, in the order of the user's locale: negative, 0 or positive.
 int localizedCompare(std::string_view a, std::string_view b);

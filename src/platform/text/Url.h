@@ -19,7 +19,8 @@ class QVCT_API URL {
     static URL URLWithString(std::string_view text);
 
     bool isFileURL() const { return isFile_; }
-    /// The absolute path of a file URL; for others their text, which reading and writing refuse as a path.
+    /// The absolute path of a file URL; for other URLs their text, which is refused as a path when reading or
+    /// writing.
     const std::string& path() const { return isFile_ ? path_ : text_; }
     /// "file://" and the percent-encoded path; for other URLs their text.
     std::string absoluteString() const;
@@ -45,10 +46,10 @@ class QVCT_API URL {
 
     bool isFile_;
     std::string text_;  // of a URL that is no file URL
-    std::string path_;  // of others the text after the host
+    std::string path_;  // of other URLs the text after the host
 };
 
-/// Whether a path is the text of a URL, such as "https://host/Loop.wav", and so names nothing on this
+/// Whether a path is really the text of a URL, such as "https://host/Loop.wav", and so names no file on this
 /// machine.
 bool isURLText(std::string_view path);
 
