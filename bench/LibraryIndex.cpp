@@ -90,7 +90,7 @@ IndexProgress index(const std::string& folder, const std::string& database) {
     Error error;
     const auto progress = indexLibrary(options, &error);
     if (!progress) {
-        fmt::print(stderr, "{}\n", error.message);
+        fmt::print(stderr, "{}\n", error.message());
         std::exit(1);
     }
     return *progress;

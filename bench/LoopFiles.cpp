@@ -131,7 +131,7 @@ void writeTag(const fs::path& path, int& count) {
     data->setTaggingDictionary({{"Genres", PropertyList::Array{fmt::format("Tag {}", ++count)}}});
     Error error;
     if (LCFileWriter::fileWriterForURL(url)->writeFileData(data, &error)) return;
-    fmt::print(stderr, "{}\n", error.message);
+    fmt::print(stderr, "{}\n", error.message());
     std::exit(1);
 }
 

@@ -81,7 +81,7 @@ std::optional<std::vector<Similar>> ContentDatabase::similar(std::string_view pa
     const auto found = item(path, error);
     if (!found) return std::nullopt;
     const auto refuse = [&](const std::string& reason) {
-        fail(error, kErrorInvalidArgument, fmt::format("{}: {}", printable(path), reason));
+        fail(error, kErrorInvalidArgument, reason, {std::string(path)});
         return std::nullopt;
     };
     if (!found->item.failure.empty()) return refuse("could not be read when it was indexed");
@@ -98,8 +98,7 @@ std::optional<Found> ContentDatabase::item(std::string_view path, Error* error) 
         if (!item) return std::nullopt;
         return Found{*id, std::move(*item)};
     });
-    if (found && !*found)
-        fail(error, kErrorInvalidArgument, fmt::format("{}: not in the index", printable(path)));
+    if (found && !*found) fail(error, kErrorInvalidArgument, "not in the index", {std::string(path)});
     return found ? *found : std::nullopt;
 }
 

@@ -154,7 +154,7 @@ std::optional<IndexedItem> ContentDescriber::describe(const std::string& path, E
         url, ContentItem::RecordReading{Implementation::kOptions, its.taxonomyOfRecords});
     Error reason;
     const auto record = content->record(&reason);
-    if (reason.code != 0 && reason.code != kErrorNoContent) {
+    if (reason.isSet() && reason.code != kErrorNoContent) {
         if (error != nullptr) *error = reason;
         return std::nullopt;
     }

@@ -84,14 +84,15 @@ struct IndexedItem {
     std::vector<IndexedValue> values;
     std::vector<std::string> packs;
     std::vector<IndexedDependency> dependencies;
-    /// Why the item could not be read; then nothing below `stamp` is known, and no search finds it.
+    /// Why the item could not be read, without its path; then nothing below `stamp` is known, and no search
+    /// finds it.
     std::string failure;
 
     bool operator==(const IndexedItem&) const = default;
 };
 
-/// One line that says which item could not be read, and why.
-QVCT_API std::string messageOfFailure(const IndexedItem& item);
+/// The error of an item that could not be read.
+QVCT_API Error errorOfFailure(const IndexedItem& item);
 
 /// Describes one item at a time: a pure function of what lies at the path.
 class ItemDescriber {

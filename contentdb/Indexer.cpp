@@ -46,10 +46,11 @@ void finishRebuild(const IndexOptions& options) {
     if (!isRebuilt(options.database)) return;
     const std::string aside = putAside(options.database);
     if (!options.note) return;
-    options.note(fmt::format(
-        "{}: was damaged, and its rebuilding interrupted; the rebuilt one is in its place, the old "
-        "one was put aside as {}",
-        printable(options.database), printable(aside)));
+    const std::string what = fmt::format(
+        "was damaged, and its rebuilding interrupted; the rebuilt one is in its place, the old one was put "
+        "aside as {}",
+        printable(aside));
+    options.note(errorOf(kErrorMalformed, what, {options.database}).message());
 }
 
 IndexProgress runOnce(const IndexOptions& options, const std::vector<std::string>& folders,
@@ -64,7 +65,7 @@ IndexProgress runOnce(const IndexOptions& options, const std::vector<std::string
     IndexRun run(options, *connection, *describers);
     bool isInOrder = true;
     for (const std::string& folder : folders) isInOrder = isInOrder && run.walk(folder);
-    if (!run.finish() || !isInOrder) throw DatabaseFailure(kErrorUnreadable, describers->problem());
+    if (!run.finish() || !isInOrder) throw DatabaseFailure(describers->problem());
     return run.progress();
 }
 
@@ -99,8 +100,8 @@ bool replaceDamaged(const IndexOptions& options, const PoolFactory& makePool,
 std::optional<IndexProgress> indexBy(const PoolFactory& makePool, const IndexOptions& wanted, Error* error) {
     IndexOptions options = wanted;
     options.database = pathOfDatabase(wanted.database);
-    const auto refuse = [error](ErrorCode code, const std::string& message) {
-        qvct::fail(error, code, message);
+    const auto refuse = [error](ErrorCode code, std::string reason, std::string path = {}) {
+        qvct::fail(error, code, std::move(reason), {std::move(path)});
         return std::nullopt;
     };
     if (options.parts == 0 || options.part == 0 || options.part > options.parts)
@@ -111,12 +112,11 @@ std::optional<IndexProgress> indexBy(const PoolFactory& makePool, const IndexOpt
         folders.push_back(URL::fileURLWithPath(folder).path());
         const bool mayBeAway = options.prune && options.pruneRoots && !fileExists(folders.back());
         if (!isDirectory(folders.back()) && !mayBeAway)
-            return refuse(kErrorUnreadable,
-                          fmt::format("{}: {}", printable(folder),
-                                      fileExists(folder) ? "is a file, not a folder" : "no such folder"));
+            return refuse(kErrorUnreadable, fileExists(folder) ? "is a file, not a folder" : "no such folder",
+                          folder);
     }
     if (const auto reason = reasonAgainstDatabase(options.database))
-        return refuse(kErrorInvalidArgument, fmt::format("{}: {}", printable(options.database), *reason));
+        return refuse(kErrorInvalidArgument, *reason, options.database);
     const auto lock = RunLock::acquire(options.database, error);
     if (!lock) return std::nullopt;
     return guarded(error, std::optional<IndexProgress>(), [&]() -> std::optional<IndexProgress> {
@@ -156,7 +156,7 @@ bool mergeDatabases(const std::vector<std::string>& databases, const std::string
     const auto lock = RunLock::acquire(target, error);
     if (!lock) return false;
     if (fileExists(target) || isRebuilt(target))
-        return fail(error, kErrorInvalidArgument, fmt::format("{}: exists already", printable(target)));
+        return fail(error, kErrorInvalidArgument, "exists already", {target});
     // Built beside its place, so that an interrupted merge leaves no half-finished database there.
     const std::string unfinished = unfinishedPath(target);
     removeDatabase(unfinished);

@@ -42,7 +42,7 @@ bool matches(const Query& query, const IndexedItem& item, Error* error) {
     if (!item.failure.empty()) return false;
     Error fault;
     const bool isMatch = meets(query.condition, item, fault);
-    if (fault.message.empty()) return isMatch;
+    if (!fault.isSet()) return isMatch;
     if (error != nullptr) *error = fault;
     return false;
 }

@@ -16,13 +16,13 @@ void useResources(const std::string& directory, const std::string& taxonomyFile,
     if (!directory.empty()) ResourceBundle::setDirectory(directory);
     const std::string folder = ResourceBundle::directory();
     if (!folder.empty() && !isDirectory(folder)) {
-        context.itemFailed(fmt::format("{}: no such resource folder", printable(folder)));
+        context.itemFailed(errorOf(kErrorUnreadable, "no such resource folder", {folder}));
     }
     if (!taxonomyFile.empty()) ResourceBundle::setPathForResource("DefaultTaxonomy", "plist", taxonomyFile);
     for (const ResourceFile& resource : kResourceFiles) {
         Error error;
         const auto path = replacementFile(resource, &error);
-        if (!error.message.empty()) context.itemFailed(error.message);
+        if (error.isSet()) context.itemFailed(error);
         const bool isMapping = path && resource.name == "DefaultKeywordMapping";
         if (const auto mapping = isMapping ? readDictionaryFile(*path) : std::nullopt)
             checkKeywords(*mapping, context);

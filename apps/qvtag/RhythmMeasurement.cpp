@@ -28,10 +28,6 @@ struct Metre {
     LoopMetre ofLoop() const { return {static_cast<float>(tempo), beats, top, bottom}; }
 };
 
-bool failFor(Error* error, const URL& url, std::string_view reason) {
-    return fail(error, kErrorInvalidArgument, fmt::format("{}: {}", printable(url.path()), reason));
-}
-
 void applyRequest(const RhythmRequest& request, Metre& metre) {
     metre.tempo = request.tempo.value_or(metre.tempo);
     metre.beats = request.beats.value_or(metre.beats);
@@ -74,12 +70,13 @@ std::optional<RhythmResult::AllTracks> measuredTogether(const MidiSequence& sequ
 std::optional<RhythmResult> measured(const URL& url, const std::vector<Note>& notes, double beatsPerUnit,
                                      const Metre& metre, Error* error) {
     if (metre.beats < 1 || metre.beats > kMostBeats) {
-        failFor(error, url,
-                fmt::format("a loop of {} beats cannot be measured; 1 to {} can", metre.beats, kMostBeats));
+        fail(error, kErrorInvalidArgument,
+             fmt::format("a loop of {} beats cannot be measured; 1 to {} can", metre.beats, kMostBeats),
+             {url.path()});
         return std::nullopt;
     }
     if (notes.empty()) {
-        failFor(error, url, "nothing sounds in it");
+        fail(error, kErrorInvalidArgument, "nothing sounds in it", {url.path()});
         return std::nullopt;
     }
     const auto analysis = analysisOf(notes, metre.ofLoop());
@@ -122,11 +119,14 @@ std::optional<RhythmResult> measureMidi(const URL& url, const MidiSequence& sequ
     if (metre.beats == 0) metre.beats = wholeBars(sequence.endOfNotes(), metre);
     const auto notes = notesOfFirstTrack(sequence);
     if (notes.empty() && sequence.endOfNotes() > 0) {
-        failFor(error, url, "nothing sounds in its first track, which is the one that is measured");
+        fail(error, kErrorInvalidArgument,
+             "nothing sounds in its first track, which is the one that is measured", {url.path()});
         return std::nullopt;
     }
     if (notes.empty() && !sequence.problems().empty()) {
-        failFor(error, url, "nothing sounds in it: " + join(sequence.problems(), "; "));
+        std::vector<std::string> problems;
+        for (const Error& problem : sequence.problems()) problems.push_back(problem.message());
+        fail(error, kErrorInvalidArgument, "nothing sounds in it: " + join(problems, "; "), {url.path()});
         return std::nullopt;
     }
     auto result = measured(url, notes, metre.beatsPerQuarter(), metre, error);
@@ -170,7 +170,7 @@ std::optional<RhythmResult> measureAudio(ItemFile& file, Metre metre, const Rhyt
     if (!decoder) return std::nullopt;
     const std::int64_t frames = decoder->frames();
     if (frames <= 0) {
-        failFor(error, url, "it has no samples");
+        fail(error, kErrorInvalidArgument, "it has no samples", {url.path()});
         return std::nullopt;
     }
     const double minutes = static_cast<double>(frames) / decoder->sampleRate() / 60;
@@ -179,9 +179,10 @@ std::optional<RhythmResult> measureAudio(ItemFile& file, Metre metre, const Rhyt
         metre.beats = static_cast<std::int32_t>(
             std::lround(std::min(metre.tempo * minutes * metre.beatsPerQuarter(), 1e6)));
     if (metre.beats == 0) {
-        failFor(error, url,
-                metre.tempo > 0 ? "it is shorter than half a beat; say --beats"
-                                : "its length in beats is unknown; say --beats or --tempo");
+        fail(error, kErrorInvalidArgument,
+             metre.tempo > 0 ? "it is shorter than half a beat; say --beats"
+                             : "its length in beats is unknown; say --beats or --tempo",
+             {url.path()});
         return std::nullopt;
     }
     if (metre.tempo == 0) metre.tempo = metre.beats / minutes / metre.beatsPerQuarter();

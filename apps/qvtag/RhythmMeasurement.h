@@ -40,7 +40,7 @@ struct RhythmResult {
         float complexity = 0;
     };
     std::optional<AllTracks> allTracks;
-    std::vector<std::string> problems;  ///< What is damaged in the MIDI, and was left out.
+    std::vector<Error> problems;  ///< What is damaged in the MIDI, and was left out.
     RhythmPlot plot;
 };
 

@@ -59,6 +59,10 @@ void ToolContext::prepare() {
     useResources(resourceDirectory, taxonomyFile, *this);
 }
 
+void ToolContext::itemFailed(const Error& error) {
+    itemFailed(std::string_view(error.message()));
+}
+
 void ToolContext::itemFailed(std::string_view message) {
     if (!logged_->contain(message)) printLine(message);
     loggedFailure();
@@ -80,8 +84,10 @@ void ToolContext::note(std::string_view message) const {
 void ToolContext::notePassedOver(const std::vector<URL>& links) const {
     if (links.empty()) return;
     const std::string all = links.size() == 1 ? "" : fmt::format(" (one of {} such links)", links.size());
-    note(fmt::format("{}: leads out of the folder and was passed over{}; --follow follows it",
-                     printable(links.front().path()), all));
+    note(errorOf(kErrorInvalidArgument,
+                 fmt::format("leads out of the folder and was passed over{}; --follow follows it", all),
+                 {links.front().path()})
+             .message());
 }
 
 void ToolContext::forEachContentItem(const std::vector<std::string>& paths, LinksOutside links,
@@ -91,13 +97,13 @@ void ToolContext::forEachContentItem(const std::vector<std::string>& paths, Link
         if (isValidUtf8(url.path())) {
             show(url);
         } else {
-            itemFailed(fmt::format("{}: the name is not UTF-8", printable(url.path())));
+            itemFailed(errorOf(kErrorInvalidArgument, "the name is not UTF-8", {url.path()}));
         }
         return !isOutputLost();
     };
     for (const std::string& path : paths) {
         if (isOutputLost()) break;
-        walkContent(path, visit, [this](const Error& error) { itemFailed(error.message); },
+        walkContent(path, visit, [this](const Error& error) { itemFailed(error); },
                     {links, [&passedOver](const URL& link) { passedOver.push_back(link); }});
     }
     notePassedOver(passedOver);

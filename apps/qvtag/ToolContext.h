@@ -2,6 +2,7 @@
 
 #include "formats/LinkRule.h"
 #include "output/Output.h"
+#include "platform/base/Error.h"
 #include "platform/text/Url.h"
 
 #include <cstddef>
@@ -30,6 +31,7 @@ class ToolContext {
 
     /// One line on standard error, unless the library logged the same; the tool will say by its exit status
     /// that some items failed.
+    void itemFailed(const Error& error);
     void itemFailed(std::string_view message);
     /// The same when the log has named it already.
     void loggedFailure();

@@ -53,18 +53,23 @@ std::optional<Verification> Verification::before(const URL& url, Error* error) {
 std::vector<std::string> Verification::faultsAfterWriting(const TGRTMetaData& expected) const {
     std::vector<std::string> faults;
     Error error;
+    const auto addError = [&] {
+        if (error.path == url_.path()) error.path.clear();  // whoever shows the faults says whose they are
+        faults.push_back(error.message());
+    };
     if (audio_) {
         const auto after = fingerprintOfFile(url_, &error);
         if (after) faults = audio_->differences(*after);
-        if (!after) faults.push_back(error.message);
+        if (!after) addError();
     } else {
         const auto after = untouchedBytes(url_, &error);
-        if (!after) faults.push_back(error.message);
+        if (!after) addError();
         if (after && *after != *untouched_) faults.emplace_back("what is not ours differs");
     }
     const auto stored = TGRTFileNode::nodeWithFileURL(url_)->readMetaDataWithOptions(0, &error);
     if (!stored) {
-        faults.push_back(error.message.empty() ? "no record is there" : error.message);
+        if (!error.isSet()) fail(&error, kErrorUnwritable, "no record is there");
+        addError();
     } else if (!(stored->taggings() == expected.taggings()) ||
                stored->displayName().value_or("") != expected.displayName().value_or("")) {
         faults.emplace_back("the record that is there is not the one that was written");

@@ -10,12 +10,24 @@
 namespace qvct::contentdb {
 namespace {
 
+/// What is said of the item: without its path, and with the name alone of a file in it or beside it.
+std::string failureOf(Error error, const std::string& path) {
+    if (!error.isSet()) return "no description";
+    const std::string folder = path.substr(0, path.rfind('/') + 1);
+    if (error.path == path) {
+        error.path.clear();
+    } else if (error.path.starts_with(folder)) {
+        error.path.erase(0, folder.size());
+    }
+    return error.message();
+}
+
 IndexedItem itemBy(ItemDescriber& describer, const std::string& path) {
     IndexedItem failed;
     try {
         Error error;
         if (auto item = describer.describe(path, &error)) return *std::move(item);
-        failed.failure = error.message.empty() ? "no description" : error.message;
+        failed.failure = failureOf(std::move(error), path);
     } catch (const std::exception& fault) {
         failed.failure = fault.what();
     } catch (...) {

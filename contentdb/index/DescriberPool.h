@@ -39,7 +39,7 @@ class DescriberPool {
     /// Waits briefly for described items and calls `take` for each that is ready, in any order. False when
     /// nothing can be described any more; `problem` then says why.
     virtual bool collect(const std::function<void(Described)>& take) = 0;
-    virtual std::string problem() const = 0;
+    virtual Error problem() const = 0;
 };
 
 }  // namespace qvct::contentdb

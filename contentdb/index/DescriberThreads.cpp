@@ -51,16 +51,16 @@ bool DescriberThreads::collect(const std::function<void(Described)>& take) {
     std::vector<Described> taken;
     {
         std::unique_lock lock(mutex_);
-        hasResult_.wait_for(lock, patience, [this] { return !ready_.empty() || !problem_.empty(); });
+        hasResult_.wait_for(lock, patience, [this] { return !ready_.empty() || problem_.isSet(); });
         taken.swap(ready_);
         onTheirWay_ -= taken.size();
-        if (!problem_.empty()) return false;
+        if (problem_.isSet()) return false;
     }
     for (Described& described : taken) take(std::move(described));
     return true;
 }
 
-std::string DescriberThreads::problem() const {
+Error DescriberThreads::problem() const {
     const std::lock_guard lock(mutex_);
     return problem_;
 }
@@ -108,7 +108,7 @@ void DescriberThreads::describeAll(ItemDescriber& describer) {
 void DescriberThreads::give(std::string problem) {
     {
         const std::lock_guard lock(mutex_);
-        problem_ = std::move(problem);
+        problem_ = errorOf(kErrorUnreadable, std::move(problem));
     }
     hasResult_.notify_one();
 }

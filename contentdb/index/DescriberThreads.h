@@ -23,7 +23,7 @@ class DescriberThreads : public DescriberPool {
     void submit(ItemTask task) override;
     bool isBusy() const override;
     bool collect(const std::function<void(Described)>& take) override;
-    std::string problem() const override;
+    Error problem() const override;
 
   private:
     void start();
@@ -41,7 +41,7 @@ class DescriberThreads : public DescriberPool {
     std::deque<ItemTask> waiting_;
     std::vector<Described> ready_;
     std::size_t onTheirWay_ = 0;  ///< Submitted and not yet taken.
-    std::string problem_;
+    Error problem_;
     bool isOver_ = false;
 };
 

@@ -205,7 +205,7 @@ void IndexRun::storeOne(const Described& described, Pending& pending) {
     if (hasFailed) {
         ++progress_.failed;
         if (options_.failed) {
-            options_.failed({std::string(QVCTErrorDomain), kErrorUnreadable, messageOfFailure(item)});
+            options_.failed(errorOfFailure(item));
         }
     } else {
         ++progress_.described;
@@ -247,12 +247,12 @@ void IndexRun::prune() {
     for (const std::string& root : roots_) pruneUnvisited(root);
     for (const auto& [root, missing] : bareRoots_) {
         if (missing == 0 || !options_.failed) continue;
-        options_.failed(
-            {std::string(QVCTErrorDomain), kErrorUnreadable,
-             fmt::format(
-                 "{}: nothing is left in it, as when a disk is away; its {} items stay in the database "
-                 "(`--prune-roots` takes them out)",
-                 printable(root), missing)});
+        options_.failed(errorOf(
+            kErrorUnreadable,
+            fmt::format("nothing is left in it, as when a disk is away; its {} items stay in the database "
+                        "(`--prune-roots` takes them out)",
+                        missing),
+            {root}));
     }
 }
 

@@ -81,13 +81,9 @@ bool WorkerPool::collect(const std::function<void(Described)>& take) {
 }
 
 bool WorkerPool::start(Worker& worker) {
-    Error error;
     worker.process =
-        ChildProcess::start(settings_.program, settings_.arguments, sizeof(WorkerStatus), &error);
-    if (!worker.process) {
-        problem_ = error.message;
-        return false;
-    }
+        ChildProcess::start(settings_.program, settings_.arguments, sizeof(WorkerStatus), &problem_);
+    if (!worker.process) return false;
     worker.started = WorkerStatus::now();
     worker.isOfOurVersion = false;
     worker.wasLate = false;
@@ -169,9 +165,8 @@ void WorkerPool::endIfLate(Worker& worker) const {
     worker.process->kill();
 }
 
-bool WorkerPool::fail(std::string_view reason) {
-    problem_ = fmt::format("{}: {}", printable(settings_.program), reason);
-    return false;
+bool WorkerPool::fail(std::string reason) {
+    return qvct::fail(&problem_, kErrorUnreadable, std::move(reason), {settings_.program});
 }
 
 }  // namespace qvct::contentdb

@@ -30,7 +30,7 @@ class WorkerPool : public DescriberPool {
     void submit(ItemTask task) override;
     bool isBusy() const override;
     bool collect(const std::function<void(Described)>& take) override;
-    std::string problem() const override { return problem_; }
+    Error problem() const override { return problem_; }
 
   private:
     struct Worker;
@@ -42,12 +42,12 @@ class WorkerPool : public DescriberPool {
     bool replace(Worker& worker, const std::function<void(Described)>& take);
     std::string end(Worker& worker) const;
     void endIfLate(Worker& worker) const;
-    bool fail(std::string_view reason);
+    bool fail(std::string reason);
 
     const Settings settings_;
     std::vector<Worker> workers_;
     unsigned barren_ = 0;  ///< Workers that ended, one after the other, without having described anything.
-    std::string problem_;
+    Error problem_;
 };
 
 }  // namespace qvct::contentdb

@@ -34,7 +34,7 @@ class Matching {
     Matching(const IndexedItem& item, Error& fault) : item_(item), fault_(fault) {}
 
     bool operator()(const Condition& condition) const {
-        return fault_.message.empty() && std::visit(*this, condition.is);
+        return !fault_.isSet() && std::visit(*this, condition.is);
     }
     bool operator()(const AllOf& all) const { return std::all_of(all.parts.begin(), all.parts.end(), *this); }
     bool operator()(const AnyOf& any) const { return std::any_of(any.parts.begin(), any.parts.end(), *this); }

@@ -218,7 +218,7 @@ class Parser {
         Error error;
         auto compiled =
             RegularExpression::compile(pattern.text, RegularExpression::Case::insensitive, &error);
-        if (!compiled) fail(pattern.start, pattern.end, error.message);
+        if (!compiled) fail(pattern.start, pattern.end, error.message());
         return {ExpressionMatch{field, std::make_shared<RegularExpression>(std::move(*compiled))}};
     }
 

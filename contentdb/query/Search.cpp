@@ -62,7 +62,7 @@ class Evaluation {
     bool isMatch(const IndexedItem& item) const {
         Error error;
         const bool result = matches(query_, item, &error);
-        if (!error.message.empty()) throw DatabaseFailure(kErrorTooLarge, error.message);
+        if (error.isSet()) throw DatabaseFailure(std::move(error));
         return result;
     }
 

@@ -20,8 +20,8 @@ IndexedItem readItem(const Statement& row, const Connection& connection) {
     item.payloadHash = row.bytes(6);
     if (!decodeDescription(row.bytes(7), item)) {
         throw DatabaseFailure(kErrorMalformed,
-                              fmt::format("{}: the database is damaged: the record of {}",
-                                          printable(connection.path()), printable(item.path)));
+                              fmt::format("the database is damaged: the record of {}", printable(item.path)),
+                              connection.path());
     }
     return item;
 }
@@ -161,8 +161,7 @@ void ContentStore::addPosting(TermId term, std::int64_t chunk, IdSet& ids) {
     const bool isIntact = !posting_.step() || ids.insertEncoded(posting_.bytes(0));
     posting_.reset();
     if (!isIntact) {
-        throw DatabaseFailure(kErrorMalformed, fmt::format("{}: the database is damaged: an index entry",
-                                                           printable(connection_.path())));
+        throw DatabaseFailure(kErrorMalformed, "the database is damaged: an index entry", connection_.path());
     }
 }
 

@@ -36,8 +36,7 @@ std::string nameForDamaged(const std::string& database, int number) {
 
 void moveIfThere(const std::string& from, const std::string& to) {
     Error error;
-    if (fileExists(from) && !renameFlushed(from, to, &error))
-        throw DatabaseFailure(kErrorUnwritable, error.message);
+    if (fileExists(from) && !renameFlushed(from, to, &error)) throw DatabaseFailure(error);
 }
 
 }  // namespace
@@ -54,7 +53,7 @@ std::string pathOfDatabase(const std::string& name) {
 
 void makeEmptyLike(const std::string& model, const std::string& path) {
     Error error;
-    if (!makeEmptyFileLike(model, path, &error)) throw DatabaseFailure(kErrorUnwritable, error.message);
+    if (!makeEmptyFileLike(model, path, &error)) throw DatabaseFailure(error);
 }
 
 bool isMarkedAsContentDatabase(const std::string& path) {

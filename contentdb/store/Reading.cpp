@@ -28,7 +28,7 @@ void finishRebuild(const std::string& path) {
     Error error;
     if (!isRebuilt(path)) return;
     const auto lock = RunLock::acquire(path, &error);
-    if (!lock) throw DatabaseFailure(kErrorUnwritable, error.message);
+    if (!lock) throw DatabaseFailure(error);
     if (isRebuilt(path)) putAside(path);
 }
 
@@ -41,11 +41,10 @@ std::unique_ptr<Connection> openToRead(const std::string& name) {
     while (RunLock::isHeld(path)) {
         if (auto connection = openUnlessEmpty(path)) return connection;
         if (std::chrono::steady_clock::now() > end) {
-            throw DatabaseFailure(
-                kErrorUnreadable,
-                fmt::format("{}: is being made, and nothing is in it yet; try again when the "
-                            "run of `index` has stored something",
-                            printable(path)));
+            throw DatabaseFailure(kErrorUnreadable,
+                                  "is being made, and nothing is in it yet; try again when the run of "
+                                  "`index` has stored something",
+                                  path);
         }
         std::this_thread::sleep_for(kPause);
     }

@@ -19,9 +19,9 @@ std::unique_ptr<FileLock> RunLock::acquire(const std::string& database, Error* e
     const std::string holder = attempt.holder != 0 ? fmt::format(" (process {})", attempt.holder) : "";
     qvct::fail(error, kErrorUnwritable,
                attempt.reason.empty()
-                   ? fmt::format("{}: another run is writing to it{}; try again when it has ended",
-                                 printable(database), holder)
-                   : fmt::format("{}: cannot be written here: {}", printable(database), attempt.reason));
+                   ? fmt::format("another run is writing to it{}; try again when it has ended", holder)
+                   : fmt::format("cannot be written here: {}", attempt.reason),
+               {database});
     return nullptr;
 }
 

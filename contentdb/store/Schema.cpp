@@ -56,8 +56,8 @@ constexpr std::array kMigrations = {
        ALTER TABLE folder ADD COLUMN parts INTEGER NOT NULL DEFAULT 1;
        UPDATE folder SET digest = 0;)"};
 
-[[noreturn]] void refuse(const std::string& path, ErrorCode code, std::string_view reason) {
-    throw DatabaseFailure(code, fmt::format("{}: {}", printable(path), reason));
+[[noreturn]] void refuse(const std::string& path, ErrorCode code, std::string reason) {
+    throw DatabaseFailure(code, std::move(reason), path);
 }
 
 void migrate(Connection& connection) {
@@ -120,15 +120,7 @@ void create(const std::string& path) {
         keepLog(connection);
     }
     Error error;
-    if (!renameFlushed(unborn, path, &error)) throw DatabaseFailure(kErrorUnwritable, error.message);
-}
-
-/// A URI of the file that says that nobody writes to it, so that no log is needed beside it.
-std::string immutableUri(const std::string& path) {
-    std::string uri = "file:";
-    for (const char c : std::filesystem::absolute(path).string())
-        uri += fmt::format("%{:02X}", static_cast<unsigned char>(c));
-    return uri + "?immutable=1";
+    if (!renameFlushed(unborn, path, &error)) throw DatabaseFailure(error);
 }
 
 std::unique_ptr<Connection> openForReading(const std::string& path) {
@@ -148,7 +140,7 @@ std::unique_ptr<Connection> openForReading(const std::string& path) {
                "its last changes are still in the log beside it, and taking them in needs the right to write "
                "to its folder; one search by its owner does it");
     }
-    auto connection = std::make_unique<Connection>(immutableUri(path), Connection::Access::readOnly);
+    auto connection = std::make_unique<Connection>(path, Connection::Access::unchanging);
     prepare(*connection, Access::read);
     return connection;
 }
@@ -167,7 +159,7 @@ std::unique_ptr<Connection> openDatabase(const std::string& path, Access access)
     if (!exists && access == Access::read) refuse(path, kErrorUnreadable, "there is no such database");
     if (access == Access::write && (!exists || isEmptyFile(path))) create(path);
     Error error;
-    if (!mayRead(path, &error)) throw DatabaseFailure(kErrorUnreadable, error.message);
+    if (!mayRead(path, &error)) throw DatabaseFailure(error);
     if (!isMarkedAsContentDatabase(path)) {
         refuse(path, kErrorInvalidArgument,
                "not a content database, or one whose beginning is damaged; if it was one, move it away and "

@@ -4,6 +4,7 @@
 #include "platform/text/Text.h"
 
 #include <array>
+#include <filesystem>
 
 #include <fmt/format.h>
 #include <sqlite3.h>
@@ -38,17 +39,26 @@ std::string_view reasonOf(int result, std::string_view otherwise) {
     return otherwise;
 }
 
+/// The file by an URI that says that nobody writes to it.
+std::string unchangingUri(const std::string& path) {
+    std::string uri = "file:";
+    for (const char c : std::filesystem::absolute(path).string())
+        uri += fmt::format("%{:02X}", static_cast<unsigned char>(c));
+    return uri + "?immutable=1";
+}
+
 }  // namespace
 
 Connection::Connection(const std::string& path, Access access) : path_(path) {
     registerChecksumVfs();
     constexpr int patience = 10000;  // milliseconds that a writer waits for another
-    const int flags = access == Access::readOnly ? SQLITE_OPEN_READONLY : SQLITE_OPEN_READWRITE;
-    if (sqlite3_open_v2(path.c_str(), &handle_, flags | SQLITE_OPEN_NOMUTEX, kChecksumVfs) != SQLITE_OK) {
+    const int flags = access == Access::readWrite ? SQLITE_OPEN_READWRITE : SQLITE_OPEN_READONLY;
+    const std::string name = access == Access::unchanging ? unchangingUri(path) : path;
+    if (sqlite3_open_v2(name.c_str(), &handle_, flags | SQLITE_OPEN_NOMUTEX, kChecksumVfs) != SQLITE_OK) {
         const int result = sqlite3_extended_errcode(handle_);
-        const std::string reason(reasonOf(result, sqlite3_errmsg(handle_)));
+        std::string reason(reasonOf(result, sqlite3_errmsg(handle_)));
         sqlite3_close(handle_);
-        throw DatabaseFailure(codeOf(result), fmt::format("{}: {}", printable(path), reason));
+        throw DatabaseFailure(codeOf(result), std::move(reason), path);
     }
     sqlite3_extended_result_codes(handle_, 1);
     sqlite3_busy_timeout(handle_, patience);
@@ -88,8 +98,7 @@ void Connection::checkPages() {
     for (sqlite3_int64 at = 0; result == SQLITE_OK && at < size; at += kPageSize)
         result = file->pMethods->xRead(file, page.data(), kPageSize, at);
     if (result == SQLITE_OK) return;
-    throw DatabaseFailure(codeOf(result),
-                          fmt::format("{}: {}", printable(path_), reasonOf(result, sqlite3_errstr(result))));
+    throw DatabaseFailure(codeOf(result), std::string(reasonOf(result, sqlite3_errstr(result))), path_);
 }
 
 void Connection::emptyLog() {
@@ -102,10 +111,9 @@ bool Connection::isInTransaction() const {
 
 void Connection::fail(std::string_view doing) const {
     const int result = sqlite3_extended_errcode(handle_);
-    const std::string_view reason = reasonOf(result, sqlite3_errmsg(handle_));
-    throw DatabaseFailure(codeOf(result), (result & 0xff) == SQLITE_ERROR
-                                              ? fmt::format("{}: {} ({})", printable(path_), reason, doing)
-                                              : fmt::format("{}: {}", printable(path_), reason));
+    std::string reason(reasonOf(result, sqlite3_errmsg(handle_)));
+    if ((result & 0xff) == SQLITE_ERROR) reason += fmt::format(" ({})", doing);
+    throw DatabaseFailure(codeOf(result), std::move(reason), path_);
 }
 
 Statement::Statement(const Connection& connection, std::string_view sql) : connection_(connection) {

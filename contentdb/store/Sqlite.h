@@ -17,18 +17,22 @@ namespace qvct::contentdb {
 /// What SQLite reports, thrown inside the content database and turned into an Error at its surface.
 class DatabaseFailure : public std::runtime_error {
   public:
-    DatabaseFailure(ErrorCode code, const std::string& message) : std::runtime_error(message), code_(code) {}
+    explicit DatabaseFailure(Error error) : std::runtime_error(error.message()), error_(std::move(error)) {}
+    DatabaseFailure(ErrorCode code, std::string reason, std::string path)
+        : DatabaseFailure(errorOf(code, std::move(reason), {std::move(path)})) {}
     /// kErrorMalformed: the file is damaged. kErrorUnwritable: it cannot be written.
-    ErrorCode code() const { return code_; }
+    int code() const { return error_.code; }
+    const Error& error() const { return error_; }
 
   private:
-    ErrorCode code_;
+    Error error_;
 };
 
 /// An open connection. One thread at a time.
 class Connection {
   public:
-    enum class Access { readOnly, readWrite };
+    /// Unchanging: nobody writes to it, so that no log is needed beside it.
+    enum class Access { unchanging, readOnly, readWrite };
 
     /// @throws DatabaseFailure, as every operation here.
     Connection(const std::string& path, Access access);
@@ -105,8 +109,9 @@ Result guarded(Error* error, Result otherwise, Work work) {
     try {
         return work();
     } catch (const DatabaseFailure& failure) {
-        const char* remedy = failure.code() == kErrorMalformed ? "; `index --check` builds it anew" : "";
-        qvct::fail(error, failure.code(), std::string(failure.what()) + remedy);
+        if (error == nullptr) return otherwise;
+        *error = failure.error();
+        if (failure.code() == kErrorMalformed) error->reason += "; `index --check` builds it anew";
         return otherwise;
     }
 }

@@ -60,8 +60,8 @@ std::optional<std::string> misjudgedFolder(Connection& connection) {
 void checkStore(ContentStore& store) {
     Connection& connection = store.connection();
     const auto damaged = [&connection](std::string_view what) {
-        throw DatabaseFailure(kErrorMalformed, fmt::format("{}: the database is damaged: {}",
-                                                           printable(connection.path()), what));
+        throw DatabaseFailure(kErrorMalformed, fmt::format("the database is damaged: {}", what),
+                              connection.path());
     };
     const std::string verdict = connection.text("PRAGMA integrity_check(1)");
     // Of several lines the last one says what is wrong, and where.

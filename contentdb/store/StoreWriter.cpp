@@ -78,9 +78,8 @@ void StoreWriter::commit() {
 
 void StoreWriter::put(ItemId id, const IndexedItem& item, const std::vector<std::string>& terms) {
     if (id > kLastItemId) {
-        throw DatabaseFailure(
-            kErrorTooLarge,
-            fmt::format("{}: more than {} items", printable(store_.connection().path()), kLastItemId));
+        throw DatabaseFailure(kErrorTooLarge, fmt::format("more than {} items", kLastItemId),
+                              store_.connection().path());
     }
     const auto replaced = store_.idOfPath(item.path);
     if (replaced && *replaced != id) remove(*replaced);

@@ -27,7 +27,7 @@ int fail(const std::string& message) {
 bool store(const std::shared_ptr<TGRTTag>& tag, const URL& url, Error& error) {
     const auto reader = TGRTMetaDataReaderFactory::metaDataReaderForURL(url);
     const auto writer = TGRTMetaDataWriterFactory::taggingWriterForURL(url);
-    if (!reader || !writer) return qvct::fail(&error, kErrorInvalidArgument, url.path() + ": no content");
+    if (!reader || !writer) return qvct::fail(&error, kErrorInvalidArgument, "no content", {url.path()});
     const auto record = reader->readMetaDataFromURL(url, 0, &error);
     ObjectSet<TGRTTagging> taggings = record ? record->taggings() : ObjectSet<TGRTTagging>{};
     taggings.insert(TGRTTagging::initWithTag(tag, nullptr));
@@ -82,15 +82,15 @@ int main(int argc, char** argv) {
     std::cout << taxonomy->categories().size() << " categories, " << taxonomy->allTags().size() << " tags\n";
 
     Error error;
-    if (!tagAll(argv[1], *taxonomy, error)) return fail(error.message);
+    if (!tagAll(argv[1], *taxonomy, error)) return fail(error.message());
 
     IndexOptions options;
     options.folders = {argv[1]};
     options.database = argv[2];
     const auto run = indexLibrary(options, &error);
-    if (!run) return fail(error.message);
+    if (!run) return fail(error.message());
     std::cout << run->described << " read, " << run->failed << " failed\n";
 
-    if (!search(argv[2], argv[3], error)) return fail(error.message);
+    if (!search(argv[2], argv[3], error)) return fail(error.message());
     return 0;
 }

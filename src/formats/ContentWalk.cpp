@@ -16,8 +16,7 @@ void walkContent(const std::string& path, const std::function<bool(const URL& it
         return;
     }
     if (!isFolder && fileExists(start.path())) {
-        const std::string message = printable(start.path()) + ": neither a file nor a folder";
-        if (failed) failed({std::string(QVCTErrorDomain), kErrorUnreadable, message});
+        if (failed) failed(errorOf(kErrorUnreadable, "neither a file nor a folder", {start.path()}));
         return;
     }
     const auto visit = [&item](const ContentFolder& folder) {

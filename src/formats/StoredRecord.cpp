@@ -20,9 +20,9 @@ std::optional<PropertyList::Dictionary> parseStoredDictionary(const std::string&
     Error reason;
     auto value = parsePropertyList(bytes, &reason, PropertyListUse::rewriting);
     if (value && value->dictionary() != nullptr) return std::move(*value->dictionary());
+    const std::string why = value ? "no dictionary" : reason.reason;
     fail(error, kErrorMalformed,
-         fmt::format("not written over, since what is there cannot be read ({})",
-                     value ? "no dictionary" : reason.message));
+         fmt::format("not written over, since what is there cannot be read ({})", why), std::move(reason));
     return std::nullopt;
 }
 
@@ -47,12 +47,8 @@ bool changeStoredFile(
         if (!bytes) return false;
         stored.assign(bytes->begin(), bytes->end());
     }
-    Error reason;
-    auto changed = change(stored, &reason);
-    if (!changed) {
-        return fail(error, static_cast<ErrorCode>(reason.code),
-                    fmt::format("{}: {}", printable(path), reason.message));
-    }
+    auto changed = change(stored, error);
+    if (!changed) return failIn(path, error);
     if (isThere && *changed == stored) return true;
     const FilePiece whole{.bytes = std::move(*changed)};
     return replaceFileByPieces(path, {&whole, 1}, how, error);
@@ -87,8 +83,7 @@ bool changeStoredContentInfo(const URL& item, const std::string& path,
 }
 
 bool failForMissingRecord(const std::string& path, Error* error) {
-    return fail(error, kErrorInvalidArgument,
-                fmt::format("{}: there is no record to write", printable(path)));
+    return fail(error, kErrorInvalidArgument, "there is no record to write", {path});
 }
 
 }  // namespace qvct

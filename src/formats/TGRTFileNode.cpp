@@ -59,14 +59,13 @@ std::shared_ptr<TGRTMetaData> TGRTFileNode::readMetaDataOfFile(ItemFile& file, s
                                                                Error* error) {
     const URL& url = file.url();
     if (!taxonomy) {
-        fail(error, kErrorInvalidArgument,
-             fmt::format("{}: no taxonomy to read it with", printable(url.path())));
+        fail(error, kErrorInvalidArgument, "no taxonomy to read it with", {url.path()});
         return nullptr;
     }
     auto reader = TGRTMetaDataReaderFactory::metaDataReaderForURL(url, taxonomy);
     if (!reader) reader = readerForAudio(file, taxonomy);
     if (reader) return reader->readMetaDataFromFile(file, options, error);
-    fail(error, kErrorNoContent, fmt::format("{}: no kind of content", printable(url.path())));
+    fail(error, kErrorNoContent, "no kind of content", {url.path()});
     return nullptr;
 }
 

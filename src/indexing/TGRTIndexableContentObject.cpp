@@ -56,7 +56,7 @@ std::shared_ptr<TGRTMetaData> readRecord(const URL& url, std::uint64_t options,
     if (const auto reader = TGRTMetaDataReaderFactory::metaDataReaderForURL(url, taxonomy)) {
         return reader->readMetaDataFromURL(url, options, error);
     }
-    fail(error, kErrorInvalidArgument, fmt::format("{}: no kind of content", printable(url.path())));
+    fail(error, kErrorInvalidArgument, "no kind of content", {url.path()});
     return nullptr;
 }
 
@@ -69,8 +69,7 @@ std::shared_ptr<TGRTIndexableContentObject> TGRTIndexableContentObject::init() {
 std::shared_ptr<TGRTIndexableContentObject> TGRTIndexableContentObject::indexableContentObjectForURL(
     const URL& url, std::uint64_t options, Error* error) {
     if (!url.isFileURL()) {
-        fail(error, kErrorInvalidArgument,
-             fmt::format("{}: not a file URL", printable(url.absoluteString())));
+        fail(error, kErrorInvalidArgument, "not a file URL", {url.absoluteString()});
         return nullptr;
     }
     const auto taxonomy = taxonomyForOptions(options);

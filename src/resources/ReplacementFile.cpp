@@ -23,13 +23,13 @@ constexpr std::string_view kRules = "DefaultRules";
 bool isMappingTable(std::string_view text, const std::string& path, Error* error) {
     const std::vector<std::string> lines = split(replaceAll(text, "\r\n", "\n"), "\n");
     if (lines.front() != kLegacyMappingHeader)
-        return fail(error, kErrorMalformed, fmt::format("{}, line 1: is not the header", printable(path)));
+        return fail(error, kErrorMalformed, "is not the header", {.path = path, .line = 1});
     for (std::size_t i = 1; i < lines.size(); ++i) {
         const auto separators = std::count(lines[i].begin(), lines[i].end(), ';');
         if (lines[i].empty() || separators + 1 == kLegacyMappingFieldCount) continue;
         return fail(error, kErrorMalformed,
-                    fmt::format("{}, line {}: has not {} fields", printable(path), i + 1,
-                                std::size_t{kLegacyMappingFieldCount}));
+                    fmt::format("has not {} fields", std::size_t{kLegacyMappingFieldCount}),
+                    {.path = path, .line = i + 1});
     }
     return true;
 }
@@ -50,7 +50,7 @@ struct Verdict {
 Verdict judge(const ResourceFile& resource, const std::string& path, FileStamp stamp) {
     Verdict verdict{stamp, false, {}};
     verdict.isUsable = isUsable(resource, path, &verdict.error);
-    if (!verdict.isUsable) verdict.error.message += " (using the built-in one)";
+    if (!verdict.isUsable) verdict.error.reason += " (using the built-in one)";
     return verdict;
 }
 
@@ -88,7 +88,7 @@ std::optional<std::string> replacementFile(const ResourceFile& resource, Error* 
     auto verdict = verdicts.of(*path, stamp);
     if (!verdict) {
         verdict = judge(resource, *path, stamp);
-        if (verdicts.set(*path, *verdict) && !verdict->isUsable) log(verdict->error.message);
+        if (verdicts.set(*path, *verdict) && !verdict->isUsable) log(verdict->error.message());
     }
     if (verdict->isUsable) return path;
     if (error != nullptr) *error = verdict->error;
@@ -104,9 +104,10 @@ std::optional<PropertyList::Dictionary> readResourceDictionary(std::string_view 
         name == kRules ? dictionary->array(key) != nullptr : dictionary->dictionary(key) != nullptr;
     if (hasEntries) return dictionary;
     fail(error, kErrorMalformed,
-         fmt::format("{}: {} \"{}\"", printable(path),
+         fmt::format("{} \"{}\"",
                      dictionary->value(key) == nullptr ? "there is no key" : "there are no entries under",
-                     key));
+                     key),
+         {path});
     return std::nullopt;
 }
 

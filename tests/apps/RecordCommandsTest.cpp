@@ -432,11 +432,11 @@ TEST(Inspect, ShowsWhatIsInEveryKindOfItem) {
     }
     const ToolResult data = runTool({"inspect", items.folder.path("bits.data")});
     EXPECT_EQ(data.status, 1);
-    EXPECT_THAT(data.errors, HasSubstr("bits.data: the property list at byte 2 has no end"));
+    EXPECT_THAT(data.errors, HasSubstr("bits.data: embedded property list, byte 2: has no end"));
     const ToolResult once = runTool({"read", items.folder.path("bits.data")});
     EXPECT_EQ(once.status, 1);
     EXPECT_EQ(once.errors,
-              "qvtag: " + items.folder.path("bits.data") + ": the property list at byte 2 has no end\n");
+              "qvtag: " + items.folder.path("bits.data") + ": embedded property list, byte 2: has no end\n");
 }
 
 TEST(Inspect, ListsTheTracksOfMidiFiles) {

@@ -328,16 +328,17 @@ TEST(RhythmCommand, NamesWhatCannotBeMeasuredAndDoesTheRest) {
     const Wav wav;
     const struct {
         std::string path, reason;
-    } rows[] = {{folder.path("none.mid"), "none.mid: No such file"},
-                {folder.path("none.wav"), "none.wav: "},
-                {folder.write("text.mid", "no notes"), "text.mid: "},
-                {folder.write("text.wav", "no sound"), "text.wav: "},
-                {folder.write("d.mid", "MThd" + big(6, 4) + big(0, 2) + big(1, 2) + big(0, 2)), "d.mid: "},
-                {folder.write("empty.mid", emptyMidi()), "empty.mid: nothing sounds in it"},
-                {folder.write("silence.wav", clicks({})), "silence.wav: nothing sounds in it"},
-                {folder.write("nothing.wav", wav.file(wav.format(1) + wav.chunk("data", ""))),
-                 "nothing.wav: it has no samples"},
-                {folder.path(), folder.path() + ": "}};
+    } rows[] = {
+        {folder.path("none.mid"), "none.mid: No such file"},
+        {folder.path("none.wav"), "none.wav: "},
+        {folder.write("text.mid", "no notes"), "text.mid, byte 0: "},
+        {folder.write("text.wav", "no sound"), "text.wav: "},
+        {folder.write("d.mid", "MThd" + big(6, 4) + big(0, 2) + big(1, 2) + big(0, 2)), "d.mid, byte 12: "},
+        {folder.write("empty.mid", emptyMidi()), "empty.mid: nothing sounds in it"},
+        {folder.write("silence.wav", clicks({})), "silence.wav: nothing sounds in it"},
+        {folder.write("nothing.wav", wav.file(wav.format(1) + wav.chunk("data", ""))),
+         "nothing.wav: it has no samples"},
+        {folder.path(), folder.path() + ": "}};
     for (const auto& row : rows) {
         const ToolResult result = rhythm({row.path, good, "--beats", "4"});
         EXPECT_EQ(result.status, 1) << row.path;
@@ -401,7 +402,7 @@ TEST(RhythmCommand, EveryMidiFileOfTheCorpusGivesWhatCanBeReadOrAReason) {
         const ToolResult result = rhythm({file});
         ASSERT_THAT(result.status, testing::AnyOf(0, 1)) << file << result.errors;
         if (result.status == 1) {
-            EXPECT_THAT(result.errors, HasSubstr(std::filesystem::path(file).filename().string() + ": "));
+            EXPECT_THAT(result.errors, HasSubstr(file));
             EXPECT_EQ(result.json(), json::array());
             continue;
         }

@@ -358,7 +358,7 @@ TEST(Script, SyntaxIsCheckedWithoutRunning) {
     Error error;
     EXPECT_TRUE(ScriptContext::checkSyntax("for (;;);"));
     EXPECT_FALSE(ScriptContext::checkSyntax("var a;\nvar b = ;", &error));
-    EXPECT_THAT(error.message, HasSubstr("script, line 2: SyntaxError"));
+    EXPECT_THAT(error.message(), HasSubstr("script, line 2: SyntaxError"));
 }
 
 }  // namespace

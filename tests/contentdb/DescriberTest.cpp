@@ -37,7 +37,7 @@ class Describing : public testing::Test {
                          std::uint64_t services = optionsForAllTaggingServices()) const {
         Error error;
         const auto item = ContentDescriber(services).describe(path, &error);
-        EXPECT_TRUE(item) << error.message;
+        EXPECT_TRUE(item) << error.message();
         return item.value_or(IndexedItem{});
     }
 
@@ -48,7 +48,7 @@ class Describing : public testing::Test {
         Error error;
         EXPECT_TRUE(TGRTFileNode::nodeWithFileURL(url)->taggingWriterForFileURL(url)->writeTaggings(
             {TGRTTagging::initWithTag(tag, nullptr)}, url, &error))
-            << error.message;
+            << error.message();
     }
 
     /// One item of each kind, with its content apart from the record.
@@ -231,7 +231,7 @@ TEST_F(Describing, SaysWhyAnItemCannotBeRead) {
     for (const auto& [path, place] : cases) {
         Error error;
         EXPECT_FALSE(ContentDescriber().describe(path, &error)) << path;
-        EXPECT_THAT(error.message, HasSubstr(place));
+        EXPECT_THAT(error.message(), HasSubstr(place));
     }
 }
 

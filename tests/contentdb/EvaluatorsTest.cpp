@@ -280,9 +280,9 @@ TEST(Evaluators, FindTheSimilarItemsThatComparingAllWouldFind) {
     }
     Error error;
     EXPECT_FALSE(database->similar(items[7].path, 5, &error));
-    EXPECT_THAT(error.message, testing::HasSubstr("could not be read when it was indexed"));
+    EXPECT_THAT(error.message(), testing::HasSubstr("could not be read when it was indexed"));
     EXPECT_FALSE(database->similar(items[9].path, 5, &error));
-    EXPECT_THAT(error.message, testing::HasSubstr("no tags, rhythm or tempo"));
+    EXPECT_THAT(error.message(), testing::HasSubstr("no tags, rhythm or tempo"));
 }
 
 TEST(Evaluators, FindTheSimilarItemsAmongManyOfTheSameTags) {

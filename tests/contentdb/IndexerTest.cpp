@@ -82,7 +82,7 @@ class Indexing : public testing::Test {
                                   ? indexLibrary(
                                         options, [] { return std::make_unique<NameDescriber>(); }, &error)
                                   : indexLibrary(options, &error);
-        EXPECT_TRUE(progress) << error.message;
+        EXPECT_TRUE(progress) << error.message();
         return progress.value_or(IndexProgress{});
     }
 
@@ -226,7 +226,7 @@ TEST_F(Indexing, AndMergingTakeTurnsAtADatabase) {
     const auto refusal = [&] {
         Error error;
         EXPECT_FALSE(mergeDatabases({database()}, target, &error));
-        return error.message;
+        return error.message();
     };
     Milestone milestone;
     const pid_t child = ::fork();
@@ -334,7 +334,7 @@ TEST_F(Indexing, TakesNothingOutWhileADiskMayBeAway) {
                    options.links.outside = LinksOutside::all;
                    options.prune = true;
                    options.pruneRoots = roots;
-                   options.failed = [&](const Error& error) { failures.push_back(error.message); };
+                   options.failed = [&](const Error& error) { failures.push_back(error.message()); };
                })
             .pruned;
     };
@@ -485,7 +485,7 @@ TEST_F(Indexing, SaysWhyNothingDescribes) {
         options.worker = program;
         Error error;
         EXPECT_FALSE(indexLibrary(options, &error));
-        return error.message;
+        return error.message();
     };
     const std::string missing = folder_.path("none");
     EXPECT_EQ(problem({missing, {}}), missing + ": cannot be started: No such file or directory");
@@ -497,10 +497,10 @@ TEST_F(Indexing, SaysWhyNothingDescribes) {
     Error error;
     EXPECT_FALSE(indexLibrary(
         options, [] { return std::unique_ptr<NameDescriber>(); }, &error));
-    EXPECT_EQ(error.message, "there is nothing that describes items");
+    EXPECT_EQ(error.message(), "there is nothing that describes items");
     const auto failing = []() -> std::unique_ptr<NameDescriber> { throw std::runtime_error("out of luck"); };
     EXPECT_FALSE(indexLibrary(options, failing, &error));
-    EXPECT_EQ(error.message, "out of luck");
+    EXPECT_EQ(error.message(), "out of luck");
     EXPECT_EQ(index().described, 1U);
 }
 
@@ -522,10 +522,10 @@ TEST_F(Indexing, IsDescribedByOurWorkersAsInThisProcess) {
     Error error;
     EXPECT_TRUE(indexLibrary(
         options, [&] { return std::make_unique<ContentDescriber>(options.services); }, &error))
-        << error.message;
+        << error.message();
     options.database = folder_.path("workers");
     ::setenv("QVCT_INDEX_WORKER", QVCT_INDEX_WORKER, 1);
-    EXPECT_TRUE(indexLibrary(options, &error)) << error.message;
+    EXPECT_TRUE(indexLibrary(options, &error)) << error.message();
     ::unsetenv("QVCT_INDEX_WORKER");
     for (const auto& [name, extension] : kResourceFiles)
         ResourceBundle::setPathForResource(name, extension, std::nullopt);
@@ -654,17 +654,17 @@ TEST_F(Indexing, OfPartsUnitesToTheSameContent) {
     EXPECT_EQ(sum, 500U);
     const std::string merged = folder_.path("merged");
     Error error;
-    ASSERT_TRUE(mergeDatabases({parts[2], parts[0], parts[1]}, merged, &error)) << error.message;
+    ASSERT_TRUE(mergeDatabases({parts[2], parts[0], parts[1]}, merged, &error)) << error.message();
     EXPECT_EQ(names("", merged), names());
     EXPECT_EQ(names("name-", merged), names("name-"));
     const auto whole = ContentDatabase::open(database());
     const auto united = ContentDatabase::open(merged);
-    EXPECT_TRUE(united->check(&error)) << error.message;
+    EXPECT_TRUE(united->check(&error)) << error.message();
     EXPECT_EQ(united->totals()->failures, 1);
     const auto all = whole->search(*parseQuery("", {}, nullptr), 1000);
     for (const Found& found : *all) EXPECT_EQ(united->item(found.item.path)->item, found.item);
     EXPECT_FALSE(mergeDatabases(parts, merged, &error));
-    EXPECT_THAT(error.message, HasSubstr("exists already"));
+    EXPECT_THAT(error.message(), HasSubstr("exists already"));
 }
 
 TEST_F(Indexing, OfPartsInOneDatabaseMissesNothingOfTheOthers) {
@@ -783,8 +783,8 @@ TEST_F(Indexing, IsNotSearchedByAnExpressionWithoutEnd) {
     const auto query = parseQuery("-name::^(a+)+$", *database->vocabulary(), nullptr);
     Error error;
     EXPECT_FALSE(database->search(*query, 10, &error));
-    EXPECT_THAT(error.message, HasSubstr("regular expression \"^(a+)+$\" on \"aaaa"));
-    EXPECT_THAT(error.message, HasSubstr("takes too long"));
+    EXPECT_THAT(error.message(), HasSubstr("regular expression \"^(a+)+$\" on \"aaaa"));
+    EXPECT_THAT(error.message(), HasSubstr("takes too long"));
 }
 
 TEST_F(Indexing, FindsDamageOnAnyPageAndKeepsAllFolders) {
@@ -842,7 +842,7 @@ TEST_F(Indexing, ReadsTheDatabaseWholeWhenTold) {
         Connection(database(), Connection::Access::readWrite).run(fault);
         Error error;
         EXPECT_FALSE(ContentDatabase::open(database())->check(&error));
-        EXPECT_THAT(error.message, HasSubstr(reason + "; `index --check` builds"));
+        EXPECT_THAT(error.message(), HasSubstr(reason + "; `index --check` builds"));
         notes_.clear();
         index([](IndexOptions& options) { options.check = true; });
         EXPECT_THAT(notes_, ElementsAre(HasSubstr("built anew")));
@@ -861,7 +861,7 @@ TEST_F(Indexing, RefusesASecondRunAForeignFileAndAMissingFolder) {
         Error error;
         EXPECT_FALSE(indexLibrary(
             options, [] { return std::make_unique<NameDescriber>(); }, &error));
-        return error.message;
+        return error.message();
     };
     EXPECT_THAT(refusal(), HasSubstr("not a content database"));
     EXPECT_EQ(readAll(song), std::string(20000, 'x'));
@@ -913,7 +913,7 @@ TEST_F(Indexing, KeepsWhatItHasWhenTheDiskIsFull) {
         Error error;
         const auto progress = indexLibrary(
             options, [] { return std::make_unique<NameDescriber>(); }, &error);
-        ::_exit(!progress && error.message.find(database()) != std::string::npos ? 7 : 0);
+        ::_exit(!progress && error.message().find(database()) != std::string::npos ? 7 : 0);
     }
     int status = 0;
     ::waitpid(child, &status, 0);

@@ -52,13 +52,13 @@ std::map<std::string, IndexedItem> contents(const std::string& path) {
     };
     Error error;
     const auto database = ContentDatabase::open(path, &error);
-    EXPECT_TRUE(database) << error.message;
+    EXPECT_TRUE(database) << error.message();
     if (!database) return result;
     const auto all = database->search(*parseQuery("", {}, nullptr), 100000, &error);
-    EXPECT_TRUE(all) << error.message;
+    EXPECT_TRUE(all) << error.message();
     for (const Found& found : all.value_or(std::vector<Found>())) add(found.item);
     EXPECT_TRUE(database->forEachFailure(add));
-    EXPECT_TRUE(database->check(&error)) << error.message;
+    EXPECT_TRUE(database->check(&error)) << error.message();
     return result;
 }
 
@@ -231,7 +231,7 @@ class ChangingLibrary {
         Error error;
         EXPECT_TRUE(indexLibrary(
             options, [] { return std::make_unique<TextDescriber>(); }, &error))
-            << error.message;
+            << error.message();
     }
     void indexAndCompare() {
         const bool prunes = pick(3) == 0;

@@ -36,7 +36,7 @@ TEST(Store, KeepsEveryByteOfAnItem) {
         EXPECT_EQ(found->item, item);
     }
     Error error;
-    EXPECT_TRUE(database->check(&error)) << error.message;
+    EXPECT_TRUE(database->check(&error)) << error.message();
 }
 
 TEST(Store, FindsAnItemByItsNewFactsOnly) {
@@ -122,7 +122,7 @@ TEST(Store, IsReadByOneWhoMayNotWriteThere) {
         Error error;
         const auto database = ContentDatabase::open(path, &error);
         const auto totals = database ? database->totals(&error) : std::nullopt;
-        return totals && database->check(&error) ? std::to_string(totals->items) : error.message;
+        return totals && database->check(&error) ? std::to_string(totals->items) : error.message();
     };
     EXPECT_EQ(asStranger(count), "10");
     // What is only in the log is not passed over.
@@ -157,8 +157,8 @@ TEST(Store, RefusesWhatIsNoContentDatabaseOfThisVersion) {
           Case{"/dev/null", "a pipe or device"}}) {
         Error error;
         EXPECT_EQ(ContentDatabase::open(one.path, &error), nullptr) << one.path;
-        EXPECT_THAT(error.message, HasSubstr(one.reason));
-        EXPECT_THAT(error.message, HasSubstr(one.path));
+        EXPECT_THAT(error.message(), HasSubstr(one.reason));
+        EXPECT_THAT(error.message(), HasSubstr(one.path));
     }
 }
 

@@ -409,9 +409,9 @@ bool indexFolder(const std::string& folder) {
 std::vector<std::string> namesIndexed(const std::string& folder) {
     Error error;
     const auto database = contentdb::ContentDatabase::open(folder + "/db", &error);
-    EXPECT_TRUE(database) << error.message;
+    EXPECT_TRUE(database) << error.message();
     if (!database) return {};
-    EXPECT_TRUE(database->check(&error)) << error.message;
+    EXPECT_TRUE(database->check(&error)) << error.message();
     const auto found = database->search(*contentdb::parseQuery("", *database->vocabulary(), nullptr), 1000);
     std::vector<std::string> names;
     for (const auto& each : found.value_or(std::vector<contentdb::Found>{})) names.push_back(each.item.name);

@@ -176,7 +176,7 @@ TEST(AudioWriters, TagsDoNotMakeOrUnmakeALoop) {
     Error error;
     EXPECT_FALSE(
         TGRTAudioFileTaggingWriter().writeTaggings(taggings, urlOf(folder.write("x.wav", "RIFF")), &error));
-    EXPECT_THAT(error.message, testing::HasSubstr("x.wav"));
+    EXPECT_THAT(error.message(), testing::HasSubstr("x.wav"));
 }
 
 }  // namespace

@@ -201,9 +201,9 @@ TEST(FileNode, ReadsAudioOfAnyNameAndNamesWhatIsNoContent) {
     ASSERT_NE(read("named.any", &error), nullptr);
     EXPECT_EQ(read("named.any", &error)->fileType(), kFileTypeAudioFile);
     EXPECT_EQ(read("Bass.cst", &error), nullptr);
-    EXPECT_EQ(error.message, "") << "an item that stores nothing is not broken";
+    EXPECT_EQ(error.message(), "") << "an item that stores nothing is not broken";
     EXPECT_EQ(read("words.txt", &error), nullptr);
-    EXPECT_THAT(error.message, testing::EndsWith("words.txt: no kind of content"));
+    EXPECT_THAT(error.message(), testing::EndsWith("words.txt: no kind of content"));
 }
 
 TEST(PrelistenFiles, AreToldByTheEndOfThePath) {
@@ -278,21 +278,21 @@ TEST(ReadersAndWriters, TakeNoOtherURLForAPathOfThisMachine) {
         const auto reader = TGRTMetaDataReaderFactory::metaDataReaderForURL(local);
         EXPECT_NE(reader->readMetaDataFromURL(local, 0), nullptr) << name;
         EXPECT_EQ(reader->readMetaDataFromURL(remote, 0, &error), nullptr) << name;
-        EXPECT_THAT(error.message, testing::StartsWith("http://host/")) << name;
+        EXPECT_THAT(error.message(), testing::StartsWith("http://host/")) << name;
         error = {};
         const auto writer = TGRTMetaDataWriterFactory::taggingWriterForURL(local);
         EXPECT_FALSE(writer->writeTaggings(test::taggingsOf({{"Genres", "House"}}), remote, &error)) << name;
-        EXPECT_THAT(error.message, testing::StartsWith("http://host/")) << name;
+        EXPECT_THAT(error.message(), testing::StartsWith("http://host/")) << name;
         EXPECT_TRUE(reader->readMetaDataFromURL(local, 0)->taggings().empty()) << name;
     }
     const URL remote = URL::URLWithString("http://host" + folder.path("taxonomy.plist"));
     Error error;
     EXPECT_FALSE(TGRTTaxonomy::defaultTaxonomy()->writeToURL(remote, &error));
-    EXPECT_EQ(error.message, remote.absoluteString() + ": is no file URL");
+    EXPECT_EQ(error.message(), remote.absoluteString() + ": is no file URL");
     EXPECT_FALSE(std::filesystem::exists(folder.path("taxonomy.plist")));
     error = {};
     TGRTTaxonomy::taxonomyWithContentsOfURL(remote, &error);
-    EXPECT_EQ(error.message, remote.absoluteString() + ": is no file URL");
+    EXPECT_EQ(error.message(), remote.absoluteString() + ": is no file URL");
 }
 
 TEST(Packages, GatherTheItemsThatNameThem) {

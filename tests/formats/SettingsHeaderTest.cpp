@@ -63,7 +63,7 @@ TEST(SettingsHeader, ReadsTheFieldsOfAWholeOrShortFile) {
     EXPECT_EQ(info->manuID() | info->productID() | info->plugInID() | info->plugInSubID(), 0U);
     Error error;
     EXPECT_EQ(TGRTSettingsHeaderReader::settingInfoForURL(test::urlOf(folder.path("none")), &error), nullptr);
-    EXPECT_THAT(error.message, testing::HasSubstr(folder.path("none")));
+    EXPECT_THAT(error.message(), testing::HasSubstr(folder.path("none")));
     EXPECT_EQ(TGRTSettingsHeaderReader::settingInfoForURL(test::urlOf(folder.path())), nullptr);
     EXPECT_EQ(TGRTSettingsHeaderReader::settingInfoForURL(std::nullopt), nullptr);
 }

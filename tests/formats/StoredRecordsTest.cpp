@@ -35,7 +35,7 @@ std::shared_ptr<TGRTMetaData> read(const std::string& path, std::uint64_t option
 PropertyList::Dictionary stored(const std::string& path) {
     Error error;
     auto dictionary = readDictionaryFile(path, &error);
-    EXPECT_TRUE(dictionary) << error.message;
+    EXPECT_TRUE(dictionary) << error.message();
     return dictionary.value_or(Dictionary{});
 }
 
@@ -73,12 +73,12 @@ TEST(StoredRecords, NothingStoredIsNotBroken) {
     Error error;
     for (const char* name : {"empty.patch", "absent.cst", "absent.ostrax"})
         EXPECT_EQ(read(folder.path(name), 0, &error), nullptr) << name;
-    EXPECT_EQ(error.message, "");
+    EXPECT_EQ(error.message(), "");
     const auto untagged = read(folder.path("empty.patch"), kReadUntaggedPatch);
     ASSERT_TRUE(untagged);
     EXPECT_EQ(untagged->fileType(), 1);
     EXPECT_EQ(read(folder.path("broken.patch"), 0, &error), nullptr);
-    EXPECT_THAT(error.message, HasSubstr(folder.path("broken.patch/tags.plist")));
+    EXPECT_THAT(error.message(), HasSubstr(folder.path("broken.patch/tags.plist")));
 }
 
 TEST(StoredRecords, SubTypesFollowTheFirstTagInTheTable) {
@@ -129,7 +129,7 @@ TEST(TaggingWriters, ReplaceTaggingsAndKeepWhatIsNotTheirs) {
         const TemporaryFolder folder;
         Error error;
         const URL item = urlOf(folder.path(c.item));
-        ASSERT_TRUE(c.writer->writeTaggings(demo, item, &error)) << c.what << ": " << error.message;
+        ASSERT_TRUE(c.writer->writeTaggings(demo, item, &error)) << c.what << ": " << error.message();
         Dictionary expected = {{"Tagging", test::taggingDictionary("Content Type", "Demo Song")},
                                {"Type", c.type}};
         if (c.subType != PropertyList(false)) expected.set("SubType", c.subType);
@@ -138,7 +138,7 @@ TEST(TaggingWriters, ReplaceTaggingsAndKeepWhatIsNotTheirs) {
         test::writeList(folder, c.list,
                         {{"UUID", "u"}, {"Mine", 7}, {"Type", 3}, {"ContentInfo", Dictionary{}}},
                         PropertyListFormat::binary);
-        ASSERT_TRUE(c.writer->writeTaggings({}, item, &error)) << c.what << ": " << error.message;
+        ASSERT_TRUE(c.writer->writeTaggings({}, item, &error)) << c.what << ": " << error.message();
         const Dictionary cleared = {
             {"Mine", 7}, {"Type", c.type}, {"ContentInfo", Dictionary{}}, {"Tagging", Dictionary{}}};
         EXPECT_EQ(stored(folder.path(c.list)), cleared) << c.what;
@@ -179,7 +179,7 @@ TEST(MetaDataWriters, BundlesAreWrittenOverAndSideCarsAreKept) {
         auto record = TGRTMetaData::init();
         record->setDisplayName("New");
         Error error;
-        ASSERT_TRUE(c.writer->writeMetaData(record, urlOf(folder.path(c.item)), &error)) << error.message;
+        ASSERT_TRUE(c.writer->writeMetaData(record, urlOf(folder.path(c.item)), &error)) << error.message();
         EXPECT_EQ(record->fileType(), c.type) << c.what << ": the caller's record is given its type";
         Dictionary expected = {{"Tagging", Dictionary{}},
                                {"KeyValueData", Dictionary{}},
@@ -230,17 +230,18 @@ TEST(Writers, LeaveWhatTheyCannotReadOrReach) {
         Error error;
         EXPECT_FALSE(
             TGRTCstSxvPstTaggingWriter().writeTaggings(taggings, urlOf(folder.path("a.cst")), &error));
-        EXPECT_THAT(error.message, HasSubstr(list + ": not written over"));
+        EXPECT_EQ(error.path, list);
+        EXPECT_THAT(error.reason, testing::StartsWith("not written over"));
         EXPECT_EQ(readTextFile(list), bytes);
     }
     Error error;
     const URL nowhere = urlOf(folder.path("absent/a.cst"));
     EXPECT_FALSE(TGRTCstSxvPstTaggingWriter().writeTaggings(taggings, nowhere, &error));
-    EXPECT_THAT(error.message, HasSubstr(nowhere.path() + ".plist"));
+    EXPECT_THAT(error.message(), HasSubstr(nowhere.path() + ".plist"));
     EXPECT_FALSE(std::filesystem::exists(folder.path("absent"))) << "settings writers make no folder";
     folder.write("file.patch", "");
     EXPECT_FALSE(TGRTPatchTaggingWriter().writeTaggings(taggings, urlOf(folder.path("file.patch")), &error));
-    EXPECT_THAT(error.message, HasSubstr("file.patch/tags.plist"));
+    EXPECT_THAT(error.message(), HasSubstr("file.patch/tags.plist"));
 }
 
 TEST(Writers, DoNotTouchAFileThatSaysItAlready) {
@@ -294,13 +295,16 @@ TEST(DataFiles, FindTheirListBetweenOtherBytes) {
 TEST(DataFiles, LogOneLineWhenThereIsNone) {
     const TemporaryFolder folder;
     const std::string array = serializePropertyList(PropertyList::Array{1}, PropertyListFormat::binary);
+    std::string damaged = "xx" + array;
+    damaged[10] = '\xF0';
     struct {
         std::string bytes;
         const char* reason;
     } const cases[] = {
+        {damaged, "embedded binary property list, byte 10: unknown marker 0xf"},
         {"no list at all", "no embedded property list"},
-        {"xxbplist00" + std::string(60, 'x'), "the property list at byte 2 has no end"},
-        {array, "the embedded property list is no dictionary"},
+        {"xxbplist00" + std::string(60, 'x'), "embedded property list, byte 2: has no end"},
+        {array, "embedded property list, byte 0: is no dictionary"},
     };
     for (const auto& c : cases) {
         const std::string path = folder.write("a.data", c.bytes);
@@ -313,7 +317,7 @@ TEST(DataFiles, LogOneLineWhenThereIsNone) {
         EXPECT_EQ(record->fileType(), 0);
         EXPECT_THAT(lines, ElementsAre("Indexing " + path + ": " + c.reason));
         EXPECT_EQ(error.code, 2);
-        EXPECT_EQ(error.message, path + ": " + c.reason);
+        EXPECT_EQ(error.message(), path + ": " + c.reason);
     }
 }
 

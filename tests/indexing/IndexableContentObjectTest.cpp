@@ -105,8 +105,8 @@ TEST(IndexableObject, IsMissingOrNotAsTheOptionsSay) {
         SCOPED_TRACE(c.what);
         Error error;
         const auto object = objectAt(c.path, 0, &error);
-        EXPECT_THAT(error.message, *c.error == '\0' ? testing::Matcher<std::string>(IsEmpty())
-                                                    : testing::Matcher<std::string>(HasSubstr(c.error)));
+        EXPECT_THAT(error.message(), *c.error == '\0' ? testing::Matcher<std::string>(IsEmpty())
+                                                      : testing::Matcher<std::string>(HasSubstr(c.error)));
         EXPECT_EQ(object ? object->fileType() : -1, c.fileType);
         const auto all = objectAt(c.path, kIndexWithoutRecord);
         ASSERT_NE(all, nullptr);
@@ -124,7 +124,7 @@ TEST(IndexableObject, IsMadeOfFilesOnly) {
         Error error;
         const URL url = URL::URLWithString("https://example.org/a.wav");
         EXPECT_EQ(Object::indexableContentObjectForURL(url, options, &error), nullptr) << options;
-        EXPECT_THAT(error.message, HasSubstr("example.org/a.wav: not a file URL"));
+        EXPECT_THAT(error.message(), HasSubstr("example.org/a.wav: not a file URL"));
     }
 }
 

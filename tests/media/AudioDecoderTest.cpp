@@ -86,8 +86,9 @@ TEST(AudioDecoder, RefusesWhatIsNoAudioAndNamesIt) {
     const test::TemporaryFolder folder;
     for (const std::string& bytes : {std::string(), std::string("RIFF"), std::string(1000, 'x')}) {
         Error error;
-        EXPECT_FALSE(AudioDecoder::open(folder.write("no.wav", bytes), &error));
-        EXPECT_THAT(error.message, testing::HasSubstr("no.wav"));
+        const std::string path = folder.write("no.wav", bytes);
+        EXPECT_FALSE(AudioDecoder::open(path, &error));
+        EXPECT_EQ(error.path, path);
         EXPECT_FALSE(decoderOf(bytes));
     }
     EXPECT_FALSE(AudioDecoder::open(folder.path("absent.wav")));
@@ -140,7 +141,7 @@ TEST(AudioDecoder, SurvivesMalformedFiles) {
         Error error;
         const auto decoder = AudioDecoder::open(path, &error);
         if (!decoder) {
-            EXPECT_THAT(error.message, testing::HasSubstr(path));
+            EXPECT_THAT(error.message(), testing::HasSubstr(path));
         } else {
             OnsetDetector::detect(*decoder);
         }

@@ -106,18 +106,18 @@ TEST(LoopFileWrite, ARecordComesBackAndEveryOtherByteStays) {
         Error error;
         for (int round = 0; round < 3; ++round) {
             const auto data = read(path, &error);
-            ASSERT_TRUE(data) << sound.name << error.message;
+            ASSERT_TRUE(data) << sound.name << error.message();
             data->setTaggingDictionary(kTagging);
             data->setDisplayName(std::string(static_cast<std::size_t>(round) + 1, 'n'));
-            ASSERT_TRUE(write(path, data, &error)) << sound.name << ": " << error.message;
+            ASSERT_TRUE(write(path, data, &error)) << sound.name << ": " << error.message();
             const auto again = read(path, &error);
-            ASSERT_TRUE(again) << sound.name << ": " << error.message;
+            ASSERT_TRUE(again) << sound.name << ": " << error.message();
             EXPECT_EQ(again->taggingDictionary(), kTagging);
             EXPECT_EQ(again->displayName(), data->displayName());
             EXPECT_EQ(before->differences(*fingerprintOfFile(URL::fileURLWithPath(path))),
                       std::vector<std::string>{});
         }
-        ASSERT_TRUE(untag(path, &error)) << sound.name << ": " << error.message;
+        ASSERT_TRUE(untag(path, &error)) << sound.name << ": " << error.message();
         EXPECT_EQ(contentsOf(path), sound.bytes) << sound.name;
         EXPECT_EQ(test::filesBelow(folder.path()).size(), 1U) << "a temporary file was left behind";
     }
@@ -275,7 +275,7 @@ TEST(LoopFileWrite, PutsHarmlessSizesAndPadBytesRight) {
         const auto heard = samplesOf(path);
         const auto before = fingerprintOfFile(URL::fileURLWithPath(path));
         Error error;
-        ASSERT_TRUE(tag(path, &error)) << c.what << ": " << error.message;
+        ASSERT_TRUE(tag(path, &error)) << c.what << ": " << error.message();
         EXPECT_EQ(read(path)->taggingDictionary(), kTagging) << c.what;
         EXPECT_THAT(before->differences(*fingerprintOfFile(URL::fileURLWithPath(path))), testing::IsEmpty())
             << c.what;
@@ -347,7 +347,7 @@ TEST(LoopFileWrite, AllMusicThatIsSetComesBackThroughARecord) {
     ASSERT_TRUE(write(path, data));
     Error error;
     const auto again = read(path, &error);
-    ASSERT_TRUE(again) << error.message;
+    ASSERT_TRUE(again) << error.message();
     EXPECT_EQ(again->tavioLoopType(), 2);
     EXPECT_EQ(again->beatCount(), 8);
     EXPECT_EQ(again->midiRootNote(), 48);
@@ -392,55 +392,56 @@ TEST(LoopFileWrite, RefusesWhatItCannotRewriteWithCertainty) {
         std::string bytes;
         const char* reason;
     } const cases[] = {
-        {"wav-cut-off.wav", wav.file(start + wav.data()).substr(0, 900), "byte 4 claims"},
+        {"wav-cut-off.wav", wav.file(start + wav.data()).substr(0, 900), "form, byte 4: claims"},
         {"wav-never-finished.wav",
          "RIFF" + test::little(0, 4) + "WAVE" + start + "data" + test::little(0, 4) + "abcd",
-         "byte 4 has no size"},
+         "form, byte 4: has no size"},
         {"wav-cut-off-in-a-header.wav", wav.file(start + wav.data(40) + wav.chunk("junk", "")).substr(0, 89),
-         "byte 4 claims"},
-        {"wav-cut-off-behind-a-header.wav", wav.file(start + wav.data(400)).substr(0, 44), "byte 4 claims"},
+         "form, byte 4: claims"},
+        {"wav-cut-off-behind-a-header.wav", wav.file(start + wav.data(400)).substr(0, 44),
+         "form, byte 4: claims"},
         {"wav-invalid-id.wav", wav.file(start + wav.data(40) + wav.chunk("\1\2te", "")),
-         "at byte 84: its id is invalid"},
+         "byte 84: its id is invalid"},
         {"wav-two-formats.wav", wav.file(start + wav.format(1, 8000, 8) + wav.data()),
-         "at byte 36: contradicts"},
-        {"wav-stray-bytes.wav", wav.file(start + wav.data(40) + "stray"), "byte 84 are no chunk"},
+         "byte 36: contradicts"},
+        {"wav-stray-bytes.wav", wav.file(start + wav.data(40) + "stray"), "byte 84: 5 bytes are no chunk"},
         {"wav-size-too-large.wav", wav.file(start + wav.data(40) + "junk" + test::little(0xFFFFFFF8, 4)),
-         "'junk' at byte 84: claims more"},
+         "'junk', byte 84: claims more"},
         {"wav-audio-reaches-into-the-block-behind.wav",
          wav.file(start + "data" + test::little(46, 4) + test::noise(40)) + block,
-         "'1><0' at byte 90: claims more"},
+         "'1><0', byte 90: claims more"},
         {"wav-chunk-reaches-into-the-block-behind.wav",
          wav.file(start + wav.data(40) + "LIST" + test::little(22, 4) + "INFOINAM" + test::little(4, 4) +
                   std::string("abc", 4)) +
              block,
-         "'1><0' at byte 114: claims more"},
+         "'1><0', byte 114: claims more"},
         {"wav-two-records.wav",
          wav.file(start + wav.data(40) + wav.chunk("qvct", record) + wav.chunk("qvct", record)),
          "a second record"},
         {"wav-record-damaged.wav", wav.file(start + wav.data(40) + wav.chunk("qvct", "bplist00 but no more")),
-         "'qvct' at byte 84: holds a record that cannot be read"},
+         "'qvct', byte 84: holds a record that cannot be read"},
         {"rf64-without-sizes.wav", "RF64" + test::little(0xFFFFFFFF, 4) + "WAVE" + start + wav.data(),
-         "byte 4 has no size"},
+         "form, byte 4: has no size"},
         {"aiff-two-formats.aif", Aiff::file(Aiff::common() + Aiff::common(1) + Aiff::sound()),
-         "at byte 38: contradicts"},
-        {"aiff-cut-off.aif", Aiff::file(Aiff::common() + Aiff::sound()).substr(0, 500), "byte 4 claims"},
+         "byte 38: contradicts"},
+        {"aiff-cut-off.aif", Aiff::file(Aiff::common() + Aiff::sound()).substr(0, 500),
+         "form, byte 4: claims"},
         {"caf-cut-off.caf", Caf::file(Caf::description() + Caf::data()).substr(0, 500),
-         "'data' at byte 52: claims"},
+         "'data', byte 52: claims"},
         {"caf-size-minus-8.caf", Caf::file(Caf::description() + Caf::data() + Caf::chunk("free", "", -8)),
-         "'free' at byte 4068: its size is negative"},
+         "'free', byte 4068: its size is negative"},
         {"caf-unknown-version.caf",
-         "caff" + test::big(9, 2) + test::big(0, 2) + Caf::description() + Caf::data(),
-         "version 9 at byte 4"},
+         "caff" + test::big(9, 2) + test::big(0, 2) + Caf::description() + Caf::data(), "byte 4: version 9"},
         {"caf-two-descriptions.caf", Caf::file(Caf::description() + Caf::description(8000) + Caf::data()),
-         "at byte 52: a second description"},
+         "byte 52: a second description"},
     };
     for (const auto& c : cases) {
         const TemporaryFolder folder;
         const std::string path = folder.write(c.fault, c.bytes);
         Error error;
-        EXPECT_TRUE(read(path, &error)) << c.fault << ": " << error.message;
+        EXPECT_TRUE(read(path, &error)) << c.fault << ": " << error.message();
         EXPECT_FALSE(tag(path, &error)) << c.fault;
-        EXPECT_THAT(error.message, testing::AllOf(HasSubstr(path), HasSubstr(c.reason))) << c.fault;
+        EXPECT_THAT(error.message(), testing::AllOf(HasSubstr(path), HasSubstr(c.reason))) << c.fault;
         EXPECT_EQ(contentsOf(path), c.bytes) << c.fault;
         EXPECT_EQ(test::filesBelow(folder.path()).size(), 1U) << c.fault;
     }
@@ -457,7 +458,7 @@ TEST(LoopFileWrite, AWavThatWouldOutgrowItsSizesIsRefused) {
     std::filesystem::resize_file(path, kFormSize + 8);  // a hole: it takes no room
     Error error;
     EXPECT_FALSE(tag(path, &error));
-    EXPECT_THAT(error.message, HasSubstr("more than its size can say"));
+    EXPECT_THAT(error.message(), HasSubstr("more than its size can say"));
     EXPECT_EQ(std::filesystem::file_size(path), kFormSize + 8);
 }
 
@@ -466,9 +467,9 @@ TEST(LoopFileWrite, NullDataAndOtherFilesFailWithAReason) {
     const std::string text = folder.write("a.wav", "no sound");
     Error error;
     EXPECT_FALSE(write(text, nullptr, &error));
-    EXPECT_THAT(error.message, HasSubstr("no file data"));
+    EXPECT_THAT(error.message(), HasSubstr("no file data"));
     EXPECT_FALSE(write(text, std::make_shared<LCFileData>(), &error));
-    EXPECT_THAT(error.message, HasSubstr("is no WAV"));
+    EXPECT_THAT(error.message(), HasSubstr("is no WAV"));
     EXPECT_FALSE(write(folder.path("missing.wav"), std::make_shared<LCFileData>(), &error));
     EXPECT_FALSE(write(folder.path("new.loopdata"), std::make_shared<LCFileData>(), &error));
     EXPECT_FALSE(write(folder.path(), std::make_shared<LCFileData>(), &error));
@@ -479,7 +480,7 @@ TEST(LoopFileWrite, NullDataAndOtherFilesFailWithAReason) {
     const auto data = std::make_shared<LCFileData>();
     data->setTaggingDictionary(kTagging);
     EXPECT_FALSE(write(removed, data, &error, asRead));
-    EXPECT_THAT(error.message, HasSubstr("changed by another program"));
+    EXPECT_THAT(error.message(), HasSubstr("changed by another program"));
     EXPECT_EQ(test::filesBelow(folder.path()).size(), 1U);
 }
 
@@ -500,7 +501,7 @@ TEST(LoopFileWrite, RealAndMalformedFilesAreTaggedWithoutLossOrLeftAlone) {
             Error error;
             if (!tag(path, &error)) {
                 ++refused;
-                EXPECT_THAT(error.message, testing::AllOf(HasSubstr(path), HasSubstr("byte"))) << file;
+                EXPECT_THAT(error.message(), testing::AllOf(HasSubstr(path), HasSubstr("byte"))) << file;
                 EXPECT_EQ(contentsOf(path), bytes) << file;
                 continue;
             }
@@ -509,7 +510,7 @@ TEST(LoopFileWrite, RealAndMalformedFilesAreTaggedWithoutLossOrLeftAlone) {
             const auto after = fingerprintOfFile(URL::fileURLWithPath(path));
             EXPECT_EQ(before->audioHash, after->audioHash) << file;
             EXPECT_TRUE(before->differences(*after).empty()) << file;
-            ASSERT_TRUE(untag(path, &error)) << error.message;
+            ASSERT_TRUE(untag(path, &error)) << error.message();
             const std::string back = contentsOf(path);
             // A missing last pad byte was added; a size that left it out is put right. Two lack others.
             const std::string whole = bytes + std::string(bytes.size() % 2, '\0');

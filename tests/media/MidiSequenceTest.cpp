@@ -151,7 +151,8 @@ TEST(MidiSequence, ReadsWhatADamagedTrackStillHolds) {
         EXPECT_EQ(sequence->problems().size(), 1U);
     }
     const auto stray = MidiSequence::parse(oneTrack({0, 60, 9}));
-    EXPECT_THAT(stray->problems(), testing::ElementsAre(testing::HasSubstr("byte 24: a data byte without")));
+    ASSERT_EQ(stray->problems().size(), 1U);
+    EXPECT_THAT(stray->problems()[0].message(), testing::StartsWith("byte 24: a data byte without"));
 
     Bytes truncated = oneTrack(whole + kEnd);
     truncated.resize(truncated.size() - 5);
@@ -172,21 +173,21 @@ TEST(MidiSequence, RefusesHeadersThatGiveTimeNoUnit) {
     for (const auto& c : cases) {
         Error error;
         EXPECT_FALSE(MidiSequence::parse(c.bytes, &error));
-        EXPECT_THAT(error.message, testing::HasSubstr(c.reason));
+        EXPECT_THAT(error.message(), testing::HasSubstr(c.reason));
     }
     Error error;
     EXPECT_FALSE(MidiSequence::parse(Bytes(MidiSequence::kLargestFile + 1), &error));
     EXPECT_EQ(error.code, kErrorTooLarge);
     EXPECT_FALSE(MidiSequence::read("/no/such file.mid", &error));
-    EXPECT_THAT(error.message, testing::HasSubstr("/no/such file.mid"));
+    EXPECT_THAT(error.message(), testing::HasSubstr("/no/such file.mid"));
 }
 
 TEST(MidiSequence, SurvivesManyTracksAndFalseCounts) {
     const Bytes music = track(Bytes{0, 0x90, 60, 9} + kEnd);
     const auto announced = MidiSequence::parse(header(1, 65535, 96) + music);
     EXPECT_EQ(announced->tracks().size(), 1U);
-    EXPECT_THAT(announced->problems(),
-                testing::ElementsAre(testing::HasSubstr("65535 tracks announced, 1 found")));
+    ASSERT_EQ(announced->problems().size(), 1U);
+    EXPECT_EQ(announced->problems()[0].message(), "byte 10: 65535 tracks announced, 1 found");
 
     Bytes many = header(1, 65535, 96);
     many.reserve(many.size() + 65536 * music.size());
@@ -225,7 +226,7 @@ TEST(MidiSequence, ReadsEveryFileOfTheCorpusOrSaysWhyNot) {
         const std::string name = std::filesystem::path(path).filename();
         if (!sequence) {
             refused.push_back(name);
-            EXPECT_THAT(error.message, testing::HasSubstr(path));
+            EXPECT_EQ(error.path, path);
         } else if (!sequence->problems().empty()) {
             damaged.push_back(name);
         }

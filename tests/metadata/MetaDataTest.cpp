@@ -87,11 +87,11 @@ TEST(MetaData, SaysWhenWhatIsStoredCannotBeRead) {
     const auto record = TGRTMetaData::init();
     Error error;
     EXPECT_EQ(record->prepareDictionaryForURL(URL::fileURLWithPath(folder.path("none")), &error).size(), 3U);
-    EXPECT_EQ(error.message, "");
+    EXPECT_EQ(error.message(), "");
     for (const char* broken : {"<plist><dict>", "<plist><dict/></plist>behind"}) {
         const URL url = URL::fileURLWithPath(folder.write("broken", broken));
         EXPECT_EQ(record->prepareDictionaryForURL(url, &error).size(), 3U);
-        EXPECT_THAT(error.message, testing::HasSubstr(url.path())) << broken;
+        EXPECT_THAT(error.message(), testing::HasSubstr(url.path())) << broken;
         error = {};
     }
 }

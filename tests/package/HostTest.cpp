@@ -63,7 +63,7 @@ TEST(NullPointers, AreNoTaxonomyToReadWith) {
     Error error;
     EXPECT_EQ(TGRTFileNode::nodeWithFileURL(url)->readMetaDataWithOptions(0, nullptr, &error), nullptr);
     EXPECT_EQ(error.code, kErrorInvalidArgument);
-    EXPECT_THAT(error.message, HasSubstr(url.path()));
+    EXPECT_THAT(error.message(), HasSubstr(url.path()));
     const auto searching = TGRTTaxonomySearching::initWithTaxonomy(nullptr);
     EXPECT_THAT(searching->findTagsForString("House"), IsEmpty());
     searching->setTaxonomy(nullptr);
@@ -100,7 +100,7 @@ TEST(NullPointers, WriteNothing) {
     const std::string before = bytesOf(url);
     Error error;
     EXPECT_FALSE(TGRTMetaDataWriterFactory::metaDataWriterForURL(url)->writeMetaData(nullptr, url, &error));
-    EXPECT_THAT(error.message, HasSubstr(url.path()));
+    EXPECT_THAT(error.message(), HasSubstr(url.path()));
     EXPECT_FALSE(TGRTMetaDataWriterFactory::metaDataWriterForURL(url)->writeMetaData(nullptr, url));
     EXPECT_EQ(bytesOf(url), before);
 }
@@ -204,7 +204,7 @@ void storeUnknownLabels(const std::vector<URL>& items) {
         }
         const auto writer = TGRTMetaDataWriterFactory::taggingWriterForURL(url);
         Error error;
-        ASSERT_TRUE(writer && writer->writeTaggings(taggings, url, &error)) << url.path() << error.message;
+        ASSERT_TRUE(writer && writer->writeTaggings(taggings, url, &error)) << url.path() << error.message();
     }
 }
 
@@ -235,7 +235,7 @@ void tagAgain(const std::vector<URL>& items, int times) {
         for (const URL& url : items) {
             Error error;
             const auto writer = TGRTMetaDataWriterFactory::taggingWriterForURL(url);
-            EXPECT_TRUE(writer && writer->writeTaggings({jazz}, url, &error)) << error.message;
+            EXPECT_TRUE(writer && writer->writeTaggings({jazz}, url, &error)) << error.message();
         }
     }
 }
@@ -250,24 +250,24 @@ void indexWithNames(const std::string& folder, const std::string& database) {
     options.worker.path = QVCT_INDEX_WORKER;
     options.services = QVCTAutoTaggingOptionFilenameKeywords;
     Error error;
-    EXPECT_TRUE(contentdb::indexLibrary(options, &error)) << error.message;
+    EXPECT_TRUE(contentdb::indexLibrary(options, &error)) << error.message();
     // And once more in threads of the host.
     options.describer = 2;
     const auto describer = [&options] {
         return std::make_unique<contentdb::ContentDescriber>(options.services);
     };
-    EXPECT_TRUE(contentdb::indexLibrary(options, describer, &error)) << error.message;
+    EXPECT_TRUE(contentdb::indexLibrary(options, describer, &error)) << error.message();
 }
 
 /// How many items it finds; opens the database anew, as a host does that was just started.
 std::size_t countFound(const std::string& path, const std::string& text) {
     Error error;
     const auto database = contentdb::ContentDatabase::open(path, &error);
-    EXPECT_TRUE(database) << error.message;
+    EXPECT_TRUE(database) << error.message();
     if (!database) return 0;
     const auto query = contentdb::parseQuery(text, *database->vocabulary(), nullptr);
     const auto found = database->search(*query, 1000, &error);
-    EXPECT_TRUE(found && database->facets(*query, &error)) << error.message;
+    EXPECT_TRUE(found && database->facets(*query, &error)) << error.message();
     return found ? found->size() : 0;
 }
 
@@ -304,7 +304,7 @@ TEST(Threads, IndexSearchAndWriteAtOnce) {
     indexWithNames(folder.path(), database);
     EXPECT_EQ(countFound(database, "genre:jazz"), taken.size());
     Error error;
-    EXPECT_TRUE(contentdb::ContentDatabase::open(database)->check(&error)) << error.message;
+    EXPECT_TRUE(contentdb::ContentDatabase::open(database)->check(&error)) << error.message();
 }
 
 TEST(Threads, FindTheSameAsOneByOneInTheSharedTaxonomy) {

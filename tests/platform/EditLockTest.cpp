@@ -100,8 +100,9 @@ TEST(EditLock, OfAnotherProcessIsWaitedForAndNamed) {
     ASSERT_EQ(::read(held[0], &byte, 1), 1);
     Error error;
     EXPECT_FALSE(EditLock::acquire(item, &error, milliseconds(20)));
-    EXPECT_THAT(error.message, testing::AllOf(HasSubstr(item), HasSubstr(fmt::format("process {} (", child)),
-                                              HasSubstr("waited 0.02 s")));
+    EXPECT_THAT(error.message(),
+                testing::AllOf(HasSubstr(item), HasSubstr(fmt::format("process {} (", child)),
+                               HasSubstr("waited 0.02 s")));
     EXPECT_TRUE(EditLock::acquire(item, &error)) << "it ends with the process";
     ::waitpid(child, nullptr, 0);
     ::close(held[0]);

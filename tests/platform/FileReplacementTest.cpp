@@ -61,7 +61,7 @@ TEST(FileReplacement, PutsPiecesTogetherAtAnyAlignment) {
                 expected += old.substr(range.offset, range.length);
             }
             Error error;
-            ASSERT_TRUE(replaceFileByPieces(path, pieces, {}, &error)) << error.message;
+            ASSERT_TRUE(replaceFileByPieces(path, pieces, {}, &error)) << error.message();
             EXPECT_TRUE(contentsOf(path) == expected) << head.size() << " " << ranges.size();
         }
     }
@@ -100,7 +100,7 @@ TEST(FileReplacement, FollowsSymbolicLinksEvenIntoAnotherFileSystem) {
         std::filesystem::remove(link);
         std::filesystem::create_symlink(target, link);
         Error error;
-        EXPECT_TRUE(replaceFile(link, "new", &error)) << error.message;
+        EXPECT_TRUE(replaceFile(link, "new", &error)) << error.message();
         EXPECT_TRUE(S_ISLNK(statusOf(link).st_mode));
         EXPECT_EQ(contentsOf(target), "new");
     }
@@ -123,7 +123,7 @@ TEST(FileReplacement, RefusesProtectedFilesAndWhatIsNoFile) {
     ::chmod(path.c_str(), 0444);
     Error error;
     EXPECT_FALSE(replaceFile(path, "new", &error));
-    EXPECT_THAT(error.message, testing::AllOf(HasSubstr(path), HasSubstr("protected from writing")));
+    EXPECT_THAT(error.message(), testing::AllOf(HasSubstr(path), HasSubstr("protected from writing")));
     EXPECT_EQ(contentsOf(path), "old");
     std::filesystem::create_directory(folder.path("folder"));
     EXPECT_FALSE(replaceFile(folder.path("folder"), "new", &error));
@@ -134,7 +134,7 @@ TEST(FileReplacement, RefusesProtectedFilesAndWhatIsNoFile) {
         FileReplacementOptions options;
         options.isDryRun = isDryRun;
         EXPECT_FALSE(replaceFileByPieces(folder.path("link"), {}, options, &error));
-        EXPECT_THAT(error.message, HasSubstr("link: is a link that leads nowhere"));
+        EXPECT_THAT(error.message(), HasSubstr("link: is a link that leads nowhere"));
     }
     EXPECT_EQ(filesIn(folder), 1U);
 }
@@ -160,7 +160,7 @@ TEST(FileReplacement, AFolderThatForbidsItIsAnErrorBeforehandAndLosesNothing) {
             const bool replaced = replaceFileByPieces(path, {&whole, 1}, options, &error);
             ASSERT_EQ(isRoot ? ::seteuid(0) : 0, 0);
             EXPECT_FALSE(replaced) << isDryRun;
-            EXPECT_THAT(error.message, testing::AllOf(HasSubstr(path), HasSubstr(each.reason)));
+            EXPECT_THAT(error.message(), testing::AllOf(HasSubstr(path), HasSubstr(each.reason)));
         }
         ::chmod(folder.path().c_str(), 0755);
         EXPECT_EQ(contentsOf(path), "old");
@@ -182,7 +182,7 @@ TEST(FileReplacement, AFullDiskLosesNothingAndLeavesNothingBehind) {
     EXPECT_EQ(filesIn(folder), 1U);
     ::umount(folder.path().c_str());
     EXPECT_FALSE(replaced || replacedByRange);
-    EXPECT_THAT(error.message,
+    EXPECT_THAT(error.message(),
                 testing::AllOf(HasSubstr(path), HasSubstr("No space left"), HasSubstr("at byte 0")));
 }
 
@@ -200,7 +200,7 @@ TEST(FileReplacement, ALimitOnSizesIsAnErrorToo) {
     ::setrlimit(RLIMIT_FSIZE, &former);
     std::signal(SIGXFSZ, formerHandler);
     EXPECT_FALSE(replaced);
-    EXPECT_THAT(error.message, HasSubstr("File too large"));
+    EXPECT_THAT(error.message(), HasSubstr("File too large"));
     EXPECT_TRUE(contentsOf(path) == test::noise(30000));
     EXPECT_EQ(filesIn(folder), 1U);
 }
@@ -246,7 +246,7 @@ TEST(FileReplacement, WhatAnotherProgramSavedMeanwhileStays) {
         for (int round = 0; round < 2; ++round) {  // the second time the state is an old one from the start
             Error error;
             EXPECT_FALSE(replaceFileByPieces(path, {&whole, 1}, options, &error));
-            EXPECT_THAT(error.message, HasSubstr("changed by another program"));
+            EXPECT_THAT(error.message(), HasSubstr("changed by another program"));
             EXPECT_EQ(contentsOf(path), each.contents);
             EXPECT_EQ(filesIn(folder), each.contents == "unreadable" ? 0U : 1U);
         }

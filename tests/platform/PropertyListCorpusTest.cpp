@@ -109,11 +109,11 @@ TEST(PropertyListCorpus, ValidListsSurviveBothEncodings) {
     for (const std::string& file : files) {
         Error error;
         const auto original = readPropertyListFile(file, &error);
-        EXPECT_EQ(original.has_value(), !isUnsoundAllTheSame(file)) << error.message;
+        EXPECT_EQ(original.has_value(), !isUnsoundAllTheSame(file)) << error.message();
         if (!original) continue;
         for (const auto format : {PropertyListFormat::xml, PropertyListFormat::binary}) {
             const auto again = parsePropertyList(serializePropertyList(*original, format), &error);
-            ASSERT_TRUE(again) << file << error.message;
+            ASSERT_TRUE(again) << file << error.message();
             EXPECT_EQ(*again, *original) << file;
             EXPECT_EQ(keysInOrder(*again), keysInOrder(*original)) << file;
         }

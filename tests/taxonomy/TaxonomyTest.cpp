@@ -115,7 +115,7 @@ TEST(Taxonomy, SurvivesBeingWrittenAndReadBack) {
     const URL url = URL::fileURLWithPath(folder.path("taxonomy.plist"));
     const auto original = TGRTTaxonomy::defaultTaxonomy();
     Error error;
-    ASSERT_TRUE(original->writeToURL(url, &error)) << error.message;
+    ASSERT_TRUE(original->writeToURL(url, &error)) << error.message();
     const auto read = TGRTTaxonomy::taxonomyWithContentsOfURL(url, &error);
     EXPECT_EQ(read->categories(), original->categories());
     const auto originalTags = original->allTags();
@@ -163,13 +163,13 @@ TEST(Taxonomy, OfAThousandLevelsIsWrittenAndReadWithASmallStack) {
         // The property list has three dictionaries more: its own, of the categories, of the category.
         constexpr int levels = kDeepestPropertyList - 3;
         Error error;
-        EXPECT_TRUE(deepTaxonomy(levels)->writeToURL(url, &error)) << error.message;
+        EXPECT_TRUE(deepTaxonomy(levels)->writeToURL(url, &error)) << error.message();
         const auto read = TGRTTaxonomy::taxonomyWithContentsOfURL(url, &error);
         const auto lowest = read->findTagForLabel(std::to_string(levels - 1));
-        ASSERT_NE(lowest, nullptr) << error.message;
+        ASSERT_NE(lowest, nullptr) << error.message();
         EXPECT_EQ(lowest->ancestors().size(), std::size_t{levels} - 1);
         EXPECT_FALSE(deepTaxonomy(levels + 1)->writeToURL(url, &error));
-        EXPECT_THAT(error.message,
+        EXPECT_THAT(error.message(),
                     testing::HasSubstr("deep.plist: no property list can hold more than 1024 levels"));
         EXPECT_EQ(TGRTTaxonomy::taxonomyWithContentsOfURL(url)->allTags().size(), std::size_t{levels});
     });
@@ -180,11 +180,11 @@ TEST(Taxonomy, SaysWhatCouldNotBeRead) {
     const auto empty =
         TGRTTaxonomy::taxonomyWithContentsOfURL(URL::fileURLWithPath("/no/such.plist"), &error);
     EXPECT_TRUE(empty->categories().empty());
-    EXPECT_THAT(error.message, testing::HasSubstr("/no/such.plist"));
+    EXPECT_THAT(error.message(), testing::HasSubstr("/no/such.plist"));
     const std::string noList = "<plist><string>x</string></plist>";
     Error none;
     EXPECT_EQ(TGRTTaxonomy::taxonomyWithData(noList, &none), nullptr);
-    EXPECT_EQ(none.message, "");
+    EXPECT_EQ(none.message(), "");
 }
 
 TEST(Taxonomy, SharesCachedInstancesUntilTheyAreEvicted) {

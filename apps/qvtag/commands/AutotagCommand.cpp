@@ -42,7 +42,9 @@ Settings settingsIn(const std::string& file, std::string_view what, Read read, T
     if (file.empty()) return std::nullopt;
     Error error;
     Settings settings = read(file, &error);
-    if (!settings) context.itemFailed(fmt::format("{} (using the built-in {})", error.message, what));
+    if (settings) return settings;
+    error.reason += fmt::format(" (using the built-in {})", what);
+    context.itemFailed(error);
     return settings;
 }
 

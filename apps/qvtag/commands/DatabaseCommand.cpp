@@ -19,10 +19,10 @@ struct Options {
 
 void merge(const Options& options, ToolContext& context) {
     Error error;
-    if (!mergeDatabases(options.databases, options.target, &error)) return context.itemFailed(error.message);
+    if (!mergeDatabases(options.databases, options.target, &error)) return context.itemFailed(error);
     const auto merged = ContentDatabase::open(options.target, &error);
     const auto totals = merged ? merged->totals(&error) : std::nullopt;
-    if (!totals) return context.itemFailed(error.message);
+    if (!totals) return context.itemFailed(error);
     if (context.format == Format::table)
         return print("{} items, {} of them failed\n", totals->items, totals->failures);
     printJson(Json{{"database", options.target}, {"items", totals->items}, {"failed", totals->failures}},
@@ -37,13 +37,13 @@ void check(const Options& options, ToolContext& context) {
         const bool isIntact = database && database->check(&error);
         const auto totals = isIntact ? database->totals(&error) : std::nullopt;
         if (!totals) {
-            context.itemFailed(error.message);
-            json.push_back({{"database", path}, {"intact", false}, {"reason", error.message}});
+            context.itemFailed(error);
+            json.push_back({{"database", path}, {"intact", false}, {"reason", error.message()}});
             continue;
         }
         Json failures = Json::array();
         database->forEachFailure([&](const IndexedItem& item) {
-            if (context.format == Format::table) print("{}\n", messageOfFailure(item));
+            if (context.format == Format::table) print("{}\n", errorOfFailure(item).message());
             failures.push_back({{"path", item.path}, {"reason", item.failure}});
             return true;
         });

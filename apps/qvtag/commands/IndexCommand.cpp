@@ -77,7 +77,7 @@ void run(Options& options, ToolContext& context) {
     };
     index.failed = [&](const Error& error) {
         bar.hide();
-        context.itemFailed(error.message);
+        context.itemFailed(error);
     };
     index.note = [&](const std::string& message) {
         bar.hide();
@@ -90,7 +90,7 @@ void run(Options& options, ToolContext& context) {
     Error error;
     const auto progress = indexLibrary(index, &error);
     bar.hide();
-    if (!progress) return context.itemFailed(error.message);
+    if (!progress) return context.itemFailed(error);
     context.notePassedOver(passedOver);
     printRun(jsonOfRun(index, *progress, bar.seconds()), *progress, context);
     if (wasInterrupted()) context.itemFailed("interrupted; the next run goes on from here");

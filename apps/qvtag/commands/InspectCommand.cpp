@@ -44,8 +44,8 @@ void run(const Options& options, ToolContext& context) {
     context.forEachContentItem(options.paths, options.links, [&](const URL& url) {
         Error error;
         const auto parts = partsOfItem(url, &error);
-        if (!error.message.empty()) context.itemFailed(error.message);
-        if (parts.empty() && !error.message.empty()) return;
+        if (error.isSet()) context.itemFailed(error);
+        if (parts.empty() && error.isSet()) return;
         if (context.format == Format::table) {
             print("{}\n", colored(context.terminal(), Color::strong, printable(url.path())));
             print("{}\n", colored(context.terminal(), Color::faint, "    offset       size  what"));

@@ -24,7 +24,8 @@ void printTable(const CountedSet& found) {
 
 void run(const Options& options, ToolContext& context) {
     if (!isValidUtf8(options.text)) {
-        return context.itemFailed(fmt::format("{}: the text is not UTF-8", printable(options.text)));
+        return context.itemFailed(
+            errorOf(kErrorInvalidArgument, "the text is not UTF-8", {.part = options.text}));
     }
     const auto extractor = QVCTKeywordExtractor::defaultKeywordExtractor();
     const CountedSet found = extractor->extractKeywordsFromString(options.text);

@@ -43,7 +43,7 @@ std::vector<Vocabulary> vocabularies(const Options& options, ToolContext& contex
         const auto url = vocabulary.name == "loop"
                              ? TGRTLegacyTaxonomyMapping::defaultLegacyLoopTaxonomyMappingURL()
                              : TGRTLegacyTaxonomyMapping::defaultLegacyVorthalTaxonomyMappingURL();
-        context.itemFailed(fmt::format("{}: not a mapping table", url ? printable(url->path()) : "built-in"));
+        context.itemFailed(errorOf(kErrorMalformed, "not a mapping table", {url ? url->path() : "built-in"}));
         return true;
     });
     return chosen;

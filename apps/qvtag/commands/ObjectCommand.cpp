@@ -79,8 +79,8 @@ void run(const Options& options, ToolContext& context) {
     context.forEachContentItem(options.paths, options.links, [&](const URL& url) {
         Error error;
         const auto object = objectOf(url, options.bits, &error);
-        if (!error.message.empty()) {
-            context.itemFailed(error.message);
+        if (error.isSet()) {
+            context.itemFailed(error);
         } else if (!object) {
             ++withoutRecord;
         }

@@ -26,8 +26,8 @@ struct Options {
 std::shared_ptr<TGRTMetaData> readRecord(const URL& url, std::uint64_t bits, ToolContext& context) {
     Error error;
     auto record = TGRTFileNode::nodeWithFileURL(url)->readMetaDataWithOptions(bits, &error);
-    if (!error.message.empty()) {
-        context.itemFailed(error.message);
+    if (error.isSet()) {
+        context.itemFailed(error);
         return nullptr;
     }
     if (record) return record;

@@ -95,24 +95,25 @@ bool beginsLikeSvg(const std::string& path) {
     return start.starts_with("<svg") || start == "<?xml";
 }
 
-/// Why a picture must not be put there, since something else would be lost; empty when it may.
-std::string problemOfPlot(const std::string& target, const std::vector<std::string>& inputs) {
+/// Why a picture must not be put there, since something else would be lost; not set when it may.
+Error problemOfPlot(const std::string& target, const std::vector<std::string>& inputs) {
     namespace fs = std::filesystem;
     std::error_code ignored;
     if (!fs::exists(target, ignored)) return {};
-    const std::string place = printable(target) + ": ";
     for (const std::string& input : inputs) {
-        if (fs::equivalent(target, input, ignored)) return place + "is to be read, and not to be drawn over";
+        if (fs::equivalent(target, input, ignored))
+            return errorOf(kErrorInvalidArgument, "is to be read, and not to be drawn over", {target});
     }
     const bool isSvg =
         URL::fileURLWithPath(target).lowercasePathExtension() == "svg" && beginsLikeSvg(target);
-    return isSvg ? std::string{} : place + "is no SVG, and is not replaced by one";
+    return isSvg ? Error{}
+                 : errorOf(kErrorInvalidArgument, "is no SVG, and is not replaced by one", {target});
 }
 
 void writePlot(const Options& options, const RhythmResult& result, ToolContext& context) {
     if (options.plotFile.empty()) return;
     Error error;
-    if (!replaceFile(options.plotFile, result.plot.svg(), &error)) context.itemFailed(error.message);
+    if (!replaceFile(options.plotFile, result.plot.svg(), &error)) context.itemFailed(error);
 }
 
 void run(Options options, ToolContext& context) {
@@ -123,8 +124,8 @@ void run(Options options, ToolContext& context) {
     if (!options.plotFile.empty() && options.paths.size() != 1) {
         return context.usageFailed("--plot draws one file; name only one");
     }
-    const std::string problem = problemOfPlot(options.plotFile, options.paths);
-    if (!problem.empty()) return context.usageFailed(problem);
+    const Error problem = problemOfPlot(options.plotFile, options.paths);
+    if (problem.isSet()) return context.usageFailed(problem.message());
     Json items = Json::array();
     for (const std::string& path : options.paths) {
         if (isOutputLost()) break;
@@ -132,11 +133,13 @@ void run(Options options, ToolContext& context) {
         ItemFile file(URL::fileURLWithPath(path));
         const auto result = measureRhythm(file, options.request, &error);
         if (!result) {
-            context.itemFailed(error.message);
+            context.itemFailed(error);
             continue;
         }
-        for (const std::string& damage : result->problems)
-            context.note(fmt::format("{}: {}", printable(path), damage));
+        for (Error damage : result->problems) {
+            failIn(path, &damage);
+            context.note(damage.message());
+        }
         writePlot(options, *result, context);
         if (context.format == Format::table) {
             printRow(path, *result);

@@ -62,7 +62,7 @@ Json jsonOf(const RuleOutcome& outcome) {
 /// The outcomes of the rules that gave a tag.
 std::vector<RuleOutcome> matchesOf(const Service& service, const URL& url, ToolContext& context) {
     const auto document = documentOf(url);
-    if (!document) context.note(fmt::format("{}: has no XML description", printable(url.path())));
+    if (!document) context.note(errorOf(kErrorUnreadable, "has no XML description", {url.path()}).message());
     std::vector<RuleOutcome> outcomes = service->outcomesForXMLDocument(document);
     std::erase_if(outcomes, [](const RuleOutcome& outcome) { return outcome.tags.empty(); });
     return outcomes;
@@ -87,7 +87,7 @@ Service serviceWith(const std::string& rulesFile, ToolContext& context) {
     Error error;
     auto rules = readRules(rulesFile, &error);
     if (rules) return QVCTXMLRulesTaggingService::initWithRules(std::move(rules));
-    context.itemFailed(error.message);
+    context.itemFailed(error);
     return nullptr;
 }
 
@@ -113,8 +113,8 @@ std::vector<Tally> emptyTallies(const Service& service, const std::string& rules
     std::vector<Tally> tallies;
     for (RuleDescription& rule : service->rules()) {
         if (!rule.problem.empty()) {
-            context.itemFailed(
-                fmt::format("{}: rule {}: {}", printable(rulesFile), rule.number, rule.problem));
+            context.itemFailed(errorOf(kErrorMalformed, rule.problem,
+                                       {.path = rulesFile, .part = fmt::format("rule {}", rule.number)}));
         }
         tallies.push_back({std::move(rule)});
     }

@@ -130,10 +130,12 @@ ItemRow rowOf(const IndexedItem& item) {
 std::unique_ptr<ContentDatabase> opened(const Options& options, ToolContext& context) {
     Error error;
     auto database = ContentDatabase::open(options.database, &error);
-    if (!database) context.itemFailed(error.message);
+    if (!database) context.itemFailed(error);
     if (database && database->isBeingIndexed())
-        context.note(fmt::format("{}: a run of `index` is going on; this is what it has stored so far",
-                                 printable(options.database)));
+        context.note(errorOf(kErrorUnreadable,
+                             "a run of `index` is going on; this is what it has stored so far",
+                             {options.database})
+                         .message());
     return database;
 }
 
@@ -142,7 +144,7 @@ std::optional<Query> queryOf(const Options& options, ContentDatabase& database, 
     Error error;
     const auto vocabulary = database.vocabulary(&error);
     if (!vocabulary) {
-        context.itemFailed(error.message);
+        context.itemFailed(error);
         return std::nullopt;
     }
     const std::string text = join(options.words, " ");
@@ -163,11 +165,11 @@ void searchItems(const Options& options, ToolContext& context) {
     if (!query) return;
     Error error;
     const auto found = database->search(*query, options.limit, &error);
-    if (!found) return context.itemFailed(error.message);
+    if (!found) return context.itemFailed(error);
     if (context.format != Format::table) {
         Json json = Json::array();
         for (const Found& one : *found) json.push_back(jsonOf(*database, one.id, one.item, &error));
-        if (!error.message.empty()) return context.itemFailed(error.message);
+        if (error.isSet()) return context.itemFailed(error);
         return printJson(json, context.format);
     }
     std::vector<ItemRow> rows;
@@ -175,7 +177,7 @@ void searchItems(const Options& options, ToolContext& context) {
     printItemTable(rows, context.terminal());
     const auto count = rows.size() < options.limit ? std::optional(static_cast<std::int64_t>(rows.size()))
                                                    : database->count(*query, &error);
-    if (!count) return context.itemFailed(error.message);
+    if (!count) return context.itemFailed(error);
     context.note(fmt::format("{} found, {} shown", *count, rows.size()));
 }
 
@@ -185,7 +187,7 @@ void countTags(const Options& options, ToolContext& context) {
     if (!query) return;
     Error error;
     const auto found = database->facets(*query, &error);
-    if (!found) return context.itemFailed(error.message);
+    if (!found) return context.itemFailed(error);
     if (context.format != Format::table) {
         Json json = Json::array();
         for (const Facet& facet : *found)
@@ -205,14 +207,14 @@ void findSimilar(const Options& options, ToolContext& context) {
     if (!database) return;
     Error error;
     const auto found = database->similar(URL::fileURLWithPath(options.path).path(), options.limit, &error);
-    if (!found) return context.itemFailed(error.message);
+    if (!found) return context.itemFailed(error);
     if (context.format != Format::table) {
         Json json = Json::array();
         for (const Similar& one : *found) {
             json.push_back(jsonOf(*database, one.id, one.item, &error));
             json.back()["similarity"] = one.similarity;
         }
-        if (!error.message.empty()) return context.itemFailed(error.message);
+        if (error.isSet()) return context.itemFailed(error);
         return printJson(json, context.format);
     }
     std::vector<ItemRow> rows;

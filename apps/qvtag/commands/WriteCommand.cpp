@@ -50,17 +50,18 @@ struct Change {
 };
 
 /// Why nothing can be written to an item of a kind that is none of those with writers.
-std::string reasonNotWritten(const URL& url) {
-    const std::string path = printable(url.path());
+Error reasonNotWritten(const URL& url) {
     if (TGRTBinaryFileMetaDataReader::supportsFileExtension(url.pathExtension()))
-        return path + ": data files are never written";
+        return errorOf(kErrorUnwritable, "data files are never written", {url.path()});
     Error error;
     TGRTFileNode::nodeWithFileURL(url)->readMetaDataWithOptions(0, &error);
-    if (!error.message.empty()) return error.message;
+    if (error.isSet()) return error;
     const URL folder = url.URLByDeletingLastPathComponent();
-    return TGRTPatchTypeValidator().isValidContentTypeAtFileURL(folder)
-               ? fmt::format("{}: belongs to the patch it lies in, {}", path, printable(folder.path()))
-               : path + ": cannot be written";
+    const std::string reason =
+        TGRTPatchTypeValidator().isValidContentTypeAtFileURL(folder)
+            ? fmt::format("belongs to the patch it lies in, {}", printable(folder.path()))
+            : "cannot be written";
+    return errorOf(kErrorUnwritable, reason, {url.path()});
 }
 
 std::optional<Change> changeOfItem(const URL& url, const TaggingEdit& edit, const Options& options,
@@ -73,8 +74,8 @@ std::optional<Change> changeOfItem(const URL& url, const TaggingEdit& edit, cons
         return std::nullopt;
     }
     change.record = node->readMetaDataWithOptions(0, &error);
-    if (!error.message.empty()) {
-        context.itemFailed(error.message);
+    if (error.isSet()) {
+        context.itemFailed(error);
         return std::nullopt;
     }
     if (!change.record) change.record = TGRTMetaData::init();
@@ -127,7 +128,7 @@ bool carryOut(Change& change, const Options& options, ToolContext& context, Erro
     if (!isDone || !change.verification) return isDone;
     change.faults = change.verification->faultsAfterWriting(*change.record);
     for (const std::string& fault : change.faults)
-        context.itemFailed(fmt::format("{}: {}", printable(change.url.path()), fault));
+        context.itemFailed(errorOf(kErrorUnwritable, fault, {change.url.path()}));
     return true;
 }
 
@@ -147,8 +148,9 @@ std::optional<Change> editItem(const URL& url, const TaggingEdit& edit, const Op
     const auto turn = EditLock::acquire(url.path(), &error);
     const std::string record = TGRTFileNode::nodeWithFileURL(url)->recordURL().path();
     if (options.links != LinksOutside::all && leadsAway(record, url)) {
-        context.itemFailed(fmt::format("{}: leads out of its folder, and is written to only with --follow",
-                                       printable(record)));
+        context.itemFailed(errorOf(kErrorInvalidArgument,
+                                   "leads out of its folder, and is written to only with --follow",
+                                   {record}));
         return std::nullopt;
     }
     constexpr int kAttempts = 10;
@@ -161,7 +163,8 @@ std::optional<Change> editItem(const URL& url, const TaggingEdit& edit, const Op
         if (carryOut(*change, options, context, &error)) return change;
         if (FileStamp::ofFile(record) == former) break;
     }
-    context.itemFailed(error.message.empty() ? printable(url.path()) + ": cannot be written" : error.message);
+    if (!error.isSet()) fail(&error, kErrorUnwritable, "cannot be written", {url.path()});
+    context.itemFailed(error);
     return std::nullopt;
 }
 

@@ -75,7 +75,7 @@ void addStoredList(const URL& list, Parts& parts) {
     Error error;
     const auto value = readPropertyListFile(list.path(), &error);
     InspectedPart part = value ? entryPart(list.lastPathComponent(), *value)
-                               : InspectedPart{list.lastPathComponent(), {}, {}, {}, error.message, {}};
+                               : InspectedPart{list.lastPathComponent(), {}, {}, {}, error.message(), {}};
     part.meaning = value ? "record, " + part.meaning : "record";
     parts.push_back(std::move(part));
 }
@@ -121,7 +121,7 @@ template <typename Reader>
 Parts bundleParts(const URL& url, Error* error) {
     Parts parts;
     if (!isDirectory(url.path())) {
-        fail(error, kErrorUnreadable, fmt::format("{}: is no bundle", printable(url.path())));
+        fail(error, kErrorUnreadable, "is no bundle", {url.path()});
         return parts;
     }
     const auto reader = Reader::initWithTaxonomy(TGRTTaxonomy::init());
@@ -134,10 +134,9 @@ Parts presetParts(const URL& url, Error* error) {
     Parts parts;
     const auto bytes = readFile(url.path(), error);
     if (!bytes) return parts;
-    Error reason;
-    const auto preset = PresetText::parse(std::string(bytes->begin(), bytes->end()), &reason);
+    const auto preset = PresetText::parse(std::string(bytes->begin(), bytes->end()), error);
     if (!preset) {
-        fail(error, kErrorMalformed, fmt::format("{}: {}", printable(url.path()), reason.message));
+        failIn(url.path(), error);
         return parts;
     }
     for (const PresetText::Section& section : preset->sections()) {
@@ -158,10 +157,9 @@ Parts dataParts(const URL& url, Error* error) {
     Parts parts;
     const auto bytes = readFile(url.path(), error);
     if (!bytes) return parts;
-    Error reason;
-    const auto found = findEmbeddedPropertyList(*bytes, &reason);
+    const auto found = findEmbeddedPropertyList(*bytes, error);
     if (!found) {
-        fail(error, kErrorNoPropertyList, fmt::format("{}: {}", printable(url.path()), reason.message));
+        failIn(url.path(), error);
         return parts;
     }
     InspectedPart part = entryPart("bplist00", found->value);
@@ -185,8 +183,8 @@ Parts midiParts(const URL& url, Error* error) {
                                  {},
                                  {}});
     }
-    for (const std::string& problem : sequence->problems())
-        file.children.push_back({"", {}, {}, "", problem, {}});
+    for (const Error& problem : sequence->problems())
+        file.children.push_back({"", {}, {}, "", problem.message(), {}});
     return {std::move(file)};
 }
 

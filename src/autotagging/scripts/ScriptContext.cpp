@@ -391,11 +391,14 @@ bool ScriptContext::checkSyntax(std::string_view script, Error* error) {
     JSValueRef exception = nullptr;
     if (engine().JSCheckScriptSyntax(reference, prepared(script).text.get(), nullptr, 1, &exception))
         return true;
-    const JSValueRef line =
-        property(reference, engine().JSValueToObject(reference, exception, nullptr), "line", nullptr);
-    return fail(error, kErrorMalformed,
-                fmt::format("script, line {}: {}", textOf(reference, line, nullptr),
-                            withReason(textOf(reference, exception, nullptr), script)));
+    const double line = engine().JSValueToNumber(
+        reference,
+        property(reference, engine().JSValueToObject(reference, exception, nullptr), "line", nullptr),
+        nullptr);
+    ErrorPlace place{.part = "script"};
+    if (line >= 1) place.line = static_cast<std::uint64_t>(line);
+    return fail(error, kErrorMalformed, withReason(textOf(reference, exception, nullptr), script),
+                std::move(place));
 }
 
 }  // namespace qvct

@@ -15,7 +15,7 @@ struct Loaded {
     Loaded() {
         const auto library = SharedLibrary::load(QVCT_SCRIPT_ENGINE_LIBRARY, &error);
         if (library) isComplete = find(*library);
-        if (!isComplete) log("Scripts do not run: " + error.message);
+        if (!isComplete) log("Scripts do not run: " + error.message());
     }
 
     bool find(const SharedLibrary& library) {

@@ -50,7 +50,7 @@ std::string resolvedText(const std::string& rule, Error* error = nullptr) {
     if (error != nullptr) {
         *error = std::move(reason);
     } else {
-        log(reason.message);
+        log(reason.message());
     }
     return {};
 }
@@ -164,15 +164,18 @@ std::optional<std::string> QVCTXMLRulesTaggingService::problemOf(const Rule& rul
     if (rule.text.empty()) return "there is no text under \"rule\"";
     Error error;
     const std::string text = resolvedText(rule.text, &error);
-    if (text.empty()) return error.message.empty() ? "the rule's file is empty" : error.message;
+    if (text.empty()) return error.isSet() ? error.message() : "the rule's file is empty";
+    const std::string path = text == rule.text ? std::string() : pathOfRule(rule.text);
+    const auto problem = [&](bool isSound) {
+        failIn(path, &error);
+        return isSound ? std::nullopt : std::optional(error.message());
+    };
     if (rule.type == kXPathType) {
         if (!rule.tag) return "there is no text under \"tag\"";
         if (text == rule.text && text.starts_with(kFileScheme)) return pathOfRule(text) + ": no such file";
-        return XPathExpression::cached(text, &error) ? std::nullopt : std::optional(error.message);
+        return problem(XPathExpression::cached(text, &error) != nullptr);
     }
-    if (rule.type == kScriptType) {
-        return ScriptContext::checkSyntax(text, &error) ? std::nullopt : std::optional(error.message);
-    }
+    if (rule.type == kScriptType) return problem(ScriptContext::checkSyntax(text, &error));
     return fmt::format("unknown type \"{}\" (XPath or JavaScript)", printable(rule.type));
 }
 

@@ -30,8 +30,14 @@ bool isPlain(const ParsedXml& parsed, std::string_view text) {
 
 ParsedXml parse(std::string_view text, std::string_view name) {
     ParsedXml parsed = parseXml(text);
-    for (const std::string& fault : parsed.faults) log(fmt::format("{}, {}", printable(name), fault));
-    if (parsed.moreFaults > 0) log(fmt::format("{}: {} more faults", printable(name), parsed.moreFaults));
+    for (Error& fault : parsed.faults) {
+        failIn(name, &fault);
+        log(fault.message());
+    }
+    if (parsed.moreFaults > 0) {
+        const std::string more = fmt::format("{} more faults", parsed.moreFaults);
+        log(errorOf(kErrorMalformed, more, {std::string(name)}).message());
+    }
     return parsed;
 }
 
@@ -93,7 +99,7 @@ std::shared_ptr<QVCTXMLDocument> QVCTXMLDocument::initWithContentsOfURL(const UR
     if (url.pathExtension() == "zxml") return initWithContentsOfQVZippedXMLURL(url);
     Error error;
     const auto bytes = readFile(url.path(), &error);
-    if (!bytes) log(error.message);
+    if (!bytes) log(error.message());
     return initWithXMLData(bytes ? textOf(*bytes) : std::string_view{}, url.path());
 }
 
@@ -102,9 +108,9 @@ std::shared_ptr<QVCTXMLDocument> QVCTXMLDocument::initWithContentsOfQVZippedXMLU
     std::optional<std::vector<std::uint8_t>> xml;
     if (const auto bytes = readFile(url.path(), &error)) {
         xml = decompress(*bytes, &error);
-        if (!xml) error.message = fmt::format("{}: {}", printable(url.path()), error.message);
+        if (!xml) failIn(url.path(), &error);
     }
-    if (!xml) log(error.message);
+    if (!xml) log(error.message());
     return initWithXMLData(xml ? textOf(*xml) : std::string_view{}, url.path());
 }
 
@@ -175,7 +181,7 @@ std::optional<std::string> QVCTXMLDocument::JSONStringWithData(std::string_view 
     QVCTXMLParser parser(QVCTXMLParser::largestJson(data.size()));
     auto dictionary = parser.objectWithData(data);
     if (dictionary) return jsonText(PropertyList(std::move(*dictionary)), JsonStyle::pretty);
-    if (parser.isTooLarge()) log(parser.error().message);
+    if (parser.isTooLarge()) log(parser.error().message());
     return std::nullopt;
 }
 

@@ -24,6 +24,11 @@ QVCTXMLParser& parserOf(void* context) {
     return *static_cast<QVCTXMLParser*>(static_cast<xmlParserCtxt*>(context)->_private);
 }
 
+Error errorAt(int line, ErrorCode code, std::string reason) {
+    return errorOf(code, std::move(reason),
+                   {.part = "XML", .line = static_cast<std::uint64_t>(std::max(line, 0))});
+}
+
 void stopIfTooLarge(void* context) {
     if (parserOf(context).isTooLarge()) xmlStopParser(static_cast<xmlParserCtxt*>(context));
 }
@@ -54,9 +59,8 @@ void declareEntity(void* context, const xmlChar* name, int type, const xmlChar* 
     if (attributeTooMany(viewOf(content))) {
         auto* stopped = static_cast<xmlParserCtxt*>(context);
         parserOf(context).parseErrorOccurred(
-            {std::string(QVCTErrorDomain), kErrorTooLarge,
-             fmt::format("XML, line {}: an entity with more than {} attributes",
-                         xmlSAX2GetLineNumber(stopped), kMostXmlAttributes)});
+            errorAt(xmlSAX2GetLineNumber(stopped), kErrorTooLarge,
+                    fmt::format("an entity with more than {} attributes", kMostXmlAttributes)));
         xmlStopParser(stopped);
     } else if (type == XML_INTERNAL_GENERAL_ENTITY) {
         xmlSAX2EntityDecl(context, name, type, publicId, systemId, content);
@@ -109,11 +113,10 @@ QVCTXMLParser::Attributes attributesOf(const xmlNode& element) {
     return attributes;
 }
 
-Error errorOf(const xmlParserCtxt& context) {
+Error lastError(const xmlParserCtxt& context) {
     const xmlError& last = context.lastError;
     const std::string_view reason = last.message == nullptr ? "not well-formed" : last.message;
-    return {std::string(QVCTErrorDomain), kErrorMalformed,
-            fmt::format("XML, line {}: {}", last.line, trimBlanksAndLineBreaks(reason))};
+    return errorAt(last.line, kErrorMalformed, std::string(trimBlanksAndLineBreaks(reason)));
 }
 
 }  // namespace
@@ -163,7 +166,7 @@ std::optional<PropertyList::Dictionary> QVCTXMLParser::dictionaryForXMLData(std:
 
 std::optional<PropertyList::Dictionary> QVCTXMLParser::objectWithData(std::string_view data) {
     if (data.empty() || data.size() > static_cast<std::size_t>(std::numeric_limits<int>::max())) {
-        parseErrorOccurred({std::string(QVCTErrorDomain), kErrorMalformed, "XML: no text, or far too much"});
+        parseErrorOccurred(errorOf(kErrorMalformed, "no text, or far too much", {.part = "XML"}));
         return std::nullopt;
     }
     Error error;
@@ -180,13 +183,12 @@ std::optional<PropertyList::Dictionary> QVCTXMLParser::objectWithData(std::strin
     xmlParseDocument(context.get());
     if (isTooLarge_) {
         parseErrorOccurred(
-            {std::string(QVCTErrorDomain), kErrorTooLarge,
-             fmt::format("XML, line {}: its JSON grows too large", xmlSAX2GetLineNumber(context.get()))});
+            errorAt(xmlSAX2GetLineNumber(context.get()), kErrorTooLarge, "its JSON grows too large"));
         return std::nullopt;
     }
     if (error_.code != 0) return std::nullopt;  // stopped, which the library takes for well-formed
     if (context->wellFormed == 0) {
-        parseErrorOccurred(errorOf(*context));
+        parseErrorOccurred(lastError(*context));
         return std::nullopt;
     }
     return takeObject();

@@ -76,8 +76,8 @@ Error syntaxError(std::string_view text, std::size_t offset, std::string_view re
     const std::string_view before = text.substr(0, offset);
     const auto character =
         1 + std::count_if(before.begin(), before.end(), [](char c) { return (c & 0xC0) != 0x80; });
-    return {std::string(QVCTErrorDomain), kErrorMalformed,
-            fmt::format("XPath \"{}\", character {}: {}", shortened(text), character, reason)};
+    return errorOf(kErrorMalformed, std::string(reason),
+                   {.part = fmt::format("XPath \"{}\", character {}", shortened(text), character)});
 }
 
 void keepSyntaxError(void* target, xmlErrorPtr raised) {
@@ -129,8 +129,8 @@ std::size_t XPathScope::workOfStep(const XPathCost& cost) {
 
 std::shared_ptr<const XPathExpression> XPathExpression::compile(std::string_view text, Error* error) {
     if (text.empty() || text.size() > kLongestXPath || text.find('\0') != std::string_view::npos) {
-        fail(error, kErrorMalformed,
-             fmt::format("XPath of {} bytes: empty, too long or binary", text.size()));
+        fail(error, kErrorMalformed, "empty, too long or binary",
+             {.part = fmt::format("XPath of {} bytes", text.size())});
         return nullptr;
     }
     const XmlOwned<xmlXPathContext> context(xmlXPathNewContext(nullptr));
@@ -164,7 +164,7 @@ std::shared_ptr<const XPathExpression> XPathExpression::cached(std::string_view 
     if (!expression && error != nullptr) {
         *error = std::move(reason);
     } else if (!expression) {
-        log(reason.message);
+        log(reason.message());
     }
     return cache.emplace(std::move(key), std::move(expression)).first->second;
 }

@@ -27,8 +27,7 @@ std::shared_ptr<TGRTMetaData> TGRTAudioFileMetaDataReader::readMetaDataFromFile(
                                                                                 Error* error) const {
     const URL& url = file.url();
     if (TGRTAudioFileTypeValidator::isPrelistenFile(url)) {
-        fail(error, kErrorUnreadable,
-             fmt::format("{}: is the recorded preview of another item", printable(url.path())));
+        fail(error, kErrorUnreadable, "is the recorded preview of another item", {url.path()});
         return nullptr;
     }
     const std::shared_ptr<const LCFileData> fileData = file.audio(error);

@@ -81,7 +81,7 @@ std::optional<PresetText> PresetText::parse(std::string_view text, Error* error)
         Line line{std::string(text.substr(start, end - start)), open};
         start = end;
         if (!isValidUtf8(line.bytes)) {
-            fail(error, kErrorMalformed, fmt::format("line {}: not UTF-8", preset.lines_.size() + 1));
+            fail(error, kErrorMalformed, "not UTF-8", {.line = preset.lines_.size() + 1});
             return std::nullopt;
         }
         std::string_view visible = line.bytes;

@@ -29,12 +29,10 @@ std::shared_ptr<TGRTMetaData> TGRTVorthalPresetMetaDataReader::readMetaDataFromF
     const URL& url = file.url();
     const auto bytes = file.bytes(kLargestPreset, error);
     if (!bytes) return nullptr;
-    Error reason;
     const auto preset =
-        PresetText::parse({reinterpret_cast<const char*>(bytes->data()), bytes->size()}, &reason);
+        PresetText::parse({reinterpret_cast<const char*>(bytes->data()), bytes->size()}, error);
     if (!preset) {
-        fail(error, static_cast<ErrorCode>(reason.code),
-             fmt::format("{}: {}", printable(url.path()), reason.message));
+        failIn(url.path(), error);
         return nullptr;
     }
     auto record = recordOfPreset(*preset, *taxonomy());

@@ -16,14 +16,14 @@ namespace {
 bool changePreset(const URL& url, const std::function<void(PresetText&)>& change, Error* error,
                   const ContentWriteOptions& options) {
     if (!fileExists(url.path())) {
-        return fail(error, kErrorUnreadable, fmt::format("{}: no such preset", printable(url.path())));
+        return fail(error, kErrorUnreadable, "no such preset", {url.path()});
     }
     const auto changeText = [&change](const std::string& stored,
                                       Error* reason) -> std::optional<std::string> {
         auto preset = PresetText::parse(stored, reason);
         if (!preset) return std::nullopt;
         if (const auto line = preset->firstUnclosedSection()) {
-            fail(reason, kErrorMalformed, fmt::format("line {}: the section does not end", *line));
+            fail(reason, kErrorMalformed, "the section does not end", {.line = *line});
             return std::nullopt;
         }
         change(*preset);

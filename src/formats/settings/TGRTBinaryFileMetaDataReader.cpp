@@ -27,16 +27,16 @@ std::optional<EmbeddedPropertyList> findEmbeddedPropertyList(std::span<const std
     const auto rest = bytes.subspan(found.offset);
     std::uint64_t trailer = 0;
     if (!CFBinaryPlistFindTrailer(rest.data(), rest.size(), &trailer)) {
-        fail(error, kErrorNoPropertyList,
-             fmt::format("the property list at byte {} has no end", found.offset));
+        fail(error, kErrorNoPropertyList, "has no end",
+             {.part = "embedded property list", .offset = found.offset});
         return std::nullopt;
     }
     found.length = trailer + kBinaryPlistTrailerLength;
     Error reason;
     auto value = parsePropertyList(rest.first(found.length), &reason);
     if (!value) {
-        fail(error, kErrorNoPropertyList,
-             fmt::format("the property list at byte {} cannot be parsed: {}", found.offset, reason.message));
+        fail(error, kErrorNoPropertyList, reason.reason,
+             {.part = "embedded " + reason.part, .offset = found.offset + reason.offset.value_or(0)});
         return std::nullopt;
     }
     found.value = std::move(*value);
@@ -85,13 +85,14 @@ std::optional<PropertyList::Dictionary> TGRTBinaryFileMetaDataReader::_extractDi
     if (const auto bytes = file.bytes(kLargestWholeFile, &reason))
         found = findEmbeddedPropertyList(*bytes, &reason);
     if (found && found->value.dictionary() != nullptr) return std::move(*found->value.dictionary());
-    if (found) fail(&reason, kErrorNoPropertyList, "the embedded property list is no dictionary");
+    if (found)
+        fail(&reason, kErrorNoPropertyList, "is no dictionary",
+             {.part = "embedded property list", .offset = found->offset});
 
-    const std::string place = printable(url.path()) + ": ";
-    const std::string_view message = reason.message;
-    const std::string_view why = message.starts_with(place) ? message.substr(place.size()) : message;
-    if (!processHasArgument("-XCTest")) log(fmt::format("Indexing {}{}", place, why));
-    fail(error, kErrorNoPropertyList, fmt::format("{}{}", place, why));
+    reason.code = kErrorNoPropertyList;
+    failIn(url.path(), &reason);
+    if (!processHasArgument("-XCTest")) log("Indexing " + reason.message());
+    if (error != nullptr) *error = std::move(reason);
     return std::nullopt;
 }
 

@@ -64,7 +64,7 @@ std::shared_ptr<TGRTSettingsInfo> TGRTSettingsHeaderReader::settingInfoForURL(co
     std::array<std::uint8_t, kHeaderLength> bytes{};
     const auto stored = std::span(bytes).first(std::min<std::uint64_t>(reader->size(), kHeaderLength));
     if (!reader->read(0, stored)) {
-        fail(error, kErrorUnreadable, fmt::format("{}: cannot be read", printable(url->path())));
+        fail(error, kErrorUnreadable, "cannot be read", {url->path()});
         return nullptr;
     }
     return settingInfoForBytes(stored);

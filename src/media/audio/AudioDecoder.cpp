@@ -76,10 +76,11 @@ struct AudioDecoder::State {
     }
 
     bool isUsable(std::string_view name, Error* error) const {
-        if (!file) return fail(error, kErrorUnreadable, fmt::format("{}: {}", name, sf_strerror(nullptr)));
+        if (!file) return fail(error, kErrorUnreadable, sf_strerror(nullptr), {std::string(name)});
         if (info.samplerate < 1 || info.channels < 1 || info.channels > kMostChannels) {
             return fail(error, kErrorMalformed,
-                        fmt::format("{}: {} channels at {} Hz", name, info.channels, info.samplerate));
+                        fmt::format("{} channels at {} Hz", info.channels, info.samplerate),
+                        {std::string(name)});
         }
         return true;
     }

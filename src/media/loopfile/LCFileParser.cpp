@@ -15,11 +15,6 @@
 namespace qvct {
 namespace {
 
-/// A container's messages know no path.
-void putPathBefore(Error* error, std::string_view path) {
-    if (error != nullptr) error->message = fmt::format("{}: {}", printable(path), error->message);
-}
-
 std::optional<PropertyList::Dictionary> readRecord(const Container& container) {
     const auto bytes = container.recordBytes();
     if (!bytes || bytes->empty()) return std::nullopt;
@@ -47,7 +42,7 @@ std::shared_ptr<LCFileData> read(ReadWindow& window, std::string_view name, unsi
     }
     auto record = readRecord(*container);
     if (container->isRecordAlone() && !record) {
-        fail(error, kErrorMalformed, "holds no record that can be read (byte 0)");
+        fail(error, kErrorMalformed, "holds no record that can be read", {.offset = 0});
         return nullptr;
     }
     auto data = std::make_shared<LCFileData>(std::move(facts), std::move(record));
@@ -133,7 +128,7 @@ std::shared_ptr<LCFileData> LCFileParser::fileData(Error* error) const {
     if (data) {
         data->setOpenFile(reader);
     } else {
-        putPathBefore(error, name_);
+        failIn(name_, error);
     }
     return data;
 }
@@ -153,7 +148,7 @@ std::vector<LCChunk> LCFileParser::chunks(Error* error) const {
     ReadWindow window(*reader);
     const auto container = Container::open(window, name_, error);
     if (container) return describeChunks(*container);
-    putPathBefore(error, name_);
+    failIn(name_, error);
     return {};
 }
 

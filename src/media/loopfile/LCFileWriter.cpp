@@ -14,11 +14,6 @@
 namespace qvct {
 namespace {
 
-bool failFor(Error* error, std::string_view path, const Error& reason) {
-    return fail(error, static_cast<ErrorCode>(reason.code),
-                fmt::format("{}: {}", printable(path), reason.message));
-}
-
 /// An unreadable record may be one of a newer version, or be saved by other means: it is not overwritten.
 bool isReadable(const Container& container, Error* error) {
     const Chunk* chunk = container.find(Chunk::Role::record);
@@ -29,7 +24,7 @@ bool isReadable(const Container& container, Error* error) {
     if (record && record->dictionary() != nullptr) return true;
     return failAt(error, *chunk,
                   fmt::format("holds a record that cannot be read and is kept ({})",
-                              record ? "no dictionary" : reason.message));
+                              record ? "no dictionary" : reason.message()));
 }
 
 bool holdsAlready(const Container& container, const std::string& record) {
@@ -45,19 +40,18 @@ bool isSameOutsideOfTheRecord(const std::string& path, const LCFingerprint& befo
     Error reason;
     const auto reader = FileReader::open(newFile, &reason);
     const auto after = reader ? fingerprintOfReader(*reader, path, &reason) : std::nullopt;
+    reason.path.clear();  // that of the new file, which is about to go
     const std::vector<std::string> differences =
-        after ? before.differences(*after) : std::vector{reason.message};
+        after ? before.differences(*after) : std::vector{reason.message()};
     if (differences.empty()) return true;
     return fail(error, kErrorUnwritable,
-                fmt::format("{}: not written, since the new file differs: {}", printable(path),
-                            join(differences, "; ")));
+                "not written, since the new file differs: " + join(differences, "; "), {path});
 }
 
 bool makeLoopDataFile(const std::string& path, const std::string& record, const LCWriteOptions& how,
                       Error* error) {
     if (record.empty()) {
-        return failFor(error, path,
-                       {{}, kErrorInvalidArgument, "a loop data file cannot be without a record"});
+        return fail(error, kErrorInvalidArgument, "a loop data file cannot be without a record", {path});
     }
     const FilePiece whole{.bytes = record};
     FileReplacementOptions options;
@@ -81,13 +75,11 @@ std::shared_ptr<LCFileWriter> LCFileWriter::fileWriterForURL(const URL& url, LCW
 }
 
 bool LCFileWriter::writeFileData(const std::shared_ptr<const LCFileData>& data, Error* error) const {
-    const auto refuse = [&](const Error& reason) { return failFor(error, path_, reason); };
-    if (!data) return refuse({{}, kErrorInvalidArgument, "there is no file data to write"});
-    Error reason;
-    const std::string record =
-        data->record().empty() ? std::string{}
-                               : serializePropertyList(data->record(), PropertyListFormat::binary, &reason);
-    if (record.empty() && !data->record().empty()) return refuse(reason);
+    if (!data) return fail(error, kErrorInvalidArgument, "there is no file data to write", {path_});
+    const std::string record = data->record().empty()
+                                   ? std::string{}
+                                   : serializePropertyList(data->record(), PropertyListFormat::binary, error);
+    if (record.empty() && !data->record().empty()) return failIn(path_, error);
     const auto turn = EditLock::acquire(path_, error);
     if (!turn) return false;
     if (LoopDataFile::isName(path_) && isMissing(path_))
@@ -96,14 +88,14 @@ bool LCFileWriter::writeFileData(const std::shared_ptr<const LCFileData>& data, 
     const auto reader = FileReader::open(path_, error);
     if (!reader) return false;
     ReadWindow window(*reader);
-    const auto container = Container::open(window, path_, &reason);
+    const auto container = Container::open(window, path_, error);
     LCAudioFacts facts;
-    if (!container || !container->readFacts(facts, &reason) || !isReadable(*container, &reason)) {
-        return refuse(reason);
+    if (!container || !container->readFacts(facts, error) || !isReadable(*container, error)) {
+        return failIn(path_, error);
     }
     if (holdsAlready(*container, record)) return true;
-    const auto pieces = container->rewritten(record, &reason);
-    if (!pieces) return refuse(reason);
+    const auto pieces = container->rewritten(record, error);
+    if (!pieces) return failIn(path_, error);
 
     FileReplacementOptions options;
     options.keepsTimes = options_.keepsTimes;

@@ -86,11 +86,11 @@ std::optional<LCFingerprint> fingerprintOfFile(const URL& url, Error* error) {
 std::optional<LCFingerprint> fingerprintOfReader(const RandomAccessReader& reader, std::string_view name,
                                                  Error* error) {
     ReadWindow window(reader);
-    Error reason{{}, kErrorUnreadable, "became shorter while it was read"};
-    const auto container = Container::open(window, name, &reason);
+    const auto container = Container::open(window, name, error);
     LCFingerprint result;
     if (container && addChunks(result, reader, *container)) return result;
-    fail(error, static_cast<ErrorCode>(reason.code), fmt::format("{}: {}", printable(name), reason.message));
+    if (container) fail(error, kErrorUnreadable, "became shorter while it was read");
+    failIn(name, error);
     return std::nullopt;
 }
 

@@ -105,20 +105,22 @@ class MidiSequenceBuilder {
 
     bool readHeader(Error* error) {
         if (!hasName(bytes_, "MThd") || bytes_.size() < kChunkHeader + kHeaderLength) {
-            return fail(error, kErrorMalformed, "byte 0: no standard MIDI file header");
+            return fail(error, kErrorMalformed, "no standard MIDI file header", {.offset = 0});
         }
         const std::uint32_t length = bigEndian(bytes_.subspan(4, 4));
         const std::uint32_t format = bigEndian(bytes_.subspan(8, 2));
         announcedTracks_ = bigEndian(bytes_.subspan(10, 2));
         division_ = divisionOf(bigEndian(bytes_.subspan(12, 2)));
         if (length < kHeaderLength) {
-            return fail(error, kErrorMalformed, fmt::format("byte 4: a header of {} bytes, not 6", length));
+            return fail(error, kErrorMalformed, fmt::format("a header of {} bytes, not 6", length),
+                        {.offset = 4});
         }
         if (format > 2) {
-            return fail(error, kErrorMalformed, fmt::format("byte 8: unknown MIDI file format {}", format));
+            return fail(error, kErrorMalformed, fmt::format("unknown MIDI file format {}", format),
+                        {.offset = 8});
         }
         if (!division_.isUsable()) {
-            return fail(error, kErrorMalformed, "byte 12: a division of 0, so that time has no unit");
+            return fail(error, kErrorMalformed, "a division of 0, so that time has no unit", {.offset = 12});
         }
         sequence_.format_ = static_cast<int>(format);
         position_ = kChunkHeader + std::min<std::size_t>(length, bytes_.size() - kChunkHeader);
@@ -133,17 +135,20 @@ class MidiSequenceBuilder {
             position_ += kChunkHeader;
             const std::size_t length = std::min(announced, bytes_.size() - position_);
             if (length < announced) {
-                note(fmt::format("byte {}: a chunk of {} bytes, {} are there", position_ - 4, announced,
-                                 length));
+                note(errorOf(kErrorMalformed,
+                             fmt::format("a chunk of {} bytes, {} are there", announced, length),
+                             {.offset = position_ - 4}));
             }
             if (hasName(header, "MTrk")) {
                 tracks_.push_back(reader.read(bytes_.subspan(position_, length), position_));
-                if (!tracks_.back().problem.empty()) note(tracks_.back().problem);
+                if (tracks_.back().problem.isSet()) note(tracks_.back().problem);
             }
             position_ += length;
         }
         if (tracks_.size() != announcedTracks_) {
-            note(fmt::format("byte 10: {} tracks announced, {} found", announcedTracks_, tracks_.size()));
+            note(errorOf(kErrorMalformed,
+                         fmt::format("{} tracks announced, {} found", announcedTracks_, tracks_.size()),
+                         {.offset = 10}));
         }
     }
 
@@ -178,7 +183,7 @@ class MidiSequenceBuilder {
         return track;
     }
 
-    void note(std::string problem) {
+    void note(Error problem) {
         if (sequence_.problems_.size() < kMostProblems) sequence_.problems_.push_back(std::move(problem));
     }
 
@@ -211,7 +216,7 @@ std::optional<MidiSequence> MidiSequence::read(const std::string& path, Error* e
     const auto bytes = readFile(path, error, kLargestFile);
     if (!bytes) return std::nullopt;
     auto sequence = parse(*bytes, error);
-    if (!sequence && error) error->message = path + ": " + error->message;
+    if (!sequence) failIn(path, error);
     return sequence;
 }
 

@@ -47,7 +47,8 @@ struct MeterChange {
 /// its own tempo events (120 a minute before the first). Running status survives meta and system-exclusive
 /// events, since there are files that rely on it.
 ///
-/// What is damaged is read as far as it goes; `problems` says what was left out and at which byte.
+/// What is damaged is read as far as it goes; `problems` says what was left out and at which byte, not of
+/// which file.
 class MidiSequence {
   public:
     /// Largest file that is read: 16 MB.
@@ -75,7 +76,7 @@ class MidiSequence {
     /// Where the last note of all tracks ends, in beats.
     double endOfNotes() const;
     /// One line for each damaged place, at most a few dozen.
-    const std::vector<std::string>& problems() const { return problems_; }
+    const std::vector<Error>& problems() const { return problems_; }
 
   private:
     friend class MidiSequenceBuilder;
@@ -85,7 +86,7 @@ class MidiSequence {
     std::vector<TempoChange> tempos_;
     std::vector<MeterChange> meters_;
     double length_ = 0;
-    std::vector<std::string> problems_;
+    std::vector<Error> problems_;
 };
 
 }  // namespace qvct

@@ -37,7 +37,7 @@ MidiTrackEvents MidiTrackReader::read(std::span<const std::uint8_t> chunk, std::
         tick_ += delta;
         if (!readEvent()) break;
     }
-    if (!ended_ && events_.problem.empty()) stop("the track has no end event");
+    if (!ended_ && !events_.problem.isSet()) stop("the track has no end event");
     events_.end = tick_;
     closeOpenNotes();
     return std::move(events_);
@@ -177,8 +177,7 @@ bool MidiTrackReader::skipBytes(std::uint32_t count) {
 }
 
 bool MidiTrackReader::stop(const char* reason) {
-    events_.problem = fmt::format("byte {}: {}", offset_ + position_, reason);
-    return false;
+    return fail(&events_.problem, kErrorMalformed, reason, {.offset = offset_ + position_});
 }
 
 }  // namespace qvct

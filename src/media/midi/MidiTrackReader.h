@@ -1,5 +1,7 @@
 #pragma once
 
+#include "platform/base/Error.h"
+
 #include <cstddef>
 #include <cstdint>
 #include <span>
@@ -28,7 +30,7 @@ struct MidiTrackEvents {
     std::vector<Meter> meters;
     std::uint64_t end = 0;
     bool hasChannelEvent = false;
-    std::string problem;  ///< Why reading stopped before the track's end; empty when it did not.
+    Error problem;  ///< Why reading stopped before the track's end; not set when it did not.
 };
 
 /// Reads the events of track chunks, one after the other.

@@ -1,11 +1,39 @@
 #include "platform/base/Error.h"
 
+#include "platform/base/Printable.h"
+
 #include <utility>
 
 namespace qvct {
+namespace {
 
-bool fail(Error* error, ErrorCode code, std::string message) {
-    if (error != nullptr) *error = Error{std::string(QVCTErrorDomain), code, std::move(message)};
+void append(std::string& text, std::string_view separator, std::string_view more) {
+    if (!text.empty()) text += separator;
+    text += more;
+}
+
+}  // namespace
+
+std::string Error::message() const {
+    std::string text = printable(path);
+    if (!part.empty()) append(text, ": ", printable(part));
+    if (line) append(text, ", ", "line " + std::to_string(*line));
+    if (offset) append(text, ", ", "byte " + std::to_string(*offset));
+    if (!reason.empty()) append(text, ": ", reason);
+    return text;
+}
+
+Error errorOf(ErrorCode code, std::string reason, ErrorPlace place) {
+    return {std::move(place), std::string(QVCTErrorDomain), code, std::move(reason)};
+}
+
+bool fail(Error* error, ErrorCode code, std::string reason, ErrorPlace place) {
+    if (error != nullptr) *error = errorOf(code, std::move(reason), std::move(place));
+    return false;
+}
+
+bool failIn(std::string_view path, Error* error) {
+    if (error != nullptr && error->path.empty()) error->path = path;
     return false;
 }
 

@@ -333,7 +333,8 @@ std::optional<PropertyList> parseXml(std::string_view text, PropertyListUse use,
 }
 
 bool failAt(Error* error, std::string_view form, const PropertyListFault& fault, std::size_t offset) {
-    return fail(error, fault.code, fmt::format("{} property list, byte {}: {}", form, offset, fault.reason));
+    return fail(error, fault.code, fault.reason,
+                {.part = fmt::format("{} property list", form), .offset = offset});
 }
 
 }  // namespace
@@ -380,11 +381,8 @@ std::string serializePropertyList(const PropertyList& value, PropertyListFormat 
 std::optional<PropertyList> readPropertyListFile(const std::string& path, Error* error, PropertyListUse use) {
     const auto bytes = readFile(path, error);
     if (!bytes) return std::nullopt;
-    Error reason;
-    auto value = parsePropertyList(*bytes, &reason, use);
-    if (!value)
-        fail(error, static_cast<ErrorCode>(reason.code),
-             fmt::format("{}: {}", printable(path), reason.message));
+    auto value = parsePropertyList(*bytes, error, use);
+    if (!value) failIn(path, error);
     return value;
 }
 
@@ -393,19 +391,14 @@ std::optional<PropertyList::Dictionary> readDictionaryFile(const std::string& pa
     auto value = readPropertyListFile(path, error, use);
     if (!value) return std::nullopt;
     if (PropertyList::Dictionary* dictionary = value->dictionary()) return std::move(*dictionary);
-    fail(error, kErrorMalformed, fmt::format("{}: the property list is not a dictionary", printable(path)));
+    fail(error, kErrorMalformed, "the property list is not a dictionary", {path});
     return std::nullopt;
 }
 
 bool writePropertyListFile(const PropertyList& value, const std::string& path, PropertyListFormat format,
                            Error* error) {
-    Error reason;
-    const std::string bytes = serializePropertyList(value, format, &reason);
-    if (bytes.empty()) {
-        return fail(error, static_cast<ErrorCode>(reason.code),
-                    fmt::format("{}: {}", printable(path), reason.message));
-    }
-    return replaceFile(path, bytes, error);
+    const std::string bytes = serializePropertyList(value, format, error);
+    return bytes.empty() ? failIn(path, error) : replaceFile(path, bytes, error);
 }
 
 }  // namespace qvct

@@ -34,10 +34,9 @@ std::shared_ptr<XmlDocument> XmlDocument::fromFile(const std::string& path, Erro
     const auto bytes = readFile(path, error, kLargestXmlFile);
     if (!bytes) return nullptr;
     if (!path.ends_with(".zxml")) return fromText(textOf(*bytes), path, error);
-    Error reason;
-    const auto xml = decompress(*bytes, &reason);
+    const auto xml = decompress(*bytes, error);
     if (xml) return fromText(textOf(*xml), path, error);
-    fail(error, static_cast<ErrorCode>(reason.code), fmt::format("{}: {}", printable(path), reason.message));
+    failIn(path, error);
     return nullptr;
 }
 
@@ -45,8 +44,9 @@ std::shared_ptr<XmlDocument> XmlDocument::fromText(std::string_view text, std::s
                                                    Error* error) {
     ParsedXml parsed = parseXml(text);
     if (!parsed.tree) {
-        const std::string reason = parsed.faults.empty() ? "no XML" : parsed.faults.front();
-        fail(error, kErrorMalformed, fmt::format("{}, {}", printable(name), reason));
+        fail(error, kErrorMalformed, "no XML");
+        if (error != nullptr && !parsed.faults.empty()) *error = std::move(parsed.faults.front());
+        failIn(name, error);
         return nullptr;
     }
     auto implementation = std::make_unique<Implementation>();

@@ -83,10 +83,11 @@ std::optional<std::string> declaredEncoding(std::string_view declaration) {
 /// Whether the library reads the markup as it is seen here, a byte for each of its characters.
 bool hasKnownMarkup(std::string_view narrow, bool isWide, Error* error) {
     constexpr std::string_view declarationInEbcdic = "\x4C\x6F\xA7\x94";
-    if (narrow.starts_with(declarationInEbcdic)) return fail(error, kErrorMalformed, "line 1: EBCDIC");
+    if (narrow.starts_with(declarationInEbcdic)) return fail(error, kErrorMalformed, "EBCDIC", {.line = 1});
     const std::string_view declaration = declarationOf(narrow);
     if (!declaration.empty() && !declaration.ends_with("?>"))
-        return fail(error, kErrorMalformed, "line 1: an XML declaration that is too long, or does not end");
+        return fail(error, kErrorMalformed, "an XML declaration that is too long, or does not end",
+                    {.line = 1});
     const std::optional<std::string> name = declaredEncoding(declaration);
     if (!name || std::find(kUnswitchedEncodings.begin(), kUnswitchedEncodings.end(), *name) !=
                      kUnswitchedEncodings.end())
@@ -96,7 +97,7 @@ bool hasKnownMarkup(std::string_view narrow, bool isWide, Error* error) {
                                [&](std::string_view start) { return name->starts_with(start); });
     return isKnown ||
            fail(error, kErrorMalformed,
-                fmt::format("line 1: texts in the encoding \"{}\" are not read", printable(*name)));
+                fmt::format("texts in the encoding \"{}\" are not read", printable(*name)), {.line = 1});
 }
 
 std::size_t lineAt(std::string_view text, std::size_t offset) {
@@ -112,6 +113,13 @@ std::size_t valueBehind(std::string_view text, std::size_t equals) {
     return at < text.size() && (text[at] == '"' || text[at] == '\'') ? at : text.size();
 }
 
+/// The library counts from 1, and says 0 where it has no line.
+ErrorPlace placeOfLine(int line) {
+    ErrorPlace place;
+    if (line > 0) place.line = static_cast<std::uint64_t>(line);
+    return place;
+}
+
 /// Keeps the XML library's messages, and ends the parsing of what grows too large.
 class Parser {
   public:
@@ -122,17 +130,17 @@ class Parser {
         static const bool isInitialized = (xmlInitParser(), true);  // before several threads parse at once
         if (isInitialized) context_.reset(xmlNewParserCtxt());
         if (!context_ || text_.size() > static_cast<std::size_t>(std::numeric_limits<int>::max())) {
-            result_.faults.emplace_back("too large to be parsed");
+            result_.faults.push_back(errorOf(kErrorTooLarge, "too large to be parsed"));
             return std::move(result_);
         }
         Error error;
         if (!hasFewAttributes(text_, &error)) {
-            result_.faults.push_back(std::move(error.message));
+            result_.faults.push_back(std::move(error));
             return std::move(result_);
         }
         context_->_private = this;
         context_->sax->serror = [](void* context, xmlErrorPtr raised) {
-            of(context).addFault(raised->line,
+            of(context).addFault(kErrorMalformed, raised->line,
                                  raised->message == nullptr ? "unknown fault" : raised->message);
         };
         context_->sax->startElementNs = startElement;
@@ -149,17 +157,18 @@ class Parser {
         return *static_cast<Parser*>(static_cast<xmlParserCtxt*>(context)->_private);
     }
 
-    void addFault(int line, std::string_view reason) {
+    void addFault(ErrorCode code, int line, std::string_view reason) {
         if (result_.faults.size() == kMostFaults) {
             ++result_.moreFaults;
         } else {
-            result_.faults.push_back(fmt::format("line {}: {}", line, trimBlanksAndLineBreaks(reason)));
+            result_.faults.push_back(
+                errorOf(code, std::string(trimBlanksAndLineBreaks(reason)), placeOfLine(line)));
         }
     }
 
     void stop(std::string_view reason) {
         isStopped_ = true;
-        addFault(context_->input == nullptr ? 0 : context_->input->line, reason);
+        addFault(kErrorTooLarge, context_->input == nullptr ? 0 : context_->input->line, reason);
         xmlStopParser(context_.get());
     }
 
@@ -243,8 +252,8 @@ bool hasFewAttributes(std::string_view text, Error* error) {
     if (!hasKnownMarkup(narrow, isWide, error)) return false;
     const auto offset = attributeTooMany(narrow);
     return !offset || fail(error, kErrorTooLarge,
-                           fmt::format("line {}: an element with more than {} attributes",
-                                       lineAt(narrow, *offset), kMostXmlAttributes));
+                           fmt::format("an element with more than {} attributes", kMostXmlAttributes),
+                           {.line = lineAt(narrow, *offset)});
 }
 
 }  // namespace qvct

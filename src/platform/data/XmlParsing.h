@@ -22,10 +22,10 @@ inline constexpr std::size_t kXmlBytesOfNode = 40;
 
 /// A parsed text. Malformed XML is used as far as it makes sense.
 struct ParsedXml {
-    XmlOwned<_xmlDoc> tree;           ///< Null when there is nothing to recover, or too much.
-    bool isWellFormed = false;        ///< Whether the tree is all of the text.
-    std::vector<std::string> faults;  ///< The first few, each with its line.
-    std::size_t moreFaults = 0;       ///< How many more there were.
+    XmlOwned<_xmlDoc> tree;      ///< Null when there is nothing to recover, or too much.
+    bool isWellFormed = false;   ///< Whether the tree is all of the text.
+    std::vector<Error> faults;   ///< The first few, each with its line.
+    std::size_t moreFaults = 0;  ///< How many more there were.
 };
 
 /// Parses without reading anything outside the text: no network, no external entities or document types. The

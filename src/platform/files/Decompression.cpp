@@ -39,7 +39,8 @@ class BoundedOutput {
 };
 
 bool failAt(Error* error, std::string_view format, std::size_t offset, std::string_view reason) {
-    return fail(error, kErrorMalformed, fmt::format("{} data, byte {}: {}", format, offset, reason));
+    return fail(error, kErrorMalformed, std::string(reason),
+                {.part = fmt::format("{} data", format), .offset = offset});
 }
 
 bool beginsLikeGzip(Bytes bytes) {

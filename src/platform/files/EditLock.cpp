@@ -95,9 +95,10 @@ std::unique_ptr<EditLock> EditLock::acquire(const std::string& path, Error* erro
     if (lockWithin(descriptor.number(), patience) == EWOULDBLOCK) {
         const std::string holder = holderOf(status.st_ino);
         fail(error, kErrorUnwritable,
-             fmt::format("{}: waited {} s for a turn to write in its folder, which {} has now",
-                         printable(path), std::chrono::duration<double>(patience).count(),
-                         holder.empty() ? "another program" : holder));
+             fmt::format("waited {} s for a turn to write in its folder, which {} has now",
+                         std::chrono::duration<double>(patience).count(),
+                         holder.empty() ? "another program" : holder),
+             {path});
         return nullptr;
     }
     heldByThisThread().push_back({key, std::move(descriptor)});

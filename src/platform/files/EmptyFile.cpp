@@ -19,8 +19,7 @@ bool makeEmptyFileLike(const std::string& model, const std::string& path, Error*
     const mode_t mode = isThere ? status.st_mode & 0777U : 0666U;
     const FileDescriptor file(::open(path.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, mode));
     if (!file.isOpen() || (isThere && ::fchmod(file.number(), mode) != 0))
-        return fail(error, kErrorUnwritable,
-                    fmt::format("{}: cannot be made: {}", printable(path), std::strerror(errno)));
+        return fail(error, kErrorUnwritable, fmt::format("cannot be made: {}", std::strerror(errno)), {path});
     if (isThere) [[maybe_unused]]
         const int ignored = ::fchown(file.number(), status.st_uid, status.st_gid);
     return true;

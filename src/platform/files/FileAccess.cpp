@@ -17,14 +17,6 @@
 namespace qvct {
 namespace {
 
-bool failFor(Error* error, ErrorCode code, std::string_view path, std::string_view reason) {
-    return fail(error, code, fmt::format("{}: {}", printable(path), reason));
-}
-
-bool failWithErrno(Error* error, ErrorCode code, std::string_view path) {
-    return failFor(error, code, path, std::strerror(errno));
-}
-
 bool statOf(const std::string& path, struct stat& status) {
     return !isURLText(path) && ::stat(path.c_str(), &status) == 0;
 }
@@ -47,7 +39,7 @@ bool isRegularFile(const std::string& path) {
 }
 
 bool mayRead(const std::string& path, Error* error) {
-    return ::access(path.c_str(), R_OK) == 0 || failWithErrno(error, kErrorUnreadable, path);
+    return ::access(path.c_str(), R_OK) == 0 || fail(error, kErrorUnreadable, std::strerror(errno), {path});
 }
 
 bool mayWrite(const std::string& path) {
@@ -56,7 +48,7 @@ bool mayWrite(const std::string& path) {
 
 FileDescriptor openRegularFile(const std::string& path, Error* error, struct stat* status) {
     if (isURLText(path)) {
-        failFor(error, kErrorInvalidArgument, path, "is no file URL");
+        fail(error, kErrorInvalidArgument, "is no file URL", {path});
         return FileDescriptor(-1);
     }
     // Without O_NONBLOCK, opening a named pipe would wait for a writer for ever.
@@ -64,10 +56,10 @@ FileDescriptor openRegularFile(const std::string& path, Error* error, struct sta
     struct stat own {};
     if (status == nullptr) status = &own;
     if (!descriptor.isOpen() || ::fstat(descriptor.number(), status) != 0) {
-        failWithErrno(error, kErrorUnreadable, path);
+        fail(error, kErrorUnreadable, std::strerror(errno), {path});
     } else if (!S_ISREG(status->st_mode)) {
-        failFor(error, kErrorUnreadable, path,
-                S_ISDIR(status->st_mode) ? "is a folder" : "is not a regular file");
+        fail(error, kErrorUnreadable, S_ISDIR(status->st_mode) ? "is a folder" : "is not a regular file",
+             {path});
     } else {
         return descriptor;
     }
@@ -85,7 +77,7 @@ std::optional<std::string> readTextFile(const std::string& path, Error* error) {
     if (!bytes) return std::nullopt;
     std::string text(bytes->begin(), bytes->end());
     if (!isValidUtf8(text)) {
-        failFor(error, kErrorMalformed, path, "is not UTF-8 text");
+        fail(error, kErrorMalformed, "is not UTF-8 text", {path});
         return std::nullopt;
     }
     return text;

@@ -24,14 +24,6 @@
 namespace qvct {
 namespace {
 
-bool failFor(Error* error, std::string_view path, std::string_view reason) {
-    return fail(error, kErrorUnwritable, fmt::format("{}: {}", printable(path), reason));
-}
-
-bool failWithErrno(Error* error, std::string_view path, std::string_view action) {
-    return failFor(error, path, fmt::format("{}: {}", action, std::strerror(errno)));
-}
-
 std::uint64_t lengthOf(const FilePiece& piece) {
     return piece.length > 0 ? piece.length : piece.bytes.size();
 }
@@ -158,19 +150,19 @@ class Replacement {
     bool openOld() {
         struct stat status {};
         if (::stat(target_.c_str(), &status) != 0) {
-            if (errno != ENOENT) return failWithErrno(error_, path_, "cannot be opened");
+            if (errno != ENOENT) return refuseFor("cannot be opened");
             const bool isLink = ::lstat(target_.c_str(), &status) == 0;
-            return isLink ? failFor(error_, path_, "is a link that leads nowhere") : isExpected({});
+            return isLink ? refuse("is a link that leads nowhere") : isExpected({});
         }
-        if (!S_ISREG(status.st_mode)) return failFor(error_, path_, "is not a regular file");
+        if (!S_ISREG(status.st_mode)) return refuse("is not a regular file");
         constexpr mode_t kAnyWrite = S_IWUSR | S_IWGRP | S_IWOTH;
         if ((status.st_mode & kAnyWrite) == 0 ||
             ::faccessat(AT_FDCWD, target_.c_str(), W_OK, AT_EACCESS) != 0) {
-            return failFor(error_, path_, "is protected from writing");
+            return refuse("is protected from writing");
         }
         old_.emplace(::open(target_.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
         if (!old_->isOpen() || ::fstat(old_->number(), &status_) != 0) {
-            return failWithErrno(error_, path_, "cannot be opened");
+            return refuseFor("cannot be opened");
         }
         return isReplaceable() && isExpected(FileStamp::of(status_));
     }
@@ -182,7 +174,7 @@ class Replacement {
         const uid_t user = ::geteuid();
         if (user == 0 || user == status_.st_uid || ::stat(folder_.c_str(), &folder) != 0) return true;
         if ((folder.st_mode & S_ISVTX) == 0 || user == folder.st_uid) return true;
-        return failFor(error_, path_, "lies in a folder where only its owner may replace it");
+        return refuse("lies in a folder where only its owner may replace it");
     }
 
     bool canMakeFile() const {
@@ -194,15 +186,22 @@ class Replacement {
         return ::faccessat(AT_FDCWD, (folder / ".").c_str(), W_OK | X_OK, AT_EACCESS) == 0 || failToMake();
     }
 
-    bool failToMake() const { return failWithErrno(error_, path_, "cannot make a file beside it"); }
+    bool refuse(std::string reason) const {
+        return fail(error_, kErrorUnwritable, std::move(reason), {path_});
+    }
+
+    /// With what the system says.
+    bool refuseFor(std::string_view action) const {
+        return refuse(fmt::format("{}: {}", action, std::strerror(errno)));
+    }
+
+    bool failToMake() const { return refuseFor("cannot make a file beside it"); }
 
     bool isExpected(const FileStamp& stamp) const {
         return !options_.expected || stamp == *options_.expected || failForOtherSave();
     }
 
-    bool failForOtherSave() const {
-        return failFor(error_, path_, "was changed by another program meanwhile");
-    }
+    bool failForOtherSave() const { return refuse("was changed by another program meanwhile"); }
 
     bool write(std::span<const FilePiece> pieces, int to) const {
         const std::uint64_t unmoved = endOfUnmoved(pieces);
@@ -228,32 +227,29 @@ class Replacement {
     }
 
     bool copy(std::uint64_t offset, std::uint64_t length, int to, std::uint64_t position) const {
-        if (!old_) return failFor(error_, path_, "does not exist");
+        if (!old_) return refuse("does not exist");
         return copyRange({old_->number(), offset, length, to, position}) || failToWrite(position);
     }
 
     bool failToWrite(std::uint64_t position) const {
-        return failWithErrno(error_, path_,
-                             fmt::format("cannot write the new contents at byte {}", position));
+        return refuseFor(fmt::format("cannot write the new contents at byte {}", position));
     }
 
     bool takeOver(const UnfinishedFile& made) const {
         const int to = made.descriptor();
         if (!old_) {
-            return ::fchmod(to, made.modeAtCreation()) == 0 ||
-                   failWithErrno(error_, path_, "cannot be given its mode");
+            return ::fchmod(to, made.modeAtCreation()) == 0 || refuseFor("cannot be given its mode");
         }
         takeOverOwner(status_, to);
         if (!takeOverAttributes(old_->number(), to)) {
-            return failWithErrno(error_, path_, "cannot keep its extended attributes");
+            return refuseFor("cannot keep its extended attributes");
         }
-        if (!takeOverMode(status_, to)) return failWithErrno(error_, path_, "cannot keep its mode");
-        return !options_.keepsTimes || takeOverTimes(status_, to) ||
-               failWithErrno(error_, path_, "cannot keep its times");
+        if (!takeOverMode(status_, to)) return refuseFor("cannot keep its mode");
+        return !options_.keepsTimes || takeOverTimes(status_, to) || refuseFor("cannot keep its times");
     }
 
     bool takePlace(UnfinishedFile& made) const {
-        if (::fsync(made.descriptor()) != 0) return failWithErrno(error_, path_, "cannot be flushed");
+        if (::fsync(made.descriptor()) != 0) return refuseFor("cannot be flushed");
         if (options_.expected && !isExpected(FileStamp::ofFile(target_))) return false;
         const EndingSignalsHeld held;
         const bool isDone = !options_.expected ? takePlaceOfAny(made)
@@ -264,7 +260,7 @@ class Replacement {
     }
 
     bool takePlaceOfAny(UnfinishedFile& made) const {
-        if (!renameOnDisk(made.path(), target_)) return failWithErrno(error_, path_, "cannot be replaced");
+        if (!renameOnDisk(made.path(), target_)) return refuseFor("cannot be replaced");
         made.release();
         return true;
     }
@@ -274,7 +270,7 @@ class Replacement {
             ::renameat2(AT_FDCWD, made.path().c_str(), AT_FDCWD, target_.c_str(), RENAME_NOREPLACE);
         if (done != 0 && errno == EEXIST) return failForOtherSave();
         if (done != 0 && isUnsupported(errno)) return takePlaceOfAny(made);
-        if (done != 0) return failWithErrno(error_, path_, "cannot be made");
+        if (done != 0) return refuseFor("cannot be made");
         made.release();
         flushFolder(folder_);
         return true;
@@ -283,13 +279,13 @@ class Replacement {
     bool exchange(UnfinishedFile& made) const {
         ::flock(old_->number(), LOCK_SH | LOCK_NB);  // so that nobody removes it as left behind
         if (!made.renameForExchangeWith(*options_.expected)) {
-            return failWithErrno(error_, path_, "cannot be replaced");
+            return refuseFor("cannot be replaced");
         }
         const FileStamp placed = FileStamp::ofFile(made.path());
         if (!exchangeOnce(made)) {
             if (errno == ENOENT) return failForOtherSave();
             if (isUnsupported(errno)) return takePlaceOfAny(made);
-            return failWithErrno(error_, path_, "cannot be replaced");
+            return refuseFor("cannot be replaced");
         }
         if (!isOld(FileStamp::ofFile(made.path()))) return putBack(made, placed);
         // The old file is removed only after the new one's name is on the disk.
@@ -315,10 +311,10 @@ class Replacement {
         for (bool isDone = false; !isDone;) {
             const FileStamp saved = FileStamp::ofFile(made.path());
             if (!exchangeOnce(made)) {
-                failWithErrno(error_, path_,
-                              fmt::format("was changed by another program meanwhile, whose contents stand in "
-                                          "{} and cannot be put back",
-                                          printable(made.path())));
+                refuseFor(
+                    fmt::format("was changed by another program meanwhile, whose contents stand in "
+                                "{} and cannot be put back",
+                                printable(made.path())));
                 made.release();
                 return false;
             }
@@ -352,13 +348,14 @@ FileStamp FileStamp::ofFile(const std::string& path) {
 bool replaceFileByPieces(const std::string& path, std::span<const FilePiece> pieces,
                          const FileReplacementOptions& options, Error* error) {
     if (isURLText(path)) {
-        return fail(error, kErrorInvalidArgument, fmt::format("{}: is no file URL", printable(path)));
+        return fail(error, kErrorInvalidArgument, "is no file URL", {path});
     }
     return Replacement(path, options, error).run(pieces);
 }
 
 bool renameFlushed(const std::string& from, const std::string& to, Error* error) {
-    return renameOnDisk(from, to) || failWithErrno(error, from, "cannot be moved");
+    return renameOnDisk(from, to) ||
+           fail(error, kErrorUnwritable, fmt::format("cannot be moved: {}", std::strerror(errno)), {from});
 }
 
 }  // namespace qvct

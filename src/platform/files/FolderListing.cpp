@@ -28,7 +28,7 @@ EntryKind kindOf(int folder, const dirent& entry) {
 
 std::optional<FolderListing> FolderListing::read(const std::string& path, Error* error) {
     auto listing = readAt(AT_FDCWD, path.c_str(), Links::follow);
-    if (!listing) fail(error, kErrorUnreadable, fmt::format("{}: {}", printable(path), std::strerror(errno)));
+    if (!listing) fail(error, kErrorUnreadable, std::strerror(errno), {path});
     return listing;
 }
 
@@ -89,8 +89,7 @@ std::optional<EntryStatus> FolderListing::status(const Entry& entry, Links links
     struct stat status {};
     const int kept = links == Links::keep ? AT_SYMLINK_NOFOLLOW : 0;
     if (::fstatat(descriptor(), entry.name.data(), &status, kept) == 0) return EntryStatus::of(status);
-    fail(error, kErrorUnreadable,
-         fmt::format("{}/{}: {}", printable(path), printable(entry.name), std::strerror(errno)));
+    fail(error, kErrorUnreadable, std::strerror(errno), {fmt::format("{}/{}", path, entry.name)});
     return std::nullopt;
 }
 

@@ -40,16 +40,15 @@ bool FileReader::read(std::uint64_t offset, std::span<std::uint8_t> into) const 
 std::optional<std::vector<std::uint8_t>> readAll(const RandomAccessReader& reader, std::string_view name,
                                                  std::uint64_t limit, Error* error) {
     if (reader.size() > limit) {
-        fail(error, kErrorTooLarge,
-             fmt::format("{}: {} bytes are over the limit of {}", printable(name), reader.size(), limit));
+        fail(error, kErrorTooLarge, fmt::format("{} bytes are over the limit of {}", reader.size(), limit),
+             {std::string(name)});
         return std::nullopt;
     }
     std::vector<std::uint8_t> bytes(reader.size());
     errno = 0;
     if (reader.read(0, bytes)) return bytes;
-    fail(error, kErrorUnreadable,
-         fmt::format("{}: {}", printable(name),
-                     errno != 0 ? std::strerror(errno) : "shrank while it was read"));
+    fail(error, kErrorUnreadable, errno != 0 ? std::strerror(errno) : "shrank while it was read",
+         {std::string(name)});
     return std::nullopt;
 }
 

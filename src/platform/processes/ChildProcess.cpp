@@ -85,8 +85,7 @@ std::unique_ptr<ChildProcess> ChildProcess::start(const std::string& program,
             id = SpawnPlan(theirs.number(), theirMemory.number()).start(program, arguments);
     }
     if (!id) {
-        fail(error, kErrorUnreadable,
-             fmt::format("{}: cannot be started: {}", printable(program), std::strerror(errno)));
+        fail(error, kErrorUnreadable, fmt::format("cannot be started: {}", std::strerror(errno)), {program});
         return nullptr;
     }
     ::fcntl(ours.number(), F_SETFL, O_NONBLOCK);

@@ -27,9 +27,9 @@ struct RegularExpression::Implementation {
         const bool found = uregex_findNext(expression.get(), &status) != 0;
         if (U_SUCCESS(status)) return found;
         const char* reason = status == U_REGEX_TIME_OUT ? "takes too long" : u_errorName(status);
-        return fail(error, kErrorTooLarge,
-                    fmt::format("regular expression \"{}\" on \"{}\": {}", printable(pattern),
-                                printable(utf8FromUtf16(text)), reason));
+        return fail(
+            error, kErrorTooLarge, reason,
+            {.part = fmt::format("regular expression \"{}\" on \"{}\"", pattern, utf8FromUtf16(text))});
     }
 };
 
@@ -50,9 +50,8 @@ std::optional<RegularExpression> RegularExpression::compile(std::string_view pat
     made->expression.reset(
         uregex_open(wide.data(), static_cast<int32_t>(wide.size()), flags, &place, &status));
     if (U_FAILURE(status)) {
-        fail(error, kErrorMalformed,
-             fmt::format("regular expression \"{}\", character {}: {}", printable(pattern), place.offset,
-                         u_errorName(status)));
+        fail(error, kErrorMalformed, u_errorName(status),
+             {.part = fmt::format("regular expression \"{}\", character {}", pattern, place.offset)});
         return std::nullopt;
     }
     uregex_setTimeLimit(made->expression.get(), kTimeLimit, &status);

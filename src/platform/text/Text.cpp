@@ -1,5 +1,7 @@
 #include "platform/text/Text.h"
 
+#include "platform/base/Utf8.h"
+
 #include <algorithm>
 #include <charconv>
 #include <memory>
@@ -11,28 +13,9 @@
 #include <unicode/normalizer2.h>
 #include <unicode/uchar.h>
 #include <unicode/unistr.h>
-#include <unicode/utf8.h>
 
 namespace qvct {
 namespace {
-
-// The macros of ICU convert without casts.
-#pragma GCC diagnostic push
-#pragma GCC diagnostic ignored "-Wconversion"
-/// The character at `i`, which moves behind it; negative for malformed bytes.
-UChar32 nextCharacter(std::string_view text, int32_t& i, int32_t end) {
-    UChar32 c = 0;
-    U8_NEXT(text.data(), i, end, c);
-    return c;
-}
-
-/// The character before `i`, which moves in front of it.
-UChar32 previousCharacter(std::string_view text, int32_t start, int32_t& i) {
-    UChar32 c = 0;
-    U8_PREV(text.data(), start, i, c);
-    return c;
-}
-#pragma GCC diagnostic pop
 
 icu::StringPiece piece(std::string_view text) {
     return {text.data(), static_cast<int32_t>(text.size())};
@@ -262,24 +245,6 @@ std::size_t displayWidth(std::string_view text) {
         columns += width == U_EA_WIDE || width == U_EA_FULLWIDTH ? 2 : 1;
     }
     return columns;
-}
-
-std::string printable(std::string_view text) {
-    std::string result;
-    const auto length = static_cast<int32_t>(text.size());
-    for (int32_t i = 0; i < length;) {
-        const int32_t start = i;
-        const UChar32 c = nextCharacter(text, i, length);
-        const std::string_view bytes =
-            text.substr(static_cast<std::size_t>(start), static_cast<std::size_t>(i - start));
-        if (c >= 0 && u_isprint(c)) {
-            result += bytes;
-        } else {
-            for (const char byte : bytes)
-                result += fmt::format("\\x{:02x}", static_cast<unsigned char>(byte));
-        }
-    }
-    return result;
 }
 
 }  // namespace qvct

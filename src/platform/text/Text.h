@@ -1,5 +1,7 @@
 #pragma once
 
+#include "platform/base/Printable.h"
+
 #include <string>
 #include <string_view>
 #include <vector>
@@ -51,7 +53,5 @@ std::string replaceAll(std::string_view text, std::string_view from, std::string
 double leadingNumber(std::string_view text);
 /// How many columns of a terminal the text takes.
 std::size_t displayWidth(std::string_view text);
-/// The text with every byte that is not printable UTF-8 escaped, fit for one line of a message.
-std::string printable(std::string_view text);
 
 }  // namespace qvct

@@ -127,7 +127,7 @@ TEST(Presets, KeepEveryTextThatARecordHolds) {
         record->setContentInfo(info);
         Error error;
         ASSERT_TRUE(TGRTVorthalPresetMetaDataWriter().writeMetaData(record, urlOf(path), &error))
-            << error.message;
+            << error.message();
         const auto again = read(path, 1);
         EXPECT_EQ(again->displayName(), awkward);
         EXPECT_EQ(again->subFileType(), 9);
@@ -159,22 +159,22 @@ TEST(Presets, RefuseWhatTheyCannotRewriteWithCertainty) {
         std::string text;
         const char* reason;
     } const cases[] = {
-        {"<metadata>\n<tagging>\n</tagging>\n", "a.vcp: line 1: the section does not end"},
-        {"x\n<tagging>\nName = a", "a.vcp: line 2: the section does not end"},
-        {"fine\n\xff\n", "a.vcp: line 2: not UTF-8"},
+        {"<metadata>\n<tagging>\n</tagging>\n", "a.vcp, line 1: the section does not end"},
+        {"x\n<tagging>\nName = a", "a.vcp, line 2: the section does not end"},
+        {"fine\n\xff\n", "a.vcp, line 2: not UTF-8"},
     };
     const TGRTVorthalPresetMetaDataWriter writer;
     for (const auto& c : cases) {
         const std::string path = folder.write("a.vcp", c.text);
         Error error;
         EXPECT_FALSE(writer.writeTaggings(test::taggingsOf({{"Genres", "House"}}), urlOf(path), &error));
-        EXPECT_THAT(error.message, testing::EndsWith(c.reason));
+        EXPECT_THAT(error.message(), testing::EndsWith(c.reason));
         EXPECT_EQ(readFile(path)->size(), c.text.size());
     }
     Error error;
     EXPECT_FALSE(writer.writeTaggings({}, urlOf(folder.path("absent.vcp")), &error));
     EXPECT_EQ(read(folder.write("a.vcp", "\xff"), 0, &error), nullptr);
-    EXPECT_THAT(error.message, testing::EndsWith("a.vcp: line 1: not UTF-8"));
+    EXPECT_THAT(error.message(), testing::EndsWith("a.vcp, line 1: not UTF-8"));
 }
 
 }  // namespace

@@ -80,7 +80,7 @@ AiffFile::AiffFile(ReadWindow& window, std::uint32_t form) : IffFile(window, Byt
 
 bool AiffFile::readFacts(LCAudioFacts& facts, Error* error) const {
     const Chunk* common = find(fourCC("COMM"));
-    if (common == nullptr) return fail(error, kErrorMalformed, "has no chunk 'COMM' (bytes 12 to the end)");
+    if (common == nullptr) return fail(error, kErrorMalformed, "has no chunk 'COMM'", {.offset = 12});
     BoundedCursor header = cursor(*common);
     facts.channelCount = header.u16();
     facts.frameCount = header.u32();
@@ -92,7 +92,7 @@ bool AiffFile::readFacts(LCAudioFacts& facts, Error* error) const {
     if (!checkFormat(facts, *common, error)) return false;
     const Chunk* sound = find(Chunk::Role::audio);
     if (sound == nullptr && facts.frameCount > 0) {
-        return fail(error, kErrorMalformed, "has no chunk 'SSND' (bytes 12 to the end)");
+        return fail(error, kErrorMalformed, "has no chunk 'SSND'", {.offset = 12});
     }
     constexpr std::uint64_t kSoundHeader = 8;
     const std::uint64_t bytes =

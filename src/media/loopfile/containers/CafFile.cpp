@@ -20,7 +20,8 @@ constexpr std::uint64_t kEditCount = 4;  // bytes before the audio in its chunk
 CafFile::CafFile(ReadWindow& window) : Container(window, ByteOrder::big) {
     BoundedCursor header(window, order_, 4, 2);
     const std::uint16_t version = header.u16();
-    if (version != 1) fault_ = fmt::format("version {} at byte 4 is unknown", version);
+    if (version != 1)
+        fail(&fault_, kErrorMalformed, fmt::format("version {} is unknown", version), {.offset = 4});
     walk();
 }
 
@@ -53,8 +54,9 @@ void CafFile::walk() {
         chunks_.push_back(chunk);
     }
     chunksEnd_ = at;
-    if (fault_.empty() && at < fileEnd && !areFiller(at, fileEnd)) {
-        fault_ = fmt::format("{} bytes at byte {} are no chunk that is known of", fileEnd - at, at);
+    if (!fault_.isSet() && at < fileEnd && !areFiller(at, fileEnd)) {
+        fail(&fault_, kErrorMalformed, fmt::format("{} bytes are no chunk that is known of", fileEnd - at),
+             {.offset = at});
     }
 }
 
@@ -67,10 +69,10 @@ bool CafFile::isRecord(const Chunk& chunk) const {
 bool CafFile::readFacts(LCAudioFacts& facts, Error* error) const {
     const Chunk* description = chunks_.empty() ? nullptr : chunks_.data();
     if (description == nullptr || description->id != fourCC("desc")) {
-        return fail(error, kErrorMalformed, "the first chunk, at byte 8, is not 'desc'");
+        return fail(error, kErrorMalformed, "the first chunk is not 'desc'", {.offset = 8});
     }
     if (find(Chunk::Role::audio) == nullptr) {
-        return fail(error, kErrorMalformed, "has no chunk 'data' (bytes 8 to the end)");
+        return fail(error, kErrorMalformed, "has no chunk 'data'", {.offset = 8});
     }
     if (!readFormat(*description, facts, error)) return false;
     readCafMusic(*this, facts);

@@ -20,7 +20,6 @@ class CafFile : public Container {
     explicit CafFile(ReadWindow& window);
 
     std::string_view formatName() const override { return "CAF"; }
-    std::string fault() const override { return fault_; }
     bool readFacts(LCAudioFacts& facts, Error* error) const override;
 
   protected:
@@ -34,7 +33,6 @@ class CafFile : public Container {
 
     bool endsOpen_ = false;  // with audio of size -1
     std::uint64_t chunksEnd_ = 0;
-    std::string fault_;
 };
 
 }  // namespace qvct

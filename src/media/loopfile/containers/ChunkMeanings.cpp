@@ -95,7 +95,7 @@ std::string quoted(BoundedCursor contents, std::uint64_t skipped) {
 std::string formatText(const Container& container) {
     LCAudioFacts facts;
     Error error;
-    if (!container.readFacts(facts, &error)) return ": " + error.message;
+    if (!container.readFacts(facts, &error)) return ": " + error.message();
     return fmt::format(": {} Hz, {} channels, {} bits, {} frames", facts.sampleRate, facts.channelCount,
                        facts.bitsPerSample, facts.frameCount);
 }
@@ -179,7 +179,7 @@ std::vector<LCChunk> describeChunks(const Container& container) {
     whole.id = container.isRecordAlone() ? "" : textOfCode(magic.fourCC());
     whole.size = container.window().size();
     whole.meaning = container.formatName();
-    whole.fault = container.fault();
+    whole.fault = container.fault().message();
     for (const Chunk& chunk : container.chunks()) {
         LCChunk shown;
         shown.id = textOfCode(chunk.id);

@@ -52,8 +52,8 @@ void PieceList::addRange(std::uint64_t begin, std::uint64_t end) {
 }
 
 bool failAt(Error* error, const Chunk& chunk, std::string_view reason) {
-    return fail(error, kErrorMalformed,
-                fmt::format("chunk '{}' at byte {}: {}", textOfCode(chunk.id), chunk.offset, reason));
+    return fail(error, kErrorMalformed, std::string(reason),
+                {.part = fmt::format("chunk '{}'", charactersOf(chunk.id)), .offset = chunk.offset});
 }
 
 bool checkFormat(const LCAudioFacts& facts, const Chunk& chunk, Error* error) {
@@ -82,7 +82,7 @@ std::unique_ptr<Container> Container::open(ReadWindow& window, std::string_view 
         if (magic == fourCC("caff")) return std::make_unique<CafFile>(window);
     }
     if (LoopDataFile::isName(name)) return std::make_unique<LoopDataFile>(window);
-    fail(error, kErrorMalformed, "is no WAV, AIFF, AIFC, CAF or loop data file (bytes 0 to 11)");
+    fail(error, kErrorMalformed, "is no WAV, AIFF, AIFC, CAF or loop data file", {.offset = 0});
     return nullptr;
 }
 
@@ -115,9 +115,8 @@ bool Container::areFiller(std::uint64_t begin, std::uint64_t end) const {
 }
 
 std::optional<std::vector<FilePiece>> Container::rewritten(const std::string& record, Error* error) const {
-    const std::string wrong = fault();
-    if (!wrong.empty()) {
-        fail(error, kErrorMalformed, wrong);
+    if (fault_.isSet()) {
+        if (error != nullptr) *error = fault_;
         return std::nullopt;
     }
     if (record.size() > kLargestRecord) {

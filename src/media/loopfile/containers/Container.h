@@ -61,7 +61,7 @@ class PieceList {
 
 /// A file format that consists of chunks. One class per format knows how to list, find and replace them.
 ///
-/// Messages name the chunk and its byte offset; the caller puts the path before them.
+/// Errors name the chunk and its byte offset; the caller adds the path.
 class Container {
   public:
     /// Chunks beyond this number are not looked at, and such a file is not rewritten.
@@ -84,8 +84,8 @@ class Container {
     BoundedCursor cursor(const Chunk& chunk) const { return {window_, order_, chunk.contents, chunk.size}; }
 
     virtual std::string_view formatName() const = 0;
-    /// What is wrong with the whole; empty when nothing is.
-    virtual std::string fault() const { return {}; }
+    /// What is wrong with the whole; not set when nothing is.
+    const Error& fault() const { return fault_; }
     /// Whether it is our record and nothing else.
     virtual bool isRecordAlone() const { return false; }
     /// Format and music; an error when the file is no sound audio file.
@@ -109,9 +109,10 @@ class Container {
     ReadWindow& window_;
     ByteOrder order_;
     std::vector<Chunk> chunks_;
+    Error fault_;
 };
 
-/// "chunk 'fmt ' at byte 12: reason"; always false.
+/// Fails at the chunk; always false.
 bool failAt(Error* error, const Chunk& chunk, std::string_view reason);
 
 /// Whether a file can have that many frames a second and channels.

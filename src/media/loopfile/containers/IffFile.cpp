@@ -71,7 +71,9 @@ void IffFile::walk(std::uint64_t formSize, bool isOpenEnded) {
     const std::uint64_t fileEnd = window_.size();
     const std::uint64_t declaredEnd = kChunkHeader + formSize;
     formEnd_ = isOpenEnded ? fileEnd : std::clamp(declaredEnd, std::min(kFormHeader, fileEnd), fileEnd);
-    if (isOpenEnded) fault_ = "the form at byte 4 has no size, as a recording that was cut off";
+    const ErrorPlace sizeOfForm{.part = "form", .offset = 4};
+    if (isOpenEnded)
+        fail(&fault_, kErrorMalformed, "has no size, as a recording that was cut off", sizeOfForm);
     std::uint64_t at = kFormHeader;
     while (formEnd_ >= at + kChunkHeader && chunks_.size() < kMostChunks) {
         Chunk chunk = chunkAt(at);
@@ -100,12 +102,14 @@ void IffFile::walk(std::uint64_t formSize, bool isOpenEnded) {
     if (areFiller(at, formEnd_)) formEnd_ = at;
     if (isOpenEnded) return;
     if (at < formEnd_) {
-        fault_ = fmt::format("{} bytes at byte {} are no chunk that is known of", formEnd_ - at, at);
+        fail(&fault_, kErrorMalformed, fmt::format("{} bytes are no chunk that is known of", formEnd_ - at),
+             {.offset = at});
     }
     // A size that is too large is common, and harmless where all chunks are whole.
     const bool isCutOff = chunks_.empty() || chunks_.back().fault != nullptr || at < formEnd_;
     if (declaredEnd > fileEnd && isCutOff) {
-        fault_ = fmt::format("the form at byte 4 claims {} bytes, the file has {}", declaredEnd, fileEnd);
+        fail(&fault_, kErrorMalformed, fmt::format("claims {} bytes, the file has {}", declaredEnd, fileEnd),
+             sizeOfForm);
     }
 }
 
@@ -142,8 +146,8 @@ std::optional<std::vector<FilePiece>> IffFile::piecesWith(const std::string& rec
     }
     if (!canGrowTo(formSize)) {
         fail(error, kErrorTooLarge,
-             fmt::format("with the record the form at byte 4 would have {} bytes, more than its size can say",
-                         formSize));
+             fmt::format("with the record it would have {} bytes, more than its size can say", formSize),
+             {.part = "form", .offset = 4});
         return std::nullopt;
     }
     PieceList pieces;

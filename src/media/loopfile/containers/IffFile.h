@@ -11,8 +11,6 @@ namespace qvct {
 /// the chunks follows it. Pad bytes that are missing are added.
 class IffFile : public Container {
   public:
-    std::string fault() const override { return fault_; }
-
   protected:
     using Container::Container;
 
@@ -47,7 +45,6 @@ class IffFile : public Container {
     std::string recordChunk(const std::string& record) const;
 
     std::uint64_t formEnd_ = 0;  ///< At most the file's.
-    std::string fault_;
 };
 
 }  // namespace qvct

@@ -93,8 +93,8 @@ std::string_view WavFile::formatName() const {
 bool WavFile::readFacts(LCAudioFacts& facts, Error* error) const {
     const Chunk* format = find(fourCC("fmt "));
     const Chunk* data = find(fourCC("data"));
-    if (format == nullptr) return fail(error, kErrorMalformed, "has no chunk 'fmt ' (bytes 12 to the end)");
-    if (data == nullptr) return fail(error, kErrorMalformed, "has no chunk 'data' (bytes 12 to the end)");
+    if (format == nullptr) return fail(error, kErrorMalformed, "has no chunk 'fmt '", {.offset = 12});
+    if (data == nullptr) return fail(error, kErrorMalformed, "has no chunk 'data'", {.offset = 12});
     if (!readFormat(*format, *data, facts, error)) return false;
     readWavMusic(*this, facts);
     return true;
