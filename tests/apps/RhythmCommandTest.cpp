@@ -387,7 +387,7 @@ TEST(RhythmCommand, TellsWhatIsDamagedInAMidiFile) {
     const ToolResult partly = rhythm({cut});
     EXPECT_EQ(partly.status, 0);
     EXPECT_EQ(partly.json()[0]["onsets"].size(), 2U);
-    EXPECT_THAT(partly.errors, HasSubstr("cut.mid: byte "));
+    EXPECT_THAT(partly.errors, HasSubstr("cut.mid, byte "));
     EXPECT_EQ(rhythm({cut, "--quiet"}).errors, "");
     const ToolResult nothing = rhythm({folder.write("none.mid", emptyMidi().substr(0, 24))});
     EXPECT_EQ(nothing.status, 1);
@@ -402,7 +402,7 @@ TEST(RhythmCommand, EveryMidiFileOfTheCorpusGivesWhatCanBeReadOrAReason) {
         const ToolResult result = rhythm({file});
         ASSERT_THAT(result.status, testing::AnyOf(0, 1)) << file << result.errors;
         if (result.status == 1) {
-            EXPECT_THAT(result.errors, HasSubstr(file));
+            EXPECT_THAT(result.errors, HasSubstr(std::filesystem::path(file).filename().string()));
             EXPECT_EQ(result.json(), json::array());
             continue;
         }
