@@ -204,7 +204,7 @@ TEST(LoopFileWrite, ARecordBeforeOrBetweenTheAudioIsReplacedWithoutTouchingTheSo
                 const auto data = read(path);
                 data->setDisplayName(std::string(length, 'n'));
                 Error error;
-                ASSERT_TRUE(write(path, data, &error, {})) << error.message;
+                ASSERT_TRUE(write(path, data, &error, {})) << error.message();
                 EXPECT_EQ(read(path)->displayName(), data->displayName());
                 EXPECT_EQ(samplesOf(path), samples);
             }
