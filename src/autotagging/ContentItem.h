@@ -18,8 +18,8 @@ class TGRTMetaData;
 /// A content item as it is prepared for tagging, listing and indexing: its XML description, its record and
 /// what its chunks say, each read on first use, once.
 ///
-/// Whoever asks several things about an item hands one of these around; the item's own file is opened once.
-/// It shows the item as it was when it was read. Not thread-safe.
+/// Code that asks several things about an item hands one of these around, so that the item's own file is
+/// opened once. It shows the item as it was when it was read. Not thread-safe.
 class QVCT_API ContentItem {
   public:
     /// How the record is to be read: MetaDataReaderOptions, and the taxonomy in which labels are resolved;

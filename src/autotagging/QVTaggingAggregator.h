@@ -19,9 +19,10 @@ class ContentItem;
 
 /// Derives tags for content items: asks every tagging service that the options name and merges their answers.
 ///
-/// Nothing is kept between calls but what the services cache. An aggregator works from one thread at a time:
-/// the keyword service does, and records are read in the shared writable default taxonomy, which they may add
-/// labels to. Threads that are to work at the same time each take an `independentTaggingAggregator`.
+/// Nothing is kept between calls but what the services cache. Use an aggregator from one thread at a time:
+/// the keyword service requires it, and records are read in the shared writable default taxonomy, to which
+/// they may add labels. Threads that are to work at the same time each take an
+/// `independentTaggingAggregator`.
 class QVCT_API QVTaggingAggregator {
   public:
     using Services = std::vector<std::shared_ptr<QVCTAutoTaggingService>>;
@@ -34,15 +35,15 @@ class QVCT_API QVTaggingAggregator {
     static std::shared_ptr<QVTaggingAggregator> independentTaggingAggregator();
     /// With rules and keywords of the host's own; nothing stands for the built-in ones.
     static std::shared_ptr<QVTaggingAggregator> initWithRules(Settings rules, Settings keywordMapping);
-    /// The services of such an aggregator, in the order in which it asks them: to be handed, with services of
-    /// the host's own, to a subclass.
+    /// The services of such an aggregator, in the order in which it asks them. A subclass can pass them on
+    /// together with services of the host's own.
     static Services defaultTaggingServicesWithRules(Settings rules, Settings keywordMapping);
 
     virtual ~QVTaggingAggregator() = default;
 
     /// What the services say: each tag dictionary once. Labels need not be known to any taxonomy.
     TagDictionarySet tagsWithContentsOfURL(const URL& url, std::uint64_t options);
-    /// The same of an item of which something may have been read already. Its record counts as it was read,
+    /// The same for an item of which parts may have been read already. Its record is used as it was read,
     /// whatever the options.
     TagDictionarySet tagsOfItem(const std::shared_ptr<ContentItem>& item, std::uint64_t options);
     /// The same as taggings. Labels that the taxonomy does not know are dropped.
@@ -56,9 +57,9 @@ class QVCT_API QVTaggingAggregator {
     const std::shared_ptr<TGRTTaxonomy>& taxonomy() const { return taxonomy_; }
     void setTaxonomy(std::shared_ptr<TGRTTaxonomy> taxonomy) { taxonomy_ = std::move(taxonomy); }
 
-    // What the services are given of an item: prepared once a call, each null where the item has none. A host
-    // that has one at hand overrides. What the base class answers during a call stems from the item at hand,
-    // so that no file is opened twice.
+    // What the services are given of an item: prepared once for each call, and null where the item has none.
+    // A host that already has one of these overrides the operation. During a call the base class answers from
+    // the item that is being tagged, so that no file is opened twice.
 
     /// The XML description in or beside the item.
     virtual std::shared_ptr<QVCTXMLDocument> xmlDocumentForURL(const URL& url);

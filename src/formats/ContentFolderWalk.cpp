@@ -17,7 +17,7 @@ class Walk {
         links_.push_back(start);
     }
 
-    /// Links come last, so that a folder has the path where it lies, whatever points to it.
+    /// Links come last, so that a folder is walked under its real path, whatever links point to it.
     bool run() {
         bool goesOn = true;
         for (; goesOn && !links_.empty(); links_.pop_front()) goesOn = enter(links_.front());
@@ -71,7 +71,8 @@ class Walk {
         }
     }
 
-    /// What stands there, behind links. A link that leads nowhere is told when its name promises content.
+    /// The kind of the entry, links followed. A link that leads nowhere is reported when its name promises
+    /// content.
     EntryKind kindReached(const ContentFolder& folder, const FolderListing::Entry& entry, ContentKind kind) {
         if (entry.kind != EntryKind::link) return entry.kind;
         Error error;

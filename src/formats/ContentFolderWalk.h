@@ -24,7 +24,7 @@ struct ContentFolder {
 
 /// Called for each folder; answers whether to go on.
 using ContentFolderVisitor = std::function<bool(const ContentFolder& folder)>;
-/// Told the path of what cannot be read, and the reason.
+/// Called with the path of what cannot be read, and the reason.
 using WalkFailure = std::function<void(const std::string& path, const Error& error)>;
 
 /// The walk of `walkContent`, folder by folder: a folder's items, then its folders by name.

@@ -16,9 +16,9 @@ enum class ContentKind : unsigned char {
 /// Tells which names are those of content: the extension is that of a kind that the framework knows, the name
 /// is not hidden, and it is not that of the recorded preview of another item.
 ///
-/// Data files (".data") do not count: half of the world's programs call files so, and only a search through
-/// all of its bytes tells whether one carries a record. Who names one can read it.
-/// @cost  Extensions are remembered.
+/// Data files (".data") do not count: countless programs use that extension, and only a search through all
+/// bytes tells whether a file carries a record. A caller that names one can read it.
+/// @cost  Each extension is looked up once and remembered.
 class ContentNames {
   public:
     ContentKind kindOf(std::string_view name);

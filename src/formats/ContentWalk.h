@@ -12,14 +12,15 @@ namespace qvct {
 
 /// What a walk does with links, and whom it tells.
 struct WalkedLinks {
-    /// Who writes to the items should say none: else files outside of the folder are written to, too.
+    /// Callers that write to the items should choose `none`; otherwise files outside of the folder are
+    /// written to, too.
     LinksOutside outside = LinksOutside::files;
     /// Called for each link that is not followed; may be empty.
     std::function<void(const URL& link)> passedOver;
 };
 
-/// Calls `item` for every content item at or below `path`: those of a folder by name, then those below it. It
-/// answers whether to go on.
+/// Calls `item` for every content item at or below `path`: those of a folder by name, then those below it.
+/// The callback answers whether to go on.
 ///
 /// Folders are walked; a bundle is an item, what lies inside it is not; pipes, sockets and devices are none.
 /// Links to folders are followed as `links` says, after all else, to folders that were not entered yet: each

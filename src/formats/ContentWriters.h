@@ -20,10 +20,11 @@ struct ContentWriteOptions {
     /// Audio files: the new file is compared with the old one before it takes its place, and abandoned when
     /// more than our record differs.
     bool verifies = false;
-    /// Every check is made that a write makes, and nothing is written: whether it would be is the answer.
+    /// All checks of a write are made, but nothing is written; the result says whether it would be.
     bool isDryRun = false;
-    /// The state of the file that holds the record (`recordURL`) when what is written was decided; another
-    /// one is an error, and what another program saved stays. Without it, the state when the call begins.
+    /// The state that the file with the record (`recordURL`) had when the caller decided what to write. If it
+    /// has changed since, the write fails and what another program saved stays. Without it, the state at the
+    /// beginning of the call counts.
     std::optional<FileStamp> expected = std::nullopt;
 };
 

@@ -17,8 +17,8 @@ class RandomAccessReader;
 
 /// The file that lies at an item's URL: opened on first use, once, and what it says parsed once.
 ///
-/// It stays open as long as this lives. What cannot be opened or parsed is not tried again; the reason is
-/// told each time. Of a folder or a missing file there is nothing. Not thread-safe.
+/// It stays open as long as this object lives. A file that cannot be opened or parsed is not tried again; the
+/// same error is given each time. Folders and missing files count as unreadable. Not thread-safe.
 class QVCT_API ItemFile {
   public:
     /// Looks at nothing yet.

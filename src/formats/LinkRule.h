@@ -6,8 +6,8 @@
 
 namespace qvct {
 
-/// What a walk does with a link that leads out of the folder at which it began. A link that stays within is
-/// followed always.
+/// What a walk does with a link that leads out of the folder in which it began. A link that stays inside is
+/// always followed.
 enum class LinksOutside {
     none,   ///< Passes over all: nothing outside of the folder is touched.
     files,  ///< Takes files and bundles, and does not enter folders.
@@ -21,7 +21,7 @@ class QVCT_API LinkRule {
     LinkRule(const std::string& folder, LinksOutside outside);
 
     /// Whether the link at a path may be followed. `entersFolder` when it leads to a folder to be walked.
-    /// @cost  No look at the disk where every link is followed, else the resolution of one path.
+    /// @cost  None where every link is followed; else the resolution of one path on the disk.
     bool follows(const std::string& link, bool entersFolder) const;
 
   private:

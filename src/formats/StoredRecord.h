@@ -17,15 +17,15 @@ namespace qvct {
 
 // Each holds the item's turn (`EditLock`) from the read to the write.
 
-/// `change` makes the new bytes of the old (none for a file that is not there), or fills the error.
+/// `change` turns the old bytes (none for a file that is not there) into the new ones, or fills the error.
 bool changeStoredFile(
     const URL& item, const std::string& path,
     const std::function<std::optional<std::string>(const std::string& stored, Error* error)>& change,
     Error* error, const ContentWriteOptions& options);
 
-/// The same for a property list. Entries that `change` leaves alone stay, in their order. A new file is XML,
-/// and so is one that was text of any form; a binary one stays binary. One that cannot be read as a
-/// dictionary is not written over.
+/// The same for a property list. Entries that `change` leaves alone stay, in their order. A new file, or one
+/// that was text in any form, is written as XML; a binary one stays binary. A file that cannot be read as a
+/// dictionary is never written over.
 bool changeStoredDictionary(const URL& item, const std::string& path,
                             const std::function<void(PropertyList::Dictionary&)>& change, Error* error,
                             const ContentWriteOptions& options);

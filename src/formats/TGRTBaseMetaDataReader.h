@@ -15,8 +15,8 @@ class ItemFile;
 
 /// Base of all readers. It reads nothing itself.
 ///
-/// Readers are immutable: several threads may use one, as far as its taxonomy allows. A writable taxonomy
-/// grows by the labels that a file holds and it does not know.
+/// Readers are immutable: several threads may use one, as far as its taxonomy allows. Reading adds a file's
+/// unknown labels to a writable taxonomy.
 class QVCT_API TGRTBaseMetaDataReader : public TGRTMetaDataReader, public TGRTTaggingsReader {
   public:
     /// Null without a taxonomy.
@@ -28,7 +28,7 @@ class QVCT_API TGRTBaseMetaDataReader : public TGRTMetaDataReader, public TGRTTa
     /// The file that holds the record of the item at a URL: the item, unless its kind keeps it elsewhere.
     virtual URL recordURLForURL(const URL& url) const { return url; }
 
-    /// In which labels are resolved.
+    /// The taxonomy in which labels are resolved.
     const std::shared_ptr<TGRTTaxonomy>& taxonomy() const { return taxonomy_; }
 
     std::shared_ptr<TGRTMetaData> readMetaDataFromURL(const URL& url, std::uint64_t options,
@@ -47,7 +47,7 @@ class QVCT_API TGRTBaseMetaDataReader : public TGRTMetaDataReader, public TGRTTa
     explicit TGRTBaseMetaDataReader(std::shared_ptr<TGRTTaxonomy> taxonomy)
         : taxonomy_(std::move(taxonomy)) {}
 
-    /// Whether the extension, in lower case, is one of those.
+    /// Whether the extension, put into lower case, is one of those given.
     static bool isExtensionIn(std::string_view extension, std::span<const std::string_view> lowercased);
 
   private:

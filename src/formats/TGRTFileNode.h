@@ -27,8 +27,9 @@ class QVCT_API TGRTFileNode : public Object, public FileURLNode {
 
     URL fileURL() const override { return url_; }
 
-    /// The shared validator of the kind of content that lies at a URL; null when none takes it for its own.
-    /// The kinds that the extension tells come first, then loops, then any audio file whatever its name.
+    /// The shared validator of the kind of content that lies at a URL; null when no validator accepts it.
+    /// Kinds that have an extension of their own are asked first, then loops, then any audio file whatever
+    /// its name.
     static std::shared_ptr<const TGRTContentNodeTypeValidator> validatorForFileURL(const URL& url);
     std::shared_ptr<const TGRTContentNodeTypeValidator> validator() const {
         return validatorForFileURL(url_);

@@ -27,8 +27,8 @@ class QVCT_API TGRTMetaDataReader {
   public:
     virtual ~TGRTMetaDataReader() = default;
 
-    /// The record that the item stores; null when it stores none or cannot be read. Only the second sets the
-    /// error.
+    /// The record that the item stores; null when it stores none, and null with an error when it cannot be
+    /// read.
     virtual std::shared_ptr<TGRTMetaData> readMetaDataFromURL(const URL& url, std::uint64_t options,
                                                               Error* error = nullptr) const = 0;
     /// `readUUID:fileType:taggings:keyValues:options:forFileURL:`. Fills what is not null: without a record
@@ -37,7 +37,7 @@ class QVCT_API TGRTMetaDataReader {
     virtual bool readUUID(std::string* uuid, std::int64_t* fileType, ObjectSet<TGRTTagging>* taggings,
                           ObjectSet<TGRTKeyValue>* keyValues, std::uint64_t options,
                           const URL& url) const = 0;
-    /// What an item is that says nothing of it.
+    /// The file type of an item that stores none.
     virtual std::int64_t defaultFileType() const { return kFileTypeNone; }
 };
 

@@ -20,8 +20,7 @@ class QVCT_API TGRTPackage : public Object {
     /// Identifier and display name of the packs that are known.
     using Names = std::vector<std::pair<std::string, std::string>>;
 
-    /// An empty pack, with the display name that the product knows for it, else
-    /// its identifier.
+    /// An empty pack. Its display name is the one in the resources, or else the identifier.
     static std::shared_ptr<TGRTPackage> packageWithIdentifier(std::string identifier);
 
     /// The identifiers of the packs that a record's taggings name, in their order.

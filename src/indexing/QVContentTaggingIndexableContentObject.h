@@ -16,8 +16,8 @@ namespace qvct {
 ///
 /// The elements of its sets are meant to be read through their own protocols:
 /// QVContentTaggingIndexableTaggingData, QVContentTaggingIndexableValueData and
-/// QVContentTaggingDependencyItem. Those hold texts and numbers of their own and stay valid whatever becomes
-/// of the taxonomy; what else the elements are leads into it.
+/// QVContentTaggingDependencyItem. What these answer are texts and numbers of their own, which stay valid
+/// whatever becomes of the taxonomy; everything else about the elements depends on it.
 class QVCT_API QVContentTaggingIndexableContentObject {
   public:
     virtual ~QVContentTaggingIndexableContentObject() = default;

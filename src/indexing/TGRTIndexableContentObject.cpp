@@ -31,7 +31,7 @@ const Taggings& taggingsOfCategory(const CategoryTaggings& byCategory, std::stri
     return hit == byCategory.end() ? none : hit->second;
 }
 
-/// The mapped tagging as one of the taxonomy's own; null when it has no place beside what the item has.
+/// The mapped tagging with the taxonomy's own tag; null when it must not be added to what the item has.
 std::shared_ptr<TGRTTagging> additionForMappedTagging(const TGRTTagging& mapped,
                                                       const CategoryTaggings& byCategory,
                                                       const TGRTTaxonomy& taxonomy) {
@@ -43,8 +43,8 @@ std::shared_ptr<TGRTTagging> additionForMappedTagging(const TGRTTagging& mapped,
     return TGRTTagging::initWithTag(taxonomy.findTagForLabel(mapped.label(), category), mapped.level());
 }
 
-/// The tag of the retired vocabulary that a tagging names. It is looked up anew: the taxonomy that the
-/// tagging's own tag hangs in may be gone, and with it the parent that the mapping asks for.
+/// The tag of the retired vocabulary that a tagging names. It is looked up anew: the taxonomy of the
+/// tagging's own tag may be gone, and with it the parent that the mapping needs.
 std::shared_ptr<TGRTTag> legacyTagForTagging(const TGRTTagging& tagging, const TGRTTaxonomy& legacyTaxonomy) {
     const OptionalLabel parent =
         tagging.parentLabel().empty() ? std::nullopt : OptionalLabel(tagging.parentLabel());
@@ -114,7 +114,7 @@ Taggings TGRTIndexableContentObject::taggingsByAddingVirtualTagsToTaggings(const
                                                                            const TGRTMetaData* metaData,
                                                                            const TGRTTaxonomy& taxonomy) {
     const CategoryTaggings byCategory = taggingsByCategory(taggings);
-    // Hosts put the ancestors into their own tables: they are worked out here, and not handed over.
+    // The ancestors are computed here but not handed over: hosts put them into tables of their own.
     Taggings withAncestors = taggings;
     withAncestors.insertAll(virtualTaggings(taggings, byCategory));
 

@@ -39,8 +39,8 @@ class QVCT_API TGRTIndexableContentObject : public Object, public QVContentTaggi
     static std::shared_ptr<TGRTIndexableContentObject> init();
 
     /// The object of the item at a file URL. Null for another URL, and, unless kIndexWithoutRecord is set,
-    /// for an item without record or file type; the error is set only where there is something wrong with the
-    /// URL or the item, even when an object comes back.
+    /// for an item without record or file type; the error is set whenever something is wrong with the URL or
+    /// the item, even if an object is returned.
     static std::shared_ptr<TGRTIndexableContentObject> indexableContentObjectForURL(const URL& url,
                                                                                     std::uint64_t options,
                                                                                     Error* error = nullptr);
@@ -64,12 +64,12 @@ class QVCT_API TGRTIndexableContentObject : public Object, public QVContentTaggi
     /// whose label the taggings have already.
     static Taggings virtualTaggings(const Taggings& taggings,
                                     const CategoryTaggings& categoryTaggingsMapping);
-    /// All given taggings, and for every keyword of the retired loop vocabulary among them what it is called
-    /// today, with the level that the mapping table gives it.
+    /// All given taggings, and for every keyword of the retired loop vocabulary among them its present-day
+    /// tag, with the level that the mapping table gives it.
     ///
-    /// Not added are tags that the taxonomy lacks, tags that the item has already in that category (its own
-    /// level stands), and effects at level 0: a table says by these that the effect is not heard, which is no
-    /// reason to find the item under it.
+    /// Not added are tags that the taxonomy lacks, tags that the item already has in that category (its own
+    /// level stays), and effects at level 0: with these a table says that the effect is not heard, so the
+    /// item must not be found under it.
     static Taggings adjustTaggings(const Taggings& taggings, const CategoryTaggings& categoryTaggingsMapping,
                                    const TGRTTaxonomy& taxonomy);
     /// Without level. Null for no label, and when the taxonomy has no such tag.

@@ -194,8 +194,9 @@ void QVCTKeywordExtractor::scanForCandidates(std::string_view text) {
     if (mayFoldIntoMore) scanFolded(foldCase(text));
 }
 
-// Letters that only case folding makes equal to a keyword's show in the folded text. Folding moves characters
-// about and makes a letter of a mark, so here a place is only passed over when ASCII stands on both sides.
+// Letters that equal a keyword's only after case folding are found in the folded text. Folding changes
+// offsets and can turn a mark into a letter, so here a place is passed over only when ASCII stands on both
+// sides.
 void QVCTKeywordExtractor::scanFolded(std::string_view text) {
     for (std::size_t start = 0; start < text.size(); ++start) {
         if (Neighbours(text, start).areInsideAsciiWordOrGap()) continue;

@@ -26,8 +26,8 @@ class LiteralTrie;
 ///
 /// The result is that of one case-insensitive expression per keyword. To get there faster, one pass looks at
 /// every place where a word begins or ends for the keywords that start there; a plain word is decided on the
-/// spot, by what stands behind it, and any other by its expression. Expressions that need nothing certain are
-/// always run.
+/// spot, by what stands behind it, and any other by its expression. Expressions without a text that must
+/// occur are always run.
 ///
 /// Use one extractor from one thread at a time: it fills its cache of expressions as it goes.
 class QVCT_API QVCTKeywordExtractor {

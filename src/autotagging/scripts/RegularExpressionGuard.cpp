@@ -12,7 +12,7 @@ namespace {
 
 using Deadline = std::chrono::steady_clock::time_point;
 
-/// Steps that take an engine a few hundredths of a second.
+/// A number of steps that an engine takes in a few hundredths of a second.
 constexpr double kHarmlessSteps = 1e7;
 /// Bytes that ICU may use for backtracking.
 constexpr int32_t kBacktrackingStack = 64 << 20;
@@ -21,7 +21,7 @@ struct Closer {
     void operator()(URegularExpression* expression) const { uregex_close(expression); }
 };
 
-/// How the text's length enters into the worst number of steps.
+/// The form of a pattern, as far as it decides how the number of steps grows with the text's length.
 struct Choices {
     int count = 0;           // of quantifiers and alternatives
     bool areNested = false;  // a quantifier applies to a group
@@ -109,7 +109,7 @@ class Translation {
         isInClass_ = c != u']';
     }
 
-    /// ICU's own classes know more than ASCII.
+    /// Spelled out, since ICU's own classes contain more than ASCII.
     void escape() {
         if (rest_.empty()) return;
         const char16_t c = take();

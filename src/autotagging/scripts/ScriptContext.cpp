@@ -23,7 +23,7 @@ using Clock = std::chrono::steady_clock;
 /// Seconds of work between two looks at the limits.
 constexpr double kSlice = 0.01;
 constexpr std::size_t kLongestMessage = 4096;
-/// What a script may use up beyond its limits before the process ends, where that is allowed.
+/// How far a script may exceed its limits before the process is ended, where that is allowed.
 constexpr std::chrono::milliseconds kHardTime{1000};
 constexpr std::size_t kHardMemory = std::size_t{64} << 20;
 
@@ -75,8 +75,8 @@ JSValueRef property(JSContextRef context, JSObjectRef object, std::string_view n
     return engine().JSObjectGetProperty(context, object, scriptString(name).get(), exception);
 }
 
-/// Writes the first letter of a word as an escape, wherever the word stands: in texts, expressions and names
-/// it stays the same, but no keyword may be written so. What follows a backslash is no keyword anyway.
+/// Replaces the first letter of each occurrence of a word by an escape: in texts, expressions and names that
+/// means the same, but keywords must not contain escapes. A word behind a backslash is no keyword anyway.
 std::string withoutKeyword(std::string text, std::string_view word) {
     const std::string escape = fmt::format("\\u{:04x}", static_cast<unsigned char>(word.front()));
     for (std::size_t at = text.find(word); at != std::string::npos; at = text.find(word, at + 1)) {
@@ -87,8 +87,8 @@ std::string withoutKeyword(std::string text, std::string_view word) {
     return text;
 }
 
-/// A rule's text as the engine gets it: "async" and "import", which would go on after the script's end, are
-/// keywords no more.
+/// A rule's text as it is given to the engine: "async" and "import", whose work would go on after the
+/// script's end, are no longer keywords.
 struct Prepared {
     ScriptString text;
     bool isOwn = false;
@@ -106,7 +106,7 @@ const Prepared& prepared(std::string_view script) {
     return kept.emplace(std::move(key), std::move(made)).first->second;
 }
 
-/// The engine's words, and why it does not know what every other engine does.
+/// The engine's message; where it may be about "async" or "import", with the reason why these are unknown.
 std::string withReason(const std::string& problem, std::string_view script) {
     const bool mayMissKeyword =
         problem.starts_with("SyntaxError") &&
@@ -140,7 +140,8 @@ struct ScriptContext::Implementation {
         engine().JSContextGroupClearExecutionTimeLimit(group->reference());
         current = outer;
         engine().JSGlobalContextRelease(context);
-        // A machine that was stopped may hold much memory: the thread's next context begins with a new one.
+        // A virtual machine that was stopped may hold much memory, so the thread's next context gets a new
+        // one.
         if (stop != Stop::none && groupOfThisThread() == group) groupOfThisThread().reset();
     }
 
@@ -183,8 +184,8 @@ struct ScriptContext::Implementation {
         return stop == Stop::none;
     }
 
-    /// Asked by the machine once a slice is over. Must ask for the next slice itself, even when it says stop:
-    /// calls into the machine from our own functions may swallow the stopping.
+    /// Called by the machine at the end of each slice. It has to request the next slice itself, even when it
+    /// says stop: calls into the machine from our own functions may swallow the stop.
     static bool shouldTerminate(JSContextRef context, void* self) {
         auto& implementation = *static_cast<Implementation*>(self);
         if (Clock::now() >= implementation.deadline) {
@@ -240,7 +241,7 @@ JSClassRef ScriptContext::Implementation::documentClass() {
     return made;
 }
 
-/// `console` is an object of our own, since the engine's takes longer to make than most scripts run.
+/// `console` is an object of our own, since making the engine's takes longer than most scripts run.
 void ScriptContext::Implementation::defineLog() {
     const JSObjectRef logFunction = engine().JSObjectMakeFunctionWithCallback(context, nullptr, logMessage);
     const JSObjectRef console = engine().JSObjectMake(context, nullptr, nullptr);

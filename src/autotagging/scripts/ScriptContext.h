@@ -13,9 +13,9 @@ namespace qvct {
 
 class QVCTXMLDocument;
 
-/// What a script may use up. Time is that of the whole evaluation, checked about every ten milliseconds;
-/// memory is what the script's objects take, checked as often, so that one single operation can go beyond it.
-/// Processes that allow it (`HardLimit`) are ended when a script cannot be stopped otherwise.
+/// What a script may use up. Time is that of the whole evaluation; memory is what the script's objects take.
+/// Both are checked about every ten milliseconds, so that a single operation can exceed them. Processes that
+/// allow it (`HardLimit`) are ended when a script cannot be stopped otherwise.
 struct ScriptLimits {
     std::chrono::milliseconds time{1000};
     std::size_t memory = std::size_t{64} << 20;
@@ -30,9 +30,9 @@ inline constexpr int kMostScriptMessages = 100;
 
 /// A fresh global object in which one rule's script runs, with its limits.
 ///
-/// Contexts of one thread share a virtual machine, which makes them cheap, and nothing that scripts can see.
-/// Faults are logged as "JavaScript Exception: ..."; after one the context goes on, after a limit was reached
-/// it does nothing any more. Use a context from the thread that made it, and one at a time.
+/// Contexts of one thread share a virtual machine, which makes them cheap, but nothing that scripts can see.
+/// Faults are logged as "JavaScript Exception: ..."; a context can be used after a fault, but does nothing
+/// any more once a limit was reached. Use a context from the thread that made it, and one at a time.
 /// @cost  About a tenth of a millisecond for making one.
 class ScriptContext {
   public:
@@ -46,7 +46,7 @@ class ScriptContext {
     /// Makes the document's three operations callable as the global `document`. It must outlive the context.
     void exposeDocument(const QVCTXMLDocument& document);
 
-    /// Runs a program. Whether it ended without a fault.
+    /// Runs a program. False when it ended with a fault.
     bool evaluate(std::string_view script);
 
     /// Calls the global function without arguments and converts the array that it returns: objects become
@@ -57,7 +57,7 @@ class ScriptContext {
     /// Whether a limit was reached.
     bool isStopped() const;
 
-    /// Whether the text is a program, else where it is not.
+    /// Whether the text is a valid program; else false, and an error that says where it is not.
     static bool checkSyntax(std::string_view script, Error* error = nullptr);
 
   private:

@@ -14,7 +14,7 @@ namespace {
 /// Seconds between 1970 and 2001, where property lists begin to count.
 constexpr double kReferenceDate = 978307200;
 
-/// Converts with a count of what is left of the bounds. The first failure ends everything.
+/// Converts values and counts down what is left of the bounds. The first failure ends the conversion.
 class Converter {
   public:
     Converter(JSContextRef context, std::string& problem) : context_(context), problem_(problem) {}

@@ -9,7 +9,8 @@
 #include <string_view>
 #include <type_traits>
 
-/// Passing values between scripts and us. Includes the engine's header: for the .cpp files of scripts only.
+/// Conversion of values to and from scripts. Includes the engine's header: for the .cpp files of this folder
+/// only.
 namespace qvct {
 
 struct ScriptStringReleaser {
@@ -23,8 +24,8 @@ std::string textOf(JSStringRef string);
 /// The value as a script's `String(value)` gives it; empty and `exception` set where that fails.
 std::string textOf(JSContextRef context, JSValueRef value, JSValueRef* exception);
 
-/// Converts an array that a script returned. Nothing when it is none or too large, or when a getter throws;
-/// `problem` is then the reason, unless the script is being stopped.
+/// Converts an array that a script returned. Nothing when the value is no array or too large, or when a
+/// getter throws; `problem` is then the reason, unless the script is being stopped.
 std::optional<PropertyList::Array> arrayOf(JSContextRef context, JSValueRef value, std::string& problem);
 
 }  // namespace qvct

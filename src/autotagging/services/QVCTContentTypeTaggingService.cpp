@@ -20,7 +20,7 @@ constexpr std::string_view kMidiLoop = "MIDI Loop";
 constexpr std::string_view kOneShot = "One Shot";
 constexpr std::string_view kSample = "Sample";
 
-/// What was prepared of one item, and the labels that it gets.
+/// What is known of one item, and the labels that it gets.
 struct Item {
     const URL& url;
     const QVCTXMLDocument* xml;
@@ -32,12 +32,12 @@ struct Item {
     std::int64_t subType() const { return record == nullptr ? 0 : record->subFileType(); }
 };
 
-/// Whether a chunk says so, or the length in beats is known, which nobody gives to a single sound.
+/// Whether a chunk says so, or the length in beats is known, which is never given for a single sound.
 bool isLoop(const Item& item) {
     return item.file != nullptr && (item.file->hasLoopTypeChunks() || item.file->beatCount() > 0);
 }
 
-/// "Deep House 122bpm.aif" is something to be played in time, even if its chunks do not tell.
+/// "Deep House 122bpm.aif" is meant to be played in time, even if its chunks do not say so.
 bool namesATempo(const URL& url) {
     thread_local RegularExpression tempo =
         *RegularExpression::compile("\\d\\s?bpm\\b", RegularExpression::Case::insensitive);

@@ -8,9 +8,9 @@ namespace qvct {
 
 /// Grades the rhythm of a loop: "Rhythmic Density" and "Rhythmic Complexity", each with a level in [0, 1].
 ///
-/// A loop that holds MIDI is judged by the notes of its first track; a loop of sound, or audio that says that
-/// it is one, by its onsets. Files that say to be no loop get nothing, nor do loops without tempo, length or
-/// signature, and those in 5 or 7. Stateless: safe from every thread.
+/// A loop that holds MIDI is judged by the notes of its first track; a loop of sound, or audio that claims to
+/// be one, by its onsets. Files that say that they are no loop get nothing, nor do loops without tempo,
+/// length or signature, or with 5 or 7 beats to the bar. Stateless: safe from every thread.
 class QVCTRhythmicTaggingService : public QVCTAutoTaggingService {
   public:
     TagDictionarySet tagsWithContentsOfURL(const URL& url,

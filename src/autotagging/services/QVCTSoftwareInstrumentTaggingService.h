@@ -9,8 +9,8 @@ namespace qvct {
 
 /// Tags a patch with its active software instruments, by the names of their plug-ins.
 ///
-/// What counts as one says the script `ExtractSoftwareInstrumentsRule.js` of the resource folder, or the one
-/// inside the library. Immutable: safe from every thread, each with documents of its own.
+/// The script `ExtractSoftwareInstrumentsRule.js` of the resource folder, or else the one inside the library,
+/// decides what counts as one. Immutable: safe from every thread, each with documents of its own.
 class QVCTSoftwareInstrumentTaggingService : public QVCTAutoTaggingService {
   public:
     static std::shared_ptr<QVCTSoftwareInstrumentTaggingService> init();

@@ -10,8 +10,8 @@ namespace qvct {
 
 /// Tags an item as the user's own work when it lies outside the content packs.
 ///
-/// An item belongs to a pack when its record names one, or when it lies in a folder that is called as a pack
-/// is: by its identifier or its display name. Immutable: safe from every thread.
+/// An item belongs to a pack when its record names one, or when it lies in a folder that has a pack's
+/// identifier or display name. Immutable: safe from every thread.
 class QVCTUserGeneratedTaggingService : public QVCTAutoTaggingService {
   public:
     QVCTUserGeneratedTaggingService();

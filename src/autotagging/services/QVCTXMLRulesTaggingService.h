@@ -60,8 +60,8 @@ class QVCT_API QVCTXMLRulesTaggingService : public QVCTAutoTaggingService {
     /// All rules, with syntax errors, missing tags and files, unknown types: for the authors of rules.
     std::vector<RuleDescription> rules() const;
 
-    /// The outcome of every rule without a problem, whether it gives tags or not. What the log says meanwhile
-    /// begins with the rule's number.
+    /// The outcome of every rule without a problem, whether it gives tags or not. Messages logged meanwhile
+    /// begin with the rule's number.
     std::vector<RuleOutcome> outcomesForXMLDocument(const std::shared_ptr<QVCTXMLDocument>& document) const;
 
   private:

@@ -17,7 +17,7 @@ using Condition = LocationPath::Condition;
 using Comparison = LocationPath::Comparison;
 using Relation = LocationPath::Relation;
 
-/// Positions are counted for each predicate of a step.
+/// Most predicates of a step: for each of them positions are counted.
 constexpr std::size_t kMostPredicates = 8;
 
 bool isNamed(const xmlChar* name, const xmlNs* nameSpace, const std::string& wanted) {
@@ -76,7 +76,7 @@ bool holds(const Comparison& comparison, const xmlNode& element) {
     const xmlAttr* attribute = attributeNamed(element, comparison.attribute);
     if (comparison.relation == Relation::exists) return attribute != nullptr;
     if (attribute == nullptr) {
-        // A missing attribute is an empty text to a function, and nothing to an operator.
+        // For a function a missing attribute is an empty text; with an operator it never compares true.
         const bool isFunction =
             comparison.relation == Relation::contains || comparison.relation == Relation::startsWith;
         return isFunction && holdsFor(comparison, "");
@@ -171,7 +171,8 @@ class LocationPathParser {
     static bool isDigit(char c) { return c >= '0' && c <= '9'; }
     static bool isNameCharacter(char c) { return isLetter(c) || isDigit(c) || c == '-' || c == '.'; }
 
-    /// A name without prefix; one with other than ASCII letters, or a function's, is left to others.
+    /// A name without prefix. Names with other than ASCII letters, and those of functions, do not fit the
+    /// form.
     std::optional<std::string> takeName() {
         skipBlanks();
         if (rest_.empty() || !isLetter(rest_.front())) return std::nullopt;

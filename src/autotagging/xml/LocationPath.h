@@ -11,7 +11,7 @@
 
 namespace qvct {
 
-/// The everyday form of a rule's XPath expression, whose first node is found by walking down the tree.
+/// An XPath expression of the form that most rules have, whose first node is found by walking down the tree.
 ///
 /// Covers absolute paths of child elements with predicates that compare attributes with constants:
 /// `/A/B[2]/C[contains(@x,'y') and @z>=1]`. The grammar, with blanks between any two tokens:
@@ -22,8 +22,8 @@ namespace qvct {
 ///     comparison = "@" name [("=" | "!=") (text | number)] | "@" name ("<" | "<=" | ">" | ">=") number
 ///                | ("contains" | "starts-with") "(@" name "," text ")"
 ///
-/// For everything else there is the XML library; for these it gives the same answer in a tenth of the time,
-/// since it neither builds node sets nor goes on behind the first node.
+/// All other expressions are left to the XML library. For these, this gives the same answer in a tenth of the
+/// time, since it builds no node sets and stops at the first node.
 class LocationPath {
   public:
     /// Nothing when the expression is not of this form. The caller has seen that it is valid XPath.

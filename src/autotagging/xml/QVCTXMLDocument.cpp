@@ -21,8 +21,9 @@ namespace {
 /// Most JSON text that a document keeps for the next script, in bytes.
 constexpr std::size_t kMostKeptJson = std::size_t{1} << 20;
 
-/// Whether elements can be told to a parser as they stand in the tree: what was mended may have no text that
-/// is well-formed, entities are replaced only in text, and longer texts may be too long for JSON.
+/// Whether elements can be given to the JSON parser directly from the tree. Otherwise they are written as
+/// text and parsed again: a repaired document's text may not be well-formed, entities are replaced only in
+/// text, and the JSON of longer texts may grow too large.
 bool isPlain(const ParsedXml& parsed, std::string_view text) {
     constexpr std::size_t longest = kLargestForJson / 8;  // a character becomes six bytes of text at most
     return parsed.isWellFormed && parsed.tree->intSubset == nullptr && text.size() <= longest;
@@ -51,8 +52,8 @@ struct QVCTXMLDocument::Implementation {
     XmlOwned<xmlDoc> document;
     std::size_t textSize = 0;
     bool isPlain = false;
-    mutable std::optional<XPathScope> scope;  // after the document, on which it depends
-    /// By expression: the scripts of a rule set ask for the same plug-ins.
+    mutable std::optional<XPathScope> scope;  // declared after the document, which it refers to
+    /// By expression, since the scripts of a rule set ask for the same plug-ins.
     std::unordered_map<std::string, std::optional<std::string>> keptJson;
     std::size_t keptBytes = 0;
 
@@ -71,7 +72,7 @@ struct QVCTXMLDocument::Implementation {
         return compiled ? compiled->firstNode(*scope) : nullptr;
     }
 
-    /// The JSON of the element's text, which is written and read only where that may make a difference.
+    /// The JSON of an element. It is written as text and parsed again only where that may make a difference.
     std::optional<std::string> jsonOf(xmlNode* node) const {
         if (!isPlain || node->type != XML_ELEMENT_NODE)
             return QVCTXMLDocument::JSONStringWithData(QVSKXMLNode::initWithXMLNode(node)->XMLData());

@@ -51,7 +51,7 @@ class QVCT_API QVCTXMLDocument : public QVCTXMLDocumentExport {
 
     /// All selected nodes in document order; empty where `isMatchingXPath` is false.
     std::vector<std::shared_ptr<QVSKXMLNode>> nodesForXPath(std::string_view expression) const;
-    /// The first of them, or null. Does not look for the others where the expression allows it.
+    /// The first of them, or null. Where the expression allows it, the search stops there.
     std::shared_ptr<QVSKXMLNode> firstNodeForXPath(std::string_view expression) const;
     /// Whether the expression selects a node.
     bool anyNodesForXPath(std::string_view expression) const;
@@ -65,7 +65,7 @@ class QVCT_API QVCTXMLDocument : public QVCTXMLDocumentExport {
     /// The JSON of a document's XML text; nothing when it has no content.
     static std::optional<std::string> JSONStringWithData(std::string_view data);
 
-    /// The script context in which the document is exposed at this time. Not used by the document itself.
+    /// The script context that the document is exposed in at the moment. Not used by the document itself.
     std::shared_ptr<ScriptContext> context() const { return context_.lock(); }
     void setContext(const std::shared_ptr<ScriptContext>& context) { context_ = context; }
 

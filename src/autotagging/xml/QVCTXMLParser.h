@@ -51,10 +51,10 @@ class QVCTXMLParser {
     void foundCharacters(std::string_view characters);
     void parseErrorOccurred(Error error) { error_ = std::move(error); }
 
-    /// The events that the element's own text would cause, without writing and reading it. Only for trees
-    /// whose text would be well-formed and holds no references to entities, nested as deep as a parser reads.
+    /// Causes the events that parsing the element's own text would cause. Only for trees whose text would be
+    /// well-formed, holds no references to entities, and is not nested deeper than a parser reads.
     void didFindElement(const _xmlNode& element);
-    /// Whether the limit was reached: nothing was kept since.
+    /// Whether the limit was reached; nothing that came afterwards was kept.
     bool isTooLarge() const { return isTooLarge_; }
     /// Takes the container with all that the events told.
     PropertyList::Dictionary takeObject() { return elements_.front().takeDictionary(); }

@@ -17,7 +17,7 @@ bool isNameCharacter(char c) {
            c == '-' || c == '.' || static_cast<unsigned char>(c) >= 0x80;
 }
 
-/// Names and numbers are one token, other signs one each but for the pairs.
+/// A name or number is one token, and so is every other sign or two-character operator.
 std::vector<std::string_view> tokensOf(std::string_view text) {
     constexpr std::array<std::string_view, 6> pairs = {"//", "::", "..", "!=", "<=", ">="};
     std::vector<std::string_view> tokens;
@@ -42,7 +42,7 @@ bool isOneOf(std::string_view token, const std::array<std::string_view, size>& a
     return std::find(all.begin(), all.end(), token) != all.end();
 }
 
-/// Follows the grammar as far as operands go; operators are all the same to it.
+/// Follows the grammar of operands; all operators are treated alike.
 class Scan {
   public:
     explicit Scan(std::string_view expression) : tokens_(tokensOf(expression)) {}
@@ -58,8 +58,8 @@ class Scan {
   private:
     struct Operand {
         bool isSet = false;   // may be a node set
-        bool isMany = false;  // of more than one node
-        bool isText = false;  // whose texts are not attributes' own
+        bool isMany = false;  // may have more than one node
+        bool isText = false;  // its nodes' texts may be more than attribute values
     };
 
     std::string_view token(std::size_t ahead = 0) const {
@@ -148,7 +148,7 @@ class Scan {
         ++cost_.texts;
     }
 
-    /// Steps and predicates. The first step starts at one node, where its path stands by itself.
+    /// Steps and predicates. In a path that stands by itself, the first step starts at a single node.
     void takeSteps(Operand& operand, bool isFirst) {
         bool isStepDue = isFirst;
         while (true) {

@@ -5,7 +5,7 @@
 namespace qvct {
 namespace {
 
-/// What all steps take at most, see kMostXPathSteps.
+/// The time that kMostXPathSteps take at most.
 constexpr std::chrono::duration<double> kTimeOfAllSteps{1};
 
 XPathDeadline::Clock::time_point& endOfThread() {

@@ -4,8 +4,8 @@
 
 namespace qvct {
 
-/// While one lives, expressions that its thread evaluates take no more steps than fit into the time until
-/// then. Deadlines may be nested: the earliest counts.
+/// While one lives, the expressions that its thread evaluates take no more steps than fit into the time that
+/// is left. Deadlines may be nested: the earliest counts.
 class XPathDeadline {
   public:
     using Clock = std::chrono::steady_clock;
@@ -15,7 +15,7 @@ class XPathDeadline {
     XPathDeadline& operator=(const XPathDeadline&) = delete;
     ~XPathDeadline();
 
-    /// Which share of all steps that an evaluation may take fits into the time left, from 0 to 1; 1 without a
+    /// The share, from 0 to 1, of the steps of an evaluation that fits into the time left; 1 without a
     /// deadline.
     static double shareOfSteps();
 

@@ -20,7 +20,7 @@ namespace {
 /// Most expressions that a thread keeps; scripts may make up new ones without end.
 constexpr std::size_t kMostCachedExpressions = 1024;
 
-/// Where the numbers of faults in expressions begin among those of all faults.
+/// The number of the first XPath fault among the library's error codes.
 constexpr int kFirstReason = XML_XPATH_EXPRESSION_OK;
 
 std::string_view reasonOf(int code) {
@@ -104,7 +104,7 @@ XPathScope::XPathScope(_xmlDoc& document) : context_(xmlXPathNewContext(&documen
 
 const XmlExtent& XPathScope::extent() {
     if (extent_) return *extent_;
-    xmlXPathOrderDocElems(context_->doc);  // two elements are put in order without a walk between them
+    xmlXPathOrderDocElems(context_->doc);  // makes comparing the order of two elements cheap
     return extent_.emplace(extentOf(*context_->doc));
 }
 
@@ -117,7 +117,7 @@ bool XPathScope::holdsTooMuchText(const XPathCost& cost) {
 }
 
 std::size_t XPathScope::workOfStep(const XPathCost& cost) {
-    constexpr std::size_t bytesOfWork = 8;  // as many are copied in the time of one comparison
+    constexpr std::size_t bytesOfWork = 8;  // so many are copied in the time of one comparison
     const XmlExtent& all = extent();
     std::size_t bytes = all.longestAttribute;
     if (cost.readsText) bytes += cost.isJoin ? all.elementTexts : all.text;
@@ -141,7 +141,7 @@ std::shared_ptr<const XPathExpression> XPathExpression::compile(std::string_view
     auto expression = std::make_shared<XPathExpression>();
     expression->text_ = text;
     expression->compiled_.reset(xmlXPathCtxtCompile(context.get(), xmlText(expression->text_.c_str())));
-    // The library finds these when it comes to them, in some documents and not in others.
+    // The library reports these only when evaluation reaches them, in some documents and not in others.
     const auto unknown = expression->compiled_ ? unknownXPathName(text) : std::nullopt;
     if (unknown) raised = syntaxError(text, unknown->offset, unknown->reason);
     if (!expression->compiled_ || unknown) {

@@ -17,19 +17,20 @@ namespace qvct {
 /// Longest expression in bytes, and most steps of one evaluation (less than a second's worth).
 inline constexpr std::size_t kLongestXPath = std::size_t{64} << 10;
 inline constexpr unsigned long kMostXPathSteps = 20'000'000;
-/// Most nodes that are compared or merged, and bytes of text copied, unseen by the count of steps: an
-/// expression that may do so takes as many steps less as the document is large. About a second's worth.
+/// Bounds the work that the count of steps does not include: nodes compared or merged, and bytes of text
+/// copied. An expression that may cause such work is allowed fewer steps, the fewer the larger the document
+/// is. About a second's worth.
 inline constexpr unsigned long kMostXPathWork = 2'000'000'000;
 /// Most text that an evaluation may hold at once.
 inline constexpr std::size_t kMostXPathText = std::size_t{16} << 20;
 
-/// The place where one document's expressions are evaluated: no name spaces, no context node, limits on the
-/// work, messages to the log.
+/// The context in which expressions are evaluated over one document: without name spaces or a context node,
+/// with limits on the work; messages go to the log.
 class XPathScope {
   public:
     explicit XPathScope(_xmlDoc& document);
 
-    /// Whether the last evaluation came to its end: with more steps, others may find more.
+    /// Whether the last evaluation came to its end. If not, one with more steps may find more.
     bool isComplete() const { return isComplete_; }
 
   private:
@@ -40,7 +41,7 @@ class XPathScope {
 
     XmlOwned<_xmlXPathContext> context_;
     bool isComplete_ = true;
-    std::optional<XmlExtent> extent_;  // when an expression first needs it
+    std::optional<XmlExtent> extent_;  // computed when an expression first needs it
 };
 
 /// A compiled XPath 1.0 expression. Evaluating changes its caches: use one from one thread at a time.
@@ -49,8 +50,8 @@ class XPathExpression {
     /// Nothing and an error with the character where the expression goes wrong.
     static std::shared_ptr<const XPathExpression> compile(std::string_view text, Error* error = nullptr);
 
-    /// The same from this thread's cache, so that a rule is compiled once, and a wrong one told once: by the
-    /// error, or by the log where none is asked for.
+    /// The same from this thread's cache, so that a rule is compiled once and a wrong one is reported once:
+    /// through the error, or in the log where the caller asks for no error.
     static std::shared_ptr<const XPathExpression> cached(std::string_view text, Error* error = nullptr);
 
     /// The selected nodes in document order; empty when the result is no node set, or when a limit was

@@ -64,7 +64,7 @@ bool isBlank(char c) {
     return c == ' ' || c == '\t' || c == '\r' || c == '\n';
 }
 
-/// Why the name, behind which `rest` follows, means nothing; empty when it may mean something.
+/// Why the name, which `rest` follows, is not defined; empty when it may be.
 std::string problemOf(std::string_view name, std::string_view rest) {
     const std::string_view next = rest.substr(endOf(rest, 0, isBlank));
     if (rest.starts_with(':') && !rest.starts_with("::") && name != "xml")

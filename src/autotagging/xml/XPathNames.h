@@ -7,7 +7,7 @@
 
 namespace qvct {
 
-/// A name in an expression that nothing stands behind.
+/// A name in an expression that is not defined.
 struct UnknownXPathName {
     std::size_t offset = 0;  ///< Where it begins, in bytes.
     std::string reason;

@@ -62,7 +62,8 @@ class Measurement {
         return node.type == XML_ENTITY_REF_NODE ? textOfEntity(node) : sizeOf(node.content);
     }
 
-    /// The same for each reference, and none while it is being asked: an entity that holds itself has none.
+    /// Computed once for all references; 0 while it is being computed, so that an entity that contains itself
+    /// adds nothing.
     std::size_t textOfEntity(const xmlNode& reference) {
         const xmlEntity* entity = xmlGetDocEntity(reference.doc, reference.name);
         if (entity == nullptr) return 0;

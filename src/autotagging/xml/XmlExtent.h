@@ -6,8 +6,8 @@
 
 namespace qvct {
 
-/// How much there is in a document that expressions may look at. Texts are in bytes, with their entities
-/// replaced: a reference counts as often as it stands there.
+/// How much there is in a document for expressions to look at. Texts are counted in bytes with their entities
+/// replaced, so that an entity counts once for each reference to it.
 struct XmlExtent {
     std::size_t nodes = 0;         ///< Elements, attributes, texts and the like.
     std::size_t ids = 0;           ///< Attributes that identify their element.

@@ -7,7 +7,7 @@ namespace qvct {
 // Writers of loops and audio files. Only the record is touched (see `LCFileWriter`).
 //
 // A loop writer differs from its base in `isLoopType` alone: it keeps the file's loop type. The base clears
-// it on purpose, since it is handed out only for files that are no loops.
+// it on purpose, since it is used only for files that are no loops.
 
 class TGRTAudioFileTaggingWriter : public TGRTTaggingsWriter {
   public:
@@ -23,8 +23,8 @@ class TGRTAudioFileContentInfoWriter : public TGRTContentInfoWriter {
                           Error* error = nullptr, const ContentWriteOptions& options = {}) const override;
 };
 
-/// Writes taggings, content info and display name. Key values, file type and UUID are not written: the music
-/// stays as the file says it.
+/// Writes taggings, content info and display name. Key values, file type and UUID are not written: what the
+/// file says about the music stays.
 class TGRTAudioFileMetaDataWriter : public TGRTMetaDataWriter {
   public:
     virtual bool isLoopType() const { return false; }

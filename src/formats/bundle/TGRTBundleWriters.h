@@ -32,8 +32,8 @@ class TGRTBundleContentInfoWriter : public TGRTContentInfoWriter {
                           Error* error = nullptr, const ContentWriteOptions& options = {}) const override;
 };
 
-/// Writes the record over the property list: an entry that no record has is lost, unless the record was read
-/// from a list with such an entry.
+/// Replaces the record in the property list. Other entries are removed, except those with a key that the list
+/// from which the record was read had, too.
 class TGRTBundleMetaDataWriter : public TGRTMetaDataWriter {
   public:
     virtual std::string plistPathComponent() const { return std::string(QVContentTaggingTagsPlistName); }

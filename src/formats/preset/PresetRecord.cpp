@@ -55,7 +55,7 @@ std::optional<PropertyList> flagOf(std::string_view text) {
     return PropertyList(text == kTrue);
 }
 
-/// What an item says of the tag before it; nothing for other items and for values that make no sense.
+/// What an item says about the tag before it; nothing for other items and for invalid values.
 std::optional<PropertyList> propertyOfTag(const PresetText::Item& item) {
     if (item.key == QVContentTaggingWeightKeyName) return numberOf(item.value);
     return item.key == QVContentTaggingAutoTaggingKeyName ? flagOf(item.value) : std::nullopt;
@@ -67,8 +67,8 @@ std::optional<PropertyList> propertyOfApplication(const PresetText::Item& item) 
     return item.key == QVContentInfoLegacyKey ? flagOf(item.value) : std::nullopt;
 }
 
-/// What the items of a section say, and which of them say it: the others make no sense where they stand, and
-/// stay there.
+/// What the items of a section say, and which of them say it: the others are not understood where they stand,
+/// and stay there.
 template <typename Value>
 struct Reading {
     Value value;
@@ -130,7 +130,7 @@ struct Description {
 Reading<Description> readDescription(const PresetText& preset) {
     Reading<Description> reading;
     std::optional<std::string> current;
-    std::size_t keyAt = 0;  // its item counts as read when a value of it was, and none was not
+    std::size_t keyAt = 0;  // the key's item; it counts as read if it has values and all of them were read
     bool hasStrangeValue = false;
     for (const auto& [key, value] : preset.items(kMetaData)) {
         const bool isNumber = key == kNumber || key == QVContentTaggingSubTypeKeyName;

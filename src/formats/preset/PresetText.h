@@ -42,10 +42,10 @@ class PresetText {
     };
     std::vector<Section> sections() const;
 
-    /// Replaces the items of a section that are marked (`isReplaced` has one entry for each of `items`) by
-    /// `replacement`, which takes the place of the first of them, or follows the section's last line; but it
-    /// follows all other items that have one of the `keys`, lest these be read as parts of it. A section that
-    /// is not there is added at the end, unless there is nothing to put into it.
+    /// Replaces the marked items of a section (`isReplaced` has one entry for each of `items`) by
+    /// `replacement`. That takes the place of the first marked item, or else follows the section's last line;
+    /// but it always comes after all other items that have one of the `keys`, lest these be read as parts of
+    /// it. A missing section is added at the end, unless there is nothing to put into it.
     void setItems(std::string_view section, const std::vector<std::string_view>& keys,
                   const std::vector<bool>& isReplaced, const Items& replacement);
 
@@ -57,7 +57,7 @@ class PresetText {
   private:
     struct Line {
         std::string bytes;    // with what ends it
-        std::string section;  // in which it stands, its opening and closing lines included; else empty
+        std::string section;  // the one it belongs to, as its opening and closing lines do; else empty
         enum { opening, inside, closing } role = inside;
     };
 

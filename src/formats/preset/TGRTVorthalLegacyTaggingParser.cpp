@@ -34,8 +34,8 @@ std::string_view lineAround(std::string_view text, std::size_t offset) {
     return text.substr(start, end - start);
 }
 
-/// The codes of the first attribute line. The token is taken to open its line: that many characters are cut
-/// from the line's start, wherever the token stands.
+/// The codes of the first attribute line. The token is assumed to begin its line: as many characters as it
+/// has are cut from the line's start, wherever it stands.
 std::vector<std::string> attributeCodes(std::string_view text) {
     const std::size_t token = text.find(kToken);
     if (token == std::string_view::npos) return {};
