@@ -26,7 +26,7 @@ std::unordered_map<std::string_view, const PropertyList*> valuesByKey(const Dict
     return values;
 }
 
-/// What is stored, with the difference between what it was understood as and what it is to be.
+/// What is stored, changed in what differs between `before`, as which it was understood, and `after`.
 Dictionary changed(const Dictionary& stored, const Dictionary& before, const Dictionary& after) {
     const auto old = valuesByKey(before);
     const auto wanted = valuesByKey(after);
@@ -56,14 +56,14 @@ PropertyList changed(const PropertyList& stored, const PropertyList& before, con
     return areDictionaries ? changed(*stored.dictionary(), *before.dictionary(), *after.dictionary()) : after;
 }
 
-/// How the elements of an array stand for items.
+/// How the elements of a stored array are turned into items and back.
 template <typename Item>
 struct Elements {
     /// Null for what is no item.
     std::function<std::shared_ptr<Item>(const PropertyList& element)> read;
     /// Nothing for an item that cannot be stored.
     std::function<std::optional<PropertyList>(const std::shared_ptr<Item>&)> write;
-    /// What stays when an item changes.
+    /// What identifies an item even when the rest of it changes.
     std::function<std::string(const Item&)> name;
 };
 
@@ -106,7 +106,7 @@ class ArrayChange {
         }
     }
 
-    /// Where the item stands, also several times; else where one of its name stands that is no more.
+    /// All places of the item; if there are none, the place of an item with its name that is no longer held.
     std::vector<std::size_t> takePlacesOf(const Item& item) {
         auto& places = staying_[&item];
         auto& others = leaving_[elements_.name(item)];
@@ -200,7 +200,7 @@ bool isEmptyArray(const PropertyList& value) {
     return value.array() != nullptr && value.array()->empty();
 }
 
-/// What is stored with that key, unless it was emptied, or there is nothing to store.
+/// Appends the value under the key. An empty array is left out, unless one was stored there before.
 void append(Dictionary& result, const std::string& key, const PropertyList* stored, PropertyList value) {
     const bool wasEmpty = stored != nullptr && isEmptyArray(*stored);
     if (!isEmptyArray(value) || wasEmpty) result.append(key, std::move(value));

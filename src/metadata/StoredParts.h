@@ -10,11 +10,11 @@ namespace qvct {
 
 // The parts of a record as they are to be stored where something is stored already (null for nothing).
 //
-// What a part holds is told from what stands there: entries that it still holds stay as they are, those that
-// it holds no more go, others are added, and one that changed is changed in place, whatever else it carries.
-// So everything that is not understood stays: entries of strange types, strange keys of entries and of the
-// part. An array that changes is put into its written order, what is not understood behind the rest. A stored
-// value of another type counts as absent, and gives way only to a part that is not empty.
+// A part is compared with what is stored: entries that it still holds stay as they are, others are removed,
+// new ones are added, and changed ones are changed in place, keeping whatever else they carry. So everything
+// that is not understood stays: entries of unknown types, unknown keys of entries and of the part. An array
+// that changes is put into the order in which arrays are written, with what is not understood behind the
+// rest. A stored value of another type counts as absent, and is replaced only by a part that is not empty.
 
 /// @cost  All of them O(stored + held).
 PropertyList storedTaggings(const PropertyList* stored, const ObjectSet<TGRTTagging>& taggings);

@@ -15,7 +15,7 @@
 namespace qvct {
 namespace {
 
-/// A value that says the number already, in whatever type, stays.
+/// A stored value that equals the number already, in whatever type, stays as it is.
 void setInteger(std::string_view key, std::int64_t number, PropertyList::Dictionary& dictionary) {
     if (dictionary.integerValue(key) != number) dictionary.set(key, number);
 }

@@ -53,17 +53,18 @@ class QVCT_API TGRTMetaData : public Object {
 
     /// Puts the record into the dictionary that an item stores.
     ///
-    /// What the record knows nothing of stays where it stands, at every depth (see StoredParts.h); so do the
-    /// sub-type when the record has none, and the content info when it has none. A stored UUID is removed.
+    /// Entries that a record does not know stay where they are, at every depth (see StoredParts.h). So do a
+    /// stored sub-type and content info if the record has none. A stored UUID is removed.
     void storeInto(PropertyList::Dictionary& stored) const;
-    /// The same for an item whose dictionary is the record's alone: an entry beside those of a record goes,
-    /// unless this record was read from a dictionary with such an entry, and so do sub-type and content info
-    /// when the record has none.
+    /// The same for an item whose dictionary holds nothing but the record: other entries are removed, except
+    /// those with a key that the dictionary from which this record was read had, too. A stored sub-type and
+    /// content info are removed if the record has none.
     void storeOver(PropertyList::Dictionary& stored) const;
     /// What to store at the URL: this record put into the property list that is stored there, by `storeInto`.
     ///
-    /// When nothing is stored there it starts empty. So it does when what is there cannot be read, or holds
-    /// more behind its end, but then the error says so: whoever writes the result destroys what is there.
+    /// When nothing is stored there it starts empty. It also starts empty when what is there cannot be read,
+    /// or is followed by other bytes. Then the error says so, since writing the result would destroy what is
+    /// there.
     PropertyList::Dictionary prepareDictionaryForURL(const URL& url, Error* error = nullptr) const;
 
     /// The record that a dictionary holds; null without dictionary. Entries that are not of their type count

@@ -5,13 +5,13 @@
 
 namespace qvct {
 
-/// The first line of a table that says what the tags of a retired vocabulary have become. Fields are
+/// The first line of a table that maps the tags of a retired vocabulary to those of today. Fields are
 /// separated by ";", without quoting.
 inline constexpr std::string_view kLegacyMappingHeader =
     "Type;Legacy Keyword;Legacy Keyword Sub;New Taxonomy Keyword 1;New Taxonomy Keyword 2;"
     "New Taxonomy Keyword 3;New Taxonomy Keyword 4;Comments, Questions";
 
-/// Where in a row a field stands, and how many there are.
+/// The place of each field in a row, and the number of fields.
 enum LegacyMappingField : std::size_t {
     kLegacyMappingType = 0,
     kLegacyMappingKeyword = 1,

@@ -24,8 +24,8 @@ class QVCTCompiledResources {
     /// What `compiledResourceWithData` makes of the bytes.
     enum Kind : int { kPropertyList = 0, kText = 1, kTextLines = 2 };
 
-    /// The property list, the text, or the text's lines (split at every "\n", which leaves an empty last one
-    /// behind a final line break). No data is logged and, like an unknown kind, answers nothing.
+    /// The property list, the text, or the text's lines (split at every "\n", so that a final line break
+    /// gives an empty last line). Empty data is logged and, like an unknown kind, answers nothing.
     static Resource compiledResourceWithData(std::span<const unsigned char> data, int type);
 
     static std::optional<PropertyList::Dictionary> DefaultTaxonomyPlist();

@@ -40,7 +40,7 @@ bool isUsable(const ResourceFile& resource, const std::string& path, Error* erro
     return text && (!resource.name.ends_with("TaxonomyMapping") || isMappingTable(*text, path, error));
 }
 
-/// What was found of a file, and in which state it was then.
+/// Whether a file was found usable, and the state that it was in then.
 struct Verdict {
     FileStamp stamp;
     bool isUsable = false;
@@ -54,7 +54,7 @@ Verdict judge(const ResourceFile& resource, const std::string& path, FileStamp s
     return verdict;
 }
 
-/// The verdicts that were reached, by path: there are no more than resources.
+/// The latest verdict on each file, by path. There are no more of them than resources.
 class Verdicts {
   public:
     std::optional<Verdict> of(const std::string& path, FileStamp stamp) {
@@ -64,7 +64,7 @@ class Verdicts {
         return isOfNow ? std::optional(known->second) : std::nullopt;
     }
 
-    /// Whether it is new: another thread may have come to the same meanwhile.
+    /// Keeps the verdict. False when another thread has reached the same one meanwhile.
     bool set(const std::string& path, const Verdict& verdict) {
         const std::lock_guard lock(mutex_);
         Verdict& known = verdicts_[path];

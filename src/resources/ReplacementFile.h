@@ -28,8 +28,8 @@ inline constexpr ResourceFile kResourceFiles[] = {{"DefaultTaxonomy", "plist"},
                                                   {"ExtractSoftwareInstrumentsRule", "js"}};
 
 /// The path of the file that replaces a resource: the one that `ResourceBundle` finds, provided that it is
-/// what the resource is. Nothing when there is none, or when it is broken; the built-in resource is to be
-/// used then. A broken file is told to the log once for each of its states, and to `error` each time.
+/// valid for that resource. Nothing when there is none or it is broken; use the built-in resource then. A
+/// broken file is logged once for each of its states, and reported to `error` each time.
 /// @cost  One look at the file; its bytes are read when it is new or has changed. Safe from every thread.
 std::optional<std::string> replacementFile(const ResourceFile& resource, Error* error = nullptr);
 
@@ -38,8 +38,8 @@ std::optional<std::string> replacementFile(const ResourceFile& resource, Error* 
 std::optional<PropertyList::Dictionary> readResourceDictionary(std::string_view name, const std::string& path,
                                                                Error* error = nullptr);
 
-/// What `read` makes of the path of the replacement file, or else what `builtIn` gives. Both answer an
-/// optional value.
+/// What `read` makes of the replacement file at a path; if there is none, what `builtIn` gives. Both answer
+/// an optional value.
 template <typename Read, typename BuiltIn>
 auto replacedOrBuiltIn(const ResourceFile& resource, Read read, BuiltIn builtIn) {
     const auto path = replacementFile(resource);

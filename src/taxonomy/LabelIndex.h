@@ -19,8 +19,8 @@ struct LabelKey {
     std::size_t hash;
 };
 
-/// Finds the tags of a category by their labels, so that a search does not walk the tree. It knows what is
-/// certain alone: a tree that was changed by anything but creating tags is to be searched.
+/// Finds the tags of a category by their labels, so that a search does not walk the tree. It only answers
+/// what is certain: after any change of the tree other than creating tags, the tree has to be searched.
 class LabelIndex {
   public:
     /// `exact` says that no other tag of the tree can have the label.
@@ -47,7 +47,7 @@ class LabelIndex {
         const auto hit = byLabel_.find(label);
         return hit == byLabel_.end() ? Answer{nullptr, true} : Answer{hit->second, hit->second != nullptr};
     }
-    /// Counts changes, for whoever keeps something that he derived from the tags.
+    /// Counts changes, for code that caches something derived from the tags.
     std::uint64_t revision() const { return revision_; }
 
   private:

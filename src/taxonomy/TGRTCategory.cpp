@@ -28,12 +28,12 @@ void TGRTCategory::setIdentifier(std::string identifier) {
 
 void TGRTCategory::addTag(const std::shared_ptr<TGRTTag>& tag) {
     if (!tag) return;
-    // A root tag that equals one that is here changes nothing.
+    // Adding a root tag that equals an existing one changes nothing.
     if (!tag->parent() && tag->children().empty() && tags_.contains(*tag)) return;
     const auto parent = tag->parent();
     const bool isOfThisTree = tag->category().get() == this && (!parent || parent->category().get() == this);
-    // A tag that equals another one is only found below its own parent, and one from elsewhere brings a tree
-    // along, which may grow without this category being told.
+    // A tag that equals another one can only be found below its own parent; a tag from elsewhere brings a
+    // subtree along, which may grow without this category noticing.
     if (!tags_.insert(tag) || !isOfThisTree || !tag->children().empty()) return treeChanged();
     index_->add(*tag, tag->label());
 }

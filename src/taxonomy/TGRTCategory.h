@@ -41,9 +41,9 @@ class QVCT_API TGRTCategory : public Object,
     /// Does not change hash and equality, which are those of the identifier at creation.
     void setIdentifier(std::string identifier);
 
-    /// Lets the tag join; its children do not come along. Null is ignored.
+    /// Adds the tag without its children. Null is ignored.
     void addTag(const std::shared_ptr<TGRTTag>& tag);
-    /// Takes the tag out; its children stay. Null is ignored.
+    /// Removes the tag without its children. Null is ignored.
     void removeTag(const std::shared_ptr<TGRTTag>& tag);
     /// Whether an equal tag is here, at any depth.
     bool doesContain(const TGRTTag& tag) const;

@@ -24,11 +24,12 @@ class QVCT_API TGRTLegacyTaxonomyMapping {
   public:
     using Lines = std::vector<std::string>;
 
-    /// The mapping of loop keywords; null when its table is a file that is no table. Made once.
+    /// The mapping of loop keywords; null when its table comes from a file that is not a valid table. Made
+    /// once.
     static std::shared_ptr<const TGRTLegacyTaxonomyMapping> legacyLoopTaxonomyMapping();
-    /// The mapping of synth preset keywords; else as above.
+    /// The same for the keywords of synth presets.
     static std::shared_ptr<const TGRTLegacyTaxonomyMapping> legacyVorthalTaxonomyMapping();
-    /// The resource file with the table; nothing leaves it to the compiled-in copy.
+    /// The resource file with the table; nothing when the compiled-in copy is used.
     static std::optional<URL> defaultLegacyLoopTaxonomyMappingURL();
     /// The same for the table of synth presets.
     static std::optional<URL> defaultLegacyVorthalTaxonomyMappingURL();
@@ -53,7 +54,7 @@ class QVCT_API TGRTLegacyTaxonomyMapping {
     bool hasRowForLegacyTag(const TGRTTag& tag) const { return rows_.contains(mappingKeyForTag(tag)); }
     /// Type, keyword and sub-keyword, separated by ";", of the rows whose retired tag does not exist.
     const Lines& unknownLegacyKeywords() const { return unknownLegacyKeywords_; }
-    /// The new labels that the default taxonomy does not know, as often as they occur.
+    /// The new labels that the default taxonomy does not know, once for each occurrence.
     const Lines& unknownNewLabels() const { return unknownNewLabels_; }
 
   private:

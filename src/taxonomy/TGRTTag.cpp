@@ -36,7 +36,7 @@ std::shared_ptr<TGRTTag> TGRTTag::initWithLabel(std::string_view rawLabel,
         // Of two equal children the later one stays.
         parentTag->children_.erase(*tag);
         parentTag->children_.insert(tag);
-        // The own category learns of it below.
+        // This tag's own category is told below.
         if (parentTag->category() != category) parentTag->tellCategory();
     }
     if (category) category->addTag(tag);

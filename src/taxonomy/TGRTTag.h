@@ -63,8 +63,8 @@ class QVCT_API TGRTTag : public Object,
     /// The category's identifier; empty without category.
     std::string categoryIdentifier() const;
     const ObjectSet<TGRTTag>& children() const override { return children_; }
-    /// Takes the child over from its current parent's children. The child's own link upward stays as it is.
-    /// Ignored: null, and a tag that this one is or lies below, since trees have no cycles.
+    /// Moves the child here from its current parent's children. The child's own link upward stays as it is.
+    /// Ignored: null, this tag itself, and any tag above it, since trees have no cycles.
     /// @cost  O(descendants of the child).
     void addChild(std::shared_ptr<TGRTTag> tag);
     /// Takes the child out. Null is ignored.

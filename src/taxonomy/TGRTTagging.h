@@ -33,7 +33,7 @@ class QVCT_API QVContentTaggingIndexableTaggingData {
 /// One tag applied to one piece of content, with a level or without.
 ///
 /// Label, parent label and category are those of the tag at creation. Equality is that of label, level and
-/// category; whether a tagging service made it does not take part.
+/// category; whether a tagging service made it does not matter.
 class QVCT_API TGRTTagging : public Object, public QVContentTaggingIndexableTaggingData {
   public:
     /// Null for a null tag or one without label. The level may be null.
@@ -57,7 +57,7 @@ class QVCT_API TGRTTagging : public Object, public QVContentTaggingIndexableTagg
     /// levels, else the weight times 4 with one decimal.
     std::string displayString() const;
 
-    /// How weights are written that are none of the four named levels: one decimal. Shared by all threads.
+    /// Writes weights other than the four named levels: with one decimal. Shared by all threads.
     static const DecimalFormatter& doubleFormatter();
 
     /// @{

@@ -47,7 +47,7 @@ class QVCT_API TGRTTaggingCollection {
 
     /// The taggings of all nodes.
     Taggings taggings() const;
-    /// Nodes whose taggings were never set do not count; when there are no others: none.
+    /// Nodes whose taggings were never set do not count; kTaggingStateNone if there are no others.
     TaggingState taggingStateForTagging(const TGRTTagging& tagging, const std::vector<Node>& andNodes) const;
 
   private:

@@ -51,9 +51,9 @@ class QVCT_API QVContentTaggingTaxonomy {
 
 /// The catalogue of all tags: categories, each with a tree of tags.
 ///
-/// Looking up is safe from several threads as long as nobody adds; whoever adds tags to a taxonomy that
-/// others use must see to it that one works at a time. Cached taxonomies live as long as the cache or a
-/// caller keeps them; tags do not keep their taxonomy alive.
+/// Looking up is safe from several threads as long as nobody adds tags; code that adds tags to a taxonomy
+/// that other threads use must make sure that only one thread uses it at a time. Cached taxonomies live as
+/// long as the cache or a caller keeps them; tags do not keep their taxonomy alive.
 ///
 /// Labels are compared as they are, case included, and without markers ("Bright / Dark", not "Bright /
 /// Dark-+").
@@ -77,7 +77,7 @@ class QVCT_API TGRTTaxonomy : public Object, public QVContentTaggingTaxonomy {
     static std::shared_ptr<TGRTTaxonomy> legacyLoopTaxonomy();
     /// From the resource file of the type where there is one, else from the compiled-in copy.
     static std::shared_ptr<TGRTTaxonomy> newTaxonomyOfType(std::int64_t type, bool readonly, bool useCache);
-    /// The resource file of the type; nothing leaves it to the compiled-in copy.
+    /// The resource file of the type; nothing when the compiled-in copy is used.
     static std::optional<URL> taxonomyURLForType(std::int64_t type);
     /// The property list that `newTaxonomyOfType` builds from; nothing for a type without one.
     static std::optional<PropertyList::Dictionary> taxonomyDictionaryForType(std::int64_t type);
@@ -159,7 +159,7 @@ class QVCT_API TGRTTaxonomy : public Object, public QVContentTaggingTaxonomy {
                                        OptionalLabel categoryIdentifier,
                                        bool includingAncestors = false) const;
     /// @}
-    /// Adds the tag that the tagging names, if this taxonomy has it, and if asked for what it hangs below.
+    /// Adds the tag that the tagging names, if this taxonomy has it, and its ancestors if asked for.
     void appendTagsOfTagging(const TGRTTagging& tagging, ObjectSet<TGRTTag>& set,
                              bool includingAncestors) const;
     /// Changes whenever a category or tag was added, moved or renamed.
@@ -176,7 +176,7 @@ class QVCT_API TGRTTaxonomy : public Object, public QVContentTaggingTaxonomy {
     Localization localizationDictionary() const override;
     /// The same as the text of a strings table. Quotes, backslashes and line breaks are escaped.
     std::string localizedStrings() const override;
-    /// Rows, header first, from which a mapping of retired tags is filled in.
+    /// Rows, header first, of a table in which a mapping of retired tags can be filled in.
     std::vector<std::string> mappingExport() const;
     /// The row for one tag.
     std::string mappingExportForTag(const TGRTTag& tag) const;

@@ -10,8 +10,8 @@ namespace {
 
 using Case = RegularExpression::Case;
 
-/// An expression that is only run on texts that hold its telling character: labels without markers are the
-/// rule.
+/// An expression that is run only on texts that contain its characteristic character, since most labels have
+/// no markers.
 class MarkerExpression {
   public:
     MarkerExpression(const char* pattern, char tellingCharacter, Case caseMode = Case::sensitive)

@@ -20,10 +20,9 @@ QVCT_API bool containsTagWithLabel(const ObjectSet<TGRTTagging>& taggings, std::
 /// Replaces the tagging with a label by one of a new tag with the new label, which joins the old tag's parent
 /// and category. The level stays; the new tagging is no automatic one.
 ///
-/// Where the parent has a tag of the new label already, the new tag takes its place among the parent's
-/// children, and it has no children of its own: those of the tag that was there are lost when the taxonomy is
-/// next written.
-/// @return  Whether there was one. False, too, when nothing is left of the new label without its markers.
+/// If the parent already has a tag of the new label, the new tag replaces it among the parent's children
+/// without taking over its children: these are lost when the taxonomy is next written.
+/// @return  Whether there was such a tagging. Also false when the new label consists of nothing but markers.
 QVCT_API bool renameTagWithLabel(ObjectSet<TGRTTagging>& taggings, std::string_view label,
                                  std::string_view newLabel);
 

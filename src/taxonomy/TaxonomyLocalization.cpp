@@ -54,7 +54,7 @@ void addTag(Localization& strings, const TGRTTag& tag, bool reversed) {
 
 /// A string as a strings table quotes it.
 std::string quoted(std::string text) {
-    // The backslash first: the others bring some along.
+    // The backslash first, since escaping the others adds backslashes.
     constexpr std::array<std::pair<const char*, const char*>, 4> escapes = {
         {{"\\", "\\\\"}, {"\"", "\\\""}, {"\n", "\\n"}, {"\r", "\\r"}}};
     for (const auto& [plain, escaped] : escapes) text = replaceAll(text, plain, escaped);

@@ -14,13 +14,13 @@ namespace qvct {
 namespace {
 
 constexpr double kReach = 0.006;      // seconds by which an onset may be moved
-constexpr double kLikely = 0.010;     // seconds at which a rise would count for nothing
+constexpr double kLikely = 0.010;     // seconds at which the weight of a rise would reach 0
 constexpr double kStep = 0.0005;      // seconds of one sum of energy
 constexpr std::size_t kSide = 3;      // sums before and after a rise
-constexpr double kGround = 0.02;      // share of the mean energy below which differences do not count
+constexpr double kGround = 0.02;      // differences below this share of the mean energy do not count
 constexpr double kBeside = 0.010;     // seconds before and after an onset that are compared
-constexpr double kLoss = 0.78;        // what remains at least of the energy where something begins
-constexpr double kSilence = 0.001;    // share of the energy to come that is none
+constexpr double kLoss = 0.78;        // share of the energy that remains, at least, at an onset
+constexpr double kSilence = 0.001;    // less than this share of the energy to come is silence
 constexpr std::size_t kBlock = 4096;  // frames
 
 }  // namespace
@@ -53,7 +53,7 @@ class OnsetDetector::Analyser {
     }
 
     std::vector<std::int64_t> finish() {
-        // The last level is held until the last frame is judged, so that the end itself is no onset.
+        // The last sample is repeated until the last frame is judged, so that the end itself is no onset.
         mixed_.assign(kept_, samples_.empty() ? 0 : samples_.back());
         append();
         return std::move(onsets_);
@@ -62,7 +62,7 @@ class OnsetDetector::Analyser {
   private:
     void append() {
         if (mixed_.empty()) return;
-        // The first level is held before the start, so that an offset of the whole signal is no onset.
+        // The first sample is repeated before the start, so that a constant offset of the signal is no onset.
         if (samples_.empty()) samples_.assign(kept_, mixed_.front());
         samples_.insert(samples_.end(), mixed_.begin(), mixed_.end());
         const std::size_t together = SpectralFlux::kTogether * flux_.hop();
@@ -111,8 +111,8 @@ class OnsetDetector::Analyser {
         return after.signal >= kLoss * before.signal || after.slope >= kLoss * before.slope;
     }
 
-    /// A sound out of silence shows in the spectrum as soon as the window touches it, before its attack is
-    /// within reach; then a position closer to it.
+    /// A sound out of silence shows in the spectrum as soon as the window touches it, when its attack may be
+    /// out of reach. In that case a position closer to the attack; otherwise the position itself.
     std::int64_t pastSilence(std::int64_t middle) const {
         const std::size_t reach = reach_ * step_;
         for (int i = 0; i < 2; ++i) {

@@ -18,7 +18,7 @@ constexpr std::size_t kSmallestWindow = 64;
 constexpr double kLowestHertz = 40;
 constexpr double kHighestHertz = 16000;
 constexpr double kBandsPerOctave = 8;
-constexpr std::size_t kLag = 2;       // frames to the one that is compared with
+constexpr std::size_t kLag = 2;       // frames back to the one that is compared with
 constexpr float kCompression = 1000;  // The scale is logarithmic from 60 dB below the loudest band on.
 constexpr float kQuietest = 0.001F;   // Signals below do not get louder.
 constexpr double kForgetting = 0.1;   // share of the loudest level forgotten in a second
@@ -35,7 +35,8 @@ std::size_t windowSizeFor(double sampleRate) {
     }
 }
 
-// Each frame with the one two before it: the last two of the former four, then the first two of these.
+// Compares each frame with the one two before it: the last two of the former four frames, then the first two
+// of these.
 Lanes twoBefore(Lanes former, Lanes these) {
     return Lanes(__builtin_shufflevector(former.v, these.v, 2, 3, 4, 5));
 }

@@ -29,9 +29,9 @@ class SpectralFlux {
     /// Frames that are measured together.
     static constexpr std::size_t kTogether = 4;
 
-    /// The rise at each of the next kTogether frames, in octaves of magnitude. `samples` are the first
-    /// frame's; the others begin a hop later each. REQUIRES: windowSize() + (kTogether - 1) * hop() samples,
-    /// all finite.
+    /// The rise at each of the next kTogether frames, in octaves of magnitude. `samples` begin with the first
+    /// frame; each further frame begins a hop later. REQUIRES: windowSize() + (kTogether - 1) * hop()
+    /// samples, all finite.
     std::array<float, kTogether> next(const float* samples);
 
   private:

@@ -68,8 +68,8 @@ class Timeline {
         }
     };
 
-    // Versions only grow, and a run that takes another in gets a new one: an equal sum means the same two
-    // runs.
+    // Versions only grow, and a run that takes in another gets a new one; so an equal sum means that both
+    // runs are unchanged.
     bool isCurrent(const Candidate& pair) const {
         return !runs_[pair.left].notes.empty() &&
                runs_[pair.left].version + runs_[pair.right].version == pair.versions;

@@ -12,19 +12,20 @@ class LCFileData;
 
 /// Rhythmic density and complexity of an audio loop: its onsets are measured as notes of equal loudness.
 ///
-/// The first success is kept: later calls give it again, whatever they are asked. Not safe to use from two
+/// The first success is kept: later calls give it again, whatever their arguments. Not safe to use from two
 /// threads at once.
 class AudioTransientComplexity {
   public:
-    /// Measures the onsets of the loop at a URL: those of a fresh search, or the transient markers that are
-    /// stored in the file without a first one at its start and a last one at its end.
+    /// Measures the onsets of the loop at a URL: those of a fresh search, or else the transient markers
+    /// stored in the file, leaving out a first one at its start and a last one at its end.
     ///
     /// False, with the stored values left as they are, when the extension is not exactly "aif" or "caf", the
     /// file cannot be read, its metre is not measured or there is no onset.
     ///
     /// @cost  A fresh search decodes the whole file, in constant memory.
     bool computeRhythmicDensityAndComplexityUsingTransients(const URL& url, bool withNewAnalysis);
-    /// The same with what the file says at hand; while `LCFileData::openFile` is there, nothing is opened.
+    /// The same for a caller that has the file's data already; while `LCFileData::openFile` is not null,
+    /// nothing is opened.
     bool computeRhythmicDensityAndComplexityUsingTransients(const URL& url, const LCFileData& data,
                                                             bool withNewAnalysis);
 

@@ -34,7 +34,7 @@ float tripleTerm(int a, int b) {
     return static_cast<float>(std::abs(double(a) - b) * kPerVelocity / 3);
 }
 
-// The parts of one interval, the last single-precision step kept as a width so that the parts stay equal.
+// The parts of one interval. Their width is rounded to single precision once, so that all parts are equal.
 void appendParts(std::vector<Interval>& parts, double start, float width, std::int32_t count) {
     for (std::int32_t k = 0; k < count; ++k) {
         const double from = start + static_cast<double>(static_cast<float>(k) * width);

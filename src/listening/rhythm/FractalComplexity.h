@@ -16,10 +16,10 @@ class NoteLookup;
 /// cell by cell on a fine grid of time, by the velocity of the note that starts in each cell. The level
 /// scores are combined by weights into one number in [0, 1].
 ///
-/// The hierarchy is three vectors of one entry a level, the coarsest first: `divisions`, into how many parts
-/// each interval of the level above is cut, which is also the size of the groups that are compared (groups
-/// of 2 and 3 score, others score 0 but still weigh); `resolutions`, the width of the grid's cell in beats;
-/// `weights`, the share of the level in the sum.
+/// The hierarchy is three vectors of one entry a level, the coarsest first: `divisions`, the number of parts
+/// into which each interval of the level above is cut, which is also the size of the groups that are compared
+/// (groups of 2 and 3 score, others score 0 but still weigh); `resolutions`, the width of the grid's cell in
+/// beats; `weights`, the share of the level in the sum.
 ///
 /// A hierarchy that has no cell to compare gives a result that is not a number; `QVCTMidiAnalysis` turns that
 /// into 0. The steps are in single precision where the code says `float`. Stateless.

@@ -39,8 +39,8 @@ std::vector<Note> notesOfFirstTrack(const MidiSequence& sequence);
 std::vector<Note> notesOfOnsets(std::span<const std::int64_t> onsets, std::int64_t frames,
                                 std::int32_t beatCount);
 
-/// The analysis of a loop of these notes: what the tagging service and everybody else who grades a rhythm
-/// measures with.
+/// The analysis of a loop of these notes. The tagging service and everything else that grades a rhythm use
+/// it.
 std::shared_ptr<QVCTMidiAnalysis> analysisOf(const std::vector<Note>& notes, const LoopMetre& metre);
 
 }  // namespace qvct

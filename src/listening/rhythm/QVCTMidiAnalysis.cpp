@@ -73,7 +73,7 @@ void QVCTMidiAnalysis::adjustNoteTimesToZero() {
     const float length = static_cast<float>(beatCount_);
     if (!std::isfinite(last) || length <= 0 || last < length) return;
 
-    // What taking the length off again and again would leave, for any number of loop lengths.
+    // Gives what subtracting the loop length again and again would give, in one step.
     const float shift = last - std::fmod(last, length);
     for (Note& note : notes_) {
         note.startTime -= static_cast<double>(shift);

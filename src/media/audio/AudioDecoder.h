@@ -24,7 +24,7 @@ class AudioDecoder {
 
     /// Null, and an error that names the path, when the file is unreadable or no known audio.
     static std::unique_ptr<AudioDecoder> open(const std::string& path, Error* error = nullptr);
-    /// Over what is open already; `name` stands in messages.
+    /// Decodes a file that is open already; messages call it `name`.
     static std::unique_ptr<AudioDecoder> open(std::shared_ptr<const RandomAccessReader> file,
                                               std::string_view name, Error* error = nullptr);
     ~AudioDecoder();
@@ -36,8 +36,8 @@ class AudioDecoder {
     /// Length in frames as the header states it; a damaged file may give fewer.
     std::int64_t frames() const;
 
-    /// Decodes the next frames, interleaved, as many as fit into `samples`; how many came. 0 is the end, or
-    /// the first byte that cannot be decoded.
+    /// Decodes the next frames, interleaved, as many as fit into `samples`, and answers how many there were:
+    /// 0 at the end, or where the file cannot be decoded any further.
     std::size_t read(std::span<float> samples);
 
   private:

@@ -43,7 +43,7 @@ void DownMixer::mix(std::span<const float> frames, std::vector<float>& mixed) {
         for (std::size_t i = 0; i < left / 2; ++i) {
             const float* f = frame + 4 * i;
             out[i] =
-                bounded((f[0] * a + f[1] * b) + (f[2] * a + f[3] * b));  // in the order of the general way
+                bounded((f[0] * a + f[1] * b) + (f[2] * a + f[3] * b));  // in the order of the general case
         }
         frame += left / 2 * 4;
         left %= 2;

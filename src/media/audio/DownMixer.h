@@ -8,8 +8,9 @@ namespace qvct {
 
 /// Mixes interleaved channels to one and averages runs of frames to bring the rate down to about 22 kHz.
 ///
-/// A plain average: what it folds down from above is still the energy of the same moment, which is all that
-/// the search for onsets asks. The channels weigh unequally, so that opposite ones do not cancel.
+/// A plain average suffices: the high frequencies that it folds down (aliasing) are still energy of the same
+/// moment, and the search for onsets needs no more. The channels weigh unequally, so that opposite ones do
+/// not cancel.
 class DownMixer {
   public:
     DownMixer(double sampleRate, int channels);

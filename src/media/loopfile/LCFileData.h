@@ -42,16 +42,16 @@ struct LCAudioFacts {
 
 /// What a loop or plain audio file says: our record, and where that is silent the facts of the file itself.
 ///
-/// A setter that changes a value writes it into the record; one that sets the value which is there anyway
-/// leaves the record as it is, so that a rewrite does not freeze what other makers' chunks say. Keys of the
-/// record that this class does not know survive, and so does the order of the keys. Values of a wrong type or
-/// out of range in a record count as absent. Not thread-safe while it is changed.
+/// A setter that changes a value writes it into the record. Setting the value that is already in effect
+/// leaves the record as it is, so that a rewrite does not copy what other makers' chunks say into it. Keys of
+/// the record that this class does not know survive, and so does the order of the keys. Values of a wrong
+/// type or out of range in a record count as absent. Not thread-safe while it is changed.
 class LCFileData {
   public:
     using Dictionary = PropertyList::Dictionary;
 
     LCFileData() = default;
-    /// Without a record the file has none as yet.
+    /// No record means that the file has none yet.
     LCFileData(LCAudioFacts facts, std::optional<Dictionary> record);
 
     /// Whether a person or program described the file: it holds our record, or a loop editor's chunk.
@@ -89,8 +89,8 @@ class LCFileData {
     /// Quarter notes a minute; 0 is unknown. Always finite.
     float bpm() const;
     void setBpm(float value);
-    /// Plain file data knows it from the record only, enhanced data from the file's header, which counts
-    /// before the record; 0 is unknown.
+    /// In plain file data it comes from the record only; in enhanced data the file's header takes precedence
+    /// over the record. 0 is unknown.
     float lengthInSeconds() const;
     void setLengthInSeconds(float value);
 
@@ -115,14 +115,14 @@ class LCFileData {
     std::uint32_t channelCount() const { return facts_.channelCount; }
     std::uint32_t bitsPerSample() const { return facts_.bitsPerSample; }
 
-    /// The record as it is to be stored, and the facts that it stands on.
+    /// The record as it is to be stored, and the facts that apply where it is silent.
     const Dictionary& record() const { return record_; }
     const LCAudioFacts& facts() const { return facts_; }
-    /// The same record on other facts.
+    /// The same record combined with other facts.
     std::shared_ptr<LCFileData> withFacts(LCAudioFacts facts) const;
 
-    /// The file that this was read from, while its reader holds it open: who needs more of it need not open
-    /// it again. Null afterwards.
+    /// The file that this was read from, so that nobody who needs more of it has to open it again. Null once
+    /// nothing holds it open any more.
     std::shared_ptr<const RandomAccessReader> openFile() const { return file_.lock(); }
     void setOpenFile(std::weak_ptr<const RandomAccessReader> file) { file_ = std::move(file); }
 

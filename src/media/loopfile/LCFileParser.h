@@ -36,7 +36,8 @@ struct LCChunk {
 };
 
 /// Reads what loops and plain audio files say about themselves: WAV (RIFF, RIFX, RF64, BW64), AIFF, AIFC, CAF
-/// and ".loopdata", which is our record alone. The container is told by its first bytes, whatever the name.
+/// and ".loopdata", which is our record alone. The container is recognised by its first bytes, whatever the
+/// name.
 ///
 /// Only headers and descriptive chunks are read: a file of any size costs a few kilobytes and system calls.
 /// What a file claims is bounded by its size before anything is allocated. Each operation opens the file anew
@@ -44,13 +45,13 @@ struct LCChunk {
 class LCFileParser {
   public:
     static std::shared_ptr<LCFileParser> fileParserForURL(const URL& url);
-    /// Never null: whether the file is of an admitted kind is told by `fileData`. With
+    /// Never null: only `fileData` finds out whether the file is of an admitted kind. With
     /// `allowKeywordExtractionFromPath`, enhanced data of a file without descriptors takes the words of its
     /// name.
     static std::shared_ptr<LCFileParser> fileParserForURL(const URL& url, bool allowKeywordExtractionFromPath,
                                                           unsigned allowedFileTypes);
-    /// Over bytes or a reader instead of a file; `name` stands in for the path in messages, and its extension
-    /// tells ".loopdata".
+    /// Parses bytes or a reader instead of a file. `name` stands in for the path in messages; a ".loopdata"
+    /// file is recognised by its extension.
     static std::shared_ptr<LCFileParser> fileParserForBytes(std::span<const std::uint8_t> bytes,
                                                             std::string_view name,
                                                             unsigned allowedFileTypes = kLCAllAudio);
@@ -64,8 +65,8 @@ class LCFileParser {
     /// The same with what can be derived: the length from the header, the tempo from beats and length, the
     /// beats from tempo and length where that gives a whole number. Derived values never enter the record.
     std::shared_ptr<LCFileData> enhancedFileData(Error* error = nullptr) const;
-    /// Every chunk in the order of the file, also of a damaged one as far as it can be followed; what is
-    /// wrong stands in the chunks. Empty, and an error, when the file is unreadable or no known container.
+    /// Every chunk in the order of the file, even of a damaged file as far as it can be followed; faults are
+    /// noted in the chunks. Empty, and an error, when the file is unreadable or no known container.
     std::vector<LCChunk> chunks(Error* error = nullptr) const;
 
   private:

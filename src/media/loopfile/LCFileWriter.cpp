@@ -14,7 +14,8 @@
 namespace qvct {
 namespace {
 
-/// An unreadable record may be one of a newer version, or be saved by other means: it is not overwritten.
+/// A record that cannot be read is not overwritten: a newer version may have written it, or it may be
+/// recoverable by other means.
 bool isReadable(const Container& container, Error* error) {
     const Chunk* chunk = container.find(Chunk::Role::record);
     if (chunk == nullptr || chunk->size == 0) return true;

@@ -17,9 +17,9 @@ struct LCWriteOptions {
     /// The new file is read back and compared with the old one before it takes its place: the audio, and
     /// every chunk that is not ours. Costs a read of both.
     bool verifies = false;
-    /// Every check is made that a write makes, and nothing is written: whether it would be is the answer.
+    /// All checks of a write are made, but nothing is written; the result says whether it would be.
     bool isDryRun = false;
-    /// The state of the file that the data were read from; another one is an error.
+    /// The state of the file that the data were read from; if it has changed since, that is an error.
     std::optional<FileStamp> expected = std::nullopt;
 };
 

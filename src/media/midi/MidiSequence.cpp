@@ -50,7 +50,8 @@ Division divisionOf(std::uint32_t word) {
     return {0, rate * (word & 0xFF)};
 }
 
-/// Ticks to beats. SMPTE ticks are seconds, which the tempo events stretch; their tempos must be ascending.
+/// Ticks to beats. SMPTE ticks measure seconds, which the tempo events convert to beats; the tempo events
+/// must be in ascending order.
 class BeatClock {
   public:
     BeatClock(Division division, const std::vector<MidiTrackEvents::Tempo>& tempos) : division_(division) {

@@ -62,7 +62,7 @@ bool MidiTrackReader::readEvent() {
         case 0xF0:
         case 0xF7:
             return readLength(length) && skipBytes(length);
-        // System messages do not belong into a file; those that are there are skipped with their data.
+        // System messages do not belong in a file; any that occur are skipped with their data.
         case 0xF2:
             return skipBytes(2);
         case 0xF1:
@@ -137,7 +137,8 @@ void MidiTrackReader::noteOff(std::uint8_t channel, std::uint8_t pitch, std::uin
 }
 
 void MidiTrackReader::closeOpenNotes() {
-    // Through the notes, not the slots, so that a file of many small tracks costs no more than its bytes.
+    // Loops over the notes, not over all slots, so that a file of many small tracks costs time in proportion
+    // to its size.
     for (const MidiTrackEvents::Note& note : events_.notes) {
         OpenNotes& open = open_[openSlot(note.channel, note.pitch)];
         for (; open.oldest != kNone; open.oldest = nextOpen_[open.oldest]) {

@@ -58,8 +58,8 @@ Packing packingOf(std::uint32_t coding, std::uint32_t bits) {
     }
 }
 
-/// Writers put frames, packets or a share of the packets into the header, depending on the coding: what it
-/// says counts only where it is known to mean frames.
+/// Depending on the coding, writers put the number of frames, of packets or of a share of the packets into
+/// the header. It is used only where it is known to mean frames.
 std::uint64_t framesOf(std::uint32_t coding, const LCAudioFacts& header, std::uint64_t bytes) {
     const Packing packing = packingOf(coding, header.bitsPerSample);
     const std::uint64_t packet = std::uint64_t{packing.bytes} * header.channelCount;

@@ -106,8 +106,8 @@ bool CafFile::readFormat(const Chunk& description, LCAudioFacts& facts, Error* e
     return true;
 }
 
-/// What the table of packets of varying size says, as far as there can be so many packets: each has a byte of
-/// audio at least.
+/// The number of frames in the table of packets of varying size, if the audio can hold so many packets: each
+/// has at least one byte.
 std::uint64_t CafFile::packetTableFrames(std::uint64_t bytes, std::uint32_t framesPerPacket) const {
     const Chunk* table = find(fourCC("pakt"));
     if (table == nullptr) return 0;

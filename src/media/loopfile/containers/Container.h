@@ -32,14 +32,14 @@ struct Chunk {
     std::uint32_t id = 0;
     Role role = Role::other;
     std::uint64_t offset = 0;     ///< Of its header.
-    std::uint64_t contents = 0;   ///< Offset of its contents; of a record, behind our signature.
+    std::uint64_t contents = 0;   ///< Offset of its contents; in a record, behind our signature.
     std::uint64_t size = 0;       ///< Of the contents, as far as the file reaches.
     std::uint64_t signature = 0;  ///< Bytes of our signature before the contents of a record.
     std::uint64_t end = 0;        ///< Offset behind it and its pad byte.
     const char* fault =
         nullptr;  ///< Why a file with this chunk is not rewritten; null when nothing is wrong.
 
-    /// Its contents begin behind our signature of so many bytes.
+    /// Makes it our record's chunk: its contents begin behind a signature of so many bytes.
     void becomeRecord(std::uint64_t signatureSize) {
         role = Role::record;
         signature = signatureSize;
@@ -69,8 +69,9 @@ class Container {
     /// Largest record that is read or written.
     static constexpr std::uint64_t kLargestRecord = 64ULL << 20U;
 
-    /// The container that the first bytes announce; ".loopdata", which has no such mark, is told by the
-    /// extension of `name`. Null and an error for anything else. The window must outlive the container.
+    /// The container that the first bytes announce; a ".loopdata" file, which has no such mark, is recognised
+    /// by the extension of `name`. Null and an error for anything else. The window must outlive the
+    /// container.
     static std::unique_ptr<Container> open(ReadWindow& window, std::string_view name, Error* error);
 
     virtual ~Container() = default;
@@ -92,10 +93,10 @@ class Container {
     virtual bool readFacts(LCAudioFacts& facts, Error* error) const = 0;
     /// The bytes of the record; nothing when there is none, or none that can be read.
     std::optional<std::vector<std::uint8_t>> recordBytes() const;
-    /// The file with this record in place of any that it has; an empty one leaves it without. Nothing and the
-    /// reason when that cannot be done with certainty.
+    /// The file with this record in place of any that it has; an empty record only removes that. Nothing, and
+    /// the reason, when this cannot be done with certainty.
     std::optional<std::vector<FilePiece>> rewritten(const std::string& record, Error* error) const;
-    /// Bytes at the start of a chunk's contents that a rewrite has to change.
+    /// How many bytes at the start of a chunk's contents a rewrite has to change.
     virtual std::uint64_t rewrittenPrefix(const Chunk&) const { return 0; }
 
   protected:

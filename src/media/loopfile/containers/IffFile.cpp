@@ -52,7 +52,7 @@ Chunk IffFile::chunkAt(std::uint64_t offset) const {
     return chunk;
 }
 
-/// Whether the chunk is sound, and another one or the end follows it.
+/// Whether the chunk is intact and is followed by another one or by the end.
 bool IffFile::leadsOn(const Chunk& chunk) const {
     if (chunk.fault != nullptr) return false;
     if (chunk.end >= formEnd_ || formEnd_ - chunk.end < kChunkHeader) return true;
@@ -60,8 +60,8 @@ bool IffFile::leadsOn(const Chunk& chunk) const {
     return mayLackPad || chunkAt(chunk.end).fault == nullptr || areFiller(chunk.end, formEnd_);
 }
 
-/// Some writers forget the pad byte; then the next header lies one byte before the place where it belongs. A
-/// byte later it may look like one, too.
+/// Some writers forget the pad byte; then the next header begins one byte before the place where it belongs.
+/// At that place, too, the bytes may look like a header.
 bool IffFile::startsOneByteEarlier(const Chunk& chunk) const {
     if (chunks_.empty() || !isOdd(chunks_.back().size) || leadsOn(chunk)) return false;
     return leadsOn(chunkAt(chunk.offset - 1));
@@ -82,7 +82,8 @@ void IffFile::walk(std::uint64_t formSize, bool isOpenEnded) {
             chunks_.back().end = at - 1;
         }
         if (chunk.end > formEnd_) {
-            // A form that its own chunk contradicts does not tell where the bytes of others begin.
+            // When a chunk contradicts the form's size, that size does not tell where bytes of other programs
+            // begin.
             formEnd_ = fileEnd;
             chunk = chunkAt(chunk.offset);
         }

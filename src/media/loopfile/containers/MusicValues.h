@@ -26,7 +26,7 @@ std::string textOfField(std::string_view bytes);
 void setTempo(LCAudioFacts& facts, double bpm);
 void setSignature(LCAudioFacts& facts, unsigned top, unsigned bottom);
 void setBeats(LCAudioFacts& facts, std::uint64_t beats);
-/// 0 is what writers leave that set no note.
+/// 0 is ignored: writers that set no note leave it there.
 void setRootNote(LCAudioFacts& facts, unsigned note);
 /// "4/4"
 void setSignatureText(LCAudioFacts& facts, std::string_view text);

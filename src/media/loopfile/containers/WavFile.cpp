@@ -17,7 +17,7 @@ constexpr std::uint16_t kImaAdpcm = 0x11;
 constexpr std::uint16_t kGsm = 0x31;
 constexpr std::uint16_t kExtensible = 0xFFFE;
 
-/// A coding whose blocks each begin with a header, and hold as many frames as their size tells.
+/// A coding in blocks that each begin with a header; the size of a block says how many frames it holds.
 struct BlockCoding {
     std::uint64_t header = 0;  ///< Bytes a channel.
     std::uint64_t framesOfHeader = 0;
@@ -161,14 +161,15 @@ std::uint64_t WavFile::factFrames() const {
     return isLong() && frames == kInLongSizes ? longSizes_.frames : frames;
 }
 
-/// The last blocks are filled up: what `fact` says counts where it leaves out no more than two of them, as
-/// encoders write them.
+/// Encoders fill up the last blocks. So the number in `fact` is used if it is short of what the blocks hold
+/// by less than two blocks.
 std::uint64_t WavFile::saidFrames(std::uint64_t held, std::uint64_t framesOfBlock) const {
     const std::uint64_t said = factFrames();
     return said > 0 && said < held && held - said < 2 * framesOfBlock ? said : held;
 }
 
-/// For codings that nothing is known of: what the file says, else what its data rate makes likely.
+/// For unknown codings: the number of frames that the file states, else the one that its data rate makes
+/// likely.
 std::uint64_t WavFile::likelyFrames(const Coding& coding, std::uint64_t bytes, double sampleRate) const {
     constexpr std::uint64_t kMostFramesOfByte = 64;  // far above what any coding packs
     const std::uint64_t said = factFrames();

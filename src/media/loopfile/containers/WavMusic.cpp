@@ -90,7 +90,7 @@ void readWavMusic(const WavFile& file, LCAudioFacts& facts) {
                 break;
         }
     }
-    // The surest word on the root note comes last.
+    // The most reliable source of the root note comes last.
     if (sampler != nullptr) readSampler(file.cursor(*sampler), facts);
     if (acid != nullptr) readAcid(file.cursor(*acid), facts);
 }
