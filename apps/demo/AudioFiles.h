@@ -5,8 +5,9 @@
 #include <string>
 #include <string_view>
 
-/// Short writers of the three audio containers, which know nothing of the library that reads them: what they
-/// write can serve as fixtures. Each fact of a Sound goes to the open chunk that other programs use for it.
+/// Short writers of the three audio containers. They are independent of the library that reads them, so that
+/// what they write can serve as fixtures. Each fact of a Sound goes to the open chunk that other programs use
+/// for it.
 ///
 /// | fact    | WAV            | AIFF                 | CAF                            |
 /// |---------|----------------|----------------------|--------------------------------|

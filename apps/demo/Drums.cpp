@@ -81,7 +81,7 @@ void addTone(Signal& signal, const DrumSound& sound, const KitCharacter& kit, in
     }
 }
 
-/// All bursts but the last are short: hands that do not quite meet.
+/// All bursts but the last are short, as of hands that do not clap exactly together.
 double burstLevel(const DrumSound& sound, double time, double length) {
     const int burst = std::min(static_cast<int>(time / kBurstSpacing), sound.bursts - 1);
     const bool last = burst == sound.bursts - 1;

@@ -5,7 +5,7 @@
 #include <string_view>
 #include <vector>
 
-/// Rhythms and melodies as texts of one character a sixteenth note; blanks are there for the eye only.
+/// Rhythms and melodies as texts with one character for each sixteenth note; blanks are for readability only.
 namespace qvct::demo {
 
 /// "x" a hit, "X" an accent, "o" a soft hit, "." nothing. A lane that is shorter than the loop starts over.
@@ -31,7 +31,7 @@ struct Phrase {
     double swing = 50;
 };
 
-/// Throws std::out_of_range for a name that there is none of.
+/// Throws std::out_of_range for an unknown name.
 const Groove& groove(std::string_view name);
 const Phrase& phrase(std::string_view name);
 

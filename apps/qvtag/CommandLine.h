@@ -40,13 +40,13 @@ void addFollowOption(CLI::App& command, LinksOutside& links);
 /// Hidden commands and options are left out.
 CommandDescription describeCommandLine(const CLI::App& app);
 
-/// The command and all below it, each before its own.
+/// The command and all commands below it, each before those below it.
 std::vector<const CommandDescription*> allCommands(const CommandDescription& root);
 
 std::string bashCompletion(const CommandDescription& tool);
 std::string zshCompletion(const CommandDescription& tool);
 std::string fishCompletion(const CommandDescription& tool);
-/// In the man macros; the version stands in its footer.
+/// The manual page in the macros of `man`, with the version in its footer.
 std::string manualPage(const CommandDescription& tool);
 
 }  // namespace qvct::tool

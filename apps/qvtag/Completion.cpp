@@ -17,7 +17,7 @@ std::string quoted(const std::string& text) {
     return "'" + replaceAll(text, "'", "'\\''") + "'";
 }
 
-/// fish knows no other way to write an apostrophe between apostrophes.
+/// In fish, a backslash is the only way to write an apostrophe between apostrophes.
 std::string quotedForFish(const std::string& text) {
     return "'" + replaceAll(replaceAll(text, "\\", "\\\\"), "'", "\\'") + "'";
 }
@@ -28,15 +28,14 @@ std::vector<CommandOption> optionsOf(const CommandDescription& command, const Co
     std::set<std::string> known;
     for (const CommandOption& option : options) known.insert(option.names.back());
     for (const CommandOption& option : tool.options) {
-        // The version is told of the tool alone.
+        // Only the tool itself has `--version`.
         const bool isOfToolOnly = option.names.back() == "--version" && &command != &tool;
         if (!isOfToolOnly && known.insert(option.names.back()).second) options.push_back(option);
     }
     return options;
 }
 
-/// Whether a word that is no option may be a file: of a command that takes some, or that has nothing below
-/// it.
+/// Whether a word that is no option may be a file: the command takes files, or has no commands below it.
 bool offersFiles(const CommandDescription& command) {
     return command.commands.empty() ||
            std::any_of(command.arguments.begin(), command.arguments.end(),
@@ -110,7 +109,7 @@ std::string fishLines(const CommandDescription& command, const CommandDescriptio
     return text;
 }
 
-/// Finds the command among the words before the one that is typed, and does what the branch of it says.
+/// Finds the command in the words before the one being typed, and runs its branch.
 template <typename Branch>
 std::string wordsOfCommand(std::string_view words, const CommandDescription& tool, Branch branch) {
     return fmt::format(

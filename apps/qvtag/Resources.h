@@ -17,7 +17,7 @@ void useResources(const std::string& directory, const std::string& taxonomyFile,
 /// The rule set in a file; nothing and the reason when it holds none.
 std::optional<PropertyList::Dictionary> readRules(const std::string& path, Error* error);
 
-/// Names the keywords of a mapping that are no expressions; the others are used all the same.
+/// Reports the keywords of a mapping that are not valid expressions; the others are still used.
 void checkKeywords(const PropertyList::Dictionary& mapping, ToolContext& context);
 
 }  // namespace qvct::tool

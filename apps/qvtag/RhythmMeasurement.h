@@ -15,10 +15,10 @@ namespace qvct::tool {
 /// No loop is longer; what claims to be is a mistake.
 inline constexpr std::int32_t kMostBeats = QVCTMidiAnalysis::kLongestLoop;
 
-/// What a user knows better than the file.
+/// What the user states; it takes precedence over what the file says.
 struct RhythmRequest {
     std::optional<double> tempo;        ///< Quarter notes a minute.
-    std::optional<std::int32_t> beats;  ///< Of the signature's lower number, as all beats here.
+    std::optional<std::int32_t> beats;  ///< In notes of the signature's lower number, like all beats here.
     std::optional<std::int32_t> signatureTop;
     std::optional<std::int32_t> signatureBottom;
 };
@@ -33,7 +33,7 @@ struct RhythmResult {
     double tempo = 0;  ///< Quarter notes a minute.
     std::int32_t signatureTop = 4;
     std::int32_t signatureBottom = 4;
-    /// The same of the notes of all tracks, where more than the first one have some.
+    /// The same for the notes of all tracks together, if not only the first one has notes.
     struct AllTracks {
         std::size_t count = 0;  ///< Of the tracks with notes.
         float density = 0;
@@ -45,8 +45,8 @@ struct RhythmResult {
 };
 
 /// Measures a MIDI file, a loop with MIDI inside, or any sound that can be decoded, as the tagging service
-/// does: by the notes of the first track where there is MIDI, unless a loop says that it is one of sound
-/// alone. What neither the request nor the file tells is derived: the beats from tempo and length, the
+/// does: by the notes of the first track if there is MIDI, unless the file says that it is a loop of sound
+/// only. What neither the request nor the file states is derived: the beats from tempo and length, the
 /// signature as 4/4. Nothing, and an error, when the length in beats cannot be known or nothing sounds.
 std::optional<RhythmResult> measureRhythm(ItemFile& file, const RhythmRequest& request, Error* error);
 

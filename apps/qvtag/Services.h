@@ -12,7 +12,7 @@ class App;
 
 namespace qvct::tool {
 
-/// Adds "--services": one list, behind which paths may follow.
+/// Adds "--services", which takes one list, so that paths may follow it.
 void addServicesOption(CLI::App& command, std::vector<std::string>& names);
 
 /// The options of the services by name; of all of them when none is named. A wrong name is reported and left

@@ -24,7 +24,7 @@ std::optional<double> levelOf(std::string_view text) {
     return level >= 0 && level <= 1 ? std::optional(level) : std::nullopt;
 }
 
-/// Whether whoever typed it meant a level, right or wrong.
+/// Whether the text was meant as a level, valid or not.
 bool isMeantAsLevel(std::string_view text) {
     const std::string word = lowercase(text);
     return text.empty() || std::string_view("+-.%0123456789").find(text.front()) != std::string_view::npos ||

@@ -14,8 +14,9 @@ namespace qvct::tool {
 
 class ToolContext;
 
-/// "Category/Label" or "Category/Label=LEVEL" as typed. The first "/" separates, so that labels may hold some
-/// ("Bright / Dark"); the last "=" does where a level follows it: 0 to 1, or 0% to 100%.
+/// "Category/Label" or "Category/Label=LEVEL" as typed. The first "/" separates category and label, so that
+/// labels may contain one ("Bright / Dark"). The last "=" separates the level, if one follows it: 0 to 1, or
+/// 0% to 100%.
 struct TagArgument {
     std::string category;
     std::string label;
@@ -36,7 +37,8 @@ class TaggingEdit {
                                            ToolContext& context);
 
     bool isEmpty() const { return added_.empty() && removed_.empty(); }
-    /// Without what is removed, and with what is added in place of the same tag at another level.
+    /// The taggings without those to remove, and with those to add; these replace the same tag at another
+    /// level.
     ObjectSet<TGRTTagging> apply(const ObjectSet<TGRTTagging>& taggings) const;
 
   private:
@@ -48,7 +50,7 @@ class TaggingEdit {
     std::vector<TagArgument> removed_;
 };
 
-/// The taggings of `a` that `b` has not.
+/// The taggings of `a` that are not in `b`.
 ObjectSet<TGRTTagging> difference(const ObjectSet<TGRTTagging>& a, const ObjectSet<TGRTTagging>& b);
 
 }  // namespace qvct::tool

@@ -16,7 +16,7 @@
 namespace qvct::tool {
 namespace {
 
-/// Whatever a message cites, a terminal gets nothing but characters and line breaks.
+/// Whatever a message quotes, nothing but printable characters and line breaks goes to a terminal.
 void printLine(std::string_view message) {
     std::string text = "qvtag: ";
     for (std::size_t end = message.find('\n'); end != std::string_view::npos; end = message.find('\n')) {
@@ -28,8 +28,8 @@ void printLine(std::string_view message) {
 
 }  // namespace
 
-/// What the library logged; it does so for every item that meets a broken keyword or rule, and a person wants
-/// to read it once.
+/// What the library logged, to be shown once: it logs the same for every item that meets a broken keyword or
+/// rule.
 class ToolContext::LoggedLines {
   public:
     void print(std::string_view message) {

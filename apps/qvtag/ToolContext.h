@@ -29,27 +29,28 @@ class ToolContext {
     void prepare();
     const Terminal& terminal() const { return terminal_; }
 
-    /// One line on standard error, unless the library logged the same; the tool will say by its exit status
-    /// that some items failed.
+    /// Prints one line on standard error, unless the library logged the same; the exit status will say that
+    /// some items failed.
     void itemFailed(const Error& error);
     void itemFailed(std::string_view message);
-    /// The same when the log has named it already.
+    /// The same for a failure that the log has reported already.
     void loggedFailure();
-    /// The same for a wrong word on the command line, when the rest is done all the same.
+    /// The same for a wrong word on the command line when the rest is done anyway; the exit status will be
+    /// that of wrong usage.
     void usageFailed(std::string_view message);
-    /// A line on standard error that is no failure; nothing when quiet.
+    /// Prints a line on standard error that is no failure; nothing when quiet.
     void note(std::string_view message) const;
     /// 0 done, 1 some items failed, 2 wrong usage.
     int exitStatus() const { return exitStatus_; }
 
-    /// Calls `show` for every content item at or below the paths as it is found, until nobody can see it any
-    /// more. What cannot be read is reported. Names that are not UTF-8 are reported and left out. Links that
-    /// are not followed are told in one note.
+    /// Calls `show` for every content item at or below the paths as it is found, until output is lost. What
+    /// cannot be read is reported. Names that are not UTF-8 are reported and left out. One note lists the
+    /// links that are not followed.
     void forEachContentItem(const std::vector<std::string>& paths, LinksOutside links,
                             const std::function<void(const URL&)>& show);
-    /// All of them, before anything is done with one.
+    /// The content items at or below the paths, all found before anything is done with one.
     std::vector<URL> contentItems(const std::vector<std::string>& paths, LinksOutside links);
-    /// That note, for a walk of one's own; nothing when there are none.
+    /// Prints that note for a command that walks by itself; nothing when there are no links.
     void notePassedOver(const std::vector<URL>& links) const;
 
   private:

@@ -10,7 +10,7 @@
 namespace qvct::tool {
 namespace {
 
-/// What a preset holds besides its record, also within the sections of the record.
+/// What a preset holds besides its record, even inside the record's sections.
 std::string untouchedText(PresetText& preset) {
     std::string text = textWithoutRecord(preset);
     setTaggings(preset, {});

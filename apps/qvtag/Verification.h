@@ -12,9 +12,9 @@
 
 namespace qvct::tool {
 
-/// What a write must leave alone, taken before it and compared after it: of audio the samples and every chunk
-/// that is not ours, of settings files the whole file, of presets every line that is not ours. Of every kind
-/// the record is read back.
+/// What a write must leave alone, taken before it and compared after it: the samples of audio and every chunk
+/// that is not ours, the whole of a settings file, every line of a preset that is not ours. For every kind,
+/// the record is read back, too.
 class Verification {
   public:
     /// Nothing and an error when the item cannot be read.

@@ -32,8 +32,8 @@ void addSharedOptions(CLI::App& app, qvct::tool::ToolContext& context) {
         ->type_name("DIR");
 }
 
-/// An empty path, as a variable that is not set leaves it, would name the current folder and all that is in
-/// it.
+/// Refuses an empty path, such as an unset variable gives: it would name the current folder and all that is
+/// in it.
 void refuseEmptyPaths(CLI::App& app) {
     for (CLI::Option* option : app.get_options()) {
         const std::string type = option->get_type_name();

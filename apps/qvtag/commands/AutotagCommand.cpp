@@ -36,7 +36,7 @@ using Taggings = std::vector<std::shared_ptr<TGRTTagging>>;
 
 using Settings = QVTaggingAggregator::Settings;
 
-/// The settings in a file; none, and a line on standard error, when it is not one.
+/// The settings in a file; nothing, and a line on standard error, when it holds none.
 template <typename Read>
 Settings settingsIn(const std::string& file, std::string_view what, Read read, ToolContext& context) {
     if (file.empty()) return std::nullopt;
@@ -55,7 +55,7 @@ Settings keywordsIn(const std::string& file, ToolContext& context) {
     return keywords;
 }
 
-/// What the item's record says that it is, else its name.
+/// The item's kind as its record states it, or else as its name suggests.
 std::int64_t fileTypeOf(ContentItem& item) {
     const auto record = item.record();
     const std::int64_t stored = record ? record->fileType() : std::int64_t{kFileTypeNone};
@@ -97,7 +97,7 @@ bool isGraded(const ObjectSet<TGRTTagging>& taggings) {
                        [](const auto& tagging) { return tagging->label() == "Rhythmic Density"; });
 }
 
-/// Grades audio that the rhythm service leaves alone, where its length in beats is known.
+/// Grades the rhythm of audio that the rhythm service leaves alone, if its length in beats is known.
 void addAnyRhythm(ContentItem& item, const TGRTTaxonomy& taxonomy, ObjectSet<TGRTTagging>& taggings) {
     if (isGraded(taggings)) return;
     const auto data = item.fileData();

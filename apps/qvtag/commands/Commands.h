@@ -8,7 +8,7 @@ class App;
 
 namespace qvct::tool {
 
-/// `generate`, hidden: what the build makes of the command line.
+/// `generate`, hidden: prints what the build needs of the command line.
 void addGenerateCommand(CLI::App& app);
 
 /// Each adds one command to the tool. A command reports what fails through the context and never throws.
@@ -26,7 +26,7 @@ void addReadCommand(CLI::App& app, ToolContext& context);
 void addSearchCommands(CLI::App& app, ToolContext& context);
 void addTaxonomyCommand(CLI::App& app, ToolContext& context);
 void addWriteCommand(CLI::App& app, ToolContext& context);
-/// Below the taxonomy command: what has become of retired vocabularies.
+/// Adds the commands below `taxonomy` that show what has become of retired vocabularies.
 void addLegacyTaxonomyCommands(CLI::App& taxonomy, ToolContext& context);
 
 }  // namespace qvct::tool

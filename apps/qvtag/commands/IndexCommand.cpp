@@ -49,7 +49,7 @@ void printRun(const Json& run, const IndexProgress& progress, const ToolContext&
     print("; {:.1f} s, {:.0f} a second\n", run["seconds"].get<double>(), run["itemsPerSecond"].get<double>());
 }
 
-/// By listing alone, for the bar; what cannot be listed the run tells.
+/// Counts by listing only, for the progress bar; the run reports what cannot be listed.
 std::uint64_t countItems(const std::string& folder, LinksOutside links) {
     std::uint64_t count = 0;
     const auto add = [&count](const ContentFolder& found) {
@@ -62,7 +62,7 @@ std::uint64_t countItems(const std::string& folder, LinksOutside links) {
 
 void run(Options& options, ToolContext& context) {
     const auto services = optionsForServices(options.services, context);
-    if (context.exitStatus() != 0) return;  // half of the services would mark the items as done
+    if (context.exitStatus() != 0) return;  // indexing with fewer services would mark the items as done
     Progress bar(context.quiet);
     IndexOptions& index = options.index;
     index.services = services;

@@ -24,7 +24,7 @@ struct Options {
 
 using ContentObject = QVContentTaggingIndexableContentObject;
 
-/// As `indexableContentObjectForURL`, also of audio whose extension is none of content.
+/// Like `indexableContentObjectForURL`, but also for audio whose extension is not one of content.
 std::shared_ptr<ContentObject> objectOf(const URL& url, std::uint64_t bits, Error* error) {
     const auto taxonomy = TGRTIndexableContentObject::taxonomyForOptions(bits);
     const auto record = TGRTFileNode::nodeWithFileURL(url)->readMetaDataWithOptions(bits, taxonomy, error);

@@ -41,13 +41,13 @@ bool readSignature(const std::string& text, RhythmRequest& request) {
     return true;
 }
 
-/// What a range lets through, since it compares with nothing.
+/// Catches a NaN, which a range check lets through.
 std::string refuseNotANumber(const std::string& text) {
     double value = 0;
     return CLI::detail::lexical_cast(text, value) && std::isnan(value) ? "not a number" : "";
 }
 
-/// Whole numbers without a fraction, others with what tells them apart.
+/// The value rounded to a millionth, so that it is printed without the digits of rounding errors.
 double rounded(double value) {
     return std::round(value * 1e6) / 1e6;
 }

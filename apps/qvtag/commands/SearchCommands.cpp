@@ -44,7 +44,7 @@ std::string_view nameOf(Provenance provenance) {
     return "stored";
 }
 
-/// In tenths; the tag's default level stands in where the tagging has none.
+/// In tenths; if the tagging has no level, the tag's default level is used.
 std::int64_t weightLevelOf(const IndexedTagging& tagging) {
     const auto level = tagging.level ? TGRTLevel::levelWithWeight(decimalOf(*tagging.level)) : nullptr;
     const auto tag = TGRTTaxonomy::defaultTaxonomy()->findTagForLabel(tagging.label, tagging.category);
@@ -66,7 +66,7 @@ Json jsonOf(const IndexedTagging& tagging) {
     return json;
 }
 
-/// Of a key that comes twice the last value.
+/// When a key comes twice, its last value is used.
 Json jsonOf(const std::vector<IndexedValue>& values) {
     Json json = Json::object();
     auto& members = json.get_ref<Json::object_t&>();
@@ -81,7 +81,7 @@ Json jsonOf(const std::vector<IndexedValue>& values) {
     return json;
 }
 
-/// With an error when the database cannot be read any more.
+/// Reports an error when the database cannot be read any more.
 Json jsonOf(ContentDatabase& database, ItemId id, const IndexedItem& item, Error* error) {
     Json json;
     json["id"] = id;
@@ -139,7 +139,7 @@ std::unique_ptr<ContentDatabase> opened(const Options& options, ToolContext& con
     return database;
 }
 
-/// The query, or nothing after a message that points at the place.
+/// The query; or nothing, after a message that points at the fault.
 std::optional<Query> queryOf(const Options& options, ContentDatabase& database, ToolContext& context) {
     Error error;
     const auto vocabulary = database.vocabulary(&error);

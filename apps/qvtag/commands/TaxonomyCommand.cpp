@@ -112,7 +112,7 @@ TagPointer findTag(const Options& options, const TGRTTaxonomy& taxonomy, ToolCon
     return nullptr;
 }
 
-/// " in Genres below House", as far as it was asked for.
+/// " in Genres below House", or the part of it that was asked for.
 std::string placeOf(const Options& options) {
     std::string place;
     if (!options.category.empty()) place += " in " + printable(options.category);

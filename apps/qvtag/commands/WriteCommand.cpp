@@ -33,7 +33,7 @@ struct Options {
     bool keepsTimes = false;
 };
 
-/// What a write does, or did, to one item.
+/// What a write is to do, or has done, to one item.
 struct Change {
     URL url;
     std::shared_ptr<TGRTMetaData> record = {};  // as it is to be
@@ -42,14 +42,14 @@ struct Change {
     std::string oldName = {};
     std::optional<std::string> newName = {};
     bool isWritten = false;
-    FileStamp former = {};                          // of the file that holds the record, when that was read
+    FileStamp former = {};                          // of the file with the record when it was read
     std::optional<Verification> verification = {};  // of what was written
-    std::vector<std::string> faults = {};           // that it found
+    std::vector<std::string> faults = {};           // what the verification found
 
     bool isNone() const { return added.empty() && removed.empty() && !newName; }
 };
 
-/// Why nothing can be written to an item of a kind that is none of those with writers.
+/// Why nothing can be written to an item of a kind that has no writer.
 Error reasonNotWritten(const URL& url) {
     if (TGRTBinaryFileMetaDataReader::supportsFileExtension(url.pathExtension()))
         return errorOf(kErrorUnwritable, "data files are never written", {url.path()});
@@ -91,7 +91,7 @@ std::optional<Change> changeOfItem(const URL& url, const TaggingEdit& edit, cons
     return change;
 }
 
-/// A whole record stores the sub type that it holds: that of other tags must not stay in it.
+/// A whole record is stored with the sub type that it holds, which must therefore be that of the new tags.
 void updateSubType(const Change& change) {
     const bool hasOtherTags = !change.added.empty() || !change.removed.empty();
     const auto writer = std::dynamic_pointer_cast<TGRTBundleTaggingWriter>(
@@ -132,16 +132,18 @@ bool carryOut(Change& change, const Options& options, ToolContext& context, Erro
     return true;
 }
 
-/// Whether the record beside or in an item is a link to elsewhere, which would be written to in its place.
+/// Whether the record beside or in an item is a link that leads elsewhere: writing would change the file
+/// there.
 bool leadsAway(const std::string& record, const URL& url) {
-    if (record == url.path()) return false;  // an item that is a link itself was decided on by the walk
-    std::error_code reason;                  // told by the write, which fails for it
+    if (record == url.path()) return false;  // the walk has decided about items that are links themselves
+    std::error_code reason;                  // the write fails for the same reason and reports it
     if (std::filesystem::status(record, reason).type() == std::filesystem::file_type::none) return false;
     const URL folder = isDirectory(url.path()) ? url : url.URLByDeletingLastPathComponent();
     return !LinkRule(folder.path(), LinksOutside::none).follows(record, false);
 }
 
-/// Reads, changes and writes an item in its turn; once more when another program saves it meanwhile.
+/// Reads, changes and writes an item while holding its turn; tries once more if another program saves it
+/// meanwhile.
 std::optional<Change> editItem(const URL& url, const TaggingEdit& edit, const Options& options,
                                ToolContext& context) {
     Error error;

@@ -23,7 +23,7 @@ namespace {
 
 using Parts = std::vector<InspectedPart>;
 
-/// Most entries of a property list that are shown: on its way out each takes a kilobyte.
+/// Most entries of a property list that are shown: until it is printed, each takes a kilobyte of memory.
 constexpr std::size_t kMostEntries = 10'000;
 
 /// Shows `left` entries at most, and counts them down.

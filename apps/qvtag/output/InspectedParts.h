@@ -20,8 +20,8 @@ struct InspectedPart {
     std::vector<InspectedPart> children;
 };
 
-/// Everything that is in an item, and beside it as far as it belongs to it. What is damaged is shown as far
-/// as it can be followed; the error says what cannot be read at all.
+/// All parts of an item, in it and beside it. Damaged ones are shown as far as they can be followed; the
+/// error says what cannot be read at all.
 std::vector<InspectedPart> partsOfItem(const URL& url, Error* error);
 
 }  // namespace qvct::tool

@@ -35,7 +35,7 @@ std::string jsonText(const Json& value, bool onOneLine);
 /// Prints the items: as an array, or one a line.
 void printJson(const Json& items, Format format);
 
-/// Prints items as they come: the elements of one array, or one a line, each of which can be read at once.
+/// Prints items as they come: as elements of one array, or one a line, so that each can be read at once.
 class JsonItems {
   public:
     explicit JsonItems(Format format) : format_(format) {}
@@ -48,11 +48,12 @@ class JsonItems {
     bool isEmpty_ = true;
 };
 
-/// A number as it was meant: whole ones without a fraction, those of single precision as their decimal.
+/// A number as it was meant: whole numbers without a fraction, single-precision ones as their shortest
+/// decimal.
 Json jsonOfNumber(double number);
 /// {"label","parent","category","level","auto","weightLevel"}, null where absent.
 Json jsonOfTagging(const TGRTTagging& tagging);
-/// Sorted by category, label and level, for output that is the same in every run.
+/// The taggings sorted by category, label and level, so that output is the same in every run.
 std::vector<std::shared_ptr<TGRTTagging>> sortedTaggings(const ObjectSet<TGRTTagging>& taggings);
 /// "House", or "Cold / Warm 100%" with a level.
 std::string textOfTagging(const TGRTTagging& tagging);

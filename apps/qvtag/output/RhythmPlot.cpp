@@ -159,7 +159,7 @@ class Painter {
         text(kLeft, kWeightTop - 6, "metric weight of each cell; red where an onset falls");
         std::set<std::size_t> hit;
         for (const double onset : plot_.onsets) {
-            // The nearest cell, as it is measured: an exact half falls back.
+            // The nearest cell, as in the measurement: an exact half is rounded down.
             if (isInside(onset)) hit.insert(static_cast<std::size_t>(std::ceil(onset * kCellsPerBeat - 0.5)));
         }
         const std::size_t cells =
