@@ -6,6 +6,8 @@
 namespace qvct::contentdb {
 namespace {
 
+static_assert(std::endian::native == std::endian::little, "the file has its numbers in this order");
+
 void write(ByteWriter& out, const IndexedTagging& tagging) {
     out.text(tagging.label);
     out.text(tagging.category);

@@ -46,7 +46,7 @@ TEST(Damage, IsRefusedOrWithoutConsequence) {
     for (int i = 0; i < 1000; ++i) {
         std::string broken = bytes;
         const std::size_t at = std::uniform_int_distribution<std::size_t>(0, bytes.size() - 1)(random);
-        broken[at] = static_cast<char>(broken[at] ^ (1U << random() % 8));
+        broken[at] = static_cast<char>(broken[at] ^ static_cast<char>(1U << random() % 8));
         const std::string path = folder.write("broken", broken);
         const std::string answer = answers(path);
         if (answer == "refused") {

@@ -200,7 +200,7 @@ TEST(LoopFileWrite, ARecordBeforeOrBetweenTheAudioIsReplacedWithoutTouchingTheSo
             SCOPED_TRACE(std::string(kind.name) + ", place " + std::to_string(place));
             const std::string path = folder.write(kind.name, fileWith(place, record));
             ASSERT_EQ(read(path)->taggingDictionary(), kTagging);
-            for (const std::size_t length : {5000, 1, 200}) {
+            for (const std::size_t length : {5000U, 1U, 200U}) {
                 const auto data = read(path);
                 data->setDisplayName(std::string(length, 'n'));
                 Error error;

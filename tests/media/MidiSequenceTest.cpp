@@ -106,7 +106,7 @@ TEST(MidiSequence, TellsTheTempoTrackFromTheFirstTrack) {
     // A program change makes the first track music, and only format 1 has a tempo track.
     EXPECT_EQ(
         MidiSequence::parse(header(1, 2, 96) + track(Bytes{0, 0xC0, 5} + kEnd) + music)->tracks().size(), 2U);
-    for (const std::size_t format : {0, 2}) {
+    for (const std::size_t format : {0U, 2U}) {
         EXPECT_EQ(MidiSequence::parse(header(format, 2, 96) + tempo + music)->tracks().size(), 2U);
     }
     // A second track without events stays.

@@ -18,14 +18,14 @@ constexpr std::size_t kSmallestWindow = 64;
 constexpr double kLowestHertz = 40;
 constexpr double kHighestHertz = 16000;
 constexpr double kBandsPerOctave = 8;
-constexpr std::size_t kLag = 2;       // frames back to the one that is compared with
 constexpr float kCompression = 1000;  // The scale is logarithmic from 60 dB below the loudest band on.
 constexpr float kQuietest = 0.001F;   // Signals below do not get louder.
 constexpr double kForgetting = 0.1;   // share of the loudest level forgotten in a second
 
 // An even product of small primes, which transforms quickly.
 std::size_t windowSizeFor(double sampleRate) {
-    auto half = std::max<std::size_t>(kSmallestWindow, std::lround(sampleRate * kWindowSeconds)) / 2;
+    auto half =
+        std::max(kSmallestWindow, static_cast<std::size_t>(std::lround(sampleRate * kWindowSeconds))) / 2;
     for (;; ++half) {
         std::size_t rest = half;
         for (const std::size_t prime : {2U, 3U, 5U}) {

@@ -18,7 +18,7 @@ namespace {
 /// Some file systems do not report the kind of an entry in their listings.
 EntryKind kindOf(int folder, const dirent& entry) {
     struct stat status {};
-    status.st_mode = DTTOIF(entry.d_type);
+    status.st_mode = static_cast<mode_t>(DTTOIF(entry.d_type));
     const bool isThere =
         entry.d_type != DT_UNKNOWN || ::fstatat(folder, entry.d_name, &status, AT_SYMLINK_NOFOLLOW) == 0;
     return isThere ? EntryStatus::of(status).kind : EntryKind::other;
