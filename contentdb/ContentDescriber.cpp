@@ -132,7 +132,7 @@ ContentDescriber::~ContentDescriber() = default;
 
 std::uint64_t ContentDescriber::digest(std::uint64_t services) {
     // Raised when a change makes items be described differently although the version stays the same.
-    constexpr std::uint64_t edition = 3;
+    constexpr std::uint64_t edition = 4;
     Digest digest;
     digest.add(services);
     digest.add(version());
