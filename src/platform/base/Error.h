@@ -24,7 +24,7 @@ struct ErrorPlace {
 ///
 /// Operations that can fail take an `Error*` as their last argument; null means that the caller does not ask.
 /// The error is written only on failure.
-struct Error : ErrorPlace {
+struct QVCT_API Error : ErrorPlace {
     std::string domain;
     int code = 0;
     std::string reason;  ///< For people, without the place: "is not UTF-8 text".
@@ -34,7 +34,7 @@ struct Error : ErrorPlace {
 
     /// The sentence for people, fit for one line: "PATH: PART, line LINE, byte OFFSET: REASON" without what
     /// is unknown; what cannot be printed of the place is escaped.
-    QVCT_API std::string message() const;
+    std::string message() const;
 };
 
 /// Codes used in QVCTErrorDomain.
