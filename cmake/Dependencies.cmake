@@ -22,6 +22,11 @@ pkg_check_modules(javascriptcore REQUIRED javascriptcoregtk-4.1)
 find_library(QVCT_SCRIPT_ENGINE javascriptcoregtk-4.1 HINTS ${javascriptcore_LIBRARY_DIRS} REQUIRED)
 file(REAL_PATH "${QVCT_SCRIPT_ENGINE}" engine_file)
 string(REGEX MATCH "[^/]+[.]so[.][0-9]+" QVCT_SCRIPT_ENGINE_LIBRARY "${engine_file}")
+if(QVCT_SANITIZERS)
+  # The leak checker crashes over the thread-local variables of libraries that were loaded later.
+  target_link_options(qvct_build_flags INTERFACE
+    -Wl,--push-state,--no-as-needed "${QVCT_SCRIPT_ENGINE}" -Wl,--pop-state)
+endif()
 if(QVCT_BUILD_TOOL)
   find_package(CLI11 REQUIRED)
   find_package(nlohmann_json REQUIRED)
