@@ -174,6 +174,7 @@ std::optional<PropertyList::Dictionary> QVCTXMLParser::objectWithData(std::strin
         parseErrorOccurred(std::move(error));
         return std::nullopt;
     }
+    prepareXmlLibrary();
     const XmlOwned<xmlParserCtxt> context(
         xmlCreateMemoryParserCtxt(data.data(), static_cast<int>(data.size())));
     if (!context) return std::nullopt;

@@ -133,6 +133,7 @@ std::shared_ptr<const XPathExpression> XPathExpression::compile(std::string_view
              {.part = fmt::format("XPath of {} bytes", text.size())});
         return nullptr;
     }
+    prepareXmlLibrary();
     const XmlOwned<xmlXPathContext> context(xmlXPathNewContext(nullptr));
     if (!context) return nullptr;
     Error raised;

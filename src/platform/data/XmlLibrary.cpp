@@ -6,6 +6,11 @@
 
 namespace qvct {
 
+void prepareXmlLibrary() {
+    static const bool isPrepared = (xmlInitParser(), true);
+    static_cast<void>(isPrepared);
+}
+
 void XmlCloser::operator()(xmlBuffer* buffer) const {
     xmlBufferFree(buffer);
 }

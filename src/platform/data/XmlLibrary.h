@@ -17,6 +17,9 @@ struct _xmlXPathObject;
 
 namespace qvct {
 
+/// To be called before anything else of the XML library: several threads must not make its first use at once.
+void prepareXmlLibrary();
+
 /// Frees objects of the XML library; a parser together with the document that it has built so far.
 struct XmlCloser {
     void operator()(_xmlBuffer* buffer) const;

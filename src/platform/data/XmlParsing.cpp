@@ -127,8 +127,8 @@ class Parser {
         : text_(text), mostNodes_(kMostXmlNodes + text.size() / kXmlBytesOfNode) {}
 
     ParsedXml parse() {
-        static const bool isInitialized = (xmlInitParser(), true);  // before several threads parse at once
-        if (isInitialized) context_.reset(xmlNewParserCtxt());
+        prepareXmlLibrary();
+        context_.reset(xmlNewParserCtxt());
         if (!context_ || text_.size() > static_cast<std::size_t>(std::numeric_limits<int>::max())) {
             result_.faults.push_back(errorOf(kErrorTooLarge, "too large to be parsed"));
             return std::move(result_);

@@ -317,6 +317,7 @@ class Parser {
             parser.reader_.refuse("not well-formed XML", isAboutATag ? parser.lastTag() : parser.offset());
             parser.isStopped_ = true;  // the parser stops by itself, and must not be stopped amid an error
         };
+        prepareXmlLibrary();
         context_.reset(xmlCreatePushParserCtxt(&handler, this, nullptr, 0, nullptr));
         // The library's limit of depth is below ours, so it is switched off; the encoding is known, and not
         // always the declared one.
