@@ -82,7 +82,7 @@ class Verdicts {
 
 std::optional<std::string> replacementFile(const ResourceFile& resource, Error* error) {
     static Verdicts verdicts;
-    const auto path = ResourceBundle::pathForResource(resource.name, resource.extension);
+    auto path = ResourceBundle::pathForResource(resource.name, resource.extension);
     if (!path) return std::nullopt;
     const FileStamp stamp = FileStamp::ofFile(*path);
     auto verdict = verdicts.of(*path, stamp);

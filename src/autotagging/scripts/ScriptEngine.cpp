@@ -19,9 +19,11 @@ struct Loaded {
     }
 
     bool find(const SharedLibrary& library) {
-#define QVCT_SCRIPT_ENGINE_FIND(name) &&library.find(#name, functions.name, &error)
-        return true QVCT_SCRIPT_ENGINE_FUNCTIONS(QVCT_SCRIPT_ENGINE_FIND);
+        bool hasAll = true;
+#define QVCT_SCRIPT_ENGINE_FIND(name) hasAll = hasAll && library.find(#name, functions.name, &error);
+        QVCT_SCRIPT_ENGINE_FUNCTIONS(QVCT_SCRIPT_ENGINE_FIND)
 #undef QVCT_SCRIPT_ENGINE_FIND
+        return hasAll;
     }
 };
 

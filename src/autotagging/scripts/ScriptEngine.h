@@ -64,7 +64,8 @@ namespace qvct {
 ///
 /// For the .cpp files of scripts only. Safe from every thread.
 struct ScriptEngine {
-#define QVCT_SCRIPT_ENGINE_MEMBER(name) decltype(&::name) name = nullptr;
+#define QVCT_SCRIPT_ENGINE_MEMBER(name) \
+    decltype(&::name) name = nullptr;  // NOLINT(bugprone-macro-parentheses): a name
     QVCT_SCRIPT_ENGINE_FUNCTIONS(QVCT_SCRIPT_ENGINE_MEMBER)
 #undef QVCT_SCRIPT_ENGINE_MEMBER
 
