@@ -5,6 +5,7 @@
 // Built once per container; the input is turned to that container, so that no time goes into others.
 #include "media/loopfile/LCFileParser.h"
 #include "media/loopfile/LCFileWriter.h"
+#include "media/loopfile/LCFingerprint.h"
 #include "media/loopfile/containers/Container.h"
 #include "platform/data/PropertyListFile.h"
 
