@@ -6,12 +6,9 @@
 #include "contentdb/store/RunLock.h"
 #include "contentdb/store/StoreCheck.h"
 #include "contentdb/terms/Terms.h"
-#include "platform/text/Text.h"
 #include "taxonomy/TGRTTaxonomy.h"
 
 #include <algorithm>
-
-#include <fmt/format.h>
 
 namespace qvct::contentdb {
 

@@ -95,6 +95,12 @@ struct ContentDescriber::Implementation {
         TGRTTaxonomy::newTaxonomyOfType(kDefaultTaxonomy, false, false);
     std::shared_ptr<TGRTTaxonomy> taxonomyOfServices = TGRTTaxonomy::defaultTaxonomy();
     std::uint64_t services;
+    bool needsXmlDocument() const {
+        constexpr std::uint64_t readers = QVCTAutoTaggingOptionXMLRules |
+                                          QVCTAutoTaggingOptionSoftwareInstruments |
+                                          QVCTAutoTaggingOptionContentType;
+        return (services & readers) != 0;
+    }
     std::shared_ptr<QVTaggingAggregator> aggregator = QVTaggingAggregator::defaultTaggingAggregator();
     RegularExpression namedTempo = *RegularExpression::compile(
         R"((?<![\d.,])(\d{2,3}(?:[.,]\d+)?)[\s_-]?bpm(?![\p{L}\d]))", RegularExpression::Case::insensitive);
@@ -151,7 +157,7 @@ std::optional<IndexedItem> ContentDescriber::describe(const std::string& path, E
     Implementation& its = *implementation_;
     const URL url = URL::fileURLWithPath(path);
     const auto content = std::make_shared<ContentItem>(
-        url, ContentItem::RecordReading{Implementation::kOptions, its.taxonomyOfRecords});
+        url, ContentItem::Reading{Implementation::kOptions, its.taxonomyOfRecords, its.needsXmlDocument()});
     Error reason;
     const auto record = content->record(&reason);
     if (reason.isSet() && reason.code != kErrorNoContent) {

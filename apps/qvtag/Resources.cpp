@@ -5,10 +5,7 @@
 #include "platform/data/PropertyListFile.h"
 #include "platform/files/FileAccess.h"
 #include "platform/files/ResourceBundle.h"
-#include "platform/text/Text.h"
 #include "resources/ReplacementFile.h"
-
-#include <fmt/format.h>
 
 namespace qvct::tool {
 

@@ -30,6 +30,7 @@ std::optional<std::string> untouchedBytes(const URL& url, Error* error) {
     std::string text(bytes->begin(), bytes->end());
     if (QVContentTaggingTypes::fallBackFileTypeForURL(url) != kFileTypeSynthPreset) return text;
     auto preset = PresetText::parse(text, error);
+    if (!preset) failIn(url.path(), error);
     return preset ? std::optional(untouchedText(*preset)) : std::nullopt;
 }
 

@@ -4,12 +4,9 @@
 #include "contentdb/store/RunLock.h"
 #include "contentdb/store/Schema.h"
 #include "platform/files/FileAccess.h"
-#include "platform/text/Text.h"
 
 #include <chrono>
 #include <thread>
-
-#include <fmt/format.h>
 
 namespace qvct::contentdb {
 namespace {

@@ -1,7 +1,5 @@
 #include "contentdb/store/RunLock.h"
 
-#include "platform/text/Text.h"
-
 #include <fmt/format.h>
 
 namespace qvct::contentdb {

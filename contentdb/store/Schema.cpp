@@ -4,7 +4,6 @@
 #include "contentdb/store/DatabaseFiles.h"
 #include "platform/files/FileAccess.h"
 #include "platform/files/FileReplacement.h"
-#include "platform/text/Text.h"
 
 #include <array>
 #include <cstdint>

@@ -1,7 +1,6 @@
 #include "contentdb/store/Sqlite.h"
 
 #include "contentdb/store/ChecksumVfs.h"
-#include "platform/text/Text.h"
 
 #include <array>
 #include <filesystem>

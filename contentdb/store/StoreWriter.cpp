@@ -6,7 +6,6 @@
 #include "formats/QVContentTaggingTypes.h"
 #include "platform/files/EntryStatus.h"
 #include "platform/files/Paths.h"
-#include "platform/text/Text.h"
 #include "platform/text/Url.h"
 
 #include <algorithm>

@@ -8,10 +8,9 @@
 
 namespace qvct {
 
-ContentItem::ContentItem(URL url) : ContentItem(std::move(url), RecordReading{}) {}
+ContentItem::ContentItem(URL url) : ContentItem(std::move(url), Reading{}) {}
 
-ContentItem::ContentItem(URL url, RecordReading reading)
-    : file_(std::move(url)), reading_(std::move(reading)) {
+ContentItem::ContentItem(URL url, Reading reading) : file_(std::move(url)), reading_(std::move(reading)) {
     if (!reading_.taxonomy) reading_.taxonomy = TGRTTaxonomy::mutableDefaultTaxonomy();
 }
 
@@ -19,7 +18,9 @@ ContentItem::~ContentItem() = default;
 
 std::shared_ptr<QVCTXMLDocument> ContentItem::xmlDocument() {
     if (!xmlDocument_) {
-        const auto cache = QVContentEditorFileUtilities::intermediateCacheURLForURL(url());
+        const auto cache = reading_.withXmlDocument
+                               ? QVContentEditorFileUtilities::intermediateCacheURLForURL(url())
+                               : std::nullopt;
         xmlDocument_ = cache ? QVCTXMLDocument::initWithContentsOfURL(*cache) : nullptr;
     }
     return *xmlDocument_;

@@ -22,17 +22,17 @@ class TGRTMetaData;
 /// opened once. It shows the item as it was when it was read. Not thread-safe.
 class QVCT_API ContentItem {
   public:
-    /// How the record is to be read: MetaDataReaderOptions, and the taxonomy in which labels are resolved;
-    /// without one the shared writable default taxonomy.
-    struct RecordReading {
-        std::uint64_t options = 0;
-        std::shared_ptr<TGRTTaxonomy> taxonomy;
+    /// What is to be read, and how.
+    struct Reading {
+        std::uint64_t options = 0;               ///< For the record: MetaDataReaderOptions.
+        std::shared_ptr<TGRTTaxonomy> taxonomy;  ///< For its labels; null is the shared writable default one.
+        bool withXmlDocument = true;             ///< Else there is none: for whoever does not need it.
     };
 
     /// With the stored record alone, its labels resolved in the shared writable default taxonomy.
     explicit ContentItem(URL url);
     /// With a record that is read in another way.
-    ContentItem(URL url, RecordReading reading);
+    ContentItem(URL url, Reading reading);
     ~ContentItem();
 
     const URL& url() const { return file_.url(); }
@@ -54,7 +54,7 @@ class QVCT_API ContentItem {
     };
 
     ItemFile file_;
-    RecordReading reading_;
+    Reading reading_;
     std::optional<std::shared_ptr<QVCTXMLDocument>> xmlDocument_;
     std::optional<Record> record_;
 };

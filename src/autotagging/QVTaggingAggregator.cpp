@@ -53,8 +53,8 @@ class AtHand {
 
 std::shared_ptr<QVTaggingAggregator> QVTaggingAggregator::independentTaggingAggregator() {
     auto aggregator = initWithRules(std::nullopt, std::nullopt);
-    aggregator->taxonomyOfRecords_ = TGRTTaxonomy::newTaxonomyOfType(kDefaultTaxonomy, false, false);
-    aggregator->setTaxonomy(aggregator->taxonomyOfRecords_);
+    aggregator->setTaxonomy(TGRTTaxonomy::newTaxonomyOfType(kDefaultTaxonomy, false, false));
+    aggregator->readsInItsTaxonomy_ = true;
     return aggregator;
 }
 
@@ -87,7 +87,8 @@ QVTaggingAggregator::QVTaggingAggregator(Services services) : taggingServices_(s
 
 std::shared_ptr<ContentItem> QVTaggingAggregator::itemForURL(const URL& url, std::uint64_t options) const {
     if (item_ && item_->url() == url) return item_;
-    return std::make_shared<ContentItem>(url, ContentItem::RecordReading{options, taxonomyOfRecords_});
+    return std::make_shared<ContentItem>(
+        url, ContentItem::Reading{options, readsInItsTaxonomy_ ? taxonomy_ : nullptr});
 }
 
 std::shared_ptr<QVCTXMLDocument> QVTaggingAggregator::xmlDocumentForURL(const URL& url) {

@@ -74,7 +74,7 @@ class QVCT_API QVTaggingAggregator {
     explicit QVTaggingAggregator(Services services);
 
   private:
-    std::shared_ptr<TGRTTaxonomy> taxonomyOfRecords_;  // null: the shared writable default taxonomy
+    bool readsInItsTaxonomy_ = false;  // records, else in the shared writable default taxonomy
     /// The item at hand, or one for another URL.
     std::shared_ptr<ContentItem> itemForURL(const URL& url, std::uint64_t options) const;
 

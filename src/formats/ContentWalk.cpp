@@ -2,7 +2,6 @@
 
 #include "formats/ContentFolderWalk.h"
 #include "platform/files/FileAccess.h"
-#include "platform/text/Text.h"
 
 namespace qvct {
 

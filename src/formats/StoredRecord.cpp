@@ -5,7 +5,6 @@
 #include "platform/files/EditLock.h"
 #include "platform/files/FileAccess.h"
 #include "platform/files/FileReplacement.h"
-#include "platform/text/Text.h"
 #include "taxonomy/TaggingTypes.h"
 
 #include <utility>

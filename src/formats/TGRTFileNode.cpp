@@ -6,7 +6,6 @@
 #include "formats/bundle/TGRTBundleTypeValidators.h"
 #include "formats/preset/TGRTVorthalPresetTypeValidator.h"
 #include "formats/settings/TGRTCstSxvPstTypeValidator.h"
-#include "platform/text/Text.h"
 
 #include <algorithm>
 #include <array>

@@ -2,7 +2,6 @@
 
 #include "formats/QVContentEditorFileUtilities.h"
 #include "formats/TGRTMetaDataReaderFactory.h"
-#include "platform/text/Text.h"
 #include "taxonomy/TGRTLegacyTaxonomyMapping.h"
 #include "taxonomy/TaggingSetAdditions.h"
 
@@ -56,7 +55,7 @@ std::shared_ptr<TGRTMetaData> readRecord(const URL& url, std::uint64_t options,
     if (const auto reader = TGRTMetaDataReaderFactory::metaDataReaderForURL(url, taxonomy)) {
         return reader->readMetaDataFromURL(url, options, error);
     }
-    fail(error, kErrorInvalidArgument, "no kind of content", {url.path()});
+    fail(error, kErrorNoContent, "no kind of content", {url.path()});
     return nullptr;
 }
 

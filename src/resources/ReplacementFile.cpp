@@ -67,9 +67,9 @@ class Verdicts {
     /// Keeps the verdict. False when another thread has reached the same one meanwhile.
     bool set(const std::string& path, const Verdict& verdict) {
         const std::lock_guard lock(mutex_);
-        Verdict& known = verdicts_[path];
-        const bool isNew = known.stamp != verdict.stamp;
-        known = verdict;
+        const auto [known, isFirst] = verdicts_.try_emplace(path, verdict);
+        const bool isNew = isFirst || known->second.stamp != verdict.stamp;
+        known->second = verdict;
         return isNew;
     }
 

@@ -331,9 +331,9 @@ TEST(RhythmCommand, NamesWhatCannotBeMeasuredAndDoesTheRest) {
     } rows[] = {
         {folder.path("none.mid"), "none.mid: No such file"},
         {folder.path("none.wav"), "none.wav: "},
-        {folder.write("text.mid", "no notes"), "text.mid, byte 0: "},
+        {folder.write("text.mid", "no notes"), "text.mid: byte 0: "},
         {folder.write("text.wav", "no sound"), "text.wav: "},
-        {folder.write("d.mid", "MThd" + big(6, 4) + big(0, 2) + big(1, 2) + big(0, 2)), "d.mid, byte 12: "},
+        {folder.write("d.mid", "MThd" + big(6, 4) + big(0, 2) + big(1, 2) + big(0, 2)), "d.mid: byte 12: "},
         {folder.write("empty.mid", emptyMidi()), "empty.mid: nothing sounds in it"},
         {folder.write("silence.wav", clicks({})), "silence.wav: nothing sounds in it"},
         {folder.write("nothing.wav", wav.file(wav.format(1) + wav.chunk("data", ""))),
@@ -387,7 +387,7 @@ TEST(RhythmCommand, TellsWhatIsDamagedInAMidiFile) {
     const ToolResult partly = rhythm({cut});
     EXPECT_EQ(partly.status, 0);
     EXPECT_EQ(partly.json()[0]["onsets"].size(), 2U);
-    EXPECT_THAT(partly.errors, HasSubstr("cut.mid, byte "));
+    EXPECT_THAT(partly.errors, HasSubstr("cut.mid: byte "));
     EXPECT_EQ(rhythm({cut, "--quiet"}).errors, "");
     const ToolResult nothing = rhythm({folder.write("none.mid", emptyMidi().substr(0, 24))});
     EXPECT_EQ(nothing.status, 1);

@@ -97,7 +97,7 @@ TEST(Autotag, NamesWhatFailsAndDoesTheRest) {
         {"broken table in the resources",
          {"--resources", folder.path("table"), folder.path("Kick.wav")},
          1,
-         {"LegacyLoopTaxonomyMapping.csv, line 1: is not the header (using the built-in one)"}},
+         {"LegacyLoopTaxonomyMapping.csv: line 1: is not the header (using the built-in one)"}},
         {"missing resource folder",
          {"--resources", "/none", folder.path("Kick.wav")},
          1,
@@ -302,7 +302,7 @@ TEST(LegacyTaxonomy, ShowsWhatTheTablesLeaveOut) {
     const ToolResult own = runTool({"--resources", folder.path(), "taxonomy", "coverage", "--json"});
     EXPECT_EQ(own.status, 1);
     EXPECT_THAT(own.errors,
-                HasSubstr("LegacyVorthalTaxonomyMapping.csv, line 1: is not the header (using the"));
+                HasSubstr("LegacyVorthalTaxonomyMapping.csv: line 1: is not the header (using the"));
     ASSERT_EQ(own.json().size(), 2U);
     EXPECT_EQ(own.json()[0]["withoutRow"].size(), 137U);
     EXPECT_THAT(own.json()[0]["unknownLabels"], ElementsAre("Darkish"));

@@ -125,7 +125,7 @@ TEST(XmlDocument, RecoversWhatMakesSense) {
                     ->isMatchingXPath("/Patch/Channels/Channel[@mode='Mono']"));
     EXPECT_TRUE(document("<a><b></c></a>")->isMatchingXPath("/a/b"));
     EXPECT_FALSE(document("no XML at all")->isMatchingXPath("/*"));
-    EXPECT_THAT(log.messages().front(), HasSubstr("test.xml, line 1: "));
+    EXPECT_THAT(log.messages().front(), HasSubstr("test.xml: line 1: "));
 }
 
 TEST(XmlDocument, DamagedFilesDoNotFloodTheLog) {
@@ -318,7 +318,7 @@ TEST(XMLDocument, TooLargeForMemoryIsCutShort) {
     EXPECT_TRUE(document->isMatchingXPath("/P/a[72999]"));
     EXPECT_FALSE(document->isMatchingXPath("/P/a[73000]"));
     EXPECT_FALSE(document->isMatchingXPath("/P/last"));
-    EXPECT_THAT(log.messages(), ElementsAre(HasSubstr("huge.xml, line 1: more than 219000 elements")));
+    EXPECT_THAT(log.messages(), ElementsAre(HasSubstr("huge.xml: line 1: more than 219000 elements")));
 }
 
 /// Many times `piece`, with its number where it says "#".

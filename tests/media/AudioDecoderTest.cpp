@@ -103,6 +103,13 @@ TEST(AudioDecoder, StopsAtTheEndOfATruncatedFile) {
     EXPECT_LE(decoded(*decoder).size(), 500U);
 }
 
+TEST(AudioDecoder, AnOddSoundWithoutItsPadByteIsHeardToItsEnd) {
+    const auto decoder = decoderOf(wav(1, 1, 8000, 8, std::string(333, '\x80')));
+    ASSERT_TRUE(decoder);
+    EXPECT_EQ(decoder->frames(), 333);
+    EXPECT_EQ(decoded(*decoder).size(), 333U);
+}
+
 TEST(AudioDecoder, FloatFilesWithoutNumbersHaveNoOnsetsOfTheirOwn) {
     std::vector<float> samples(30000, 0.0F);
     for (std::size_t i = 0; i < samples.size(); i += 3) samples[i] = i % 2 ? std::nanf("") : HUGE_VALF;

@@ -80,6 +80,14 @@ TEST(ReplacementFile, IsUsedWhenItIsWholeElseToldOfOnceAndReplacedByTheBuiltInOn
     EXPECT_EQ(packDisplayNames().size(), rows[4].builtIn);
 }
 
+TEST(ReplacementFile, ThatIsNotThereIsToldOf) {
+    const test::CapturedLog log;
+    ResourceBundle::setPathForResource("DefaultKeywordMapping", "plist", "/no/such.plist");
+    EXPECT_GT(QVCTKeywordExtractor::defaultKeywordMapping().size(), 1U);
+    ResourceBundle::setPathForResource("DefaultKeywordMapping", "plist", std::nullopt);
+    EXPECT_THAT(log.messages(), ElementsAre(HasSubstr("/no/such.plist: ")));
+}
+
 TEST(ReplacementFile, OfAMappingTableMustBeOne) {
     const std::string header =
         "Type;Legacy Keyword;Legacy Keyword Sub;New Taxonomy Keyword 1;New Taxonomy Keyword 2;"

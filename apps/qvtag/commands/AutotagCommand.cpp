@@ -12,7 +12,6 @@
 #include "output/ItemTable.h"
 #include "output/StandardStreams.h"
 #include "platform/data/PropertyListFile.h"
-#include "platform/text/Text.h"
 
 #include <algorithm>
 #include <memory>
@@ -125,7 +124,7 @@ void run(const Options& options, ToolContext& context) {
     JsonItems json(context.format);
     Totals totals;
     context.forEachContentItem(options.paths, options.links, [&](const URL& url) {
-        const auto item = std::make_shared<ContentItem>(url, ContentItem::RecordReading{bits, nullptr});
+        const auto item = std::make_shared<ContentItem>(url, ContentItem::Reading{bits, nullptr});
         auto found = aggregator->taggingsOfItem(item, *taxonomy, bits);
         if (options.measuresAnyRhythm) addAnyRhythm(*item, *taxonomy, found);
         const Taggings taggings = sortedTaggings(found);
@@ -138,8 +137,8 @@ void run(const Options& options, ToolContext& context) {
     });
     if (context.format != Format::table) return json.finish();
     printItemTable(rows, context.terminal());
-    context.note(
-        fmt::format("{} items, {} of them tagged, {} tags", totals.items, totals.tagged, totals.tags));
+    context.note(fmt::format("{}, {} of them tagged, {}", counted(totals.items, "item"), totals.tagged,
+                             counted(totals.tags, "tag")));
 }
 
 }  // namespace

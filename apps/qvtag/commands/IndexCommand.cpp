@@ -7,7 +7,6 @@
 #include "output/Progress.h"
 #include "output/StandardStreams.h"
 #include "platform/processes/Interruption.h"
-#include "platform/text/Text.h"
 
 #include <chrono>
 #include <memory>
@@ -43,7 +42,7 @@ Json jsonOfRun(const IndexOptions& options, const IndexProgress& progress, doubl
 
 void printRun(const Json& run, const IndexProgress& progress, const ToolContext& context) {
     if (context.format != Format::table) return printJson(run, context.format);
-    print("{} items: {} indexed ({} of them moved), {} unchanged, {} failed", progress.seen,
+    print("{}: {} indexed ({} of them moved), {} unchanged, {} failed", counted(progress.seen, "item"),
           progress.described, progress.moved, progress.unchanged, progress.failed);
     if (progress.missing > 0) print(", {} missing of which {} pruned", progress.missing, progress.pruned);
     print("; {:.1f} s, {:.0f} a second\n", run["seconds"].get<double>(), run["itemsPerSecond"].get<double>());

@@ -7,7 +7,6 @@
 #include <memory>
 
 #include <CLI/CLI.hpp>
-#include <fmt/format.h>
 
 namespace qvct::tool {
 namespace {

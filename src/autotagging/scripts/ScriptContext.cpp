@@ -7,7 +7,6 @@
 #include "autotagging/xml/XPathDeadline.h"
 #include "platform/base/Log.h"
 #include "platform/processes/HardLimit.h"
-#include "platform/text/Text.h"
 
 #include <string>
 #include <unordered_map>

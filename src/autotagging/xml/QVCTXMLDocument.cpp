@@ -7,7 +7,6 @@
 #include "platform/data/XmlParsing.h"
 #include "platform/files/Decompression.h"
 #include "platform/files/FileAccess.h"
-#include "platform/text/Text.h"
 
 #include <unordered_map>
 #include <utility>

@@ -2,11 +2,8 @@
 
 #include "formats/ItemFile.h"
 #include "formats/audiofile/TGRTAudioFileTypeValidator.h"
-#include "platform/text/Text.h"
 
 #include <array>
-
-#include <fmt/format.h>
 
 namespace qvct {
 

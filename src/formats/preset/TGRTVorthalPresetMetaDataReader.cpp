@@ -3,11 +3,8 @@
 #include "formats/ItemFile.h"
 #include "formats/preset/PresetRecord.h"
 #include "formats/preset/TGRTVorthalLegacyTaggingParser.h"
-#include "platform/text/Text.h"
 
 #include <array>
-
-#include <fmt/format.h>
 
 namespace qvct {
 

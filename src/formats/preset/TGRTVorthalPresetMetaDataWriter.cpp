@@ -8,8 +8,6 @@
 
 #include <functional>
 
-#include <fmt/format.h>
-
 namespace qvct {
 namespace {
 

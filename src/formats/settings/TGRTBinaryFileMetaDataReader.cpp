@@ -6,12 +6,9 @@
 #include "platform/data/PropertyListFile.h"
 #include "platform/files/FileAccess.h"
 #include "platform/processes/ProcessArguments.h"
-#include "platform/text/Text.h"
 
 #include <algorithm>
 #include <array>
-
-#include <fmt/format.h>
 
 namespace qvct {
 

@@ -3,12 +3,9 @@
 #include "platform/base/ByteOrder.h"
 #include "platform/files/RandomAccessReader.h"
 #include "platform/files/SwapData.h"
-#include "platform/text/Text.h"
 
 #include <algorithm>
 #include <array>
-
-#include <fmt/format.h>
 
 namespace qvct {
 namespace {

@@ -23,12 +23,13 @@ struct PositionedFile {
 
     sf_count_t seek(sf_count_t offset, int whence) {
         const sf_count_t base = whence == SEEK_SET ? 0 : whence == SEEK_CUR ? position : size();
-        // Bounded by subtraction: offsets come from the file.
-        if (offset < -base || offset > size() - base) return -1;
+        // Bounded by subtraction: offsets come from the file. Beyond its end is a place as in any other file.
+        constexpr sf_count_t farthest = sf_count_t{1} << 62;
+        if (offset < -base || offset > farthest - base) return -1;
         return position = base + offset;
     }
     sf_count_t read(void* target, sf_count_t count) {
-        const sf_count_t given = std::clamp<sf_count_t>(count, 0, size() - position);
+        const sf_count_t given = std::clamp<sf_count_t>(count, 0, std::max<sf_count_t>(size() - position, 0));
         const std::span into(static_cast<std::uint8_t*>(target), static_cast<std::size_t>(given));
         if (!reader->read(static_cast<std::uint64_t>(position), into)) return 0;
         position += given;

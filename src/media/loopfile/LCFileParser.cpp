@@ -10,8 +10,6 @@
 #include <cmath>
 #include <optional>
 
-#include <fmt/format.h>
-
 namespace qvct {
 namespace {
 

@@ -40,8 +40,8 @@ struct LCChunk {
 /// name.
 ///
 /// Only headers and descriptive chunks are read: a file of any size costs a few kilobytes and system calls.
-/// What a file claims is bounded by its size before anything is allocated. Each operation opens the file anew
-/// and closes it; a parser may be used by several threads.
+/// What a file claims is bounded by its size before anything is allocated. A parser for a URL opens the file
+/// for each operation and closes it again; a parser may be used by several threads.
 class LCFileParser {
   public:
     static std::shared_ptr<LCFileParser> fileParserForURL(const URL& url);

@@ -1,7 +1,6 @@
 #include "media/loopfile/LCFingerprint.h"
 
 #include "media/loopfile/containers/Container.h"
-#include "platform/text/Text.h"
 
 #include <algorithm>
 

@@ -2,8 +2,6 @@
 
 #include <utility>
 
-#include <fmt/format.h>
-
 namespace qvct {
 namespace {
 

@@ -16,10 +16,14 @@ void append(std::string& text, std::string_view separator, std::string_view more
 
 std::string Error::message() const {
     std::string text = printable(path);
-    if (!part.empty()) append(text, ": ", printable(part));
-    if (line) append(text, ", ", "line " + std::to_string(*line));
-    if (offset) append(text, ", ", "byte " + std::to_string(*offset));
-    if (!reason.empty()) append(text, ": ", reason);
+    const char* separator = ": ";
+    const auto addPlace = [&](std::string_view place) {
+        append(text, std::exchange(separator, ", "), place);
+    };
+    if (!part.empty()) addPlace(printable(part));
+    if (line) addPlace("line " + std::to_string(*line));
+    if (offset) addPlace("byte " + std::to_string(*offset));
+    if (!reason.empty()) append(text, ": ", printable(reason));
     return text;
 }
 

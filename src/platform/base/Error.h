@@ -33,7 +33,7 @@ struct QVCT_API Error : ErrorPlace {
     bool isSet() const { return !reason.empty(); }
 
     /// The sentence for people, fit for one line: "PATH: PART, line LINE, byte OFFSET: REASON" without what
-    /// is unknown; what cannot be printed of the place is escaped.
+    /// is unknown; what cannot be printed is escaped.
     std::string message() const;
 };
 

@@ -3,9 +3,7 @@
 #include "platform/data/XmlParsing.h"
 #include "platform/files/Decompression.h"
 #include "platform/files/FileAccess.h"
-#include "platform/text/Text.h"
 
-#include <fmt/format.h>
 #include <libxml/tree.h>
 #include <libxml/xpath.h>
 #include <libxml/xpathInternals.h>

@@ -1,7 +1,6 @@
 #include "platform/files/EmptyFile.h"
 
 #include "platform/files/FileDescriptor.h"
-#include "platform/text/Text.h"
 
 #include <cerrno>
 #include <cstring>

@@ -10,7 +10,6 @@
 #include <cstring>
 
 #include <fcntl.h>
-#include <fmt/format.h>
 #include <sys/stat.h>
 #include <unistd.h>
 

@@ -1,7 +1,5 @@
 #include "platform/files/FolderListing.h"
 
-#include "platform/text/Text.h"
-
 #include <algorithm>
 #include <cerrno>
 #include <cstring>

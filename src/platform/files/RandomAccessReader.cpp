@@ -1,7 +1,6 @@
 #include "platform/files/RandomAccessReader.h"
 
 #include "platform/files/FileAccess.h"
-#include "platform/text/Text.h"
 
 #include <cerrno>
 #include <cstring>

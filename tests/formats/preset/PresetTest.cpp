@@ -159,9 +159,9 @@ TEST(Presets, RefuseWhatTheyCannotRewriteWithCertainty) {
         std::string text;
         const char* reason;
     } const cases[] = {
-        {"<metadata>\n<tagging>\n</tagging>\n", "a.vcp, line 1: the section does not end"},
-        {"x\n<tagging>\nName = a", "a.vcp, line 2: the section does not end"},
-        {"fine\n\xff\n", "a.vcp, line 2: not UTF-8"},
+        {"<metadata>\n<tagging>\n</tagging>\n", "a.vcp: line 1: the section does not end"},
+        {"x\n<tagging>\nName = a", "a.vcp: line 2: the section does not end"},
+        {"fine\n\xff\n", "a.vcp: line 2: not UTF-8"},
     };
     const TGRTVorthalPresetMetaDataWriter writer;
     for (const auto& c : cases) {
@@ -174,7 +174,7 @@ TEST(Presets, RefuseWhatTheyCannotRewriteWithCertainty) {
     Error error;
     EXPECT_FALSE(writer.writeTaggings({}, urlOf(folder.path("absent.vcp")), &error));
     EXPECT_EQ(read(folder.write("a.vcp", "\xff"), 0, &error), nullptr);
-    EXPECT_THAT(error.message(), testing::EndsWith("a.vcp, line 1: not UTF-8"));
+    EXPECT_THAT(error.message(), testing::EndsWith("a.vcp: line 1: not UTF-8"));
 }
 
 }  // namespace

@@ -4,8 +4,6 @@
 
 #include <cmath>
 
-#include <fmt/format.h>
-
 namespace qvct {
 namespace {
 
