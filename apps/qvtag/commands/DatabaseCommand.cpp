@@ -24,7 +24,7 @@ void merge(const Options& options, ToolContext& context) {
     const auto totals = merged ? merged->totals(&error) : std::nullopt;
     if (!totals) return context.itemFailed(error);
     if (context.format == Format::table)
-        return print("{} items, {} of them failed\n", totals->items, totals->failures);
+        return print("{}, {} of them failed\n", counted(totals->items, "item"), totals->failures);
     printJson(Json{{"database", options.target}, {"items", totals->items}, {"failed", totals->failures}},
               context.format);
 }
@@ -48,7 +48,7 @@ void check(const Options& options, ToolContext& context) {
             return true;
         });
         if (context.format == Format::table)
-            print("{}: intact, {} items, {} of them failed\n", printable(path), totals->items,
+            print("{}: intact, {}, {} of them failed\n", printable(path), counted(totals->items, "item"),
                   totals->failures);
         json.push_back(
             {{"database", path}, {"intact", true}, {"items", totals->items}, {"failures", failures}});

@@ -94,8 +94,7 @@ void run(const Options& options, ToolContext& context) {
     if (context.format != Format::table) json.finish();
     if (withoutRecord > 0) {
         context.note(fmt::format("{} that {} nothing about {} left out; --options 256 shows {} too",
-                                 withoutRecord == 1 ? "1 item" : fmt::format("{} items", withoutRecord),
-                                 withoutRecord == 1 ? "stores" : "store",
+                                 counted(withoutRecord, "item"), withoutRecord == 1 ? "stores" : "store",
                                  withoutRecord == 1 ? "itself is" : "themselves are",
                                  withoutRecord == 1 ? "it" : "them"));
     }

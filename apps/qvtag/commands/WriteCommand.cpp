@@ -227,8 +227,9 @@ void run(const Options& options, ToolContext& context) {
         }
     }
     if (context.format != Format::table) return printJson(json, context.format);
-    context.note(options.isDryRun ? std::string("nothing was written: this is a dry run")
-                                  : fmt::format("{} items written, {} unchanged", written, unchanged));
+    context.note(options.isDryRun
+                     ? std::string("nothing was written: this is a dry run")
+                     : fmt::format("{} written, {} unchanged", counted(written, "item"), unchanged));
 }
 
 }  // namespace

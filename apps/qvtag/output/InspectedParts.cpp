@@ -143,7 +143,7 @@ Parts presetParts(const URL& url, Error* error) {
         InspectedPart part{"<" + section.name + ">",
                            section.offset,
                            section.size,
-                           fmt::format("section, {} items", section.items.size()),
+                           "section, " + counted(section.items.size(), "item"),
                            section.isClosed ? "" : "does not end",
                            {}};
         for (const auto& [key, value] : section.items) part.children.push_back({key, {}, {}, value, {}, {}});

@@ -98,6 +98,10 @@ std::string pathOfTag(const TGRTTag& tag) {
     return printable(tag.categoryIdentifier() + " > " + path);
 }
 
+std::string counted(std::uint64_t count, std::string_view thing) {
+    return fmt::format("{} {}{}", count, thing, count == 1 ? "" : "s");
+}
+
 std::string padded(std::string_view text, std::size_t columns) {
     const std::size_t width = displayWidth(text);
     return std::string(text) + std::string(columns > width ? columns - width : 0, ' ');

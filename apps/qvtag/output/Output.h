@@ -2,6 +2,7 @@
 
 #include "taxonomy/TGRTTagging.h"
 
+#include <cstdint>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -60,6 +61,9 @@ std::string textOfTagging(const TGRTTagging& tagging);
 
 /// "Genres > Electronic Music > House"
 std::string pathOfTag(const TGRTTag& tag);
+
+/// "1 item", "2 items"
+std::string counted(std::uint64_t count, std::string_view thing);
 
 /// Pads with blanks to that many columns of a terminal.
 std::string padded(std::string_view text, std::size_t columns);

@@ -52,7 +52,7 @@ Json jsonOfPropertyList(const PropertyList& value) {
 
 std::string textOfPropertyList(const PropertyList& value) {
     if (const auto* dictionary = value.dictionary()) return fmt::format("{} entries", dictionary->size());
-    if (const auto* array = value.array()) return fmt::format("{} items", array->size());
+    if (const auto* array = value.array()) return counted(array->size(), "item");
     if (const std::string* text = value.string()) return printable(*text);
     if (const auto* data = value.data()) return textOfData(*data);
     if (const auto* date = value.date()) return textOfDate(*date);
