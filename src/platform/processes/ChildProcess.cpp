@@ -1,12 +1,13 @@
 #include "platform/processes/ChildProcess.h"
 
-#include "platform/text/Text.h"
+#include "platform/processes/StandardStreams.h"
 
 #include <array>
 #include <cerrno>
 #include <csignal>
 #include <cstring>
-#include <optional>
+#include <filesystem>
+#include <mutex>
 #include <utility>
 
 #include <fcntl.h>
@@ -14,19 +15,14 @@
 #include <poll.h>
 #include <spawn.h>
 #include <sys/socket.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 namespace qvct {
 namespace {
 
-/// A copy of the descriptor whose number is none of the child's standard streams: a host may have closed its
-/// own, so that new files get these numbers. Closes the one given.
-FileDescriptor raised(int descriptor) {
-    constexpr int kFirst = STDERR_FILENO + 1;
-    const FileDescriptor given(descriptor);
-    return FileDescriptor(::fcntl(given.number(), F_DUPFD_CLOEXEC, kFirst));
-}
+/// What a process gets to end by itself, and the system to end one that was killed.
+constexpr std::chrono::milliseconds kGrace(1000);
+constexpr std::size_t kMostAtOnce = 1U << 20U;
 
 /// What the child gets: its files, and default signal handling, except that SIGINT is blocked: a terminal
 /// sends it to all of its processes, and this one decides what it means.
@@ -68,20 +64,50 @@ class SpawnPlan {
     posix_spawnattr_t attributes_{};
 };
 
+/// Processes that were killed and have not ended: they wait for a disk that does not answer, for example.
+/// The system keeps each in its table until it has ended and was asked how.
+class Abandoned {
+  public:
+    void add(ProcessHandle process) {
+        const std::lock_guard lock(mutex_);
+        processes_.push_back(std::move(process));
+    }
+    void ask() {
+        const std::lock_guard lock(mutex_);
+        std::erase_if(processes_, [](const ProcessHandle& process) {
+            return process.awaitEnd(std::chrono::milliseconds(0)).has_value();
+        });
+    }
+
+  private:
+    std::mutex mutex_;
+    std::vector<ProcessHandle> processes_;
+};
+
+Abandoned& abandoned() {
+    static Abandoned all;
+    return all;
+}
+
 }  // namespace
 
 std::unique_ptr<ChildProcess> ChildProcess::start(const std::string& program,
                                                   const std::vector<std::string>& arguments,
                                                   std::size_t memory, Error* error) {
+    if (!std::filesystem::path(program).is_absolute()) {
+        fail(error, kErrorInvalidArgument, "is not an absolute path", {program});
+        return nullptr;
+    }
+    abandoned().ask();
     std::array<int, 2> pair = {-1, -1};
-    auto shared = SharedMemory::make(memory);
     std::optional<pid_t> id;
     FileDescriptor ours(-1);
+    const FileDescriptor theirMemory = besideStandardStreams(SharedMemory::make(memory));
+    auto shared = SharedMemory::map(theirMemory, memory);
     if (shared && ::socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, pair.data()) == 0) {
-        ours = raised(pair[0]);
-        const FileDescriptor theirs = raised(pair[1]);
-        const FileDescriptor theirMemory(::fcntl(shared->descriptor(), F_DUPFD_CLOEXEC, STDERR_FILENO + 1));
-        if (ours.isOpen() && theirs.isOpen() && theirMemory.isOpen())
+        ours = besideStandardStreams(FileDescriptor(pair[0]));
+        const FileDescriptor theirs = besideStandardStreams(FileDescriptor(pair[1]));
+        if (ours.isOpen() && theirs.isOpen())
             id = SpawnPlan(theirs.number(), theirMemory.number()).start(program, arguments);
     }
     if (!id) {
@@ -108,27 +134,38 @@ void ChildProcess::send(std::string& bytes) {
 
 bool ChildProcess::receive(std::string& bytes) {
     std::array<char, 1U << 16U> chunk;
-    while (true) {
+    for (std::size_t taken = 0; taken < kMostAtOnce;) {
         const ssize_t count = ::recv(socket_.number(), chunk.data(), chunk.size(), 0);
         if (count < 0 && errno == EINTR) continue;
         if (count <= 0) return count < 0 && (errno == EAGAIN || errno == EWOULDBLOCK);
         bytes.append(chunk.data(), static_cast<std::size_t>(count));
+        taken += static_cast<std::size_t>(count);
     }
+    return true;
+}
+
+void ChildProcess::hangUp() {
+    if (!socket_.isOpen()) return;
+    socket_ = FileDescriptor(-1);
+    hungUp_ = std::chrono::steady_clock::now();
 }
 
 void ChildProcess::kill() {
-    if (id_ != 0) ::kill(id_, SIGKILL);
+    if (process_) process_->kill();
 }
 
 ProcessEnd ChildProcess::end() {
-    if (id_ == 0) return {};
-    socket_ = FileDescriptor(-1);
-    kill();
-    int status = 0;
-    while (::waitpid(id_, &status, 0) < 0 && errno == EINTR) {
+    if (!process_) return {};
+    hangUp();
+    const auto since = std::chrono::steady_clock::now() - hungUp_;
+    auto end = process_->awaitEnd(kGrace - std::chrono::duration_cast<std::chrono::milliseconds>(since));
+    if (!end) {
+        process_->kill();
+        end = process_->awaitEnd(kGrace);
     }
-    id_ = 0;
-    return {WEXITSTATUS(status), WIFSIGNALED(status) ? ::strsignal(WTERMSIG(status)) : ""};
+    if (!end) abandoned().add(*std::move(process_));
+    process_.reset();
+    return end.value_or(ProcessEnd{});
 }
 
 void ChildProcess::await(std::span<const Awaited> processes, std::chrono::milliseconds patience) {

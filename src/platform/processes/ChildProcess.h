@@ -2,22 +2,18 @@
 
 #include "platform/base/Error.h"
 #include "platform/files/FileDescriptor.h"
+#include "platform/processes/ProcessHandle.h"
 #include "platform/processes/SharedMemory.h"
 
 #include <chrono>
 #include <cstddef>
 #include <memory>
+#include <optional>
 #include <span>
 #include <string>
 #include <vector>
 
 namespace qvct {
-
-/// How a process came to its end.
-struct ProcessEnd {
-    int status = 0;      ///< What it answered.
-    std::string signal;  ///< The signal that ended it, in the system's words; empty for none.
-};
 
 /// A program of our own that runs beside this process, and no longer than it. Both send bytes to each other,
 /// and see one stretch of memory; `ParentProcess` is the other end.
@@ -27,7 +23,8 @@ struct ProcessEnd {
 /// file.
 class ChildProcess {
   public:
-    /// With `memory` bytes to be seen by both. Null, and an error, when it cannot be started.
+    /// With `memory` bytes to be seen by both. Null, and an error, when it cannot be started. A relative path
+    /// is refused: what it stands for depends on where the host happens to be.
     static std::unique_ptr<ChildProcess> start(const std::string& program,
                                                const std::vector<std::string>& arguments, std::size_t memory,
                                                Error* error);
@@ -38,13 +35,16 @@ class ChildProcess {
 
     /// Sends as much as the system takes without waiting, and removes that from the beginning of `bytes`.
     void send(std::string& bytes);
-    /// Appends what has arrived, without waiting. False when nothing will arrive any more.
+    /// Appends what has arrived, without waiting, but not more than a megabyte. False when nothing will
+    /// arrive any more.
     bool receive(std::string& bytes);
     void* memory() const { return memory_.address(); }
 
-    /// Kills it; `end` then says how it ended.
+    /// Tells it that there is nothing more to do. It has a second from then on to end by itself.
+    void hangUp();
     void kill();
-    /// Kills it unless it has ended by itself, and answers how it ended.
+    /// Hangs up, waits for its end, kills it when it takes too long, and answers how it ended. Takes two
+    /// seconds at most: one that cannot even be killed, since the system is busy for it, is left to itself.
     ProcessEnd end();
 
     struct Awaited {
@@ -57,11 +57,12 @@ class ChildProcess {
 
   private:
     ChildProcess(int id, FileDescriptor socket, SharedMemory memory)
-        : id_(id), socket_(std::move(socket)), memory_(std::move(memory)) {}
+        : process_(id), socket_(std::move(socket)), memory_(std::move(memory)) {}
 
-    int id_;  ///< 0 when it is gone.
+    std::optional<ProcessHandle> process_;  ///< None when it has ended.
     FileDescriptor socket_;
     SharedMemory memory_;
+    std::chrono::steady_clock::time_point hungUp_;
 };
 
 }  // namespace qvct

@@ -17,9 +17,13 @@ namespace {
 
 /// Takes the file from a standard stream, which is closed by that.
 FileDescriptor taken(int stream) {
-    FileDescriptor file(::fcntl(stream, F_DUPFD_CLOEXEC, STDERR_FILENO + 1));
-    ::close(stream);
-    return file;
+    return besideStandardStreams(FileDescriptor(stream));
+}
+
+/// Whether nobody has the other end any more.
+bool isHungUp(const FileDescriptor& socket) {
+    pollfd end{socket.number(), 0, 0};
+    return ::poll(&end, 1, 0) > 0 && (end.revents & POLLHUP) != 0;
 }
 
 }  // namespace
@@ -27,9 +31,10 @@ FileDescriptor taken(int stream) {
 std::optional<ParentProcess> ParentProcess::connect(std::size_t memory) {
     ::prctl(PR_SET_PDEATHSIG, SIGKILL);
     FileDescriptor socket = taken(STDIN_FILENO);
-    auto shared = SharedMemory::open(taken(STDOUT_FILENO), memory);
+    auto shared = SharedMemory::map(taken(STDOUT_FILENO), memory);
     openStandardStreams();
-    if (!socket.isOpen() || !shared) return std::nullopt;
+    // A parent that was gone before it could be watched has closed its end already.
+    if (!socket.isOpen() || !shared || isHungUp(socket)) return std::nullopt;
     return ParentProcess(std::move(socket), *std::move(shared));
 }
 

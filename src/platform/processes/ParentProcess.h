@@ -13,7 +13,7 @@ namespace qvct {
 class ParentProcess {
   public:
     /// To be called first in such a program, which cannot use standard input and output from then on. Nothing
-    /// when the process was not started as a `ChildProcess` with that much memory.
+    /// when the process was not started as a `ChildProcess` with that much memory, or its parent is gone.
     static std::optional<ParentProcess> connect(std::size_t memory);
 
     /// Waits until all was sent, and empties `bytes`. False when nobody receives any more.

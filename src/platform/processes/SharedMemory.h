@@ -8,15 +8,16 @@
 
 namespace qvct {
 
-/// Memory that is shared by all processes that have its descriptor. Filled with zeros when it is made.
+/// Memory that several processes see. It lives as long as one of them does.
 class SharedMemory {
   public:
-    /// Nothing where the system has no more.
-    static std::optional<SharedMemory> make(std::size_t size);
-    /// What another process has made; nothing when the descriptor stands for something else.
-    static std::optional<SharedMemory> open(FileDescriptor descriptor, std::size_t size);
+    /// Makes memory that is filled with zeros, and answers the descriptor by which other processes see it,
+    /// too. None of them can change its size. Not open, and `errno` says why, where the system has no more.
+    static FileDescriptor make(std::size_t size);
+    /// What was made here or in another process; the descriptor is not needed any more afterwards. Nothing
+    /// when it stands for something else.
+    static std::optional<SharedMemory> map(const FileDescriptor& descriptor, std::size_t size);
 
-    int descriptor() const { return descriptor_.number(); }
     void* address() const { return address_.get(); }
 
   private:
@@ -25,10 +26,8 @@ class SharedMemory {
         void operator()(void* address) const;
     };
 
-    SharedMemory(FileDescriptor descriptor, void* address, std::size_t size)
-        : descriptor_(std::move(descriptor)), address_(address, Unmapping{size}) {}
+    SharedMemory(void* address, std::size_t size) : address_(address, Unmapping{size}) {}
 
-    FileDescriptor descriptor_;
     std::unique_ptr<void, Unmapping> address_;
 };
 

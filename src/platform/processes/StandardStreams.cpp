@@ -24,6 +24,11 @@ void openStandardStreams() {
     }
 }
 
+FileDescriptor besideStandardStreams(FileDescriptor file) {
+    if (!file.isOpen() || file.number() > STDERR_FILENO) return file;
+    return FileDescriptor(::fcntl(file.number(), F_DUPFD_CLOEXEC, STDERR_FILENO + 1));
+}
+
 void ignoreBrokenPipes() {
     std::signal(SIGPIPE, SIG_IGN);
 }

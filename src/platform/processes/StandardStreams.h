@@ -1,5 +1,7 @@
 #pragma once
 
+#include "platform/files/FileDescriptor.h"
+
 #include <cstddef>
 #include <optional>
 
@@ -8,6 +10,10 @@ namespace qvct {
 /// Opens those standard streams that were closed when the program started, in a way that using them still
 /// fails. Otherwise the next file to be opened would take their place, and messages would be written into it.
 void openStandardStreams();
+
+/// The same file under a number that is none of the standard streams'. A host may have closed these, so that
+/// a new file gets the number of one, and would receive what is written there.
+FileDescriptor besideStandardStreams(FileDescriptor file);
 
 /// Makes writing to a pipe that nobody reads an ordinary error instead of a signal that ends the program. For
 /// programs of our own.
