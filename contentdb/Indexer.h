@@ -28,9 +28,9 @@ struct IndexProgress {
 
 /// A program that describes items by `runIndexWorker`.
 struct WorkerProgram {
-    /// Empty: our own, `qvct-index-worker`, which describes as `ContentDescriber` does. It is looked for
-    /// where the environment variable QVCT_INDEX_WORKER says, beside the library or program that has this
-    /// code, and where it is installed, in libexec/qvcontenttagging.
+    /// An absolute path. Empty: our own, `qvct-index-worker`, which describes as `ContentDescriber` does. It
+    /// is looked for where the environment variable QVCT_INDEX_WORKER says (absolute, too), beside the
+    /// library or program that has this code, and where it is installed, in libexec/qvcontenttagging.
     std::string path;
     /// For a program of the host's own.
     std::vector<std::string> arguments;
@@ -68,7 +68,8 @@ struct IndexOptions {
     WorkerProgram worker;
     /// The tagging services that our own worker program asks, a sum of QVCTAutoTaggingOptions.
     std::uint64_t services = optionsForAllTaggingServices();
-    /// Longest that a worker program may take for one item.
+    /// Longest that a worker program may take for one item. Time in which the calling thread is elsewhere, as
+    /// in a function of this struct, or is stopped, does not count.
     std::chrono::milliseconds timeLimitPerItem{30000};
     /// How long an item that was read may wait to be stored, and so how much work an interruption can lose. A
     /// shorter time makes the run slower.
@@ -90,9 +91,10 @@ struct IndexOptions {
 ///
 /// An item is read when it is new, when its size, times or inode have changed (or those of the record,
 /// description or preview beside it), or when another describer described it. Items are read in worker
-/// programs: one that crashes its worker, or takes too long, is stored as failed and costs no other item. The
-/// workers are given the files that replace resources here, end with this process, and inherit none of its
-/// open files but standard error; what they log is logged here, from the calling thread.
+/// programs: one that crashes its worker, takes too long, or has a description of more than 16 MiB, is stored
+/// as failed and costs no other item. The workers are given the files that replace resources here, end with
+/// this process, and inherit none of its open files but standard error; what they log is logged here, from
+/// the calling thread.
 ///
 /// Batches of items are stored whole or not at all: a run that was interrupted at any point is continued by
 /// the next. A new item with the payload of one that is gone is taken to be that item, moved.

@@ -28,10 +28,8 @@ IndexedItem itemBy(ItemDescriber& describer, const std::string& path) {
         Error error;
         if (auto item = describer.describe(path, &error)) return *std::move(item);
         failed.failure = failureOf(std::move(error), path);
-    } catch (const std::exception& fault) {
-        failed.failure = fault.what();
     } catch (...) {
-        failed.failure = "reading it failed for a reason that cannot be told";
+        failed.failure = reasonOfException();
     }
     return failed;
 }
@@ -39,13 +37,21 @@ IndexedItem itemBy(ItemDescriber& describer, const std::string& path) {
 }  // namespace
 
 Described describedBy(ItemDescriber& describer, const ItemTask& task) {
-    Described described{task.ticket, itemBy(describer, task.path), {}};
+    Described described{task.ticket, itemBy(describer, task.path), {}, !fileExists(task.path)};
     described.item.path = task.path;
-    // The file is gone, perhaps only for a moment: what was read may be incomplete, and a failure may not be
-    // the item's fault.
-    described.item.stamp = fileExists(task.path) ? task.stamp : ItemStamp{};
     described.terms = termsOf(described.item);
     return described;
+}
+
+std::string reasonOfException() {
+    std::string reason;
+    try {
+        throw;
+    } catch (const std::exception& fault) {
+        reason = fault.what();
+    } catch (...) {  // not one of ours, nor of the standard library
+    }
+    return reason.empty() ? "the describer failed and does not say why" : reason;
 }
 
 }  // namespace qvct::contentdb

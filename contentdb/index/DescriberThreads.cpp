@@ -2,7 +2,6 @@
 
 #include <algorithm>
 #include <chrono>
-#include <exception>
 #include <system_error>
 #include <utility>
 
@@ -49,15 +48,16 @@ bool DescriberThreads::collect(const std::function<void(Described)>& take) {
     constexpr std::chrono::milliseconds patience(100);
     if (running_.empty() && isBusy()) start();
     std::vector<Described> taken;
+    bool isInOrder = true;
     {
         std::unique_lock lock(mutex_);
         hasResult_.wait_for(lock, patience, [this] { return !ready_.empty() || problem_.isSet(); });
         taken.swap(ready_);
         onTheirWay_ -= taken.size();
-        if (problem_.isSet()) return false;
+        isInOrder = !problem_.isSet();
     }
     for (Described& described : taken) take(std::move(described));
-    return true;
+    return isInOrder;
 }
 
 Error DescriberThreads::problem() const {
@@ -81,8 +81,8 @@ void DescriberThreads::work() {
         } else {
             give("there is nothing that describes items");
         }
-    } catch (const std::exception& fault) {
-        give(fault.what());
+    } catch (...) {
+        give(reasonOfException());
     }
 }
 

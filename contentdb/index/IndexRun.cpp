@@ -149,8 +149,8 @@ bool IndexRun::submit(const ListedItem& item, ItemId id, const std::shared_ptr<O
         if (!collect()) return false;
     }
     ++folder->remaining;
-    pending_[++lastTicket_] = {id != 0 ? id : nextId_++, id == 0, folder};
-    describers_.submit({lastTicket_, pathIn(folder->path, item.name), item.stamp});
+    pending_[++lastTicket_] = {id != 0 ? id : nextId_++, id == 0, item.stamp, folder};
+    describers_.submit({lastTicket_, pathIn(folder->path, item.name)});
     return true;
 }
 
@@ -187,7 +187,7 @@ void IndexRun::store(std::vector<Described>& batch) {
     // In the order of the walk, so that the same library gives the same database.
     std::sort(batch.begin(), batch.end(),
               [](const Described& a, const Described& b) { return a.ticket < b.ticket; });
-    for (const Described& described : batch) {
+    for (Described& described : batch) {
         const auto hit = pending_.find(described.ticket);
         storeOne(described, hit->second);
         OpenFolder& folder = *hit->second.folder;
@@ -196,10 +196,11 @@ void IndexRun::store(std::vector<Described>& batch) {
     }
 }
 
-void IndexRun::storeOne(const Described& described, Pending& pending) {
-    const IndexedItem& item = described.item;
+void IndexRun::storeOne(Described& described, Pending& pending) {
+    IndexedItem& item = described.item;
+    item.stamp = described.wasAway ? ItemStamp{} : pending.stamp;
     const bool hasFailed = !item.failure.empty();
-    const bool wasAway = item.stamp == ItemStamp{} || (hasFailed && isGone(item.path));
+    const bool wasAway = described.wasAway || (hasFailed && isGone(item.path));
     if (wasAway) pending.folder->digest = 0;  // the next run reads it again
     if (wasAway && hasFailed) return;         // the item is missing, not broken
     if (hasFailed) {

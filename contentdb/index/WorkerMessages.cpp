@@ -1,21 +1,20 @@
 #include "contentdb/index/WorkerMessages.h"
 
 #include "contentdb/store/ItemCodec.h"
+#include "platform/base/Version.h"
 
-#include <chrono>
+#include <fmt/format.h>
 
 namespace qvct::contentdb {
 namespace {
 
 constexpr std::size_t kLengthBytes = 4;
+/// Raised when a change makes workers and those who start them misunderstand each other.
+constexpr unsigned kProtocol = 1;
 
 }  // namespace
 
-static_assert(std::atomic<std::int64_t>::is_always_lock_free, "other processes see no lock of ours");
-
-std::int64_t WorkerStatus::now() {
-    return std::chrono::nanoseconds(std::chrono::steady_clock::now().time_since_epoch()).count();
-}
+static_assert(std::atomic<std::uint64_t>::is_always_lock_free, "other processes see no lock of ours");
 
 void appendMessage(std::string& stream, std::string_view message) {
     for (std::size_t i = 0; i < kLengthBytes; ++i)
@@ -23,14 +22,20 @@ void appendMessage(std::string& stream, std::string_view message) {
     stream += message;
 }
 
-bool nextMessage(std::string_view stream, std::size_t& at, std::string_view& message) {
-    if (stream.size() - at < kLengthBytes) return false;
-    std::size_t size = 0;
+std::size_t lengthOfMessage(std::string_view stream) {
+    if (stream.size() < kLengthBytes) return 0;
+    std::size_t length = 0;
     for (std::size_t i = kLengthBytes; i > 0; --i)
-        size = size << 8U | static_cast<unsigned char>(stream[at + i - 1]);
-    if (stream.size() - at - kLengthBytes < size) return false;
-    message = stream.substr(at + kLengthBytes, size);
-    at += kLengthBytes + size;
+        length = length << 8U | static_cast<unsigned char>(stream[i - 1]);
+    return length;
+}
+
+bool nextMessage(std::string_view stream, std::size_t& at, std::string_view& message) {
+    const std::string_view rest = stream.substr(at);
+    const std::size_t length = lengthOfMessage(rest);
+    if (rest.size() < kLengthBytes + length) return false;
+    message = rest.substr(kLengthBytes, length);
+    at += kLengthBytes + length;
     return true;
 }
 
@@ -38,7 +43,6 @@ std::string encodedTask(const ItemTask& task) {
     ByteWriter out;
     out.number(task.ticket);
     out.text(task.path);
-    out.stamp(task.stamp);
     return out.take();
 }
 
@@ -47,8 +51,11 @@ ItemTask decodedTask(std::string_view message) {
     ItemTask task;
     task.ticket = in.number();
     task.path = in.text();
-    task.stamp = in.stamp();
     return task;
+}
+
+std::string workerEdition() {
+    return fmt::format("{}, protocol {}", version(), kProtocol);
 }
 
 std::string encodedReport(WorkerReport::Kind kind, std::string_view text) {
@@ -63,8 +70,7 @@ std::string encodedReport(const Described& described) {
     ByteWriter out;
     out.number(static_cast<std::uint64_t>(WorkerReport::Kind::described));
     out.number(described.ticket);
-    out.text(item.path);
-    out.stamp(item.stamp);
+    out.number(described.wasAway ? 1 : 0);
     out.text(item.payloadHash);
     out.text(encodedDescription(item));
     out.number(described.terms.size());
@@ -82,8 +88,7 @@ std::optional<WorkerReport> decodedReport(std::string_view message) {
     if (report.kind == WorkerReport::Kind::described) {
         Described& described = report.described;
         described.ticket = in.number();
-        described.item.path = in.text();
-        described.item.stamp = in.stamp();
+        described.wasAway = in.number() != 0;
         described.item.payloadHash = in.text();
         isWhole = decodeDescription(in.text(), described.item);
         for (std::size_t left = in.count(); left > 0; --left) described.terms.emplace_back(in.text());

@@ -14,6 +14,7 @@ std::string pathOfWorkerProgram(const WorkerProgram& program) {
     if (fromEnvironment != nullptr && *fromEnvironment != '\0') return fromEnvironment;
     const auto* code = reinterpret_cast<const void*>(&pathOfWorkerProgram);
     const std::filesystem::path folder = imagePath(code).parent_path();
+    if (folder.empty()) return {};
     std::string path;
     for (const char* place : {"qvct-index-worker", QVCT_WORKER_FROM_PROGRAM, QVCT_WORKER_FROM_LIBRARY}) {
         path = (folder / place).lexically_normal().string();
