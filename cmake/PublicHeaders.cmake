@@ -20,6 +20,7 @@ set(QVCT_PUBLIC_HEADERS
   platform/data/UserDefaults.h
   media/loopfile/RecordKeys.h
   resources/EmbeddedFiles.h
+  resources/ReplacementFile.h
   taxonomy/OptionalLabel.h
   taxonomy/QVTagIdentifierUtility.h
   taxonomy/TaggingSetAdditions.h

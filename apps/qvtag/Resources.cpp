@@ -6,6 +6,7 @@
 #include "platform/files/FileAccess.h"
 #include "platform/files/ResourceBundle.h"
 #include "resources/ReplacementFile.h"
+#include "resources/ResourceDictionary.h"
 
 namespace qvct::tool {
 

@@ -1,12 +1,12 @@
 #include "resources/ReplacementFile.h"
 
 #include "platform/base/Log.h"
-#include "platform/data/PropertyListFile.h"
 #include "platform/files/FileAccess.h"
 #include "platform/files/FileStamp.h"
 #include "platform/files/ResourceBundle.h"
 #include "platform/text/Text.h"
 #include "resources/LegacyMappingTable.h"
+#include "resources/ResourceDictionary.h"
 
 #include <algorithm>
 #include <map>
@@ -17,8 +17,6 @@
 
 namespace qvct {
 namespace {
-
-constexpr std::string_view kRules = "DefaultRules";
 
 bool isMappingTable(std::string_view text, const std::string& path, Error* error) {
     const std::vector<std::string> lines = split(replaceAll(text, "\r\n", "\n"), "\n");
@@ -92,22 +90,6 @@ std::optional<std::string> replacementFile(const ResourceFile& resource, Error* 
     }
     if (verdict->isUsable) return path;
     if (error != nullptr) *error = verdict->error;
-    return std::nullopt;
-}
-
-std::optional<PropertyList::Dictionary> readResourceDictionary(std::string_view name, const std::string& path,
-                                                               Error* error) {
-    auto dictionary = readDictionaryFile(path, error);
-    const std::string_view key = name == kRules ? name : name.ends_with("Taxonomy") ? "categories" : "";
-    if (!dictionary || key.empty()) return dictionary;
-    const bool hasEntries =
-        name == kRules ? dictionary->array(key) != nullptr : dictionary->dictionary(key) != nullptr;
-    if (hasEntries) return dictionary;
-    fail(error, kErrorMalformed,
-         fmt::format("{} \"{}\"",
-                     dictionary->value(key) == nullptr ? "there is no key" : "there are no entries under",
-                     key),
-         {path});
     return std::nullopt;
 }
 

@@ -2,7 +2,6 @@
 
 #include "platform/base/Error.h"
 #include "platform/base/Export.h"
-#include "platform/data/PropertyList.h"
 
 #include <optional>
 #include <string>
@@ -10,12 +9,13 @@
 
 namespace qvct {
 
-/// A file of data that the library carries, and that another may replace.
+/// The name of a file of data that the library carries, and that another may replace.
 struct ResourceFile {
     std::string_view name;
     std::string_view extension;
 };
 
+/// The names of all such files.
 inline constexpr ResourceFile kResourceFiles[] = {{"DefaultTaxonomy", "plist"},
                                                   {"DefaultRules", "plist"},
                                                   {"DefaultKeywordMapping", "plist"},
@@ -31,12 +31,7 @@ inline constexpr ResourceFile kResourceFiles[] = {{"DefaultTaxonomy", "plist"},
 /// valid for that resource. Nothing when there is none or it is broken; use the built-in resource then. A
 /// broken file is logged once for each of its states, and reported to `error` each time.
 /// @cost  One look at the file; its bytes are read when it is new or has changed. Safe from every thread.
-std::optional<std::string> replacementFile(const ResourceFile& resource, Error* error = nullptr);
-
-/// The property list in a file, with the entries that the resource of that name must have; else nothing, and
-/// an error.
-std::optional<PropertyList::Dictionary> readResourceDictionary(std::string_view name, const std::string& path,
-                                                               Error* error = nullptr);
+QVCT_API std::optional<std::string> replacementFile(const ResourceFile& resource, Error* error = nullptr);
 
 /// What `read` makes of the replacement file at a path; if there is none, what `builtIn` gives. Both answer
 /// an optional value.
