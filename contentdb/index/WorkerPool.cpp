@@ -170,8 +170,8 @@ void WorkerPool::judge(Worker& worker, std::chrono::nanoseconds time) const {
                                static_cast<double>(limit.count()) / 1000);
 }
 
-/// Starts another process in place of one that has ended or is at fault; the item that it was working on has
-/// failed.
+/// Starts another process in place of one that has ended or is at fault, if there is work for it; the item
+/// that it was working on has failed.
 bool WorkerPool::replace(Worker& worker, const std::function<void(Described)>& take) {
     const std::uint64_t culprit = worker.currentTicket();
     if (!worker.fault.empty()) worker.process->kill();
@@ -189,7 +189,7 @@ bool WorkerPool::replace(Worker& worker, const std::function<void(Described)>& t
     } else if (++barren_ > kMostBarrenWorkers) {
         return fail(fmt::format("{} before it described anything, {} times in a row", reason, barren_));
     }
-    return start(worker);
+    return worker.waiting.empty() || start(worker);
 }
 
 bool WorkerPool::fail(std::string reason) {

@@ -1,12 +1,14 @@
 #include "Library.h"
 #include "NameDescriber.h"
 #include "contentdb/ContentDescriber.h"
+#include "contentdb/index/WorkerMessages.h"
 #include "contentdb/store/RunLock.h"
 #include "platform/base/Version.h"
 #include "platform/files/ResourceBundle.h"
 #include "resources/ReplacementFile.h"
 #include "support/CapturedLog.h"
 
+#include <atomic>
 #include <chrono>
 #include <csignal>
 #include <filesystem>
@@ -169,7 +171,10 @@ TEST_F(Indexing, ReadsAgainWhatWasAwayWhileItWasRead) {
     settle();
     for (int run = 0; run < 2; ++run) {
         write("disk/leaves", "");
-        index([](IndexOptions& options) { options.workers = 1; });
+        index([run](IndexOptions& options) {
+            if (run == 1) useWorkers(options);
+            options.workers = 1;
+        });
         std::filesystem::rename(library() + "/away", library() + "/disk");
     }
     EXPECT_EQ(index().failed, 0U);
@@ -431,8 +436,9 @@ TEST_F(Indexing, LosesOneItemToEachThatFailsCrashesOrHangs) {
         write(good.back() + ".wav", "");
     }
     for (const char* name :
-         {"A fails.wav", "B crashes.wav", "L hangs.wav", "Kick15 exits.wav", "M throws.wav"})
+         {"A fails.wav", "B crashes.wav", "L hangs.wav", "Kick15 exits.wav", "M throws.wav", "N mumbles.wav"})
         write(name, "");
+    write("O.wav", std::string(17U << 20U, 'x'));
     settle();
     const auto limit = [](IndexOptions& options) {
         useWorkers(options);
@@ -441,7 +447,7 @@ TEST_F(Indexing, LosesOneItemToEachThatFailsCrashesOrHangs) {
     };
     const IndexProgress progress = index(limit);
     EXPECT_EQ(progress.described, 300U);
-    EXPECT_EQ(progress.failed, 5U);
+    EXPECT_EQ(progress.failed, 7U);
     EXPECT_THAT(names(), testing::UnorderedElementsAreArray(good));
     std::vector<std::string> reasons;
     ContentDatabase::open(database())->forEachFailure([&](const IndexedItem& item) {
@@ -452,9 +458,11 @@ TEST_F(Indexing, LosesOneItemToEachThatFailsCrashesOrHangs) {
                 ElementsAre("A fails.wav: it is broken",
                             HasSubstr("B crashes.wav: reading it crashed (Segmentation fault"),
                             HasSubstr("Kick15 exits.wav: reading it ended the process (status 3)"),
-                            "L hangs.wav: reading it took longer than 1.5 s", "M throws.wav: out of luck"));
+                            "L hangs.wav: reading it took longer than 1.5 s", "M throws.wav: out of luck",
+                            "N mumbles.wav: the describer failed and does not say why",
+                            HasSubstr("O.wav: its description takes 178")));
     EXPECT_EQ(index(useWorkers).failed, 0U);
-    EXPECT_EQ(index(limit).failed, 5U);
+    EXPECT_EQ(index(limit).failed, 7U);
 }
 
 TEST_F(Indexing, HearsWhatItsWorkersLogAndLeavesThemNoFile) {
@@ -463,12 +471,24 @@ TEST_F(Indexing, HearsWhatItsWorkersLogAndLeavesThemNoFile) {
     settle();
     const CapturedLog log;
     const int left = ::open(library().c_str(), O_RDONLY);
-    const IndexProgress progress = index(useWorkers);
+    const std::string note = folder_.path("note");
+    ::setenv("QVCT_TEST_NOTE", note.c_str(), 1);
+    std::string open;
+    const IndexProgress progress = index([&open](IndexOptions& options) {
+        useWorkers(options);
+        options.isCancelled = [&open] {
+            open += NameDescriber::openFiles();
+            return false;
+        };
+    });
+    ::unsetenv("QVCT_TEST_NOTE");
     ::close(left);
     EXPECT_EQ(progress.described, 2U);
+    EXPECT_THAT(open, testing::AllOf(HasSubstr("socket:"), testing::Not(HasSubstr("memfd:"))));
+    EXPECT_EQ(readAll(note), "over;over;");  // they went by themselves, and their host's log is its own again
     EXPECT_THAT(log.messages(), UnorderedElementsAre("about A logs", "about B logs and crashes"));
     const auto item = ContentDatabase::open(database())->item(library() + "/C tells.wav");
-    EXPECT_EQ(item->item.title, "/dev/nu /dev/nu socket: /memfd: ");
+    EXPECT_EQ(item->item.title, "/dev/nu /dev/nu socket: ");
     // In threads of the host the same is described, and fails, but for what crashes it.
     std::filesystem::remove(library() + "/B logs and crashes.wav");
     const IndexProgress again = index([](IndexOptions& options) { options.describer = 2; });
@@ -489,19 +509,111 @@ TEST_F(Indexing, SaysWhyNothingDescribes) {
     };
     const std::string missing = folder_.path("none");
     EXPECT_EQ(problem({missing, {}}), missing + ": cannot be started: No such file or directory");
-    EXPECT_EQ(problem({"/bin/false", {}}),
-              "/bin/false: ended the process (status 1) before it described anything, 6 times in a row");
-    const std::string answer = R"(printf '\7\0\0\0\0\0050.0.9' >&0; read -r line)";
-    EXPECT_EQ(problem({"/bin/sh", {"-c", answer}}),
-              fmt::format("/bin/sh: is of version \"0.0.9\", and \"{}\" is needed", version()));
-    Error error;
-    EXPECT_FALSE(indexLibrary(
-        options, [] { return std::unique_ptr<NameDescriber>(); }, &error));
-    EXPECT_EQ(error.message(), "there is nothing that describes items");
-    const auto failing = []() -> std::unique_ptr<NameDescriber> { throw std::runtime_error("out of luck"); };
-    EXPECT_FALSE(indexLibrary(options, failing, &error));
-    EXPECT_EQ(error.message(), "out of luck");
+    EXPECT_EQ(problem({"worker", {}}), "worker: is not an absolute path");
+    const std::string greeting = fmt::format(R"(printf '\{:o}\0\0\0\0\{:03o}{}' >&0; read -r line)",
+                                             version().size() + 2, version().size(), version());
+    const std::string barren = " before it described anything, 6 times in a row";
+    const std::pair<std::string, std::string> scripts[] = {
+        {"exit 1", "ended the process (status 1)" + barren},
+        {R"(printf '\7\0\0\0\0\0050.0.9' >&0; read -r line)",
+         fmt::format("is of version \"0.0.9\", and \"{}\" is needed", workerEdition())},
+        {greeting, fmt::format("is of version \"{}\", and \"{}\" is needed", version(), workerEdition())},
+        {R"(printf '\1\0\0\0\11' >&0; read -r line)", "gave an answer that means nothing" + barren},
+        {R"(printf '\0\0\0\177' >&0; read -r line)", "gave an answer that is too long" + barren},
+        // Takes away the memory that both see.
+        {"(: >/proc/self/fd/1) 2>/dev/null; exit 1", "ended the process (status 1)" + barren}};
+    for (const auto& [script, reason] : scripts)
+        EXPECT_EQ(problem({"/bin/sh", {"-c", script}}), "/bin/sh: " + reason);
+    const auto problemOf = [&options](const DescriberFactory& factory) {
+        Error error;
+        EXPECT_FALSE(indexLibrary(options, factory, &error));
+        return error.message();
+    };
+    using Made = std::unique_ptr<ItemDescriber>;
+    const std::string silent = "the describer failed and does not say why";
+    EXPECT_EQ(problemOf([] { return Made(); }), "there is nothing that describes items");
+    EXPECT_EQ(problemOf([]() -> Made { throw std::runtime_error("out of luck"); }), "out of luck");
+    EXPECT_EQ(problemOf([]() -> Made { throw std::runtime_error(""); }), silent);
+    EXPECT_EQ(problemOf([]() -> Made { throw 1; }), silent);
     EXPECT_EQ(index().described, 1U);
+}
+
+TEST_F(Indexing, KeepsWhatWasDescribedBeforeAProblem) {
+    for (int i = 0; i < 10; ++i) write(fmt::format("Kick {}.wav", i), "");
+    settle();
+    IndexOptions options;
+    options.folders = {library()};
+    options.database = database();
+    options.workers = 2;
+    // Before anybody asks again, one has described the rest, and the other has failed.
+    options.isCancelled = [] {
+        std::this_thread::sleep_for(std::chrono::milliseconds(100));
+        return false;
+    };
+    std::atomic<int> made = 0;
+    const auto factory = [&made]() -> std::unique_ptr<NameDescriber> {
+        if (made++ == 0) return std::make_unique<NameDescriber>();
+        std::this_thread::sleep_for(std::chrono::milliseconds(30));
+        throw std::runtime_error("out of luck");
+    };
+    EXPECT_FALSE(indexLibrary(options, factory));
+    EXPECT_EQ(names().size(), 10U);
+}
+
+TEST_F(Indexing, HearsOfSlowItemsBeforeAllAreDone) {
+    constexpr std::uint64_t count = 120;  // fewer than a worker's queue holds
+    for (std::uint64_t i = 0; i < count; ++i) write(fmt::format("slow {}.wav", i), "");
+    settle();
+    std::set<std::uint64_t> described;
+    index([&described](IndexOptions& options) {
+        useWorkers(options);
+        options.workers = 1;
+        options.longestBatch = std::chrono::milliseconds(0);
+        options.progress = [&described](const IndexProgress& at) { described.insert(at.described); };
+    });
+    EXPECT_THAT(described, Contains(testing::AllOf(testing::Gt(0U), testing::Lt(count))));
+}
+
+TEST_F(Indexing, IsPatientWithAWorkerThatWaitsForIt) {
+    write("Kick shouts.wav", "");
+    settle();
+    const CapturedLog log;
+    const IndexProgress progress = index([](IndexOptions& options) {
+        useWorkers(options);
+        options.timeLimitPerItem = std::chrono::milliseconds(300);
+        options.isCancelled = [] {
+            std::this_thread::sleep_for(std::chrono::milliseconds(500));
+            return false;
+        };
+    });
+    EXPECT_EQ(progress.described, 1U);
+    EXPECT_EQ(log.messages().size(), 1U);
+}
+
+TEST_F(Indexing, GoesOnThoughItIsNotKnownHowAWorkerEnded) {
+    write("Kick.wav", "");
+    write("A crashes.wav", "");
+    settle();
+    const auto failures = [this] {
+        index(useWorkers);
+        std::vector<std::string> reasons;
+        ContentDatabase::open(database())->forEachFailure([&](const IndexedItem& item) {
+            reasons.push_back(item.failure);
+            return true;
+        });
+        return reasons;
+    };
+    const auto isUnknown = HasSubstr("it is not known how");
+    const auto handler = ::signal(SIGCHLD, SIG_IGN);
+    EXPECT_THAT(failures(), ElementsAre(isUnknown));
+    ::signal(SIGCHLD, handler);
+    // This one stays when it has ended.
+    write("Hat is held and exits.wav", "");
+    settle();
+    const auto begin = std::chrono::steady_clock::now();
+    EXPECT_EQ(failures().size(), 2U);
+    EXPECT_LT(std::chrono::steady_clock::now() - begin, std::chrono::seconds(15));
+    EXPECT_THAT(names(), ElementsAre("Kick"));
 }
 
 TEST_F(Indexing, IsDescribedByOurWorkersAsInThisProcess) {

@@ -16,6 +16,8 @@
 #include <string>
 #include <thread>
 
+#include <sys/prctl.h>
+#include <sys/ptrace.h>
 #include <unistd.h>
 
 namespace qvct::test {
@@ -34,6 +36,8 @@ class NameDescriber : public contentdb::ItemDescriber {
             return std::nullopt;
         }
         if (is("logs")) log("about " + item.name);
+        if (is("shouts")) log(std::string(1U << 18U, '!'));  // more than fits while nobody listens
+        if (is("is held")) haveThisProcessHeld();
         if (is("tells")) item.title = openFiles();
         if (is("crashes")) {
             ::signal(SIGSEGV, SIG_DFL);  // a sanitizer would report it and exit
@@ -43,6 +47,7 @@ class NameDescriber : public contentdb::ItemDescriber {
         if (is("noted")) std::ofstream(path) << ::getpid();
         if (is("hangs")) std::this_thread::sleep_for(std::chrono::hours(1));
         if (is("throws")) throw std::runtime_error("out of luck");
+        if (is("mumbles")) throw std::runtime_error("");
         if (is("slow")) std::this_thread::sleep_for(std::chrono::milliseconds(2));
         item.fileType = kFileTypeAudioFile;
         const std::filesystem::path folder = std::filesystem::path(path).parent_path();
@@ -53,7 +58,6 @@ class NameDescriber : public contentdb::ItemDescriber {
         return item;
     }
 
-  private:
     /// What this process has open, apart from standard error.
     static std::string openFiles() {
         std::string targets;
@@ -64,6 +68,26 @@ class NameDescriber : public contentdb::ItemDescriber {
             if (!isNotOpen && file != STDERR_FILENO) targets += target.string().substr(0, 7) + ' ';
         }
         return targets;
+    }
+
+  private:
+    /// By one that traces it and asks nothing: it stays in the system's table when it has ended, as one does
+    /// that cannot end.
+    static void haveThisProcessHeld() {
+        int held[2] = {};
+        if (::pipe(held) != 0) return;
+        const pid_t self = ::getpid();
+        ::prctl(PR_SET_PTRACER, PR_SET_PTRACER_ANY);
+        if (::fork() == 0) {
+            ::ptrace(PTRACE_SEIZE, self, nullptr, nullptr);
+            ::close_range(0, ~0U, 0);
+            ::sleep(20);
+            ::_exit(0);
+        }
+        ::close(held[1]);
+        char nothing = 0;
+        static_cast<void>(::read(held[0], &nothing, 1) == 0);
+        ::close(held[0]);
     }
 };
 

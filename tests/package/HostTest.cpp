@@ -17,7 +17,10 @@
 #include <qvcontenttagging/ContentDescriber.h>
 #include <qvcontenttagging/ContentWalk.h>
 #include <qvcontenttagging/Indexer.h>
+#include <qvcontenttagging/Log.h>
 #include <qvcontenttagging/QVTaggingAggregator.h>
+#include <qvcontenttagging/ReplacementFile.h>
+#include <qvcontenttagging/ResourceBundle.h>
 #include <qvcontenttagging/TGRTFileNode.h>
 #include <qvcontenttagging/TGRTIndexableContentObject.h>
 #include <qvcontenttagging/TGRTLegacyTaxonomyMapping.h>
@@ -31,6 +34,7 @@ namespace {
 
 using test::TemporaryFolder;
 using testing::Each;
+using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
 using testing::Not;
@@ -139,6 +143,19 @@ std::vector<std::string> sayingsOf(const ObjectSet<TGRTTagging>& taggings) {
         texts.push_back(tagging->category() + ">" + tagging->parentLabel() + ">" + tagging->label() + ":" +
                         std::to_string(tagging->weightLevel()) + ":" + std::to_string(tagging->hash()));
     return texts;
+}
+
+TEST(BrokenResource, IsReportedByOneOfTheLibraries) {
+    const TemporaryFolder folder;
+    const std::string broken = folder.write("Rules.plist", "no rules");
+    std::vector<std::string> lines;
+    LogHandler handler = setLogHandler([&lines](std::string_view line) { lines.emplace_back(line); });
+    ResourceBundle::setPathForResource("DefaultRules", "plist", broken);
+    contentdb::ContentDescriber::digest(0);
+    EXPECT_FALSE(replacementFile({"DefaultRules", "plist"}));
+    ResourceBundle::setPathForResource("DefaultRules", "plist", std::nullopt);
+    setLogHandler(std::move(handler));
+    EXPECT_THAT(lines, ElementsAre(HasSubstr(broken)));
 }
 
 TEST(ReleasedTaxonomy, LeavesTaggingsWhatTheyAre) {
