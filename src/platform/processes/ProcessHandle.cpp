@@ -2,6 +2,7 @@
 
 #include "platform/processes/StandardStreams.h"
 
+#include <cerrno>
 #include <csignal>
 #include <cstring>
 #include <thread>
@@ -38,7 +39,8 @@ std::optional<ProcessEnd> ProcessHandle::awaitEnd(std::chrono::milliseconds pati
     while (true) {
         siginfo_t info{};
         const auto which = static_cast<id_t>(isHeld ? descriptor_.number() : id_);
-        if (::waitid(isHeld ? P_PIDFD : P_PID, which, &info, WEXITED | WNOHANG) != 0) return ProcessEnd{};
+        if (::waitid(isHeld ? P_PIDFD : P_PID, which, &info, WEXITED | WNOHANG) != 0 && errno == ECHILD)
+            return ProcessEnd{};
         if (info.si_pid != 0) return endOf(info);
         if (std::chrono::steady_clock::now() >= until) return std::nullopt;
         std::this_thread::sleep_for(pause);
