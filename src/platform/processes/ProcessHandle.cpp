@@ -7,8 +7,12 @@
 #include <cstring>
 #include <thread>
 
-#include <sys/pidfd.h>
+#include <fcntl.h>
 #include <sys/wait.h>
+// glibc 2.36 declares these for C alone.
+extern "C" {
+#include <sys/pidfd.h>
+}
 
 namespace qvct {
 namespace {
