@@ -36,9 +36,14 @@ IndexedItem itemBy(ItemDescriber& describer, const std::string& path) {
 
 }  // namespace
 
+void Described::setSource(const ItemTask& task) {
+    item.path = task.path;
+    item.stamp = wasAway ? ItemStamp{} : task.stamp;
+}
+
 Described describedBy(ItemDescriber& describer, const ItemTask& task) {
     Described described{task.ticket, itemBy(describer, task.path), {}, !fileExists(task.path)};
-    described.item.path = task.path;
+    described.setSource(task);
     described.terms = termsOf(described.item);
     return described;
 }

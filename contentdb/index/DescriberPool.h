@@ -13,9 +13,10 @@ namespace qvct::contentdb {
 struct ItemTask {
     std::uint64_t ticket = 0;
     std::string path;
+    ItemStamp stamp;
 };
 
-/// A described item, or a failed one, with its index terms; without its stamp.
+/// A described item, or a failed one, with its index terms.
 struct Described {
     std::uint64_t ticket = 0;
     IndexedItem item;
@@ -23,6 +24,9 @@ struct Described {
     /// The file was gone afterwards, perhaps only for a moment: what was read may be incomplete, and a
     /// failure may not be the item's fault.
     bool wasAway = false;
+
+    /// Sets path and stamp: none for a file that was away, so that the next run reads it again.
+    void setSource(const ItemTask& task);
 };
 
 /// The item as the describer describes it; a failed item if it cannot.

@@ -149,8 +149,8 @@ bool IndexRun::submit(const ListedItem& item, ItemId id, const std::shared_ptr<O
         if (!collect()) return false;
     }
     ++folder->remaining;
-    pending_[++lastTicket_] = {id != 0 ? id : nextId_++, id == 0, item.stamp, folder};
-    describers_.submit({lastTicket_, pathIn(folder->path, item.name)});
+    pending_[++lastTicket_] = {id != 0 ? id : nextId_++, id == 0, folder};
+    describers_.submit({lastTicket_, pathIn(folder->path, item.name), item.stamp});
     return true;
 }
 
@@ -187,7 +187,7 @@ void IndexRun::store(std::vector<Described>& batch) {
     // In the order of the walk, so that the same library gives the same database.
     std::sort(batch.begin(), batch.end(),
               [](const Described& a, const Described& b) { return a.ticket < b.ticket; });
-    for (Described& described : batch) {
+    for (const Described& described : batch) {
         const auto hit = pending_.find(described.ticket);
         storeOne(described, hit->second);
         OpenFolder& folder = *hit->second.folder;
@@ -196,9 +196,8 @@ void IndexRun::store(std::vector<Described>& batch) {
     }
 }
 
-void IndexRun::storeOne(Described& described, Pending& pending) {
-    IndexedItem& item = described.item;
-    item.stamp = described.wasAway ? ItemStamp{} : pending.stamp;
+void IndexRun::storeOne(const Described& described, Pending& pending) {
+    const IndexedItem& item = described.item;
     const bool hasFailed = !item.failure.empty();
     const bool wasAway = described.wasAway || (hasFailed && isGone(item.path));
     if (wasAway) pending.folder->digest = 0;  // the next run reads it again

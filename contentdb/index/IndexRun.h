@@ -39,7 +39,6 @@ class IndexRun {
     struct Pending {
         ItemId id = 0;
         bool isNew = false;
-        ItemStamp stamp;
         std::shared_ptr<OpenFolder> folder;
     };
 
@@ -51,7 +50,7 @@ class IndexRun {
     void stopIfCancelled();
     bool collect();
     void store(std::vector<Described>& batch);
-    void storeOne(Described& described, Pending& pending);
+    void storeOne(const Described& described, Pending& pending);
     void storeFolder(const OpenFolder& folder);
     void flush();
     void flushIfDue();

@@ -43,6 +43,7 @@ std::string encodedTask(const ItemTask& task) {
     ByteWriter out;
     out.number(task.ticket);
     out.text(task.path);
+    out.stamp(task.stamp);
     return out.take();
 }
 
@@ -51,6 +52,7 @@ ItemTask decodedTask(std::string_view message) {
     ItemTask task;
     task.ticket = in.number();
     task.path = in.text();
+    task.stamp = in.stamp();
     return task;
 }
 

@@ -147,7 +147,7 @@ bool WorkerPool::takeReport(Worker& worker, WorkerReport report, const std::func
     }
     const auto task = worker.waiting.extract(report.described.ticket);
     if (!worker.isOfOurEdition || task.empty()) return false;
-    report.described.item.path = std::move(task.mapped().path);
+    report.described.setSource(task.mapped());
     worker.time = {};
     barren_ = 0;
     take(std::move(report.described));
@@ -182,7 +182,7 @@ bool WorkerPool::replace(Worker& worker, const std::function<void(Described)>& t
     if (hit != worker.waiting.end()) {
         Described failed;
         failed.ticket = culprit;
-        failed.item.path = std::move(hit->second.path);
+        failed.setSource(hit->second);
         failed.item.failure = "reading it " + reason;
         worker.waiting.erase(hit);
         take(std::move(failed));
