@@ -179,7 +179,7 @@ std::optional<IndexedItem> ContentDescriber::describe(const std::string& path, E
     its.addAllTaggings(item, content, record.get(), object->taggingDatas());
     addValues(item, object->valueDatas());
     its.addTempoAndBeats(item, content->fileData().get(), url.lastPathComponent());
-    item.payloadHash = payloadHash(content->file());
+    item.payloadHash = payloadHash(*content);
     return item;
 }
 

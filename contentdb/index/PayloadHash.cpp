@@ -83,9 +83,17 @@ bool addPreset(Payload& payload, ItemFile& file) {
     return preset.has_value();
 }
 
+bool addFileOfBundle(Payload& payload, ContentItem& item, const fs::path& path) {
+    ItemFile* description = item.descriptionFile();
+    if (description != nullptr && description->url().path() == path) return addFile(payload, *description);
+    ItemFile file(URL::fileURLWithPath(path.string()));
+    return addFile(payload, file);
+}
+
 /// The files below the folder but for records and what is hidden, in the order of their names; links are not
 /// followed.
-bool addFolder(Payload& payload, const fs::path& folder, std::size_t& budget, std::size_t depth) {
+bool addFolder(Payload& payload, ContentItem& item, const fs::path& folder, std::size_t& budget,
+               std::size_t depth) {
     constexpr std::size_t deepest = 16;
     std::error_code failure;
     std::vector<fs::directory_entry> entries;
@@ -99,37 +107,37 @@ bool addFolder(Payload& payload, const fs::path& folder, std::size_t& budget, st
     for (const fs::directory_entry& entry : entries) {
         const fs::file_status status = entry.symlink_status(failure);
         payload.digest.add(entry.path().filename().string());
-        if (fs::is_directory(status) && !addFolder(payload, entry.path(), budget, depth + 1)) return false;
-        ItemFile file(URL::fileURLWithPath(entry.path().string()));
-        if (fs::is_regular_file(status) && !addFile(payload, file)) return false;
+        if (fs::is_directory(status) && !addFolder(payload, item, entry.path(), budget, depth + 1))
+            return false;
+        if (fs::is_regular_file(status) && !addFileOfBundle(payload, item, entry.path())) return false;
     }
     return true;
 }
 
-bool addContent(Payload& payload, ItemFile& file) {
+bool addContent(Payload& payload, ContentItem& item) {
     constexpr std::size_t mostFiles = 10000;
-    const URL& url = file.url();
+    const URL& url = item.url();
     std::size_t budget = mostFiles;
     switch (QVContentTaggingTypes::fallBackFileTypeForURL(url)) {
         case kFileTypePatch:
         case kFileTypeProject:
-            return addFolder(payload, url.path(), budget, 0);
+            return addFolder(payload, item, url.path(), budget, 0);
         case kFileTypeSynthPreset:
-            return addPreset(payload, file);
+            return addPreset(payload, item.file());
         case kFileTypeSamplerSettings:
         case kFileTypePlugInSettings:
         case kFileTypeChannelStrip:
-            return addFile(payload, file);
+            return addFile(payload, item.file());
         default:
-            return addAudio(payload, file);
+            return addAudio(payload, item.file());
     }
 }
 
 }  // namespace
 
-std::string payloadHash(ItemFile& file) {
+std::string payloadHash(ContentItem& item) {
     Payload payload;
-    return addContent(payload, file) ? payload.hash() : std::string();
+    return addContent(payload, item) ? payload.hash() : std::string();
 }
 
 }  // namespace qvct::contentdb

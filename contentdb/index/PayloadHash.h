@@ -1,6 +1,6 @@
 #pragma once
 
-#include "formats/ItemFile.h"
+#include "autotagging/ContentItem.h"
 
 #include <string>
 
@@ -12,7 +12,7 @@ namespace qvct::contentdb {
 /// What counts is the sound and the notes of audio, the text of a preset without the record, the files in a
 /// bundle with their places, and any other settings file whole. Of a sound or file over 64 KB only the size
 /// and 16 blocks at even distances are hashed, which is enough to tell recordings apart.
-/// @cost  At most 17 reads for each file; the item's own is not opened again.
-std::string payloadHash(ItemFile& file);
+/// @cost  At most 17 reads for each file; what the item has open is not opened again.
+std::string payloadHash(ContentItem& item);
 
 }  // namespace qvct::contentdb

@@ -16,12 +16,19 @@ ContentItem::ContentItem(URL url, Reading reading) : file_(std::move(url)), read
 
 ContentItem::~ContentItem() = default;
 
+ItemFile* ContentItem::descriptionFile() {
+    if (!descriptionFile_) {
+        const auto cache = QVContentEditorFileUtilities::intermediateCacheURLForURL(url());
+        descriptionFile_ = cache ? std::make_unique<ItemFile>(*cache) : nullptr;
+    }
+    return descriptionFile_->get();
+}
+
 std::shared_ptr<QVCTXMLDocument> ContentItem::xmlDocument() {
     if (!xmlDocument_) {
-        const auto cache = reading_.withXmlDocument
-                               ? QVContentEditorFileUtilities::intermediateCacheURLForURL(url())
-                               : std::nullopt;
-        xmlDocument_ = cache ? QVCTXMLDocument::initWithContentsOfURL(*cache) : nullptr;
+        ItemFile* description = reading_.withXmlDocument ? descriptionFile() : nullptr;
+        xmlDocument_ =
+            description != nullptr ? QVCTXMLDocument::initWithContentsOfFile(*description) : nullptr;
     }
     return *xmlDocument_;
 }

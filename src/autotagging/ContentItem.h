@@ -36,10 +36,12 @@ class QVCT_API ContentItem {
     ~ContentItem();
 
     const URL& url() const { return file_.url(); }
-    /// The item's own file; of a bundle there is none.
+    /// The item's own file; a bundle has none.
     ItemFile& file() { return file_; }
 
-    /// The XML description in or beside the item; null without one.
+    /// The file of the XML description in or beside the item; null without one.
+    ItemFile* descriptionFile();
+    /// The XML description; null without one.
     std::shared_ptr<QVCTXMLDocument> xmlDocument();
     /// The stored record, as `TGRTFileNode::readMetaDataWithOptions` answers it: null without one, and with
     /// an error when it cannot be read.
@@ -55,6 +57,7 @@ class QVCT_API ContentItem {
 
     ItemFile file_;
     Reading reading_;
+    std::optional<std::unique_ptr<ItemFile>> descriptionFile_;
     std::optional<std::shared_ptr<QVCTXMLDocument>> xmlDocument_;
     std::optional<Record> record_;
 };

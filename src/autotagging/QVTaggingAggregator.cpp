@@ -112,7 +112,8 @@ TagDictionarySet QVTaggingAggregator::tagsOfItem(const std::shared_ptr<ContentIt
     const auto fileData = fileDataForURL(url);
     TagDictionarySet tags;
     for (const auto& service : taggingServices_) {
-        tags.insertAll(service->tagsWithContentsOfURL(url, xmlDocument, metaData, fileData, options));
+        tags.insertAll(
+            service->tagsWithContentsOfFile(item->file(), xmlDocument, metaData, fileData, options));
     }
     return tags;
 }

@@ -12,6 +12,7 @@
 #include "output/PropertyListOutput.h"
 #include "platform/data/PropertyListFile.h"
 #include "platform/files/FileAccess.h"
+#include "platform/files/RandomAccessReader.h"
 #include "platform/text/Text.h"
 
 #include <array>
@@ -60,8 +61,10 @@ InspectedPart chunkPart(const LCChunk& chunk) {
 }
 
 Parts audioParts(const URL& url, Error* error) {
-    const auto parser = LCFileParser::fileParserForURL(url);
     Parts parts;
+    const auto file = FileReader::open(url.path(), error);
+    if (!file) return parts;
+    const auto parser = LCFileParser::fileParserForReader(file, url.path());
     for (const LCChunk& chunk : parser->chunks(error)) parts.push_back(chunkPart(chunk));
     const auto fileData = parser->fileData();
     if (fileData && !fileData->record().empty())

@@ -9,6 +9,7 @@
 
 namespace qvct {
 
+class ItemFile;
 class LCFileData;
 class QVCTXMLDocument;
 class TGRTMetaData;
@@ -36,6 +37,13 @@ class QVCT_API QVCTAutoTaggingService {
                                                    const std::shared_ptr<TGRTMetaData>& metaData,
                                                    const std::shared_ptr<LCFileData>& fileData,
                                                    std::uint64_t options) = 0;
+    /// The same of an item whose file may be open already. The aggregator asks this one, which asks the other
+    /// one unless a service that reads the file overrides it, so that no file is opened twice.
+    virtual TagDictionarySet tagsWithContentsOfFile(ItemFile& file,
+                                                    const std::shared_ptr<QVCTXMLDocument>& xmlDocument,
+                                                    const std::shared_ptr<TGRTMetaData>& metaData,
+                                                    const std::shared_ptr<LCFileData>& fileData,
+                                                    std::uint64_t options);
 };
 
 }  // namespace qvct

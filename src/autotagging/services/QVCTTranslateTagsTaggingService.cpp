@@ -1,35 +1,47 @@
 #include "autotagging/services/QVCTTranslateTagsTaggingService.h"
 
+#include "formats/ItemFile.h"
 #include "formats/QVContentTaggingTypes.h"
 #include "formats/audiofile/TGRTTavioLoopMetaDataReader.h"
 #include "formats/preset/TGRTVorthalLegacyTaggingParser.h"
 #include "media/loopfile/LCFileData.h"
+#include "platform/files/FileAccess.h"
 #include "taxonomy/TaggingTypes.h"
 
-#include <string>
+#include <optional>
 
 namespace qvct {
 namespace {
 
-ObjectSet<TGRTTagging> translatedTaggings(const URL& url, const std::shared_ptr<LCFileData>& fileData) {
+ObjectSet<TGRTTagging> translatedTaggings(ItemFile& file, const std::shared_ptr<LCFileData>& fileData) {
     if (fileData) {
         const auto reader = TGRTTavioLoopMetaDataReader::initWithTaxonomy(TGRTTaxonomy::defaultTaxonomy());
         return reader->mappedTaggingsForFileData(fileData);
     }
-    const bool isPreset = QVContentTaggingTypes::fallBackFileTypeForURL(url) == kFileTypeSynthPreset;
-    return isPreset ? TGRTVorthalLegacyTaggingParser::mappedTaggingsForFileURL(url)
-                    : ObjectSet<TGRTTagging>();
+    if (QVContentTaggingTypes::fallBackFileTypeForURL(file.url()) != kFileTypeSynthPreset) return {};
+    const auto bytes = file.bytes(kLargestWholeFile);
+    if (!bytes) return {};
+    return TGRTVorthalLegacyTaggingParser::mappedTaggingsForText(
+        {reinterpret_cast<const char*>(bytes->data()), bytes->size()});
 }
 
 }  // namespace
 
 TagDictionarySet QVCTTranslateTagsTaggingService::tagsWithContentsOfURL(
-    const URL& url, const std::shared_ptr<QVCTXMLDocument>& /*xmlDocument*/,
+    const URL& url, const std::shared_ptr<QVCTXMLDocument>& xmlDocument,
+    const std::shared_ptr<TGRTMetaData>& metaData, const std::shared_ptr<LCFileData>& fileData,
+    std::uint64_t options) {
+    ItemFile file(url);
+    return tagsWithContentsOfFile(file, xmlDocument, metaData, fileData, options);
+}
+
+TagDictionarySet QVCTTranslateTagsTaggingService::tagsWithContentsOfFile(
+    ItemFile& file, const std::shared_ptr<QVCTXMLDocument>& /*xmlDocument*/,
     const std::shared_ptr<TGRTMetaData>& /*metaData*/, const std::shared_ptr<LCFileData>& fileData,
     std::uint64_t options) {
     TagDictionarySet tags;
     if ((options & QVCTAutoTaggingOptionTranslateTags) == 0) return tags;
-    for (const auto& tagging : translatedTaggings(url, fileData)) {
+    for (const auto& tagging : translatedTaggings(file, fileData)) {
         const auto& level = tagging->level();
         tags.insert(tagDictionary(tagging->label(), level ? std::optional(level->weight()) : std::nullopt));
     }

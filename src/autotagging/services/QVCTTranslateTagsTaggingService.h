@@ -17,6 +17,11 @@ class QVCTTranslateTagsTaggingService : public QVCTAutoTaggingService {
                                            const std::shared_ptr<TGRTMetaData>& metaData,
                                            const std::shared_ptr<LCFileData>& fileData,
                                            std::uint64_t options) override;
+    TagDictionarySet tagsWithContentsOfFile(ItemFile& file,
+                                            const std::shared_ptr<QVCTXMLDocument>& xmlDocument,
+                                            const std::shared_ptr<TGRTMetaData>& metaData,
+                                            const std::shared_ptr<LCFileData>& fileData,
+                                            std::uint64_t options) override;
 };
 
 }  // namespace qvct

@@ -2,6 +2,7 @@
 
 #include "autotagging/xml/QVCTXMLParser.h"
 #include "autotagging/xml/XPathExpression.h"
+#include "formats/ItemFile.h"
 #include "platform/base/Log.h"
 #include "platform/data/Json.h"
 #include "platform/data/XmlParsing.h"
@@ -41,8 +42,19 @@ ParsedXml parse(std::string_view text, std::string_view name) {
     return parsed;
 }
 
-std::string_view textOf(const std::vector<std::uint8_t>& bytes) {
-    return {reinterpret_cast<const char*>(bytes.data()), bytes.size()};
+/// The document in a file; without content, and logged, when it cannot be read.
+std::shared_ptr<QVCTXMLDocument> documentInFile(ItemFile& file, bool isCompressed) {
+    const std::string& path = file.url().path();
+    Error error;
+    auto xml = file.bytes(kLargestWholeFile, &error);
+    if (xml && isCompressed) {
+        xml = decompress(*xml, &error);
+        if (!xml) failIn(path, &error);
+    }
+    if (!xml) log(error.message());
+    const std::vector<std::uint8_t> bytes = std::move(xml).value_or(std::vector<std::uint8_t>{});
+    return QVCTXMLDocument::initWithXMLData({reinterpret_cast<const char*>(bytes.data()), bytes.size()},
+                                            path);
 }
 
 }  // namespace
@@ -96,22 +108,17 @@ std::shared_ptr<QVCTXMLDocument> QVCTXMLDocument::initWithXMLData(std::string_vi
 }
 
 std::shared_ptr<QVCTXMLDocument> QVCTXMLDocument::initWithContentsOfURL(const URL& url) {
-    if (url.pathExtension() == "zxml") return initWithContentsOfQVZippedXMLURL(url);
-    Error error;
-    const auto bytes = readFile(url.path(), &error);
-    if (!bytes) log(error.message());
-    return initWithXMLData(bytes ? textOf(*bytes) : std::string_view{}, url.path());
+    ItemFile file(url);
+    return initWithContentsOfFile(file);
+}
+
+std::shared_ptr<QVCTXMLDocument> QVCTXMLDocument::initWithContentsOfFile(ItemFile& file) {
+    return documentInFile(file, file.url().pathExtension() == "zxml");
 }
 
 std::shared_ptr<QVCTXMLDocument> QVCTXMLDocument::initWithContentsOfQVZippedXMLURL(const URL& url) {
-    Error error;
-    std::optional<std::vector<std::uint8_t>> xml;
-    if (const auto bytes = readFile(url.path(), &error)) {
-        xml = decompress(*bytes, &error);
-        if (!xml) failIn(url.path(), &error);
-    }
-    if (!xml) log(error.message());
-    return initWithXMLData(xml ? textOf(*xml) : std::string_view{}, url.path());
+    ItemFile file(url);
+    return documentInFile(file, true);
 }
 
 bool QVCTXMLDocument::hasContent() const {

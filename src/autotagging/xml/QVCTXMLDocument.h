@@ -12,6 +12,7 @@
 
 namespace qvct {
 
+class ItemFile;
 class ScriptContext;
 
 /// What scripts may call on the global `document`, and nothing else.
@@ -41,6 +42,8 @@ class QVCT_API QVCTXMLDocument : public QVCTXMLDocumentExport {
     /// Reads the file; the extension "zxml" (in lower case only) says that it is compressed.
     /// Never null: a file that cannot be read or holds nothing gives a document without content, logged.
     static std::shared_ptr<QVCTXMLDocument> initWithContentsOfURL(const URL& url);
+    /// The same of a file that may be open already.
+    static std::shared_ptr<QVCTXMLDocument> initWithContentsOfFile(ItemFile& file);
     /// Reads a compressed file (gzip, zlib or Zstandard), whatever its extension.
     static std::shared_ptr<QVCTXMLDocument> initWithContentsOfQVZippedXMLURL(const URL& url);
     /// Parses text; `name` stands in messages.

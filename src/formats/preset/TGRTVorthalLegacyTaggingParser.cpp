@@ -59,12 +59,11 @@ TGRTVorthalLegacyTaggingParser::legacyTagIdMapping() {
     return mapping;
 }
 
-ObjectSet<TGRTTag> TGRTVorthalLegacyTaggingParser::legacyTagsForFileURL(const URL& url) {
+ObjectSet<TGRTTag> TGRTVorthalLegacyTaggingParser::legacyTagsForText(std::string_view text) {
     ObjectSet<TGRTTag> tags;
-    const auto text = readTextFile(url.path());
-    if (!text) return tags;
+    if (!isValidUtf8(text)) return tags;
     const auto taxonomy = TGRTTaxonomy::legacyVorthalTaxonomy();
-    for (const std::string& code : attributeCodes(*text)) {
+    for (const std::string& code : attributeCodes(text)) {
         const auto known = legacyTagIdMapping().find(code);
         if (known == legacyTagIdMapping().end()) continue;
         const auto& [category, label, parent] = known->second;
@@ -75,22 +74,30 @@ ObjectSet<TGRTTag> TGRTVorthalLegacyTaggingParser::legacyTagsForFileURL(const UR
     return tags;
 }
 
-ObjectSet<TGRTTagging> TGRTVorthalLegacyTaggingParser::legacyFormatTaggingsForFileURL(const URL& url) {
+ObjectSet<TGRTTagging> TGRTVorthalLegacyTaggingParser::legacyFormatTaggingsForText(std::string_view text) {
     ObjectSet<TGRTTagging> taggings;
-    for (const auto& tag : legacyTagsForFileURL(url)) {
-        taggings.insert(TGRTTagging::initWithTag(tag, nullptr));
-    }
+    for (const auto& tag : legacyTagsForText(text)) taggings.insert(TGRTTagging::initWithTag(tag, nullptr));
     return taggings;
 }
 
-ObjectSet<TGRTTagging> TGRTVorthalLegacyTaggingParser::mappedTaggingsForFileURL(const URL& url) {
+ObjectSet<TGRTTagging> TGRTVorthalLegacyTaggingParser::mappedTaggingsForText(std::string_view text) {
     ObjectSet<TGRTTagging> taggings;
     const auto mapping = TGRTLegacyTaxonomyMapping::legacyVorthalTaxonomyMapping();
     if (!mapping) return taggings;
-    for (const auto& tag : legacyTagsForFileURL(url)) {
-        taggings.insertAll(mapping->taggingsForLegacyTag(*tag));
-    }
+    for (const auto& tag : legacyTagsForText(text)) taggings.insertAll(mapping->taggingsForLegacyTag(*tag));
     return taggings;
+}
+
+ObjectSet<TGRTTag> TGRTVorthalLegacyTaggingParser::legacyTagsForFileURL(const URL& url) {
+    return legacyTagsForText(readTextFile(url.path()).value_or(""));
+}
+
+ObjectSet<TGRTTagging> TGRTVorthalLegacyTaggingParser::legacyFormatTaggingsForFileURL(const URL& url) {
+    return legacyFormatTaggingsForText(readTextFile(url.path()).value_or(""));
+}
+
+ObjectSet<TGRTTagging> TGRTVorthalLegacyTaggingParser::mappedTaggingsForFileURL(const URL& url) {
+    return mappedTaggingsForText(readTextFile(url.path()).value_or(""));
 }
 
 }  // namespace qvct

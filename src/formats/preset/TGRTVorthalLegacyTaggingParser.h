@@ -6,6 +6,7 @@
 #include "taxonomy/TGRTTagging.h"
 
 #include <string>
+#include <string_view>
 #include <unordered_map>
 
 namespace qvct {
@@ -32,6 +33,12 @@ class TGRTVorthalLegacyTaggingParser {
     static ObjectSet<TGRTTagging> legacyFormatTaggingsForFileURL(const URL& url);
     /// What the tags have become in the default taxonomy.
     static ObjectSet<TGRTTagging> mappedTaggingsForFileURL(const URL& url);
+
+    // The same for a preset that has been read already. Text that is not UTF-8 has no tags.
+
+    static ObjectSet<TGRTTag> legacyTagsForText(std::string_view text);
+    static ObjectSet<TGRTTagging> legacyFormatTaggingsForText(std::string_view text);
+    static ObjectSet<TGRTTagging> mappedTaggingsForText(std::string_view text);
 };
 
 }  // namespace qvct

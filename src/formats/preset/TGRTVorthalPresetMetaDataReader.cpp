@@ -23,22 +23,21 @@ std::shared_ptr<TGRTMetaData> TGRTVorthalPresetMetaDataReader::readMetaDataFromU
 std::shared_ptr<TGRTMetaData> TGRTVorthalPresetMetaDataReader::readMetaDataFromFile(ItemFile& file,
                                                                                     std::uint64_t options,
                                                                                     Error* error) const {
-    const URL& url = file.url();
     const auto bytes = file.bytes(kLargestPreset, error);
     if (!bytes) return nullptr;
-    const auto preset =
-        PresetText::parse({reinterpret_cast<const char*>(bytes->data()), bytes->size()}, error);
+    const std::string_view text(reinterpret_cast<const char*>(bytes->data()), bytes->size());
+    const auto preset = PresetText::parse(text, error);
     if (!preset) {
-        failIn(url.path(), error);
+        failIn(file.url().path(), error);
         return nullptr;
     }
     auto record = recordOfPreset(*preset, *taxonomy());
     auto taggings = record->taggings();
     if ((options & kReadLegacyTaggings) != 0) {
-        taggings.insertAll(TGRTVorthalLegacyTaggingParser::legacyFormatTaggingsForFileURL(url));
+        taggings.insertAll(TGRTVorthalLegacyTaggingParser::legacyFormatTaggingsForText(text));
     }
     if ((options & kReadMappedTaggings) != 0) {
-        taggings.insertAll(TGRTVorthalLegacyTaggingParser::mappedTaggingsForFileURL(url));
+        taggings.insertAll(TGRTVorthalLegacyTaggingParser::mappedTaggingsForText(text));
     }
     record->setTaggings(std::move(taggings));
     return record;
