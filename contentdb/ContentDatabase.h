@@ -17,7 +17,7 @@
 
 namespace qvct::contentdb {
 
-/// A library as an object for hosts: what `indexLibrary` has stored, to be searched and read.
+/// What `indexLibrary` has stored of a library, for hosts to search and read.
 ///
 /// One thread at a time for each object; several objects and processes may have the same database open, also
 /// while a run writes to it: each operation sees what was stored when it began. A damaged page is found when
@@ -41,8 +41,8 @@ class QVCT_API ContentDatabase {
     std::optional<std::int64_t> count(const Query& query, Error* error = nullptr);
     /// How many of the found items have each tag, the most frequent first.
     std::optional<std::vector<Facet>> facets(const Query& query, Error* error = nullptr);
-    /// The items nearest to the one at the path, best first. Nothing and an error when the item at the path
-    /// could not be read, or has no tags, rhythm or tempo.
+    /// The items most similar to the one at the path, best first. Nothing and an error when the item at the
+    /// path could not be read, or has no tags, rhythm or tempo.
     std::optional<std::vector<Similar>> similar(std::string_view path, std::size_t limit,
                                                 Error* error = nullptr);
     /// The item at the path; nothing and an error when there is none.

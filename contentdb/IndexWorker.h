@@ -5,8 +5,8 @@
 
 namespace qvct::contentdb {
 
-/// Describes items for the process that started this one, until that needs no more: this is all that the
-/// `main` of a program named in `IndexOptions::worker` has to do. Answers the exit status.
+/// Describes items for the process that started this one, for as long as it needs them: this is all that the
+/// `main` of a program named in `IndexOptions::worker` has to do. Returns the exit status.
 ///
 /// When the factory is called, the files that replace resources are already those of the parent process; log
 /// messages of any thread go to the parent, as long as this runs. Standard input and output cannot be used.

@@ -14,7 +14,7 @@
 
 namespace qvct::contentdb {
 
-/// Something of an item that a query can name.
+/// A field of an item that a query can name.
 struct Field {
     /// Which of an item's texts, sets or numbers.
     enum class Kind { name, path, type, pack, tag, key, level, number };

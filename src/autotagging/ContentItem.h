@@ -18,15 +18,15 @@ class TGRTMetaData;
 /// A content item as it is prepared for tagging, listing and indexing: its XML description, its record and
 /// what its chunks say, each read on first use, once.
 ///
-/// Code that asks several things about an item hands one of these around, so that the item's own file is
-/// opened once. It shows the item as it was when it was read. Not thread-safe.
+/// Code that asks several things about an item hands one of these around, so that its files are opened once.
+/// It shows the item as it was when it was read. Not thread-safe.
 class QVCT_API ContentItem {
   public:
     /// What is to be read, and how.
     struct Reading {
         std::uint64_t options = 0;               ///< For the record: MetaDataReaderOptions.
         std::shared_ptr<TGRTTaxonomy> taxonomy;  ///< For its labels; null is the shared writable default one.
-        bool withXmlDocument = true;             ///< Else there is none: for whoever does not need it.
+        bool withXmlDocument = true;             ///< If false, `xmlDocument` is null.
     };
 
     /// With the stored record alone, its labels resolved in the shared writable default taxonomy.

@@ -21,8 +21,7 @@ class ContentItem;
 ///
 /// Nothing is kept between calls but what the services cache. Use an aggregator from one thread at a time:
 /// the keyword service requires it, and records are read in the shared writable default taxonomy, to which
-/// they may add labels. Threads that are to work at the same time each take an
-/// `independentTaggingAggregator`.
+/// they may add labels. Threads that work at the same time each need an `independentTaggingAggregator`.
 class QVCT_API QVTaggingAggregator {
   public:
     using Services = std::vector<std::shared_ptr<QVCTAutoTaggingService>>;
@@ -30,10 +29,10 @@ class QVCT_API QVTaggingAggregator {
 
     /// With the built-in rules and keywords, for the default taxonomy.
     static std::shared_ptr<QVTaggingAggregator> defaultTaggingAggregator();
-    /// The same with a writable copy of the default taxonomy for itself, in which it reads records: nothing
-    /// that it changes is shared with another one.
+    /// The same with a writable copy of the default taxonomy of its own, in which it reads records: it
+    /// changes nothing that others share.
     static std::shared_ptr<QVTaggingAggregator> independentTaggingAggregator();
-    /// With rules and keywords of the host's own; nothing stands for the built-in ones.
+    /// With rules and keywords of the host's own; an argument without value stands for the built-in ones.
     static std::shared_ptr<QVTaggingAggregator> initWithRules(Settings rules, Settings keywordMapping);
     /// The services of such an aggregator, in the order in which it asks them. A subclass can pass them on
     /// together with services of the host's own.

@@ -19,14 +19,14 @@ struct WalkedLinks {
     std::function<void(const URL& link)> passedOver;
 };
 
-/// Calls `item` for every content item at or below `path`: those of a folder by name, then those below it.
-/// The callback answers whether to go on.
+/// Calls `item` for every content item at or below `path`: those of a folder in the order of their names,
+/// then those of the folders in it. The callback returns whether to go on.
 ///
-/// Folders are walked; a bundle is an item, what lies inside it is not; pipes, sockets and devices are none.
-/// Links to folders are followed as `links` says, after all else, to folders that were not entered yet: each
-/// is entered once. `path` itself is followed always, and when it names a file, that is an item whatever its
-/// name. What cannot be read or listed, such as a folder whose path is too long for the system, is told to
-/// `failed`, and the walk goes on. Each function may be empty.
+/// Folders are walked; a bundle is an item, but nothing inside it is; pipes, sockets and devices are not
+/// items. Links to folders are followed as `links` says, after all else, to folders that were not entered
+/// yet: each is entered once. `path` itself is always followed, and if it names a file, that is an item
+/// whatever its name. What cannot be read or listed, such as a folder whose path is too long for the system,
+/// is reported to `failed`, and the walk goes on. Each function may be empty.
 /// @cost  One listing a folder; files are looked at only where the file system does not tell their kind.
 QVCT_API void walkContent(const std::string& path, const std::function<bool(const URL& item)>& item,
                           const std::function<void(const Error& error)>& failed,

@@ -28,9 +28,9 @@ struct ContentWriteOptions {
     std::optional<FileStamp> expected = std::nullopt;
 };
 
-// The writers of an item's parts. Each answers whether the file now holds what was written, and else fills
-// the error with path and reason. Files are replaced whole (see `replaceFileByPieces`), so that on failure
-// the old one stands untouched. What cannot be read is never written over. Writers have no state.
+// The writers of an item's parts. Each returns whether the file now holds what was to be written; if not, the
+// error gives path and reason. Files are replaced whole (see `replaceFileByPieces`), so that on failure the
+// old one stands untouched. What cannot be read is never written over. Writers have no state.
 
 /// Writes an item's taggings and leaves the rest of its record alone.
 class QVCT_API TGRTTaggingsWriter {

@@ -15,13 +15,13 @@ namespace qvct {
 class LCFileData;
 class RandomAccessReader;
 
-/// The file that lies at an item's URL: opened on first use, once, and what it says parsed once.
+/// The file at an item's URL: opened once, on first use, and parsed once.
 ///
 /// It stays open as long as this object lives. A file that cannot be opened or parsed is not tried again; the
 /// same error is given each time. Folders and missing files count as unreadable. Not thread-safe.
 class QVCT_API ItemFile {
   public:
-    /// Looks at nothing yet.
+    /// Does not look at the disk yet.
     explicit ItemFile(URL url);
     ~ItemFile();
 
@@ -30,7 +30,7 @@ class QVCT_API ItemFile {
     /// Null, and an error with the path, for anything but a regular file that can be read.
     std::shared_ptr<const RandomAccessReader> reader(Error* error = nullptr);
     /// What an audio file says, with what can be derived from it (`LCFileParser::enhancedFileData`). Null,
-    /// and an error, for what is no audio.
+    /// and an error, for what is not audio.
     std::shared_ptr<LCFileData> audio(Error* error = nullptr);
     /// All bytes. They are not kept.
     std::optional<std::vector<std::uint8_t>> bytes(std::uint64_t limit, Error* error = nullptr);

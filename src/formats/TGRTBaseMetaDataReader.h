@@ -33,7 +33,7 @@ class QVCT_API TGRTBaseMetaDataReader : public TGRTMetaDataReader, public TGRTTa
 
     std::shared_ptr<TGRTMetaData> readMetaDataFromURL(const URL& url, std::uint64_t options,
                                                       Error* error = nullptr) const override;
-    /// The same of a file that may be open already. A kind whose record lies in the item's own file is read
+    /// The same for a file that may be open already. A kind whose record lies in the item's own file is read
     /// through it; others are read by their URL.
     virtual std::shared_ptr<TGRTMetaData> readMetaDataFromFile(ItemFile& file, std::uint64_t options,
                                                                Error* error = nullptr) const;

@@ -18,8 +18,8 @@ enum ItemActions : unsigned {
     kItemInsertableOnTrack = 8
 };
 
-/// Decides whether a URL is content of its kind, and hands out the reader and the writers for it: null for
-/// what is not.
+/// Decides whether what lies at a URL is content of its kind, and hands out the reader and writers for it;
+/// null for anything else.
 class QVCT_API TGRTContentNodeTypeValidator {
   public:
     virtual ~TGRTContentNodeTypeValidator() = default;

@@ -19,7 +19,7 @@ class ItemFile;
 
 /// One file or bundle, seen as content: its validator, and through it its reader and writers.
 ///
-/// Nodes with equal URLs are equal. Immutable; what it answers follows the disk, nothing is remembered.
+/// Nodes with equal URLs are equal. Immutable. Each call looks at the disk; nothing is remembered.
 class QVCT_API TGRTFileNode : public Object, public FileURLNode {
   public:
     /// A node for the URL, whether anything lies there or not. Never null.
@@ -44,7 +44,7 @@ class QVCT_API TGRTFileNode : public Object, public FileURLNode {
     std::shared_ptr<TGRTMetaData> readMetaDataWithOptions(std::uint64_t options,
                                                           const std::shared_ptr<TGRTTaxonomy>& taxonomy,
                                                           Error* error = nullptr) const;
-    /// The same of a file that may be open already.
+    /// The same for a file that may be open already.
     static std::shared_ptr<TGRTMetaData> readMetaDataOfFile(ItemFile& file, std::uint64_t options,
                                                             const std::shared_ptr<TGRTTaxonomy>& taxonomy,
                                                             Error* error = nullptr);

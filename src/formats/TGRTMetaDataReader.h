@@ -31,9 +31,9 @@ class QVCT_API TGRTMetaDataReader {
     /// read.
     virtual std::shared_ptr<TGRTMetaData> readMetaDataFromURL(const URL& url, std::uint64_t options,
                                                               Error* error = nullptr) const = 0;
-    /// `readUUID:fileType:taggings:keyValues:options:forFileURL:`. Fills what is not null: without a record
-    /// with empty sets and kFileTypeNone. The UUID is never written. Whether there is a record with a file
-    /// type.
+    /// `readUUID:fileType:taggings:keyValues:options:forFileURL:`. Fills in each argument that is not null;
+    /// without a record, with empty sets and kFileTypeNone. The UUID is never filled in. Returns whether
+    /// there is a record with a file type.
     virtual bool readUUID(std::string* uuid, std::int64_t* fileType, ObjectSet<TGRTTagging>* taggings,
                           ObjectSet<TGRTKeyValue>* keyValues, std::uint64_t options,
                           const URL& url) const = 0;

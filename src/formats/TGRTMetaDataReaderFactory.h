@@ -12,7 +12,7 @@ namespace qvct {
 /// Picks the reader for a URL by its extension alone, whatever its case. The file is not opened.
 class QVCT_API TGRTMetaDataReaderFactory {
   public:
-    /// Null for an extension of no content, and without a taxonomy.
+    /// Null for an extension that no content has, and without a taxonomy.
     static std::shared_ptr<TGRTBaseMetaDataReader> metaDataReaderForURL(
         const URL& url, const std::shared_ptr<TGRTTaxonomy>& taxonomy);
     /// With the shared writable default taxonomy.

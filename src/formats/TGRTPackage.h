@@ -34,7 +34,7 @@ class QVCT_API TGRTPackage : public Object {
     void setDisplayName(std::string name) { displayName_ = std::move(name); }
     /// In the order in which they were added.
     const std::vector<URL>& items() const { return items_; }
-    /// Adds the item behind the others.
+    /// Adds the item after the others.
     void addItem(URL item) { items_.push_back(std::move(item)); }
 
     bool isEqual(const Object& other) const override;

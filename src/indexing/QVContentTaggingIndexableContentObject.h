@@ -16,16 +16,16 @@ namespace qvct {
 ///
 /// The elements of its sets are meant to be read through their own protocols:
 /// QVContentTaggingIndexableTaggingData, QVContentTaggingIndexableValueData and
-/// QVContentTaggingDependencyItem. What these answer are texts and numbers of their own, which stay valid
-/// whatever becomes of the taxonomy; everything else about the elements depends on it.
+/// QVContentTaggingDependencyItem. Those return texts and numbers of their own, which stay valid whatever
+/// becomes of the taxonomy; everything else about the elements depends on it.
 class QVCT_API QVContentTaggingIndexableContentObject {
   public:
     virtual ~QVContentTaggingIndexableContentObject() = default;
     virtual const std::string& displayName() const = 0;
-    /// A FileType; files may hold others. 0 for unknown.
+    /// A FileType, though files may hold other numbers; 0 for unknown.
     virtual std::int64_t fileType() const = 0;
     virtual std::int64_t subFileType() const = 0;
-    /// Whether there is a recording to listen to, be it the item itself.
+    /// Whether there is a recording to listen to, which may be the item itself.
     virtual bool previewAvailable() const = 0;
     /// The content packs that the item belongs to.
     virtual const std::set<std::string>& packageIdentifiers() const = 0;

@@ -18,7 +18,7 @@
 
 namespace qvct {
 
-/// What an indexable object is asked for; a bit set that readers see too (MetaDataReaderOptions).
+/// How an indexable object is made; a bit set that readers are given, too (MetaDataReaderOptions).
 enum IndexingOptions : std::uint64_t {
     kIndexInMutableTaxonomy = 0x4,  ///< Labels that the default taxonomy lacks join the shared writable one.
     kIndexWithoutRecord = 0x100     ///< Also items that store nothing, or not what they are.

@@ -10,7 +10,7 @@ namespace qvct {
 /// Identifiers that anybody can compute from what they identify, so that they need not be stored.
 class QVCT_API QVCTUUIDGenerator {
   public:
-    /// The namespace of our identifiers: together with the path it gives everyone the same ones.
+    /// The namespace of our identifiers: with it, the same path has the same identifier everywhere.
     static constexpr std::string_view kPathNamespace = "42e60a19-8562-4e31-9514-3ae3912dfa41";
 
     /// The identifier of what lies at a path: a name-based UUID (version 5, RFC 9562) of the path in lower

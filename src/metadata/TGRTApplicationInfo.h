@@ -17,7 +17,7 @@ class QVCT_API TGRTApplicationInfo : public Object {
   public:
     /// One without identifier and version.
     static std::shared_ptr<TGRTApplicationInfo> init();
-    /// Fields that are absent, or not of their type, stay unset.
+    /// Fields that are absent, or of the wrong type, stay unset.
     static std::shared_ptr<TGRTApplicationInfo> initWithDictionary(
         const PropertyList::Dictionary& dictionary);
 

@@ -19,8 +19,8 @@ class QVCT_API TGRTContentInfo : public Object {
   public:
     /// An empty one.
     static std::shared_ptr<TGRTContentInfo> init();
-    /// From the form that files store. What is not of its type is passed over; without a dictionary an empty
-    /// one.
+    /// From the form that files store. Entries of the wrong type are passed over; without a dictionary the
+    /// result is empty.
     static std::shared_ptr<TGRTContentInfo> initWithDictionary(const PropertyList* dictionary);
     /// A new one made from `dictionary`, as if it had been written and read.
     std::shared_ptr<TGRTContentInfo> copy() const;

@@ -33,7 +33,7 @@ class QVCT_API TGRTMetaData : public Object {
     /// Nothing when the item has no name but that of its file.
     const std::optional<std::string>& displayName() const { return displayName_; }
     void setDisplayName(std::optional<std::string> name) { displayName_ = std::move(name); }
-    /// A FileType; files may hold others. 0 for none.
+    /// A FileType, though files may hold other numbers; 0 for none.
     std::int64_t fileType() const { return fileType_; }
     void setFileType(std::int64_t fileType) { fileType_ = fileType; }
     /// 0 for none.
@@ -53,8 +53,8 @@ class QVCT_API TGRTMetaData : public Object {
 
     /// Puts the record into the dictionary that an item stores.
     ///
-    /// Entries that a record does not know stay where they are, at every depth (see StoredParts.h). So do a
-    /// stored sub-type and content info if the record has none. A stored UUID is removed.
+    /// Entries that a record does not know stay where they are, at every depth. So do a stored sub-type and
+    /// content info if the record has none. A stored UUID is removed.
     void storeInto(PropertyList::Dictionary& stored) const;
     /// The same for an item whose dictionary holds nothing but the record: other entries are removed, except
     /// those with a key that the dictionary from which this record was read had, too. A stored sub-type and
@@ -67,8 +67,8 @@ class QVCT_API TGRTMetaData : public Object {
     /// there.
     PropertyList::Dictionary prepareDictionaryForURL(const URL& url, Error* error = nullptr) const;
 
-    /// The record that a dictionary holds; null without dictionary. Entries that are not of their type count
-    /// as absent. Labels that the taxonomy does not know are added to it, or dropped when it is read-only.
+    /// The record that a dictionary holds; null without dictionary. Entries of the wrong type count as
+    /// absent. Labels that the taxonomy does not know are added to it, or dropped when it is read-only.
     static std::shared_ptr<TGRTMetaData> metaDataFromDictionary(const PropertyList::Dictionary* dictionary,
                                                                 TGRTTaxonomy& taxonomy);
     /// The taggings alone; none without that entry. Labels as above.

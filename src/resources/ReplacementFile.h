@@ -9,7 +9,7 @@
 
 namespace qvct {
 
-/// The name of a file of data that the library carries, and that another may replace.
+/// The name of a data file that is built into the library and that another file may replace.
 struct ResourceFile {
     std::string_view name;
     std::string_view extension;

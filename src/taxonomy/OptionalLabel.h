@@ -6,7 +6,7 @@
 
 namespace qvct {
 
-/// A label, or none: a null pointer is none, as hosts write it.
+/// A label, or none; hosts may write none as a null pointer.
 class OptionalLabel : public std::optional<std::string_view> {
   public:
     using std::optional<std::string_view>::optional;

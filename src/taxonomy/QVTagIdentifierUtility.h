@@ -7,7 +7,7 @@
 
 namespace qvct {
 
-/// Keys that hosts and the framework derive from tag labels alike.
+/// Keys that both hosts and the framework derive from tag labels.
 class QVCT_API QVTagIdentifierUtility {
   public:
     /// The key under which a pole of a bipolar label ("Bright / Dark") is translated.

@@ -34,8 +34,8 @@ class QVCT_API TGRTLegacyTaxonomyMapping {
     /// The same for the table of synth presets.
     static std::optional<URL> defaultLegacyVorthalTaxonomyMappingURL();
 
-    /// The mapping that a table file (UTF-8) holds. Null when there is none, and when its header or the
-    /// number of fields of any line is not as it should be.
+    /// The mapping that a table file (UTF-8) holds. Null when there is none, or when its header or the number
+    /// of fields of any line is wrong.
     static std::shared_ptr<const TGRTLegacyTaxonomyMapping> initWithTaxonomyMappingFileURL(
         const std::optional<URL>& url, const TGRTTaxonomy& taxonomy);
     /// The mapping of a table's lines, the first of which is passed over, as are lines with another number of
@@ -46,11 +46,11 @@ class QVCT_API TGRTLegacyTaxonomyMapping {
     /// What a retired tag has become; empty when the table names nothing, or has no row for it.
     const ObjectSet<TGRTTagging>& taggingsForLegacyTag(const TGRTTag& tag) const;
 
-    // For whoever keeps the tables.
+    // For those who maintain the tables.
 
     /// Whether a line has as many fields as a row of a table.
     static bool correctFormatForLine(std::string_view line);
-    /// Whether the table has a row for the tag, be it one that names nothing.
+    /// Whether the table has a row for the tag, even one that names nothing.
     bool hasRowForLegacyTag(const TGRTTag& tag) const { return rows_.contains(mappingKeyForTag(tag)); }
     /// Type, keyword and sub-keyword, separated by ";", of the rows whose retired tag does not exist.
     const Lines& unknownLegacyKeywords() const { return unknownLegacyKeywords_; }

@@ -74,7 +74,7 @@ class QVCT_API TGRTTag : public Object,
     std::vector<std::shared_ptr<TGRTTag>> ancestors() const;
     /// The children, then the descendants of each in turn.
     std::vector<std::shared_ptr<TGRTTag>> descendants() const;
-    /// The last of its ancestors; itself when it has none.
+    /// The topmost of its ancestors; the tag itself when it has none.
     std::shared_ptr<TGRTTag> rootTag();
 
     /// The label with its marker written back. Bipolar poles come out as named steps in braces.

@@ -62,8 +62,7 @@ class QVCT_API TGRTTagging : public Object, public QVContentTaggingIndexableTagg
 
     /// @{
     /// The taggings that a tagging dictionary holds; none for null or another value. Unknown labels are added
-    /// to the taxonomy, or dropped when it is read-only; entries that are not as they should be are passed
-    /// over.
+    /// to the taxonomy, or dropped when it is read-only; malformed entries are passed over.
     static ObjectSet<TGRTTagging> taggingsWithTaggingDictionary(const PropertyList* dictionary,
                                                                 TGRTTaxonomy& taxonomy);
     static ObjectSet<TGRTTagging> taggingsWithTaggingDictionary(const PropertyList::Dictionary& dictionary,

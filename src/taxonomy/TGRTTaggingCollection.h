@@ -21,7 +21,7 @@ class QVCT_API FileURLNode {
     virtual URL fileURL() const = 0;
 };
 
-/// How many of the asked nodes have a tagging.
+/// How many of the given nodes have a tagging.
 enum TaggingState : std::int64_t { kTaggingStateNone = 0, kTaggingStateAll = 1, kTaggingStateSome = 2 };
 
 /// The taggings of several file nodes at once, such as of an editor's selection.

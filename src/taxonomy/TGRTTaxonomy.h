@@ -84,12 +84,13 @@ class QVCT_API TGRTTaxonomy : public Object, public QVContentTaggingTaxonomy {
     /// An empty taxonomy, and an error, when the file cannot be read.
     static std::shared_ptr<TGRTTaxonomy> taxonomyWithContentsOfURL(const URL& url, Error* error = nullptr);
     /// @{
-    /// Null, and an error, when the bytes are no property list; null alone when they are no dictionary.
+    /// Null, and an error, when the bytes are not a property list; null without an error when it is not a
+    /// dictionary.
     static std::shared_ptr<TGRTTaxonomy> taxonomyWithData(std::span<const std::uint8_t> data,
                                                           Error* error = nullptr);
     static std::shared_ptr<TGRTTaxonomy> taxonomyWithData(std::string_view data, Error* error = nullptr);
     /// @}
-    /// The taxonomy of a property list's dictionary. What is not of its type is passed over; never null.
+    /// The taxonomy of a property list's dictionary. Entries of the wrong type are passed over. Never null.
     static std::shared_ptr<TGRTTaxonomy> taxonomyWithDictionary(const PropertyList::Dictionary& dictionary);
     /// An empty, writable one.
     static std::shared_ptr<TGRTTaxonomy> init();
@@ -119,8 +120,8 @@ class QVCT_API TGRTTaxonomy : public Object, public QVContentTaggingTaxonomy {
     CategoryPointer findOrCreateCategoryWithIdentifier(std::string_view identifier,
                                                        bool overwriteReadonly = false);
     /// @{
-    /// The tag with that label in the category, wherever it hangs; else a new one below the parent label (a
-    /// root tag when no such parent is found). Null when it would have to be made in a read-only taxonomy.
+    /// The tag with that label at any depth of the category; else a new one below the parent label (a root
+    /// tag when no such parent is found). Null when it would have to be made in a read-only taxonomy.
     TagPointer findOrCreateTagWithLabel(std::string_view label, std::string_view categoryIdentifier);
     TagPointer findOrCreateTagWithLabel(std::string_view label, OptionalLabel parentLabel,
                                         std::string_view categoryIdentifier, bool overwriteReadonly = false);

@@ -18,11 +18,11 @@ class QVCT_API TGRTTaxonomySearching {
     /// Labels with their tags, each label once.
     using TagsTable = std::vector<std::pair<std::string, std::shared_ptr<TGRTTag>>>;
 
-    /// Without a taxonomy it finds nothing. The table is made once; after adding tags to the taxonomy, make
-    /// it anew with `_updateSearchTable`.
+    /// Without a taxonomy it finds nothing. The table is made once; after adding tags to the taxonomy, call
+    /// `_updateSearchTable`.
     static std::shared_ptr<TGRTTaxonomySearching> initWithTaxonomy(std::shared_ptr<TGRTTaxonomy> taxonomy);
-    /// Makes the table anew from the taxonomy: its labels in its order, of several tags with one label the
-    /// last. Empty without a taxonomy.
+    /// Rebuilds the table from the taxonomy: its labels in its order; of several tags with one label the last
+    /// counts. Empty without a taxonomy.
     void _updateSearchTable();
 
     /// The labels equal to the text, or (not exact) those that hold it, without regard to case and
@@ -36,8 +36,8 @@ class QVCT_API TGRTTaxonomySearching {
     void setTaxonomy(std::shared_ptr<TGRTTaxonomy> taxonomy) { taxonomy_ = std::move(taxonomy); }
     /// What is searched.
     const TagsTable& tagsTable() const { return tagsTable_; }
-    /// Searches these tags from now on. Of several rows with one label the last tag holds, in the first's
-    /// place.
+    /// Searches these tags from now on. Of several rows with one label the tag of the last counts, in the
+    /// place of the first.
     void setTagsTable(const TagsTable& table);
     /// The tag of the table with that label, or null.
     std::shared_ptr<TGRTTag> tagForLabel(std::string_view label) const;

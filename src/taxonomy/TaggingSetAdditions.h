@@ -18,7 +18,7 @@ QVCT_API std::shared_ptr<TGRTTagging> anyTaggingForLabel(const ObjectSet<TGRTTag
 QVCT_API bool containsTagWithLabel(const ObjectSet<TGRTTagging>& taggings, std::string_view label);
 
 /// Replaces the tagging with a label by one of a new tag with the new label, which joins the old tag's parent
-/// and category. The level stays; the new tagging is no automatic one.
+/// and category. The level stays; the new tagging does not count as automatic.
 ///
 /// If the parent already has a tag of the new label, the new tag replaces it among the parent's children
 /// without taking over its children: these are lost when the taxonomy is next written.

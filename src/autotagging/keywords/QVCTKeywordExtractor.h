@@ -21,8 +21,8 @@ class LiteralTrie;
 
 /// Finds tag labels in a text: the words of a keyword mapping and every label of a taxonomy, as whole words.
 ///
-/// A mapping's dictionary leads from a keyword (a word, or "regex:" and an expression) to a label or an array
-/// of labels; a label may end in a level, "Bright / Dark (0.0)".
+/// A mapping is a dictionary from a keyword (a word, or "regex:" and an expression) to a label or an array of
+/// labels; a label may end in a level, "Bright / Dark (0.0)".
 ///
 /// The result is that of one case-insensitive expression per keyword. To get there faster, one pass looks at
 /// every place where a word begins or ends for the keywords that start there; a plain word is decided on the

@@ -59,8 +59,8 @@ JSObjectRef JSGetMemoryUsageStatistics(JSContextRef);
 
 namespace qvct {
 
-/// The functions of the script engine. Its library is loaded when the first script runs, since loading takes
-/// half of a program's start-up time and a third of its memory, and most runs need no script.
+/// The functions of the script engine. Its library is loaded when the first script runs, since most runs need
+/// no script and loading takes 5 ms and 5 MB: `qvtag --version` takes 7 ms and 10 MB without it.
 ///
 /// For the .cpp files of scripts only. Safe from every thread.
 struct ScriptEngine {

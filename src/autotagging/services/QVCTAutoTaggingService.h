@@ -25,7 +25,7 @@ enum QVCTAutoTaggingOptions : std::uint64_t {
     QVCTAutoTaggingOptionTranslateTags = 0x200
 };
 
-/// One way of deriving tags. Each service answers to one bit of the options.
+/// One way of deriving tags. Each service is switched on by one bit of the options.
 class QVCT_API QVCTAutoTaggingService {
   public:
     virtual ~QVCTAutoTaggingService() = default;
@@ -37,8 +37,8 @@ class QVCT_API QVCTAutoTaggingService {
                                                    const std::shared_ptr<TGRTMetaData>& metaData,
                                                    const std::shared_ptr<LCFileData>& fileData,
                                                    std::uint64_t options) = 0;
-    /// The same of an item whose file may be open already. The aggregator asks this one, which asks the other
-    /// one unless a service that reads the file overrides it, so that no file is opened twice.
+    /// The same for an item whose file may be open already. This is what the aggregator calls. It calls the
+    /// operation above; a service that reads the item's file overrides it, so that no file is opened twice.
     virtual TagDictionarySet tagsWithContentsOfFile(ItemFile& file,
                                                     const std::shared_ptr<QVCTXMLDocument>& xmlDocument,
                                                     const std::shared_ptr<TGRTMetaData>& metaData,

@@ -20,7 +20,7 @@ struct RuleDescription {
     std::string problem;
 };
 
-/// What one rule made of one document.
+/// The outcome of one rule for one document.
 struct RuleOutcome {
     std::size_t number = 0;  ///< From 1, in the order of the rule set.
     std::string type;        ///< "XPath" or "JavaScript".

@@ -20,8 +20,8 @@ class QVCT_API QVCTXMLDocumentExport {
   public:
     virtual ~QVCTXMLDocumentExport() = default;
 
-    /// Whether the expression selects at least one node. A wrong expression, or one whose value is a number,
-    /// a text or a boolean, selects none.
+    /// Whether the expression selects at least one node. An invalid expression, or one whose value is a
+    /// number, a text or a boolean, selects none.
     virtual bool isMatchingXPath(std::string_view expression) const = 0;
     /// The first selected node as JSON (see `QVCTXMLParser` for its shape), or nothing.
     virtual std::optional<std::string> JSONStringForXPath(std::string_view expression) const = 0;
@@ -39,10 +39,10 @@ class QVCT_API QVCTXMLDocumentExport {
 /// Immutable once made. Queries share state: use a document from one thread at a time.
 class QVCT_API QVCTXMLDocument : public QVCTXMLDocumentExport {
   public:
-    /// Reads the file; the extension "zxml" (in lower case only) says that it is compressed.
-    /// Never null: a file that cannot be read or holds nothing gives a document without content, logged.
+    /// Reads the file; the extension "zxml" (in lower case only) says that it is compressed. Never null: a
+    /// file that cannot be read or holds nothing gives a document without content, and a message in the log.
     static std::shared_ptr<QVCTXMLDocument> initWithContentsOfURL(const URL& url);
-    /// The same of a file that may be open already.
+    /// The same for a file that may be open already.
     static std::shared_ptr<QVCTXMLDocument> initWithContentsOfFile(ItemFile& file);
     /// Reads a compressed file (gzip, zlib or Zstandard), whatever its extension.
     static std::shared_ptr<QVCTXMLDocument> initWithContentsOfQVZippedXMLURL(const URL& url);

@@ -9,8 +9,8 @@
 
 namespace qvct {
 
-/// Texts, each with how often it was added, in the order in which they came first.
-/// Lookups are linear: sets of this kind hold a handful.
+/// Counts how often each text was added; keeps the order of first additions. Lookups are linear: such sets
+/// hold a handful of texts.
 class CountedSet {
   public:
     /// A text and how often it was added.
@@ -20,7 +20,7 @@ class CountedSet {
         bool operator==(const Entry&) const = default;
     };
 
-    /// Counts the text `times` times more.
+    /// Adds `times` to the count of the text.
     void add(std::string_view text, std::size_t times = 1) {
         const auto hit = find(text);
         if (hit == entries_.end()) {

@@ -8,7 +8,7 @@
 
 namespace qvct {
 
-/// Receives one message of the framework, without a line break at its end.
+/// Receives one message from the framework, without a line break at its end.
 using LogHandler = std::function<void(std::string_view message)>;
 
 /// Writes one line to the log. Line breaks and control characters inside the message are escaped.
@@ -16,8 +16,8 @@ using LogHandler = std::function<void(std::string_view message)>;
 /// Messages go to the handler if one is set, else to standard error. Safe from every thread.
 QVCT_API void log(std::string_view message);
 
-/// Sends all further messages to `handler`; an empty one brings standard error back.
-/// Answers the handler that was set before, so that it can be restored.
+/// Sends all further messages to `handler`; an empty one brings standard error back. Returns the handler that
+/// was set before, so that it can be restored.
 QVCT_API LogHandler setLogHandler(LogHandler handler);
 
 /// While it lives, messages of its thread begin with its prefix. Scopes do not nest.

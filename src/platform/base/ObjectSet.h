@@ -21,12 +21,12 @@ class ObjectSet {
     using Pointer = std::shared_ptr<T>;
 
     ObjectSet() = default;
-    /// The objects without those that equal an earlier one.
+    /// The objects, leaving out any that equals an earlier one.
     ObjectSet(std::initializer_list<Pointer> objects) {
         for (const Pointer& object : objects) insert(object);
     }
 
-    /// Adds the object unless an equal one is there. Whether it was added.
+    /// Adds the object unless an equal one is there. Returns whether it was added.
     bool insert(Pointer object) {
         if (!object || contains(*object)) return false;
         byHash_.emplace(object->hash(), object.get());

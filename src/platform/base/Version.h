@@ -8,7 +8,7 @@ namespace qvct {
 
 /// The version of the library that is running, such as "1.2.3".
 ///
-/// A host that was built with another one may want to know. Safe from every thread.
+/// It may differ from the version that a host was built with. Safe from every thread.
 QVCT_API std::string_view version();
 
 }  // namespace qvct

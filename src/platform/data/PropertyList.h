@@ -38,7 +38,7 @@ class QVCT_API PropertyList {
     class Dictionary {
       public:
         Dictionary();
-        /// The entries as they stand: keys have to differ.
+        /// Takes the entries as they are; their keys must differ.
         Dictionary(std::initializer_list<Entry> entries);
         /// @{
         /// Copies are deep.

@@ -17,10 +17,10 @@ namespace qvct {
 //
 // What is read is bounded before anything is built from it: the nesting by kDeepestPropertyList, the keys and
 // values to 150,000 and one more for every 64 bytes, the texts and data that a binary list's shared
-// references expand to by its size. Everything that a property list can hold survives a read and a write in
-// either encoding, in its order, but for this: of a key that comes twice the last value holds, dates lose
-// fractions of a second in XML, and what is not part of a value (comments, attributes, the encoding, the
-// spelling of a number) is not kept.
+// references expand to by its size. Reading and writing keep everything that a property list can hold, and
+// its order, in either encoding, with these exceptions: of a key that comes twice the last value counts,
+// dates in XML lose fractions of a second, and what is not part of a value (comments, attributes, the
+// encoding, the spelling of a number) is lost.
 
 /// How deep dictionaries and arrays of a property list may be nested. Deeper ones are refused as too large,
 /// when read and when written alike, so that what is written can be read.
@@ -38,7 +38,7 @@ enum class PropertyListUse { reading, rewriting };
 /// The value that the bytes hold, whatever the form, or nothing and an error with the offset of the byte at
 /// fault.
 /// @cost  O(size), with O(n log n) for the n keys of one dictionary; memory at most proportional to the size,
-/// beside 64 MiB.
+///   plus 64 MiB.
 QVCT_API std::optional<PropertyList> parsePropertyList(std::span<const std::uint8_t> bytes,
                                                        Error* error = nullptr,
                                                        PropertyListUse use = PropertyListUse::reading);

@@ -16,10 +16,10 @@ namespace qvct {
 /// tag of another writer is lost.
 ///
 /// It is an advisory lock (`flock`) on the folder that the item lies in, links followed. It leaves no file
-/// behind and ends with the process, however that ends. A thread that holds it takes it again at once; it is
-/// to be given back by the thread that took it. A process that is forked meanwhile has no part in it. Where
-/// the folder cannot be opened or its file system has no locks, nobody waits; a write then fails if another
-/// writer changed the file meanwhile.
+/// behind and ends with the process, however that ends. A thread that holds it can take it again at once, and
+/// must itself give it back. A process forked meanwhile has no part in it. Where the folder cannot be opened
+/// or its file system has no locks, nobody waits; a write then fails if another writer changed the file
+/// meanwhile.
 class QVCT_API EditLock {
   public:
     /// How long `acquire` waits for its turn.

@@ -9,7 +9,7 @@ struct stat;
 
 namespace qvct {
 
-/// What tells one state of a file from another. An empty stamp stands for no file.
+/// Tells one state of a file from another. An empty stamp stands for no file.
 struct QVCT_API FileStamp {
     std::uint64_t device = 0;
     std::uint64_t inode = 0;

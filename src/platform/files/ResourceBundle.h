@@ -8,12 +8,12 @@
 
 namespace qvct {
 
-/// Where resource files may lie that replace the compiled-in copies.
+/// Finds the resource files that replace the compiled-in copies.
 ///
-/// Looked into, in this order: the folder set here, the folder that the environment variable QVCT_RESOURCES
-/// names, the resource folder of the installation: share/qvcontenttagging/resources beside the folder in
-/// which the library lies, or the program that it is part of, wherever these were moved to. Setting is for
-/// start-up, before the first look-up of another thread.
+/// Searched in this order: the folder set here; the folder named by the environment variable QVCT_RESOURCES;
+/// the resource folder of the installation, which is share/qvcontenttagging/resources beside the folder of
+/// the library (or of the program that contains it), wherever that was moved to. Set the folder at start-up,
+/// before any other thread looks something up.
 class QVCT_API ResourceBundle {
   public:
     /// An empty path undoes the setting.

@@ -9,11 +9,11 @@ namespace qvct {
 
 /// Writes numbers as the user's locale does, with a fixed number of decimals and without grouping.
 ///
-/// The locale is that of the moment of creation. Making one takes some microseconds, using it is cheap and
+/// The locale is the one in effect at creation. Making one takes some microseconds, using it is cheap and
 /// safe from every thread.
 class QVCT_API DecimalFormatter {
   public:
-    /// With so many decimals, rounded half to even.
+    /// With that many decimals; halves are rounded to even.
     explicit DecimalFormatter(int fractionDigits);
     /// @{
     /// A moved-from formatter must not be used.

@@ -17,7 +17,7 @@ namespace qvct {
 /// without end is given up after about a second and counts as no match, with an error where one is asked for.
 class QVCT_API RegularExpression {
   public:
-    /// Whether capitals and small letters differ.
+    /// Whether upper and lower case differ.
     enum class Case { sensitive, insensitive };
     /// A match: UTF-16 offsets of the whole (first) and of each capture group.
     struct Range {

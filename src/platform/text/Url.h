@@ -15,7 +15,7 @@ class QVCT_API URL {
     /// The URL of a path. A relative path is taken from the current directory; "." and ".." and doubled
     /// slashes are resolved in the text, without looking at the disk. A trailing slash is dropped.
     static URL fileURLWithPath(std::string_view path);
-    /// The URL that the text spells; "file://" forms are percent-decoded.
+    /// The URL written as the text; "file://" forms are percent-decoded.
     static URL URLWithString(std::string_view text);
 
     bool isFileURL() const { return isFile_; }
@@ -28,14 +28,14 @@ class QVCT_API URL {
     std::string decodedString() const;
 
     std::string lastPathComponent() const;
-    /// The letters after the last dot of the last component; empty when there is none.
+    /// The characters after the last dot of the last component; empty when there is none.
     std::string pathExtension() const;
     /// The extension in lower case, for comparing.
     std::string lowercasePathExtension() const;
     std::string lastPathComponentWithoutExtension() const;
-    /// The URL of what has that name inside this one.
+    /// The URL of the entry of that name inside this one.
     URL URLByAppendingPathComponent(std::string_view component) const;
-    /// The same with "." and the extension behind the last component.
+    /// This URL with "." and the extension appended to its last component.
     URL URLByAppendingPathExtension(std::string_view extension) const;
     URL URLByDeletingLastPathComponent() const;
 
