@@ -1,4 +1,4 @@
-#include "CommandLine.h"
+#include "CommandDescription.h"
 #include "platform/base/Version.h"
 #include "platform/text/Text.h"
 

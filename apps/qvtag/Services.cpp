@@ -1,11 +1,11 @@
 #include "Services.h"
 
+#include "CommandLine.h"
 #include "autotagging/services/TaggingServiceNames.h"
 #include "platform/text/Text.h"
 
 #include <algorithm>
 
-#include <CLI/CLI.hpp>
 #include <fmt/format.h>
 
 namespace qvct::tool {
@@ -20,11 +20,11 @@ std::string allNames() {
 
 }  // namespace
 
-void addServicesOption(CLI::App& command, std::vector<std::string>& names) {
-    command.add_option("--services", names, "Only these services derive tags: " + allNames())
-        ->delimiter(',')
-        ->allow_extra_args(false)
-        ->type_name("A,B");
+void addServicesOption(Command& command, std::vector<std::string>& names) {
+    command.addOption("--services", names, "Only these services derive tags: " + allNames())
+        .separatedBy(',')
+        .oneWordEach()
+        .valueName("A,B");
 }
 
 std::uint64_t optionsForServices(const std::vector<std::string>& names, ToolContext& context) {

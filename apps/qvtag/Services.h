@@ -6,14 +6,12 @@
 #include <string>
 #include <vector>
 
-namespace CLI {
-class App;
-}
-
 namespace qvct::tool {
 
+class Command;
+
 /// Adds "--services", which takes one list, so that paths may follow it.
-void addServicesOption(CLI::App& command, std::vector<std::string>& names);
+void addServicesOption(Command& command, std::vector<std::string>& names);
 
 /// The options of the services by name; of all of them when none is named. A wrong name is reported and left
 /// out.

@@ -16,7 +16,6 @@
 #include <algorithm>
 #include <memory>
 
-#include <CLI/CLI.hpp>
 #include <fmt/format.h>
 
 namespace qvct::tool {
@@ -143,23 +142,22 @@ void run(const Options& options, ToolContext& context) {
 
 }  // namespace
 
-void addAutotagCommand(CLI::App& app, ToolContext& context) {
+void addAutotagCommand(Command& tool, ToolContext& context) {
     const auto options = std::make_shared<Options>();
-    auto* command = app.add_subcommand("autotag", "Derives tags for files and for everything below folders");
-    command->add_option("paths", options->paths, "Files and folders")->required()->type_name("PATH");
-    addFollowOption(*command, options->links);
-    addServicesOption(*command, options->services);
+    Command command = tool.addCommand("autotag", "Derives tags for files and for everything below folders");
+    command.addOption("paths", options->paths, "Files and folders").required().valueName("PATH");
+    command.addFollowFlag(options->links);
+    addServicesOption(command, options->services);
     command
-        ->add_option("--keywords", options->keywordsFile,
-                     "Property list of keywords to use instead of the built-in")
-        ->type_name("FILE");
-    command
-        ->add_option("--rules", options->rulesFile, "Property list of rules to use instead of the built-in")
-        ->type_name("FILE");
-    command->add_flag("--rhythm-any", options->measuresAnyRhythm,
-                      "Grade the rhythm of every sound whose length in beats is known");
-    command->footer("Example:\n  qvtag autotag --json Loops \"Patches/Warm Pad.patch\"");
-    command->callback([options, &context] { run(*options, context); });
+        .addOption("--keywords", options->keywordsFile,
+                   "Property list of keywords to use instead of the built-in")
+        .valueName("FILE");
+    command.addOption("--rules", options->rulesFile, "Property list of rules to use instead of the built-in")
+        .valueName("FILE");
+    command.addFlag("--rhythm-any", options->measuresAnyRhythm,
+                    "Grade the rhythm of every sound whose length in beats is known");
+    command.footer("Example:\n  qvtag autotag --json Loops \"Patches/Warm Pad.patch\"");
+    command.callback([options, &context] { run(*options, context); });
 }
 
 }  // namespace qvct::tool

@@ -2,31 +2,29 @@
 
 #include "ToolContext.h"
 
-namespace CLI {
-class App;
-}
-
 namespace qvct::tool {
 
+class Command;
+
 /// `generate`, hidden: prints what the build needs of the command line.
-void addGenerateCommand(CLI::App& app);
+void addGenerateCommand(Command& tool);
 
 /// Each adds one command to the tool. A command reports what fails through the context and never throws.
-void addAutotagCommand(CLI::App& app, ToolContext& context);
-void addInspectCommand(CLI::App& app, ToolContext& context);
+void addAutotagCommand(Command& tool, ToolContext& context);
+void addInspectCommand(Command& tool, ToolContext& context);
 /// `db`: merges and checks databases.
-void addDatabaseCommand(CLI::App& app, ToolContext& context);
-void addIndexCommand(CLI::App& app, ToolContext& context);
-void addKeywordsCommand(CLI::App& app, ToolContext& context);
-void addObjectCommand(CLI::App& app, ToolContext& context);
-void addRhythmCommand(CLI::App& app, ToolContext& context);
-void addRulesCommand(CLI::App& app, ToolContext& context);
-void addReadCommand(CLI::App& app, ToolContext& context);
+void addDatabaseCommand(Command& tool, ToolContext& context);
+void addIndexCommand(Command& tool, ToolContext& context);
+void addKeywordsCommand(Command& tool, ToolContext& context);
+void addObjectCommand(Command& tool, ToolContext& context);
+void addRhythmCommand(Command& tool, ToolContext& context);
+void addRulesCommand(Command& tool, ToolContext& context);
+void addReadCommand(Command& tool, ToolContext& context);
 /// `search`, `facets` and `similar`: what a database holds.
-void addSearchCommands(CLI::App& app, ToolContext& context);
-void addTaxonomyCommand(CLI::App& app, ToolContext& context);
-void addWriteCommand(CLI::App& app, ToolContext& context);
+void addSearchCommands(Command& tool, ToolContext& context);
+void addTaxonomyCommand(Command& tool, ToolContext& context);
+void addWriteCommand(Command& tool, ToolContext& context);
 /// Adds the commands below `taxonomy` that show what has become of retired vocabularies.
-void addLegacyTaxonomyCommands(CLI::App& taxonomy, ToolContext& context);
+void addLegacyTaxonomyCommands(Command& taxonomy, ToolContext& context);
 
 }  // namespace qvct::tool

@@ -1,11 +1,10 @@
+#include "CommandLine.h"
 #include "commands/Commands.h"
 #include "contentdb/ContentDatabase.h"
 #include "output/StandardStreams.h"
 #include "platform/text/Text.h"
 
 #include <memory>
-
-#include <CLI/CLI.hpp>
 
 namespace qvct::tool {
 namespace {
@@ -58,22 +57,22 @@ void check(const Options& options, ToolContext& context) {
 
 }  // namespace
 
-void addDatabaseCommand(CLI::App& app, ToolContext& context) {
+void addDatabaseCommand(Command& tool, ToolContext& context) {
     const auto options = std::make_shared<Options>();
-    auto* command = app.add_subcommand("db", "Merges and checks databases");
-    command->require_subcommand(1);
-    command->footer("Example:\n  qvtag db merge part1.db part2.db --db all.db\n  qvtag db check all.db");
+    Command command = tool.addCommand("db", "Merges and checks databases");
+    command.requireCommand();
+    command.footer("Example:\n  qvtag db merge part1.db part2.db --db all.db\n  qvtag db check all.db");
 
-    auto* merging = command->add_subcommand("merge", "Unites the databases of parts into a new one");
-    merging->add_option("databases", options->databases, "The parts")->required()->type_name("FILE");
-    merging->add_option("--db", options->target, "The new database")->required()->type_name("FILE");
-    merging->footer("Example:\n  qvtag db merge part1.db part2.db --db all.db");
-    merging->callback([options, &context] { merge(*options, context); });
+    Command merging = command.addCommand("merge", "Unites the databases of parts into a new one");
+    merging.addOption("databases", options->databases, "The parts").required().valueName("FILE");
+    merging.addOption("--db", options->target, "The new database").required().valueName("FILE");
+    merging.footer("Example:\n  qvtag db merge part1.db part2.db --db all.db");
+    merging.callback([options, &context] { merge(*options, context); });
 
-    auto* checking = command->add_subcommand("check", "Reads a database whole; lists the items that failed");
-    checking->add_option("databases", options->databases, "The databases")->required()->type_name("FILE");
-    checking->footer("Example:\n  qvtag db check all.db");
-    checking->callback([options, &context] { check(*options, context); });
+    Command checking = command.addCommand("check", "Reads a database whole; lists the items that failed");
+    checking.addOption("databases", options->databases, "The databases").required().valueName("FILE");
+    checking.footer("Example:\n  qvtag db check all.db");
+    checking.callback([options, &context] { check(*options, context); });
 }
 
 }  // namespace qvct::tool

@@ -11,8 +11,6 @@
 #include <chrono>
 #include <memory>
 
-#include <CLI/CLI.hpp>
-
 namespace qvct::tool {
 namespace {
 
@@ -97,41 +95,41 @@ void run(Options& options, ToolContext& context) {
 
 }  // namespace
 
-void addIndexCommand(CLI::App& app, ToolContext& context) {
+void addIndexCommand(Command& tool, ToolContext& context) {
     const auto options = std::make_shared<Options>();
     IndexOptions& index = options->index;
-    auto* command = app.add_subcommand("index", "Brings a database up to date with folders of sounds");
-    command->add_option("folders", index.folders, "Folders to walk")->required()->type_name("DIR");
-    command->add_option("--db", index.database, "The database; made if there is none")
-        ->required()
-        ->type_name("FILE");
-    addFollowOption(*command, index.links.outside);
-    auto* prune = command->add_flag("--prune", index.prune, "Take items out whose files are gone");
+    Command command = tool.addCommand("index", "Brings a database up to date with folders of sounds");
+    command.addOption("folders", index.folders, "Folders to walk").required().valueName("DIR");
+    command.addOption("--db", index.database, "The database; made if there is none")
+        .required()
+        .valueName("FILE");
+    command.addFollowFlag(index.links.outside);
+    Option prune = command.addFlag("--prune", index.prune, "Take items out whose files are gone");
     command
-        ->add_flag("--prune-roots", index.pruneRoots,
-                   "Also where a named folder is empty or missing, as when its disk is away")
-        ->needs(prune);
-    command->add_flag("--retry", index.retryFailed, "Read items again that failed before");
-    command->add_flag("--check", index.check,
-                      "Read the database whole first; what is damaged is built anew. Without, only its pages "
-                      "are held against their checksums");
-    addServicesOption(*command, options->services);
-    auto* part = command->add_option("--part", index.part, "Index only part I of the items")
-                     ->type_name("I")
-                     ->check(CLI::Range(1, 1000000));
-    auto* parts = command->add_option("--parts", index.parts, "Into how many parts the items are divided")
-                      ->type_name("N")
-                      ->check(CLI::Range(1, 1000000));
-    part->needs(parts);
-    parts->needs(part);
-    command->add_option("--workers", index.workers, "Processes that read items (default: one a processor)")
-        ->check(CLI::Range(0, 1024));
-    command->add_option("--time-limit", options->secondsPerItem, "Seconds that one item may take")
-        ->check(CLI::Range(1, 86400));
-    command->footer(
+        .addFlag("--prune-roots", index.pruneRoots,
+                 "Also where a named folder is empty or missing, as when its disk is away")
+        .needs(prune);
+    command.addFlag("--retry", index.retryFailed, "Read items again that failed before");
+    command.addFlag("--check", index.check,
+                    "Read the database whole first; what is damaged is built anew. Without, only its pages "
+                    "are held against their checksums");
+    addServicesOption(command, options->services);
+    Option part = command.addOption("--part", index.part, "Index only part I of the items")
+                      .valueName("I")
+                      .between(1, 1000000);
+    Option parts = command.addOption("--parts", index.parts, "Into how many parts the items are divided")
+                       .valueName("N")
+                       .between(1, 1000000);
+    part.needs(parts);
+    parts.needs(part);
+    command.addOption("--workers", index.workers, "Processes that read items (default: one a processor)")
+        .between(0, 1024);
+    command.addOption("--time-limit", options->secondsPerItem, "Seconds that one item may take")
+        .between(1, 86400);
+    command.footer(
         "Example:\n  qvtag index ~/Music/Loops --db loops.db\n"
         "  qvtag index /sounds --db part2.db --part 2 --parts 4");
-    command->callback([options, &context] { run(*options, context); });
+    command.callback([options, &context] { run(*options, context); });
 }
 
 }  // namespace qvct::tool

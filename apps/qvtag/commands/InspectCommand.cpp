@@ -6,7 +6,6 @@
 
 #include <memory>
 
-#include <CLI/CLI.hpp>
 #include <fmt/format.h>
 
 namespace qvct::tool {
@@ -61,14 +60,14 @@ void run(const Options& options, ToolContext& context) {
 
 }  // namespace
 
-void addInspectCommand(CLI::App& app, ToolContext& context) {
+void addInspectCommand(Command& tool, ToolContext& context) {
     const auto options = std::make_shared<Options>();
-    auto* command =
-        app.add_subcommand("inspect", "Shows what is in a file: chunks, header fields, stored entries");
-    command->add_option("paths", options->paths, "Files and folders")->required()->type_name("PATH");
-    addFollowOption(*command, options->links);
-    command->footer("Example:\n  qvtag inspect \"Kick 01.wav\"");
-    command->callback([options, &context] { run(*options, context); });
+    Command command =
+        tool.addCommand("inspect", "Shows what is in a file: chunks, header fields, stored entries");
+    command.addOption("paths", options->paths, "Files and folders").required().valueName("PATH");
+    command.addFollowFlag(options->links);
+    command.footer("Example:\n  qvtag inspect \"Kick 01.wav\"");
+    command.callback([options, &context] { run(*options, context); });
 }
 
 }  // namespace qvct::tool

@@ -1,3 +1,4 @@
+#include "CommandLine.h"
 #include "autotagging/keywords/QVCTKeywordExtractor.h"
 #include "commands/Commands.h"
 #include "output/StandardStreams.h"
@@ -5,8 +6,6 @@
 
 #include <algorithm>
 #include <memory>
-
-#include <CLI/CLI.hpp>
 
 namespace qvct::tool {
 namespace {
@@ -36,13 +35,13 @@ void run(const Options& options, ToolContext& context) {
 
 }  // namespace
 
-void addKeywordsCommand(CLI::App& app, ToolContext& context) {
+void addKeywordsCommand(Command& tool, ToolContext& context) {
     const auto options = std::make_shared<Options>();
-    auto* command =
-        app.add_subcommand("keywords", "Shows which labels the words of a text yield, and how often");
-    command->add_option("text", options->text, "The text, such as a path")->required();
-    command->footer("Example:\n  qvtag keywords \"Loops/Deep House/Warm Analog Synth.caf\"");
-    command->callback([options, &context] { run(*options, context); });
+    Command command =
+        tool.addCommand("keywords", "Shows which labels the words of a text yield, and how often");
+    command.addOption("text", options->text, "The text, such as a path").required();
+    command.footer("Example:\n  qvtag keywords \"Loops/Deep House/Warm Analog Synth.caf\"");
+    command.callback([options, &context] { run(*options, context); });
 }
 
 }  // namespace qvct::tool

@@ -1,3 +1,4 @@
+#include "CommandLine.h"
 #include "commands/Commands.h"
 #include "output/StandardStreams.h"
 #include "platform/text/Text.h"
@@ -7,7 +8,6 @@
 #include <algorithm>
 #include <memory>
 
-#include <CLI/CLI.hpp>
 #include <fmt/format.h>
 
 namespace qvct::tool {
@@ -184,23 +184,22 @@ void showCoverage(const Options& options, ToolContext& context) {
 
 }  // namespace
 
-void addLegacyTaxonomyCommands(CLI::App& taxonomy, ToolContext& context) {
+void addLegacyTaxonomyCommands(Command& taxonomy, ToolContext& context) {
     const auto options = std::make_shared<Options>();
-    const auto addVocabulary = [&options](CLI::App* command) {
-        command->add_option("--vocabulary", options->vocabulary, "Only loop or synth")
-            ->check(CLI::IsMember({"loop", "synth"}));
+    const auto addVocabulary = [&options](Command command) {
+        command.addOption("--vocabulary", options->vocabulary, "Only loop or synth").oneOf({"loop", "synth"});
     };
-    auto* mapping = taxonomy.add_subcommand("map", "What a keyword of a retired vocabulary has become");
-    mapping->add_option("label", options->label, "The old keyword, as it is written")->required();
+    Command mapping = taxonomy.addCommand("map", "What a keyword of a retired vocabulary has become");
+    mapping.addOption("label", options->label, "The old keyword, as it is written").required();
     addVocabulary(mapping);
-    mapping->footer("Example:\n  qvtag taxonomy map Dark --vocabulary loop");
-    mapping->callback([options, &context] { map(*options, context); });
+    mapping.footer("Example:\n  qvtag taxonomy map Dark --vocabulary loop");
+    mapping.callback([options, &context] { map(*options, context); });
 
-    auto* coverage = taxonomy.add_subcommand(
+    Command coverage = taxonomy.addCommand(
         "coverage", "Old tags that have become nothing, and new labels that the taxonomy does not know");
     addVocabulary(coverage);
-    coverage->footer("Example:\n  qvtag taxonomy coverage");
-    coverage->callback([options, &context] { showCoverage(*options, context); });
+    coverage.footer("Example:\n  qvtag taxonomy coverage");
+    coverage.callback([options, &context] { showCoverage(*options, context); });
 }
 
 }  // namespace qvct::tool

@@ -10,7 +10,6 @@
 
 #include <memory>
 
-#include <CLI/CLI.hpp>
 #include <fmt/format.h>
 
 namespace qvct::tool {
@@ -102,20 +101,20 @@ void run(const Options& options, ToolContext& context) {
 
 }  // namespace
 
-void addObjectCommand(CLI::App& app, ToolContext& context) {
+void addObjectCommand(Command& tool, ToolContext& context) {
     const auto options = std::make_shared<Options>();
-    auto* command = app.add_subcommand("object", "Shows what a content database stores of files and bundles");
-    command->add_option("paths", options->paths, "Files and folders")->required()->type_name("PATH");
-    addFollowOption(*command, options->links);
+    Command command = tool.addCommand("object", "Shows what a content database stores of files and bundles");
+    command.addOption("paths", options->paths, "Files and folders").required().valueName("PATH");
+    command.addFollowFlag(options->links);
     command
-        ->add_option("--options", options->bits,
-                     "Sum of 1: tags of retired vocabularies, and what loop keywords among them are called "
-                     "today; 2: what retired tags are called today; 4: tags that the taxonomy does not "
-                     "know; 256: items that store nothing")
-        ->type_name("N")
-        ->check(CLI::Validator(refuseNegative, ""));
-    command->footer("Example:\n  qvtag object --json --options 258 Loops");
-    command->callback([options, &context] { run(*options, context); });
+        .addOption("--options", options->bits,
+                   "Sum of 1: tags of retired vocabularies, and what loop keywords among them are called "
+                   "today; 2: what retired tags are called today; 4: tags that the taxonomy does not "
+                   "know; 256: items that store nothing")
+        .valueName("N")
+        .notNegative();
+    command.footer("Example:\n  qvtag object --json --options 258 Loops");
+    command.callback([options, &context] { run(*options, context); });
 }
 
 }  // namespace qvct::tool

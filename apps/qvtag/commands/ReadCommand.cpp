@@ -9,7 +9,6 @@
 
 #include <memory>
 
-#include <CLI/CLI.hpp>
 #include <fmt/format.h>
 
 namespace qvct::tool {
@@ -90,16 +89,16 @@ void run(const Options& options, ToolContext& context) {
 
 }  // namespace
 
-void addReadCommand(CLI::App& app, ToolContext& context) {
+void addReadCommand(Command& tool, ToolContext& context) {
     const auto options = std::make_shared<Options>();
-    auto* command = app.add_subcommand("read", "Shows what files and bundles store about themselves");
-    command->add_option("paths", options->paths, "Files and folders")->required()->type_name("PATH");
-    addFollowOption(*command, options->links);
-    command->add_flag("--legacy", options->legacy,
-                      "Also the tags of retired vocabularies in old loops and presets");
-    command->add_flag("--mapped", options->mapped, "Also what those tags are called today");
-    command->footer("Example:\n  qvtag read --json --mapped Loops");
-    command->callback([options, &context] { run(*options, context); });
+    Command command = tool.addCommand("read", "Shows what files and bundles store about themselves");
+    command.addOption("paths", options->paths, "Files and folders").required().valueName("PATH");
+    command.addFollowFlag(options->links);
+    command.addFlag("--legacy", options->legacy,
+                    "Also the tags of retired vocabularies in old loops and presets");
+    command.addFlag("--mapped", options->mapped, "Also what those tags are called today");
+    command.footer("Example:\n  qvtag read --json --mapped Loops");
+    command.callback([options, &context] { run(*options, context); });
 }
 
 }  // namespace qvct::tool

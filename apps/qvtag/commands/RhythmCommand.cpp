@@ -1,3 +1,4 @@
+#include "CommandLine.h"
 #include "RhythmMeasurement.h"
 #include "commands/Commands.h"
 #include "output/StandardStreams.h"
@@ -11,7 +12,6 @@
 #include <fstream>
 #include <memory>
 
-#include <CLI/CLI.hpp>
 #include <fmt/format.h>
 
 namespace qvct::tool {
@@ -39,12 +39,6 @@ bool readSignature(const std::string& text, RhythmRequest& request) {
     request.signatureTop = top;
     request.signatureBottom = bottom;
     return true;
-}
-
-/// Catches a NaN, which a range check lets through.
-std::string refuseNotANumber(const std::string& text) {
-    double value = 0;
-    return CLI::detail::lexical_cast(text, value) && std::isnan(value) ? "not a number" : "";
 }
 
 /// The value rounded to a millionth, so that it is printed without the digits of rounding errors.
@@ -152,21 +146,20 @@ void run(Options options, ToolContext& context) {
 
 }  // namespace
 
-void addRhythmCommand(CLI::App& app, ToolContext& context) {
+void addRhythmCommand(Command& tool, ToolContext& context) {
     const auto options = std::make_shared<Options>();
-    auto* command = app.add_subcommand("rhythm", "Measures how dense and how complex a rhythm is");
-    command->add_option("files", options->paths, "MIDI files, loops and other sounds")
-        ->required()
-        ->type_name("FILE");
-    command->add_option("--tempo", options->request.tempo, "Quarter notes a minute")
-        ->check(CLI::Range(1.0, 1000.0) & CLI::Validator(refuseNotANumber, ""));
-    command->add_option("--beats", options->request.beats, "Length in beats, 6 a bar of 6/8")
-        ->check(CLI::Range(1, kMostBeats));
-    command->add_option("--signature", options->signature, "Time signature, such as 6/8");
-    command->add_option("--plot", options->plotFile, "Draw the rhythm, and what gave it its numbers")
-        ->type_name("FILE.svg");
-    command->footer("Example:\n  qvtag rhythm \"Deep House Beat.caf\" --plot beat.svg");
-    command->callback([options, &context] { run(*options, context); });
+    Command command = tool.addCommand("rhythm", "Measures how dense and how complex a rhythm is");
+    command.addOption("files", options->paths, "MIDI files, loops and other sounds")
+        .required()
+        .valueName("FILE");
+    command.addOption("--tempo", options->request.tempo, "Quarter notes a minute").between(1.0, 1000.0);
+    command.addOption("--beats", options->request.beats, "Length in beats, 6 a bar of 6/8")
+        .between(1, kMostBeats);
+    command.addOption("--signature", options->signature, "Time signature, such as 6/8");
+    command.addOption("--plot", options->plotFile, "Draw the rhythm, and what gave it its numbers")
+        .valueName("FILE.svg");
+    command.footer("Example:\n  qvtag rhythm \"Deep House Beat.caf\" --plot beat.svg");
+    command.callback([options, &context] { run(*options, context); });
 }
 
 }  // namespace qvct::tool

@@ -10,7 +10,6 @@
 #include <algorithm>
 #include <memory>
 
-#include <CLI/CLI.hpp>
 #include <fmt/format.h>
 
 namespace qvct::tool {
@@ -170,29 +169,26 @@ void test(const Options& options, ToolContext& context) {
 
 }  // namespace
 
-void addRulesCommand(CLI::App& app, ToolContext& context) {
+void addRulesCommand(Command& tool, ToolContext& context) {
     const auto options = std::make_shared<Options>();
-    auto* rules = app.add_subcommand("rules", "Shows which rules match a patch, and why");
-    rules->add_option("paths", options->paths, "Patches, settings, and folders of them")->type_name("PATH");
-    rules->add_option("--rules", options->rulesFile, "Property list of rules to use instead of the built-in")
-        ->type_name("FILE");
-    addFollowOption(*rules, options->links);
-    rules->footer(
+    Command rules = tool.addCommand("rules", "Shows which rules match a patch, and why");
+    rules.addOption("paths", options->paths, "Patches, settings, and folders of them").valueName("PATH");
+    rules.addOption("--rules", options->rulesFile, "Property list of rules to use instead of the built-in")
+        .valueName("FILE");
+    rules.addFollowFlag(options->links);
+    rules.footer(
         "Example:\n  qvtag rules \"Patches/Warm Pad.patch\"\n  qvtag rules test MyRules.plist Patches");
 
-    auto* testing =
-        rules->add_subcommand("test", "Tries rules of your own: faults, matches and time of each");
-    testing->add_option("rules", options->rulesFile, "Property list of rules")
-        ->required()
-        ->type_name("RULES");
-    testing->add_option("paths", options->paths, "Patches, settings, and folders of them")
-        ->required()
-        ->type_name("PATH");
-    addFollowOption(*testing, options->links);
-    testing->footer("Example:\n  qvtag rules test MyRules.plist Patches");
-    testing->callback([options, &context] { test(*options, context); });
-    rules->callback([rules, options, &context] {
-        if (!rules->get_subcommands().empty()) return;
+    Command testing = rules.addCommand("test", "Tries rules of your own: faults, matches and time of each");
+    testing.addOption("rules", options->rulesFile, "Property list of rules").required().valueName("RULES");
+    testing.addOption("paths", options->paths, "Patches, settings, and folders of them")
+        .required()
+        .valueName("PATH");
+    testing.addFollowFlag(options->links);
+    testing.footer("Example:\n  qvtag rules test MyRules.plist Patches");
+    testing.callback([options, &context] { test(*options, context); });
+    rules.callback([rules, options, &context] {
+        if (rules.isCommandNamed()) return;
         if (options->paths.empty()) return context.usageFailed("rules: which files? See qvtag rules --help");
         show(*options, context);
     });

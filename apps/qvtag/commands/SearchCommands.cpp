@@ -17,7 +17,6 @@
 #include <memory>
 #include <unordered_map>
 
-#include <CLI/CLI.hpp>
 #include <fmt/format.h>
 
 namespace qvct::tool {
@@ -226,42 +225,40 @@ void findSimilar(const Options& options, ToolContext& context) {
     printItemTable(rows, context.terminal());
 }
 
-CLI::App* addCommand(CLI::App& app, const char* name, const char* what,
-                     const std::shared_ptr<Options>& options, ToolContext& context,
-                     void (*run)(const Options&, ToolContext&)) {
-    auto* command = app.add_subcommand(name, what);
-    command->add_option("--db", options->database, "The database")->required()->type_name("FILE");
-    command->callback([options, &context, run] { run(*options, context); });
+Command addCommand(Command& tool, const char* name, const char* what, const std::shared_ptr<Options>& options,
+                   ToolContext& context, void (*run)(const Options&, ToolContext&)) {
+    Command command = tool.addCommand(name, what);
+    command.addOption("--db", options->database, "The database").required().valueName("FILE");
+    command.callback([options, &context, run] { run(*options, context); });
     return command;
 }
 
 }  // namespace
 
-void addSearchCommands(CLI::App& app, ToolContext& context) {
+void addSearchCommands(Command& tool, ToolContext& context) {
     const auto options = std::make_shared<Options>();
-    const auto addLimit = [&options](CLI::App* command) {
-        command->add_option("--limit", options->limit, "Most items to show")
-            ->capture_default_str()
-            ->check(CLI::Validator(refuseNegative, ""));
+    const auto addLimit = [&options](Command command) {
+        command.addOption("--limit", options->limit, "Most items to show").showsDefault().notNegative();
     };
-    auto* searching = addCommand(app, "search", "Finds items in a database", options, context, searchItems);
-    searching->add_option("query", options->words, "What to find; a query that begins with - goes behind --");
+    Command searching =
+        addCommand(tool, "search", "Finds items in a database", options, context, searchItems);
+    searching.addOption("query", options->words, "What to find; a query that begins with - goes behind --");
     addLimit(searching);
-    searching->footer(
+    searching.footer(
         "Example:\n  qvtag search 'kick genre:House bpm:118..124 -type:loop bpm+' --db loops.db");
 
-    auto* counting =
-        addCommand(app, "facets", "Counts the tags of what a query finds", options, context, countTags);
-    counting->add_option("query", options->words, "What to find; everything if left out");
-    counting->footer("Example:\n  qvtag facets 'type:loop bpm:90..100' --db loops.db");
+    Command counting =
+        addCommand(tool, "facets", "Counts the tags of what a query finds", options, context, countTags);
+    counting.addOption("query", options->words, "What to find; everything if left out");
+    counting.footer("Example:\n  qvtag facets 'type:loop bpm:90..100' --db loops.db");
 
-    auto* nearing =
-        addCommand(app, "similar", "Finds the items nearest to one", options, context, findSimilar);
-    nearing->add_option("path", options->path, "The item, which must be in the database")
-        ->required()
-        ->type_name("PATH");
+    Command nearing =
+        addCommand(tool, "similar", "Finds the items nearest to one", options, context, findSimilar);
+    nearing.addOption("path", options->path, "The item, which must be in the database")
+        .required()
+        .valueName("PATH");
     addLimit(nearing);
-    nearing->footer("Example:\n  qvtag similar 'Loops/Dusty Kick.wav' --db loops.db --limit 10");
+    nearing.footer("Example:\n  qvtag similar 'Loops/Dusty Kick.wav' --db loops.db --limit 10");
 }
 
 }  // namespace qvct::tool

@@ -1,3 +1,4 @@
+#include "CommandLine.h"
 #include "SimilarTags.h"
 #include "commands/Commands.h"
 #include "output/StandardStreams.h"
@@ -8,7 +9,6 @@
 
 #include <memory>
 
-#include <CLI/CLI.hpp>
 #include <fmt/format.h>
 
 namespace qvct::tool {
@@ -153,48 +153,47 @@ void exportTaxonomy(const Options& options, ToolContext& /*context*/) {
 }
 
 template <typename Run>
-void callback(CLI::App* command, const std::shared_ptr<Options>& options, ToolContext& context, Run run) {
-    command->callback([options, &context, run] { run(*options, context); });
+void callback(Command command, const std::shared_ptr<Options>& options, ToolContext& context, Run run) {
+    command.callback([options, &context, run] { run(*options, context); });
 }
 
 }  // namespace
 
-void addTaxonomyCommand(CLI::App& app, ToolContext& context) {
+void addTaxonomyCommand(Command& tool, ToolContext& context) {
     const auto options = std::make_shared<Options>();
-    auto* taxonomy = app.add_subcommand("taxonomy", "Shows, searches and exports the tags that there are");
-    taxonomy->require_subcommand(0, 1);
-    taxonomy->callback([taxonomy, options, &context] {
-        if (taxonomy->get_subcommands().empty()) show(*options, context);
+    Command taxonomy = tool.addCommand("taxonomy", "Shows, searches and exports the tags that there are");
+    taxonomy.allowOneCommand();
+    taxonomy.callback([taxonomy, options, &context] {
+        if (!taxonomy.isCommandNamed()) show(*options, context);
     });
-    taxonomy->footer("Example:\n  qvtag taxonomy show Genres\n  qvtag taxonomy search house");
+    taxonomy.footer("Example:\n  qvtag taxonomy show Genres\n  qvtag taxonomy search house");
 
-    auto* showing = taxonomy->add_subcommand("show", "The tree of tags, whole or of some categories");
-    showing->add_option("categories", options->categories, "Categories, such as Genres")
-        ->type_name("CATEGORY");
-    showing->footer("Example:\n  qvtag taxonomy show Genres \"Sound Descriptors\"");
+    Command showing = taxonomy.addCommand("show", "The tree of tags, whole or of some categories");
+    showing.addOption("categories", options->categories, "Categories, such as Genres").valueName("CATEGORY");
+    showing.footer("Example:\n  qvtag taxonomy show Genres \"Sound Descriptors\"");
     callback(showing, options, context, show);
 
-    auto* finding = taxonomy->add_subcommand("find", "The tag with a label, and what lies below it");
-    finding->add_option("label", options->label, "The label, as it is written")->required();
-    finding->add_option("--category", options->category, "Only in this category");
-    finding->add_option("--parent", options->parent, "Only below the tag with this label");
-    finding->footer("Example:\n  qvtag taxonomy find \"Deep House\" --category Genres");
+    Command finding = taxonomy.addCommand("find", "The tag with a label, and what lies below it");
+    finding.addOption("label", options->label, "The label, as it is written").required();
+    finding.addOption("--category", options->category, "Only in this category");
+    finding.addOption("--parent", options->parent, "Only below the tag with this label");
+    finding.footer("Example:\n  qvtag taxonomy find \"Deep House\" --category Genres");
     callback(finding, options, context, find);
 
-    auto* searching = taxonomy->add_subcommand("search", "The tags whose labels hold a text, in any case");
-    searching->add_option("text", options->text, "Part of a label")->required();
-    searching->footer("Example:\n  qvtag taxonomy search reggae");
+    Command searching = taxonomy.addCommand("search", "The tags whose labels hold a text, in any case");
+    searching.addOption("text", options->text, "Part of a label").required();
+    searching.footer("Example:\n  qvtag taxonomy search reggae");
     callback(searching, options, context, search);
 
-    auto* exporting = taxonomy->add_subcommand("export", "The taxonomy as a file of its own");
+    Command exporting = taxonomy.addCommand("export", "The taxonomy as a file of its own");
     exporting
-        ->add_option("what", options->what, "plist, strings (for translators) or mapping (rows to fill in)")
-        ->required()
-        ->check(CLI::IsMember({"plist", "strings", "mapping"}));
-    exporting->footer("Example:\n  qvtag taxonomy export strings > Tags.strings");
+        .addOption("what", options->what, "plist, strings (for translators) or mapping (rows to fill in)")
+        .required()
+        .oneOf({"plist", "strings", "mapping"});
+    exporting.footer("Example:\n  qvtag taxonomy export strings > Tags.strings");
     callback(exporting, options, context, exportTaxonomy);
 
-    addLegacyTaxonomyCommands(*taxonomy, context);
+    addLegacyTaxonomyCommands(taxonomy, context);
 }
 
 }  // namespace qvct::tool

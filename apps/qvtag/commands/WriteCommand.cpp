@@ -15,7 +15,6 @@
 #include <memory>
 #include <optional>
 
-#include <CLI/CLI.hpp>
 #include <fmt/format.h>
 
 namespace qvct::tool {
@@ -234,28 +233,27 @@ void run(const Options& options, ToolContext& context) {
 
 }  // namespace
 
-void addWriteCommand(CLI::App& app, ToolContext& context) {
+void addWriteCommand(Command& tool, ToolContext& context) {
     const auto options = std::make_shared<Options>();
-    auto* command = app.add_subcommand("write", "Changes the tags and the name that items store");
-    command->add_option("paths", options->paths, "Files and folders")->required()->type_name("PATH");
-    addFollowOption(*command, options->links);
-    command
-        ->add_option("--add", options->add, "Tag to add, or to give another level (0 to 1, or a percentage)")
-        ->type_name("CATEGORY/LABEL[=LEVEL]")
-        ->allow_extra_args(false);
-    command->add_option("--remove", options->remove, "Tag to remove, whatever its level")
-        ->type_name("CATEGORY/LABEL")
-        ->allow_extra_args(false);
-    command->add_option("--name", options->name, "Display name")->type_name("NAME");
-    command->add_flag("--create", options->creates, "Also add tags that the taxonomy does not know");
-    command->add_flag("--dry-run", options->isDryRun, "Show what would change, and write nothing");
-    command->add_flag("--verify", options->verifies,
-                      "Compare audio and all that is not ours before and after, and read the record back");
-    command->add_flag("--keep-times", options->keepsTimes, "Files keep their times of access and change");
-    command->footer(
+    Command command = tool.addCommand("write", "Changes the tags and the name that items store");
+    command.addOption("paths", options->paths, "Files and folders").required().valueName("PATH");
+    command.addFollowFlag(options->links);
+    command.addOption("--add", options->add, "Tag to add, or to give another level (0 to 1, or a percentage)")
+        .valueName("CATEGORY/LABEL[=LEVEL]")
+        .oneWordEach();
+    command.addOption("--remove", options->remove, "Tag to remove, whatever its level")
+        .valueName("CATEGORY/LABEL")
+        .oneWordEach();
+    command.addOption("--name", options->name, "Display name").valueName("NAME");
+    command.addFlag("--create", options->creates, "Also add tags that the taxonomy does not know");
+    command.addFlag("--dry-run", options->isDryRun, "Show what would change, and write nothing");
+    command.addFlag("--verify", options->verifies,
+                    "Compare audio and all that is not ours before and after, and read the record back");
+    command.addFlag("--keep-times", options->keepsTimes, "Files keep their times of access and change");
+    command.footer(
         "The first \"/\" separates category and label: \"Sound Descriptors/Bright / Dark=25%\".\n"
         "Example:\n  qvtag write --add Genres/House --add \"Source/Bass=0.5\" --dry-run Loops");
-    command->callback([options, &context] { run(*options, context); });
+    command.callback([options, &context] { run(*options, context); });
 }
 
 }  // namespace qvct::tool
