@@ -90,7 +90,7 @@ TEST(AudioFiles, WavTellsTempoMeterAndRootNote) {
     EXPECT_STREQ(file.getString(SF_STR_TITLE), "Bassline");
 }
 
-TEST(AudioFiles, SamplerChunksLoopOverTheWholeSound) {
+TEST(AudioFiles, SamplerChunksLoopOverTheWholeSoundAndMarkersKeepTheirFramesAndNames) {
     const TemporaryFolder folder;
     for (const std::string extension : {"wav", "aiff"}) {
         SCOPED_TRACE(extension);
@@ -104,16 +104,6 @@ TEST(AudioFiles, SamplerChunksLoopOverTheWholeSound) {
         EXPECT_EQ(instrument.loops[0].mode, SF_LOOP_FORWARD);
         EXPECT_EQ(instrument.loops[0].start, 0U);
         EXPECT_EQ(instrument.loops[0].end, 10U);
-    }
-}
-
-TEST(AudioFiles, MarkersKeepTheirFramesAndNames) {
-    const TemporaryFolder folder;
-    for (const std::string extension : {"wav", "aiff"}) {
-        SCOPED_TRACE(extension);
-        const std::string path = folder.path("loop." + extension);
-        writeSound(path, loopOfThreeBars());
-        SndfileHandle file(path);
         SF_CUES cues{};
         ASSERT_EQ(file.command(SFC_GET_CUE, &cues, sizeof(cues)), SF_TRUE);
         ASSERT_EQ(cues.cue_count, 2U) << "the two that bound the loop do not count";
