@@ -545,15 +545,34 @@ TEST_F(Indexing, KeepsWhatWasDescribedBeforeAProblem) {
     options.folders = {library()};
     options.database = database();
     options.workers = 2;
-    // Before anybody asks again, one has described the rest, and the other has failed.
-    options.isCancelled = [] {
-        std::this_thread::sleep_for(std::chrono::milliseconds(100));
+    // After the first item, and before the run listens again, one thread describes the rest and the other
+    // fails.
+    static std::atomic<int> described;
+    static std::atomic<bool> isAway;
+    described = 0;
+    isAway = false;
+    struct PausingDescriber : NameDescriber {
+        std::optional<IndexedItem> describe(const std::string& path, Error* error) override {
+            while (described > 0 && !isAway) std::this_thread::yield();
+            auto item = NameDescriber::describe(path, error);
+            ++described;
+            return item;
+        }
+    };
+    const auto untilAllAreDescribed = [](int milliseconds) {
+        while (described < 10) std::this_thread::yield();
+        std::this_thread::sleep_for(std::chrono::milliseconds(milliseconds));
+    };
+    options.isCancelled = [&untilAllAreDescribed] {
+        if (described == 0) return false;
+        isAway = true;
+        untilAllAreDescribed(100);
         return false;
     };
     std::atomic<int> made = 0;
-    const auto factory = [&made]() -> std::unique_ptr<NameDescriber> {
-        if (made++ == 0) return std::make_unique<NameDescriber>();
-        std::this_thread::sleep_for(std::chrono::milliseconds(30));
+    const auto factory = [&]() -> std::unique_ptr<NameDescriber> {
+        if (made++ == 0) return std::make_unique<PausingDescriber>();
+        untilAllAreDescribed(30);
         throw std::runtime_error("out of luck");
     };
     EXPECT_FALSE(indexLibrary(options, factory));
