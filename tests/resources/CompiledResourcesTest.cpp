@@ -1,10 +1,8 @@
-#include "platform/base/Log.h"
 #include "resources/EmbeddedFiles.h"
 #include "resources/QVCTCompiledResources.h"
+#include "support/CapturedLog.h"
 #include "support/Places.h"
-
-#include <fstream>
-#include <iterator>
+#include "support/TemporaryFolder.h"
 
 #include <gmock/gmock.h>
 
@@ -26,21 +24,16 @@ TEST(CompiledResources, HoldTheFilesToTheByte) {
         {"QVSearchKit.js", QVSearchKit_js, QVSearchKit_js_len},
     };
     for (const auto& c : cases) {
-        std::ifstream file(std::string(QVCT_SOURCE "/src/resources/data/") + c.file, std::ios::binary);
-        const std::string wanted((std::istreambuf_iterator<char>(file)), {});
-        EXPECT_EQ(std::string(reinterpret_cast<const char*>(c.bytes), c.length), wanted) << c.file;
+        EXPECT_EQ(std::string(reinterpret_cast<const char*>(c.bytes), c.length),
+                  test::readAll(std::string(QVCT_SOURCE "/src/resources/data/") + c.file));
     }
 }
 
 TEST(CompiledResources, ConvertByKind) {
     using R = QVCTCompiledResources;
-    std::vector<std::string> lines;
-    const LogHandler before =
-        setLogHandler([&lines](std::string_view message) { lines.emplace_back(message); });
+    const test::CapturedLog log;
     EXPECT_EQ(R::compiledResourceWithData({}, R::kText).index(), 0U);
-    setLogHandler(before);
-    EXPECT_THAT(lines, testing::ElementsAre("No data"));
-
+    EXPECT_THAT(log.messages(), testing::ElementsAre("No data"));
     const auto text = R::compiledResourceWithData(bytesOf("a\r\nb\n"), R::kTextLines);
     EXPECT_EQ(std::get<R::Lines>(text), (R::Lines{"a\r", "b", ""}));
     EXPECT_EQ(R::compiledResourceWithData(bytesOf("a"), 3).index(), 0U);

@@ -80,50 +80,34 @@ TEST(DefaultTaxonomy, HoldsItsCategoriesInOrderEachWithItsTags) {
 }
 
 TEST(DefaultTaxonomy, KnowsEveryLabelThatTheCodeNames) {
-    struct {
-        std::string_view category, parent, label;
-    } const rows[] = {
-        {"Content Type", "", QVTagPatch},
-        {"Content Type", QVTagPatch, QVTagAudioPatch},
-        {"Content Type", QVTagPatch, QVTagAuxPatch},
-        {"Content Type", QVTagPatch, QVTagOutputPatch},
-        {"Content Type", QVTagPatch, QVTagInstrumentPatch},
-        {"Content Type", "", QVTagTavioLoop},
-        {"Content Type", "", QVTagVorthalSetting},
-        {"Content Type", "", QVTagSXV},
-        {"Content Type", "", QVTagPST},
-        {"Content Type", "", QVTagCST},
-        {"Content Type", "", QVTagProject},
-        {"Content Type", QVTagProject, QVTagDemoSong},
-        {"Content Type", QVTagProject, QVTagLiveLoopGrid},
-        {"Content Type", QVTagProject, QVTagRemixSession},
-        {"Loop Specifics", QVTagTimeSignature, "6/8"},
-        {"Loop Specifics", QVTagKeyType, QVTagAnyKeyType},
-        {"Loop Specifics", QVTagKeyType, QVTagMinorKeyType},
-        {"Loop Specifics", QVTagKeyType, QVTagMajorKeyType},
-        {"Loop Specifics", QVTagKeyType, QVTagNeitherKeyType},
-        {"Loop Specifics", QVTagKeyType, QVTagBothKeyType},
-        {"Loop Specifics", QVTagKey, QVTagCKey},
-        {"Loop Specifics", QVTagKey, QVTagCSharpKey},
-        {"Loop Specifics", QVTagKey, QVTagDKey},
-        {"Loop Specifics", QVTagKey, QVTagDSharpKey},
-        {"Loop Specifics", QVTagKey, QVTagEKey},
-        {"Loop Specifics", QVTagKey, QVTagFKey},
-        {"Loop Specifics", QVTagKey, QVTagFSharpKey},
-        {"Loop Specifics", QVTagKey, QVTagGKey},
-        {"Loop Specifics", QVTagKey, QVTagGSharpKey},
-        {"Loop Specifics", QVTagKey, QVTagAKey},
-        {"Loop Specifics", QVTagKey, QVTagASharpKey},
-        {"Loop Specifics", QVTagKey, QVTagBKey},
-        {"Sound Descriptors", "Simple / Complex", "Rhythmic Density"},
-        {"Sound Descriptors", "Simple / Complex", "Rhythmic Complexity"},
-        {"System", "", "User generated"},
-        {"PlugIns", "", "Software Instrument"},
+    const struct {
+        std::string_view category, parent;
+        std::vector<std::string_view> labels;
+    } rows[] = {
+        {"Content Type",
+         "",
+         {QVTagPatch, QVTagTavioLoop, QVTagVorthalSetting, QVTagSXV, QVTagPST, QVTagCST, QVTagProject}},
+        {"Content Type",
+         QVTagPatch,
+         {QVTagAudioPatch, QVTagAuxPatch, QVTagOutputPatch, QVTagInstrumentPatch}},
+        {"Content Type", QVTagProject, {QVTagDemoSong, QVTagLiveLoopGrid, QVTagRemixSession}},
+        {"Loop Specifics", QVTagTimeSignature, {"6/8"}},
+        {"Loop Specifics",
+         QVTagKeyType,
+         {QVTagAnyKeyType, QVTagMinorKeyType, QVTagMajorKeyType, QVTagNeitherKeyType, QVTagBothKeyType}},
+        {"Loop Specifics",
+         QVTagKey,
+         {QVTagCKey, QVTagCSharpKey, QVTagDKey, QVTagDSharpKey, QVTagEKey, QVTagFKey, QVTagFSharpKey,
+          QVTagGKey, QVTagGSharpKey, QVTagAKey, QVTagASharpKey, QVTagBKey}},
+        {"Sound Descriptors", "Simple / Complex", {"Rhythmic Density", "Rhythmic Complexity"}},
+        {"System", "", {"User generated"}},
+        {"PlugIns", "", {"Software Instrument"}},
     };
-    for (const auto& row : rows) {
-        const auto parent =
-            row.parent.empty() ? TGRTTaxonomy::OptionalLabel() : TGRTTaxonomy::OptionalLabel(row.parent);
-        EXPECT_NE(taxonomy()->findTagForLabel(row.label, parent, row.category), nullptr) << row.label;
+    for (const auto& [category, parent, labels] : rows) {
+        const auto below =
+            parent.empty() ? TGRTTaxonomy::OptionalLabel() : TGRTTaxonomy::OptionalLabel(parent);
+        for (const std::string_view label : labels)
+            EXPECT_NE(taxonomy()->findTagForLabel(label, below, category), nullptr) << label;
     }
 }
 
@@ -171,54 +155,6 @@ TEST(Rules, AreSeventeenExpressionsThenFiveScriptsWithKnownTags) {
                           "Polyphonic", "Arpeggiated", "Arpeggiated", "Physical Modelling"));
     EXPECT_THAT(unknown(tags), IsEmpty());
     EXPECT_THAT(unknown({"Swing", "Progress", "Triplet"}), IsEmpty());
-}
-
-struct Table {
-    const char* name;
-    std::vector<std::string> lines;
-    std::shared_ptr<TGRTTaxonomy> legacy;
-    std::map<std::string, std::size_t> rowsByType;
-};
-
-std::vector<Table> mappingTables() {
-    return {{"loop",
-             *QVCTCompiledResources::LegacyLoopTaxonomyMapping(),
-             TGRTTaxonomy::legacyLoopTaxonomy(),
-             {{"LoopDescriptors", 18}, {"LoopGenres", 27}, {"LoopInstrumentTypes", 93}}},
-            {"synth",
-             *QVCTCompiledResources::LegacyVorthalTaxonomyMapping(),
-             TGRTTaxonomy::legacyVorthalTaxonomy(),
-             {{"VorthalArticulation", 23},
-              {"VorthalCategory", 111},
-              {"VorthalGenre", 18},
-              {"VorthalTimbre", 21},
-              {"VorthalVersion", 2}}}};
-}
-
-TEST(MappingTables, HaveTheirRowsAndEveryRowALegacyTagAndKnownLabels) {
-    for (const Table& table : mappingTables()) {
-        EXPECT_EQ(table.lines[0],
-                  "Type;Legacy Keyword;Legacy Keyword Sub;New Taxonomy Keyword 1;New Taxonomy Keyword 2;"
-                  "New Taxonomy Keyword 3;New Taxonomy Keyword 4;Comments, Questions");
-        std::map<std::string, std::size_t> rows;
-        std::set<std::string> keys;
-        std::vector<std::string> newLabels;
-        for (std::size_t i = 1; i < table.lines.size(); ++i) {
-            if (table.lines[i].empty()) continue;
-            const auto fields = split(table.lines[i], ";");
-            ASSERT_EQ(fields.size(), 8U) << table.lines[i];
-            ++rows[fields[0]];
-            EXPECT_TRUE(keys.insert(fields[0] + ";" + fields[1] + ";" + fields[2]).second) << table.lines[i];
-            const auto tag = fields[2].empty()
-                                 ? table.legacy->findTagForLabel(fields[1], fields[0])
-                                 : table.legacy->findTagForLabel(fields[2], fields[1], fields[0]);
-            EXPECT_NE(tag, nullptr) << table.lines[i];
-            newLabels.insert(newLabels.end(), fields.begin() + 3, fields.begin() + 7);
-        }
-        EXPECT_EQ(rows, table.rowsByType) << table.name;
-        EXPECT_EQ(table.legacy->allTags().size(), keys.size()) << table.name;
-        EXPECT_THAT(unknown(newLabels), IsEmpty()) << table.name;
-    }
 }
 
 TEST(PackDisplayNames, NameEveryContentPackAndNothingElse) {

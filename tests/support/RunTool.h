@@ -4,8 +4,6 @@
 #include "support/TemporaryFolder.h"
 
 #include <cstdio>
-#include <fstream>
-#include <iterator>
 #include <string>
 #include <vector>
 
@@ -21,11 +19,6 @@ struct ToolResult {
 
     nlohmann::json json() const { return nlohmann::json::parse(output); }
 };
-
-inline std::string readAll(const std::string& path) {
-    std::ifstream file(path, std::ios::binary);
-    return {std::istreambuf_iterator<char>(file), {}};
-}
 
 inline std::string quoted(const std::string& text) {
     std::string result = "'";

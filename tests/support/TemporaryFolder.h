@@ -3,10 +3,17 @@
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
+#include <iterator>
 #include <string>
 #include <string_view>
 
 namespace qvct::test {
+
+/// The bytes of a file; none where there is no such file.
+inline std::string readAll(const std::string& path) {
+    std::ifstream file(path, std::ios::binary);
+    return {std::istreambuf_iterator<char>(file), {}};
+}
 
 /// A folder of its own for one test, removed with all that is in it.
 class TemporaryFolder {

@@ -1,6 +1,5 @@
 #include "platform/data/PropertyListFile.h"
 #include "platform/data/UserDefaults.h"
-#include "platform/files/ResourceBundle.h"
 #include "support/TemporaryFolder.h"
 #include "taxonomy/TGRTTaxonomy.h"
 #include "taxonomy/TGRTTaxonomySearching.h"
@@ -197,19 +196,6 @@ TEST(Taxonomy, SharesCachedInstancesUntilTheyAreEvicted) {
     EXPECT_TRUE(TGRTTaxonomy::newTaxonomyOfType(7, false, false)->categories().empty());
 }
 
-TEST(Taxonomy, AResourceFileWinsOverTheCompiledCopy) {
-    const test::TemporaryFolder folder;
-    folder.write("DefaultTaxonomy.plist",
-                 serializePropertyList(
-                     Dictionary{{"categories", Dictionary{{"Own", Dictionary{{"Tag", Dictionary{}}}}}}},
-                     PropertyListFormat::xml));
-    ResourceBundle::setDirectory(folder.path());
-    const auto own = TGRTTaxonomy::testingTaxonomy();
-    ResourceBundle::setDirectory("");
-    EXPECT_THAT(labels(own->allTags()), ElementsAre("Tag"));
-    EXPECT_GT(TGRTTaxonomy::testingTaxonomy()->allTags().size(), 500U);
-}
-
 TEST(Taxonomy, ReadOnlyRefusesButForContentPacks) {
     const auto taxonomy = TGRTTaxonomy::newTaxonomyOfType(kDefaultTaxonomy, true, false);
     EXPECT_EQ(taxonomy->findOrCreateTagWithLabel("New", "House", "Genres"), nullptr);
@@ -219,15 +205,6 @@ TEST(Taxonomy, ReadOnlyRefusesButForContentPacks) {
     ASSERT_NE(pack, nullptr);
     EXPECT_EQ(taxonomy->findTagForLabel("9999_new"), pack);
     EXPECT_TRUE(taxonomy->doesContainTag(pack));
-}
-
-TEST(Taxonomy, FindsByParent) {
-    const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
-    EXPECT_NE(taxonomy->findTagForLabel("Deep House", "House", "Genres"), nullptr);
-    EXPECT_EQ(taxonomy->findTagForLabel("Deep House", "Techno", "Genres"), nullptr);
-    EXPECT_EQ(taxonomy->findTagForLabel("Deep House", "Source"), nullptr);
-    EXPECT_EQ(taxonomy->findTagForLabel("deep house"), nullptr);
-    EXPECT_EQ(taxonomy->findTagForLabel("Bright / Dark-+"), nullptr);
 }
 
 TEST(Tag, TakesOverAChildNamedByAReferenceIntoTheOldList) {
