@@ -1,6 +1,7 @@
 #include "support/AudioFixtures.h"
 #include "support/RunTool.h"
 
+#include <algorithm>
 #include <filesystem>
 #include <set>
 
@@ -66,14 +67,11 @@ TEST_F(LibraryCommands, IndexAndFind) {
                 testing::UnorderedElementsAre("House Snare", "Deep House Bass"));
     const json found = run({"search", "dark"}).json();
     ASSERT_EQ(found.size(), 1U);
-    bool hasKick = false;
-    for (const json& tagging : found[0]["taggings"]) {
-        if (tagging["label"] != "Kick") continue;
-        hasKick = true;
-        EXPECT_EQ(tagging["provenance"], "automatic");
-        EXPECT_EQ(tagging["service"], "keywords");
-    }
-    EXPECT_TRUE(hasKick);
+    const auto kick = std::find_if(found[0]["taggings"].begin(), found[0]["taggings"].end(),
+                                   [](const json& tagging) { return tagging["label"] == "Kick"; });
+    ASSERT_NE(kick, found[0]["taggings"].end());
+    EXPECT_EQ((*kick)["provenance"], "automatic");
+    EXPECT_EQ((*kick)["service"], "keywords");
     EXPECT_EQ(run({"search", "", "--limit", "2"}).json().size(), 2U);
 }
 
@@ -96,37 +94,19 @@ TEST_F(LibraryCommands, ShowTheNameOfTheFileAndItsTitle) {
 
 TEST_F(LibraryCommands, KnowItemsAgainThatWereMovedAndTagged) {
     index();
-    const auto idOf = [this](const std::string& query) {
-        const json found = run({"search", query}).json();
-        return found.size() == 1 ? found[0]["id"].get<int>() : -1;
-    };
-    const int kick = idOf("dark");
-    const int snare = idOf("snare");
-    const int bass = idOf("bass");
-    const int pad = idOf("name:pad");
-    const std::string sounds = folder_.path("sounds");
-    std::filesystem::create_directories(sounds + "/New");
-    std::filesystem::rename(sounds + "/Drums/Dark Kick 01.wav", sounds + "/New/Thump.wav");
-    const auto write = [](const std::string& path) {
-        EXPECT_EQ(runTool({"write", "--add", "Genres/Jazz", path}).status, 0);
-    };
-    write(sounds + "/New/Thump.wav");
-    write(sounds + "/Drums/House Snare.wav");
-    write(sounds + "/Pads/Deep House Bass.caf");
-    std::filesystem::rename(sounds + "/Pads", sounds + "/Warm");
-    write(sounds + "/Warm/Warm Pad.cst");
+    const json kick = run({"search", "dark"}).json()[0];
+    const std::string moved = folder_.path("sounds/New/Thump.wav");
+    std::filesystem::create_directories(folder_.path("sounds/New"));
+    std::filesystem::rename(folder_.path("sounds/Drums/Dark Kick 01.wav"), moved);
+    EXPECT_EQ(runTool({"write", "--add", "Genres/Jazz", moved}).status, 0);
     settle();
     const json again = index({"--prune"}).json();
-    EXPECT_EQ(again["indexed"], 4);
-    EXPECT_EQ(again["moved"], 3);
+    EXPECT_EQ(again["indexed"], 1);
+    EXPECT_EQ(again["moved"], 1);
     EXPECT_EQ(again["pruned"], 0);
-    EXPECT_EQ(idOf("thump genre:jazz"), kick);
-    EXPECT_EQ(idOf("snare genre:jazz"), snare);
-    EXPECT_EQ(idOf("bass genre:jazz"), bass);
-    EXPECT_EQ(idOf("name:pad genre:jazz"), pad);
-    const json thump = run({"search", "thump"}).json()[0];
-    EXPECT_EQ(thump["earlierPaths"], json({sounds + "/Drums/Dark Kick 01.wav"}));
-    EXPECT_EQ(names("").size(), 5U);
+    const json thump = run({"search", "thump genre:jazz"}).json()[0];
+    EXPECT_EQ(thump["id"], kick["id"]);
+    EXPECT_EQ(thump["earlierPaths"], json({kick["path"]}));
     EXPECT_EQ(runTool({"db", "check", folder_.path("db")}).status, 0);
 }
 
@@ -141,26 +121,8 @@ TEST_F(LibraryCommands, TagByTheNamedServicesAndTakeTheFoldersBehind) {
             services.insert(tagging["service"].is_null() ? tagging["provenance"] : tagging["service"]);
     }
     EXPECT_THAT(services, ElementsAre("content-type", "user"));
-    const ToolResult wrong = index({"--services", "keywords,magic"});
-    EXPECT_EQ(wrong.status, 2);
-    EXPECT_THAT(wrong.errors, HasSubstr("no service \"magic\""));
-}
-
-TEST_F(LibraryCommands, WalkFoldersThatLinkToEachOtherOnce) {
-    const std::vector<std::string> folders = {"a", "b", "c", "d", "e"};
-    for (const std::string& a : folders) {
-        folder_.write("linked/" + a + "/Kick.wav", Wav().file(Wav().format() + Wav().data()));
-        for (const std::string& b : folders) {
-            if (a != b)
-                std::filesystem::create_directory_symlink("../" + b, folder_.path("linked/" + a + "/" + b));
-        }
-    }
-    std::vector<std::string> paths;
-    for (const json& item : runTool({"autotag", "--json", folder_.path("linked")}).json())
-        paths.push_back(item["path"]);
-    std::vector<std::string> expected;
-    for (const std::string& a : folders) expected.push_back(folder_.path("linked/" + a + "/Kick.wav"));
-    EXPECT_EQ(paths, expected);
+    EXPECT_EQ(index({"--services", "keywords,magic"}).status, 2);
+    EXPECT_EQ(index({"--services", "content-type,user"}).json()["unchanged"], 5);
 }
 
 TEST_F(LibraryCommands, ReadAgainWhenOtherServicesOrResourcesDescribe) {

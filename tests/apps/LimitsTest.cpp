@@ -3,8 +3,8 @@
 #include "demo/Library.h"
 #include "support/Places.h"
 #include "support/TemporaryFolder.h"
+#include "support/Texts.h"
 
-#include <algorithm>
 #include <filesystem>
 
 #include <fcntl.h>
@@ -90,19 +90,6 @@ std::size_t expectWithinLimits(const fs::path& folder, const Commands& commands 
         }
     }
     return items.size();
-}
-
-/// So many times `piece`, with its number where it says "#".
-std::string repeated(int count, std::string_view piece) {
-    std::string text;
-    const std::size_t place = std::min(piece.find('#'), piece.size());
-    for (int i = 0; i < count; ++i) {
-        text += piece.substr(0, place);
-        if (place == piece.size()) continue;
-        text += std::to_string(i);
-        text += piece.substr(place + 1);
-    }
-    return text;
 }
 
 /// Patches whose descriptions and records make libraries compare everything with everything, or multiply.

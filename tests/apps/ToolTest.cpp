@@ -30,20 +30,6 @@ std::set<std::string> labels(const json& item) {
     return result;
 }
 
-TEST(Autotag, WalksFoldersButNotBundles) {
-    const TemporaryFolder folder;
-    for (const char* name :
-         {"b/Kick.wav", "a/Warm Pad.patch/inside.caf", "a/Bass.cst", "a/Bass.cst.plist", "a/Bass.cst.caf",
-          "a/notes.txt", "a/.hidden.wav", "a/._Kick.wav", "c/UPPER.AIFF", "d/file.patch"}) {
-        folder.write(name, "");
-    }
-    std::filesystem::create_directory_symlink(folder.path(), folder.path("b/circle"));
-    const ToolResult result = runTool({"autotag", "--json", folder.path()});
-    EXPECT_EQ(result.status, 0) << result.errors;
-    EXPECT_THAT(names(result.json()), ElementsAre("Bass.cst", "Warm Pad.patch", "Kick.wav", "UPPER.AIFF"));
-    EXPECT_THAT(labels(result.json()[2]), testing::IsSupersetOf({"Kick", "Drums"}));
-}
-
 TEST(Autotag, WritesOneStableRecordAnItem) {
     const TemporaryFolder folder;
     const std::string path = folder.write("Dark Kick.wav", "");

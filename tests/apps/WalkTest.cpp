@@ -69,19 +69,21 @@ void makeSocket(const std::string& path) {
 TEST(Walk, TakesFilesAndBundlesAndNothingElse) {
     const TemporaryFolder folder;
     const std::string sound = Wav().file(Wav().format() + Wav().data());
-    for (const char* name : {"b/z.wav", "a.wav", "c.wav", "b/.hidden.wav", ".hidden/x.wav",
-                             "folder.wav/in.wav", "one.patch/in.wav", "notes.txt"})
+    for (const char* name :
+         {"b/z.wav", "a.wav", "c.wav", "b/.hidden.wav", ".hidden/x.wav", "folder.wav/in.wav",
+          "one.patch/in.wav", "notes.txt", "d.cst", "d.cst.plist", "d.cst.caf", "._a.wav", "E.AIFF"})
         folder.write(name, sound);
     folder.write("file.patch", "no bundle");
     ASSERT_EQ(::mkfifo(folder.path("pipe.wav").c_str(), 0600), 0);
     ASSERT_NO_FATAL_FAILURE(makeSocket(folder.path("socket.wav")));
     fs::create_symlink("/dev/null", folder.path("device.wav"));
     fs::create_symlink("a.wav", folder.path("link.wav"));
+    fs::create_directory_symlink(folder.path(), folder.path("b/circle"));
     const Walks walks(folder.path());
     EXPECT_EQ(walks.status(), 0) << walks.errors()[0] << walks.errors()[1];
     // A folder's items come before what lies in its folders.
-    EXPECT_THAT(walks.paths(),
-                ElementsAre("a.wav", "c.wav", "link.wav", "one.patch", "b/z.wav", "folder.wav/in.wav"));
+    EXPECT_THAT(walks.paths(), ElementsAre("E.AIFF", "a.wav", "c.wav", "d.cst", "link.wav", "one.patch",
+                                           "b/z.wav", "folder.wav/in.wav"));
     const ToolResult named = runTool({"read", folder.path("pipe.wav")});
     EXPECT_EQ(named.status, 1);
     EXPECT_THAT(named.errors, HasSubstr("pipe.wav: neither a file nor a folder"));

@@ -1,7 +1,7 @@
 #include "autotagging/keywords/KeywordExpression.h"
 #include "autotagging/keywords/QVCTKeywordExtractor.h"
 #include "autotagging/services/QVCTFilenameKeywordExtractorTaggingService.h"
-#include "platform/base/Log.h"
+#include "support/CapturedLog.h"
 #include "support/Corpus.h"
 #include "support/OneByOneExtractor.h"
 #include "support/PathGenerator.h"
@@ -80,15 +80,13 @@ TEST(KeywordExtraction, FollowsATaxonomyThatGrows) {
 }
 
 TEST(KeywordExtraction, LogsABrokenKeywordOnEveryAttemptAndGoesOn) {
-    std::vector<std::string> lines;
-    const LogHandler before =
-        setLogHandler([&lines](std::string_view message) { lines.emplace_back(message); });
+    const test::CapturedLog log;
     const auto extractor = QVCTKeywordExtractor::initWithKeywordMappingDictionary(
         Dictionary{{"(open", "Synth"}, {"kick", "Kick"}}, smallTaxonomy());
     for (int i = 0; i < 2; ++i)
         EXPECT_THAT(texts(extractor->extractKeywordsFromString("kick")), Contains("Kick"));
-    setLogHandler(before);
-    EXPECT_THAT(lines, ElementsAre("Error when evalating regex: (open", "Error when evalating regex: (open"));
+    EXPECT_THAT(log.messages(),
+                ElementsAre("Error when evalating regex: (open", "Error when evalating regex: (open"));
 }
 
 TEST(KeywordExtraction, GivesUpAnExpressionThatBacktracksWithoutEnd) {

@@ -244,35 +244,33 @@ TEST(Script, CatastrophicExpressionsAreStoppedWhateverCallsThem) {
 TEST(Script, CannotForgeExpressionsThatTheGuardLooksAt) {
     const Limits limits({milliseconds(200), std::size_t{256} << 20});
     const std::string begin = "var r = /a*a*a*a*a*a*b/, t = 'a'.repeat(300), p = RegExp.prototype; ";
-    for (const std::string& attack :
-         {std::string("r.exec = null; r.test(t)"),
-          std::string("delete p.exec; r.test(t)"),
-          std::string("p.exec = null; r.test(t)"),
-          std::string("r.__defineGetter__('exec', () => null); r.test(t)"),
-          std::string("Object.defineProperty(r, 'exec', {value: null}); r.test(t)"),
-          std::string("Object.defineProperty(r, 'source', {value: 'a'}); r.test(t)"),
-          std::string("Object.defineProperty(p, 'source', {value: 'a'}); r.test(t)"),
-          std::string("Object.defineProperty(p, 'source', {get() { return 'a' }}); t.replace(r, '')"),
-          std::string("Object.defineProperty(r, 'flags', {value: 'v'}); t.match(r)"),
-          std::string("class R extends RegExp { exec = null; get source() { return 'a' } } new R(r).test(t)"),
-          std::string("var test = p.test; Object.setPrototypeOf(r, null); test.call(r, t)"),
-          std::string("var f = p[Symbol.replace]; Object.setPrototypeOf(r, null); f.call(r, t, '')"),
-          std::string(
-              "r.constructor = {[Symbol.species]: function () { var c = /a*a*a*a*a*a*b/y; c.exec = null; "
-              "return c }}; t.split(r)"),
-          std::string(
-              "Object.defineProperty(r, 'constructor', {value: {[Symbol.species]: RegExp}}); t.split(r)"),
-          std::string("r.lastIndex = 300; r.test(t)"),
-          std::string("var n = 0; r = /a*a*a*a*a*a*b/g; r.lastIndex = {valueOf() { return n++ ? 0 : 300 }}; "
-                      "r.test(t)"),
-          std::string("r.exec = null; p.test.call(new Proxy(r, {}), t)"),
-          std::string("r.exec = null; Array.prototype[Symbol.iterator] = Reflect.apply = null; "
-                      "Function.prototype.call = Function.prototype.apply = null; r.test(t)"),
-          std::string("Object.prototype.get = () => null; r.test(t)"),
-          std::string("r.exec = null; Object.freeze(r); t.search(r)"),
-          std::string("/a/.compile(r.source).test(t)"),
-          std::string("r.exec = null; var deep = () => { try { deep() } catch (e) { r.test(t) } }; deep(); "
-                      "throw 0")}) {
+    for (const char* attack :
+         {"r.exec = null; r.test(t)",
+          "delete p.exec; r.test(t)",
+          "p.exec = null; r.test(t)",
+          "r.__defineGetter__('exec', () => null); r.test(t)",
+          "Object.defineProperty(r, 'exec', {value: null}); r.test(t)",
+          "Object.defineProperty(r, 'source', {value: 'a'}); r.test(t)",
+          "Object.defineProperty(p, 'source', {value: 'a'}); r.test(t)",
+          "Object.defineProperty(p, 'source', {get() { return 'a' }}); t.replace(r, '')",
+          "Object.defineProperty(r, 'flags', {value: 'v'}); t.match(r)",
+          "class R extends RegExp { exec = null; get source() { return 'a' } } new R(r).test(t)",
+          "var test = p.test; Object.setPrototypeOf(r, null); test.call(r, t)",
+          "var f = p[Symbol.replace]; Object.setPrototypeOf(r, null); f.call(r, t, '')",
+          "r.constructor = {[Symbol.species]: function () { var c = /a*a*a*a*a*a*b/y; c.exec = null; "
+          "return c }}; t.split(r)",
+          "Object.defineProperty(r, 'constructor', {value: {[Symbol.species]: RegExp}}); t.split(r)",
+          "r.lastIndex = 300; r.test(t)",
+          "var n = 0; r = /a*a*a*a*a*a*b/g; r.lastIndex = {valueOf() { return n++ ? 0 : 300 }}; "
+          "r.test(t)",
+          "r.exec = null; p.test.call(new Proxy(r, {}), t)",
+          "r.exec = null; Array.prototype[Symbol.iterator] = Reflect.apply = null; "
+          "Function.prototype.call = Function.prototype.apply = null; r.test(t)",
+          "Object.prototype.get = () => null; r.test(t)",
+          "r.exec = null; Object.freeze(r); t.search(r)",
+          "/a/.compile(r.source).test(t)",
+          "r.exec = null; var deep = () => { try { deep() } catch (e) { r.test(t) } }; deep(); "
+          "throw 0"}) {
         const test::CapturedLog log;
         const auto start = std::chrono::steady_clock::now();
         EXPECT_EQ(resultOfMain(begin + attack + "; return [1]"), "nil") << attack;

@@ -2,9 +2,9 @@
 #include "autotagging/xml/QVCTXMLParser.h"
 #include "autotagging/xml/XPathExpression.h"
 #include "platform/data/Json.h"
-#include "platform/text/Text.h"
 #include "support/CapturedLog.h"
 #include "support/TemporaryFolder.h"
+#include "support/Texts.h"
 
 #include <chrono>
 
@@ -14,6 +14,7 @@
 namespace qvct {
 namespace {
 
+using test::repeated;
 using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
@@ -72,8 +73,7 @@ TEST(XmlToDictionaries, KeepsItsShapeAndQuirks) {
 }
 
 TEST(XmlToDictionaries, ManyDifferentChildrenTakeNoQuadraticTime) {
-    std::string xml = "<a>";
-    for (int i = 0; i < 200000; ++i) xml += "<c" + std::to_string(i) + "/>";
+    const std::string xml = "<a>" + repeated(200000, "<c#/>");
     const auto start = std::chrono::steady_clock::now();
     const auto dictionary = QVCTXMLParser::dictionaryForXMLData(xml + "<c7/></a>");
     EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(20));
@@ -129,10 +129,8 @@ TEST(XmlDocument, RecoversWhatMakesSense) {
 }
 
 TEST(XmlDocument, DamagedFilesDoNotFloodTheLog) {
-    std::string xml = "<a>";
-    for (int i = 0; i < 1000; ++i) xml += "<b c='1' c='2'/>";
     const test::CapturedLog log;
-    document(xml + "</a>");
+    document("<a>" + repeated(1000, "<b c='1' c='2'/>") + "</a>");
     EXPECT_LE(log.messages().size(), 6U);
 }
 
@@ -153,16 +151,14 @@ TEST(XmlDocument, NodesAndJson) {
 }
 
 TEST(XmlDocument, JsonOfTheTreeIsThatOfItsText) {
-    for (const std::string& xml :
-         {std::string("<a b='1' c=\"2&quot;'&#10;&#13;&amp;\"> x <!-- c "
-                      "--><b>y</b><?pi?>z<![CDATA[]]]]><![CDATA[>&]]></a>"),
-          std::string("<p:a xmlns:p='u' xmlns='v' p:b='1' xml:lang='de'><p:c xmlns:q='w' q:b='2' b='3'/><c/> "
-                      "<c/></p:a>"),
-          std::string("<q:a q:b='1'><q:b/></q:a>"), std::string("<a>&#13;&#x1F3B5;\t<text>1</text>2</a>"),
-          std::string("<a b='1'><b/><b/></a>"), std::string("<a xmlns=''><b xmlns=''/></a>"),
-          std::string("<?xml version='1.0' encoding='ISO-8859-1'?><a b='\xe9'>\xe9</a>"),
-          std::string("<!DOCTYPE a [<!ATTLIST a b CDATA 'd'><!ENTITY e 'x'>]><a>&e;</a>"),
-          std::string("<a><b c='1' c='2'/>")}) {
+    for (const char* xml :
+         {"<a b='1' c=\"2&quot;'&#10;&#13;&amp;\"> x <!-- c "
+          "--><b>y</b><?pi?>z<![CDATA[]]]]><![CDATA[>&]]></a>",
+          "<p:a xmlns:p='u' xmlns='v' p:b='1' xml:lang='de'><p:c xmlns:q='w' q:b='2' b='3'/><c/> "
+          "<c/></p:a>",
+          "<q:a q:b='1'><q:b/></q:a>", "<a>&#13;&#x1F3B5;\t<text>1</text>2</a>", "<a b='1'><b/><b/></a>",
+          "<a xmlns=''><b xmlns=''/></a>", "<?xml version='1.0' encoding='ISO-8859-1'?><a b='\xe9'>\xe9</a>",
+          "<!DOCTYPE a [<!ATTLIST a b CDATA 'd'><!ENTITY e 'x'>]><a>&e;</a>", "<a><b c='1' c='2'/>"}) {
         const test::CapturedLog log;
         const auto parsed = document(xml);
         EXPECT_EQ(parsed->JSONString(), QVCTXMLDocument::JSONStringWithData(parsed->XMLData())) << xml;
@@ -191,32 +187,24 @@ TEST(XmlDocument, HostileExpressionsEnd) {
     EXPECT_EQ(XPathExpression::compile(deep, &error), nullptr);
     EXPECT_TRUE(error.isSet());
     EXPECT_EQ(XPathExpression::compile(std::string(70000, 'a')), nullptr);
-    std::string wide = "<a>";
-    for (int i = 0; i < 5000; ++i) wide += "<b/>";
+    const std::string wide = "<a>" + repeated(5000, "<b/>") + "</a>";
     const auto start = std::chrono::steady_clock::now();
-    EXPECT_FALSE(document(wide + "</a>")->isMatchingXPath("//*[//*[//*[contains(@x,'1')]]]"));
+    EXPECT_FALSE(document(wide)->isMatchingXPath("//*[//*[//*[contains(@x,'1')]]]"));
     EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(30));
     EXPECT_EQ(log.messages().size(), 1U);
 }
 
 TEST(XmlDocument, HostileEntitiesAndNestingEnd) {
     const test::CapturedLog log;
-    std::string bomb = "<!DOCTYPE l [<!ENTITY a 'aaaaaaaaaaaaaaaaaaaaaaaaaaaaaaaa'>";
-    for (char c = 'b'; c < 'l'; ++c) {
-        bomb += std::string("<!ENTITY ") + c + " '";
-        for (int i = 0; i < 16; ++i) bomb += std::string("&") + static_cast<char>(c - 1) + ";";
-        bomb += "'>";
-    }
-    for (const char* body : {"]><Patch><c>&k;</c></Patch>", "]><Patch name='&k;'><c/></Patch>"}) {
+    for (const char* body : {"<Patch><c>&k;</c></Patch>", "<Patch name='&k;'><c/></Patch>"}) {
         const auto start = std::chrono::steady_clock::now();
-        const auto xml = document(bomb + body);
+        const auto xml = document(test::entityBomb() + body);
         EXPECT_FALSE(xml->isMatchingXPath("/Patch[string-length(.)>100000 or string-length(@name)>100000]"));
         EXPECT_FALSE(xml->isMatchingXPath("/Patch[contains(@name,'aaa')]"));
         EXPECT_LT(xml->JSONString().value_or("").size(), 100000U);
         EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(10));
     }
-    std::string deep;
-    for (int i = 0; i < 10000; ++i) deep += "<a>";
+    const std::string deep = repeated(10000, "<a>");
     EXPECT_TRUE(document(deep)->isMatchingXPath("/a/a/a"));
     EXPECT_TRUE(document(deep)->JSONString().has_value());
 }
@@ -243,49 +231,17 @@ TEST(LocationPath, SelectsTheNodeThatTheLibrarySelects) {
         "<C m=\"it's\" v='' w='1e3'><D v='2' k='b'/><D v='2' k='b' l='1'/></C></P>";
     const auto plain = document(text);
     const auto withEntities = document("<!DOCTYPE P [<!ENTITY e 'x'>]>" + replaceAll(text, "&amp;", "&e;"));
-    const char* const expressions[] = {"/P",
-                                       "/Q",
-                                       "/P/C",
-                                       "/P/C[1]",
-                                       "/P/C[2]",
-                                       "/P/C[3]",
-                                       "/P/C[4]",
-                                       "/P/C/D[2]",
-                                       "(/P/C/D)[4]",
-                                       "(/P/C/D)[6]",
-                                       " ( / P / C [ @m = 'Stereo' ] ) [ 1 ] ",
-                                       "/P/C[@m='Mono']",
-                                       "/P/C[@m!='Mono']",
-                                       "/P/C[@x!='Mono']",
-                                       "/P/C[@m=\"it's\"]",
-                                       "/P/C[@v=1]",
-                                       "/P/C[@v>1]",
-                                       "/P/C[@v<1]",
-                                       "/P/C[@v!=1]",
-                                       "/P/C[@w=7]",
-                                       "/P/C[@w>=1000]",
-                                       "/P/C[@w<=7]",
-                                       "/P/C/D[@v<0]",
-                                       "/P/C/D[@v>=2][2]",
-                                       "/P/C/D[2][@v>=2]",
-                                       "/P/C/D[@k][@l]",
-                                       "/P/C/D[@k and @l]",
-                                       "/P/C/D[@k='zz' or @l=1]",
-                                       "/P/C/D[@k='zz' or @l=1 and @v=3]",
-                                       "/P/C/D[(@k='b' or @l) and @v=2][2]",
-                                       "/P/C[contains(@m,'ere')]",
-                                       "/P/C[contains(@zz,'')]",
-                                       "/P/C[contains(@zz,'a')]",
-                                       "/P/C[starts-with(@n,'ab')]",
-                                       "/P/C[starts-with(@n,'b')]",
-                                       "/P/C/D[contains(@k,'rth')]",
-                                       "/P/C/D[@k='Vorthal & more']",
-                                       "/P[@m='']",
-                                       "/P[@m]",
-                                       "/P[@m=0]",
-                                       "/P/C[@m='Mono'and@v=1]",
-                                       "/P/C/D[@v=2 and contains(@k,'b') and @l>0]"};
-    for (const char* expression : expressions) {
+    const std::string expressions =
+        "/P;/Q;/P/C;/P/C[1];/P/C[2];/P/C[3];/P/C[4];/P/C/D[2];(/P/C/D)[4];(/P/C/D)[6];"
+        " ( / P / C [ @m = 'Stereo' ] ) [ 1 ] ;/P/C[@m='Mono'];/P/C[@m!='Mono'];/P/C[@x!='Mono'];"
+        "/P/C[@m=\"it's\"];/P/C[@v=1];/P/C[@v>1];/P/C[@v<1];/P/C[@v!=1];/P/C[@w=7];/P/C[@w>=1000];"
+        "/P/C[@w<=7];/P/C/D[@v<0];/P/C/D[@v>=2][2];/P/C/D[2][@v>=2];/P/C/D[@k][@l];/P/C/D[@k and @l];"
+        "/P/C/D[@k='zz' or @l=1];/P/C/D[@k='zz' or @l=1 and @v=3];/P/C/D[(@k='b' or @l) and @v=2][2];"
+        "/P/C[contains(@m,'ere')];/P/C[contains(@zz,'')];/P/C[contains(@zz,'a')];"
+        "/P/C[starts-with(@n,'ab')];/P/C[starts-with(@n,'b')];/P/C/D[contains(@k,'rth')];"
+        "/P/C/D[@k='Vorthal & more'];/P[@m=''];/P[@m];/P[@m=0];/P/C[@m='Mono'and@v=1];"
+        "/P/C/D[@v=2 and contains(@k,'b') and @l>0]";
+    for (const std::string& expression : split(expressions, ";")) {
         const auto compiled = XPathExpression::compile(expression);
         ASSERT_NE(compiled, nullptr) << expression;
         EXPECT_TRUE(compiled->isLocationPath()) << expression;
@@ -311,21 +267,13 @@ TEST(LocationPath, LeavesOtherFormsToTheLibrary) {
 
 TEST(XMLDocument, TooLargeForMemoryIsCutShort) {
     const test::CapturedLog log;
-    std::string xml = "<P><first/>";
-    for (int i = 0; i < 340000; ++i) xml += "<a b='' c=''/>";
-    const auto document = QVCTXMLDocument::initWithXMLData(xml + "<last/></P>", "huge.xml");
+    const auto document = QVCTXMLDocument::initWithXMLData(
+        "<P><first/>" + repeated(340000, "<a b='' c=''/>") + "<last/></P>", "huge.xml");
     EXPECT_TRUE(document->isMatchingXPath("/P/first"));
     EXPECT_TRUE(document->isMatchingXPath("/P/a[72999]"));
     EXPECT_FALSE(document->isMatchingXPath("/P/a[73000]"));
     EXPECT_FALSE(document->isMatchingXPath("/P/last"));
     EXPECT_THAT(log.messages(), ElementsAre(HasSubstr("huge.xml: line 1: more than 219000 elements")));
-}
-
-/// Many times `piece`, with its number where it says "#".
-std::string repeated(int count, std::string_view piece) {
-    std::string text;
-    for (int i = 0; i < count; ++i) text += replaceAll(piece, "#", std::to_string(i));
-    return text;
 }
 
 /// Little-endian; a "*" becomes U+3C3C, both bytes of which are those of a "<".
@@ -404,8 +352,7 @@ TEST(XPath, WhatCostsMoreThanItsStepsIsBounded) {
     const std::string entities =
         "<!DOCTYPE P [<!ENTITY e '" + std::string(100000, 'x') + "'>]><P>" + repeated(15000, "&e;") + "</P>";
     const std::string same = "<P>" + repeated(1000, "<a>" + std::string(1000, 'x') + "</a>") + "</P>";
-    const std::string nested =
-        replaceAll(repeated(250, "<a>"), "#", "") + std::string(1 << 20, 'x') + repeated(250, "</a>");
+    const std::string nested = repeated(250, "<a>") + std::string(1 << 20, 'x') + repeated(250, "</a>");
     const char* const steps = "takes too many steps in this document";
     const char* const bytes = "reads too much text in this document";
     const struct {

@@ -9,8 +9,6 @@
 #include "platform/files/FileAccess.h"
 #include "support/AudioFixtures.h"
 
-#include <functional>
-
 #include <gmock/gmock.h>
 
 namespace qvct::test {
@@ -33,63 +31,38 @@ TEST(Errors, NameEachPlaceOnce) {
     std::string pages(bytes->begin(), bytes->end());
     pages[pages.size() / 2] ^= 1;
     folder.write("db", pages);
+    using Fails = void (*)(const std::string& path, Error* error);
+    const Fails readList = [](const auto& path, Error* error) { readDictionaryFile(path, error); };
+    const Fails readXml = [](const auto& path, Error* error) { XmlDocument::fromFile(path, error); };
+    const Fails readPreset = [](const auto& path, Error* error) {
+        TGRTVorthalPresetMetaDataReader::initWithTaxonomy(TGRTTaxonomy::init())
+            ->readMetaDataFromURL(URL::fileURLWithPath(path), 0, error);
+    };
+    const Fails checkScript = [](const auto&, Error* error) { ScriptContext::checkSyntax("1;\n)", error); };
+    const Fails writeWav = [](const auto& path, Error* error) {
+        const auto data = LCFileParser::fileParserForURL(URL::fileURLWithPath(path))->fileData();
+        data->setTaggingDictionary({{"a", 1}});
+        LCFileWriter::fileWriterForURL(URL::fileURLWithPath(path))->writeFileData(data, error);
+    };
+    const Fails replace = [](const auto& path, Error* error) { replaceFile(path, "new", error); };
+    const Fails check = [](const auto& path, Error* error) {
+        const auto database = ContentDatabase::open(path, error);
+        if (database) database->check(error);
+    };
     const struct {
         const char* what;
         std::string path;
         Place line, offset;
-        std::function<void(const std::string& path, Error* error)> fails;
+        Fails fails;
     } rows[] = {
-        {"a missing file",
-         folder.path("none"),
-         {},
-         {},
-         [](const auto& path, Error* error) { readDictionaryFile(path, error); }},
-        {"a property list",
-         folder.write("a.plist", "<plist><dict><key>"),
-         {},
-         Place(18),
-         [](const auto& path, Error* error) { readDictionaryFile(path, error); }},
-        {"XML",
-         folder.write("a.xml", "\n\n<a" + attributes + ">"),
-         Place(3),
-         {},
-         [](const auto& path, Error* error) { XmlDocument::fromFile(path, error); }},
-        {"a preset",
-         folder.write("a.vcp", "fine\n\xff\n"),
-         Place(2),
-         {},
-         [](const auto& path, Error* error) {
-             TGRTVorthalPresetMetaDataReader::initWithTaxonomy(TGRTTaxonomy::init())
-                 ->readMetaDataFromURL(URL::fileURLWithPath(path), 0, error);
-         }},
-        {"a script",
-         "",
-         Place(2),
-         {},
-         [](const auto&, Error* error) { ScriptContext::checkSyntax("1;\n)", error); }},
-        {"a contradiction in a WAV",
-         twoFormats,
-         {},
-         Place(36),
-         [](const auto& path, Error* error) {
-             const auto writer = LCFileWriter::fileWriterForURL(URL::fileURLWithPath(path));
-             const auto data = LCFileParser::fileParserForURL(URL::fileURLWithPath(path))->fileData();
-             data->setTaggingDictionary({{"a", 1}});
-             writer->writeFileData(data, error);
-         }},
-        {"a place that cannot be written to",
-         folder.path("none/a.plist"),
-         {},
-         {},
-         [](const auto& path, Error* error) { replaceFile(path, "new", error); }},
-        {"a damaged database",
-         damaged,
-         {},
-         {},
-         [](const auto& path, Error* error) {
-             const auto database = ContentDatabase::open(path, error);
-             if (database) database->check(error);
-         }},
+        {"a missing file", folder.path("none"), {}, {}, readList},
+        {"a property list", folder.write("a.plist", "<plist><dict><key>"), {}, 18, readList},
+        {"XML", folder.write("a.xml", "\n\n<a" + attributes + ">"), 3, {}, readXml},
+        {"a preset", folder.write("a.vcp", "fine\n\xff\n"), 2, {}, readPreset},
+        {"a script", "", 2, {}, checkScript},
+        {"a contradiction in a WAV", twoFormats, {}, 36, writeWav},
+        {"a place that cannot be written to", folder.path("none/a.plist"), {}, {}, replace},
+        {"a damaged database", damaged, {}, {}, check},
     };
     for (const auto& row : rows) {
         SCOPED_TRACE(row.what);

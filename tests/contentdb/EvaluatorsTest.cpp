@@ -37,59 +37,35 @@ class QueryGenerator {
         double low = static_cast<double>(pick(2000)) / 1000 * scale;
         double high = static_cast<double>(pick(2000)) / 1000 * scale;
         if (low > high) std::swap(low, high);
-        switch (pick(6)) {
-            case 0:
-                return fmt::format(":{}..{}", low, high);
-            case 1:
-                return fmt::format(":{:.0f}..{:.0f}", std::floor(low), std::ceil(high));
-            case 2:
-                return fmt::format(">{}", low);
-            case 3:
-                return fmt::format("<={:.0f}", high);
-            case 4:
-                return fmt::format(":..{}", high);
-            default:
-                return fmt::format(":{:.0f}", low);
-        }
+        const std::string ranges[] = {fmt::format(":{}..{}", low, high),
+                                      fmt::format(":{:.0f}..{:.0f}", std::floor(low), std::ceil(high)),
+                                      fmt::format(">{}", low),
+                                      fmt::format("<={:.0f}", high),
+                                      fmt::format(":..{}", high),
+                                      fmt::format(":{:.0f}", low)};
+        return ranges[pick(std::size(ranges))];
     }
 
     std::string term() {
-        const ItemGenerator::Tag& tag = items_.tag();
-        switch (pick(16)) {
-            case 0:
-                return items_.word();
-            case 1:
-                return items_.word().substr(0, 1 + pick(3));
-            case 2:
-                return quoted(items_.word());
-            case 3:
-                return quoted(items_.word() + " " + items_.word());
-            case 4:
-                return items_.word() + "," + items_.word();
-            case 5:
-                return "tag:" + quoted(tag.label);
-            case 6:
-                return (pick(2) == 0 ? "GENRE:" : "source:") + quoted(tag.label) + "," +
-                       quoted(items_.tag().label);
-            case 7:
-                return "level:" + quoted(tag.label) + (pick(4) == 0 ? "" : range(0.5));
-            case 8:
-                return "bpm" + range(100);
-            case 9:
-                return pick(2) == 0 ? "length" + range(12) : "gain" + range(-1);
-            case 10:
-                return "beats:" + std::to_string(4U << pick(4));
-            case 11:
-                return pick(2) == 0 ? "key:A" : "key:C#m";
-            case 12:
-                return pick(2) == 0 ? "type:loop" : "pack:\"pack " + std::to_string(pick(20)) + "\"";
-            case 13:
-                return "path:" + quoted(items_.word() + "/");
-            case 14:
-                return pick(2) == 0 ? "name::^k.*[13579]" : "genre::^deep";
-            default:
-                return std::string(kOddTerms[pick(kOddTerms.size())]);
-        }
+        const std::string tag = quoted(items_.tag().label);
+        const std::string terms[] = {
+            items_.word(),
+            items_.word().substr(0, 1 + pick(3)),
+            quoted(items_.word()),
+            quoted(items_.word() + " " + items_.word()),
+            items_.word() + "," + items_.word(),
+            "tag:" + tag,
+            (pick(2) == 0 ? "GENRE:" : "source:") + tag + "," + quoted(items_.tag().label),
+            "level:" + tag + (pick(4) == 0 ? "" : range(0.5)),
+            "bpm" + range(100),
+            pick(2) == 0 ? "length" + range(12) : "gain" + range(-1),
+            "beats:" + std::to_string(4U << pick(4)),
+            pick(2) == 0 ? "key:A" : "key:C#m",
+            pick(2) == 0 ? "type:loop" : "pack:\"pack " + std::to_string(pick(20)) + "\"",
+            "path:" + quoted(items_.word() + "/"),
+            pick(2) == 0 ? "name::^k.*[13579]" : "genre::^deep",
+            std::string(kOddTerms[pick(kOddTerms.size())])};
+        return terms[pick(std::size(terms))];
     }
 
     static constexpr std::array<std::string_view, 6> kOrders = {"bpm+",         "bpm-",  "name+",

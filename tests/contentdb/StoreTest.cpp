@@ -2,7 +2,6 @@
 #include "contentdb/store/IdSet.h"
 
 #include <filesystem>
-#include <fstream>
 #include <functional>
 
 #include <gmock/gmock.h>
@@ -39,7 +38,15 @@ TEST(Store, KeepsEveryByteOfAnItem) {
     EXPECT_TRUE(database->check(&error)) << error.message();
 }
 
-TEST(Store, FindsAnItemByItsNewFactsOnly) {
+void change(const std::string& path, const std::function<void(StoreWriter&)>& work, bool isWhole = true) {
+    const auto connection = openDatabase(path, Access::write);
+    StoreWriter writer(*connection);
+    writer.begin();
+    work(writer);
+    if (isWhole) writer.commit();
+}
+
+TEST(Store, FindsAnItemByItsNewFactsOnlyAndInOnePlace) {
     const TemporaryFolder folder;
     const std::string path = folder.path("db");
     std::vector<IndexedItem> items = generatedItems(4, 50);
@@ -47,33 +54,14 @@ TEST(Store, FindsAnItemByItsNewFactsOnly) {
     store(path, items);
     items[20].name = "Newname";
     items[20].taggings = {{"Polka", "Genres", {}, 0.25F, Provenance::stored, {}}};
-    {
-        const auto connection = openDatabase(path, Access::write);
-        StoreWriter writer(*connection);
-        writer.begin();
+    change(path, [&](StoreWriter& writer) {
         writer.put(21, items[20], termsOf(items[20]));
+        writer.put(51, items[3], termsOf(items[3]));  // which is item 4 so far
         writer.remove(1);
-        writer.commit();
-    }
+    });
     EXPECT_THAT(foundNames(path, "oldname"), testing::IsEmpty());
     EXPECT_THAT(foundNames(path, "newname genre:polka level:polka=0.25"), ElementsAre("Newname"));
     EXPECT_EQ(foundNames(path, "").size(), 49U);
-    EXPECT_TRUE(ContentDatabase::open(path)->check());
-}
-
-TEST(Store, HasOneItemInOnePlace) {
-    const TemporaryFolder folder;
-    const std::string path = folder.path("db");
-    const std::vector<IndexedItem> items = generatedItems(4, 10);
-    store(path, items);
-    {
-        const auto connection = openDatabase(path, Access::write);
-        StoreWriter writer(*connection);
-        writer.begin();
-        writer.put(11, items[3], termsOf(items[3]));
-        writer.commit();
-    }
-    EXPECT_EQ(foundNames(path, "").size(), 10U);
     EXPECT_TRUE(ContentDatabase::open(path)->check());
 }
 
@@ -81,12 +69,10 @@ TEST(Store, IsNotThereBeforeTheBatchIsWhole) {
     const TemporaryFolder folder;
     const std::string path = folder.path("db");
     store(path, generatedItems(4, 10));
-    {
-        const auto connection = openDatabase(path, Access::write);
-        StoreWriter writer(*connection);
-        writer.begin();
+    const auto removeAll = [](StoreWriter& writer) {
         for (ItemId id = 1; id <= 10; ++id) writer.remove(id);
-    }
+    };
+    change(path, removeAll, false);
     EXPECT_EQ(foundNames(path, "").size(), 10U);
 }
 

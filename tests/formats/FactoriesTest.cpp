@@ -49,29 +49,23 @@ std::string loopWav() {
 }
 
 TEST(ReaderFactory, GoesByTheExtensionAlone) {
-    struct {
-        const char* path;
+    const struct {
         std::type_index reader;
-    } const cases[] = {
-        {"/none/KICK.WAV", is<TGRTTavioLoopMetaDataReader>()},
-        {"/none/a.aif", is<TGRTTavioLoopMetaDataReader>()},
-        {"/none/a.AIFF", is<TGRTTavioLoopMetaDataReader>()},
-        {"/none/a.caf", is<TGRTTavioLoopMetaDataReader>()},
-        {"/none/a.loopdata", is<TGRTTavioLoopMetaDataReader>()},
-        {"/none/a.Patch", is<TGRTPatchMetaDataReader>()},
-        {"/none/a.ostrax", is<TGRTOstraProjectMetaDataReader>()},
-        {"/none/a.vcp", is<TGRTVorthalPresetMetaDataReader>()},
-        {"/none/a.cst", is<TGRTCstSxvPstMetaDataReader>()},
-        {"/none/a.sxv", is<TGRTCstSxvPstMetaDataReader>()},
-        {"/none/a.pst", is<TGRTCstSxvPstMetaDataReader>()},
-        {"/none/a.aaz", is<TGRTCstSxvPstMetaDataReader>()},
-        {"/none/a.data", is<TGRTBinaryFileMetaDataReader>()},
-        {"/none/a.txt", is<std::nullptr_t>()},
-        {"/none/wav", is<std::nullptr_t>()},
+        std::vector<const char*> paths;
+    } cases[] = {
+        {is<TGRTTavioLoopMetaDataReader>(), {"KICK.WAV", "a.aif", "a.AIFF", "a.caf", "a.loopdata"}},
+        {is<TGRTPatchMetaDataReader>(), {"a.Patch"}},
+        {is<TGRTOstraProjectMetaDataReader>(), {"a.ostrax"}},
+        {is<TGRTVorthalPresetMetaDataReader>(), {"a.vcp"}},
+        {is<TGRTCstSxvPstMetaDataReader>(), {"a.cst", "a.sxv", "a.pst", "a.aaz"}},
+        {is<TGRTBinaryFileMetaDataReader>(), {"a.data"}},
+        {is<std::nullptr_t>(), {"a.txt", "wav"}},
     };
-    for (const auto& c : cases) {
-        EXPECT_EQ(classOf(TGRTMetaDataReaderFactory::metaDataReaderForURL(urlOf(c.path))), c.reader)
-            << c.path;
+    for (const auto& [reader, paths] : cases) {
+        for (const std::string path : paths)
+            EXPECT_EQ(classOf(TGRTMetaDataReaderFactory::metaDataReaderForURL(urlOf("/none/" + path))),
+                      reader)
+                << path;
     }
     EXPECT_FALSE(TGRTBundleMetaDataReader::supportsFileExtension("patch"));
     EXPECT_FALSE(TGRTAudioFileMetaDataReader::supportsFileExtension("loopdata"));
@@ -120,64 +114,66 @@ struct Items {
 
 TEST(FileNode, FindsTheValidatorWithItsActionsReaderAndWriters) {
     const Items items;
-    const auto none = is<std::nullptr_t>();
-    struct {
+    struct Kind {
+        std::type_index validator, reader, taggingWriter, metaDataWriter;
+    };
+    const auto noType = is<std::nullptr_t>();
+    const Kind none{noType, noType, noType, noType};
+    const Kind audio{is<TGRTAudioFileTypeValidator>(), is<TGRTAudioFileMetaDataReader>(),
+                     is<TGRTAudioFileTaggingWriter>(), is<TGRTAudioFileMetaDataWriter>()};
+    const Kind loop{is<TGRTTavioLoopTypeValidator>(), is<TGRTTavioLoopMetaDataReader>(),
+                    is<TGRTTavioLoopTaggingWriter>(), is<TGRTTavioLoopMetaDataWriter>()};
+    const Kind settings{is<TGRTCstSxvPstTypeValidator>(), is<TGRTCstSxvPstMetaDataReader>(),
+                        is<TGRTCstSxvPstTaggingWriter>(), is<TGRTCstSxvPstMetaDataWriter>()};
+    const Kind preset{is<TGRTVorthalPresetTypeValidator>(), is<TGRTVorthalPresetMetaDataReader>(),
+                      is<TGRTVorthalPresetMetaDataWriter>(), is<TGRTVorthalPresetMetaDataWriter>()};
+    const Kind patch{is<TGRTPatchTypeValidator>(), is<TGRTPatchMetaDataReader>(),
+                     is<TGRTPatchTaggingWriter>(), is<TGRTPatchMetaDataWriter>()};
+    const Kind project{is<TGRTOstraProjectTypeValidator>(), is<TGRTOstraProjectMetaDataReader>(),
+                       is<TGRTOstraProjectTaggingWriter>(), is<TGRTOstraProjectMetaDataWriter>()};
+    const struct {
         const char* name;
-        std::type_index validator;
+        const Kind& kind;
         unsigned actions;
         const char* preview;
-        std::type_index reader;
-        std::type_index taggingWriter;
-        std::type_index metaDataWriter;
-    } const cases[] = {
-        {"plain.wav", is<TGRTAudioFileTypeValidator>(), 12, "plain.wav", is<TGRTAudioFileMetaDataReader>(),
-         is<TGRTAudioFileTaggingWriter>(), is<TGRTAudioFileMetaDataWriter>()},
-        {"loop.wav", is<TGRTTavioLoopTypeValidator>(), 12, "loop.wav", is<TGRTTavioLoopMetaDataReader>(),
-         is<TGRTTavioLoopTaggingWriter>(), is<TGRTTavioLoopMetaDataWriter>()},
-        {"named.any", is<TGRTAudioFileTypeValidator>(), 12, "named.any", is<TGRTAudioFileMetaDataReader>(),
-         is<TGRTAudioFileTaggingWriter>(), is<TGRTAudioFileMetaDataWriter>()},
-        {"Bass.cst", is<TGRTCstSxvPstTypeValidator>(), 1, "", is<TGRTCstSxvPstMetaDataReader>(),
-         is<TGRTCstSxvPstTaggingWriter>(), is<TGRTCstSxvPstMetaDataWriter>()},
-        {"Sampler.sxv", is<TGRTCstSxvPstTypeValidator>(), 3, "", is<TGRTCstSxvPstMetaDataReader>(),
-         is<TGRTCstSxvPstTaggingWriter>(), is<TGRTCstSxvPstMetaDataWriter>()},
-        {"Echo.PST", is<TGRTCstSxvPstTypeValidator>(), 3, "", is<TGRTCstSxvPstMetaDataReader>(),
-         is<TGRTCstSxvPstTaggingWriter>(), is<TGRTCstSxvPstMetaDataWriter>()},
-        {"Strip.aaz", is<TGRTCstSxvPstTypeValidator>(), 0, "", is<TGRTCstSxvPstMetaDataReader>(),
-         is<TGRTCstSxvPstTaggingWriter>(), is<TGRTCstSxvPstMetaDataWriter>()},
-        {"Lead.vcp", is<TGRTVorthalPresetTypeValidator>(), 2, "", is<TGRTVorthalPresetMetaDataReader>(),
-         is<TGRTVorthalPresetMetaDataWriter>(), is<TGRTVorthalPresetMetaDataWriter>()},
-        {"Pad.patch", is<TGRTPatchTypeValidator>(), 5, "Pad.patch/prelisten.caf",
-         is<TGRTPatchMetaDataReader>(), is<TGRTPatchTaggingWriter>(), is<TGRTPatchMetaDataWriter>()},
-        {"Dry.patch", is<TGRTPatchTypeValidator>(), 1, "", is<TGRTPatchMetaDataReader>(),
-         is<TGRTPatchTaggingWriter>(), is<TGRTPatchMetaDataWriter>()},
-        {"Song.ostrax", is<TGRTOstraProjectTypeValidator>(), 0, "", is<TGRTOstraProjectMetaDataReader>(),
-         is<TGRTOstraProjectTaggingWriter>(), is<TGRTOstraProjectMetaDataWriter>()},
-        {"Pad.patch/deep/inside.pst", is<TGRTCstSxvPstTypeValidator>(), 3, "",
-         is<TGRTCstSxvPstMetaDataReader>(), is<TGRTCstSxvPstTaggingWriter>(),
-         is<TGRTCstSxvPstMetaDataWriter>()},
+    } cases[] = {
+        {"plain.wav", audio, 12, "plain.wav"},
+        {"loop.wav", loop, 12, "loop.wav"},
+        {"named.any", audio, 12, "named.any"},
+        {"Bass.cst", settings, 1, ""},
+        {"Sampler.sxv", settings, 3, ""},
+        {"Echo.PST", settings, 3, ""},
+        {"Strip.aaz", settings, 0, ""},
+        {"Lead.vcp", preset, 2, ""},
+        {"Pad.patch", patch, 5, "Pad.patch/prelisten.caf"},
+        {"Dry.patch", patch, 1, ""},
+        {"Song.ostrax", project, 0, ""},
+        {"Pad.patch/deep/inside.pst", settings, 3, ""},
         // What lies in a patch, previews, and what is not what its name says.
-        {"Pad.patch/inside.pst", none, 0, "", none, none, none},
-        {"Pad.patch/prelisten.caf", none, 0, "", none, none, none},
-        {"Bass.cst.caf", none, 0, "", none, none, none},
-        {"file.patch", none, 0, "", none, none, none},
-        {"file.ostrax", none, 0, "", none, none, none},
-        {"folder.vcp", none, 0, "", none, none, none},
-        {"folder.cst", none, 0, "", none, none, none},
-        {"broken.wav", none, 0, "", none, none, none},
-        {"words.txt", none, 0, "", none, none, none},
-        {"absent.wav", none, 0, "", none, none, none},
+        {"Pad.patch/inside.pst", none, 0, ""},
+        {"Pad.patch/prelisten.caf", none, 0, ""},
+        {"Bass.cst.caf", none, 0, ""},
+        {"file.patch", none, 0, ""},
+        {"file.ostrax", none, 0, ""},
+        {"folder.vcp", none, 0, ""},
+        {"folder.cst", none, 0, ""},
+        {"broken.wav", none, 0, ""},
+        {"words.txt", none, 0, ""},
+        {"absent.wav", none, 0, ""},
     };
     for (const auto& c : cases) {
         const URL url = urlOf(items.folder.path(c.name));
         const auto node = TGRTFileNode::nodeWithFileURL(url);
-        EXPECT_EQ(classOf(node->validator()), c.validator) << c.name;
+        EXPECT_EQ(classOf(node->validator()), c.kind.validator) << c.name;
         EXPECT_EQ(node->itemActions(), c.actions) << c.name;
         const auto preview = node->prelistenURL();
         EXPECT_EQ(preview ? preview->path() : "", *c.preview ? items.folder.path(c.preview) : "") << c.name;
-        EXPECT_EQ(classOf(node->metaDataReaderForFileURL(url)), c.reader) << c.name;
-        EXPECT_EQ(classOf(TGRTMetaDataWriterFactory::taggingWriterForURL(url)), c.taggingWriter) << c.name;
-        EXPECT_EQ(classOf(TGRTMetaDataWriterFactory::metaDataWriterForURL(url)), c.metaDataWriter) << c.name;
-        EXPECT_EQ(TGRTMetaDataWriterFactory::contentInfoWriterForURL(url) == nullptr, c.reader == none)
+        EXPECT_EQ(classOf(node->metaDataReaderForFileURL(url)), c.kind.reader) << c.name;
+        EXPECT_EQ(classOf(TGRTMetaDataWriterFactory::taggingWriterForURL(url)), c.kind.taggingWriter)
+            << c.name;
+        EXPECT_EQ(classOf(TGRTMetaDataWriterFactory::metaDataWriterForURL(url)), c.kind.metaDataWriter)
+            << c.name;
+        EXPECT_EQ(TGRTMetaDataWriterFactory::contentInfoWriterForURL(url) == nullptr, c.kind.reader == noType)
             << c.name;
     }
 }

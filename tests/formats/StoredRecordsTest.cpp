@@ -6,8 +6,8 @@
 #include "formats/bundle/TGRTBundleTypeValidators.h"
 #include "formats/settings/TGRTBinaryFileMetaDataReader.h"
 #include "formats/settings/TGRTCstSxvPstTypeValidator.h"
-#include "platform/base/Log.h"
 #include "platform/files/FileAccess.h"
+#include "support/CapturedLog.h"
 
 #include <filesystem>
 
@@ -135,25 +135,17 @@ TEST(TaggingWriters, ReplaceTaggingsAndKeepWhatIsNotTheirs) {
         if (c.subType != PropertyList(false)) expected.set("SubType", c.subType);
         EXPECT_EQ(stored(folder.path(c.list)), expected) << c.what;
 
-        test::writeList(folder, c.list,
-                        {{"UUID", "u"}, {"Mine", 7}, {"Type", 3}, {"ContentInfo", Dictionary{}}},
-                        PropertyListFormat::binary);
+        test::writeList(
+            folder, c.list,
+            {{"UUID", "u"}, {"Mine", 7}, {"Type", 3}, {"SubType", 4}, {"ContentInfo", Dictionary{}}},
+            PropertyListFormat::binary);
         ASSERT_TRUE(c.writer->writeTaggings({}, item, &error)) << c.what << ": " << error.message();
-        const Dictionary cleared = {
+        Dictionary cleared = {
             {"Mine", 7}, {"Type", c.type}, {"ContentInfo", Dictionary{}}, {"Tagging", Dictionary{}}};
+        if (c.subType == PropertyList(false)) cleared.set("SubType", 4);  // what bundles drop, settings keep
         EXPECT_EQ(stored(folder.path(c.list)), cleared) << c.what;
         EXPECT_TRUE(readFile(folder.path(c.list))->front() == 'b') << c.what << " keeps its encoding";
     }
-}
-
-TEST(TaggingWriters, SettingsKeepASubTypeAndBundlesDropIt) {
-    const TemporaryFolder folder;
-    test::writeList(folder, "a.cst.plist", {{"SubType", 4}});
-    test::writeList(folder, "a.patch/tags.plist", {{"SubType", 4}});
-    ASSERT_TRUE(TGRTCstSxvPstTaggingWriter().writeTaggings({}, urlOf(folder.path("a.cst"))));
-    ASSERT_TRUE(TGRTPatchTaggingWriter().writeTaggings({}, urlOf(folder.path("a.patch"))));
-    EXPECT_NE(stored(folder.path("a.cst.plist")).value("SubType"), nullptr);
-    EXPECT_EQ(stored(folder.path("a.patch/tags.plist")).value("SubType"), nullptr);
 }
 
 TEST(MetaDataWriters, BundlesAreWrittenOverAndSideCarsAreKept) {
@@ -264,14 +256,12 @@ TEST(PluginTaggings, NameThePlugInsThatAreNotBypassed) {
                  "<Plugin bypassed='1' name='Echo'/><Plugin bypassed='0' name=''/><Plugin bypassed='0'/>"
                  "<Plugin bypassed='10' name='Odd &amp; Even'/></Plugins></Channel></Channels>"
                  "<Plugin bypassed='0' name='Elsewhere'/>");  // cut off
-    std::vector<std::string> lines;
-    const LogHandler former = setLogHandler([&](std::string_view line) { lines.emplace_back(line); });
+    const test::CapturedLog log;
     const auto taggings = TGRTPatchMetaDataReader::pluginTaggingsForURL(urlOf(folder.path("a.patch")));
     EXPECT_TRUE(TGRTPatchMetaDataReader::pluginTaggingsForURL(urlOf(folder.path("b.patch"))).empty());
-    setLogHandler(former);
     // Without a level: not "=0.00".
     EXPECT_THAT(textsOf(taggings), ElementsAre("Plugins/Odd & Even", "Plugins/Tube Amp"));
-    EXPECT_THAT(lines, ElementsAre("pluginName Tube Amp", "pluginName Odd & Even"));
+    EXPECT_THAT(log.messages(), ElementsAre("pluginName Tube Amp", "pluginName Odd & Even"));
 }
 
 TEST(DataFiles, FindTheirListBetweenOtherBytes) {
@@ -308,14 +298,12 @@ TEST(DataFiles, LogOneLineWhenThereIsNone) {
     };
     for (const auto& c : cases) {
         const std::string path = folder.write("a.data", c.bytes);
-        std::vector<std::string> lines;
-        const LogHandler former = setLogHandler([&](std::string_view line) { lines.emplace_back(line); });
+        const test::CapturedLog log;
         Error error;
         const auto record = read(path, 0, &error);
-        setLogHandler(former);
         ASSERT_TRUE(record);
         EXPECT_EQ(record->fileType(), 0);
-        EXPECT_THAT(lines, ElementsAre("Indexing " + path + ": " + c.reason));
+        EXPECT_THAT(log.messages(), ElementsAre("Indexing " + path + ": " + c.reason));
         EXPECT_EQ(error.code, 2);
         EXPECT_EQ(error.message(), path + ": " + c.reason);
     }

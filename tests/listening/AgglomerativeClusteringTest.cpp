@@ -72,24 +72,6 @@ TEST(AgglomerativeClustering, AgreesWithTheDefinition) {
     }
 }
 
-TEST(AgglomerativeClustering, MergesNoFartherThanTheThreshold) {
-    EXPECT_EQ(clustersOf(notesAt({0, 0.125, 0.25}), 0.125), (Clusters{{0, 1}, {2}}))
-        << "ties go to the earliest";
-    EXPECT_EQ(clustersOf(notesAt({0, 0.12, 0.2}), 0.125), (Clusters{{0}, {1, 2}}))
-        << "the closest pair first";
-    EXPECT_EQ(clustersOf(notesAt({}), 0.125), Clusters{});
-}
-
-TEST(AgglomerativeClustering, KeepsTheEarliestNoteOfEachCluster) {
-    AgglomerativeClustering clustering({{2, 3, 60, 1}, {1.9, 3, 61, 2}, {0, 1, 62, 3}, {1.9, 3, 63, 4}});
-    clustering.setThreshold(0.125);
-    clustering.runAnalysis(AgglomerativeClustering::kStartInThreshold);
-    const auto reduced = clustering.getReducedRepresentationEarliestNotes();
-    ASSERT_EQ(reduced.size(), 2U);
-    EXPECT_EQ(reduced[0].pitch, 61);
-    EXPECT_EQ(reduced[1].pitch, 62);
-}
-
 TEST(AgglomerativeClustering, MeasuresByFourMethods) {
     const AgglomerativeClustering clustering({});
     const Note a{0, 4, 60, 100}, b{3, 8, 60, 100}, c{8, 9, 60, 100}, instant{3, 3, 60, 100};

@@ -3,6 +3,7 @@
 #include "media/loopfile/LCFileData.h"
 #include "media/loopfile/LCFileParser.h"
 #include "media/loopfile/LCFileWriter.h"
+#include "support/AudioFixtures.h"
 #include "support/TemporaryFolder.h"
 
 #include <cmath>
@@ -13,6 +14,8 @@
 
 namespace qvct {
 namespace {
+
+using test::Aiff;
 
 const LoopMetre kFourBeats{120, 4, 4, 4};
 
@@ -53,13 +56,6 @@ TEST(AudioTransientComplexity, RefusesWhatCannotBeMeasured) {
         << "a refusal is not kept";
 }
 
-std::string bigEndian(std::uint32_t value, int bytes) {
-    std::string out;
-    for (int shift = 8 * (bytes - 1); shift >= 0; shift -= 8)
-        out.push_back(static_cast<char>(std::uint64_t{value} >> static_cast<unsigned>(shift)));
-    return out;
-}
-
 // Two seconds at 8000 Hz, a click every half second from the first quarter on.
 std::string clicksAsAiff() {
     constexpr std::uint32_t kFrames = 16000;
@@ -67,14 +63,10 @@ std::string clicksAsAiff() {
     for (std::uint32_t i = 0; i < kFrames; ++i) {
         const std::uint32_t since = (i + 2000) % 4000;
         const double sample = 20000 * std::exp(-0.01 * since) * (since % 2 ? -1 : 1);
-        sound += bigEndian(static_cast<std::uint32_t>(static_cast<int>(sample)), 2);
+        sound += test::big(static_cast<std::uint64_t>(static_cast<int>(sample)), 2);
     }
-    const std::string common = "COMM" + bigEndian(18, 4) + bigEndian(1, 2) + bigEndian(kFrames, 4) +
-                               bigEndian(16, 2) + std::string("\x40\x0b\xfa\0\0\0\0\0\0\0", 10);
-    const std::string data =
-        "SSND" + bigEndian(static_cast<std::uint32_t>(sound.size() + 8), 4) + bigEndian(0, 8) + sound;
-    return "FORM" + bigEndian(static_cast<std::uint32_t>(4 + common.size() + data.size()), 4) + "AIFF" +
-           common + data;
+    return Aiff::file(Aiff::common(1, kFrames, 16, Aiff::rate(8000)) +
+                      Aiff::chunk("SSND", test::big(0, 8) + sound));
 }
 
 URL writeLoop(const test::TemporaryFolder& folder, const std::string& name, int top) {

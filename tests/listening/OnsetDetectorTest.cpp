@@ -65,15 +65,9 @@ TEST(OnsetDetector, BlocksDoNotMatter) {
         EXPECT_EQ(onsetsOf(samples, 44100, 2, block), whole);
 }
 
-TEST(OnsetDetector, LoudnessDoesNotMatter) {
-    auto samples = bursts(kTimes, 1.5, 44100);
-    for (float& sample : samples) sample *= 0.03F;
-    EXPECT_EQ(onsetsOf(samples, 44100).size(), kTimes.size());
-}
-
-TEST(OnsetDetector, OppositeChannelsDoNotCancel) {
+TEST(OnsetDetector, LoudnessAndOppositeChannelsDoNotMatter) {
     auto samples = bursts(kTimes, 1.5, 44100, 2);
-    for (std::size_t i = 1; i < samples.size(); i += 2) samples[i] = -samples[i];
+    for (std::size_t i = 0; i < samples.size(); ++i) samples[i] *= i % 2 == 0 ? 0.03F : -0.03F;
     EXPECT_EQ(onsetsOf(samples, 44100, 2).size(), kTimes.size());
 }
 

@@ -57,16 +57,6 @@ TEST(QVCTMidiAnalysis, CutsBeatsIntoHalvesAndThirds) {
     }
 }
 
-TEST(QVCTMidiAnalysis, WeighsOneBarAndRepeatsIt) {
-    const auto mask = analysisOf(16, 4, 4, {})->getSyncopationMask();
-    ASSERT_EQ(mask.size(), 128U);
-    const std::pair<std::size_t, float> cells[] = {{0, 1.0F},     {32, 1.0F},   {16, 0.7F},     {8, 0.49F},
-                                                   {100, 0.343F}, {2, 0.2401F}, {127, 0.16807F}};
-    for (const auto& [cell, weight] : cells) EXPECT_NEAR(mask[cell], 1 - weight, 1e-6) << cell;
-    EXPECT_EQ(analysisOf(10, 4, 4, {})->getSyncopationMask().size(), 64U) << "the odd half bar has no cells";
-    EXPECT_TRUE(analysisOf(10, 5, 4, {})->getSyncopationMask().empty());
-}
-
 TEST(QVCTMidiAnalysis, ShiftsOnlyOnce) {
     const auto analysis = analysisOf(4, 4, 4, {{8, 100}, {9, 100}});
     analysis->computeRhythmicDensity();

@@ -2,6 +2,7 @@
 #include "media/audio/AudioDecoder.h"
 #include "platform/files/FileAccess.h"
 #include "platform/files/RandomAccessReader.h"
+#include "support/AudioFixtures.h"
 #include "support/Corpus.h"
 #include "support/TemporaryFolder.h"
 
@@ -15,21 +16,13 @@
 namespace qvct {
 namespace {
 
-std::string littleEndian(std::uint32_t value, int bytes) {
-    std::string out;
-    for (int i = 0; i < bytes; ++i) out.push_back(static_cast<char>(value >> (8 * i)));
-    return out;
-}
-
 // A WAV file; format 1 is integers, 3 floats.
-std::string wav(std::uint32_t format, std::uint32_t channels, std::uint32_t rate, std::uint32_t bits,
+std::string wav(unsigned format, unsigned channels, std::uint32_t rate, unsigned bits,
                 const std::string& data) {
-    const std::string fmt = littleEndian(format, 2) + littleEndian(channels, 2) + littleEndian(rate, 4) +
-                            littleEndian(rate * channels * bits / 8, 4) +
-                            littleEndian(channels * bits / 8, 2) + littleEndian(bits, 2);
-    const auto length = static_cast<std::uint32_t>(data.size());
-    return "RIFF" + littleEndian(length + 36, 4) + "WAVEfmt " + littleEndian(16, 4) + fmt + "data" +
-           littleEndian(length, 4) + data;
+    const test::Wav wav;
+    std::string description = wav.format(channels, rate, bits);
+    description[8] = static_cast<char>(format);
+    return wav.file(description + wav.chunk("data", data));
 }
 
 std::string floats(const std::vector<float>& samples) {
@@ -74,7 +67,7 @@ TEST(AudioDecoder, GivesTheSamplesOfEveryDepth) {
 TEST(AudioDecoder, ReadsFromAPathWhatItReadsFromMemory) {
     const test::TemporaryFolder folder;
     std::string data;
-    for (std::uint32_t i = 0; i < 5000; ++i) data += littleEndian(i * 2654435761U, 2);
+    for (std::uint32_t i = 0; i < 5000; ++i) data += test::little(i * 2654435761U, 2);
     const std::string file = wav(1, 1, 44100, 16, data);
     const auto memory = decoderOf(file);
     const auto path = AudioDecoder::open(folder.write("a.wav", file));

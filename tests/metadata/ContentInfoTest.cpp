@@ -69,13 +69,6 @@ TEST(ContentInfo, PassesOverWhatIsNotOfItsType) {
     EXPECT_TRUE(TGRTContentInfo::initWithDictionary(nullptr)->dictionary().empty());
 }
 
-TEST(ContentInfo, ACopyStandsOnItsOwn) {
-    const auto info = infoOf(Dictionary{{"Dependencies", Array{"/a"}}});
-    const auto copy = info->copy();
-    info->updateDependencyPaths({"/b"});
-    EXPECT_THAT(copy->assetDependencyPaths(), ElementsAre("/a"));
-}
-
 TEST(DependencyItem, IsKnownByItsIdentifierAndNothingWithoutPath) {
     const auto a = TGRTDependencyItem::dependencyItemWithPath("/a");
     const auto b = TGRTDependencyItem::dependencyItemWithPath("/b");

@@ -2,6 +2,7 @@
 
 #include "metadata/TGRTMetaData.h"
 #include "platform/data/PropertyListFile.h"
+#include "platform/text/Text.h"
 #include "taxonomy/TGRTTaxonomy.h"
 
 #include <cmath>
@@ -87,51 +88,28 @@ class Mutator {
     }
 
     std::string text() {
-        const std::vector<std::string> texts = {"",
-                                                "Name",
-                                                "Weight",
-                                                "Genres",
-                                                "(null)",
-                                                "%",
-                                                "x-+",
-                                                "[,]",
-                                                "}{",
-                                                "1^$9",
-                                                "/../..",
-                                                "\xe2\x80\xa8",
-                                                "House$99999999999999999999",
-                                                std::string(3000, '%'),
-                                                "Tagging"};
+        const std::vector<std::string> texts = split(
+            "|Name|Weight|Genres|(null)|%|x-+|[,]|}{|1^$9|/../"
+            "..|\xe2\x80\xa8|House$99999999999999999999|Tagging",
+            "|");
+        if (pick(texts.size()) == 0) return std::string(3000, '%');
         return texts[pick(texts.size())];
     }
 
     PropertyList anything() {
-        switch (pick(12)) {
-            case 0:
-                return pick(2) == 0;
-            case 1:
-                return std::numeric_limits<std::int64_t>::min();
-            case 2:
-                return std::numeric_limits<std::uint64_t>::max();
-            case 3:
-                return std::nan("");
-            case 4:
-                return -std::numeric_limits<double>::infinity();
-            case 5:
-                return 1e308;
-            case 6:
-                return PropertyList::Data{0, 255};
-            case 7:
-                return PropertyList::Date{1e9};
-            case 8:
-                return PropertyList::Uid{1};
-            case 9:
-                return Array{text(), 1};
-            case 10:
-                return Dictionary{{text(), text()}};
-            default:
-                return text();
-        }
+        const PropertyList values[] = {pick(2) == 0,
+                                       std::numeric_limits<std::int64_t>::min(),
+                                       std::numeric_limits<std::uint64_t>::max(),
+                                       std::nan(""),
+                                       -std::numeric_limits<double>::infinity(),
+                                       1e308,
+                                       PropertyList::Data{0, 255},
+                                       PropertyList::Date{1e9},
+                                       PropertyList::Uid{1},
+                                       Array{text(), 1},
+                                       Dictionary{{text(), text()}},
+                                       text()};
+        return values[pick(std::size(values))];
     }
 
     std::mt19937 random_;

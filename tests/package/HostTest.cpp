@@ -8,8 +8,6 @@
 #include <atomic>
 #include <chrono>
 #include <filesystem>
-#include <fstream>
-#include <iterator>
 #include <thread>
 
 #include <gmock/gmock.h>
@@ -46,11 +44,6 @@ std::vector<URL> writeDemoLibrary(const TemporaryFolder& folder) {
     for (const std::string& path : demo::writeLibrary(folder.path()))
         items.push_back(URL::fileURLWithPath(folder.path(path)));
     return items;
-}
-
-std::string bytesOf(const URL& url) {
-    std::ifstream file(url.path(), std::ios::binary);
-    return {std::istreambuf_iterator<char>(file), {}};
 }
 
 URL soundIn(const TemporaryFolder& folder) {
@@ -101,12 +94,12 @@ TEST(NullPointers, AreNoTagsNoCategoriesAndNoTaggings) {
 TEST(NullPointers, WriteNothing) {
     const TemporaryFolder folder;
     const URL url = soundIn(folder);
-    const std::string before = bytesOf(url);
+    const std::string before = test::readAll(url.path());
     Error error;
     EXPECT_FALSE(TGRTMetaDataWriterFactory::metaDataWriterForURL(url)->writeMetaData(nullptr, url, &error));
     EXPECT_THAT(error.message(), HasSubstr(url.path()));
     EXPECT_FALSE(TGRTMetaDataWriterFactory::metaDataWriterForURL(url)->writeMetaData(nullptr, url));
-    EXPECT_EQ(bytesOf(url), before);
+    EXPECT_EQ(test::readAll(url.path()), before);
 }
 
 TEST(NullPointers, AreInputsThatAnItemDoesNotHave) {
@@ -181,14 +174,6 @@ TEST(ReleasedTaxonomy, LeavesTaggingsWhatTheyAre) {
     EXPECT_THAT(TGRTTagging::taggingDictionaryForTaggings(taggings), Not(IsEmpty()));
     EXPECT_EQ(taggings, aggregator->taggingsWithContentsOfURL(url, *TGRTTaxonomy::defaultTaxonomy(),
                                                               QVCTAutoTaggingOptionFilenameKeywords));
-}
-
-TEST(ReleasedTaxonomy, IsMadeAnewAfterEviction) {
-    const auto held = TGRTTaxonomy::defaultTaxonomy();
-    TGRTTaxonomy::evictCache();
-    const auto anew = TGRTTaxonomy::defaultTaxonomy();
-    EXPECT_NE(held, anew);
-    EXPECT_TRUE(anew->doesContainTag(held->findTagForLabel("House")));
 }
 
 /// What one thread finds out about the items.

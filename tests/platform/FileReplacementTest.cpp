@@ -40,6 +40,11 @@ std::size_t filesIn(const TemporaryFolder& folder) {
     return test::filesBelow(folder.path()).size();
 }
 
+bool replaceByNew(const std::string& path, const FileReplacementOptions& options, Error* error = nullptr) {
+    const FilePiece whole{.bytes = "new"};
+    return replaceFileByPieces(path, {&whole, 1}, options, error);
+}
+
 TEST(FileReplacement, PutsPiecesTogetherAtAnyAlignment) {
     const std::string old = test::noise(50000);
     struct Range {
@@ -75,9 +80,7 @@ TEST(FileReplacement, KeepsModeAttributesAndOnRequestTheTimes) {
         const bool hasAttributes = ::setxattr(path.c_str(), "user.rating", "five", 4, 0) == 0;
         const struct timespec times[2] = {{1000, 1}, {2000, 2}};
         ::utimensat(AT_FDCWD, path.c_str(), times, 0);
-        const FilePiece piece{.bytes = "new"};
-        ASSERT_TRUE(
-            replaceFileByPieces(path, {&piece, 1}, {.keepsTimes = keeps, .expected = {}, .check = {}}));
+        ASSERT_TRUE(replaceByNew(path, {.keepsTimes = keeps, .expected = {}, .check = {}}));
         const struct stat status = statusOf(path);
         EXPECT_EQ(status.st_mode & 07777U, 0640U);
         EXPECT_EQ(status.st_mtim.tv_sec == 2000 && status.st_mtim.tv_nsec == 2, keeps);
@@ -154,10 +157,9 @@ TEST(FileReplacement, AFolderThatForbidsItIsAnErrorBeforehandAndLosesNothing) {
         for (const bool isDryRun : {true, false}) {
             FileReplacementOptions options;
             options.isDryRun = isDryRun;
-            const FilePiece whole{.bytes = "new"};
             Error error;
             ASSERT_EQ(isRoot ? ::seteuid(kNobody) : 0, 0);
-            const bool replaced = replaceFileByPieces(path, {&whole, 1}, options, &error);
+            const bool replaced = replaceByNew(path, options, &error);
             ASSERT_EQ(isRoot ? ::seteuid(0) : 0, 0);
             EXPECT_FALSE(replaced) << isDryRun;
             EXPECT_THAT(error.message(), testing::AllOf(HasSubstr(path), HasSubstr(each.reason)));
@@ -242,10 +244,9 @@ TEST(FileReplacement, WhatAnotherProgramSavedMeanwhileStays) {
             each.save(path);
             return true;
         };
-        const FilePiece whole{.bytes = "new"};
         for (int round = 0; round < 2; ++round) {  // the second time the state is an old one from the start
             Error error;
-            EXPECT_FALSE(replaceFileByPieces(path, {&whole, 1}, options, &error));
+            EXPECT_FALSE(replaceByNew(path, options, &error));
             EXPECT_THAT(error.message(), HasSubstr("changed by another program"));
             EXPECT_EQ(contentsOf(path), each.contents);
             EXPECT_EQ(filesIn(folder), each.contents == "unreadable" ? 0U : 1U);
@@ -265,8 +266,7 @@ TEST(FileReplacement, NobodyElseCanReadTheNewFileBeforeItIsInPlace) {
             seen = statusOf(newFile).st_mode & 07777U;
             return true;
         };
-        const FilePiece whole{.bytes = "new"};
-        EXPECT_TRUE(replaceFileByPieces(path, {&whole, 1}, options));
+        EXPECT_TRUE(replaceByNew(path, options));
         EXPECT_EQ(seen, 0600U);
         EXPECT_EQ(statusOf(path).st_mode & 07777U, mode == 0 ? 0644U : mode);
     }
@@ -331,8 +331,7 @@ bool writeAndMeanwhile(const std::string& path, const std::function<bool()>& wor
     removeUnfinishedFilesWhenEnded();
     FileReplacementOptions options;
     options.check = [&](const std::string&, Error*) { return work(); };
-    const FilePiece whole{.bytes = "new"};
-    return replaceFileByPieces(path, {&whole, 1}, options);
+    return replaceByNew(path, options);
 }
 
 /// Sends a signal to a process in the middle of writing `path`; how the process ended.
@@ -397,8 +396,7 @@ TEST(FileReplacement, WhatAKilledProcessLeftIsRemovedByTheNextWriteAndNothingEls
         EXPECT_TRUE(replaceFile(victim, "user's"));
         return std::filesystem::exists(newFile);
     };
-    const FilePiece whole{.bytes = "new"};
-    EXPECT_TRUE(replaceFileByPieces(path, {&whole, 1}, options)) << "a living writer's file was removed";
+    EXPECT_TRUE(replaceByNew(path, options)) << "a living writer's file was removed";
     EXPECT_EQ(entries(), others - (isRoot ? 0 : 1));
     for (const std::string& name : kept) EXPECT_EQ(contentsOf(folder.path(name)), "user's") << name;
 }

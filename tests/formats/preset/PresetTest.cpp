@@ -144,15 +144,6 @@ TEST(Presets, KeepEveryTextThatARecordHolds) {
     }
 }
 
-TEST(Presets, NamesAreNotTakenForOldCodes) {
-    const TemporaryFolder folder;
-    const std::string path = folder.write("a.vcp", "<metadata>\n</metadata>\nAttribs = 6004\n");
-    auto record = TGRTMetaData::init();
-    record->setDisplayName("Attribs = 4001,4001");
-    ASSERT_TRUE(TGRTVorthalPresetMetaDataWriter().writeMetaData(record, urlOf(path)));
-    EXPECT_THAT(textsOf(read(path, 1)->taggings()), ElementsAre("VorthalTimbre/Bright"));
-}
-
 TEST(Presets, RefuseWhatTheyCannotRewriteWithCertainty) {
     const TemporaryFolder folder;
     struct {

@@ -1,6 +1,6 @@
 #include "formats/preset/TGRTVorthalLegacyTaggingParser.h"
-#include "platform/base/Log.h"
 #include "resources/QVCTCompiledResources.h"
+#include "support/CapturedLog.h"
 #include "support/TemporaryFolder.h"
 #include "taxonomy/TGRTTaxonomy.h"
 
@@ -57,8 +57,7 @@ TEST(VorthalLegacyTagging, ReadsTheFirstAttributeLine) {
 TEST(VorthalLegacyTagging, TableHasARowForEveryTagOfTheVocabulary) {
     std::map<std::pair<std::string, bool>, std::size_t> counts;
     std::set<std::string> keys;
-    std::vector<std::string> messages;
-    const LogHandler former = setLogHandler([&](std::string_view m) { messages.emplace_back(m); });
+    const test::CapturedLog log;
     for (const auto& [code, row] : Parser::legacyTagIdMapping()) {
         ++counts[{row.category, row.parent.empty()}];
         const auto tags = tagsOf("Attribs = " + code);
@@ -66,8 +65,7 @@ TEST(VorthalLegacyTagging, TableHasARowForEveryTagOfTheVocabulary) {
             << code;
         keys.insert(row.category + ";" + row.parent + ";" + row.label);
     }
-    setLogHandler(former);
-    EXPECT_THAT(messages, IsEmpty());
+    EXPECT_THAT(log.messages(), IsEmpty());
     const std::map<std::pair<std::string, bool>, std::size_t> expected = {
         {{"VorthalCategory", true}, 17}, {{"VorthalCategory", false}, 94},    {{"VorthalTimbre", true}, 21},
         {{"VorthalGenre", true}, 18},    {{"VorthalArticulation", true}, 23}, {{"VorthalVersion", true}, 2}};
