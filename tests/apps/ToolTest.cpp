@@ -24,12 +24,6 @@ std::vector<std::string> names(const json& items) {
     return result;
 }
 
-std::set<std::string> labels(const json& item) {
-    std::set<std::string> result;
-    for (const json& tagging : item["taggings"]) result.insert(tagging["label"]);
-    return result;
-}
-
 TEST(Autotag, WritesOneStableRecordAnItem) {
     const TemporaryFolder folder;
     const std::string path = folder.write("Dark Kick.wav", "");
@@ -57,54 +51,30 @@ TEST(Autotag, NamesWhatFailsAndDoesTheRest) {
         "<plist version=\"1.0\"><dict><key>(open</key><string>Kick</string></dict></plist>";
     folder.write("keywords/DefaultKeywordMapping.plist", keywords);
     folder.write("table/LegacyLoopTaxonomyMapping.csv", "Keyword;Tag\n");
-    struct {
-        const char* what;
-        std::vector<std::string> arguments;
-        int status;
-        std::vector<std::string> messages;
-    } const cases[] = {
-        {"missing path",
-         {folder.path("none"), folder.path("Kick.wav")},
-         1,
-         {folder.path("none") + ": No such file"}},
-        {"name that is not UTF-8", {folder.path()}, 1, {"bad \\xff\\x0a.wav: the name is not UTF-8"}},
-        {"broken resources",
-         {"--resources", folder.path("list"), folder.path("Kick.wav")},
-         1,
-         {"DefaultTaxonomy.plist", "using the built-in one"}},
-        {"broken keyword in the resources",
-         {"--resources", folder.path("keywords"), folder.path("Kick.wav")},
-         1,
-         {"Error when evalating regex: (open"}},
-        {"broken keyword in a file",
-         {"--keywords", folder.path("keywords/DefaultKeywordMapping.plist"), folder.path("Kick.wav")},
-         1,
-         {"Error when evalating regex: (open"}},
-        {"broken table in the resources",
-         {"--resources", folder.path("table"), folder.path("Kick.wav")},
-         1,
+    const std::string kick = folder.path("Kick.wav");
+    const std::string brokenKeyword = "Error when evalating regex: (open";
+    const struct {
+        std::vector<std::string> arguments, messages;
+        int status = 1;
+    } cases[] = {
+        {{folder.path("none"), kick}, {folder.path("none") + ": No such file"}},
+        {{folder.path()}, {"bad \\xff\\x0a.wav: the name is not UTF-8"}},
+        {{"--resources", folder.path("list"), kick}, {"DefaultTaxonomy.plist", "using the built-in one"}},
+        {{"--resources", folder.path("keywords"), kick}, {brokenKeyword}},
+        {{"--keywords", folder.path("keywords/DefaultKeywordMapping.plist"), kick}, {brokenKeyword}},
+        {{"--resources", folder.path("table"), kick},
          {"LegacyLoopTaxonomyMapping.csv: line 1: is not the header (using the built-in one)"}},
-        {"missing resource folder",
-         {"--resources", "/none", folder.path("Kick.wav")},
-         1,
-         {"/none: no such resource folder"}},
-        {"unknown service",
-         {"--services", "keywords,magic", folder.path("Kick.wav")},
-         2,
-         {"no service \"magic\""}},
-        {"missing keywords",
-         {"--keywords", "/none.plist", folder.path("Kick.wav")},
-         1,
-         {"/none.plist: No such file"}},
+        {{"--resources", "/none", kick}, {"/none: no such resource folder"}},
+        {{"--services", "keywords,magic", kick}, {"no service \"magic\""}, 2},
+        {{"--keywords", "/none.plist", kick}, {"/none.plist: No such file"}},
     };
     for (const auto& c : cases) {
         std::vector<std::string> arguments = {"autotag", "--json"};
         arguments.insert(arguments.end(), c.arguments.begin(), c.arguments.end());
         const ToolResult result = runTool(arguments);
-        EXPECT_EQ(result.status, c.status) << c.what << result.errors;
-        EXPECT_THAT(names(result.json()), ElementsAre("Kick.wav")) << c.what;
-        for (const std::string& message : c.messages)
-            EXPECT_THAT(result.errors, HasSubstr(message)) << c.what;
+        EXPECT_EQ(result.status, c.status) << result.errors;
+        EXPECT_THAT(names(result.json()), ElementsAre("Kick.wav")) << result.errors;
+        for (const std::string& message : c.messages) EXPECT_THAT(result.errors, HasSubstr(message));
         EXPECT_EQ(std::count(result.errors.begin(), result.errors.end(), '\n'), 1) << result.errors;
     }
 }

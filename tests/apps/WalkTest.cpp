@@ -71,7 +71,7 @@ TEST(Walk, TakesFilesAndBundlesAndNothingElse) {
     const std::string sound = Wav().file(Wav().format() + Wav().data());
     for (const char* name :
          {"b/z.wav", "a.wav", "c.wav", "b/.hidden.wav", ".hidden/x.wav", "folder.wav/in.wav",
-          "one.patch/in.wav", "notes.txt", "d.cst", "d.cst.plist", "d.cst.caf", "._a.wav", "E.AIFF"})
+          "one.patch/in.wav", "notes.txt", "d.cst", "d.cst.caf", "._a.wav", "E.AIFF"})
         folder.write(name, sound);
     folder.write("file.patch", "no bundle");
     ASSERT_EQ(::mkfifo(folder.path("pipe.wav").c_str(), 0600), 0);

@@ -8,6 +8,7 @@
 #include "support/Corpus.h"
 #include "support/TemporaryFolder.h"
 
+#include <algorithm>
 #include <functional>
 
 #include <gmock/gmock.h>
@@ -134,17 +135,18 @@ TEST(LoopFileWrite, TheSizesOfTheFormAreThoseOfTheFile) {
         {"rf64.wav", 20, 8, false, 8}, {"bw64.wav", 20, 8, false, 8}, {"trailing.wav", 4, 4, false, 8 + 24},
         {"odd.aif", 4, 4, true, 8},    {"sowt.aifc", 4, 4, true, 8},
     };
+    const auto sounds = soundFiles();
     for (const auto& c : cases) {
-        for (const Sound& sound : soundFiles()) {
-            if (std::string_view(sound.name) != c.name) continue;
-            const TemporaryFolder folder;
-            const std::string path = folder.write(sound.name, sound.bytes);
-            ASSERT_TRUE(tag(path));
-            const std::string written = contentsOf(path);
-            EXPECT_EQ(sizeAt(written, c.offset, c.width, c.isBig), written.size() - c.notCounted) << c.name;
-            EXPECT_GT(written.size(), sound.bytes.size());
-            EXPECT_EQ((written.size() - c.notCounted) % 2, 0U);
-        }
+        const auto sound = std::find_if(sounds.begin(), sounds.end(), [&c](const Sound& each) {
+            return each.name == std::string_view(c.name);
+        });
+        const TemporaryFolder folder;
+        const std::string path = folder.write(c.name, sound->bytes);
+        ASSERT_TRUE(tag(path));
+        const std::string written = contentsOf(path);
+        EXPECT_EQ(sizeAt(written, c.offset, c.width, c.isBig), written.size() - c.notCounted) << c.name;
+        EXPECT_GT(written.size(), sound->bytes.size());
+        EXPECT_EQ((written.size() - c.notCounted) % 2, 0U);
     }
 }
 
