@@ -63,7 +63,6 @@ void includeCompanions(const FolderListing& listing, ListedItem& item) {
 
 std::vector<ListedItem> listedItems(const ContentFolder& folder, const WalkFailure& failed) {
     std::vector<ListedItem> items;
-    items.reserve(folder.items.size());
     for (const ContentFolder::Item& found : folder.items) {
         Error error;
         const auto status = folder.listing.status(found.entry, Links::follow, folder.path, &error);

@@ -71,27 +71,23 @@ void QueryPlan::add(const TagMatch& match) {
 void QueryPlan::add(const NumberMatch& match) {
     const std::string start = term(TermKind::coarseNumber, match.field) + '\0';
     std::vector<NumberGroup> cut;  // by an end of the range
-    store_.forEachTerm(start, start + "\xff\xff\xff\xff\xff", [&](TermId id, std::string_view value) {
-        const NumberGroup group = numberGroupOfTerm(value);
-        if (match.contains(group.first) && match.contains(group.last)) {
-            sureTerms_.push_back(id);
-        } else if (group.last >= match.low && group.first <= match.high) {
-            cut.push_back(group);
-        }
-    });
+    addGroups(start, start + "\xff\xff\xff\xff\xff", match,
+              [&cut](TermId /*id*/, const NumberGroup& group) { cut.push_back(group); });
     for (const NumberGroup& group : cut) {
         addGroups(fineGroup(match.field, group.first).term, fineGroup(match.field, group.last).term + '\0',
-                  match);
+                  match, [this](TermId id, const NumberGroup& /*group*/) { possibleTerms_.push_back(id); });
     }
 }
 
-void QueryPlan::addGroups(const std::string& start, const std::string& end, const NumberMatch& match) {
+/// Groups that lie in the range are sure; of those that an end of it cuts, `addCut` is told.
+void QueryPlan::addGroups(const std::string& start, const std::string& end, const NumberMatch& match,
+                          const std::function<void(TermId, const NumberGroup&)>& addCut) {
     store_.forEachTerm(start, end, [&](TermId id, std::string_view value) {
         const NumberGroup group = numberGroupOfTerm(value);
         if (match.contains(group.first) && match.contains(group.last)) {
             sureTerms_.push_back(id);
         } else if (group.last >= match.low && group.first <= match.high) {
-            possibleTerms_.push_back(id);
+            addCut(id, group);
         }
     });
 }

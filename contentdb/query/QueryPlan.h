@@ -2,7 +2,10 @@
 
 #include "contentdb/Query.h"
 #include "contentdb/store/ContentStore.h"
+#include "contentdb/terms/Terms.h"
 
+#include <functional>
+#include <string>
 #include <vector>
 
 namespace qvct::contentdb {
@@ -33,7 +36,8 @@ class QueryPlan {
     void add(const TextMatch& match);
     void add(const ExpressionMatch& match);
     void addParts(Kind kind, const std::vector<Condition>& parts);
-    void addGroups(const std::string& start, const std::string& end, const NumberMatch& match);
+    void addGroups(const std::string& start, const std::string& end, const NumberMatch& match,
+                   const std::function<void(TermId, const NumberGroup&)>& addCut);
     void evaluateParts(std::int64_t chunk, const IdSet& all, Bounds& bounds) const;
 
     ContentStore& store_;

@@ -72,7 +72,6 @@ void StoreWriter::begin() {
 void StoreWriter::commit() {
     flushPostings();
     transaction_->commit();
-    transaction_.reset();
 }
 
 void StoreWriter::put(ItemId id, const IndexedItem& item, const std::vector<std::string>& terms) {
@@ -114,7 +113,6 @@ void StoreWriter::remove(ItemId id) {
 }
 
 std::optional<ItemId> StoreWriter::idOfMoved(const IndexedItem& item) {
-    if (item.payloadHash.empty()) return std::nullopt;
     const auto firstGone = [&item](Statement& candidates) {
         std::optional<ItemId> id;
         while (!id && candidates.step()) {

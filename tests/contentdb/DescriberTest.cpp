@@ -2,6 +2,7 @@
 #include "contentdb/ContentDescriber.h"
 #include "formats/TGRTFileNode.h"
 #include "indexing/TGRTIndexableContentObject.h"
+#include "platform/files/ResourceBundle.h"
 #include "support/AudioFixtures.h"
 #include "support/RunTool.h"
 #include "support/TemporaryFolder.h"
@@ -218,6 +219,30 @@ TEST_F(Describing, HashesTheEndOfALongSoundAndItsNotes) {
             .payloadHash;
     };
     EXPECT_NE(withNotes(emptyMidi()), withNotes(emptyMidi() + "more"));
+}
+
+TEST_F(Describing, HashesABundleWhateverTheOrderOfItsFolder) {
+    // The files of a folder in memory come in the order in which they were made.
+    const std::string memory = "/dev/shm";
+    const TemporaryFolder folder(std::filesystem::is_directory(memory) ? memory : folder_.path());
+    for (const std::string names : {"ab", "ba"}) {
+        for (const char name : names)
+            folder.write(names + ".patch/" + name, std::string("settings of ") + name);
+    }
+    EXPECT_EQ(describe(folder.path("ab.patch")).payloadHash, describe(folder.path("ba.patch")).payloadHash);
+}
+
+TEST_F(Describing, IsAnotherWithOtherServicesAndOtherFiles) {
+    std::set<std::uint64_t> digests = {ContentDescriber::digest(0), ContentDescriber::digest(1)};
+    for (const char* bytes : {"1;", "2;"}) {
+        const std::string script = folder_.write("script.js", bytes);
+        for (const char* name : {"QVSearchKit", "ExtractSoftwareInstrumentsRule"}) {
+            ResourceBundle::setPathForResource(name, "js", script);
+            digests.insert(ContentDescriber::digest(0));
+            ResourceBundle::setPathForResource(name, "js", std::nullopt);
+        }
+    }
+    EXPECT_EQ(digests.size(), 6U);
 }
 
 TEST_F(Describing, SaysWhyAnItemCannotBeRead) {

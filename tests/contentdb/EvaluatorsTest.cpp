@@ -254,11 +254,15 @@ TEST(Evaluators, FindTheSimilarItemsThatComparingAllWouldFind) {
         for (const std::size_t limit : {std::size_t{1}, std::size_t{20}, items.size()})
             expectNearest(*database, items, at, limit);
     }
-    Error error;
-    EXPECT_FALSE(database->similar(items[7].path, 5, &error));
-    EXPECT_THAT(error.message(), testing::HasSubstr("could not be read when it was indexed"));
-    EXPECT_FALSE(database->similar(items[9].path, 5, &error));
-    EXPECT_THAT(error.message(), testing::HasSubstr("no tags, rhythm or tempo"));
+    const std::pair<std::string, std::string> refusals[] = {
+        {items[7].path, "could not be read when it was indexed"},
+        {items[9].path, "no tags, rhythm or tempo"},
+        {"/Library/none.wav", "not in the index"}};
+    for (const auto& [path, reason] : refusals) {
+        Error error;
+        EXPECT_FALSE(database->similar(path, 5, &error));
+        EXPECT_THAT(error.message(), testing::HasSubstr(path + ": " + reason));
+    }
 }
 
 TEST(Evaluators, FindTheSimilarItemsAmongManyOfTheSameTags) {

@@ -134,8 +134,9 @@ TEST_F(Indexing, ReadsAnItemAgainWhenWhatLiesBesideItChanges) {
         write(name, "sound");
     settle();
     index();
-    for (const std::string beside : {"Kick.wav.zxml", "Kick.wav.xml", "Kick.wav.caf", "Pad.cst.plist",
-                                     "Pad.cst.zxml", "Pad.cst.caf", "Bell.patch.xml", "Bell.patch.caf"}) {
+    for (const std::string beside :
+         {"Kick.wav.zxml", "Kick.wav.xml", "Kick.wav.caf", "Pad.cst.plist", "Pad.cst.zxml", "Pad.cst.caf",
+          "Bell.patch.xml", "Bell.patch.caf", "Bell.patch/sub/data"}) {
         // A sound is an item of its own as well, unless its name says that it is a preview of settings.
         const bool isItem = beside.ends_with(".caf") && beside != "Pad.cst.caf";
         for (const char* bytes : {"one", "another"}) {
@@ -435,8 +436,8 @@ TEST_F(Indexing, LosesOneItemToEachThatFailsCrashesOrHangs) {
         good.push_back("Kick" + std::to_string(i));
         write(good.back() + ".wav", "");
     }
-    for (const char* name :
-         {"A fails.wav", "B crashes.wav", "L hangs.wav", "Kick15 exits.wav", "M throws.wav", "N mumbles.wav"})
+    for (const char* name : {"A fails.wav", "B crashes.wav", "C fails beside.wav", "Kick15 exits.wav",
+                             "L hangs.wav", "M throws.wav", "N is silent.wav", "N mumbles.wav"})
         write(name, "");
     write("O.wav", std::string(17U << 20U, 'x'));
     settle();
@@ -447,22 +448,23 @@ TEST_F(Indexing, LosesOneItemToEachThatFailsCrashesOrHangs) {
     };
     const IndexProgress progress = index(limit);
     EXPECT_EQ(progress.described, 300U);
-    EXPECT_EQ(progress.failed, 7U);
+    EXPECT_EQ(progress.failed, 9U);
     EXPECT_THAT(names(), testing::UnorderedElementsAreArray(good));
     std::vector<std::string> reasons;
     ContentDatabase::open(database())->forEachFailure([&](const IndexedItem& item) {
         reasons.push_back(URL::fileURLWithPath(item.path).lastPathComponent() + ": " + item.failure);
         return true;
     });
-    EXPECT_THAT(reasons,
-                ElementsAre("A fails.wav: it is broken",
-                            HasSubstr("B crashes.wav: reading it crashed (Segmentation fault"),
-                            HasSubstr("Kick15 exits.wav: reading it ended the process (status 3)"),
-                            "L hangs.wav: reading it took longer than 1.5 s", "M throws.wav: out of luck",
-                            "N mumbles.wav: the describer failed and does not say why",
-                            HasSubstr("O.wav: its description takes 178")));
+    EXPECT_THAT(reasons, ElementsAre("A fails.wav: it is broken",
+                                     HasSubstr("B crashes.wav: reading it crashed (Segmentation fault"),
+                                     "C fails beside.wav: C fails beside.wav.plist: it is broken",
+                                     HasSubstr("Kick15 exits.wav: reading it ended the process (status 3)"),
+                                     "L hangs.wav: reading it took longer than 1.5 s",
+                                     "M throws.wav: out of luck", "N is silent.wav: no description",
+                                     "N mumbles.wav: the describer failed and does not say why",
+                                     HasSubstr("O.wav: its description takes 178")));
     EXPECT_EQ(index(useWorkers).failed, 0U);
-    EXPECT_EQ(index(limit).failed, 7U);
+    EXPECT_EQ(index(limit).failed, 9U);
 }
 
 TEST_F(Indexing, HearsWhatItsWorkersLogAndLeavesThemNoFile) {
@@ -473,6 +475,7 @@ TEST_F(Indexing, HearsWhatItsWorkersLogAndLeavesThemNoFile) {
     const int left = ::open(library().c_str(), O_RDONLY);
     const std::string note = folder_.path("note");
     ::setenv("QVCT_TEST_NOTE", note.c_str(), 1);
+    ResourceBundle::setDirectory("/resources");
     std::string open;
     const IndexProgress progress = index([&open](IndexOptions& options) {
         useWorkers(options);
@@ -482,6 +485,7 @@ TEST_F(Indexing, HearsWhatItsWorkersLogAndLeavesThemNoFile) {
         };
     });
     ::unsetenv("QVCT_TEST_NOTE");
+    ResourceBundle::setDirectory({});
     ::close(left);
     EXPECT_EQ(progress.described, 2U);
     EXPECT_THAT(open, testing::AllOf(HasSubstr("socket:"), testing::Not(HasSubstr("memfd:"))));
@@ -489,6 +493,7 @@ TEST_F(Indexing, HearsWhatItsWorkersLogAndLeavesThemNoFile) {
     EXPECT_THAT(log.messages(), UnorderedElementsAre("about A logs", "about B logs and crashes"));
     const auto item = ContentDatabase::open(database())->item(library() + "/C tells.wav");
     EXPECT_EQ(item->item.title, "/dev/nu /dev/nu socket: ");
+    EXPECT_THAT(item->item.packs, ElementsAre("/resources"));
     // In threads of the host the same is described, and fails, but for what crashes it.
     std::filesystem::remove(library() + "/B logs and crashes.wav");
     const IndexProgress again = index([](IndexOptions& options) { options.describer = 2; });
@@ -520,6 +525,7 @@ TEST_F(Indexing, SaysWhyNothingDescribes) {
         {greeting, fmt::format("is of version \"{}\", and \"{}\" is needed", version(), workerEdition())},
         {R"(printf '\1\0\0\0\11' >&0; read -r line)", "gave an answer that means nothing" + barren},
         {R"(printf '\0\0\0\177' >&0; read -r line)", "gave an answer that is too long" + barren},
+        {R"(printf '\0\0\0\0' >&0; read -r line)", "gave an answer that means nothing" + barren},
         // Takes away the memory that both see.
         {"(: >/proc/self/fd/1) 2>/dev/null; exit 1", "ended the process (status 1)" + barren}};
     for (const auto& [script, reason] : scripts)
@@ -591,6 +597,18 @@ TEST_F(Indexing, HearsOfSlowItemsBeforeAllAreDone) {
         options.progress = [&described](const IndexProgress& at) { described.insert(at.described); };
     });
     EXPECT_THAT(described, Contains(testing::AllOf(testing::Gt(0U), testing::Lt(count))));
+}
+
+TEST_F(Indexing, GivesWorkToThreadsThatHadNone) {
+    for (int i = 0; i < 200; ++i) write(fmt::format("Kick {}.wav", i), "");  // more than a queue holds
+    const IndexProgress progress = index([](IndexOptions& options) {
+        options.workers = 1;
+        options.isCancelled = [] {
+            std::this_thread::sleep_for(std::chrono::milliseconds(50));
+            return false;
+        };
+    });
+    EXPECT_EQ(progress.described, 200U);
 }
 
 TEST_F(Indexing, IsPatientWithAWorkerThatWaitsForIt) {
@@ -967,6 +985,9 @@ TEST_F(Indexing, ReadsTheDatabaseWholeWhenTold) {
     // Nothing that a checksum would tell.
     const std::pair<const char*, std::string> cases[] = {
         {"DELETE FROM posting WHERE key % 7 = 3", "the index does not say what the items say"},
+        {"DELETE FROM term WHERE id = (SELECT max(id) FROM term)", "is missing"},
+        {"UPDATE posting SET ids = x'00' WHERE key = (SELECT max(key) FROM posting)", "an index entry"},
+        {"UPDATE item SET description = x'05' WHERE id = 3", "the record of " + library() + "/Kick 10.wav"},
         {"UPDATE folder SET digest = digest + 1",
          library() + " does not hold the items that it is known by"}};
     for (const auto& [fault, reason] : cases) {

@@ -3,6 +3,7 @@
 #include "contentdb/IndexedItem.h"
 #include "platform/base/Log.h"
 #include "platform/files/FileAccess.h"
+#include "platform/files/ResourceBundle.h"
 #include "platform/text/Url.h"
 #include "support/RunTool.h"
 #include "taxonomy/TaggingTypes.h"
@@ -32,13 +33,17 @@ class NameDescriber : public contentdb::ItemDescriber {
         const auto is = [&item](std::string_view word) { return item.name.find(word) != std::string::npos; };
         if (is("vanishes")) std::filesystem::remove(path);
         if (is("fails") || !std::filesystem::exists(path)) {
-            qvct::fail(error, kErrorMalformed, "it is broken");
+            qvct::fail(error, kErrorMalformed, "it is broken", {path + (is("beside") ? ".plist" : "")});
             return std::nullopt;
         }
+        if (is("is silent")) return std::nullopt;
         if (is("logs")) log("about " + item.name);
         if (is("shouts")) log(std::string(1U << 18U, '!'));  // more than fits while nobody listens
         if (is("is held")) haveThisProcessHeld();
-        if (is("tells")) item.title = openFiles();
+        if (is("tells")) {
+            item.title = openFiles();
+            item.packs = {ResourceBundle::directory()};
+        }
         if (is("crashes")) {
             ::signal(SIGSEGV, SIG_DFL);  // a sanitizer would report it and exit
             ::raise(SIGSEGV);

@@ -58,6 +58,8 @@ IndexedItem item() {
                        {"Minor KeyType", "Loop Specifics", {"Key Type"}, {}, Provenance::virtualTag, {}}};
     result.values = {{"Tempo", 120.0}, {"BeatCount", 16.0}, {"Gain", -6.0}};
     result.packs = {"Dust & Grain"};
+    for (int i = 0; i < 40; ++i) result.title += "\xef\xac\x83";  // "ffi" in one character
+    result.title += " - Take";
     return result;
 }
 
@@ -69,6 +71,7 @@ TEST(QueryParser, UnderstandsWhatPeopleWrite) {
     const std::vector<Case> cases = {
         {"", true},
         {"dus loop", true},
+        {"warm electronic", true},
         {"dus \"loo\"", false},
         {"CAFE", true},
         {"\"deep house\"", true},
@@ -80,7 +83,10 @@ TEST(QueryParser, UnderstandsWhatPeopleWrite) {
         {"kick, snare dusty", false},
         {"kick snare , dusty", true},
         {", ,", true},
-        {"-", false},
+        {"-", true},
+        {"-\"deep techno\"", true},
+        {"kick,", false},
+        {"ffiffi take", true},
         {"tag:house", true},
         {"tag:Hous", false},
         {"genre:electronic", true},
@@ -93,7 +99,7 @@ TEST(QueryParser, UnderstandsWhatPeopleWrite) {
         {"level:Warm>=0.6 level:Warm<=0.6", true},
         {"level:Warm>0.6", false},
         {"level:\"Warm\":0.5..0.7", true},
-        {"level:Warm", true},
+        {"level:Warm level:Dark,Warm>=0.6", true},
         {"level:\"Deep House\"", false},
         {"bpm:118..124 tempo:120 bpm=120 bpm>119.5 bpm:<121", true},
         {"bpm>120", false},
@@ -109,6 +115,7 @@ TEST(QueryParser, UnderstandsWhatPeopleWrite) {
         {"name::^dusty.*\\d+bpm$", true},
         {"name::\"caf\xc3\xa9\\W\"", false},
         {"genre::^(deep|tech)", true},
+        {"bpm::^12.$ type::^loop$ pack::grain$ key::^asharp$ path::wav$", true},
         {"bpm+ name- dusty", true},
     };
     for (const Case& one : cases) {

@@ -3,6 +3,7 @@
 
 #include <filesystem>
 #include <functional>
+#include <set>
 
 #include <gmock/gmock.h>
 #include <sys/stat.h>
@@ -36,6 +37,9 @@ TEST(Store, KeepsEveryByteOfAnItem) {
     }
     Error error;
     EXPECT_TRUE(database->check(&error)) << error.message();
+    const std::vector<std::string> categories = database->vocabulary()->categories;
+    EXPECT_THAT(categories, testing::IsSupersetOf({"Artist", "Genres", "Rhythm"}));
+    EXPECT_EQ(std::set(categories.begin(), categories.end()).size(), categories.size());
 }
 
 void change(const std::string& path, const std::function<void(StoreWriter&)>& work, bool isWhole = true) {
@@ -121,6 +125,8 @@ TEST(Store, IsReadByOneWhoMayNotWriteThere) {
     for (const char* part : {"", "-wal"}) std::filesystem::rename(path + "2" + part, path + part);
     EXPECT_THAT(asStranger(count), HasSubstr("its last changes are still in the log beside it"));
     EXPECT_EQ(count(), "10");
+    Connection(path, Connection::Access::readWrite).run("PRAGMA user_version = 99");
+    EXPECT_THAT(asStranger(count), HasSubstr("newer version"));
 }
 
 TEST(Store, RefusesWhatIsNoContentDatabaseOfThisVersion) {
