@@ -130,7 +130,9 @@ TEST_F(Indexing, ReadsWhatHasChangedOnly) {
 }
 
 TEST_F(Indexing, ReadsAnItemAgainWhenWhatLiesBesideItChanges) {
-    for (const char* name : {"Kick.wav", "Kick.wav-2.wav", "Pad.cst", "Bell.patch/data"})
+    std::string deep = "Bell.patch";  // deeper than it is looked into
+    for (int i = 0; i < 20; ++i) deep += "/a";
+    for (const std::string& name : std::vector<std::string>{"Kick.wav", "Kick.wav-2.wav", "Pad.cst", deep})
         write(name, "sound");
     settle();
     index();
@@ -537,6 +539,7 @@ TEST_F(Indexing, SaysWhyNothingDescribes) {
     };
     using Made = std::unique_ptr<ItemDescriber>;
     const std::string silent = "the describer failed and does not say why";
+    EXPECT_EQ(problemOf(nullptr), "there is nothing that describes items");
     EXPECT_EQ(problemOf([] { return Made(); }), "there is nothing that describes items");
     EXPECT_EQ(problemOf([]() -> Made { throw std::runtime_error("out of luck"); }), "out of luck");
     EXPECT_EQ(problemOf([]() -> Made { throw std::runtime_error(""); }), silent);
@@ -796,6 +799,7 @@ TEST_F(Indexing, OfPartsUnitesToTheSameContent) {
         parts.push_back(folder_.path("part" + std::to_string(part)));
         sum += index([&](IndexOptions& options) {
                    options.database = parts.back();
+                   options.describer = 2;
                    options.part = part;
                    options.parts = 3;
                }).described;
@@ -810,6 +814,11 @@ TEST_F(Indexing, OfPartsUnitesToTheSameContent) {
     const auto united = ContentDatabase::open(merged);
     EXPECT_TRUE(united->check(&error)) << error.message();
     EXPECT_EQ(united->totals()->failures, 1);
+    const IndexProgress again = index([&merged](IndexOptions& options) {
+        options.database = merged;
+        options.describer = 2;
+    });
+    EXPECT_EQ(again.unchanged, 501U);
     const auto all = whole->search(*parseQuery("", {}, nullptr), 1000);
     for (const Found& found : *all) EXPECT_EQ(united->item(found.item.path)->item, found.item);
     EXPECT_FALSE(mergeDatabases(parts, merged, &error));
@@ -1081,8 +1090,14 @@ TEST_F(Indexing, TakesAnyNameAndCirclesOfLinks) {
                                           "\xf0\x9f\xa5\x81", "raw \xff\xfe", "-x,y:z"};
     for (const std::string& name : odd) write(name + ".wav", name);
     std::filesystem::create_directory_symlink(library(), library() + "/circle");
+    std::filesystem::create_symlink("nowhere", library() + "/dead.wav");
     settle();
-    EXPECT_EQ(index().described, odd.size());
+    std::vector<std::string> failures;
+    const auto hear = [&failures](IndexOptions& options) {
+        options.failed = [&failures](const Error& error) { failures.push_back(error.message()); };
+    };
+    EXPECT_EQ(index(hear).described, odd.size());
+    EXPECT_THAT(failures, ElementsAre(HasSubstr(library() + "/dead.wav: ")));
     EXPECT_THAT(names(), testing::UnorderedElementsAreArray(odd));
     EXPECT_THAT(names("\"\xf0\x9f\xa5\x81\""), ElementsAre("\xf0\x9f\xa5\x81"));
     EXPECT_THAT(names("%"), ElementsAre("100%_*"));

@@ -8,7 +8,7 @@ namespace {
 using namespace contentdb;
 using testing::HasSubstr;
 
-const Vocabulary kVocabulary = {{"Genres", "Source", "Sound Descriptors", "Sound Effects"},
+const Vocabulary kVocabulary = {{"Genres", "GENRES", "Source", "Sound Effects", "Sound Descriptors"},
                                 {"BeatCount", "Gain"}};
 
 TEST(QueryParser, PointsAtWhatIsWrong) {

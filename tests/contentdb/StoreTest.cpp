@@ -40,6 +40,7 @@ TEST(Store, KeepsEveryByteOfAnItem) {
     const std::vector<std::string> categories = database->vocabulary()->categories;
     EXPECT_THAT(categories, testing::IsSupersetOf({"Artist", "Genres", "Rhythm"}));
     EXPECT_EQ(std::set(categories.begin(), categories.end()).size(), categories.size());
+    EXPECT_THAT(database->vocabulary()->numbers, testing::Contains("Gain"));
 }
 
 void change(const std::string& path, const std::function<void(StoreWriter&)>& work, bool isWhole = true) {
