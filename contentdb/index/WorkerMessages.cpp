@@ -43,7 +43,7 @@ std::string encodedTask(const ItemTask& task) {
     ByteWriter out;
     out.number(task.ticket);
     out.text(task.path);
-    out.stamp(task.stamp);
+    out.stamp(task.stamp);  // an item is found by its size, too
     return out.take();
 }
 
