@@ -23,7 +23,8 @@ void merge(const Options& options, ToolContext& context) {
     const auto totals = merged ? merged->totals(&error) : std::nullopt;
     if (!totals) return context.itemFailed(error);
     if (context.format == Format::table)
-        return print("{}, {} of them failed\n", counted(totals->items, "item"), totals->failures);
+        return print("{}, {} of them failed\n", counted(static_cast<std::uint64_t>(totals->items), "item"),
+                     totals->failures);
     printJson(Json{{"database", options.target}, {"items", totals->items}, {"failed", totals->failures}},
               context.format);
 }
@@ -47,8 +48,8 @@ void check(const Options& options, ToolContext& context) {
             return true;
         });
         if (context.format == Format::table)
-            print("{}: intact, {}, {} of them failed\n", printable(path), counted(totals->items, "item"),
-                  totals->failures);
+            print("{}: intact, {}, {} of them failed\n", printable(path),
+                  counted(static_cast<std::uint64_t>(totals->items), "item"), totals->failures);
         json.push_back(
             {{"database", path}, {"intact", true}, {"items", totals->items}, {"failures", failures}});
     }
