@@ -171,8 +171,8 @@ class LocationPathParser {
     static bool isDigit(char c) { return c >= '0' && c <= '9'; }
     static bool isNameCharacter(char c) { return isLetter(c) || isDigit(c) || c == '-' || c == '.'; }
 
-    /// A name without prefix. Names with other than ASCII letters, and those of functions, do not fit the
-    /// form.
+    /// A name of ASCII letters. What goes on with a prefix, an argument list or another letter does not fit
+    /// the form: nothing that may follow a name begins like that.
     std::optional<std::string> takeName() {
         skipBlanks();
         if (rest_.empty() || !isLetter(rest_.front())) return std::nullopt;
@@ -180,10 +180,7 @@ class LocationPathParser {
         while (length < rest_.size() && isNameCharacter(rest_[length])) ++length;
         std::string name(rest_.substr(0, length));
         rest_.remove_prefix(length);
-        skipBlanks();
-        const bool goesOn = !rest_.empty() && (rest_.front() == ':' || rest_.front() == '(' ||
-                                               static_cast<unsigned char>(rest_.front()) >= 0x80);
-        return goesOn ? std::nullopt : std::optional(std::move(name));
+        return name;
     }
 
     bool takePath() {
