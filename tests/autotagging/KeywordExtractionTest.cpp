@@ -59,6 +59,9 @@ TEST(KeywordExtraction, FindsWholeWordsInAnyCase) {
     const auto extractor = QVCTKeywordExtractor::initWithKeywordMappingDictionary(mapping, smallTaxonomy());
     for (const auto& c : cases)
         EXPECT_EQ(texts(extractor->extractKeywordsFromString(c.text)), c.found) << c.text;
+    EXPECT_EQ(texts(extractor->extractKeywordsFromString(std::string_view("Kicks").substr(0, 4))),
+              (std::vector<std::string>{"Kick", "Drums"}))
+        << "what lies behind the text does not count";
 }
 
 TEST(KeywordExtraction, CountsWhatIsFoundBothWaysAndOneLevelOfParents) {
@@ -68,6 +71,15 @@ TEST(KeywordExtraction, CountsWhatIsFoundBothWaysAndOneLevelOfParents) {
     // As a key and as a member of the keyword set: each time its two labels and itself; then the parent.
     EXPECT_EQ(found.count("Kick"), 4U);
     EXPECT_EQ(found.count("Drums"), 3U);
+}
+
+TEST(KeywordExtraction, WithoutAMappingFileThereIsNone) {
+    Error error;
+    EXPECT_EQ(QVCTKeywordExtractor::keywordExtractorWithKeywordMappingDictionaryURL(std::nullopt), nullptr);
+    const URL missing = URL::fileURLWithPath("/missing.plist");
+    EXPECT_EQ(QVCTKeywordExtractor::keywordExtractorWithKeywordMappingDictionaryURL(missing, &error),
+              nullptr);
+    EXPECT_EQ(error.path, "/missing.plist");
 }
 
 TEST(KeywordExtraction, FollowsATaxonomyThatGrows) {

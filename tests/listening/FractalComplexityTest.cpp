@@ -24,6 +24,9 @@ TEST(FractalComplexity, ScoresHalvesByTheirDifference) {
     EXPECT_FLOAT_EQ(distance(notesAt({{0, 127}})), 0.75F);
     EXPECT_FLOAT_EQ(distance(notesAt({{0.5, 127}})), 0.75F)
         << "a note on a cell's end belongs to the next cell";
+    EXPECT_FLOAT_EQ(distance(notesAt({{1.6, 90}, {0.5, 127}, {0, 127}})),
+                    distance(notesAt({{0, 127}, {0.5, 127}, {1.6, 90}})))
+        << "the order of the notes does not matter";
     EXPECT_EQ(distance(notesAt({{-0.1, 127}, {2, 127}})), 0) << "notes outside belong to none";
     EXPECT_EQ(distance(notesAt({{0.2, 10}, {0.1, 127}, {1, 10}})), 0) << "the first in the vector counts";
     EXPECT_EQ(fractal.testDistance(), 0);

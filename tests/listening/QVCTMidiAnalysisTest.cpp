@@ -1,4 +1,6 @@
+#include "listening/rhythm/LoopRhythm.h"
 #include "listening/rhythm/QVCTMidiAnalysis.h"
+#include "media/midi/MidiSequence.h"
 
 #include <chrono>
 #include <cmath>
@@ -55,6 +57,18 @@ TEST(QVCTMidiAnalysis, CutsBeatsIntoHalvesAndThirds) {
         analysisOf(beats, 3, 4, {{0, 100}})->computeRhythmicComplexity(&detail);
         EXPECT_EQ(detail.divisions, divisions) << beats;
     }
+}
+
+TEST(QVCTMidiAnalysis, MeasuresNoLoopThatIsTooLong) {
+    const std::string withoutTracks("MThd\0\0\0\6\0\1\0\0\0\x60", 14);
+    const auto sequence = MidiSequence::parse(
+        {reinterpret_cast<const std::uint8_t*>(withoutTracks.data()), withoutTracks.size()});
+    ASSERT_TRUE(sequence);
+    EXPECT_TRUE(notesOfFirstTrack(*sequence).empty());
+    RhythmDetail detail;
+    const auto analysis = analysisOf(QVCTMidiAnalysis::kLongestLoop + 4, 4, 4, {{0, 100}, {1, 90}});
+    EXPECT_EQ(analysis->computeRhythmicComplexity(&detail), 0);
+    EXPECT_EQ(detail.reasonForZero, "it is longer than 16384 beats");
 }
 
 TEST(QVCTMidiAnalysis, ShiftsOnlyOnce) {

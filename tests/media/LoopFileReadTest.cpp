@@ -70,6 +70,8 @@ TEST(LoopFileRead, AChunkThatIsAByteTooShortSaysNothing) {
     ASSERT_TRUE(data);
     EXPECT_FALSE(data->hasLoopTypeChunks());
     EXPECT_EQ(data->midiRootNote(), -1);
+    const std::string sampler = wav.chunk("smpl", std::string(12, '\x01') + test::little(61, 4));
+    EXPECT_EQ(parserOf(wav.file(wav.format() + sampler + wav.data()))->fileData()->midiRootNote(), 61);
 }
 
 TEST(LoopFileRead, TakesTheMusicOfAiffFilesAndLeavesLoopPointsOut) {
@@ -124,8 +126,9 @@ TEST(LoopFileRead, TellsMinorFromMajorInKeySignatures) {
     struct {
         const char* text;
         int keyType;
-    } const cases[] = {{"A minor", 1}, {"A Minor", 1}, {"F#m", 1},    {"Bb min", 1},      {"C", 2},
-                       {"CM", 2},      {"D MAJOR", 2}, {"Eb-maj", 2}, {"G mixolydian", 0}};
+    } const cases[] = {{"A minor", 1}, {"A Minor", 1}, {"F#m", 1},    {"Bb min", 1},       {"C", 2},
+                       {"CM", 2},      {"D MAJOR", 2}, {"Eb-maj", 2}, {"G mixolydian", 0}, {"Hm", 0},
+                       {"", 0}};
     for (const auto& c : cases) {
         const std::string information = big(1, 4) + "key signature" + '\0' + c.text + '\0';
         const auto data =
@@ -244,6 +247,10 @@ TEST(LoopFileRead, HostileAndDamagedFiles) {
         {"wav-two-formats", wav.file(format + wav.format(1, 8000, 8) + data), nullptr, 1000},
         {"rf64-without-sizes", Wav{"RF64"}.file(format + data), nullptr, 1000},
         {"rf64-called-wav", Wav{"RF64"}.longFile(format, 400), nullptr, 100},
+        {"rf64-other-long-chunks",
+         Wav{"RF64"}.longFile(format + "huge" + test::little(0xFFFFFFFF, 4) + "abcd", 400, "",
+                              "none" + test::little(2, 8) + "huge" + test::little(4, 8)),
+         nullptr, 100},
         {"ds64-in-a-plain-wav", wav.file(wav.chunk("ds64", std::string(28, '\xFF')) + format + data), nullptr,
          1000},
         {"aiff-without-format", Aiff::file(Aiff::sound()), "no chunk 'COMM'", 0},

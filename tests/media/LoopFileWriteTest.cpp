@@ -99,6 +99,20 @@ std::vector<Sound> soundFiles() {
     };
 }
 
+TEST(LoopFileWrite, ComparingSeesPadBytesAndWhatLiesBehindTheChunks) {
+    const TemporaryFolder folder;
+    const Wav wav;
+    const std::string chunks = wav.format() + wav.data() + wav.chunk("odd ", "abc");
+    const auto fingerprint = [&](const std::string& bytes) {
+        return fingerprintOfFile(URL::fileURLWithPath(folder.write("a.wav", bytes)));
+    };
+    const auto before = fingerprint(wav.file(chunks) + "tail");
+    const std::string otherPad = chunks.substr(0, chunks.size() - 1) + "x";
+    EXPECT_THAT(before->differences(*fingerprint(wav.file(otherPad) + "tail")), testing::SizeIs(1));
+    EXPECT_THAT(before->differences(*fingerprint(wav.file(chunks) + "tall")), testing::SizeIs(1));
+    EXPECT_THAT(before->differences(*fingerprint(wav.file(chunks))), testing::SizeIs(1));
+}
+
 TEST(LoopFileWrite, ARecordComesBackAndEveryOtherByteStays) {
     for (const Sound& sound : soundFiles()) {
         const TemporaryFolder folder;

@@ -150,6 +150,11 @@ TEST(MidiSequence, ReadsWhatADamagedTrackStillHolds) {
         EXPECT_EQ(text(sequence->tracks()[0].notes[0]), note(0, 1, 0, 60, 9));
         EXPECT_EQ(sequence->problems().size(), 1U);
     }
+    Bytes crowded = header(1, 1000, 96);
+    for (int i = 0; i < 1000; ++i) crowded = std::move(crowded) + track({0, 60, 9});
+    EXPECT_EQ(MidiSequence::parse(crowded)->problems().size(), 32U);
+    const auto coarse = header(0, 1, 1) + track(Bytes{2, 0x90, 60, 9, 3, 60, 0} + kEnd);
+    EXPECT_THAT(notes(coarse), testing::ElementsAre(note(2, 3, 0, 60, 9))) << "ticks as long as a quarter";
     const auto stray = MidiSequence::parse(oneTrack({0, 60, 9}));
     ASSERT_EQ(stray->problems().size(), 1U);
     EXPECT_THAT(stray->problems()[0].message(), testing::StartsWith("byte 24: a data byte without"));

@@ -118,6 +118,7 @@ TEST(NullPointers, AreInputsThatAnItemDoesNotHave) {
 TEST(NullPointers, AreFunctionsThatNobodyCalls) {
     const TemporaryFolder folder;
     folder.write("Kick.wav", "no sound");
+    std::filesystem::create_symlink("nowhere", folder.path("Snare.wav"));
     walkContent(folder.path(), nullptr, nullptr);
     walkContent(folder.path("nowhere"), nullptr, nullptr);
     Error error;

@@ -15,6 +15,7 @@ TEST(Url, KeepsEveryByteOfAPathThroughItsStringForm) {
         EXPECT_EQ(URL::URLWithString(url.absoluteString()).path(), path);
         EXPECT_EQ(url.decodedString(), std::string("file://") + path);
     }
+    EXPECT_EQ(URL::URLWithString("file:///%c3%B6%4a%zz%4").path(), "/\xc3\xb6J%zz%4");
 }
 
 TEST(Url, FindsComponentsAndExtensions) {

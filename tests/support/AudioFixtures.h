@@ -61,14 +61,15 @@ struct Wav {
     std::string file(const std::string& chunks) const {
         return magic + number(4 + chunks.size(), 4) + "WAVE" + chunks;
     }
-    /// RF64 or BW64: the sizes of the form and of `data` stand in `ds64`.
+    /// RF64 or BW64: the sizes of the form and of `data` stand in `ds64`, those of other chunks in its table.
     std::string longFile(const std::string& chunksBefore, std::size_t dataSize,
-                         const std::string& chunksBehind = {}) const {
+                         const std::string& chunksBehind = {}, const std::string& table = {}) const {
         const std::string data =
             "data" + little(0xFFFFFFFF, 4) + noise(dataSize) + std::string(dataSize % 2, '\0');
         const std::string rest = chunksBefore + data + chunksBehind;
-        const std::string sizes = chunk("ds64", little(4 + 36 + rest.size(), 8) + little(dataSize, 8) +
-                                                    little(dataSize / 4, 8) + little(0, 4));
+        const std::string sizes =
+            chunk("ds64", little(4 + 36 + table.size() + rest.size(), 8) + little(dataSize, 8) +
+                              little(dataSize / 4, 8) + little(table.size() / 12, 4) + table);
         return magic + little(0xFFFFFFFF, 4) + "WAVE" + sizes + rest;
     }
 };

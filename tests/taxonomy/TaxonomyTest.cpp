@@ -200,6 +200,9 @@ TEST(Taxonomy, ReadOnlyRefusesButForContentPacks) {
     const auto taxonomy = TGRTTaxonomy::newTaxonomyOfType(kDefaultTaxonomy, true, false);
     EXPECT_EQ(taxonomy->findOrCreateTagWithLabel("New", "House", "Genres"), nullptr);
     EXPECT_EQ(taxonomy->findOrCreateCategoryWithIdentifier("New"), nullptr);
+    const auto writable = TGRTTaxonomy::newTaxonomyOfType(kDefaultTaxonomy, false, false);
+    taxonomy->addCategory(writable->findOrCreateCategoryWithIdentifier("New"));
+    EXPECT_EQ(taxonomy->findCategoryWithIdentifier("New"), nullptr);
     EXPECT_EQ(taxonomy->findOrCreateSoundPackTagWithIdentifier(""), nullptr);
     const auto pack = taxonomy->findOrCreateSoundPackTagWithIdentifier("9999_new");
     ASSERT_NE(pack, nullptr);

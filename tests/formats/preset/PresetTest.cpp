@@ -89,6 +89,8 @@ TEST(Presets, KeepLinesThatMakeNoSenseWhereTheyStand) {
          "<tagging>\nName = Orphan\nWeight = abc\nAutoTagging = yes\nCategory = A\nName = B\n</tagging>\n"},
         {"<tagging>\nCategory = Genres\nName = House\nCategory = Source\nWeight = 0.5\n</tagging>\n",
          "<tagging>\nWeight = 0.5\nCategory = Genres\nName = House\n</tagging>\n"},
+        {"<tagging>\nCategory = A\nName = B\nCategory = C\nName = D\nCategory = A\nName = E\n</tagging>\n",
+         "<tagging>\nCategory = A\nName = B\nName = E\nCategory = C\nName = D\n</tagging>\n"},
         {"<metadata>\nText = orphan\nKey = Tempo\nNumber = 120,5\nText = fast\nKey = Empty\nKey = Key\n"
          "Number = 1e999\nKey = Beats\nNumber = 8\n</metadata>\n",
          "<metadata>\nText = orphan\nKey = Tempo\nNumber = 120,5\nKey = Empty\nKey = Key\n"
