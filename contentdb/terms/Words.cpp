@@ -22,6 +22,7 @@ std::u16string normalized(const UNormalizer2* form, const std::u16string& text) 
         result.resize(static_cast<std::size_t>(needed));
         needed = unorm2_normalize(form, text.data(), length, result.data(), size(), &status);
     }
+    if (U_FAILURE(status) != 0) return text;
     result.resize(static_cast<std::size_t>(needed));
     return result;
 }
