@@ -71,13 +71,13 @@ void addNumber(IndexedItem& item, std::string_view key, double number) {
 void addValues(IndexedItem& item, const ObjectSet<TGRTKeyValue>& values) {
     std::unordered_set<std::string> keys;
     for (const auto& keyValue : values) {
-        const auto& value = keyValue->numberValue();
-        const auto number = value ? value->doubleValue() : std::nullopt;
         if (const auto& text = keyValue->stringValue()) {
             keys.insert(keyValue->key());
             item.values.push_back({keyValue->key(), *text});
-        } else if (number && isKnown(keyValue->key(), *number) && keys.insert(keyValue->key()).second) {
-            item.values.push_back({keyValue->key(), decimalOf(*number)});
+        } else if (const auto& value = keyValue->numberValue()) {
+            const auto number = value->doubleValue();
+            if (number && isKnown(keyValue->key(), *number) && keys.insert(keyValue->key()).second)
+                item.values.push_back({keyValue->key(), decimalOf(*number)});
         }
     }
 }

@@ -106,7 +106,7 @@ TEST_F(LibraryCommands, KnowItemsAgainThatWereMovedAndTagged) {
     EXPECT_EQ(again["pruned"], 0);
     const json thump = run({"search", "thump genre:jazz"}).json()[0];
     EXPECT_EQ(thump["id"], kick["id"]);
-    EXPECT_EQ(thump["earlierPaths"], json({kick["path"]}));
+    EXPECT_EQ(thump["earlierPaths"], json::array({kick["path"]}));
     EXPECT_EQ(runTool({"db", "check", folder_.path("db")}).status, 0);
 }
 
