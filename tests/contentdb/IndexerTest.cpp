@@ -294,6 +294,19 @@ TEST_F(Indexing, TakesAFolderOnceThatSeveralRootsShow) {
     EXPECT_EQ(index(pruning).missing, 3U);
 }
 
+TEST_F(Indexing, KnowsAFolderAgainThatIsReachedByAnotherPath) {
+    write("a/Kick.wav", "Kick");
+    std::filesystem::create_directory_symlink("a", library() + "/z");
+    settle();
+    index([this](IndexOptions& options) { options.folders = {library() + "/z"}; });
+    index([](IndexOptions& options) { options.prune = true; });
+    const auto found = ContentDatabase::open(database());
+    EXPECT_EQ(names().size(), 1U);
+    const auto kick = found->item(library() + "/a/Kick.wav");
+    ASSERT_TRUE(kick);
+    EXPECT_THAT(*found->earlierPaths(kick->id), ElementsAre(library() + "/z/Kick.wav"));
+}
+
 TEST_F(Indexing, ForgetsMissingFilesOnlyWhenTold) {
     for (const char* name : {"Kick.wav", "gone/Snare.wav", "gone/deep/Hat.wav", "Clap.wav"})
         write(name, name);
