@@ -127,6 +127,17 @@ TEST_F(RulesCommand, EndsWhereAScriptCannotBeStopped) {
     }
 }
 
+TEST_F(RulesCommand, WhatWasFoundBeforeAScriptThatEndsTheProcessIsPrinted) {
+    folder_.write("B.patch/org.qvcontenttagging.intermediate.cache.xml", "<Deadly/>");
+    const std::string rules = folder_.write(
+        "r.plist", ruleList({scriptRule("function main() { if (document.isMatchingXPath('//Deadly')) "
+                                        "new Array(1e8).fill(0); return [{label: 'Swing'}]; }")}));
+    const ToolResult result = runTool(
+        {"autotag", "--json", "--services", "rules", "--rules", rules, patch_, folder_.path("B.patch")});
+    EXPECT_EQ(result.status, 1);
+    EXPECT_THAT(result.output, HasSubstr("Swing"));
+}
+
 /// A taxonomy, a keyword mapping, rules, a record and a description, each of whose texts clears the screen.
 TEST_F(RulesCommand, NoTextOfAFileReachesTheTerminalAsACommand) {
     const std::string clear =

@@ -627,6 +627,18 @@ TEST_F(Indexing, GivesWorkToThreadsThatHadNone) {
     EXPECT_EQ(progress.described, 200U);
 }
 
+TEST_F(Indexing, HasEachItemDescribedOnce) {
+    constexpr std::size_t count = 500;  // several queues full
+    for (std::size_t i = 0; i < count; ++i) write(fmt::format("logs {}.wav", i), "");
+    settle();
+    const CapturedLog log;
+    index([](IndexOptions& options) {
+        useWorkers(options);
+        options.workers = 1;
+    });
+    EXPECT_EQ(log.messages().size(), count);
+}
+
 TEST_F(Indexing, IsPatientWithAWorkerThatWaitsForIt) {
     write("Kick shouts.wav", "");
     settle();
@@ -699,6 +711,13 @@ TEST_F(Indexing, IsDescribedByOurWorkersAsInThisProcess) {
     EXPECT_EQ(item, ContentDatabase::open(folder_.path("threads"))->item(path)->item);
     EXPECT_THAT(item.taggings, Contains(testing::Field(&IndexedTagging::label, "House")));
     EXPECT_THAT(log.messages(), ElementsAre(HasSubstr(broken + ": ")));
+}
+
+TEST_F(Indexing, AWorkerThatIsStartedByHandSaysThatItDoesNothing) {
+    const std::string said = folder_.path("said");
+    const std::string command = std::string(QVCT_INDEX_WORKER) + " </dev/null 2>'" + said + "'";
+    EXPECT_NE(std::system(command.c_str()), 0);
+    EXPECT_THAT(test::readAll(said), HasSubstr("does nothing by itself"));
 }
 
 TEST_F(Indexing, GoesOnWhereItWasKilled) {

@@ -478,6 +478,19 @@ TEST(LoopFileWrite, AWavThatWouldOutgrowItsSizesIsRefused) {
     EXPECT_EQ(std::filesystem::file_size(path), kFormSize + 8);
 }
 
+TEST(LoopFileWrite, ARecordThatNoPropertyListCanHoldLeavesTheOldOne) {
+    const TemporaryFolder folder;
+    const std::string path = folder.write("a.caf", Caf::file(Caf::description() + Caf::data()));
+    ASSERT_TRUE(tag(path));
+    const std::string before = contentsOf(path);
+    const auto data = read(path);
+    data->setTaggingDictionary({{"Genres", std::string("cut\0here", 8)}});
+    Error error;
+    EXPECT_FALSE(write(path, data, &error));
+    EXPECT_THAT(error.message(), testing::AllOf(HasSubstr(path), HasSubstr("no property list can hold")));
+    EXPECT_EQ(contentsOf(path), before);
+}
+
 TEST(LoopFileWrite, NullDataAndOtherFilesFailWithAReason) {
     const TemporaryFolder folder;
     const std::string text = folder.write("a.wav", "no sound");

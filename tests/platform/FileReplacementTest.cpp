@@ -337,7 +337,7 @@ bool writeAndMeanwhile(const std::string& path, const std::function<bool()>& wor
 /// Sends a signal to a process in the middle of writing `path`; how the process ended.
 int statusAfterSignal(const std::string& path, int signal, bool isIgnored = false) {
     return statusOfProcess([&] {
-        if (isIgnored) std::signal(signal, SIG_IGN);
+        std::signal(signal, isIgnored ? SIG_IGN : SIG_DFL);  // whatever this process was started with
         return writeAndMeanwhile(path, [&] { return ::raise(signal) == 0; });
     });
 }
