@@ -7,6 +7,7 @@
 #include "formats/QVContentTaggingTypes.h"
 #include "indexing/TGRTIndexableContentObject.h"
 #include "media/loopfile/LCFileData.h"
+#include "platform/base/BytesAsText.h"
 #include "platform/base/Version.h"
 #include "platform/files/FileAccess.h"
 #include "platform/text/Decimal.h"
@@ -147,7 +148,7 @@ std::uint64_t ContentDescriber::digest(std::uint64_t services) {
         const auto bytes = path ? readFile(*path) : std::nullopt;
         if (!bytes) continue;
         digest.add(resource.name);
-        digest.add({reinterpret_cast<const char*>(bytes->data()), bytes->size()});
+        digest.add(textOf(*bytes));
     }
     return digest.value();
 }

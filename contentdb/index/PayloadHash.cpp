@@ -4,6 +4,7 @@
 #include "formats/QVContentTaggingTypes.h"
 #include "formats/preset/PresetRecord.h"
 #include "media/loopfile/LCFileData.h"
+#include "platform/base/BytesAsText.h"
 #include "platform/files/RandomAccessReader.h"
 #include "taxonomy/TaggingTypes.h"
 
@@ -44,7 +45,7 @@ struct Payload {
 bool addBlock(Payload& payload, const RandomAccessReader& file, std::uint64_t offset, std::uint64_t size) {
     std::array<std::uint8_t, kBlock * kBlocks> buffer;
     if (!file.read(offset, std::span(buffer).first(size))) return false;
-    payload.digest.add(std::string_view(reinterpret_cast<const char*>(buffer.data()), size));
+    payload.digest.add(textOf(std::span(buffer).first(size)));
     return true;
 }
 
@@ -71,14 +72,14 @@ bool addAudio(Payload& payload, ItemFile& file) {
     if (!audio) return false;
     const LCAudioFacts& facts = audio->facts();
     const PropertyList::Data& notes = audio->midiData();
-    if (!notes.empty()) payload.add({reinterpret_cast<const char*>(notes.data()), notes.size()});
+    if (!notes.empty()) payload.add(textOf(notes));
     return facts.audioSize == 0 || addRange(payload, *file.reader(), facts.audioOffset, facts.audioSize);
 }
 
 bool addPreset(Payload& payload, ItemFile& file) {
     const auto bytes = file.bytes(kLargestPreset);
     if (!bytes) return false;
-    const auto preset = PresetText::parse({reinterpret_cast<const char*>(bytes->data()), bytes->size()});
+    const auto preset = PresetText::parse(textOf(*bytes));
     if (preset) payload.add(textWithoutRecord(*preset));
     return preset.has_value();
 }

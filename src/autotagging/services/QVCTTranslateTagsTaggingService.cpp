@@ -5,6 +5,7 @@
 #include "formats/audiofile/TGRTTavioLoopMetaDataReader.h"
 #include "formats/preset/TGRTVorthalLegacyTaggingParser.h"
 #include "media/loopfile/LCFileData.h"
+#include "platform/base/BytesAsText.h"
 #include "platform/files/FileAccess.h"
 #include "taxonomy/TaggingTypes.h"
 
@@ -21,8 +22,7 @@ ObjectSet<TGRTTagging> translatedTaggings(ItemFile& file, const std::shared_ptr<
     if (QVContentTaggingTypes::fallBackFileTypeForURL(file.url()) != kFileTypeSynthPreset) return {};
     const auto bytes = file.bytes(kLargestWholeFile);
     if (!bytes) return {};
-    return TGRTVorthalLegacyTaggingParser::mappedTaggingsForText(
-        {reinterpret_cast<const char*>(bytes->data()), bytes->size()});
+    return TGRTVorthalLegacyTaggingParser::mappedTaggingsForText(textOf(*bytes));
 }
 
 }  // namespace

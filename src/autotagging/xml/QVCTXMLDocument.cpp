@@ -3,6 +3,7 @@
 #include "autotagging/xml/QVCTXMLParser.h"
 #include "autotagging/xml/XPathExpression.h"
 #include "formats/ItemFile.h"
+#include "platform/base/BytesAsText.h"
 #include "platform/base/Log.h"
 #include "platform/data/Json.h"
 #include "platform/data/XmlParsing.h"
@@ -53,8 +54,7 @@ std::shared_ptr<QVCTXMLDocument> documentInFile(ItemFile& file, bool isCompresse
     }
     if (!xml) log(error.message());
     const std::vector<std::uint8_t> bytes = std::move(xml).value_or(std::vector<std::uint8_t>{});
-    return QVCTXMLDocument::initWithXMLData({reinterpret_cast<const char*>(bytes.data()), bytes.size()},
-                                            path);
+    return QVCTXMLDocument::initWithXMLData(textOf(bytes), path);
 }
 
 }  // namespace

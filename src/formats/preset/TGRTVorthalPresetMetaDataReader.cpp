@@ -3,6 +3,7 @@
 #include "formats/ItemFile.h"
 #include "formats/preset/PresetRecord.h"
 #include "formats/preset/TGRTVorthalLegacyTaggingParser.h"
+#include "platform/base/BytesAsText.h"
 
 #include <array>
 
@@ -25,7 +26,7 @@ std::shared_ptr<TGRTMetaData> TGRTVorthalPresetMetaDataReader::readMetaDataFromF
                                                                                     Error* error) const {
     const auto bytes = file.bytes(kLargestPreset, error);
     if (!bytes) return nullptr;
-    const std::string_view text(reinterpret_cast<const char*>(bytes->data()), bytes->size());
+    const std::string_view text = textOf(*bytes);
     const auto preset = PresetText::parse(text, error);
     if (!preset) {
         failIn(file.url().path(), error);

@@ -1,5 +1,6 @@
 #include "platform/data/PropertyListEncoding.h"
 
+#include "platform/base/BytesAsText.h"
 #include "platform/text/Text.h"
 
 #include <algorithm>
@@ -55,7 +56,7 @@ std::size_t loneSurrogate(std::u16string_view units) {
 std::optional<PropertyListCharacters> PropertyListCharacters::decode(std::span<const std::uint8_t> bytes,
                                                                      PropertyListFault& fault) {
     PropertyListCharacters result;
-    result.original_ = {reinterpret_cast<const char*>(bytes.data()), bytes.size()};
+    result.original_ = textOf(bytes);
     const Mark mark = markOf(result.original_);
     result.skipped_ = mark.isSkipped ? mark.bytes.size() : 0;
     result.original_.remove_prefix(result.skipped_);

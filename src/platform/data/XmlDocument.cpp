@@ -1,5 +1,6 @@
 #include "platform/data/XmlDocument.h"
 
+#include "platform/base/BytesAsText.h"
 #include "platform/data/XmlParsing.h"
 #include "platform/files/Decompression.h"
 #include "platform/files/FileAccess.h"
@@ -13,10 +14,6 @@ namespace {
 
 /// A file this large takes several times its size in memory once it is parsed.
 constexpr std::uint64_t kLargestXmlFile = 64ULL << 20U;
-
-std::string_view textOf(const std::vector<std::uint8_t>& bytes) {
-    return {reinterpret_cast<const char*>(bytes.data()), bytes.size()};
-}
 
 }  // namespace
 
