@@ -95,6 +95,16 @@ TEST(LoopReader, ReadsLoopsAndOtherAudio) {
     EXPECT_EQ(read(folder.write("broken.wav", "RIFF")), nullptr);
 }
 
+TEST(LoopReader, AddsNoOldKeywordsToWhatIsNoLoop) {
+    const TemporaryFolder folder;
+    const URL url = urlOf(folder.write("shot.caf", plain()));
+    const auto data = LCFileParser::fileParserForURL(url)->fileData();
+    data->setDescriptors({"Cheerful"});
+    ASSERT_TRUE(LCFileWriter::fileWriterForURL(url)->writeFileData(data));
+    const auto reader = TGRTTavioLoopMetaDataReader::initWithTaxonomy(TGRTTaxonomy::defaultTaxonomy());
+    EXPECT_THAT(textsOf(reader->readMetaDataFromURL(url, 3)->taggings()), IsEmpty());
+}
+
 TEST(AudioWriters, KeepOrClearTheLoopType) {
     const TemporaryFolder folder;
     const auto taggings = test::taggingsOf({{"Genres", "Techno"}}, 0.5);

@@ -1,4 +1,5 @@
 #include "FormatsSupport.h"
+#include "formats/ContentFolderWalk.h"
 #include "formats/QVContentEditorFileUtilities.h"
 #include "formats/TGRTFileNode.h"
 #include "formats/TGRTMetaDataReaderFactory.h"
@@ -238,6 +239,19 @@ void expectInOrder(const TemporaryFolder& folder, const std::vector<std::string>
         std::filesystem::remove(found->path());
     }
     EXPECT_EQ(lookUp(), std::nullopt);
+}
+
+TEST(FolderWalk, GoesOnWhereNobodyHearsOfWhatCannotBeRead) {
+    const TemporaryFolder folder;
+    folder.write("b/Kick.wav", "");
+    std::filesystem::create_symlink("nowhere", folder.path("a.wav"));
+    std::vector<std::size_t> items;
+    const auto count = [&items](const ContentFolder& found) {
+        items.push_back(found.items.size());
+        return true;
+    };
+    EXPECT_TRUE(walkContentFolders(folder.path(), count, nullptr));
+    EXPECT_THAT(items, ElementsAre(0U, 1U));
 }
 
 TEST(FileUtilities, LookForCompanionsInTheirOrder) {
