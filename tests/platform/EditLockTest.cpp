@@ -89,6 +89,7 @@ TEST(EditLock, IsNeitherHeldNorEndedByAProcessThatWasForkedMeanwhile) {
 TEST(EditLock, OfAnotherProcessIsWaitedForAndNamed) {
     const TemporaryFolder folder;
     const std::string item = folder.write("item", "x");
+    const auto older = EditLock::acquire(folder.write("older/item", "x"));
     int held[2];
     ASSERT_EQ(::pipe(held), 0);
     const pid_t child = forked([&] {
@@ -98,6 +99,7 @@ TEST(EditLock, OfAnotherProcessIsWaitedForAndNamed) {
     });
     char byte = 0;
     ASSERT_EQ(::read(held[0], &byte, 1), 1);
+    const auto newer = EditLock::acquire(folder.write("newer/item", "x"));
     Error error;
     EXPECT_FALSE(EditLock::acquire(item, &error, milliseconds(20)));
     EXPECT_THAT(error.message(),

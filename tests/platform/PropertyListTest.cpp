@@ -1,3 +1,4 @@
+#include "platform/data/Json.h"
 #include "platform/data/PropertyList.h"
 #include "platform/data/PropertyListFile.h"
 #include "support/AudioFixtures.h"
@@ -98,6 +99,10 @@ TEST(PropertyList, RefusesToCutATextAtANulCharacter) {
     for (const PropertyList& value : {PropertyList(withNul), PropertyList(Dictionary{{withNul, 1}})}) {
         EXPECT_EQ(serializePropertyList(value, PropertyListFormat::binary), "");
     }
+}
+
+TEST(PropertyList, IsJsonOfWholeCharactersWhateverItsBytes) {
+    EXPECT_EQ(jsonText(PropertyList("\xc3\xa9 \xc3"), JsonStyle::compact), "\"\xc3\xa9 \xef\xbf\xbd\"");
 }
 
 TEST(PropertyList, NumbersCompareByValueAndBooleansStandApart) {
