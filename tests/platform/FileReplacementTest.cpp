@@ -371,7 +371,8 @@ TEST(FileReplacement, WhatAKilledProcessLeftIsRemovedByTheNextWriteAndNothingEls
     const std::string path = folder.write("file", "old");
     const std::vector<std::string> kept = {".qvct-mine.tmp",         ".qvct-1-0.tmp.bak", "qvct-1-0.tmp",
                                            ".qvct-1-0-a0-b0.tmp",    ".qvct-1.tmp",       ".qvct--1-0.tmp",
-                                           ".qvct-1-0-a0-b0-c0.tmp", ".qvct-1-0x1.tmp"};
+                                           ".qvct-1-0-a0-b0-c0.tmp", ".qvct-1-0x1.tmp",   "xqvct-1-0.tmp",
+                                           ".qvct-1-0xtmp"};
     for (const std::string& name : kept) folder.write(name, "user's");
     const std::string victim = folder.write("victim", "user's");
     std::filesystem::create_symlink(victim, folder.path(".qvct-2-0.tmp"));
