@@ -10,10 +10,15 @@
 #include "formats/preset/TGRTVorthalPresetTypeValidator.h"
 #include "formats/settings/TGRTBinaryFileMetaDataReader.h"
 #include "formats/settings/TGRTCstSxvPstTypeValidator.h"
+#include "media/loopfile/LCFileWriter.h"
+#include "platform/files/EditLock.h"
 #include "support/AudioFixtures.h"
+#include "support/Corpus.h"
 
 #include <filesystem>
 #include <functional>
+#include <future>
+#include <map>
 #include <typeindex>
 
 #include <gmock/gmock.h>
@@ -303,6 +308,38 @@ TEST(ReadersAndWriters, TakeNoOtherURLForAPathOfThisMachine) {
     error = {};
     TGRTTaxonomy::taxonomyWithContentsOfURL(remote, &error);
     EXPECT_EQ(error.message(), remote.absoluteString() + ": is no file URL");
+}
+
+TEST(Writers, LeaveAloneWhatAnotherWriterDoesNotLetGo) {
+    const TemporaryFolder folder;
+    const std::string loop = folder.write("a.wav", loopWav());
+    test::writeList(folder, "a.patch/tags.plist", {{"Type", 1}});
+    folder.write("a.cst", "x");
+    folder.write("a.vcp", "<tagging>\n</tagging>\n");
+    std::vector<std::future<std::string>> reasons;
+    const auto files = [&folder] {
+        std::map<std::string, std::string> contents;
+        for (const std::string& path : test::filesBelow(folder.path())) contents[path] = test::readAll(path);
+        return contents;
+    };
+    const auto before = files();
+    const auto turn = EditLock::acquire(loop);
+    for (const char* name : {"a.wav", "a.patch", "a.cst", "a.vcp"}) {
+        reasons.push_back(std::async(std::launch::async, [url = urlOf(folder.path(name))] {
+            Error error;
+            const auto writer = TGRTMetaDataWriterFactory::taggingWriterForURL(url);
+            EXPECT_FALSE(writer->writeTaggings(test::taggingsOf({{"Genres", "House"}}), url, &error));
+            return error.message();
+        }));
+    }
+    reasons.push_back(std::async(std::launch::async, [url = urlOf(loop)] {
+        Error error;
+        EXPECT_FALSE(
+            LCFileWriter::fileWriterForURL(url)->writeFileData(std::make_shared<LCFileData>(), &error));
+        return error.message();
+    }));
+    for (auto& reason : reasons) EXPECT_THAT(reason.get(), testing::HasSubstr("waited 30 s for a turn"));
+    EXPECT_EQ(files(), before);
 }
 
 TEST(Packages, GatherTheItemsThatNameThem) {
