@@ -207,6 +207,7 @@ TEST(Rules, AreTakenByExactTypeAndFromFiles) {
     EXPECT_EQ(tagsFor(rule("/a", "Lua")), "[]");
     EXPECT_EQ(tagsFor(rule("/a", nullptr, nullptr)), "[]");
     EXPECT_EQ(tagsFor(rule("")), "[]");
+    EXPECT_EQ(tagsFor(rule("", "JavaScript")), "[]");
     EXPECT_THAT(log.messages(), testing::IsEmpty()) << "each item would be told of a rule without a text";
     EXPECT_EQ(tagsFor(rule("/b")), "[]");
     EXPECT_EQ(tagsFor(rule(script, "JavaScript")), "[{\"label\":\"S\"}]");

@@ -122,11 +122,6 @@ TEST(MidiSequence, RoundsDurationsToSinglePrecision) {
     EXPECT_NE(first.end(), 1.0 / 30);
 }
 
-TEST(MidiSequence, ReadsBeatsOfASingleTick) {
-    EXPECT_THAT(notes(header(0, 1, 1) + track(Bytes{2, 0x90, 60, 9, 3, 60, 0} + kEnd)),
-                testing::ElementsAre(note(2, 3, 0, 60, 9)));
-}
-
 TEST(MidiSequence, PutsSmpteTimeIntoBeatsByTheTempo) {
     // 25 frames of 40 ticks: 1000 ticks a second. 120 a minute for half a second, then 100.
     const auto file = header(0, 1, 0xE728) + track(Bytes{0x83, 0x74, 0xFF, 0x51, 3, 0x09, 0x27, 0xC0, 0x84,
