@@ -1,8 +1,12 @@
 // A library of many small files, from its first indexing to searches in it: rates and times, each beside the
 // bare work that it is measured against.
 //
-//   bench_library index FILES [FOLDER]   makes a library in FOLDER, indexes it, and again beside a bare walk
-//   bench_library search ITEMS [FILE]    fills a database, searches it beside SQLite's own text index
+//   bench_library index [FILES [FOLDER]]    makes a library, indexes it, and again beside a bare walk
+//   bench_library search [ITEMS [FOLDER]]   fills a database, searches it beside SQLite's own text index
+//   bench_library                           both
+//
+// 100,000 files or items unless told. All is made in a new folder within FOLDER, or else within that for
+// temporary files, and removed at the end.
 
 #include "Measure.h"
 #include "contentdb/ContentDatabase.h"

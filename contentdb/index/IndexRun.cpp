@@ -250,7 +250,7 @@ void IndexRun::prune() {
         options_.failed(errorOf(
             kErrorUnreadable,
             fmt::format("nothing is left in it, as when a disk is away; its {} items stay in the database "
-                        "(`--prune-roots` takes them out)",
+                        "unless roots are pruned, too",
                         missing),
             {root}));
     }

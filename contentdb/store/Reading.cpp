@@ -39,8 +39,8 @@ std::unique_ptr<Connection> openToRead(const std::string& name) {
         if (auto connection = openUnlessEmpty(path)) return connection;
         if (std::chrono::steady_clock::now() > end) {
             throw DatabaseFailure(kErrorUnreadable,
-                                  "is being made, and nothing is in it yet; try again when the run of "
-                                  "`index` has stored something",
+                                  "is being made, and nothing is in it yet; try again when the run "
+                                  "that makes it has stored something",
                                   path);
         }
         std::this_thread::sleep_for(kPause);

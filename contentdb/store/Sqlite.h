@@ -111,7 +111,7 @@ Result guarded(Error* error, Result otherwise, Work work) {
     } catch (const DatabaseFailure& failure) {
         if (error == nullptr) return otherwise;
         *error = failure.error();
-        if (failure.code() == kErrorMalformed) error->reason += "; `index --check` builds it anew";
+        if (failure.code() == kErrorMalformed) error->reason += "; indexing it with `check` builds it anew";
         return otherwise;
     }
 }

@@ -254,7 +254,7 @@ TEST_F(LibraryCommands, TellWhatIsWrongWithADatabase) {
     for (const ToolResult& result : {run({"search", "kick"}), runTool({"db", "check", folder_.path("db")})}) {
         EXPECT_EQ(result.status, 1);
         EXPECT_THAT(result.errors, HasSubstr("damaged"));
-        EXPECT_THAT(result.errors, HasSubstr("`index --check` builds it anew"));
+        EXPECT_THAT(result.errors, HasSubstr("indexing it with `check` builds it anew"));
     }
     const ToolResult rebuilt = index();
     EXPECT_THAT(rebuilt.errors, HasSubstr("built anew"));

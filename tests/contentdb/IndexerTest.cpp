@@ -364,9 +364,9 @@ TEST_F(Indexing, TakesNothingOutWhileADiskMayBeAway) {
     for (const std::string& place : {disk, mounted}) std::filesystem::rename(place, place + " away");
     std::filesystem::create_directory(disk);
     EXPECT_EQ(prunedWith(false), 0U);
-    EXPECT_THAT(
-        failures,
-        ElementsAre(HasSubstr(disk + ": nothing is left in it, as when a disk is away; its 2 items")));
+    EXPECT_THAT(failures,
+                ElementsAre(HasSubstr(disk + ": nothing is left in it, as when a disk is away; its 2 items "
+                                             "stay in the database unless roots are pruned")));
     std::filesystem::remove(disk);
     EXPECT_EQ(prunedWith(true), 2U);
     EXPECT_THAT(names(), UnorderedElementsAre("Hat", "Clap"));
@@ -1036,7 +1036,7 @@ TEST_F(Indexing, ReadsTheDatabaseWholeWhenTold) {
         Connection(database(), Connection::Access::readWrite).run(fault);
         Error error;
         EXPECT_FALSE(ContentDatabase::open(database())->check(&error));
-        EXPECT_THAT(error.message(), HasSubstr(reason + "; `index --check` builds"));
+        EXPECT_THAT(error.message(), HasSubstr(reason + "; indexing it with `check` builds it anew"));
         notes_.clear();
         index([](IndexOptions& options) { options.check = true; });
         EXPECT_THAT(notes_, ElementsAre(HasSubstr("built anew")));
