@@ -301,8 +301,7 @@ bool IndexRun::isSpared(std::string_view path) {
     return false;
 }
 
-/// The path by which the walk reached this folder, if it was another one: the folder was reached through
-/// another link, or through none.
+/// The other path by which the walk reached this folder: through another link, or directly.
 std::optional<std::string> IndexRun::otherPathOf(const std::string& folder) {
     const auto inode = inodeOf(folder);
     if (!inode) return std::nullopt;

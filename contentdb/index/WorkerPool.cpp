@@ -125,12 +125,12 @@ bool WorkerPool::receive(Worker& worker, const std::function<void(Described)>& t
     for (std::string_view message; nextMessage(worker.input, at, message);) {
         auto report = decodedReport(message);
         if (!report || !takeReport(worker, *std::move(report), take)) {
-            worker.fault = "gave an answer that means nothing";
+            worker.fault = "sent an answer that makes no sense";
             return false;
         }
     }
     worker.input.erase(0, at);
-    if (lengthOfMessage(worker.input) > kLongestReport) worker.fault = "gave an answer that is too long";
+    if (lengthOfMessage(worker.input) > kLongestReport) worker.fault = "sent an answer that is too long";
     return isThere;
 }
 

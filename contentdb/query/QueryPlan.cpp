@@ -79,7 +79,7 @@ void QueryPlan::add(const NumberMatch& match) {
     }
 }
 
-/// Groups that lie in the range are sure; of those that an end of it cuts, `addCut` is told.
+/// Groups inside the range match for sure; `addCut` is called for each that an end of the range cuts.
 void QueryPlan::addGroups(const std::string& start, const std::string& end, const NumberMatch& match,
                           const std::function<void(TermId, const NumberGroup&)>& addCut) {
     store_.forEachTerm(start, end, [&](TermId id, std::string_view value) {

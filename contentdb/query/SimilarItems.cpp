@@ -66,7 +66,7 @@ double closeness(const Measure& measure, double a, double b) {
     return 1 / (1 + std::abs(distance) / measure.half);
 }
 
-/// The closeness of two items in a respect that is unknown of one of them.
+/// How close two items count as where one lacks the fact.
 constexpr double kUnknown = -1;
 using Closenesses = std::array<double, kMeasures.size()>;
 constexpr Closenesses kAllUnknown = {kUnknown, kUnknown, kUnknown};
@@ -122,7 +122,7 @@ class WeighedTags {
     double likeness(double shared, std::size_t tagsOfOther) const {
         if (weights_.empty()) return kUnknown;
         const double meanWeight = all_ / static_cast<double>(weights_.size());
-        // The other item's further tags are taken to weigh as much, each, as a tag of this item on average.
+        // Each further tag of the other item counts as the average weight of this item's tags.
         const double beyond = std::max(0.0, static_cast<double>(tagsOfOther) - shared / meanWeight);
         return std::min(1.0, shared / (all_ + beyond * meanWeight));
     }

@@ -16,8 +16,7 @@ bool isMarkedAsContentDatabase(const std::string& path);
 /// Removes what there is of a database and its logs.
 void removeDatabase(const std::string& path);
 
-/// The path at which a database is built before it is moved to `database`, where one always finds a complete
-/// one or none.
+/// Where a database is built before it is moved to `database`, which is therefore complete or absent.
 std::string unfinishedPath(const std::string& database);
 
 /// @{

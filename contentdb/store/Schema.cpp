@@ -136,8 +136,8 @@ std::unique_ptr<Connection> openForReading(const std::string& path) {
     }
     if (fileExists(path + "-wal") && std::filesystem::file_size(path + "-wal") > 0) {
         refuse(path, kErrorUnreadable,
-               "its last changes are still in the log beside it, and taking them in needs the right to write "
-               "to its folder; one search by its owner does it");
+               "its latest changes are only in the log beside it; somebody who may write to its folder "
+               "has to open it once");
     }
     auto connection = std::make_unique<Connection>(path, Connection::Access::unchanging);
     prepare(*connection, Access::read);

@@ -25,7 +25,7 @@ class Walk {
     }
 
   private:
-    /// No path that the system takes has so many folders that this recursion would go too deep.
+    /// The system's limit on path length bounds this recursion.
     bool enter(const std::string& path) {
         std::vector<std::string> folders;
         if (!show(path, folders)) return false;

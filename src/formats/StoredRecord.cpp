@@ -21,7 +21,7 @@ std::optional<PropertyList::Dictionary> parseStoredDictionary(const std::string&
     if (value && value->dictionary() != nullptr) return std::move(*value->dictionary());
     const std::string why = value ? "no dictionary" : reason.reason;
     fail(error, kErrorMalformed,
-         fmt::format("not written over, since what is there cannot be read ({})", why), std::move(reason));
+         fmt::format("not overwritten: its present contents cannot be read ({})", why), std::move(reason));
     return std::nullopt;
 }
 

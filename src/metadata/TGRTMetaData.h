@@ -56,9 +56,9 @@ class QVCT_API TGRTMetaData : public Object {
     /// Entries that a record does not know stay where they are, at every depth. So do a stored sub-type and
     /// content info if the record has none. A stored UUID is removed.
     void storeInto(PropertyList::Dictionary& stored) const;
-    /// The same for an item whose dictionary holds nothing but the record: other entries are removed, except
-    /// those with a key that the dictionary from which this record was read had, too. A stored sub-type and
-    /// content info are removed if the record has none.
+    /// The same for an item whose dictionary holds nothing but the record. Other entries are removed, unless
+    /// their key was in the dictionary that the record was read from. A stored sub-type and content info are
+    /// removed if the record has none.
     void storeOver(PropertyList::Dictionary& stored) const;
     /// What to store at the URL: this record put into the property list that is stored there, by `storeInto`.
     ///

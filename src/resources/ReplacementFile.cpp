@@ -21,12 +21,12 @@ namespace {
 bool isMappingTable(std::string_view text, const std::string& path, Error* error) {
     const std::vector<std::string> lines = split(replaceAll(text, "\r\n", "\n"), "\n");
     if (lines.front() != kLegacyMappingHeader)
-        return fail(error, kErrorMalformed, "is not the header", {.path = path, .line = 1});
+        return fail(error, kErrorMalformed, "is not the expected header", {.path = path, .line = 1});
     for (std::size_t i = 1; i < lines.size(); ++i) {
         const auto separators = std::count(lines[i].begin(), lines[i].end(), ';');
         if (lines[i].empty() || separators + 1 == kLegacyMappingFieldCount) continue;
         return fail(error, kErrorMalformed,
-                    fmt::format("has not {} fields", std::size_t{kLegacyMappingFieldCount}),
+                    fmt::format("does not have {} fields", std::size_t{kLegacyMappingFieldCount}),
                     {.path = path, .line = i + 1});
     }
     return true;

@@ -33,8 +33,8 @@ inline constexpr ResourceFile kResourceFiles[] = {{"DefaultTaxonomy", "plist"},
 /// @cost  One look at the file; its bytes are read when it is new or has changed. Safe from every thread.
 QVCT_API std::optional<std::string> replacementFile(const ResourceFile& resource, Error* error = nullptr);
 
-/// What `read` makes of the replacement file at a path; if there is none, what `builtIn` gives. Both answer
-/// an optional value.
+/// Reads the replacement by `read`; without one, or if that answers nothing, `builtIn`. Both answer an
+/// optional value.
 template <typename Read, typename BuiltIn>
 auto replacedOrBuiltIn(const ResourceFile& resource, Read read, BuiltIn builtIn) {
     const auto path = replacementFile(resource);

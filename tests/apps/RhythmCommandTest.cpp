@@ -286,12 +286,12 @@ TEST(RhythmCommand, DrawsAPlot) {
         std::string target;
         const char* reason;
     } const refused[] = {
-        {file, "is to be read"},
-        {folder.path("hard.svg"), "is to be read"},
-        {folder.write("other.mid", midi({0})), "is no SVG"},
-        {folder.write("words.svg", "words"), "is no SVG"},
-        {folder.write("drawing.txt", "<svg "), "is no SVG"},
-        {folder.path(), "is no SVG"},
+        {file, "is one of the files to be measured"},
+        {folder.path("hard.svg"), "is one of the files to be measured"},
+        {folder.write("other.mid", midi({0})), "exists and is not an SVG file"},
+        {folder.write("words.svg", "words"), "exists and is not an SVG file"},
+        {folder.write("drawing.txt", "<svg "), "exists and is not an SVG file"},
+        {folder.path(), "exists and is not an SVG file"},
     };
     std::filesystem::create_hard_link(file, refused[1].target);
     for (const auto& c : refused) {

@@ -63,7 +63,7 @@ TEST(Autotag, NamesWhatFailsAndDoesTheRest) {
         {{"--resources", folder.path("keywords"), kick}, {brokenKeyword}},
         {{"--keywords", folder.path("keywords/DefaultKeywordMapping.plist"), kick}, {brokenKeyword}},
         {{"--resources", folder.path("table"), kick},
-         {"LegacyLoopTaxonomyMapping.csv: line 1: is not the header (using the built-in one)"}},
+         {"LegacyLoopTaxonomyMapping.csv: line 1: is not the expected header (using the built-in one)"}},
         {{"--resources", "/none", kick}, {"/none: no such resource folder"}},
         {{"--services", "keywords,magic", kick}, {"no service \"magic\""}, 2},
         {{"--keywords", "/none.plist", kick}, {"/none.plist: No such file"}},
@@ -258,7 +258,7 @@ TEST(LegacyTaxonomy, ShowsWhatTheTablesLeaveOut) {
     const ToolResult own = runTool({"--resources", folder.path(), "taxonomy", "coverage", "--json"});
     EXPECT_EQ(own.status, 1);
     EXPECT_THAT(own.errors,
-                HasSubstr("LegacyVorthalTaxonomyMapping.csv: line 1: is not the header (using the"));
+                HasSubstr("LegacyVorthalTaxonomyMapping.csv: line 1: is not the expected header (using the"));
     ASSERT_EQ(own.json().size(), 2U);
     EXPECT_EQ(own.json()[0]["withoutRow"].size(), 137U);
     EXPECT_THAT(own.json()[0]["unknownLabels"], ElementsAre("Darkish"));

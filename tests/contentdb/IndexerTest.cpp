@@ -539,9 +539,9 @@ TEST_F(Indexing, SaysWhyNothingDescribes) {
         {R"(printf '\7\0\0\0\0\0050.0.9' >&0; read -r line)",
          fmt::format("is of version \"0.0.9\", and \"{}\" is needed", workerEdition())},
         {greeting, fmt::format("is of version \"{}\", and \"{}\" is needed", version(), workerEdition())},
-        {R"(printf '\1\0\0\0\11' >&0; read -r line)", "gave an answer that means nothing" + barren},
-        {R"(printf '\0\0\0\177' >&0; read -r line)", "gave an answer that is too long" + barren},
-        {R"(printf '\0\0\0\0' >&0; read -r line)", "gave an answer that means nothing" + barren},
+        {R"(printf '\1\0\0\0\11' >&0; read -r line)", "sent an answer that makes no sense" + barren},
+        {R"(printf '\0\0\0\177' >&0; read -r line)", "sent an answer that is too long" + barren},
+        {R"(printf '\0\0\0\0' >&0; read -r line)", "sent an answer that makes no sense" + barren},
         // Takes away the memory that both see.
         {"(: >/proc/self/fd/1) 2>/dev/null; exit 1", "ended the process (status 1)" + barren}};
     for (const auto& [script, reason] : scripts)

@@ -124,7 +124,7 @@ TEST(Store, IsReadByOneWhoMayNotWriteThere) {
         std::filesystem::copy(path + "-wal", path + "2-wal");
     }
     for (const char* part : {"", "-wal"}) std::filesystem::rename(path + "2" + part, path + part);
-    EXPECT_THAT(asStranger(count), HasSubstr("its last changes are still in the log beside it"));
+    EXPECT_THAT(asStranger(count), HasSubstr("its latest changes are only in the log beside it"));
     EXPECT_EQ(count(), "10");
     Connection(path, Connection::Access::readWrite).run("PRAGMA user_version = 99");
     EXPECT_THAT(asStranger(count), HasSubstr("newer version"));

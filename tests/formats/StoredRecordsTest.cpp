@@ -223,7 +223,7 @@ TEST(Writers, LeaveWhatTheyCannotReadOrReach) {
         EXPECT_FALSE(
             TGRTCstSxvPstTaggingWriter().writeTaggings(taggings, urlOf(folder.path("a.cst")), &error));
         EXPECT_EQ(error.path, list);
-        EXPECT_THAT(error.reason, testing::StartsWith("not written over"));
+        EXPECT_THAT(error.reason, testing::StartsWith("not overwritten"));
         EXPECT_EQ(readTextFile(list), bytes);
     }
     Error error;

@@ -96,8 +96,8 @@ TEST(ReplacementFile, OfAMappingTableMustBeOne) {
         std::string table, reason;
     } rows[] = {{header + "\r\nLoopGenres;Jazz;;Jazz;;;;\r\n", ""},
                 {header, ""},
-                {"Type;\n", "line 1: is not the header"},
-                {header + "\n\nLoopGenres;Jazz;;Jazz;;;\n", "line 3: has not 8 fields"}};
+                {"Type;\n", "line 1: is not the expected header"},
+                {header + "\n\nLoopGenres;Jazz;;Jazz;;;\n", "line 3: does not have 8 fields"}};
     for (const auto& row : rows) {
         const Resources resources;
         const test::CapturedLog log;

@@ -96,12 +96,14 @@ Error problemOfPlot(const std::string& target, const std::vector<std::string>& i
     if (!fs::exists(target, ignored)) return {};
     for (const std::string& input : inputs) {
         if (fs::equivalent(target, input, ignored))
-            return errorOf(kErrorInvalidArgument, "is to be read, and not to be drawn over", {target});
+            return errorOf(kErrorInvalidArgument,
+                           "is one of the files to be measured; the picture would overwrite it", {target});
     }
     const bool isSvg =
         URL::fileURLWithPath(target).lowercasePathExtension() == "svg" && beginsLikeSvg(target);
     return isSvg ? Error{}
-                 : errorOf(kErrorInvalidArgument, "is no SVG, and is not replaced by one", {target});
+                 : errorOf(kErrorInvalidArgument, "exists and is not an SVG file; it is not overwritten",
+                           {target});
 }
 
 void writePlot(const Options& options, const RhythmResult& result, ToolContext& context) {

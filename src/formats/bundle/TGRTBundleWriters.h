@@ -32,8 +32,8 @@ class TGRTBundleContentInfoWriter : public TGRTContentInfoWriter {
                           Error* error = nullptr, const ContentWriteOptions& options = {}) const override;
 };
 
-/// Replaces the record in the property list. Other entries are removed, except those with a key that the list
-/// from which the record was read had, too.
+/// Replaces the record in the property list. Other entries are removed, unless their key was in the list that
+/// the record was read from.
 class TGRTBundleMetaDataWriter : public TGRTMetaDataWriter {
   public:
     virtual std::string plistPathComponent() const { return std::string(QVContentTaggingTagsPlistName); }

@@ -67,8 +67,7 @@ std::optional<PropertyList> propertyOfApplication(const PresetText::Item& item) 
     return item.key == QVContentInfoLegacyKey ? flagOf(item.value) : std::nullopt;
 }
 
-/// What the items of a section say, and which of them say it: the others are not understood where they stand,
-/// and stay there.
+/// What a section's items mean, and which were understood; the others are left in place.
 template <typename Value>
 struct Reading {
     Value value;

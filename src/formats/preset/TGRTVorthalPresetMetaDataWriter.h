@@ -15,7 +15,7 @@ class TGRTVorthalPresetMetaDataWriter : public TGRTTaggingsWriter,
                        const ContentWriteOptions& options = {}) const override;
     bool writeContentInfo(const std::shared_ptr<const TGRTContentInfo>& contentInfo, const URL& url,
                           Error* error = nullptr, const ContentWriteOptions& options = {}) const override;
-    /// A record without content info leaves the stored one, one without sub type likewise.
+    /// Where the record has no content info or sub type, the stored one stays.
     bool writeMetaData(const std::shared_ptr<TGRTMetaData>& metaData, const URL& url, Error* error = nullptr,
                        const ContentWriteOptions& options = {}) const override;
 };

@@ -137,7 +137,7 @@ class MidiSequenceBuilder {
             const std::size_t length = std::min(announced, bytes_.size() - position_);
             if (length < announced) {
                 note(errorOf(kErrorMalformed,
-                             fmt::format("a chunk of {} bytes, {} are there", announced, length),
+                             fmt::format("a chunk claims {} bytes, but only {} follow", announced, length),
                              {.offset = position_ - 4}));
             }
             if (hasName(header, "MTrk")) {

@@ -305,8 +305,7 @@ class Replacement {
         return stamp == *options_.expected;
     }
 
-    /// Puts back what another program saved, again and again if it saves meanwhile, until our own file comes
-    /// out.
+    /// Exchanges the files back; repeats if the other program saved again, until the file taken out is ours.
     bool putBack(UnfinishedFile& made, FileStamp placed) const {
         for (bool isDone = false; !isDone;) {
             const FileStamp saved = FileStamp::ofFile(made.path());

@@ -22,7 +22,8 @@ class ProcessHandle {
     explicit ProcessHandle(int id);
 
     void kill() const;
-    /// How it ended; nothing when it still runs after that time. Asked once more, it is not known.
+    /// How it ended, or nothing if it still runs then. The system tells it once: later calls answer
+    /// isKnown = false.
     std::optional<ProcessEnd> awaitEnd(std::chrono::milliseconds patience) const;
 
   private:

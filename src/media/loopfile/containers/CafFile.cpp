@@ -55,7 +55,7 @@ void CafFile::walk() {
     }
     chunksEnd_ = at;
     if (!fault_.isSet() && at < fileEnd && !areFiller(at, fileEnd)) {
-        fail(&fault_, kErrorMalformed, fmt::format("{} bytes are no chunk that is known of", fileEnd - at),
+        fail(&fault_, kErrorMalformed, fmt::format("{} bytes belong to no known chunk", fileEnd - at),
              {.offset = at});
     }
 }

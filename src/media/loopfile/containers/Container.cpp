@@ -127,7 +127,7 @@ std::optional<std::vector<FilePiece>> Container::rewritten(const std::string& re
     for (const Chunk& chunk : chunks_) {
         const char* reason = chunk.fault;
         if (chunk.role == Chunk::Role::record && std::exchange(ours, &chunk) != nullptr) {
-            reason = "a second record of ours; which one holds is not certain";
+            reason = "is a second record of ours; it is unclear which one counts";
         }
         if (reason == nullptr) continue;
         failAt(error, chunk, reason);

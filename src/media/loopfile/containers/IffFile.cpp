@@ -103,7 +103,7 @@ void IffFile::walk(std::uint64_t formSize, bool isOpenEnded) {
     if (areFiller(at, formEnd_)) formEnd_ = at;
     if (isOpenEnded) return;
     if (at < formEnd_) {
-        fail(&fault_, kErrorMalformed, fmt::format("{} bytes are no chunk that is known of", formEnd_ - at),
+        fail(&fault_, kErrorMalformed, fmt::format("{} bytes belong to no known chunk", formEnd_ - at),
              {.offset = at});
     }
     // A size that is too large is common, and harmless where all chunks are whole.
