@@ -52,7 +52,21 @@ struct Neighbours {
     char after;
 };
 
+/// Of what expressions have, only single characters and groups; the compiler need not be asked. It is slow at
+/// first, and "Bright / Dark (0.0)" is such a keyword.
+bool hasOnlyGroups(std::string_view keyword) {
+    constexpr std::size_t deepest = 16;
+    std::size_t depth = 0;
+    for (std::size_t i = 0; i < keyword.size(); ++i) {
+        if (std::string_view("\\[]{}*+?^$|").find(keyword[i]) != std::string_view::npos) return false;
+        if (keyword[i] == '(' && ++depth > deepest) return false;
+        if (keyword[i] == ')' && depth-- == 0) return false;
+    }
+    return depth == 0;
+}
+
 bool compiles(std::string_view keyword) {
+    if (!keyword.starts_with("regex:") && isAscii(keyword) && hasOnlyGroups(keyword)) return true;
     return RegularExpression::compile(expressionForKeyword(keyword), RegularExpression::Case::insensitive)
         .has_value();
 }

@@ -79,7 +79,6 @@ class QVCT_API QVCTKeywordExtractor {
     void setupWithTaxonomy(const TGRTTaxonomy& taxonomy);
     void addToKeywordsSet(const std::string& label);
     void compileKeywords();
-    void addKeyword(const std::string& text, bool isLabel);
     void compileTrie();
     std::uint32_t resultIndex(const std::string& text);
     void findParents();

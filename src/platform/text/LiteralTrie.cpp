@@ -1,5 +1,7 @@
 #include "platform/text/LiteralTrie.h"
 
+#include <numeric>
+
 namespace qvct {
 namespace {
 
@@ -19,6 +21,11 @@ LiteralTrie::LiteralTrie(const std::vector<std::string>& literals) {
     }
     for (char c = 'A'; c <= 'Z'; ++c) classOf_[static_cast<unsigned char>(c)] = classOf_[lowercased(c)];
 
+    // For as many nodes as there can be: memory that is not reached is not touched, and nothing moves.
+    const std::size_t bytes =
+        std::accumulate(literals.begin(), literals.end(), std::size_t{0},
+                        [](std::size_t sum, const std::string& literal) { return sum + literal.size(); });
+    child_.reserve((bytes + 1) * classCount_);
     child_.resize(classCount_);
     literalAt_.push_back(-1);
     for (std::size_t index = 0; index < literals.size(); ++index) {
