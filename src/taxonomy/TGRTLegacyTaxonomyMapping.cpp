@@ -28,8 +28,9 @@ std::optional<URL> tableURL(std::string_view name) {
 MappingPointer sharedMapping(const std::optional<URL>& file,
                              std::optional<TGRTLegacyTaxonomyMapping::Lines> (*compiledLines)(),
                              const TGRTTaxonomy& taxonomy) {
-    return file ? TGRTLegacyTaxonomyMapping::initWithTaxonomyMappingFileURL(file, taxonomy)
-                : TGRTLegacyTaxonomyMapping::initWithLines(compiledLines(), taxonomy);
+    MappingPointer mapping =
+        file ? TGRTLegacyTaxonomyMapping::initWithTaxonomyMappingFileURL(file, taxonomy) : nullptr;
+    return mapping ? mapping : TGRTLegacyTaxonomyMapping::initWithLines(compiledLines(), taxonomy);
 }
 
 }  // namespace

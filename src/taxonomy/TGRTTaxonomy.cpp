@@ -94,9 +94,9 @@ std::shared_ptr<TGRTTaxonomy> TGRTTaxonomy::newTaxonomyOfType(std::int64_t type,
         if (auto cached = sharedCache().objectForKey(key)) return cached;
     }
     const std::optional<URL> url = taxonomyURLForType(type);
-    auto taxonomy =
-        url ? taxonomyWithContentsOfURL(*url)
-            : taxonomyWithDictionary(taxonomyDictionaryForType(type).value_or(PropertyList::Dictionary{}));
+    auto dictionary = url ? readDictionaryFile(url->path()) : std::nullopt;
+    if (!dictionary) dictionary = taxonomyDictionaryForType(type);
+    auto taxonomy = taxonomyWithDictionary(std::move(dictionary).value_or(PropertyList::Dictionary{}));
     taxonomy->setReadOnly(readonly);
     return useCache ? sharedCache().addObject(key, std::move(taxonomy)) : taxonomy;
 }

@@ -125,6 +125,11 @@ class QVCT_API TGRTTaxonomy : public Object, public QVContentTaggingTaxonomy {
     TagPointer findOrCreateTagWithLabel(std::string_view label, std::string_view categoryIdentifier);
     TagPointer findOrCreateTagWithLabel(std::string_view label, OptionalLabel parentLabel,
                                         std::string_view categoryIdentifier, bool overwriteReadonly = false);
+    template <typename... Others>
+    TagPointer findOrCreateTagWithLabel(std::nullptr_t, Others...) = delete;
+    TagPointer findOrCreateTagWithLabel(std::string_view label, std::nullptr_t) = delete;
+    TagPointer findOrCreateTagWithLabel(std::string_view label, OptionalLabel parentLabel, std::nullptr_t,
+                                        bool overwriteReadonly = false) = delete;
     /// @}
     /// Adds the content pack even to a read-only taxonomy. Null for an empty identifier.
     TagPointer findOrCreateSoundPackTagWithIdentifier(std::string_view identifier);
@@ -133,6 +138,7 @@ class QVCT_API TGRTTaxonomy : public Object, public QVContentTaggingTaxonomy {
 
     /// The category, or null.
     CategoryPointer findCategoryWithIdentifier(std::string_view identifier) const;
+    CategoryPointer findCategoryWithIdentifier(std::nullptr_t) const = delete;
     /// @{
     /// The first tag with the label: below the parent with that label, in the category, or anywhere. Null
     /// when there is none.
@@ -140,7 +146,11 @@ class QVCT_API TGRTTaxonomy : public Object, public QVContentTaggingTaxonomy {
     TagPointer findTagForLabel(std::string_view label, std::string_view categoryIdentifier) const;
     TagPointer findTagForLabel(std::string_view label, OptionalLabel parentLabel,
                                std::string_view categoryIdentifier) const;
+    template <typename... Others>
+    TagPointer findTagForLabel(std::nullptr_t, Others...) const = delete;
     TagPointer findTagForLabel(std::string_view label, std::nullptr_t) const = delete;
+    TagPointer findTagForLabel(std::string_view label, OptionalLabel parentLabel,
+                               std::nullptr_t) const = delete;
     /// @}
     /// Depth first, in order; a tag with the label under another parent is passed over with its children.
     static TagPointer findTagWithLabel(std::string_view label, OptionalLabel parentLabel,

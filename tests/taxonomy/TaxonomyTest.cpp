@@ -33,6 +33,22 @@ std::vector<std::string> labels(const auto& tags) {
     return result;
 }
 
+/// Whether a host may write this: a label or category that is a null pointer would crash.
+template <typename... Arguments>
+concept CanFindTag = requires(TGRTTaxonomy& taxonomy, Arguments... arguments) {
+    taxonomy.findTagForLabel(arguments...);
+};
+template <typename... Arguments>
+concept CanMakeTag = requires(TGRTTaxonomy& taxonomy, Arguments... arguments) {
+    taxonomy.findOrCreateTagWithLabel(arguments...);
+};
+using Text = const char*;
+using Null = std::nullptr_t;
+static_assert(CanFindTag<Text, Null, Text> && CanMakeTag<Text, Null, Text>, "no parent");
+static_assert(!CanFindTag<Null> && !CanFindTag<Null, Text> && !CanFindTag<Text, Null> &&
+              !CanFindTag<Text, Null, Null>);
+static_assert(!CanMakeTag<Null, Text> && !CanMakeTag<Text, Null> && !CanMakeTag<Text, Text, Null>);
+
 TEST(Tag, BelongsToParentAndCategoryAndIsKnownByTheThreeLabels) {
     const auto category = TGRTCategory::initWithIdentifier("Genres");
     const auto house = TGRTTag::initWithLabel("House", nullptr, category);
