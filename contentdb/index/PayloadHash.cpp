@@ -4,6 +4,7 @@
 #include "formats/QVContentTaggingTypes.h"
 #include "formats/preset/PresetRecord.h"
 #include "media/loopfile/LCFileData.h"
+#include "platform/base/ByteOrder.h"
 #include "platform/base/BytesAsText.h"
 #include "platform/files/RandomAccessReader.h"
 #include "taxonomy/TaggingTypes.h"
@@ -33,12 +34,8 @@ struct Payload {
     }
 
     std::string hash() const {
-        std::string bytes;
-        for (const std::uint64_t number : {size, digest.value()}) {
-            for (unsigned shift = 0; size > 0 && shift < 64; shift += 8)
-                bytes += static_cast<char>(number >> shift & 0xFFU);
-        }
-        return bytes;
+        if (size == 0) return {};
+        return bytesOf(size, 8, ByteOrder::little) + bytesOf(digest.value(), 8, ByteOrder::little);
     }
 };
 

@@ -1,6 +1,7 @@
 #include "contentdb/index/WorkerMessages.h"
 
 #include "contentdb/store/ItemCodec.h"
+#include "platform/base/ByteOrder.h"
 #include "platform/base/Version.h"
 
 #include <fmt/format.h>
@@ -17,17 +18,13 @@ constexpr unsigned kProtocol = 1;
 static_assert(std::atomic<std::uint64_t>::is_always_lock_free, "other processes see no lock of ours");
 
 void appendMessage(std::string& stream, std::string_view message) {
-    for (std::size_t i = 0; i < kLengthBytes; ++i)
-        stream += static_cast<char>(message.size() >> (8 * i) & 0xFFU);
+    stream += bytesOf(message.size(), kLengthBytes, ByteOrder::little);
     stream += message;
 }
 
 std::size_t lengthOfMessage(std::string_view stream) {
     if (stream.size() < kLengthBytes) return 0;
-    std::size_t length = 0;
-    for (std::size_t i = kLengthBytes; i > 0; --i)
-        length = length << 8U | static_cast<unsigned char>(stream[i - 1]);
-    return length;
+    return numberOf(stream.substr(0, kLengthBytes), ByteOrder::little);
 }
 
 bool nextMessage(std::string_view stream, std::size_t& at, std::string_view& message) {

@@ -78,8 +78,7 @@ NumberGroup coarseGroup(std::string_view field, double value) {
 }
 
 NumberGroup numberGroupOfTerm(std::string_view term) {
-    std::uint64_t code = 0;
-    for (const char c : term.substr(term.size() - 4)) code = code << 8U | static_cast<unsigned char>(c);
+    const std::uint64_t code = numberOf(term.substr(term.size() - 4), ByteOrder::big);
     return group(static_cast<TermKind>(term[0]), term.substr(1, term.size() - 6), code);
 }
 

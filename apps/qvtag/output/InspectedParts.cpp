@@ -10,6 +10,7 @@
 #include "media/loopfile/LCFileParser.h"
 #include "media/midi/MidiSequence.h"
 #include "output/PropertyListOutput.h"
+#include "platform/base/ByteOrder.h"
 #include "platform/data/PropertyListFile.h"
 #include "platform/files/FileAccess.h"
 #include "platform/files/RandomAccessReader.h"
@@ -93,20 +94,13 @@ void addCompanions(const URL& url, Parts& parts) {
     }
 }
 
-std::string fourCharacters(std::uint32_t code) {
-    std::string text;
-    for (int shift = 24; shift >= 0; shift -= 8)
-        text += static_cast<char>(code >> static_cast<unsigned>(shift) & 0xFFU);
-    return printable(text);
-}
-
 Parts settingsParts(const URL& url, Error* error) {
     constexpr std::size_t length = TGRTSettingsHeaderReader::kHeaderLength;
     Parts parts;
     const auto info = TGRTSettingsHeaderReader::settingInfoForURL(url, error);
     if (!info) return parts;
     const auto code = [](std::uint32_t value) {
-        return fmt::format("\"{}\" 0x{:08X}", fourCharacters(value), value);
+        return fmt::format("\"{}\" 0x{:08X}", printable(fourCharacters(value)), value);
     };
     InspectedPart header{"header", 0, length, "which plug-in the settings are of", {}, {}};
     header.children = {

@@ -1,5 +1,7 @@
 #include "media/midi/MidiTrackReader.h"
 
+#include "platform/base/ByteOrder.h"
+
 #include <utility>
 
 namespace qvct {
@@ -86,7 +88,7 @@ bool MidiTrackReader::readMeta() {
 
 void MidiTrackReader::keepTempoOrMeter(std::uint8_t type, std::span<const std::uint8_t> data) {
     if (type == kTempo && data.size() >= 3) {
-        const auto microseconds = static_cast<std::uint32_t>(data[0] << 16 | data[1] << 8 | data[2]);
+        const auto microseconds = static_cast<std::uint32_t>(numberOf(data.first(3), ByteOrder::big));
         if (microseconds > 0) events_.tempos.push_back({tick_, microseconds});
     } else if (type == kMeter && data.size() >= 2 && data[0] > 0 && data[1] <= kLargestDenominatorPower) {
         events_.meters.push_back({tick_, data[0], 1 << data[1]});

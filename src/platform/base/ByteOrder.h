@@ -4,6 +4,7 @@
 #include <cstdint>
 #include <span>
 #include <string>
+#include <string_view>
 
 namespace qvct {
 
@@ -17,12 +18,21 @@ constexpr std::uint64_t numberOf(std::span<const std::uint8_t> bytes, ByteOrder 
     return value;
 }
 
+inline std::uint64_t numberOf(std::string_view bytes, ByteOrder order) {
+    return numberOf(std::span(reinterpret_cast<const std::uint8_t*>(bytes.data()), bytes.size()), order);
+}
+
 /// The lowest `width` bytes of a number.
 inline std::string bytesOf(std::uint64_t value, std::size_t width, ByteOrder order) {
     std::string bytes(width, '\0');
     for (std::size_t i = 0; i < width; ++i, value >>= 8U)
         bytes[order == ByteOrder::big ? width - 1 - i : i] = static_cast<char>(value & 0xFFU);
     return bytes;
+}
+
+/// The four characters that a code of four bytes spells.
+inline std::string fourCharacters(std::uint32_t code) {
+    return bytesOf(code, 4, ByteOrder::big);
 }
 
 }  // namespace qvct

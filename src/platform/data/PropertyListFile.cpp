@@ -52,10 +52,8 @@ constexpr char kWideIntegerMarker = 0x14;
 PropertyList::Date date(plist_t node) {
     const std::string bytes = binary(node);
     if (bytes.size() < kFirstObject + 9 || bytes[kFirstObject] != kDateMarker) return {};
-    std::uint64_t bits = 0;
-    for (std::size_t i = 1; i <= 8; ++i)
-        bits = bits << 8 | static_cast<unsigned char>(bytes[kFirstObject + i]);
-    return {std::bit_cast<double>(bits)};
+    const std::string_view bits = std::string_view(bytes).substr(kFirstObject + 1, 8);
+    return {std::bit_cast<double>(numberOf(bits, ByteOrder::big))};
 }
 
 PropertyList integer(plist_t node) {

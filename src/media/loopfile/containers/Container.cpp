@@ -4,6 +4,7 @@
 #include "media/loopfile/containers/CafFile.h"
 #include "media/loopfile/containers/LoopDataFile.h"
 #include "media/loopfile/containers/WavFile.h"
+#include "platform/base/ByteOrder.h"
 #include "platform/text/Text.h"
 
 #include <algorithm>
@@ -14,13 +15,6 @@ namespace qvct {
 namespace {
 
 constexpr std::uint64_t kMostFiller = 4096;
-
-std::string charactersOf(std::uint32_t code) {
-    std::string text;
-    for (int shift = 24; shift >= 0; shift -= 8)
-        text += static_cast<char>(code >> static_cast<unsigned>(shift));
-    return text;
-}
 
 }  // namespace
 
@@ -33,7 +27,7 @@ bool isPrintableCode(std::uint32_t code) {
 }
 
 std::string textOfCode(std::uint32_t code) {
-    return printable(charactersOf(code));
+    return printable(fourCharacters(code));
 }
 
 void PieceList::addBytes(std::string bytes) {
@@ -53,7 +47,7 @@ void PieceList::addRange(std::uint64_t begin, std::uint64_t end) {
 
 bool failAt(Error* error, const Chunk& chunk, std::string_view reason) {
     return fail(error, kErrorMalformed, std::string(reason),
-                {.part = fmt::format("chunk '{}'", charactersOf(chunk.id)), .offset = chunk.offset});
+                {.part = fmt::format("chunk '{}'", fourCharacters(chunk.id)), .offset = chunk.offset});
 }
 
 bool checkFormat(const LCAudioFacts& facts, const Chunk& chunk, Error* error) {

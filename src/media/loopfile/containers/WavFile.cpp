@@ -1,6 +1,7 @@
 #include "media/loopfile/containers/WavFile.h"
 
 #include "media/loopfile/containers/WavMusic.h"
+#include "platform/base/ByteOrder.h"
 
 #include <fmt/format.h>
 
@@ -193,11 +194,7 @@ bool WavFile::canGrowTo(std::uint64_t formSize) const {
 std::string WavFile::formHeader(std::uint64_t formSize) const {
     const bool isInLongSizes = isLong() && shortFormSize_ == kInLongSizes;
     const std::uint64_t shown = isInLongSizes ? kInLongSizes : formSize;
-    std::string magic;
-    for (int shift = 24; shift >= 0; shift -= 8) {
-        magic += static_cast<char>(magic_ >> static_cast<unsigned>(shift) & 0xFFU);
-    }
-    return magic + number(shown, 4) + "WAVE";
+    return fourCharacters(magic_) + number(shown, 4) + "WAVE";
 }
 
 std::uint64_t WavFile::rewrittenPrefix(const Chunk& chunk) const {
