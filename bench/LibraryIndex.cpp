@@ -182,7 +182,7 @@ void fill(const std::string& path, std::size_t count) {
 class TextIndex {
   public:
     TextIndex(const std::string& path, std::size_t count)
-        : connection_(emptyFile(path), Connection::Access::readWrite) {
+        : connection_(emptyFile(path), Connection::Mode::readWrite) {
         connection_.run(
             "PRAGMA page_size = 8192; PRAGMA journal_mode = WAL; PRAGMA synchronous = NORMAL;"
             "CREATE VIRTUAL TABLE text USING fts5 (words, content = '', detail = none, "

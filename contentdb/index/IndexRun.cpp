@@ -17,10 +17,6 @@ namespace {
 
 using Clock = std::chrono::steady_clock;
 
-/// Items stored in one transaction, at most; fewer when reading them takes long.
-constexpr std::size_t kBatch = 8192;
-/// Also fewer when they have many terms, so that a batch stays small in memory.
-constexpr std::size_t kMostTermsInBatch = 1'000'000;
 /// A file that changed so recently may change again within the same tick of the file system's clock, and its
 /// stamp would not show it. The next run reads it again.
 constexpr std::int64_t kTick = 20'000'000;
@@ -156,7 +152,7 @@ bool IndexRun::submit(const ListedItem& item, ItemId id, const std::shared_ptr<O
 
 bool IndexRun::collect() {
     canDescribe_ = describers_.collect([this](Described described) {
-        termsInBatch_ += described.terms.size();
+        batchSize_.add(described.terms.size());
         batch_.push_back(std::move(described));
     });
     stopIfCancelled();
@@ -166,9 +162,7 @@ bool IndexRun::collect() {
 }
 
 void IndexRun::flushIfDue() {
-    if (batch_.size() >= kBatch || termsInBatch_ >= kMostTermsInBatch ||
-        Clock::now() - lastFlush_ >= options_.longestBatch)
-        flush();
+    if (batchSize_.isFull() || Clock::now() - lastFlush_ >= options_.longestBatch) flush();
 }
 
 void IndexRun::flush() {
@@ -179,7 +173,7 @@ void IndexRun::flush() {
     for (const auto& folder : complete_) storeFolder(*folder);
     writer_.commit();
     batch_.clear();
-    termsInBatch_ = 0;
+    batchSize_ = {};
     complete_.clear();
 }
 

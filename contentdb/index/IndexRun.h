@@ -3,6 +3,7 @@
 #include "contentdb/Indexer.h"
 #include "contentdb/index/DescriberPool.h"
 #include "contentdb/index/ItemStamps.h"
+#include "contentdb/store/Batches.h"
 #include "contentdb/store/StoreWriter.h"
 
 #include <chrono>
@@ -74,7 +75,7 @@ class IndexRun {
     std::uint64_t lastTicket_ = 0;
     std::unordered_map<std::uint64_t, Pending> pending_;
     std::vector<Described> batch_;
-    std::size_t termsInBatch_ = 0;
+    BatchSize batchSize_;
     std::vector<std::shared_ptr<OpenFolder>> complete_;  // to be stored with the batch
     std::uint64_t listed_ = 0;  // items of all parts in the root that is being walked
     std::vector<std::string> roots_;

@@ -44,17 +44,18 @@ class Merge {
     void run() {
         writer_.setDescriber(describer());
         Batches batches(writer_);
-        for (const auto& [path, parts] : folders()) addFolder(parts, batches);
+        for (const auto& [path, sources] : folders()) addFolder(sources, batches);
         batches.end();
         connection_->emptyLog();
     }
 
   private:
-    struct Part {
+    /// A folder as one source has it.
+    struct SourceFolder {
         std::size_t source;
         std::int64_t folder;
     };
-    using Folders = std::map<std::string, std::vector<Part>, WalkOrder>;
+    using Folders = std::map<std::string, std::vector<SourceFolder>, WalkOrder>;
 
     /// The describer that all the sources have in common; 0 when they differ, so that the next run reads
     /// everything again.
@@ -76,20 +77,19 @@ class Merge {
 
     /// The items of one folder by name, each from the first source that has it. The folder's digest is left
     /// open: the next run looks at the folder once and then knows it.
-    void addFolder(const std::vector<Part>& parts, Batches& batches) {
+    void addFolder(const std::vector<SourceFolder>& sources, Batches& batches) {
         std::map<std::string, std::pair<std::size_t, ItemId>> items;
-        for (const Part& part : parts) {
-            for (const auto& [name, file] : sources_[part.source].store->files(part.folder))
-                items.try_emplace(name, part.source, file.id);
+        for (const SourceFolder& its : sources) {
+            for (const auto& [name, file] : sources_[its.source].store->files(its.folder))
+                items.try_emplace(name, its.source, file.id);
         }
         for (const auto& [name, place] : items) {
             ContentStore& store = *sources_[place.first].store;
             const auto item = store.item(place.second);
             if (!item) continue;
-            writer_.put(++lastId_, *item, termsOf(*item));
+            batches.put(++lastId_, *item, termsOf(*item));
             for (const std::string& path : store.earlierPaths(place.second))
                 writer_.addEarlierPath(lastId_, path);
-            batches.count();
         }
     }
 

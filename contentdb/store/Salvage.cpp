@@ -89,10 +89,9 @@ std::int64_t copyItems(ContentStore& from, const std::string& target) {
     forEachNumber(from.connection(), "item", [&](ItemId id) {
         const auto item = readable([&] { return from.item(id); });
         if (!item) return false;
-        writer.put(id, *item, termsOf(*item));
+        batches.put(id, *item, termsOf(*item));
         for (const std::string& path : readable([&] { return from.earlierPaths(id); }))
             writer.addEarlierPath(id, path);
-        batches.count();
         return true;
     });
     batches.end();

@@ -110,7 +110,7 @@ void create(const std::string& path) {
     removeDatabase(unborn);
     makeEmptyLike(path, unborn);
     {
-        Connection connection(unborn, Connection::Access::readWrite);
+        Connection connection(unborn, Connection::Mode::readWrite);
         configure(connection);
         connection.run(
             fmt::format("PRAGMA page_size = {0}; PRAGMA application_id = {1}", kPageSize, kApplicationId)
@@ -124,7 +124,7 @@ void create(const std::string& path) {
 
 std::unique_ptr<Connection> openForReading(const std::string& path) {
     try {
-        auto connection = std::make_unique<Connection>(path, Connection::Access::readOnly);
+        auto connection = std::make_unique<Connection>(path, Connection::Mode::readOnly);
         prepare(*connection, Access::read);
         return connection;
     } catch (const DatabaseFailure& failure) {
@@ -139,7 +139,7 @@ std::unique_ptr<Connection> openForReading(const std::string& path) {
                "its latest changes are only in the log beside it; somebody who may write to its folder "
                "has to open it once");
     }
-    auto connection = std::make_unique<Connection>(path, Connection::Access::unchanging);
+    auto connection = std::make_unique<Connection>(path, Connection::Mode::unchanging);
     prepare(*connection, Access::read);
     return connection;
 }
@@ -165,7 +165,7 @@ std::unique_ptr<Connection> openDatabase(const std::string& path, Access access)
                "index again");
     }
     if (access == Access::read) return openForReading(path);
-    auto connection = std::make_unique<Connection>(path, Connection::Access::readWrite);
+    auto connection = std::make_unique<Connection>(path, Connection::Mode::readWrite);
     prepare(*connection, access);
     return connection;
 }

@@ -48,11 +48,11 @@ std::string unchangingUri(const std::string& path) {
 
 }  // namespace
 
-Connection::Connection(const std::string& path, Access access) : path_(path) {
+Connection::Connection(const std::string& path, Mode mode) : path_(path) {
     registerChecksumVfs();
     constexpr int patience = 10000;  // milliseconds that a writer waits for another
-    const int flags = access == Access::readWrite ? SQLITE_OPEN_READWRITE : SQLITE_OPEN_READONLY;
-    const std::string name = access == Access::unchanging ? unchangingUri(path) : path;
+    const int flags = mode == Mode::readWrite ? SQLITE_OPEN_READWRITE : SQLITE_OPEN_READONLY;
+    const std::string name = mode == Mode::unchanging ? unchangingUri(path) : path;
     if (sqlite3_open_v2(name.c_str(), &handle_, flags | SQLITE_OPEN_NOMUTEX, kChecksumVfs) != SQLITE_OK) {
         const int result = sqlite3_extended_errcode(handle_);
         std::string reason(reasonOf(result, sqlite3_errmsg(handle_)));

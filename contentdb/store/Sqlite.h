@@ -32,10 +32,10 @@ class DatabaseFailure : public std::runtime_error {
 class Connection {
   public:
     /// Unchanging: nobody writes to it, so that no log is needed beside it.
-    enum class Access { unchanging, readOnly, readWrite };
+    enum class Mode { unchanging, readOnly, readWrite };
 
     /// @throws DatabaseFailure, as every operation here.
-    Connection(const std::string& path, Access access);
+    Connection(const std::string& path, Mode mode);
     Connection(const Connection&) = delete;
     Connection& operator=(const Connection&) = delete;
     ~Connection();

@@ -126,7 +126,7 @@ TEST(Store, IsReadByOneWhoMayNotWriteThere) {
     for (const char* part : {"", "-wal"}) std::filesystem::rename(path + "2" + part, path + part);
     EXPECT_THAT(asStranger(count), HasSubstr("its latest changes are only in the log beside it"));
     EXPECT_EQ(count(), "10");
-    Connection(path, Connection::Access::readWrite).run("PRAGMA user_version = 99");
+    Connection(path, Connection::Mode::readWrite).run("PRAGMA user_version = 99");
     EXPECT_THAT(asStranger(count), HasSubstr("newer version"));
 }
 
@@ -134,7 +134,7 @@ TEST(Store, RefusesWhatIsNoContentDatabaseOfThisVersion) {
     const TemporaryFolder folder;
     const std::string newer = folder.path("newer");
     store(newer, {});
-    Connection(newer, Connection::Access::readWrite).run("PRAGMA user_version = 99");
+    Connection(newer, Connection::Mode::readWrite).run("PRAGMA user_version = 99");
     folder.write("song.wav", std::string(5000, 'x'));
     const std::string empty = folder.write("empty", "");
     const std::string pipe = folder.path("pipe");
