@@ -82,7 +82,8 @@ TEST(LoopFileRead, TakesTheMusicOfAiffFilesAndLeavesLoopPointsOut) {
     const std::string markers =
         big(4, 2) + marker(1, 900, "end") + marker(2, 10, "") + marker(3, 5, "odd") + marker(7, 400, "even");
     const std::string instrument = big(60, 1) + std::string(7, '\x01') + big(1, 2) + big(3, 2) + big(1, 2) +
-                                   big(0, 2) + big(7, 2) + big(7, 2);
+                                   big(0, 2) + big(7, 2) + big(7, 2) + big(1, 2) + big(2, 2) +
+                                   big(7, 2);  // and no third loop
     const std::string file =
         Aiff::file(Aiff::common() + Aiff::chunk("NAME", "Shaker") + Aiff::chunk("MARK", markers) +
                    Aiff::chunk("INST", instrument) + Aiff::chunk("MIDI", test::emptyMidi()) + Aiff::sound());
@@ -93,6 +94,13 @@ TEST(LoopFileRead, TakesTheMusicOfAiffFilesAndLeavesLoopPointsOut) {
     EXPECT_THAT(data->transientMarkers(), ElementsAre(10, 400));
     EXPECT_EQ(data->tavioLoopType(), 1);
     EXPECT_EQ(data->midiData().size(), test::emptyMidi().size());
+}
+
+TEST(LoopFileRead, TakesNotesThatAreAByteLongerThanWhatIsReadAtOnce) {
+    const std::string notes = test::emptyMidi() + std::string(4097 - test::emptyMidi().size(), '\0');
+    const auto data =
+        parserOf(Aiff::file(Aiff::common() + Aiff::chunk("MIDI", notes) + Aiff::sound()))->fileData();
+    EXPECT_EQ(data->midiData().size(), notes.size());
 }
 
 TEST(LoopFileRead, TakesTheMusicOfCafFilesWhoseLoopsNobodyAuthored) {

@@ -164,6 +164,19 @@ TEST(LoopFileWrite, TheSizesOfTheFormAreThoseOfTheFile) {
     }
 }
 
+TEST(LoopFileWrite, TheSizeOfAFormWithoutATableOfSizesIsThatOfTheFile) {
+    const Wav wav;
+    const std::string chunks = wav.format() + wav.data();
+    const std::string sizes = wav.chunk("ds64", test::little(4 + 16 + chunks.size(), 8));
+    const TemporaryFolder folder;
+    const std::string path =
+        folder.write("short-ds64.wav", "RF64" + test::little(0xFFFFFFFF, 4) + "WAVE" + sizes + chunks);
+    ASSERT_TRUE(tag(path));
+    const std::string written = contentsOf(path);
+    EXPECT_EQ(sizeAt(written, 20, 8, false), written.size() - 8);
+    EXPECT_FALSE(read(path)->taggingDictionary().empty());
+}
+
 TEST(LoopFileWrite, TheRecordGoesBehindTheAudioExceptWhereTheAudioIsOpenEnded) {
     const TemporaryFolder folder;
     const std::string closed = folder.write("a.caf", Caf::file(Caf::description() + Caf::data()));
