@@ -1004,7 +1004,8 @@ TEST_F(Indexing, FindsDamageOnAnyPageAndKeepsAllFolders) {
         folder_.write("db", bytes);
         notes_.clear();
         const IndexProgress progress = index([](IndexOptions& options) { options.prune = true; });
-        EXPECT_THAT(notes_, ElementsAre(testing::ContainsRegex("built anew, with [1-9][0-9]* items"))) << page;
+        EXPECT_THAT(notes_, ElementsAre(testing::ContainsRegex("built anew, with [1-9][0-9]* items")))
+            << page;
         EXPECT_LT(progress.described, 150U) << page;
         EXPECT_THAT(names(), testing::UnorderedElementsAreArray(all)) << page;
         const auto rebuilt = ContentDatabase::open(database());
