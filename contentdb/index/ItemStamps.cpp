@@ -1,5 +1,6 @@
 #include "contentdb/index/ItemStamps.h"
 
+#include "contentdb/index/BundleWalk.h"
 #include "platform/files/Paths.h"
 
 #include <algorithm>
@@ -21,30 +22,15 @@ void include(ItemStamp& stamp, const EntryStatus& other) {
     stamp.inode = stamp.inode * 31 + other.inode;
 }
 
-/// Includes everything that lies in a bundle, up to a bound that no real bundle reaches. The bundle itself
-/// may be a link and is followed; links inside it are not.
-class BundleStamp {
-  public:
-    explicit BundleStamp(ItemStamp& stamp) : stamp_(stamp) {}
-
-    void include(const FolderListing& parent, const FolderListing::Entry& bundle, int depth = 0) {
-        constexpr int deepest = 16;
-        const auto listing =
-            depth > deepest ? std::nullopt : parent.readIn(bundle, depth == 0 ? Links::follow : Links::keep);
-        if (!listing) return;
-        for (const FolderListing::Entry& entry : listing->entries()) {
-            const auto status = left_ == 0 ? std::nullopt : listing->status(entry, Links::keep);
-            if (!status) continue;
-            --left_;
-            contentdb::include(stamp_, *status);
-            if (status->kind == EntryKind::folder) include(*listing, entry, depth + 1);
-        }
-    }
-
-  private:
-    ItemStamp& stamp_;
-    int left_ = 10'000;
-};
+/// Everything that lies in a bundle, which may itself be a link.
+void includeBundle(ItemStamp& stamp, const FolderListing& parent, const FolderListing::Entry& entry) {
+    const auto bundle = parent.readIn(entry, Links::follow);
+    if (!bundle) return;
+    forEachInBundle(*bundle, [&stamp](const BundleEntry& found) {
+        if (const auto status = found.folder.status(found.entry, Links::keep)) include(stamp, *status);
+        return true;
+    });
+}
 
 /// The record, description and preview that lie beside an item. The size stays the item's own.
 void includeCompanions(const FolderListing& listing, ListedItem& item) {
@@ -72,7 +58,7 @@ std::vector<ListedItem> listedItems(const ContentFolder& folder, const WalkFailu
         }
         ListedItem item{found.entry.name, stampOf(*status)};
         includeCompanions(folder.listing, item);
-        if (found.kind == ContentKind::bundle) BundleStamp(item.stamp).include(folder.listing, found.entry);
+        if (found.kind == ContentKind::bundle) includeBundle(item.stamp, folder.listing, found.entry);
         items.push_back(item);
     }
     return items;

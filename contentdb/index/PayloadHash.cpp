@@ -1,24 +1,22 @@
 #include "contentdb/index/PayloadHash.h"
 
+#include "contentdb/index/BundleWalk.h"
 #include "contentdb/store/Digest.h"
 #include "formats/QVContentTaggingTypes.h"
 #include "formats/preset/PresetRecord.h"
 #include "media/loopfile/LCFileData.h"
 #include "platform/base/ByteOrder.h"
 #include "platform/base/BytesAsText.h"
+#include "platform/files/FolderListing.h"
+#include "platform/files/Paths.h"
 #include "platform/files/RandomAccessReader.h"
 #include "taxonomy/TaggingTypes.h"
 
-#include <algorithm>
 #include <array>
-#include <filesystem>
 #include <span>
-#include <vector>
 
 namespace qvct::contentdb {
 namespace {
-
-namespace fs = std::filesystem;
 
 constexpr std::uint64_t kBlock = 4096;
 constexpr std::uint64_t kBlocks = 16;
@@ -81,45 +79,30 @@ bool addPreset(Payload& payload, ItemFile& file) {
     return preset.has_value();
 }
 
-bool addFileOfBundle(Payload& payload, ContentItem& item, const fs::path& path) {
+bool addFileOfBundle(Payload& payload, ContentItem& item, const std::string& path) {
     ItemFile* description = item.descriptionFile();
     if (description != nullptr && description->url().path() == path) return addFile(payload, *description);
-    ItemFile file(URL::fileURLWithPath(path.string()));
+    ItemFile file(URL::fileURLWithPath(path));
     return addFile(payload, file);
 }
 
-/// The files below the folder but for records and what is hidden, in the order of their names; links are not
-/// followed.
-bool addFolder(Payload& payload, ContentItem& item, const fs::path& folder, std::size_t& budget,
-               std::size_t depth) {
-    constexpr std::size_t deepest = 16;
-    std::error_code failure;
-    std::vector<fs::directory_entry> entries;
-    for (fs::directory_iterator at(folder, failure), end; !failure && at != end; at.increment(failure)) {
-        const std::string name = at->path().filename().string();
-        if (name[0] != '.' && name != QVContentTaggingTagsPlistName) entries.push_back(*at);
-    }
-    if (failure || depth > deepest || entries.size() > budget) return false;
-    budget -= entries.size();
-    std::sort(entries.begin(), entries.end());
-    for (const fs::directory_entry& entry : entries) {
-        const fs::file_status status = entry.symlink_status(failure);
-        payload.digest.add(entry.path().filename().string());
-        if (fs::is_directory(status) && !addFolder(payload, item, entry.path(), budget, depth + 1))
-            return false;
-        if (fs::is_regular_file(status) && !addFileOfBundle(payload, item, entry.path())) return false;
-    }
-    return true;
+/// The files in the bundle with their names, but for records.
+bool addBundle(Payload& payload, ContentItem& item) {
+    const auto bundle = FolderListing::read(item.url().path());
+    return bundle && forEachInBundle(*bundle, [&](const BundleEntry& found) {
+               const std::string name(found.entry.name);
+               if (name == QVContentTaggingTagsPlistName) return true;
+               payload.digest.add(name);
+               const std::string path = pathIn(item.url().path(), found.folderPath + name);
+               return found.entry.kind != EntryKind::file || addFileOfBundle(payload, item, path);
+           });
 }
 
 bool addContent(Payload& payload, ContentItem& item) {
-    constexpr std::size_t mostFiles = 10000;
-    const URL& url = item.url();
-    std::size_t budget = mostFiles;
-    switch (QVContentTaggingTypes::fallBackFileTypeForURL(url)) {
+    switch (QVContentTaggingTypes::fallBackFileTypeForURL(item.url())) {
         case kFileTypePatch:
         case kFileTypeProject:
-            return addFolder(payload, item, url.path(), budget, 0);
+            return addBundle(payload, item);
         case kFileTypeSynthPreset:
             return addPreset(payload, item.file());
         case kFileTypeSamplerSettings:

@@ -1,6 +1,7 @@
 #include "contentdb/store/ContentStore.h"
 
 #include "contentdb/store/ItemCodec.h"
+#include "contentdb/store/StampColumns.h"
 #include "platform/files/Paths.h"
 #include "platform/text/Text.h"
 
@@ -9,16 +10,20 @@
 namespace qvct::contentdb {
 namespace {
 
-constexpr std::string_view kItemColumns =
-    "SELECT folder.path, item.file, size, modified, changed, inode, payload, description FROM item "
-    "JOIN folder ON folder.id = item.folder ";
+/// The items that a condition picks.
+std::string itemsWhere(std::string_view condition) {
+    return fmt::format(
+        "SELECT folder.path, item.file, payload, description, {} FROM item "
+        "JOIN folder ON folder.id = item.folder WHERE {}",
+        kStampColumns, condition);
+}
 
 IndexedItem readItem(const Statement& row, const Connection& connection) {
     IndexedItem item;
     item.path = pathIn(row.bytes(0), row.bytes(1));
-    item.stamp = {row.unsignedInteger(2), row.integer(3), row.integer(4), row.unsignedInteger(5)};
-    item.payloadHash = row.bytes(6);
-    if (!decodeDescription(row.bytes(7), item)) {
+    item.payloadHash = row.bytes(2);
+    item.stamp = stampIn(row, 4);
+    if (!decodeDescription(row.bytes(3), item)) {
         throw DatabaseFailure(kErrorMalformed,
                               fmt::format("the database is damaged: the record of {}", printable(item.path)),
                               connection.path());
@@ -35,7 +40,7 @@ FolderRecord folderIn(const Statement& row) {
 
 ContentStore::ContentStore(Connection& connection)
     : connection_(connection),
-      item_(connection, std::string(kItemColumns) + "WHERE item.id = ?"),
+      item_(connection, itemsWhere("item.id = ?")),
       idOfPath_(
           connection,
           "SELECT item.id FROM folder JOIN item ON item.folder = folder.id WHERE path = ? AND file = ?"),
@@ -77,13 +82,11 @@ FolderRecord ContentStore::folder(std::string_view path) {
 
 std::map<std::string, FileRecord, std::less<>> ContentStore::files(std::int64_t folder) {
     Statement statement(connection_,
-                        "SELECT file, id, size, modified, changed, inode, failed FROM item WHERE folder = ?");
+                        fmt::format("SELECT file, id, failed, {} FROM item WHERE folder = ?", kStampColumns));
     std::map<std::string, FileRecord, std::less<>> files;
     for (statement.bind(1, folder); statement.step();) {
-        files[std::string(statement.bytes(0))] = {statement.integer(1),
-                                                  {statement.unsignedInteger(2), statement.integer(3),
-                                                   statement.integer(4), statement.unsignedInteger(5)},
-                                                  statement.integer(6) != 0};
+        files[std::string(statement.bytes(0))] = {statement.integer(1), stampIn(statement, 3),
+                                                  statement.integer(2) != 0};
     }
     return files;
 }
@@ -120,7 +123,7 @@ std::uint64_t ContentStore::describer() {
 }
 
 void ContentStore::forEachFailure(const std::function<bool(const IndexedItem&)>& visit) {
-    Statement statement(connection_, std::string(kItemColumns) + "WHERE failed = 1 ORDER BY item.id");
+    Statement statement(connection_, itemsWhere("failed = 1 ORDER BY item.id"));
     while (statement.step() && visit(readItem(statement, connection_))) {
     }
 }

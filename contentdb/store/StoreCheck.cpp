@@ -2,6 +2,7 @@
 
 #include "contentdb/store/FolderDigest.h"
 #include "contentdb/store/Part.h"
+#include "contentdb/store/StampColumns.h"
 #include "contentdb/terms/Terms.h"
 #include "platform/text/Text.h"
 
@@ -36,7 +37,7 @@ std::optional<std::string> misjudgedFolder(Connection& connection) {
     Statement folder(connection,
                      "SELECT id, path, digest, part, parts FROM folder WHERE digest <> 0 AND gone = 0");
     Statement items(connection,
-                    "SELECT file, size, modified, changed, inode FROM item WHERE folder = ? ORDER BY file");
+                    fmt::format("SELECT file, {} FROM item WHERE folder = ? ORDER BY file", kStampColumns));
     while (folder.step()) {
         const std::string path(folder.bytes(1));
         const Part part{static_cast<unsigned>(folder.integer(3)), static_cast<unsigned>(folder.integer(4))};
@@ -45,9 +46,7 @@ std::optional<std::string> misjudgedFolder(Connection& connection) {
         for (items.bind(1, folder.integer(0)); items.step();) {
             if (!part.holds(path, items.bytes(0))) continue;
             names.emplace_back(items.bytes(0));
-            listed.push_back(
-                {names.back(),
-                 {items.unsignedInteger(1), items.integer(2), items.integer(3), items.unsignedInteger(4)}});
+            listed.push_back({names.back(), stampIn(items, 1)});
         }
         items.reset();
         if (digestOf(listed) != folder.unsignedInteger(2)) return path;

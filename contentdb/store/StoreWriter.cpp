@@ -1,6 +1,7 @@
 #include "contentdb/store/StoreWriter.h"
 
 #include "contentdb/store/ItemCodec.h"
+#include "contentdb/store/StampColumns.h"
 #include "contentdb/terms/Terms.h"
 #include "contentdb/terms/Words.h"
 #include "formats/QVContentTaggingTypes.h"
@@ -98,8 +99,8 @@ void StoreWriter::put(ItemId id, const IndexedItem& item, const std::vector<std:
     const Place place = placeOf(item.path);
     const std::string description = encodedDescription(item);
     put_.bind(1, id).bind(2, folderId(place.folder)).bind(3, place.file);
-    put_.bind(4, item.stamp.size).bind(5, item.stamp.modified).bind(6, item.stamp.changed);
-    put_.bind(7, item.stamp.inode).bind(8, item.payloadHash).bind(9, std::int64_t{!item.failure.empty()});
+    bindStamp(put_, 4, item.stamp);
+    put_.bind(8, item.payloadHash).bind(9, std::int64_t{!item.failure.empty()});
     put_.bind(10, description).execute();
 }
 

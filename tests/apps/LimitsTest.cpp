@@ -1,6 +1,7 @@
 // What one file may cost, whatever is in it: time and memory in proportion to its size.
 
 #include "demo/Library.h"
+#include "support/AudioFixtures.h"
 #include "support/Places.h"
 #include "support/TemporaryFolder.h"
 #include "support/Texts.h"
@@ -130,6 +131,23 @@ TEST(Limits, HoldForContentOfEveryKind) {
     const TemporaryFolder folder;
     demo::writeLibrary(folder.path());
     EXPECT_GT(expectWithinLimits(folder.path()), 50U);
+}
+
+TEST(Limits, MemoryDoesNotGrowWithTheNumberOfItems) {
+    const TemporaryFolder few;
+    const TemporaryFolder many;
+    const std::string sound = Wav().file(Wav().format() + Wav().data(0));
+    const auto fill = [&sound](const TemporaryFolder& folder, int items) {
+        for (int i = 0; i < items; ++i) folder.write(fmt::format("{}/Kick {}.wav", i / 100, i), sound);
+    };
+    fill(few, 100);
+    fill(many, 4000);
+    for (const char* form : {"--json", "--jsonl"}) {
+        const auto memory = [form](const TemporaryFolder& folder) {
+            return costOf({QVCT_TOOL, "autotag", form, folder.path()}).mebibytes;
+        };
+        EXPECT_LT(memory(many), memory(few) + 4) << form;
+    }
 }
 
 TEST(Limits, HoldForInputsThatFuzzingFound) {
