@@ -169,10 +169,10 @@ struct ScriptContext::Implementation {
         }
     }
 
-    /// Runs `work`, which enters the machine, under the limits; false once one was reached.
+    /// Runs `work`, which enters the machine, under the limits; does nothing once one was reached.
     template <typename Work>
-    bool run(Work work) {
-        if (stop != Stop::none) return false;
+    void run(Work work) {
+        if (stop != Stop::none) return;
         if (Clock::now() >= deadline) {
             stop = Stop::time;
         } else {
@@ -180,7 +180,6 @@ struct ScriptContext::Implementation {
             work();
         }
         if (stop != Stop::none) logStop();
-        return stop == Stop::none;
     }
 
     /// Called by the machine at the end of each slice. It has to request the next slice itself, even when it
@@ -342,17 +341,16 @@ void ScriptContext::exposeDocument(const QVCTXMLDocument& document) {
                 engine().JSObjectMake(self.context, Implementation::documentClass(), nullptr));
 }
 
-bool ScriptContext::evaluate(std::string_view script) {
+void ScriptContext::evaluate(std::string_view script) {
     Implementation& self = *implementation_;
-    JSValueRef exception = nullptr;
     const Prepared& program = prepared(script);
-    const bool ran = self.run([&] {
+    self.run([&] {
         if (!program.isOwn) self.guard();
         if (self.stop != Implementation::Stop::none) return;
+        JSValueRef exception = nullptr;
         engine().JSEvaluateScript(self.context, program.text.get(), nullptr, nullptr, 1, &exception);
         if (exception != nullptr) self.logException(exception, script);
     });
-    return ran && exception == nullptr;
 }
 
 std::optional<PropertyList::Array> ScriptContext::callForArray(std::string_view function) {

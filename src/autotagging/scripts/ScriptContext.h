@@ -46,8 +46,8 @@ class ScriptContext {
     /// Makes the document's three operations callable as the global `document`. It must outlive the context.
     void exposeDocument(const QVCTXMLDocument& document);
 
-    /// Runs a program. False when it ended with a fault.
-    bool evaluate(std::string_view script);
+    /// Runs a program.
+    void evaluate(std::string_view script);
 
     /// Calls the global function without arguments and converts the array that it returns: objects become
     /// dictionaries; null, undefined and symbols are left out. Nothing when there is no such function, it
