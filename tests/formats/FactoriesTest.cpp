@@ -15,6 +15,8 @@
 #include "support/AudioFixtures.h"
 #include "support/Corpus.h"
 
+#include <array>
+#include <chrono>
 #include <filesystem>
 #include <functional>
 #include <future>
@@ -98,6 +100,7 @@ struct Items {
         folder.write("plain.wav", plainWav());
         folder.write("loop.wav", loopWav());
         folder.write("named.any", plainWav());
+        test::writeList(folder, "record.loopdata", {{"Type", 1}});
         folder.write("broken.wav", "RIFF");
         folder.write("Bass.cst", "");
         folder.write("Bass.cst.caf", Caf::file(Caf::description() + Caf::data()));
@@ -146,6 +149,7 @@ TEST(FileNode, FindsTheValidatorWithItsActionsReaderAndWriters) {
         {"plain.wav", audio, 12, "plain.wav"},
         {"loop.wav", loop, 12, "loop.wav"},
         {"named.any", audio, 12, "named.any"},
+        {"record.loopdata", loop, 12, "record.loopdata"},
         {"Bass.cst", settings, 1, ""},
         {"Sampler.sxv", settings, 3, ""},
         {"Echo.PST", settings, 3, ""},
@@ -310,36 +314,72 @@ TEST(ReadersAndWriters, TakeNoOtherURLForAPathOfThisMachine) {
     EXPECT_EQ(error.message(), remote.absoluteString() + ": is no file URL");
 }
 
-TEST(Writers, LeaveAloneWhatAnotherWriterDoesNotLetGo) {
-    const TemporaryFolder folder;
-    const std::string loop = folder.write("a.wav", loopWav());
-    test::writeList(folder, "a.patch/tags.plist", {{"Type", 1}});
-    folder.write("a.cst", "x");
-    folder.write("a.vcp", "<tagging>\n</tagging>\n");
-    std::vector<std::future<std::string>> reasons;
-    const auto files = [&folder] {
-        std::map<std::string, std::string> contents;
-        for (const std::string& path : test::filesBelow(folder.path())) contents[path] = test::readAll(path);
-        return contents;
-    };
-    const auto before = files();
-    const auto turn = EditLock::acquire(loop);
-    for (const char* name : {"a.wav", "a.patch", "a.cst", "a.vcp"}) {
-        reasons.push_back(std::async(std::launch::async, [url = urlOf(folder.path(name))] {
+/// An item for each kind of writer, in a folder that the test has its turn in.
+class WritersInTurn : public testing::Test {
+  protected:
+    WritersInTurn() {
+        test::writeList(folder_, "a.patch/tags.plist", {{"Type", 1}});
+        folder_.write("a.cst", "x");
+        folder_.write("a.vcp", "<tagging>\n</tagging>\n");
+        folder_.write("chunks.wav", loopWav());
+    }
+
+    std::string write(const char* name, const char* genre) const {
+        const URL url = urlOf(folder_.path(name));
+        Error error;
+        TGRTMetaDataWriterFactory::taggingWriterForURL(url)->writeTaggings(
+            test::taggingsOf({{"Genres", genre}}), url, &error);
+        return error.message();
+    }
+
+    /// Each writer writes in a thread of its own, and says why it could not.
+    std::vector<std::future<std::string>> writeAll() const {
+        std::vector<std::future<std::string>> reasons;
+        for (const char* name : kNames)
+            reasons.push_back(std::async(std::launch::async, [this, name] { return write(name, "House"); }));
+        reasons.push_back(std::async(std::launch::async, [url = urlOf(folder_.path("chunks.wav"))] {
             Error error;
-            const auto writer = TGRTMetaDataWriterFactory::taggingWriterForURL(url);
-            EXPECT_FALSE(writer->writeTaggings(test::taggingsOf({{"Genres", "House"}}), url, &error));
+            LCFileWriter::fileWriterForURL(url)->writeFileData(std::make_shared<LCFileData>(), &error);
             return error.message();
         }));
+        return reasons;
     }
-    reasons.push_back(std::async(std::launch::async, [url = urlOf(loop)] {
-        Error error;
-        EXPECT_FALSE(
-            LCFileWriter::fileWriterForURL(url)->writeFileData(std::make_shared<LCFileData>(), &error));
-        return error.message();
-    }));
-    for (auto& reason : reasons) EXPECT_THAT(reason.get(), testing::HasSubstr("waited 30 s for a turn"));
+
+    std::map<std::string, std::string> files() const {
+        std::map<std::string, std::string> contents;
+        for (const std::string& path : test::filesBelow(folder_.path())) contents[path] = test::readAll(path);
+        return contents;
+    }
+
+    static constexpr std::array kNames = {"a.wav", "a.patch", "a.cst", "a.vcp"};
+    TemporaryFolder folder_;
+    std::unique_ptr<EditLock> turn_ = EditLock::acquire(folder_.write("a.wav", loopWav()));
+};
+
+TEST_F(WritersInTurn, WaitBeforeTheyReadWhatTheyChange) {
+    auto reasons = writeAll();
+    for (auto& reason : reasons)
+        EXPECT_EQ(reason.wait_for(std::chrono::milliseconds(100)), std::future_status::timeout);
+    for (const char* name : kNames) EXPECT_EQ(write(name, "Techno"), "");
+    turn_.reset();
+    for (auto& reason : reasons) EXPECT_EQ(reason.get(), "");
+}
+
+TEST_F(WritersInTurn, LeaveAloneWhatAnotherWriterDoesNotLetGo) {
+    const auto before = files();
+    for (auto& reason : writeAll()) EXPECT_THAT(reason.get(), testing::HasSubstr("waited 30 s for a turn"));
     EXPECT_EQ(files(), before);
+}
+
+TEST(FileNode, IsKnownByItsURLAndAPackByItsIdentifier) {
+    const auto node = TGRTFileNode::nodeWithFileURL(urlOf("/a.wav"));
+    const auto pack = TGRTPackage::packageWithIdentifier("a");
+    EXPECT_TRUE(node->isEqual(*TGRTFileNode::nodeWithFileURL(urlOf("/a.wav"))));
+    EXPECT_FALSE(node->isEqual(*TGRTFileNode::nodeWithFileURL(urlOf("/b.wav"))));
+    EXPECT_FALSE(node->isEqual(*pack));
+    EXPECT_TRUE(pack->isEqual(*TGRTPackage::packageWithIdentifier("a")));
+    EXPECT_FALSE(pack->isEqual(*TGRTPackage::packageWithIdentifier("b")));
+    EXPECT_FALSE(pack->isEqual(*node));
 }
 
 TEST(Packages, GatherTheItemsThatNameThem) {

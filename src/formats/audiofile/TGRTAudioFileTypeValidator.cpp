@@ -34,8 +34,7 @@ std::optional<URL> TGRTAudioFileTypeValidator::prelistenURLForFileURL(const URL&
 }
 
 bool TGRTTavioLoopTypeValidator::isValidContentTypeAtFileURL(const URL& url) const {
-    const auto fileData = fileDataOf(url, kLCLoopFiles);
-    return fileData && fileData->hasLoopTypeChunks();
+    return fileDataOf(url, kLCLoopFiles) != nullptr;  // with loop-type chunks, by which the parser tells them
 }
 
 }  // namespace qvct
