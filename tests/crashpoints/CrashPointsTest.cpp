@@ -611,6 +611,37 @@ TEST_P(CrashPointsOfIndexRuns, FlushInOrder) {
     expectFlushesInOrder(callsOf(indexFolder, restored(folder, files)), isReplaced);
 }
 
+TEST_F(CrashPoints, OfAWriteLeaveNothingThatAnotherOneRemoves) {
+    const TemporaryFolder folder;
+    const Item item = itemsOfEveryKind().front();
+    const std::string path = restored(folder, item.files);
+    EXPECT_EQ(run(actOn(item, writeTwoTags), path), Outcome::succeeded);
+    const std::size_t calls = shared().calls;
+    for (std::size_t at = 0; at < calls; ++at) {
+        restored(folder, item.files);
+        CutPlan plan;
+        plan.otherProgram = [&path] {
+            const Files unfinished = filesIn(path, true);
+            removeLeftFiles(path + "/./");  // by another name, since it was looked through a moment ago
+            if (filesIn(path, true) != unfinished) ::_exit(1);
+        };
+        plan.interruptedAt = at;
+        EXPECT_EQ(run(actOn(item, writeTwoTags), path, plan), Outcome::succeeded) << "call " << at;
+    }
+}
+
+TEST_F(CrashPoints, WithoutLocksLeaveNothingForMoreThanADay) {
+    const TemporaryFolder folder;
+    const Item item = itemsOfEveryKind().front();
+    for (const bool isOld : {false, true}) {
+        const std::string path = restored(folder, item.files);
+        folder.write("user/.qvct-1-0.tmp", "left, or still being written");
+        const CutPlan plan{.hasNoLocks = true, .ahead = std::time_t{isOld ? 25 : 23} * 60 * 60};
+        EXPECT_EQ(run(actOn(item, writeTwoTags), path, plan), Outcome::succeeded);
+        EXPECT_EQ(filesIn(path, true).empty(), isOld);
+    }
+}
+
 TEST_F(CrashPoints, OfMergesFlushInOrder) {
     const TemporaryFolder folder;
     expectFlushesInOrder(callsOf(mergeSlices, restored(folder, slices(folder))));

@@ -13,6 +13,7 @@
 #include <dlfcn.h>
 #include <fcntl.h>
 #include <fmt/format.h>
+#include <sys/file.h>
 #include <sys/stat.h>
 #include <sys/xattr.h>
 #include <unistd.h>
@@ -252,6 +253,20 @@ QVCT_INTERPOSED int unlink(const char* path) noexcept {
 QVCT_INTERPOSED int unlinkat(int folder, const char* path, int flags) noexcept {
     static const auto real = next<int (*)(int, const char*, int)>("unlinkat");
     return whole("unlinkat", path, [&] { return real(folder, path, flags); });
+}
+
+QVCT_INTERPOSED int flock(int descriptor, int operation) noexcept {
+    static const auto real = next<int (*)(int, int)>("flock");
+    if (!plan.hasNoLocks) return real(descriptor, operation);
+    errno = ENOLCK;
+    return -1;
+}
+
+QVCT_INTERPOSED time_t time(time_t* result) noexcept {
+    static const auto real = next<time_t (*)(time_t*)>("time");
+    const time_t now = real(nullptr) + plan.ahead;
+    if (result != nullptr) *result = now;
+    return now;
 }
 
 QVCT_INTERPOSED int mkdir(const char* path, mode_t mode) noexcept {

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstdint>
+#include <ctime>
 #include <functional>
 #include <string>
 #include <vector>
@@ -27,6 +28,8 @@ struct CutPlan {
     /// What another program does right before the call numbered `interruptedAt`; its calls are not counted.
     std::function<void()> otherProgram = nullptr;
     std::uint64_t interruptedAt = 0;
+    bool hasNoLocks = false;  ///< As on a file system that knows none.
+    std::time_t ahead = 0;    ///< Seconds by which the clock is.
 };
 
 struct Call {
