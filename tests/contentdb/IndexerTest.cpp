@@ -628,6 +628,15 @@ TEST_F(Indexing, GivesWorkToThreadsThatHadNone) {
     EXPECT_EQ(progress.described, 200U);
 }
 
+TEST_F(Indexing, StopsWhenToldAmongTheItemsOfAFolder) {
+    for (int i = 0; i < 400; ++i) write(fmt::format("Kick {}.wav", i), "");  // more than two queues hold
+    const IndexProgress progress = index([](IndexOptions& options) {
+        options.workers = 1;
+        options.isCancelled = [] { return true; };
+    });
+    EXPECT_LE(progress.described, 128U) << "more than were on their way";
+}
+
 TEST_F(Indexing, HasEachItemDescribedOnce) {
     constexpr std::size_t count = 500;  // several queues full
     for (std::size_t i = 0; i < count; ++i) write(fmt::format("logs {}.wav", i), "");

@@ -5,6 +5,7 @@
 #include <functional>
 #include <set>
 
+#include <fmt/format.h>
 #include <gmock/gmock.h>
 #include <sys/stat.h>
 #include <sys/wait.h>
@@ -152,6 +153,21 @@ TEST(Store, RefusesWhatIsNoContentDatabaseOfThisVersion) {
         EXPECT_EQ(ContentDatabase::open(one.path, &error), nullptr) << one.path;
         EXPECT_THAT(error.message(), HasSubstr(one.reason));
         EXPECT_THAT(error.message(), HasSubstr(one.path));
+    }
+}
+
+TEST(Store, ReadsNoRecordThatEndsTooEarlyOrTooLate) {
+    const std::vector<IndexedItem> items = generatedItems(4, 1);
+    for (const char* damaged :
+         {"substr(description, 1, length(description) - 1)", "CAST(description || 'x' AS BLOB)",
+          "CAST(description || CAST(x'0178' AS TEXT) || 'x' AS BLOB)"}) {
+        const TemporaryFolder folder;
+        store(folder.path("db"), items);
+        Connection(folder.path("db"), Connection::Mode::readWrite)
+            .run(fmt::format("UPDATE item SET description = {}", damaged).c_str());
+        Error error;
+        EXPECT_FALSE(ContentDatabase::open(folder.path("db"))->item(items[0].path, &error)) << damaged;
+        EXPECT_THAT(error.message(), HasSubstr("the record of " + items[0].path));
     }
 }
 

@@ -171,7 +171,7 @@ TEST(MidiSequence, RefusesHeadersThatGiveTimeNoUnit) {
         const char* reason;
     } const cases[] = {{{}, "header"},
                        {Bytes{'M', 'T', 'h', 'd'}, "header"},
-                       {Bytes{'R', 'I', 'F', 'F'} + Bytes(20, 0), "header"},
+                       {Bytes{'R', 'I', 'F', 'F'} + Bytes(20, 0), "no standard MIDI file header"},
                        {header(0, 1, 0) + music, "division of 0"},
                        {header(0, 1, 0xE700) + music, "division of 0"},
                        {header(3, 1, 96) + music, "format 3"}};
@@ -193,6 +193,11 @@ TEST(MidiSequence, SurvivesManyTracksAndFalseCounts) {
     EXPECT_EQ(announced->tracks().size(), 1U);
     ASSERT_EQ(announced->problems().size(), 1U);
     EXPECT_EQ(announced->problems()[0].message(), "byte 10: 65535 tracks announced, 1 found");
+
+    const auto foreign =
+        MidiSequence::parse(header(0, 1, 96) + Bytes{'M', 'i', 'n', 'e', 0, 0, 0, 1, 0} + music);
+    EXPECT_EQ(foreign->tracks().size(), 1U);
+    EXPECT_THAT(foreign->problems(), testing::IsEmpty());
 
     Bytes many = header(1, 65535, 96);
     many.reserve(many.size() + 65536 * music.size());

@@ -91,8 +91,16 @@ TEST(Decompression, NoPartOfDamagedDataIsReturned) {
     Bytes flipped = gzip(plain);
     flipped[flipped.size() / 2] ^= 0xff;
     EXPECT_FALSE(decompress(flipped));
-    for (const char* text : {"", "x", "<?xml version=\"1.0\"?>", "\x1f\x8b"}) {
-        EXPECT_FALSE(decompress(bytesOf(text))) << text;
+    const std::string neither = "neither gzip nor zlib nor Zstandard data";
+    const std::pair<const char*, std::string> cases[] = {{"", neither},
+                                                         {"x", neither},
+                                                         {"<?xml version=\"1.0\"?>", neither},
+                                                         {"\x1f, which begins gzip data", neither},
+                                                         {"\x1f\x8b", "deflated data, byte 2: cut short"}};
+    for (const auto& [text, reason] : cases) {
+        Error error;
+        EXPECT_FALSE(decompress(bytesOf(text), &error)) << text;
+        EXPECT_EQ(error.message(), reason) << text;
     }
 }
 

@@ -58,6 +58,8 @@ TEST(Tag, BelongsToParentAndCategoryAndIsKnownByTheThreeLabels) {
     EXPECT_THAT(labels(category->orderedTags()), ElementsAre("House", "Deep", "Techno", "Deep"));
     EXPECT_FALSE(deep->isEqual(*other));
     const auto elsewhere = TGRTCategory::initWithIdentifier("Genres");
+    EXPECT_TRUE(category->isEqual(*elsewhere));
+    EXPECT_FALSE(category->isEqual(*TGRTCategory::initWithIdentifier("Rhythm")));
     EXPECT_TRUE(deep->isEqual(
         *TGRTTag::initWithLabel("Deep", TGRTTag::initWithLabel("House", nullptr, elsewhere), elsewhere)));
     deep->setLabel("Changed");
@@ -224,6 +226,8 @@ TEST(Taxonomy, ReadOnlyRefusesButForContentPacks) {
     ASSERT_NE(pack, nullptr);
     EXPECT_EQ(taxonomy->findTagForLabel("9999_new"), pack);
     EXPECT_TRUE(taxonomy->doesContainTag(pack));
+    const auto namesake = TGRTCategory::initWithIdentifier(pack->categoryIdentifier());
+    EXPECT_FALSE(taxonomy->doesContainTag(TGRTTag::initWithLabel("elsewhere", nullptr, namesake)));
 }
 
 TEST(Tag, TakesOverAChildNamedByAReferenceIntoTheOldList) {
