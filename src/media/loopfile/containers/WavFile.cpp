@@ -112,8 +112,7 @@ bool WavFile::readFormat(const Chunk& format, const Chunk& data, LCAudioFacts& f
     if (header.failed()) return failAt(error, format, "is too short");
     if (coding == kExtensible) {
         header.skip(8);
-        const std::uint16_t inner = header.u16();
-        if (!header.failed()) coding = inner;
+        coding = header.u16();  // 0, which is none, where the header ends before
     }
     if (!checkFormat(facts, format, error)) return false;
     if (coding != kPcm && coding != kFloat) {
