@@ -56,7 +56,6 @@ std::vector<std::string> XmlDocument::attributeValues(const std::string& xpath,
         context ? xmlXPathEvalExpression(xmlText(xpath.c_str()), context.get()) : nullptr);
     std::vector<std::string> values;
     if (!result || result->type != XPATH_NODESET || result->nodesetval == nullptr) return values;
-    xmlXPathNodeSetSort(result->nodesetval);
     for (int i = 0; i < result->nodesetval->nodeNr; ++i) {
         const xmlNode* node = result->nodesetval->nodeTab[i];
         const XmlOwned<xmlChar> value(
