@@ -1,5 +1,6 @@
 #include "autotagging/xml/QVCTXMLDocument.h"
 #include "autotagging/xml/QVCTXMLParser.h"
+#include "autotagging/xml/XPathCost.h"
 #include "autotagging/xml/XPathExpression.h"
 #include "platform/data/Json.h"
 #include "support/CapturedLog.h"
@@ -181,6 +182,10 @@ TEST(XmlDocument, WrongExpressionsSelectNothingAndAreLoggedOnce) {
     EXPECT_EQ(log.messages().size(), 5U);
     EXPECT_THAT(log.messages()[0], HasSubstr("XPath \"/a[[\", character 5: "));
     EXPECT_FALSE(xml->isMatchingXPath("/a[normalize-space('b', 'c') = 'c']"));
+    for (const auto& [length, rest] : {std::pair{200U, "\", "}, {201U, "...\", "}}) {
+        EXPECT_FALSE(xml->isMatchingXPath(std::string(length, '[')));
+        EXPECT_THAT(log.messages().back(), HasSubstr("XPath \"" + std::string(200, '[') + rest));
+    }
 }
 
 TEST(XmlDocument, AWrongExpressionIsToldOnceHoweverOftenItIsAsked) {
@@ -276,6 +281,14 @@ TEST(LocationPath, LeavesOtherFormsToTheLibrary) {
         ASSERT_NE(compiled, nullptr) << other;
         EXPECT_FALSE(compiled->isLocationPath()) << other;
     }
+}
+
+TEST(LocationPath, TakesNoMoreStepsForALongAttributeElsewhere) {
+    const test::CapturedLog log;
+    const auto xml =
+        document("<P n='" + std::string(1 << 20, 'x') + "'>" + repeated(30000, "<a n='#'/>") + "</P>");
+    EXPECT_TRUE(xml->isMatchingXPath("/P/a[@n='29999']"));
+    EXPECT_THAT(log.messages(), IsEmpty());
 }
 
 TEST(XMLDocument, TooLargeForMemoryIsCutShort) {
@@ -406,6 +419,17 @@ TEST(XPath, WhatCostsMoreThanItsStepsIsBounded) {
         EXPECT_THAT(log.messages(), ElementsAre(AllOf(HasSubstr("XPath \"" + row.expression.substr(0, 99)),
                                                       HasSubstr(row.reason))));
     }
+}
+
+TEST(XPath, ReadsAsMuchTextAsItMayAndNoByteMore) {
+    const test::CapturedLog log;
+    const std::string expression = "/P[contains(concat(@n" + repeated(40, ",@n") + "), 'x')]";
+    const std::size_t longest = kMostXPathText / costOfXPath(expression).texts;
+    ASSERT_LT(longest, 500000U);
+    for (const std::size_t length : {longest, longest + 1})
+        EXPECT_EQ(document("<P n='" + std::string(length, 'x') + "'/>")->isMatchingXPath(expression),
+                  length == longest);
+    EXPECT_THAT(log.messages(), ElementsAre(HasSubstr("reads too much text")));
 }
 
 TEST(XPath, FunctionsTakeTimeAsTheirTextsAreLong) {

@@ -79,8 +79,8 @@ TEST(LoopFileRead, TakesTheMusicOfAiffFilesAndLeavesLoopPointsOut) {
         return big(number, 2) + big(frame, 4) + big(name.size(), 1) + name +
                std::string(1 - name.size() % 2, '\0');
     };
-    const std::string markers =
-        big(4, 2) + marker(1, 900, "end") + marker(2, 10, "") + marker(3, 5, "odd") + marker(7, 400, "even");
+    const std::string markers = big(4, 2) + marker(1, 900, "end") + marker(2, 10, "") + marker(3, 5, "odd") +
+                                marker(7, 400, "even") + marker(8, 20, "not counted");
     const std::string instrument = big(60, 1) + std::string(7, '\x01') + big(1, 2) + big(3, 2) + big(1, 2) +
                                    big(0, 2) + big(7, 2) + big(7, 2) + big(1, 2) + big(2, 2) +
                                    big(7, 2);  // and no third loop
@@ -354,10 +354,12 @@ TEST(LoopFileRead, CountsTheFramesOfCodedWavAudio) {
         {kImaAdpcm, 2, 256, 1245, 2560, 2490},   // half of them, as some encoders write
         {kImaAdpcm, 2, 2048, 3061, 6144, 6123},  // of few blocks, too
         {kMsAdpcm, 2, 512, 250, 512, 250},
+        {kMsAdpcm, 1, 256, 1, 256, 1},
         {kImaAdpcm, 1, 0, 0, 2, 0},
         {kGsm, 1, 65, 3100, 650, 3100},
         {kGsm, 1, 65, 0, 650, 3200},
         {kUnknown, 1, 1, 5000, 650, 5000},
+        {kUnknown, 1, 1, 1, 650, 1},
         {kUnknown, 1, 1, 0xFFFFFFFF, 22050, 44100},  // as the data rate makes likely
     };
     const Wav wav;
@@ -458,6 +460,19 @@ TEST(LoopFileRead, AFileOfTwoGigabytesCostsTwoSmallReads) {
     EXPECT_EQ(data->frameCount(), kSize / 4);
     EXPECT_EQ(reader->calls, 2U);
     EXPECT_LE(reader->bytes, 2U * 4096U);
+}
+
+TEST(LoopFileRead, LeavesOutNotesThatTakeMoreThanSixteenMegabytes) {
+    constexpr std::uint32_t kLargest = 16U << 20U;
+    for (const std::uint32_t size : {kLargest, kLargest + 1}) {
+        const std::string chunks = Aiff::common() + Aiff::sound() + "MIDI" + big(size, 4) + test::emptyMidi();
+        const std::size_t gap = size - test::emptyMidi().size();
+        const auto reader = std::make_shared<SparseReader>(
+            "FORM" + big(4 + chunks.size() + gap + size % 2, 4) + "AIFF" + chunks, gap + size % 2, "");
+        const auto data = LCFileParser::fileParserForReader(reader, "/s/notes.aif")->fileData();
+        ASSERT_TRUE(data);
+        EXPECT_EQ(data->midiData().size(), size == kLargest ? size : 0);
+    }
 }
 
 TEST(LoopFileRead, AFileThatShrinksWhileItIsReadIsRefusedOrReadAsFarAsItGoes) {
