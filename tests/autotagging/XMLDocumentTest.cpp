@@ -202,7 +202,9 @@ TEST(XmlDocument, HostileExpressionsEnd) {
     const std::string deep = std::string(20000, '(') + "1" + std::string(20000, ')');
     EXPECT_EQ(XPathExpression::compile(deep, &error), nullptr);
     EXPECT_TRUE(error.isSet());
-    EXPECT_EQ(XPathExpression::compile(std::string(70000, 'a')), nullptr);
+    const std::string longest = "/a" + std::string(kLongestXPath - 2, ' ');
+    EXPECT_NE(XPathExpression::compile(longest), nullptr);
+    EXPECT_EQ(XPathExpression::compile(longest + " "), nullptr);
     const std::string wide = "<a>" + repeated(5000, "<b/>") + "</a>";
     const auto start = test::ProcessorClock::now();
     EXPECT_FALSE(document(wide)->isMatchingXPath("//*[//*[//*[contains(@x,'1')]]]"));
