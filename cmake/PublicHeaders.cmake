@@ -56,6 +56,12 @@ set(QVCT_PUBLIC_HEADERS
   autotagging/keywords/QVCTKeywordExtractor.h
   autotagging/xml/QVCTXMLDocument.h
   autotagging/xml/QVSKXMLNode.h
+  autotagging/ItemTagger.h
+  autotagging/evidence/ClaimResolver.h
+  autotagging/evidence/EvidenceWeights.h
+  autotagging/evidence/SoundKind.h
+  autotagging/evidence/TagClaim.h
+  autotagging/names/ItemNames.h
   autotagging/services/QVCTAutoTaggingService.h
   autotagging/services/QVCTXMLRulesTaggingService.h
   autotagging/services/TagDictionary.h

@@ -3,6 +3,7 @@
 #include "autotagging/ContentItem.h"
 #include "autotagging/services/QVCTContentTypeTaggingService.h"
 #include "autotagging/services/QVCTFilenameKeywordExtractorTaggingService.h"
+#include "autotagging/services/QVCTNamesTaggingService.h"
 #include "autotagging/services/QVCTRhythmicTaggingService.h"
 #include "autotagging/services/QVCTSoftwareInstrumentTaggingService.h"
 #include "autotagging/services/QVCTTranslateTagsTaggingService.h"
@@ -10,6 +11,7 @@
 #include "autotagging/services/QVCTXMLRulesTaggingService.h"
 #include "autotagging/xml/QVCTXMLDocument.h"
 
+#include <iterator>
 #include <string>
 #include <utility>
 
@@ -78,7 +80,8 @@ QVTaggingAggregator::Services QVTaggingAggregator::defaultTaggingServicesWithRul
             std::make_shared<QVCTContentTypeTaggingService>(),
             QVCTSoftwareInstrumentTaggingService::init(),
             std::make_shared<QVCTUserGeneratedTaggingService>(),
-            std::make_shared<QVCTTranslateTagsTaggingService>()};
+            std::make_shared<QVCTTranslateTagsTaggingService>(),
+            QVCTNamesTaggingService::init()};
 }
 
 QVTaggingAggregator::QVTaggingAggregator(Services services) : taggingServices_(std::move(services)) {
@@ -116,6 +119,21 @@ TagDictionarySet QVTaggingAggregator::tagsOfItem(const std::shared_ptr<ContentIt
             service->tagsWithContentsOfFile(item->file(), xmlDocument, metaData, fileData, options));
     }
     return tags;
+}
+
+std::vector<TagClaim> QVTaggingAggregator::claimsOfItem(const std::shared_ptr<ContentItem>& item,
+                                                        std::span<const std::string_view> names,
+                                                        std::uint64_t options) {
+    const AtHand atHand(item_, item);
+    const URL& url = item->url();
+    const TaggedItem tagged{item->file(), xmlDocumentForURL(url), metaDataForURL(url, options),
+                            fileDataForURL(url), names};
+    std::vector<TagClaim> claims;
+    for (const auto& service : taggingServices_) {
+        std::vector<TagClaim> its = service->claims(tagged, options);
+        std::move(its.begin(), its.end(), std::back_inserter(claims));
+    }
+    return claims;
 }
 
 TagDictionarySet QVTaggingAggregator::tagsWithContentsOfURL(const URL& url, std::uint64_t options) {

@@ -11,6 +11,8 @@
 #include <cstdint>
 #include <memory>
 #include <optional>
+#include <span>
+#include <string_view>
 #include <vector>
 
 namespace qvct {
@@ -51,6 +53,11 @@ class QVCT_API QVTaggingAggregator {
     /// What `tagsOfItem` answers, as taggings.
     ObjectSet<TGRTTagging> taggingsOfItem(const std::shared_ptr<ContentItem>& item,
                                           const TGRTTaxonomy& taxonomy, std::uint64_t options);
+
+    /// What each service claims, and what speaks for it. `names`: the item's own, its folder's and so on, see
+    /// `ItemNames`.
+    std::vector<TagClaim> claimsOfItem(const std::shared_ptr<ContentItem>& item,
+                                       std::span<const std::string_view> names, std::uint64_t options);
 
     /// The taxonomy that belongs to this aggregator. Conversion uses the one it is given.
     const std::shared_ptr<TGRTTaxonomy>& taxonomy() const { return taxonomy_; }

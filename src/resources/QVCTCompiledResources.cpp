@@ -66,6 +66,14 @@ OptionalDictionary QVCTCompiledResources::DefaultKeywordMappingPlist() {
     return dictionary(DefaultKeywordMapping_plist, DefaultKeywordMapping_plist_len);
 }
 
+OptionalDictionary QVCTCompiledResources::NamingHabitsPlist() {
+    return dictionary(NamingHabits_plist, NamingHabits_plist_len);
+}
+
+OptionalDictionary QVCTCompiledResources::EvidenceWeightsPlist() {
+    return dictionary(EvidenceWeights_plist, EvidenceWeights_plist_len);
+}
+
 std::optional<std::string> QVCTCompiledResources::QVSearchKitJS() {
     return resource<std::string>(QVSearchKit_js, QVSearchKit_js_len, kText);
 }

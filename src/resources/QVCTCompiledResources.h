@@ -33,6 +33,8 @@ class QVCTCompiledResources {
     static std::optional<PropertyList::Dictionary> LegacyLoopTaxonomyPlist();
     static std::optional<PropertyList::Dictionary> DefaultRulesPlist();
     static std::optional<PropertyList::Dictionary> DefaultKeywordMappingPlist();
+    static std::optional<PropertyList::Dictionary> NamingHabitsPlist();
+    static std::optional<PropertyList::Dictionary> EvidenceWeightsPlist();
     static std::optional<std::string> QVSearchKitJS();
     static std::optional<std::string> ExtractSoftwareInstrumentsRuleJS();
     static std::optional<Lines> LegacyLoopTaxonomyMapping();

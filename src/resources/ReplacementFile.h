@@ -24,6 +24,8 @@ inline constexpr ResourceFile kResourceFiles[] = {{"DefaultTaxonomy", "plist"},
                                                   {"LegacyVorthalTaxonomy", "plist"},
                                                   {"LegacyVorthalTaxonomyMapping", "csv"},
                                                   {"PackDisplayNames", "csv"},
+                                                  {"EvidenceWeights", "plist"},
+                                                  {"NamingHabits", "plist"},
                                                   {"QVSearchKit", "js"},
                                                   {"ExtractSoftwareInstrumentsRule", "js"}};
 

@@ -284,6 +284,33 @@ CountedSet QVCTKeywordExtractor::resultsOf(const std::vector<std::uint32_t>& key
     return set;
 }
 
+std::optional<std::pair<std::uint32_t, std::uint32_t>> QVCTKeywordExtractor::placeOf(
+    const std::string& keyword, std::string_view text) {
+    RegularExpression* expression = cachedRegexForKeyword(keyword);
+    if (expression == nullptr) return std::nullopt;
+    const std::u16string wide = utf16FromUtf8(text);
+    const auto match = expression->firstMatch(wide);
+    if (match.empty()) return std::nullopt;
+    const auto bytesBefore = [&wide](std::size_t offset) {
+        return static_cast<std::uint32_t>(utf8FromUtf16(std::u16string_view(wide).substr(0, offset)).size());
+    };
+    return std::pair(bytesBefore(match[0].start), bytesBefore(match[0].end));
+}
+
+std::vector<QVCTKeywordExtractor::Occurrence> QVCTKeywordExtractor::occurrencesInString(
+    std::string_view text) {
+    std::vector<Occurrence> occurrences;
+    for (const std::uint32_t index : matchingKeywords(text)) {
+        const Keyword& keyword = keywords_[index];
+        const auto place = placeOf(keyword.text, text);
+        if (!place) continue;
+        Occurrence occurrence{place->first, place->second, {}};
+        for (const std::uint32_t result : keyword.results) occurrence.labels.emplace_back(results_[result]);
+        occurrences.push_back(std::move(occurrence));
+    }
+    return occurrences;
+}
+
 CountedSet QVCTKeywordExtractor::extractKeywordsFromString(std::string_view text) {
     return resultsOf(matchingKeywords(text));
 }

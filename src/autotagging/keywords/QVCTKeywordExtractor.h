@@ -13,6 +13,7 @@
 #include <string>
 #include <string_view>
 #include <unordered_map>
+#include <utility>
 #include <vector>
 
 namespace qvct {
@@ -54,6 +55,16 @@ class QVCT_API QVCTKeywordExtractor {
     /// The same, compiled once. Null for a keyword that does not compile, which is tried anew each time.
     RegularExpression* cachedRegexForKeyword(std::string_view keyword);
 
+    /// A keyword that was found, where it first stands, and what it yields.
+    struct Occurrence {
+        std::uint32_t offset;  ///< In bytes.
+        std::uint32_t end;
+        std::vector<std::string_view> labels;  ///< As long as the extractor lives.
+    };
+    /// The keywords found, in the order in which they were given.
+    /// @cost  As below, and a search for each one.
+    std::vector<Occurrence> occurrencesInString(std::string_view text);
+
     /// The labels found, with how often each was found, and then their parents' labels.
     /// @cost  O(text) plus a microsecond or so for each keyword that an expression has to decide.
     CountedSet extractKeywordsFromString(std::string_view text);
@@ -84,6 +95,8 @@ class QVCT_API QVCTKeywordExtractor {
     void findParents();
 
     std::vector<std::uint32_t> matchingKeywords(std::string_view text);
+    std::optional<std::pair<std::uint32_t, std::uint32_t>> placeOf(const std::string& keyword,
+                                                                   std::string_view text);
     void scanForCandidates(std::string_view text);
     void scanFolded(std::string_view text);
     void mark(std::uint32_t keyword, Mark mark);

@@ -23,6 +23,7 @@ class QVCTContentTypeTaggingService : public QVCTAutoTaggingService {
                                            const std::shared_ptr<TGRTMetaData>& metaData,
                                            const std::shared_ptr<LCFileData>& fileData,
                                            std::uint64_t options) override;
+    std::string_view name() const override { return "content-type"; }
 };
 
 }  // namespace qvct

@@ -23,6 +23,8 @@ class QVCTFilenameKeywordExtractorTaggingService : public QVCTAutoTaggingService
                                            const std::shared_ptr<TGRTMetaData>& metaData,
                                            const std::shared_ptr<LCFileData>& fileData,
                                            std::uint64_t options) override;
+    std::vector<TagClaim> claims(const TaggedItem& item, std::uint64_t options) override;
+    std::string_view name() const override { return "keywords"; }
 
     const std::shared_ptr<QVCTKeywordExtractor>& keywordExtractor() const { return keywordExtractor_; }
 

@@ -18,6 +18,7 @@ class QVCTRhythmicTaggingService : public QVCTAutoTaggingService {
                                            const std::shared_ptr<TGRTMetaData>& metaData,
                                            const std::shared_ptr<LCFileData>& fileData,
                                            std::uint64_t options) override;
+    std::string_view name() const override { return "rhythm"; }
 
     TagDictionarySet tagsFromMidiIfExisting(const LCFileData& fileData) const;
     /// Decodes the whole file.

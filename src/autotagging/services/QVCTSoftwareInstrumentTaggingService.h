@@ -20,6 +20,7 @@ class QVCTSoftwareInstrumentTaggingService : public QVCTAutoTaggingService {
                                            const std::shared_ptr<TGRTMetaData>& metaData,
                                            const std::shared_ptr<LCFileData>& fileData,
                                            std::uint64_t options) override;
+    std::string_view name() const override { return "instruments"; }
 
   private:
     explicit QVCTSoftwareInstrumentTaggingService(std::string script) : script_(std::move(script)) {}

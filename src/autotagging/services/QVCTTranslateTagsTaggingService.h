@@ -22,6 +22,7 @@ class QVCTTranslateTagsTaggingService : public QVCTAutoTaggingService {
                                             const std::shared_ptr<TGRTMetaData>& metaData,
                                             const std::shared_ptr<LCFileData>& fileData,
                                             std::uint64_t options) override;
+    std::string_view name() const override { return "translate"; }
 };
 
 }  // namespace qvct

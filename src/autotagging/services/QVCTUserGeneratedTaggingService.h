@@ -21,6 +21,7 @@ class QVCTUserGeneratedTaggingService : public QVCTAutoTaggingService {
                                            const std::shared_ptr<TGRTMetaData>& metaData,
                                            const std::shared_ptr<LCFileData>& fileData,
                                            std::uint64_t options) override;
+    std::string_view name() const override { return "user"; }
 
   private:
     bool liesInPackFolder(const URL& url) const;

@@ -125,22 +125,41 @@ void QVCTXMLRulesTaggingService::setupWithRules(const PropertyList::Dictionary& 
     }
 }
 
-TagDictionarySet QVCTXMLRulesTaggingService::tagsWithContentsOfURL(
-    const URL& /*url*/, const std::shared_ptr<QVCTXMLDocument>& xmlDocument,
-    const std::shared_ptr<TGRTMetaData>& /*metaData*/, const std::shared_ptr<LCFileData>& /*fileData*/,
-    std::uint64_t options) {
-    TagDictionarySet tags;
-    if ((options & QVCTAutoTaggingOptionXMLRules) == 0 || !xmlDocument) return tags;
+template <typename Visit>
+void QVCTXMLRulesTaggingService::forEachTag(const std::shared_ptr<QVCTXMLDocument>& document,
+                                            std::uint64_t options, Visit visit) const {
+    if ((options & QVCTAutoTaggingOptionXMLRules) == 0 || !document) return;
     for (const Rule& rule : rules_) {
         if (rule.type != kXPathType && rule.type != kScriptType) continue;
         const LogScope scope(fmt::format("rule {}: ", rule.number));
         const std::string text = resolvedText(rule.text);
         if (text.empty()) continue;
-        for (TagDictionary& tag : evaluate(rule.type, text, rule.tag, xmlDocument, nullptr)) {
-            tags.insert(std::move(tag));
-        }
+        for (TagDictionary& tag : evaluate(rule.type, text, rule.tag, document, nullptr))
+            visit(rule, std::move(tag));
     }
+}
+
+TagDictionarySet QVCTXMLRulesTaggingService::tagsWithContentsOfURL(
+    const URL& /*url*/, const std::shared_ptr<QVCTXMLDocument>& xmlDocument,
+    const std::shared_ptr<TGRTMetaData>& /*metaData*/, const std::shared_ptr<LCFileData>& /*fileData*/,
+    std::uint64_t options) {
+    TagDictionarySet tags;
+    forEachTag(xmlDocument, options,
+               [&tags](const Rule&, TagDictionary tag) { tags.insert(std::move(tag)); });
     return tags;
+}
+
+std::vector<TagClaim> QVCTXMLRulesTaggingService::claims(const TaggedItem& item, std::uint64_t options) {
+    constexpr std::size_t longestShown = 200;
+    std::vector<TagClaim> claims;
+    forEachTag(item.xmlDocument, options, [&](const Rule& rule, const TagDictionary& tag) {
+        auto claim = claimOf(tag);
+        if (!claim) return;
+        const bool isPath = rule.type == kXPathType && rule.text.size() <= longestShown;
+        claim->evidence = {isPath ? rule.text : rule.type, fmt::format("rule {}", rule.number), 0};
+        claims.push_back(*std::move(claim));
+    });
+    return claims;
 }
 
 std::vector<RuleOutcome> QVCTXMLRulesTaggingService::outcomesForXMLDocument(

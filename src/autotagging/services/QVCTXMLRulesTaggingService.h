@@ -56,6 +56,8 @@ class QVCT_API QVCTXMLRulesTaggingService : public QVCTAutoTaggingService {
                                            const std::shared_ptr<TGRTMetaData>& metaData,
                                            const std::shared_ptr<LCFileData>& fileData,
                                            std::uint64_t options) override;
+    std::vector<TagClaim> claims(const TaggedItem& item, std::uint64_t options) override;
+    std::string_view name() const override { return "rules"; }
 
     /// All rules, with syntax errors, missing tags and files, unknown types: for the authors of rules.
     std::vector<RuleDescription> rules() const;
@@ -75,6 +77,10 @@ class QVCT_API QVCTXMLRulesTaggingService : public QVCTAutoTaggingService {
     explicit QVCTXMLRulesTaggingService(const PropertyList::Dictionary& rules);
     void setupWithRules(const PropertyList::Dictionary& rules);
     static std::optional<std::string> problemOf(const Rule& rule);
+    /// Calls `visit` with every tag, and the rule that gives it.
+    template <typename Visit>
+    void forEachTag(const std::shared_ptr<QVCTXMLDocument>& document, std::uint64_t options,
+                    Visit visit) const;
 
     std::vector<Rule> rules_;
 };

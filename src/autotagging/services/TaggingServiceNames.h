@@ -14,14 +14,15 @@ struct TaggingServiceName {
     std::uint64_t option;
 };
 
-inline constexpr std::array<TaggingServiceName, 7> kTaggingServiceNames = {
+inline constexpr std::array<TaggingServiceName, 8> kTaggingServiceNames = {
     {{"keywords", QVCTAutoTaggingOptionFilenameKeywords},
      {"rules", QVCTAutoTaggingOptionXMLRules},
      {"rhythm", QVCTAutoTaggingOptionRhythm},
      {"content-type", QVCTAutoTaggingOptionContentType},
      {"instruments", QVCTAutoTaggingOptionSoftwareInstruments},
      {"user", QVCTAutoTaggingOptionUserGenerated},
-     {"translate", QVCTAutoTaggingOptionTranslateTags}}};
+     {"translate", QVCTAutoTaggingOptionTranslateTags},
+     {"names", QVCTAutoTaggingOptionNames}}};
 
 /// The options that run every service.
 constexpr std::uint64_t optionsForAllTaggingServices() {

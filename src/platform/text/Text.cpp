@@ -135,6 +135,10 @@ bool containsIgnoringCaseAndDiacritics(std::string_view text, std::string_view p
     return !wanted.isEmpty() && withoutCaseAndDiacritics(text).indexOf(wanted) >= 0;
 }
 
+std::string foldedWithoutDiacritics(std::string_view text) {
+    return utf8(withoutCaseAndDiacritics(text));
+}
+
 std::string foldCase(std::string_view text) {
     return utf8(unicode(text).foldCase());
 }

@@ -25,6 +25,8 @@ int localizedCompare(std::string_view a, std::string_view b);
 bool containsIgnoringCaseAndDiacritics(std::string_view text, std::string_view part);
 /// Full case folding: two texts that differ only in case fold to the same text.
 std::string foldCase(std::string_view text);
+/// The same without combining marks: "Flöte" and "FLOTE" give one text.
+std::string foldedWithoutDiacritics(std::string_view text);
 std::string lowercase(std::string_view text);
 /// The user-perceived characters in reverse order.
 std::string reversedString(std::string_view text);

@@ -1,0 +1,140 @@
+#include "autotagging/ItemTagger.h"
+
+#include "autotagging/ContentItem.h"
+#include "autotagging/QVTaggingAggregator.h"
+#include "autotagging/names/NameReader.h"
+#include "autotagging/services/QVCTAutoTaggingService.h"
+#include "taxonomy/TaggingTypes.h"
+
+#include <algorithm>
+
+#include <fmt/format.h>
+
+namespace qvct {
+namespace {
+
+constexpr std::string_view kKeywords = "keywords";
+constexpr std::string_view kOneShot = "One Shot";
+
+/// Judges what keywords claim by what the names mean: a keyword sees a word, and no more.
+class KeywordJudge {
+  public:
+    KeywordJudge(const NameReading& reading, const TGRTTaxonomy& taxonomy)
+        : reading_(reading), taxonomy_(taxonomy) {}
+
+    void judge(TagClaim& claim) const {
+        const auto tag = taxonomy_.findTagForLabel(claim.label);
+        if (!tag) return;
+        if (const std::string phrase = silenceAround(claim); !phrase.empty()) {
+            claim.doubt = fmt::format("part of \"{}\"", phrase);
+        } else if (tag->categoryIdentifier() == QVCategoryContentTypeIdentifier) {
+            claim.doubt = "the file says what kind of content it is";
+        } else if (isKey(*tag)) {
+            claim.doubt = "no key stands there";
+        } else {
+            judgeWord(claim, *tag);
+        }
+    }
+
+  private:
+    static bool isKey(const TGRTTag& tag) {
+        const auto parent = tag.parent();
+        const std::string& group = parent ? parent->label() : tag.label();
+        return group == QVTagKey || group == QVTagKeyType;
+    }
+
+    static bool overlap(const TagClaim& claim, int distance, std::uint32_t offset, std::uint32_t end) {
+        return claim.distance == distance && claim.evidence.offset < end && offset < claim.end();
+    }
+
+    std::string silenceAround(const TagClaim& claim) const {
+        for (const auto& [distance, offset, end] : reading_.silences) {
+            if (overlap(claim, distance, offset, end))
+                return claim.evidence.where.substr(offset, end - offset);
+        }
+        return {};
+    }
+
+    /// The same word that the names read says what they read in it: not more surely, and nothing else but
+    /// what that belongs to.
+    void judgeWord(TagClaim& claim, const TGRTTag& tag) const {
+        const TagClaim* other = nullptr;
+        for (const TagClaim& named : reading_.claims) {
+            if (!overlap(claim, named.distance, named.evidence.offset, named.end())) continue;
+            if (named.label == claim.label || isParent(tag, named.label)) {
+                claim.confidence = std::min(claim.confidence, named.confidence);
+                return;
+            }
+            const auto its = taxonomy_.findTagForLabel(named.label);
+            const std::string category = its ? its->categoryIdentifier() : std::string();
+            if (category == tag.categoryIdentifier() || category == QVCategoryGenresIdentifier)
+                other = &named;
+        }
+        if (other != nullptr) claim.doubt = fmt::format("\"{}\" is {}", other->evidence.what, other->label);
+    }
+
+    bool isParent(const TGRTTag& above, const std::string& label) const {
+        const auto tag = taxonomy_.findTagForLabel(label);
+        for (auto parent = tag ? tag->parent() : nullptr; parent; parent = parent->parent())
+            if (parent.get() == &above) return true;
+        return false;
+    }
+
+    const NameReading& reading_;
+    const TGRTTaxonomy& taxonomy_;
+};
+
+SoundKind kindOf(const NameReading& reading, const std::vector<TagClaim>& claims) {
+    if (reading.kind != SoundKind::unsaid) return reading.kind;
+    const bool isOneShot = std::any_of(claims.begin(), claims.end(), [](const TagClaim& claim) {
+        return claim.label == kOneShot && claim.service == "content-type";
+    });
+    return isOneShot ? SoundKind::oneShot : SoundKind::unsaid;
+}
+
+}  // namespace
+
+ObjectSet<TGRTTagging> ItemReport::taggings() const {
+    ObjectSet<TGRTTagging> taggings;
+    for (const HeldTag& held : resolution.held) taggings.insert(held.tagging());
+    return taggings;
+}
+
+ItemTagger::ItemTagger(std::shared_ptr<QVTaggingAggregator> aggregator,
+                       std::shared_ptr<const TGRTTaxonomy> taxonomy)
+    : aggregator_(std::move(aggregator)),
+      taxonomy_(std::move(taxonomy)),
+      resolver_(taxonomy_),
+      reader_(std::make_unique<NameReader>()) {}
+
+ItemTagger::~ItemTagger() = default;
+
+ItemReport ItemTagger::report(const std::shared_ptr<ContentItem>& item, const ItemNames& names,
+                              std::uint64_t options) {
+    ItemReport report;
+    std::vector<TagClaim> claims =
+        aggregator_->claimsOfItem(item, names.all(), options & ~QVCTAutoTaggingOptionNames);
+    NameReading reading;
+    if ((options & QVCTAutoTaggingOptionNames) != 0) {
+        reading = reader_->read(names.all());
+        const KeywordJudge judge(reading, *taxonomy_);
+        for (TagClaim& claim : claims)
+            if (claim.service == kKeywords) judge.judge(claim);
+        claims.insert(claims.end(), reading.claims.begin(), reading.claims.end());
+    }
+    report.tempo = reading.tempo;
+    report.kind = kindOf(reading, claims);
+    report.resolution = resolver_.resolve(std::move(claims), report.kind);
+    return report;
+}
+
+ItemReport ItemTagger::reportOfNames(const ItemNames& names, SoundKind otherwise) {
+    NameReading reading = reader_->read(names.all());
+    ItemReport report;
+    report.tempo = reading.tempo;
+    report.kind = reading.kind == SoundKind::unsaid ? otherwise : reading.kind;
+    report.resolution = resolver_.resolve(std::move(reading.claims), report.kind);
+    return report;
+}
+
+}  // namespace qvct

@@ -1,0 +1,58 @@
+#pragma once
+
+#include "autotagging/evidence/ClaimResolver.h"
+#include "autotagging/names/ItemNames.h"
+#include "platform/base/Export.h"
+#include "platform/base/ObjectSet.h"
+
+#include <cstdint>
+#include <memory>
+#include <optional>
+
+namespace qvct {
+
+class ContentItem;
+class NameReader;
+class QVTaggingAggregator;
+class TGRTTagging;
+class TGRTTaxonomy;
+
+/// What an item is, as far as it can be told, and why.
+struct QVCT_API ItemReport {
+    Resolution resolution;
+    std::optional<double> tempo;  ///< Beats a minute that its names state.
+    SoundKind kind = SoundKind::unsaid;
+
+    /// The tags that hold, marked as automatic.
+    ObjectSet<TGRTTagging> taggings() const;
+};
+
+/// Tags items as a person would: weighs what the services claim, lets what stands in an item's own name
+/// outweigh what its folders say, and decides between tags that exclude each other.
+///
+/// Use one from one thread at a time, like its aggregator.
+class QVCT_API ItemTagger {
+  public:
+    /// Labels are resolved in that taxonomy.
+    ItemTagger(std::shared_ptr<QVTaggingAggregator> aggregator, std::shared_ptr<const TGRTTaxonomy> taxonomy);
+
+    ItemTagger(const ItemTagger&) = delete;
+    ItemTagger& operator=(const ItemTagger&) = delete;
+    ~ItemTagger();
+
+    /// `options`: the services that are asked, a sum of QVCTAutoTaggingOptions.
+    ItemReport report(const std::shared_ptr<ContentItem>& item, const ItemNames& names,
+                      std::uint64_t options);
+
+    /// What names alone tell, without a look at the item, for all that it needs not exist. `otherwise`: what
+    /// it is where they do not say.
+    ItemReport reportOfNames(const ItemNames& names, SoundKind otherwise);
+
+  private:
+    std::shared_ptr<QVTaggingAggregator> aggregator_;
+    std::shared_ptr<const TGRTTaxonomy> taxonomy_;
+    ClaimResolver resolver_;
+    std::unique_ptr<NameReader> reader_;
+};
+
+}  // namespace qvct

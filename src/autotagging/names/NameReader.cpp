@@ -1,0 +1,93 @@
+#include "autotagging/names/NameReader.h"
+
+#include "autotagging/names/NameScan.h"
+#include "taxonomy/TaggingTypes.h"
+
+#include <algorithm>
+#include <array>
+
+namespace qvct {
+namespace {
+
+constexpr std::string_view kService = "names";
+
+constexpr std::array<std::string_view, 12> kKeyLabels = {
+    QVTagCKey,      QVTagCSharpKey, QVTagDKey,      QVTagDSharpKey, QVTagEKey,      QVTagFKey,
+    QVTagFSharpKey, QVTagGKey,      QVTagGSharpKey, QVTagAKey,      QVTagASharpKey, QVTagBKey};
+
+/// Adds to a reading what one name says.
+class Claims {
+  public:
+    Claims(NameReading& reading, std::string_view name, int distance)
+        : reading_(reading), name_(name), distance_(distance) {}
+
+    TagClaim& add(std::string_view label, std::uint32_t offset, std::uint32_t end, double confidence) {
+        TagClaim& claim = reading_.claims.emplace_back();
+        claim.label = label;
+        claim.service = kService;
+        claim.evidence = {std::string(name_.substr(offset, end - offset)), std::string(name_), offset};
+        claim.confidence = confidence;
+        claim.distance = distance_;
+        return claim;
+    }
+
+    void add(const NamedKey& key, double confidence) {
+        add(kKeyLabels[static_cast<std::size_t>(key.tonic)], key.offset, key.end, confidence);
+        if (key.mode == NamedKey::Mode::unsaid) return;
+        const bool isMajor = key.mode == NamedKey::Mode::major;
+        add(isMajor ? QVTagMajorKeyType : QVTagMinorKeyType, key.offset, key.end, confidence);
+    }
+
+  private:
+    NameReading& reading_;
+    std::string_view name_;
+    int distance_;
+};
+
+}  // namespace
+
+double NameReader::confidenceOf(NameStrength strength) const {
+    switch (strength) {
+        case NameStrength::word:
+            return weights_.word;
+        case NameStrength::abbreviation:
+            return weights_.abbreviation;
+        case NameStrength::hint:
+            return weights_.hint;
+    }
+    return 0;
+}
+
+NameReading NameReader::read(std::span<const std::string_view> names) {
+    NameReading reading;
+    bool hasKey = false;
+    for (std::size_t i = 0; i < names.size(); ++i) {
+        const std::string_view name = names[i];
+        const auto distance = static_cast<int>(i);
+        const NameScan scan(*habits_, name, pieces_.read(name), buffer_);
+        Claims claims(reading, name, distance);
+        for (const NameScan::Meant& meant : scan.meant()) {
+            const bool isLetter = meant.end - meant.offset == 1;
+            if (i > 0 && isLetter) continue;
+            const NamedMeaning& meaning = habits_->meaning(meant.word.meaning);
+            const bool isHint = i > 0 && scan.isOfPack();
+            const double confidence = confidenceOf(isHint ? NameStrength::hint : meant.word.strength);
+            TagClaim& claim =
+                claims.add(i > 0 ? meaning.inFolders : meaning.label, meant.offset, meant.end,
+                           meaning.isFigurative ? std::min(confidence, weights_.figure) : confidence);
+            claim.level = meaning.level;
+            claim.isHead = meant.end == scan.meant().back().end;
+        }
+        for (const auto& [offset, end] : scan.silences()) reading.silences.push_back({distance, offset, end});
+        // What the name itself says of these holds whatever its folders say.
+        if (!reading.tempo) reading.tempo = scan.tempo();
+        if (reading.kind == SoundKind::unsaid) reading.kind = scan.kind();
+        const auto key = hasKey ? std::nullopt : scan.key();
+        if (!key) continue;
+        claims.add(*key, weights_.key);
+        hasKey = true;
+    }
+    return reading;
+}
+
+}  // namespace qvct

@@ -1,0 +1,57 @@
+#pragma once
+
+#include "autotagging/evidence/EvidenceWeights.h"
+#include "autotagging/evidence/SoundKind.h"
+#include "autotagging/evidence/TagClaim.h"
+#include "autotagging/names/NamePieces.h"
+#include "autotagging/names/NamingHabits.h"
+
+#include <cstdint>
+#include <memory>
+#include <optional>
+#include <span>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace qvct {
+
+/// What the name of an item and those of its folders say.
+struct NameReading {
+    /// A phrase whose words do not mean what they say elsewhere.
+    struct Silence {
+        int distance;
+        std::uint32_t offset;
+        std::uint32_t end;
+    };
+
+    std::vector<TagClaim> claims;
+    std::vector<Silence> silences;
+    std::optional<double> tempo;  ///< Beats a minute.
+    SoundKind kind = SoundKind::unsaid;
+};
+
+/// Reads names as people write them.
+///
+/// Use one from one thread at a time: its buffers are used again.
+/// @cost  Some microseconds for a path; O(bytes).
+class NameReader {
+  public:
+    explicit NameReader(std::shared_ptr<const NamingHabits> habits = NamingHabits::defaultHabits(),
+                        EvidenceWeights weights = EvidenceWeights::defaultWeights())
+        : habits_(std::move(habits)), weights_(std::move(weights)) {}
+
+    /// The item's own name comes first, without its extension, then its folder's, and so on up to the
+    /// outermost that counts.
+    NameReading read(std::span<const std::string_view> names);
+
+  private:
+    double confidenceOf(NameStrength strength) const;
+
+    std::shared_ptr<const NamingHabits> habits_;
+    EvidenceWeights weights_;
+    NamePieces pieces_;
+    std::string buffer_;
+};
+
+}  // namespace qvct

@@ -1,0 +1,213 @@
+#include "autotagging/names/NameScan.h"
+
+#include "taxonomy/TaggingTypes.h"
+
+#include <algorithm>
+#include <charconv>
+
+namespace qvct {
+namespace {
+
+using Pieces = std::span<const NamePiece>;
+using Word = NamingHabits::Word;
+
+constexpr double kSlowest = 40, kFastest = 250;
+/// What stands alone, without "bpm", is a tempo only in the range of dance and film music.
+constexpr double kSlowestAlone = 60, kFastestAlone = 190;
+
+/// Up to three digits, and with the piece behind them "87.5".
+std::optional<double> numberAt(Pieces pieces, std::string_view name) {
+    int whole = 0;
+    const NamePiece& first = pieces.front();
+    const char* end = first.text.data() + first.text.size();
+    if (first.text.size() > 3 || std::from_chars(first.text.data(), end, whole).ptr != end)
+        return std::nullopt;
+    const bool hasTenths = pieces.size() > 1 && pieces[1].isNumber() && pieces[1].offset == first.end() + 1 &&
+                           (name[first.end()] == '.' || name[first.end()] == ',') &&
+                           pieces[1].text.size() == 1;
+    return whole + (hasTenths ? (pieces[1].text.front() - '0') / 10.0 : 0.0);
+}
+
+/// "Fm" is a key where "FM" and "fm" are a way to make sounds.
+bool isMinorKey(const NamePiece& piece) {
+    return piece.text.size() == 2 && piece.text[0] >= 'A' && piece.text[0] <= 'G' && piece.text[1] == 'm';
+}
+
+bool isLetter(const NamePiece& piece) {
+    return piece.isWord() && piece.text.size() == 1;
+}
+
+}  // namespace
+
+NameScan::NameScan(const NamingHabits& habits, std::string_view name, Pieces pieces, std::string& buffer)
+    : habits_(habits), name_(name), pieces_(pieces), buffer_(buffer) {
+    for (std::size_t at = 0; at < pieces_.size();) at += readAt(at);
+}
+
+std::size_t NameScan::readAt(std::size_t at) {
+    const Pieces rest = pieces_.subspan(at);
+    const Word word = habits_.wordAt(rest, buffer_);
+    const auto key = word.pieces == 0 || isMinorKey(rest.front()) ? namedKeyAt(rest, habits_) : std::nullopt;
+    if (key) return readKey(at, *key);
+    if (word.pieces > 0) return readWord(at, word);
+    const std::size_t read = rest.front().isNumber() ? readNumber(at) : readPacked(at);
+    before_ = NameRole::none;
+    return read;
+}
+
+std::size_t NameScan::readWord(std::size_t at, const Word& word) {
+    const std::size_t behind = at + word.pieces;
+    before_ = word.role;
+    noteKind(word.role);
+    // "drum loop" and "drumloop" are words, and say that it is a loop.
+    for (const NamePiece& piece : pieces_.subspan(at, word.pieces)) noteKindInside(piece);
+    const std::uint32_t offset = pieces_[at].offset, end = pieces_[behind - 1].end();
+    addMeant(word, offset, end);
+    if (word.pieces > 1) addWordsIn(word, pieces_.subspan(at, word.pieces));
+    if (word.role == NameRole::silent) silences_.emplace_back(offset, end);
+    if (word.role == NameRole::tempo && !tempos_.empty() && at > 0 && pieces_[at - 1].isNumber())
+        tempos_.back().isSaid = true;
+    // "Vol 2", "Take C": what is counted is neither a tempo nor a note.
+    const bool isCounted = word.role == NameRole::count && behind < pieces_.size() &&
+                           (pieces_[behind].isNumber() || isLetter(pieces_[behind]));
+    return word.pieces + (isCounted ? 1U : 0U);
+}
+
+void NameScan::noteKindInside(const NamePiece& piece) {
+    constexpr std::size_t shortest = 4;
+    for (std::size_t at = 0; at + shortest <= piece.folded.size(); ++at) {
+        const NameRole role = habits_.roleOf(piece.folded.substr(at));
+        if (role == NameRole::loop || (at == 0 && role == NameRole::oneShot)) noteKind(role);
+    }
+}
+
+void NameScan::noteKind(NameRole role) {
+    saysLoop_ = saysLoop_ || role == NameRole::loop;
+    saysOneShot_ = saysOneShot_ || role == NameRole::oneShot;
+}
+
+void NameScan::addMeant(const Word& word, std::uint32_t offset, std::uint32_t end) {
+    // A letter stands for a word only where a name begins with it: "K_01".
+    if (end - offset == 1 && offset != pieces_.front().offset) return;
+    if (word.meaning != Word::kNoMeaning) meant_.push_back({word, offset, end});
+    for (std::uint32_t at = word.other; at != Word::kNoMeaning; at = habits_.other(at).other)
+        meant_.push_back({habits_.other(at), offset, end});
+}
+
+/// "Drum Fill" is a fill, and of drums; but there is no bass in "Drum and Bass".
+void NameScan::addWordsIn(const Word& phrase, std::span<const NamePiece> pieces) {
+    if (phrase.meaning == Word::kNoMeaning || phrase.role == NameRole::silent) return;
+    const std::string& category = habits_.meaning(phrase.meaning).category;
+    if (category == QVCategoryGenresIdentifier) return;
+    for (std::size_t i = 0; i < pieces.size(); ++i) {
+        const Word word = habits_.wordAt(pieces.subspan(i, 1), buffer_);
+        const bool isOther =
+            word.meaning != Word::kNoMeaning && habits_.meaning(word.meaning).category != category;
+        if (isOther) meant_.push_back({word, pieces[i].offset, pieces[i].end()});
+    }
+}
+
+std::size_t NameScan::readKey(std::size_t at, const NamedKey& key) {
+    hasNote_ = hasNote_ || key.hasOctave;
+    const bool isBehindPitched = at > 0 && !meant_.empty() && meant_.back().end == pieces_[at - 1].end() &&
+                                 habits_.meaning(meant_.back().word.meaning).isPitched;
+    if (!key.hasOctave) keys_.push_back({key, at, before_ == NameRole::key, isBehindPitched});
+    before_ = NameRole::none;
+    return key.pieces;
+}
+
+std::size_t NameScan::readNumber(std::size_t at) {
+    const auto number = numberAt(pieces_.subspan(at), name_);
+    const bool isWhole = !number || *number == static_cast<int>(*number);
+    const std::size_t read = isWhole ? 1 : 2;
+    if (!number || *number < kSlowest || *number > kFastest) return read;
+    const bool isSaid = before_ == NameRole::tempo;
+    // "TR808", "v124": part of a word.
+    const bool isPartOfWord =
+        pieces_[at].isJoined || (at + read < pieces_.size() && pieces_[at + read].isJoined &&
+                                 habits_.roleOf(pieces_[at + read].folded) != NameRole::tempo);
+    if (isSaid || !isPartOfWord) tempos_.push_back({*number, isSaid});
+    return read;
+}
+
+std::size_t NameScan::readPacked(std::size_t at) {
+    noteKindInside(pieces_[at]);
+    const auto [first, second] = habits_.packedWords(pieces_[at].folded);
+    for (const Word& word : {first, second}) {
+        if (word.pieces == 0) break;
+        noteKind(word.role);
+        addMeant(word, pieces_[at].offset, pieces_[at].end());
+    }
+    return 1;
+}
+
+std::optional<double> NameScan::tempo() const {
+    const auto said =
+        std::find_if(tempos_.begin(), tempos_.end(), [](const Tempo& tempo) { return tempo.isSaid; });
+    if (said != tempos_.end()) return said->number;
+    const bool hasSureKey = std::any_of(
+        keys_.begin(), keys_.end(), [](const Key& key) { return key.key.mode != NamedKey::Mode::unsaid; });
+    if ((!saysLoop_ && !hasSureKey) || saysOneShot_) return std::nullopt;
+    std::optional<double> alone;
+    for (const Tempo& tempo : tempos_) {
+        if (tempo.number < kSlowestAlone || tempo.number > kFastestAlone) continue;
+        if (alone && *alone != tempo.number) return std::nullopt;
+        alone = tempo.number;
+    }
+    return alone;
+}
+
+std::optional<NamedKey> NameScan::key() const {
+    std::optional<NamedKey> chosen;
+    for (const Key& key : keys_) {
+        if (!canStand(key)) continue;
+        if (chosen && (chosen->tonic != key.key.tonic || chosen->mode != key.key.mode)) return std::nullopt;
+        chosen = key.key;
+    }
+    return chosen;
+}
+
+/// A key stands where music is meant: beside a tempo, in what is called a loop, behind an instrument, alone
+/// in brackets or at the end. "A Day", "Take C", "3 AM" and "Plan B" are none.
+bool NameScan::canStand(const Key& key) const {
+    if (hasNote_) return false;
+    if (key.isAnnounced) return true;
+    const bool isOfMusic = saysLoop_ || tempo().has_value();
+    const NamePiece& first = pieces_[key.piece];
+    const std::size_t behind = key.piece + key.key.pieces;
+    const bool isCapital = first.text.front() >= 'A' && first.text.front() <= 'G';
+    const bool isLast = behind == pieces_.size();
+    const bool isBehindBlank = key.piece > 0 && name_[first.offset - 1] == ' ';
+    const bool isSetApart = first.isInBrackets ||
+                            (isLast && key.piece > 0 && (!isBehindBlank || !meant_.empty())) ||
+                            (key.piece == 0 && saysPitched());
+    if (key.key.isCamelot) return !tempos_.empty() || first.isInBrackets;
+    const bool isSyllable = habits_.noteOf(first.folded).has_value();
+    if (key.key.isSpelledOut) return isCapital || isOfMusic || isSyllable;
+    if (key.key.mode != NamedKey::Mode::unsaid)
+        return isOfMusic || (isCapital && (isSetApart || key.isBehindPitched));
+    const bool hasSign = key.key.pieces > 1 && pieces_[key.piece + 1].kind == NamePiece::Kind::sharp;
+    if (key.key.hasAccidental)
+        return isOfMusic || (isCapital && (isSetApart || hasSign || key.isBehindPitched));
+    return isCapital && key.piece > 0 && canLetterStand(key);
+}
+
+bool NameScan::saysPitched() const {
+    return std::any_of(meant_.begin(), meant_.end(),
+                       [&](const Meant& meant) { return habits_.meaning(meant.word.meaning).isPitched; });
+}
+
+/// "Loop_A" and "Plan B" are variants of something; drums have no key.
+bool NameScan::canLetterStand(const Key& key) const {
+    const NamePiece& before = pieces_[key.piece - 1];
+    if (habits_.roleOf(before.folded) == NameRole::loop) return false;
+    const bool isOfPitched = saysPitched();
+    const bool isLast = key.piece + key.key.pieces == pieces_.size();
+    if (isOfPitched && (saysLoop_ || tempo() || (key.isBehindPitched && isLast))) return true;
+    if (!meant_.empty() && !isOfPitched) return false;
+    if (tempo()) return true;
+    const bool isSpaced = before.end() + 1 == pieces_[key.piece].offset && name_[before.end()] == ' ';
+    return isLast && isOfPitched && !isSpaced;
+}
+
+}  // namespace qvct

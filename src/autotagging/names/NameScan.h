@@ -1,0 +1,82 @@
+#pragma once
+
+#include "autotagging/evidence/SoundKind.h"
+#include "autotagging/names/NamePieces.h"
+#include "autotagging/names/NamedKey.h"
+#include "autotagging/names/NamingHabits.h"
+
+#include <optional>
+#include <span>
+#include <string>
+#include <string_view>
+#include <utility>
+#include <vector>
+
+namespace qvct {
+
+/// What one name says: the words that have a meaning, and what its numbers and letters are, as far as what
+/// stands beside them tells.
+class NameScan {
+  public:
+    /// A word or phrase that stands for a tag.
+    struct Meant {
+        NamingHabits::Word word;
+        std::uint32_t offset;  ///< In the name, in bytes.
+        std::uint32_t end;
+    };
+    /// A number that may be a tempo.
+    struct Tempo {
+        double number;
+        bool isSaid;  ///< "bpm" stands beside it.
+    };
+
+    /// `buffer` is for its own use.
+    NameScan(const NamingHabits& habits, std::string_view name, std::span<const NamePiece> pieces,
+             std::string& buffer);
+
+    const std::vector<Meant>& meant() const { return meant_; }
+    /// Where phrases stand whose words do not mean what they say elsewhere: offset and end.
+    const std::vector<std::pair<std::uint32_t, std::uint32_t>>& silences() const { return silences_; }
+    SoundKind kind() const {
+        return saysOneShot_ ? SoundKind::oneShot : saysLoop_ ? SoundKind::loop : SoundKind::unsaid;
+    }
+    /// It is called by its maker: a volume, a collection.
+    bool isOfPack() const { return isOfPack_; }
+    /// Nothing when the name says none, or several.
+    std::optional<double> tempo() const;
+    std::optional<NamedKey> key() const;
+
+  private:
+    struct Key {
+        NamedKey key;
+        std::size_t piece;
+        bool isAnnounced;  // by "key"
+        bool isBehindPitched;
+    };
+
+    std::size_t readAt(std::size_t at);
+    std::size_t readWord(std::size_t at, const NamingHabits::Word& word);
+    void noteKindInside(const NamePiece& piece);
+    void noteKind(NameRole role);
+    void addMeant(const NamingHabits::Word& word, std::uint32_t offset, std::uint32_t end);
+    void addWordsIn(const NamingHabits::Word& phrase, std::span<const NamePiece> pieces);
+    std::size_t readKey(std::size_t at, const NamedKey& key);
+    std::size_t readNumber(std::size_t at);
+    std::size_t readPacked(std::size_t at);
+    bool canStand(const Key& key) const;
+    bool saysPitched() const;
+    bool canLetterStand(const Key& key) const;
+
+    const NamingHabits& habits_;
+    std::string_view name_;
+    std::span<const NamePiece> pieces_;
+    std::string& buffer_;
+    std::vector<Meant> meant_;
+    std::vector<std::pair<std::uint32_t, std::uint32_t>> silences_;
+    std::vector<Key> keys_;
+    std::vector<Tempo> tempos_;
+    NameRole before_ = NameRole::none;  // of the word before the piece at hand
+    bool saysLoop_ = false, saysOneShot_ = false, isOfPack_ = false, hasNote_ = false;
+};
+
+}  // namespace qvct

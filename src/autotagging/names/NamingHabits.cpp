@@ -1,0 +1,343 @@
+#include "autotagging/names/NamingHabits.h"
+
+#include "autotagging/keywords/QVCTKeywordExtractor.h"
+#include "autotagging/names/NamePieces.h"
+#include "platform/base/Log.h"
+#include "platform/base/Printable.h"
+#include "platform/data/PropertyListFile.h"
+#include "platform/text/Text.h"
+#include "resources/QVCTCompiledResources.h"
+#include "resources/ReplacementFile.h"
+#include "taxonomy/TGRTTaxonomy.h"
+#include "taxonomy/TagNormalization.h"
+
+#include <algorithm>
+#include <array>
+#include <map>
+#include <unordered_set>
+
+#include <fmt/format.h>
+
+namespace qvct {
+namespace {
+
+using Dictionary = PropertyList::Dictionary;
+
+constexpr std::array<std::pair<std::string_view, NameStrength>, 3> kStrengths = {
+    {{"words", NameStrength::word}, {"short", NameStrength::abbreviation}, {"hints", NameStrength::hint}}};
+
+/// A phrase that is written as one piece.
+NamingHabits::Word packed(NamingHabits::Word phrase) {
+    phrase.pieces = 1;
+    return phrase;
+}
+
+/// Whether a number is not zero, or a text begins with such a number: the old text form knows only texts.
+bool isYes(const PropertyList* value) {
+    if (value == nullptr) return false;
+    return (value->string() != nullptr ? leadingNumber(*value->string())
+                                       : value->doubleValue().value_or(0)) != 0;
+}
+
+/// Where the words of each role stand in the dictionary.
+struct RoleList {
+    std::string_view part;
+    std::string_view key;  // empty: the part is the list itself
+    NameRole role;
+};
+constexpr std::array<RoleList, 12> kRoleLists = {{{"Kinds", "Loop", NameRole::loop},
+                                                  {"Kinds", "One Shot", NameRole::oneShot},
+                                                  {"Modes", "Major", NameRole::major},
+                                                  {"Modes", "Minor", NameRole::minor},
+                                                  {"Modes", "Other", NameRole::scale},
+                                                  {"Accidentals", "sharp", NameRole::sharp},
+                                                  {"Accidentals", "flat", NameRole::flat},
+                                                  {"Tempo", "", NameRole::tempo},
+                                                  {"Counts", "", NameRole::count},
+                                                  {"Silent", "", NameRole::silent},
+                                                  {"Packs", "", NameRole::pack},
+                                                  {"Keys", "", NameRole::key}}};
+
+}  // namespace
+
+/// Builds habits from dictionaries, entry by entry.
+class NamingHabitsReader {
+  public:
+    explicit NamingHabitsReader(const TGRTTaxonomy& taxonomy)
+        : taxonomy_(taxonomy), habits_(std::make_shared<NamingHabits>()) {}
+
+    bool add(const Dictionary& dictionary, Error* error) {
+        ++source_;
+        addNames(dictionary, "Pitched", pitched_);
+        addNames(dictionary, "Figurative", figurative_);
+        addNames(dictionary, "Categories", categories_);
+        if (const Dictionary* labels = dictionary.dictionary("InFolders"))
+            for (const auto& [label, value] : *labels)
+                if (value.string() != nullptr) inFolders_[label] = *value.string();
+        return addNotes(dictionary, error) && addRoles(dictionary, error) && addMeanings(dictionary, error);
+    }
+
+    /// The labels of the taxonomy, and the words of the keyword mapping, say themselves unless an entry says
+    /// something else.
+    void addOwnWords(const Dictionary& keywords) {
+        for (const auto& [keyword, value] : keywords) {
+            if (keyword.starts_with("regex:")) continue;
+            const std::string* one = value.string();
+            if (one != nullptr) addOwnWord(keyword, *one);
+        }
+        for (const auto& tag : taxonomy_.allTags()) addOwnWord(tag->label(), tag->label());
+    }
+
+    std::shared_ptr<const NamingHabits> finish() && {
+        for (NamedMeaning& meaning : habits_->meanings_) {
+            meaning.isPitched = belongsTo(pitched_, meaning.label);
+            meaning.isFigurative = belongsTo(figurative_, meaning.label);
+            const auto found = inFolders_.find(meaning.label);
+            meaning.inFolders = found == inFolders_.end() ? meaning.label : found->second;
+        }
+        return std::move(habits_);
+    }
+
+  private:
+    using Word = NamingHabits::Word;
+    using Names = std::unordered_set<std::string>;
+
+    static void addNames(const Dictionary& dictionary, std::string_view key, Names& names) {
+        const PropertyList::Array* list = dictionary.array(key);
+        if (list == nullptr) return;
+        for (const PropertyList& name : *list)
+            if (name.string() != nullptr) names.insert(*name.string());
+    }
+
+    bool addNotes(const Dictionary& dictionary, Error* error) {
+        const Dictionary* notes = dictionary.dictionary("Notes");
+        if (notes == nullptr) return true;
+        return std::all_of(notes->begin(), notes->end(), [&](const auto& entry) {
+            const std::string* text = entry.value.string();
+            const double note =
+                text != nullptr ? leadingNumber(*text) : entry.value.doubleValue().value_or(-1);
+            if (note < 0 || note > 11)
+                return fail(error, kErrorMalformed, "is no note from 0 to 11", {.part = entry.key});
+            habits_->notes_[entry.key] = static_cast<int>(note);
+            return true;
+        });
+    }
+
+    bool addRoles(const Dictionary& dictionary, Error* error) {
+        for (const auto& [part, key, role] : kRoleLists) {
+            const Dictionary* lists = key.empty() ? &dictionary : dictionary.dictionary(part);
+            const PropertyList::Array* words =
+                lists == nullptr ? nullptr : lists->array(key.empty() ? part : key);
+            const std::string entry = key.empty() ? std::string(part) : fmt::format("{}, {}", part, key);
+            if (words != nullptr && !addAll(*words, {.role = role}, entry, error)) return false;
+        }
+        return true;
+    }
+
+    bool addMeanings(const Dictionary& dictionary, Error* error) {
+        const Dictionary* meanings = dictionary.dictionary("Meanings");
+        if (meanings == nullptr) return true;
+        return std::all_of(meanings->begin(), meanings->end(), [&](const auto& entry) {
+            const Dictionary* lists = entry.value.dictionary();
+            if (lists == nullptr)
+                return fail(error, kErrorMalformed, "has no lists of words", {.part = entry.key});
+            const auto meaning = numberOf(entry.key);
+            return !meaning || addMeaning(*meaning, *lists, entry.key, error);
+        });
+    }
+
+    bool addMeaning(std::uint32_t meaning, const Dictionary& lists, const std::string& entry, Error* error) {
+        return std::all_of(kStrengths.begin(), kStrengths.end(), [&](const auto& strength) {
+            const PropertyList::Array* words = lists.array(strength.first);
+            return words == nullptr ||
+                   addAll(*words, {.meaning = meaning, .strength = strength.second}, entry, error);
+        });
+    }
+
+    /// Of the meaning that a label with or without level has; nothing when no tag has it.
+    std::optional<std::uint32_t> numberOf(const std::string& text) {
+        NamedMeaning meaning;
+        meaning.label = labelFromString(text, &meaning.level);
+        const auto tag = taxonomy_.findTagForLabel(meaning.label);
+        if (!tag) return std::nullopt;
+        meaning.category = tag->categoryIdentifier();
+        habits_->meanings_.push_back(std::move(meaning));
+        return static_cast<std::uint32_t>(habits_->meanings_.size() - 1);
+    }
+
+    bool addAll(const PropertyList::Array& words, Word word, const std::string& entry, Error* error) {
+        return std::all_of(words.begin(), words.end(), [&](const PropertyList& text) {
+            return text.string() != nullptr
+                       ? addWord(*text.string(), word, entry, error)
+                       : fail(error, kErrorMalformed, "is no list of texts", {.part = entry});
+        });
+    }
+
+    bool addWord(const std::string& text, Word word, const std::string& entry, Error* error) {
+        NamingHabits::Entry* place = placeFor(text, word.pieces);
+        if (place == nullptr) {
+            return fail(error, kErrorMalformed, fmt::format("\"{}\" is no word or phrase", printable(text)),
+                        {.part = entry});
+        }
+        if (place->source == source_ && place->word.strength == NameStrength::hint) {
+            std::swap(place->word, word);
+            std::swap(place->word.other, word.other);
+        }
+        if (place->source == source_ && word.strength == NameStrength::hint) {
+            addHint(*place, word);
+            return true;
+        }
+        if (place->source == source_) {
+            return fail(error, kErrorMalformed,
+                        fmt::format("\"{}\" stands in another entry as well", printable(text)),
+                        {.part = entry});
+        }
+        place->word = word;
+        place->source = source_;
+        return true;
+    }
+
+    /// A word may hint at several things besides what it says.
+    void addHint(NamingHabits::Entry& place, Word word) {
+        std::uint32_t* last = &place.word.other;
+        while (*last != Word::kNoMeaning) last = &habits_->others_[*last].other;
+        *last = static_cast<std::uint32_t>(habits_->others_.size());
+        word.other = Word::kNoMeaning;
+        habits_->others_.push_back(word);
+    }
+
+    void addOwnWord(const std::string& text, const std::string& label) {
+        Word word;
+        NamingHabits::Entry* place = placeFor(text, word.pieces);
+        if (place == nullptr || place->word.pieces > 0) return;
+        const auto tag = taxonomy_.findTagForLabel(labelFromString(label));
+        if (!tag || !categories_.contains(tag->categoryIdentifier())) return;
+        if (const auto meaning = numberOf(label)) {
+            word.meaning = *meaning;
+            place->word = word;
+        }
+    }
+
+    /// Where a word or phrase belongs, which is told by its pieces, whatever stands between them; null when
+    /// it has none or too many.
+    NamingHabits::Entry* placeFor(const std::string& text, std::uint8_t& count) {
+        const auto pieces = pieces_.read(text);
+        if (pieces.empty() || pieces.size() > NamingHabits::kMostPiecesOfPhrase) return nullptr;
+        count = static_cast<std::uint8_t>(pieces.size());
+        std::string phrase(pieces.front().folded);
+        std::uint8_t& longest = habits_->entries_[phrase].longest;
+        longest = std::max(longest, count);
+        for (const NamePiece& piece : pieces.subspan(1)) phrase.append(" ").append(piece.folded);
+        return &habits_->entries_[phrase];
+    }
+
+    bool belongsTo(const Names& labels, const std::string& label) const {
+        for (auto tag = taxonomy_.findTagForLabel(label); tag; tag = tag->parent())
+            if (labels.contains(tag->label())) return true;
+        return false;
+    }
+
+    const TGRTTaxonomy& taxonomy_;
+    std::shared_ptr<NamingHabits> habits_;
+    NamePieces pieces_;
+    Names pitched_;
+    Names figurative_;
+    Names categories_;
+    std::map<std::string, std::string> inFolders_;
+    std::uint8_t source_ = 0;
+};
+
+const NamingHabits::Entry* NamingHabits::find(std::string_view text) const {
+    const auto found = entries_.find(text);
+    return found == entries_.end() ? nullptr : &found->second;
+}
+
+const NamingHabits::Word* NamingHabits::findWord(std::string_view text) const {
+    constexpr std::size_t shortestWithPlural = 3;
+    const Entry* entry = find(text);
+    const bool isFound = entry != nullptr && entry->word.pieces > 0;
+    if (isFound || text.size() <= shortestWithPlural || (!text.ends_with('s') && !text.ends_with('z')))
+        return isFound ? &entry->word : nullptr;
+    const Entry* singular = find(text.substr(0, text.size() - 1));
+    if ((singular == nullptr || singular->word.pieces == 0) && text.ends_with("es"))
+        singular = find(text.substr(0, text.size() - 2));
+    return singular == nullptr || singular->word.pieces == 0 ? nullptr : &singular->word;
+}
+
+NameRole NamingHabits::roleOf(std::string_view folded) const {
+    const Word* word = findWord(folded);
+    return word == nullptr ? NameRole::none : word->role;
+}
+
+std::optional<int> NamingHabits::noteOf(std::string_view folded) const {
+    const auto found = notes_.find(folded);
+    return found == notes_.end() ? std::nullopt : std::optional(found->second);
+}
+
+NamingHabits::Word NamingHabits::wordAt(std::span<const NamePiece> pieces, std::string& buffer) const {
+    const Entry* first = find(pieces.front().folded);
+    const std::size_t longest = std::min<std::size_t>(first == nullptr ? 1 : first->longest, pieces.size());
+    const auto phraseOf = [&](std::size_t count) -> std::string_view {
+        if (count == 1) return pieces.front().folded;
+        buffer = pieces.front().folded;
+        for (const NamePiece& piece : pieces.subspan(1, count - 1)) buffer.append(" ").append(piece.folded);
+        return buffer;
+    };
+    for (std::size_t count = longest; count > 0; --count) {
+        const Word* found = findWord(phraseOf(count));
+        if (found == nullptr) continue;
+        Word word = *found;
+        word.pieces = static_cast<std::uint8_t>(count);
+        return word;
+    }
+    return {};
+}
+
+std::pair<NamingHabits::Word, NamingHabits::Word> NamingHabits::packedWords(std::string_view folded) const {
+    constexpr std::size_t shortest = 3, longest = 24;
+    const auto plain = [this](std::string_view text) -> const Word* {
+        const Word* word = findWord(text);
+        const bool isPlain = word != nullptr && word->pieces == 1 && word->strength == NameStrength::word;
+        return isPlain ? word : nullptr;
+    };
+    if (folded.size() < 2 * shortest || folded.size() > longest) return {};
+    std::string phrase(folded);
+    for (std::size_t at = shortest; at + shortest <= folded.size(); ++at) {
+        phrase.assign(folded).insert(at, 1, ' ');
+        const Word* together = findWord(phrase);
+        if (together != nullptr) return {packed(*together), {}};
+        const Word* first = plain(folded.substr(0, at));
+        const Word* second = first == nullptr ? nullptr : plain(folded.substr(at));
+        if (second != nullptr) return {*first, *second};
+    }
+    return {};
+}
+
+std::shared_ptr<const NamingHabits> NamingHabits::initWithDictionaries(
+    std::span<const PropertyList::Dictionary> dictionaries, const TGRTTaxonomy& taxonomy, Error* error) {
+    NamingHabitsReader reader(taxonomy);
+    for (const PropertyList::Dictionary& dictionary : dictionaries)
+        if (!reader.add(dictionary, error)) return nullptr;
+    reader.addOwnWords(QVCTKeywordExtractor::defaultKeywordMapping());
+    return std::move(reader).finish();
+}
+
+std::shared_ptr<const NamingHabits> NamingHabits::defaultHabits() {
+    const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
+    const auto builtIn = [] { return QVCTCompiledResources::NamingHabitsPlist().value_or(Dictionary{}); };
+    if (const auto path = replacementFile({"NamingHabits", "plist"})) {
+        std::vector<Dictionary> dictionaries;
+        Error error;
+        auto own = readDictionaryFile(*path, &error);
+        if (own && isYes(own->value("Adds"))) dictionaries.push_back(builtIn());
+        if (own) dictionaries.push_back(*std::move(own));
+        auto habits = error.isSet() ? nullptr : initWithDictionaries(dictionaries, *taxonomy, &error);
+        if (habits) return habits;
+        failIn(*path, &error);
+        log(fmt::format("{} (using the built-in naming habits)", error.message()));
+    }
+    const Dictionary own[] = {builtIn()};
+    return initWithDictionaries(own, *taxonomy);
+}
+
+}  // namespace qvct

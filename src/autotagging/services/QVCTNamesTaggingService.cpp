@@ -1,0 +1,32 @@
+#include "autotagging/services/QVCTNamesTaggingService.h"
+
+#include "autotagging/names/ItemNames.h"
+
+namespace qvct {
+
+std::shared_ptr<QVCTNamesTaggingService> QVCTNamesTaggingService::init() {
+    return initWithReader(NameReader());
+}
+
+std::shared_ptr<QVCTNamesTaggingService> QVCTNamesTaggingService::initWithReader(NameReader reader) {
+    return std::shared_ptr<QVCTNamesTaggingService>(new QVCTNamesTaggingService(std::move(reader)));
+}
+
+TagDictionarySet QVCTNamesTaggingService::tagsWithContentsOfURL(
+    const URL& url, const std::shared_ptr<QVCTXMLDocument>& /*xmlDocument*/,
+    const std::shared_ptr<TGRTMetaData>& /*metaData*/, const std::shared_ptr<LCFileData>& /*fileData*/,
+    std::uint64_t options) {
+    TagDictionarySet tags;
+    if ((options & QVCTAutoTaggingOptionNames) == 0) return tags;
+    const ItemNames names(url.path());
+    for (const TagClaim& claim : reader_.read(names.all()).claims)
+        tags.insert(tagDictionary(claim.label, claim.level));
+    return tags;
+}
+
+std::vector<TagClaim> QVCTNamesTaggingService::claims(const TaggedItem& item, std::uint64_t options) {
+    if ((options & QVCTAutoTaggingOptionNames) == 0) return {};
+    return reader_.read(item.names).claims;
+}
+
+}  // namespace qvct

@@ -1,0 +1,250 @@
+#include "autotagging/names/ItemNames.h"
+#include "autotagging/names/NameReader.h"
+#include "platform/data/PropertyListFile.h"
+#include "platform/files/ResourceBundle.h"
+#include "support/CapturedLog.h"
+#include "support/ProcessorClock.h"
+#include "support/TemporaryFolder.h"
+#include "taxonomy/TGRTTaxonomy.h"
+
+#include <algorithm>
+#include <set>
+
+#include <fmt/format.h>
+#include <gmock/gmock.h>
+
+namespace qvct {
+namespace {
+
+using testing::Contains;
+using testing::ElementsAre;
+using testing::HasSubstr;
+using testing::IsEmpty;
+
+using Labels = std::vector<std::string>;
+
+NameReading readingOf(std::string_view name) {
+    static NameReader reader;
+    const std::string_view names[] = {name};
+    return reader.read(names);
+}
+
+/// Labels that the name says plainly or by an abbreviation, sorted, each once.
+Labels labelsOf(const NameReading& reading) {
+    std::set<std::string> labels;
+    for (const TagClaim& claim : reading.claims)
+        if (claim.confidence > 0.5) labels.insert(claim.label);
+    return {labels.begin(), labels.end()};
+}
+
+TEST(Names, AreReadAsPeopleWriteThem) {
+    const struct {
+        std::string name;
+        Labels labels;
+    } rows[] = {
+        {"BD0010", {"Kick"}},
+        {"Kick_01", {"Kick"}},
+        {"KICKS", {"Kick"}},
+        {"kickdrum", {"Kick"}},
+        {"MyKickDrum2", {"Kick"}},
+        {"Bass Drum 3", {"Kick"}},
+        {"hihat 1", {"Hi-Hat"}},
+        {"HiHatOpen", {"Hi-Hat"}},
+        {"HHClosed01", {"Hi-Hat"}},
+        {"openhat", {"Hi-Hat"}},
+        {"OH_707", {"Hi-Hat"}},
+        {"rim-shot(2)", {"Rim"}},
+        {"Gro\xc3\x9f"
+         "e Trommel",
+         {"Kick"}},
+        {"Gu\xc3\xad"
+         "ro lang",
+         {"Guiro"}},
+        {"Synth Bass 2", {"Synth Bass"}},
+        {"drumloop", {"Drums"}},
+        {"deephouse_lead", {"Deep House", "Lead"}},
+        {"Deep_House_Pad", {"Deep House", "Pad"}},
+        {"Muted Trumpet", {"Muted", "Trumpet"}},
+        {"Drum Fill", {"Drums", "Fill"}},
+        {"Drum'n'Bass", {"Drum'n'Bass"}},
+        {"drum & bass", {"Drum'n'Bass"}},
+        {"\xd1\x82\xd0\xbe\xd0\xbc", {"Tom"}},
+        {"Bell\xff"
+         "Clap",
+         {"Bells", "Claps"}},
+    };
+    for (const auto& [name, labels] : rows) EXPECT_EQ(labelsOf(readingOf(name)), labels) << name;
+}
+
+TEST(Names, DoNotSayWhatTheyOnlySeemToSay) {
+    for (const char* name :
+         {"", "808", "v127 rr2", "Hard Drive", "Section B", "Plan B", "3 AM", "Vol 2", "C", "A Day", "Take C",
+          "TR808", "abcdefgh", "Kit", "()[]--__", "9A", "Sat", "Bdelay", "Charm"}) {
+        const NameReading reading = readingOf(name);
+        EXPECT_THAT(labelsOf(reading), IsEmpty()) << name;
+        EXPECT_FALSE(reading.tempo) << name;
+    }
+}
+
+TEST(Names, TellKeyTempoAndKindWhereTheyStand) {
+    const struct {
+        std::string name, key, mode;
+        double tempo = 0;
+        SoundKind kind = SoundKind::unsaid;
+    } rows[] = {
+        {"VEH_Deep_House_Synth_Loop_124_Am", "A", "Minor", 124, SoundKind::loop},
+        {"Piano Loop 90 Bbmaj", "ASharp", "Major", 90, SoundKind::loop},
+        {"Lead_F#min_128bpm", "FSharp", "Minor", 128},
+        {"bpm_87.5 Strings C# minor", "CSharp", "Minor", 87.5},
+        {"Pluck A_minor", "A", "Minor"},
+        {"Groove 8A 126bpm", "A", "Minor", 126},
+        {"Groove 8B 126bpm", "C", "Major", 126},
+        {"Groove 12A 126bpm", "CSharp", "Minor", 126},
+        {"Synth A# Minor", "ASharp", "Minor"},
+        {"Bajo Re menor", "D", "Minor"},
+        {"Strings C Lydian", "C", ""},
+        {"Bass Loop 124 F", "F", "", 124, SoundKind::loop},
+        {"Fm Pad", "F", "Minor"},
+        {"FM Pad", "", ""},
+        {"Piano A2", "", ""},
+        {"Piano C#3 v127", "", ""},
+        {"Drum Loop 124 A", "", "", 124, SoundKind::loop},
+        {"Bass Loop B", "", "", 0, SoundKind::loop},
+        {"Loop Am Cm 120", "", "", 120, SoundKind::loop},
+        {"Loop 120 130", "", "", 0, SoundKind::loop},
+        {"Kick 124 one shot", "", "", 0, SoundKind::oneShot},
+        {"Snare 101", "", ""},
+    };
+    for (const auto& row : rows) {
+        const NameReading reading = readingOf(row.name);
+        std::string key, mode;
+        for (const TagClaim& claim : reading.claims) {
+            const auto parent = TGRTTaxonomy::defaultTaxonomy()->findTagForLabel(claim.label)->parent();
+            if (parent && parent->label() == "Key") key += claim.label;
+            if (parent && parent->label() == "Key Type") mode += claim.label.substr(0, claim.label.find(' '));
+        }
+        EXPECT_EQ(key, row.key) << row.name;
+        EXPECT_EQ(mode, row.mode) << row.name;
+        EXPECT_EQ(reading.tempo.value_or(0), row.tempo) << row.name;
+        EXPECT_EQ(reading.kind, row.kind) << row.name;
+    }
+}
+
+TEST(Names, SayWhereTheirWordsStand) {
+    const std::string name = "99_Ti\xc3\xabsto_Snare(2)";
+    const NameReading reading = readingOf(name);
+    ASSERT_EQ(reading.claims.size(), 1U);
+    EXPECT_EQ(name.substr(reading.claims[0].evidence.offset, 5), "Snare");
+    EXPECT_EQ(reading.claims[0].evidence.what, "Snare");
+}
+
+TEST(Names, CountFromTheItemUpToTheFolderThatWasNamed) {
+    const auto names = [](const std::string& path, const std::string& root) {
+        const ItemNames its(path, root);
+        return Labels(its.all().begin(), its.all().end());
+    };
+    EXPECT_THAT(names("/C/Pack/Drums/Kick.01.wav", "/C/Pack"), ElementsAre("Kick.01", "Drums", "Pack"));
+    EXPECT_THAT(names("/C/Pack/Drums/Kick.wav", "/C/Pack/"), ElementsAre("Kick", "Drums", "Pack"));
+    EXPECT_THAT(names("/a/b/c/Kick.wav", "/a/b/c/Kick.wav"), ElementsAre("Kick", "c", "b"));
+    EXPECT_THAT(names("/a/b/c/Warm.patch/", ""), ElementsAre("Warm", "c", "b"));
+    EXPECT_THAT(names("/.wav", ""), ElementsAre(".wav"));
+}
+
+TEST(Names, CostLittleHoweverLongTheyAre) {
+    const auto repeated = [](const std::string& text, int times) {
+        std::string all;
+        for (int i = 0; i < times; ++i) all += text;
+        return all;
+    };
+    std::string deep = "/root";
+    for (int i = 0; i < 10'000; ++i) deep += fmt::format("/Kick {}", i);
+    const std::string hostile[] = {repeated("k", 255),
+                                   repeated("kick", 1'000'000),
+                                   repeated("\xcc\x81", 100'000),
+                                   repeated("\xd7\xa9\xd7\x9c\xd7\x95\xd7\x9d ", 10'000),
+                                   repeated("\xff", 1000),
+                                   repeated("A#", 100'000),
+                                   repeated("1 ", 100'000),
+                                   repeated("(", 100'000)};
+    const test::ProcessorClock::time_point start = test::ProcessorClock::now();
+    for (const std::string& name : hostile) readingOf(name);
+    NameReader reader;
+    EXPECT_LE(reader.read(ItemNames(deep, "/root").all()).claims.size(), 65U);
+    EXPECT_LT(std::chrono::duration<double>(test::ProcessorClock::now() - start).count(), 1.0);
+}
+
+// MARK: - Habits
+
+PropertyList::Dictionary dictionaryOf(const std::string& text) {
+    Error error;
+    auto list = parsePropertyList({reinterpret_cast<const unsigned char*>(text.data()), text.size()}, &error);
+    EXPECT_TRUE(list && list->dictionary() != nullptr) << error.message();
+    return *list->dictionary();
+}
+
+TEST(NamingHabits, TellWhichEntryIsWrong) {
+    const struct {
+        std::string text, part, reason;
+    } rows[] = {
+        {"{ Meanings = { Kick = { words = (boink); }; Snare = { words = (boink); }; }; }", "Snare",
+         "\"boink\" stands in"},
+        {"{ Meanings = { Kick = { words = (boink); short = (Boink); }; }; }", "Kick", "stands in another"},
+        {"{ Meanings = { Kick = { words = (\"--\"); }; }; }", "Kick", "is no word or phrase"},
+        {"{ Meanings = { Kick = { words = (\"a b c d e f\"); }; }; }", "Kick", "is no word or phrase"},
+        {"{ Meanings = { Kick = { words = ({ a = b; }); }; }; }", "Kick", "is no list of texts"},
+        {"{ Meanings = { Kick = (boink); }; }", "Kick", "has no lists"},
+        {"{ Notes = { re = 12; }; }", "re", "is no note"},
+        {"{ Tempo = (boink); Counts = (boink); }", "Counts", "stands in another"},
+    };
+    for (const auto& row : rows) {
+        Error error;
+        const PropertyList::Dictionary own[] = {dictionaryOf(row.text)};
+        EXPECT_FALSE(NamingHabits::initWithDictionaries(own, *TGRTTaxonomy::defaultTaxonomy(), &error))
+            << row.text;
+        EXPECT_EQ(error.part, row.part) << row.text;
+        EXPECT_THAT(error.reason, HasSubstr(row.reason)) << row.text;
+    }
+}
+
+TEST(NamingHabits, OfTheUserAddToOrReplaceTheBuiltInOnes) {
+    const struct {
+        std::string text;
+        Labels kick, boink, sub;  // what is read in "kick", "boink" and "snare"
+        std::string logged;
+    } rows[] = {
+        {"{ Adds = 1; Meanings = { Cowbell = { words = (boink, snare); }; }; }",
+         {"Kick"},
+         {"Cowbell"},
+         {"Cowbell"},
+         ""},
+        {"{ Meanings = { Cowbell = { words = (boink); }; }; }", {}, {"Cowbell"}, {}, ""},
+        {"{ Meanings = { \"No Such Tag\" = { words = (boink); }; }; Adds = 1; }",
+         {"Kick"},
+         {},
+         {"Snare"},
+         ""},
+        {"{ Meanings = { Kick = boink; }; }", {"Kick"}, {}, {"Snare"}, "Kick: has no lists of words"},
+        {"{ Meanings = ", {"Kick"}, {}, {"Snare"}, "NamingHabits.plist"},
+    };
+    for (const auto& row : rows) {
+        const test::TemporaryFolder folder;
+        folder.write("NamingHabits.plist", row.text);
+        ResourceBundle::setDirectory(folder.path());
+        const test::CapturedLog log;
+        NameReader reader(NamingHabits::defaultHabits());
+        ResourceBundle::setDirectory("");
+        const auto labels = [&reader](std::string_view name) {
+            const std::string_view names[] = {name};
+            return labelsOf(reader.read(names));
+        };
+        EXPECT_EQ(labels("kick"), row.kick) << row.text;
+        EXPECT_EQ(labels("boink"), row.boink) << row.text;
+        EXPECT_EQ(labels("snare"), row.sub) << row.text;
+        const std::string logged = testing::PrintToString(log.messages());
+        EXPECT_THAT(logged, HasSubstr(row.logged));
+        EXPECT_EQ(log.messages().empty(), row.logged.empty()) << logged;
+    }
+}
+
+}  // namespace
+}  // namespace qvct
