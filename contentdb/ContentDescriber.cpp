@@ -1,6 +1,7 @@
 #include "contentdb/ContentDescriber.h"
 
 #include "autotagging/ContentItem.h"
+#include "autotagging/ItemTagger.h"
 #include "autotagging/QVTaggingAggregator.h"
 #include "contentdb/index/PayloadHash.h"
 #include "contentdb/store/Digest.h"
@@ -46,6 +47,14 @@ void addTaggings(IndexedItem& item, Taggings& known, const Taggings& added, Prov
     }
 }
 
+/// The word, or the rule: what a person needs to understand the tag.
+std::string evidenceOf(const TagClaim& claim) {
+    constexpr std::size_t longest = 80;
+    const std::string& text =
+        claim.evidence.what.empty() || claim.service == "rules" ? claim.evidence.where : claim.evidence.what;
+    return text.size() <= longest ? text : std::string();
+}
+
 /// Whether the number only says that nothing is known.
 bool isUnknown(std::string_view key, double value) {
     constexpr std::array zeroIfUnknown = {QVContentKeyLengthInSeconds, QVContentKeyBeatCount,
@@ -86,7 +95,9 @@ void addValues(IndexedItem& item, const ObjectSet<TGRTKeyValue>& values) {
 }  // namespace
 
 struct ContentDescriber::Implementation {
-    explicit Implementation(std::uint64_t options) : services(options) {}
+    Implementation(std::uint64_t options, const std::vector<std::string>& indexed) : services(options) {
+        for (const std::string& folder : indexed) folders.push_back(URL::fileURLWithPath(folder).path());
+    }
 
     static constexpr std::uint64_t kOptions = kIndexInMutableTaxonomy | kIndexWithoutRecord;
     // The record may name tags of the user's own, while services name the taxonomy's. The user's are added to
@@ -95,6 +106,7 @@ struct ContentDescriber::Implementation {
         TGRTTaxonomy::newTaxonomyOfType(kDefaultTaxonomy, false, false);
     std::shared_ptr<TGRTTaxonomy> taxonomyOfServices = TGRTTaxonomy::defaultTaxonomy();
     std::uint64_t services;
+    std::vector<std::string> folders;
     bool needsXmlDocument() const {
         constexpr std::uint64_t readers = QVCTAutoTaggingOptionXMLRules |
                                           QVCTAutoTaggingOptionSoftwareInstruments |
@@ -102,18 +114,47 @@ struct ContentDescriber::Implementation {
         return (services & readers) != 0;
     }
     std::shared_ptr<QVTaggingAggregator> aggregator = QVTaggingAggregator::defaultTaggingAggregator();
-    RegularExpression namedTempo = *RegularExpression::compile(
+    ItemTagger tagger{aggregator, taxonomyOfServices};
+    RegularExpression tempoInName = *RegularExpression::compile(
         R"((?<![\d.,])(\d{2,3}(?:[.,]\d+)?)[\s_-]?bpm(?![\p{L}\d]))", RegularExpression::Case::insensitive);
+    std::optional<double> namedTempo;  // of the item at hand, as its names state it
 
     void addAllTaggings(IndexedItem& item, const std::shared_ptr<ContentItem>& content,
                         const TGRTMetaData* record, const Taggings& withVirtual) {
         Taggings known;
         if (record != nullptr) addTaggings(item, known, record->taggings(), Provenance::stored);
         addTaggings(item, known, withVirtual, Provenance::virtualTag);
+        if ((services & QVCTAutoTaggingOptionNames) != 0) return addDecided(item, known, content);
         for (const auto& [name, option] : kTaggingServiceNames) {
             if ((services & option) == 0) continue;
             addTaggings(item, known, aggregator->taggingsOfItem(content, *taxonomyOfServices, option),
                         Provenance::automatic, name);
+        }
+    }
+
+    /// The folder that was indexed, of several the innermost.
+    std::string_view rootOf(std::string_view path) const {
+        std::string_view root;
+        for (const std::string& folder : folders) {
+            const bool isBelow =
+                path.starts_with(folder) && folder.size() < path.size() && path[folder.size()] == '/';
+            if (isBelow && folder.size() > root.size()) root = folder;
+        }
+        return root;
+    }
+
+    void addDecided(IndexedItem& item, Taggings& known, const std::shared_ptr<ContentItem>& content) {
+        const std::string path = content->url().path();
+        const ItemReport report = tagger.report(content, ItemNames(path, rootOf(path)), services);
+        namedTempo = report.tempo;
+        for (const HeldTag& held : report.resolution.held) {
+            const auto tagging = held.tagging();
+            if (!tagging || !known.insert(tagging)) continue;
+            const TagClaim* best = held.claims.empty() ? nullptr : &held.claims.front();
+            auto& added = item.taggings.emplace_back(indexed(
+                *tagging, Provenance::automatic, best == nullptr ? std::string_view() : best->service));
+            added.confidence = static_cast<float>(held.confidence);
+            if (best != nullptr) added.evidence = evidenceOf(*best);
         }
     }
 
@@ -123,22 +164,23 @@ struct ContentDescriber::Implementation {
             if (file->bpm() > 0) addNumber(item, "Tempo", double{file->bpm()});
         }
         if (hasValue(item, "Tempo")) return;
+        if (namedTempo) return addNumber(item, "Tempo", *namedTempo);
         const std::u16string text = utf16FromUtf8(fileName);
-        const auto match = namedTempo.firstMatch(text);
+        const auto match = tempoInName.firstMatch(text);
         if (match.size() < 2) return;
         const auto number = std::u16string_view(text).substr(match[1].start, match[1].end - match[1].start);
         addNumber(item, "Tempo", leadingNumber(replaceAll(utf8FromUtf16(number), ",", ".")));
     }
 };
 
-ContentDescriber::ContentDescriber(std::uint64_t services)
-    : implementation_(std::make_unique<Implementation>(services)) {}
+ContentDescriber::ContentDescriber(std::uint64_t services, const std::vector<std::string>& folders)
+    : implementation_(std::make_unique<Implementation>(services, folders)) {}
 
 ContentDescriber::~ContentDescriber() = default;
 
 std::uint64_t ContentDescriber::digest(std::uint64_t services) {
     // Raised when a change makes items be described differently although the version stays the same.
-    constexpr std::uint64_t edition = 4;
+    constexpr std::uint64_t edition = 5;
     Digest digest;
     digest.add(services);
     digest.add(version());
@@ -176,6 +218,7 @@ std::optional<IndexedItem> ContentDescriber::describe(const std::string& path, E
     item.packs.assign(object->packageIdentifiers().begin(), object->packageIdentifiers().end());
     for (const auto& dependency : object->dependencyItems())
         item.dependencies.push_back({dependency->UUID(), dependency->path()});
+    its.namedTempo.reset();
     its.addAllTaggings(item, content, record.get(), object->taggingDatas());
     addValues(item, object->valueDatas());
     its.addTempoAndBeats(item, content->fileData().get(), url.lastPathComponent());

@@ -6,6 +6,8 @@
 
 #include <cstdint>
 #include <memory>
+#include <string>
+#include <vector>
 
 namespace qvct::contentdb {
 
@@ -13,8 +15,10 @@ namespace qvct::contentdb {
 /// the record, taggings that follow from it, and those that tagging services derive.
 ///
 /// A tagging that has several of these origins (the same label, category and level) is listed once, with the
-/// first of them; services come in the order of `kTaggingServiceNames`. All services together give what the
-/// aggregator gives. Labels that the taxonomy does not know are kept if they come from the record.
+/// first of them. With naming habits among the services (QVCTAutoTaggingOptionNames) it is decided as
+/// `ItemTagger` does which of their tags hold; without them all do, the services in the order of
+/// `kTaggingServiceNames`, as the aggregator gives them. Labels that the taxonomy does not know are kept if
+/// they come from the record.
 ///
 /// Values are those of the record, without numbers that mean "unknown". "Tempo" and "BeatCount" may also come
 /// from chunks of other makers, and failing that the tempo from a name such as "Beat 122bpm".
@@ -23,8 +27,10 @@ namespace qvct::contentdb {
 /// described by its name and the services.
 class QVCT_API ContentDescriber : public ItemDescriber {
   public:
-    /// `services`: a sum of QVCTAutoTaggingOptions.
-    explicit ContentDescriber(std::uint64_t services = optionsForAllTaggingServices());
+    /// `services`: a sum of QVCTAutoTaggingOptions. `folders`: those that are indexed; nothing above them
+    /// says what an item is.
+    explicit ContentDescriber(std::uint64_t services = optionsForAllTaggingServices(),
+                              const std::vector<std::string>& folders = {});
     ~ContentDescriber() override;
 
     /// A number for `IndexOptions::describer` that changes with whatever descriptions depend on besides the

@@ -33,6 +33,10 @@ struct IndexedTagging {
     std::string service;
     /// A service made it, now or before it was stored.
     bool isAuto = false;
+    /// How sure the services are, in [0, 1], and what they saw: a word of the name, a rule. Only of those
+    /// that are automatic.
+    std::optional<float> confidence = {};
+    std::string evidence = {};
 
     bool operator==(const IndexedTagging&) const = default;
 };

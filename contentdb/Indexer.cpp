@@ -34,7 +34,10 @@ std::unique_ptr<DescriberPool> workerPool(const IndexOptions& options) {
     WorkerPool::Settings settings;
     settings.program = pathOfWorkerProgram(options.worker);
     settings.arguments = options.worker.arguments;
-    if (options.worker.path.empty()) settings.arguments = {std::to_string(options.services)};
+    if (options.worker.path.empty()) {
+        settings.arguments = {std::to_string(options.services)};
+        settings.arguments.insert(settings.arguments.end(), options.folders.begin(), options.folders.end());
+    }
     if (processHasArgument(kOfTests)) settings.arguments.emplace_back(kOfTests);
     settings.workers = numberOfWorkers(options);
     settings.timeLimit = options.timeLimitPerItem;

@@ -1,6 +1,8 @@
 #include "contentdb/store/ItemCodec.h"
 
+#include <algorithm>
 #include <bit>
+#include <cmath>
 #include <cstring>
 
 namespace qvct::contentdb {
@@ -18,6 +20,27 @@ void write(ByteWriter& out, const IndexedTagging& tagging) {
     out.number(static_cast<std::uint64_t>(tagging.provenance));
     out.text(tagging.service);
     out.number(tagging.isAuto ? 1 : 0);
+}
+
+constexpr float kConfidenceSteps = 1000;
+
+/// Of every tagging: 0, or one more than its confidence in thousandths, and the evidence.
+void writeEvidence(ByteWriter& out, const std::vector<IndexedTagging>& taggings) {
+    for (const IndexedTagging& tagging : taggings) {
+        const auto& confidence = tagging.confidence;
+        out.number(confidence ? 1 + static_cast<std::uint64_t>(std::lround(*confidence * kConfidenceSteps))
+                              : 0);
+        if (confidence) out.text(tagging.evidence);
+    }
+}
+
+void readEvidence(ByteReader& in, std::vector<IndexedTagging>& taggings) {
+    for (IndexedTagging& tagging : taggings) {
+        const std::uint64_t steps = in.number();
+        if (steps == 0) continue;
+        tagging.confidence = std::min(static_cast<float>(steps - 1) / kConfidenceSteps, 1.0F);
+        tagging.evidence = in.text();
+    }
 }
 
 IndexedTagging readTagging(ByteReader& in) {
@@ -149,7 +172,10 @@ std::string encodedDescription(const IndexedItem& item) {
         out.text(dependency.path);
     }
     out.text(item.failure);
-    if (!item.title.empty()) out.text(item.title);
+    const bool hasEvidence = std::any_of(item.taggings.begin(), item.taggings.end(),
+                                         [](const auto& tagging) { return tagging.confidence.has_value(); });
+    if (!item.title.empty() || hasEvidence) out.text(item.title);
+    if (hasEvidence) writeEvidence(out, item.taggings);
     return out.take();
 }
 
@@ -170,6 +196,7 @@ bool decodeDescription(std::string_view bytes, IndexedItem& item) {
     }
     item.failure = in.text();
     if (!in.isAtEnd()) item.title = in.text();
+    if (!in.isAtEnd()) readEvidence(in, item.taggings);
     return in.isIntact() && in.isAtEnd();
 }
 

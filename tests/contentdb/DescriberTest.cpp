@@ -98,13 +98,14 @@ TEST_F(Describing, TellsWhereATaggingComesFrom) {
     }
     EXPECT_THAT(origins, Contains(Pair("Misty", Pair(Provenance::stored, ""))));
     EXPECT_THAT(origins, Contains(Pair("A", Pair(Provenance::virtualTag, ""))));
-    EXPECT_THAT(origins, Contains(Pair("Kick", Pair(Provenance::automatic, "keywords"))));
+    EXPECT_THAT(origins, Contains(Pair("Kick", Pair(Provenance::automatic, "names"))));
     EXPECT_THAT(origins, Contains(Pair("Audio Loop", Pair(Provenance::automatic, "content-type"))));
     EXPECT_THAT(ancestors["A"], testing::ElementsAre("Key"));
     EXPECT_THAT(ancestors["House"], Contains("Electronic Music"));
 }
 
 TEST_F(Describing, HasWhatObjectAndAggregatorSayAndNoMore) {
+    constexpr std::uint64_t kExactServices = optionsForAllTaggingServices() & ~QVCTAutoTaggingOptionNames;
     using Said = std::set<std::tuple<std::string, std::string, float>>;
     const auto said = [](const ObjectSet<TGRTTagging>& taggings) {
         Said result;
@@ -120,9 +121,9 @@ TEST_F(Describing, HasWhatObjectAndAggregatorSayAndNoMore) {
         tag(path, "Genres", "House");
         const auto object = TGRTIndexableContentObject::indexableContentObjectForURL(url, 0x104);
         Said expected = said(object->taggingDatas());
-        expected.merge(said(aggregator->taggingsWithContentsOfURL(url, *TGRTTaxonomy::defaultTaxonomy(),
-                                                                  optionsForAllTaggingServices())));
-        const IndexedItem item = describe(path);
+        expected.merge(said(
+            aggregator->taggingsWithContentsOfURL(url, *TGRTTaxonomy::defaultTaxonomy(), kExactServices)));
+        const IndexedItem item = describe(path, kExactServices);
         Said found;
         for (const IndexedTagging& tagging : item.taggings) {
             EXPECT_TRUE(found.emplace(tagging.label, tagging.category, tagging.level.value_or(-1)).second)
