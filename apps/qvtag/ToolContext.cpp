@@ -92,10 +92,17 @@ void ToolContext::notePassedOver(const std::vector<URL>& links) const {
 
 void ToolContext::forEachContentItem(const std::vector<std::string>& paths, LinksOutside links,
                                      const std::function<void(const URL&)>& show) {
+    forEachContentItemBelow(paths, links, [&show](const URL& url, const std::string&) { show(url); });
+}
+
+void ToolContext::forEachContentItemBelow(
+    const std::vector<std::string>& paths, LinksOutside links,
+    const std::function<void(const URL&, const std::string& root)>& show) {
     std::vector<URL> passedOver;
+    std::string root;
     const auto visit = [&](const URL& url) {
         if (isValidUtf8(url.path())) {
-            show(url);
+            show(url, root);
         } else {
             itemFailed(errorOf(kErrorInvalidArgument, "the name is not UTF-8", {url.path()}));
         }
@@ -103,6 +110,7 @@ void ToolContext::forEachContentItem(const std::vector<std::string>& paths, Link
     };
     for (const std::string& path : paths) {
         if (isOutputLost()) break;
+        root = URL::fileURLWithPath(path).path();
         walkContent(path, visit, [this](const Error& error) { itemFailed(error); },
                     {links, [&passedOver](const URL& link) { passedOver.push_back(link); }});
     }

@@ -48,6 +48,9 @@ class ToolContext {
     /// links that are not followed.
     void forEachContentItem(const std::vector<std::string>& paths, LinksOutside links,
                             const std::function<void(const URL&)>& show);
+    /// The same, with the path below which it was found.
+    void forEachContentItemBelow(const std::vector<std::string>& paths, LinksOutside links,
+                                 const std::function<void(const URL&, const std::string& root)>& show);
     /// The content items at or below the paths, all found before anything is done with one.
     std::vector<URL> contentItems(const std::vector<std::string>& paths, LinksOutside links);
     /// Prints that note for a command that walks by itself; nothing when there are no links.

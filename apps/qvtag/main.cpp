@@ -33,6 +33,8 @@ void addSharedOptions(Command tool, ToolContext& context) {
 void addCommands(Command tool, ToolContext& context) {
     addAutotagCommand(tool, context);
     addDatabaseCommand(tool, context);
+    addEvaluateCommand(tool, context);
+    addExplainCommand(tool, context);
     addGenerateCommand(tool);
     addIndexCommand(tool, context);
     addInspectCommand(tool, context);

@@ -71,7 +71,7 @@ TEST_F(LibraryCommands, IndexAndFind) {
                                    [](const json& tagging) { return tagging["label"] == "Kick"; });
     ASSERT_NE(kick, found[0]["taggings"].end());
     EXPECT_EQ((*kick)["provenance"], "automatic");
-    EXPECT_EQ((*kick)["service"], "keywords");
+    EXPECT_EQ((*kick)["service"], "names");
     EXPECT_EQ(run({"search", "", "--limit", "2"}).json().size(), 2U);
 }
 

@@ -1,8 +1,9 @@
 #include "CommandLine.h"
-#include "Resources.h"
 #include "RhythmMeasurement.h"
 #include "Services.h"
+#include "TaggerOptions.h"
 #include "autotagging/ContentItem.h"
+#include "autotagging/ItemTagger.h"
 #include "autotagging/QVTaggingAggregator.h"
 #include "autotagging/services/QVCTRhythmicTaggingService.h"
 #include "commands/Commands.h"
@@ -11,7 +12,7 @@
 #include "metadata/TGRTMetaData.h"
 #include "output/ItemTable.h"
 #include "output/StandardStreams.h"
-#include "platform/data/PropertyListFile.h"
+#include "output/TaggingWords.h"
 
 #include <algorithm>
 #include <memory>
@@ -24,34 +25,13 @@ namespace {
 struct Options {
     std::vector<std::string> paths;
     LinksOutside links = LinksOutside::files;
-    std::vector<std::string> services;
-    std::string keywordsFile;
-    std::string rulesFile;
+    TaggerOptions tagger;
     bool measuresAnyRhythm = false;
+    bool isStrict = false;
+    bool showsAll = false;
 };
 
 using Taggings = std::vector<std::shared_ptr<TGRTTagging>>;
-
-using Settings = QVTaggingAggregator::Settings;
-
-/// The settings in a file; nothing, and a line on standard error, when it holds none.
-template <typename Read>
-Settings settingsIn(const std::string& file, std::string_view what, Read read, ToolContext& context) {
-    if (file.empty()) return std::nullopt;
-    Error error;
-    Settings settings = read(file, &error);
-    if (settings) return settings;
-    error.reason += fmt::format(" (using the built-in {})", what);
-    context.itemFailed(error);
-    return settings;
-}
-
-Settings keywordsIn(const std::string& file, ToolContext& context) {
-    const auto read = [](const std::string& path, Error* error) { return readDictionaryFile(path, error); };
-    Settings keywords = settingsIn(file, "keywords", read, context);
-    if (keywords) checkKeywords(*keywords, context);
-    return keywords;
-}
 
 /// The item's kind as its record states it, or else as its name suggests.
 std::int64_t fileTypeOf(ContentItem& item) {
@@ -67,14 +47,6 @@ Json jsonOfItem(ContentItem& item, const Taggings& taggings) {
     json["taggings"] = Json::array();
     for (const auto& tagging : taggings) json["taggings"].push_back(jsonOfTagging(*tagging));
     return json;
-}
-
-ItemRow rowOf(const URL& url, const Taggings& taggings) {
-    ItemRow row{url.path(), {}};
-    for (const auto& tagging : taggings)
-        row.words.push_back({textOfTagging(*tagging), tagging->level() ? Color::accent : Color::plain});
-    if (row.words.empty()) row.words.push_back({"no tags", Color::faint});
-    return row;
 }
 
 /// How many items and tags there were.
@@ -114,26 +86,28 @@ void addAnyRhythm(ContentItem& item, const TGRTTaxonomy& taxonomy, ObjectSet<TGR
 }
 
 void run(const Options& options, ToolContext& context) {
-    const auto bits = optionsForServices(options.services, context);
-    const auto aggregator =
-        QVTaggingAggregator::initWithRules(settingsIn(options.rulesFile, "rules", readRules, context),
-                                           keywordsIn(options.keywordsFile, context));
+    const auto bits = optionsForServices(options.tagger.services, context);
+    const auto aggregator = options.tagger.aggregator(context);
     const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
     std::vector<ItemRow> rows;
     JsonItems json(context.format);
     Totals totals;
-    context.forEachContentItem(options.paths, options.links, [&](const URL& url) {
-        const auto item = std::make_shared<ContentItem>(url, ContentItem::Reading{bits, nullptr});
-        auto found = aggregator->taggingsOfItem(item, *taxonomy, bits);
-        if (options.measuresAnyRhythm) addAnyRhythm(*item, *taxonomy, found);
-        const Taggings taggings = sortedTaggings(found);
-        totals.add(taggings);
-        if (context.format == Format::table) {
-            rows.push_back(rowOf(url, taggings));
-        } else {
-            json.add(jsonOfItem(*item, taggings));
-        }
-    });
+    ItemTagger tagger(aggregator, taxonomy);
+    context.forEachContentItemBelow(
+        options.paths, options.links, [&](const URL& url, const std::string& root) {
+            const auto item = std::make_shared<ContentItem>(url, ContentItem::Reading{bits, nullptr});
+            auto found = options.isStrict
+                             ? aggregator->taggingsOfItem(item, *taxonomy, bits & ~QVCTAutoTaggingOptionNames)
+                             : tagger.report(item, ItemNames(url.path(), root), bits).taggings();
+            if (options.measuresAnyRhythm) addAnyRhythm(*item, *taxonomy, found);
+            const Taggings taggings = sortedTaggings(found);
+            totals.add(taggings);
+            if (context.format == Format::table) {
+                rows.push_back({url.path(), wordsForTaggings(taggings, options.showsAll)});
+            } else {
+                json.add(jsonOfItem(*item, taggings));
+            }
+        });
     if (context.format != Format::table) return json.finish();
     printItemTable(rows, context.terminal());
     context.note(fmt::format("{}, {} of them tagged, {}", counted(totals.items, "item"), totals.tagged,
@@ -147,13 +121,11 @@ void addAutotagCommand(Command& tool, ToolContext& context) {
     Command command = tool.addCommand("autotag", "Derives tags for files and for everything below folders");
     command.addOption("paths", options->paths, "Files and folders").required().valueName("PATH");
     command.addFollowFlag(options->links);
-    addServicesOption(command, options->services);
-    command
-        .addOption("--keywords", options->keywordsFile,
-                   "Property list of keywords to use instead of the built-in")
-        .valueName("FILE");
-    command.addOption("--rules", options->rulesFile, "Property list of rules to use instead of the built-in")
-        .valueName("FILE");
+    options->tagger.addTo(command);
+    command.addFlag("--strict", options->isStrict,
+                    "Give all that the services say, as they say it; names are not read");
+    command.addFlag("--all", options->showsAll,
+                    "Also show parents, kinds of content and the like in the table");
     command.addFlag("--rhythm-any", options->measuresAnyRhythm,
                     "Grade the rhythm of every sound whose length in beats is known");
     command.footer("Example:\n  qvtag autotag --json Loops \"Patches/Warm Pad.patch\"");

@@ -11,6 +11,8 @@ void addGenerateCommand(Command& tool);
 
 /// Each adds one command to the tool. A command reports what fails through the context and never throws.
 void addAutotagCommand(Command& tool, ToolContext& context);
+void addExplainCommand(Command& tool, ToolContext& context);
+void addEvaluateCommand(Command& tool, ToolContext& context);
 void addInspectCommand(Command& tool, ToolContext& context);
 /// `db`: merges and checks databases.
 void addDatabaseCommand(Command& tool, ToolContext& context);

@@ -62,6 +62,8 @@ Json jsonOf(const IndexedTagging& tagging) {
     json["weightLevel"] = weightLevelOf(tagging);
     json["provenance"] = nameOf(tagging.provenance);
     json["service"] = tagging.service.empty() ? Json() : Json(tagging.service);
+    json["confidence"] = tagging.confidence ? jsonOfNumber(*tagging.confidence) : Json();
+    json["evidence"] = tagging.evidence.empty() ? Json() : Json(tagging.evidence);
     return json;
 }
 

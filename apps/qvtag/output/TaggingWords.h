@@ -1,0 +1,21 @@
+#pragma once
+
+#include "output/Output.h"
+
+#include <memory>
+#include <string_view>
+#include <vector>
+
+namespace qvct::tool {
+
+/// Where a tag stands in a line about an item: what tells most of it comes first, the instrument, then the
+/// genre, its character, the key; what only keeps books ("User generated", kinds of content) comes last.
+int rankOfTag(std::string_view category, std::string_view label);
+/// Whether a tag of that rank only keeps books.
+bool isBookkeeping(int rank);
+
+/// The taggings in that order, without parents whose child is there and without bookkeeping unless all are
+/// wanted; "no tags" when there are none.
+std::vector<Word> wordsForTaggings(const std::vector<std::shared_ptr<TGRTTagging>>& taggings, bool all);
+
+}  // namespace qvct::tool
