@@ -62,6 +62,7 @@ set(QVCT_PUBLIC_HEADERS
   autotagging/evidence/SoundKind.h
   autotagging/evidence/TagClaim.h
   autotagging/names/ItemNames.h
+  autotagging/names/Thesaurus.h
   autotagging/services/QVCTAutoTaggingService.h
   autotagging/services/QVCTXMLRulesTaggingService.h
   autotagging/services/TagDictionary.h

@@ -1,5 +1,6 @@
 #include "contentdb/ContentDatabase.h"
 
+#include "autotagging/names/Thesaurus.h"
 #include "contentdb/query/Search.h"
 #include "contentdb/query/SimilarItems.h"
 #include "contentdb/store/Reading.h"
@@ -55,6 +56,10 @@ std::optional<Vocabulary> ContentDatabase::vocabulary(Error* error) {
             if (std::find(known.begin(), known.end(), category->identifier()) == known.end())
                 vocabulary.categories.push_back(category->identifier());
         }
+        vocabulary.labelsMeant = [thesaurus = std::shared_ptr<Thesaurus>()](std::string_view word) mutable {
+            if (!thesaurus) thesaurus = std::make_shared<Thesaurus>();
+            return thesaurus->labelsMeant(word);
+        };
         return vocabulary;
     });
 }

@@ -5,6 +5,7 @@
 #include "platform/text/RegularExpression.h"
 
 #include <cstddef>
+#include <functional>
 #include <memory>
 #include <optional>
 #include <string>
@@ -106,6 +107,8 @@ struct Vocabulary {
     std::vector<std::string> categories;
     /// Keys of numbers: "BeatCount".
     std::vector<std::string> numbers;
+    /// The labels of tags that people mean by a word: Kick by "bd". None where it is empty.
+    std::function<std::vector<std::string>(std::string_view word)> labelsMeant = {};
 };
 
 /// What is wrong with a query, and where.

@@ -1,13 +1,17 @@
 #include "CommandLine.h"
 
 #include "output/StandardStreams.h"
+#include "platform/base/Printable.h"
+#include "platform/text/Spelling.h"
 
+#include <algorithm>
 #include <cmath>
 #include <cstdint>
 #include <optional>
 #include <sstream>
 
 #include <CLI/CLI.hpp>
+#include <fmt/format.h>
 
 namespace qvct::tool {
 namespace {
@@ -40,6 +44,14 @@ CommandOption describe(const CLI::Option& option) {
     const std::string& value = result.value;
     result.takesFile = value.starts_with("FILE") || value == "DIR" || value == "PATH" || value == "RULES";
     return result;
+}
+
+/// The command that a misspelt word stands for; empty when it is one, or is like none.
+std::string meantCommand(const CLI::App& tool, const std::string& word) {
+    std::vector<std::string> names;
+    for (const CLI::App* command : tool.get_subcommands({})) names.push_back(command->get_name());
+    if (std::find(names.begin(), names.end(), word) != names.end()) return {};
+    return std::string(nearestSpelling(word, names));
 }
 
 CommandDescription describe(const CLI::App& app, const std::string& parents) {
@@ -193,6 +205,15 @@ bool CommandLine::run(int argc, char** argv, const std::function<void()>& prepar
     try {
         parser_->parse(argc, argv);
     } catch (const CLI::ParseError& error) {
+        // The first word that is no option is meant as a command.
+        const auto* const word = std::find_if(argv + std::min(argc, 1), argv + argc,
+                                              [](const char* text) { return *text != '-'; });
+        const std::string meant = word == argv + argc ? std::string() : meantCommand(*parser_, *word);
+        if (!meant.empty()) {
+            printErrorText(
+                fmt::format("There is no command \"{}\"; did you mean \"{}\"?\n", printable(*word), meant));
+            return false;
+        }
         std::ostringstream output;
         std::ostringstream errors;
         const bool isAnswered = parser_->exit(error, output, errors) == 0;

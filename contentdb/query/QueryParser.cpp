@@ -108,7 +108,7 @@ class Parser {
             ++at_;
             any.parts.push_back(factor(field));
         }
-        Condition condition = any.parts.size() == 1 ? std::move(any.parts[0]) : Condition{std::move(any)};
+        Condition condition = oneOf(std::move(any));
         if (isNegated) condition = {NoneOf{{std::move(condition)}}};
         terms.parts.push_back(std::move(condition));
     }
@@ -155,10 +155,30 @@ class Parser {
         return value(*field, start);
     }
 
-    static Condition words(const Piece& word) {
+    /// Words, or what people mean by them; in quotes just the words.
+    Condition words(const Piece& word) const {
         WordsMatch match{wordsOf(word.text), !word.isQuoted, {}};
         if (match.words.empty()) match.literal = folded(word.text);
-        return {std::move(match)};
+        AnyOf any{{Condition{std::move(match)}}};
+        if (!word.isQuoted) addMeant(word.text, {}, any);
+        return oneOf(std::move(any));
+    }
+
+    Condition tag(const Piece& word, const std::string& category) const {
+        AnyOf any{{Condition{TagMatch{folded(word.text), category}}}};
+        if (!word.isQuoted) addMeant(word.text, category, any);
+        return oneOf(std::move(any));
+    }
+
+    void addMeant(const std::string& text, const std::string& category, AnyOf& any) const {
+        if (!vocabulary_.labelsMeant) return;
+        for (const std::string& label : vocabulary_.labelsMeant(text)) {
+            if (folded(label) != folded(text)) any.parts.push_back({TagMatch{folded(label), category}});
+        }
+    }
+
+    static Condition oneOf(AnyOf any) {
+        return any.parts.size() == 1 ? std::move(any.parts[0]) : Condition{std::move(any)};
     }
 
     Condition value(const Field& field, std::size_t start) {
@@ -171,7 +191,7 @@ class Parser {
         const Piece word = text(start, "");
         switch (field.kind) {
             case Field::Kind::tag:
-                return {TagMatch{folded(word.text), field.of}};
+                return tag(word, field.of);
             case Field::Kind::key:
                 return key(word);
             case Field::Kind::type:

@@ -61,6 +61,13 @@ TEST_F(LibraryCommands, IndexAndFind) {
     EXPECT_EQ(first.json()["indexed"], 5);
     EXPECT_EQ(index().json()["unchanged"], 5);
     EXPECT_THAT(names("kick"), ElementsAre("Dark Kick 01", "Techno Kick"));
+    // What people mean by other words, but not in quotes.
+    for (const char* query : {"bd", "bassdrum", "bass-drum", "tag:bd", "source:\"Kick\""})
+        EXPECT_THAT(names(query), ElementsAre("Dark Kick 01", "Techno Kick")) << query;
+    EXPECT_THAT(names("type:audio -bd"), testing::UnorderedElementsAre("House Snare", "Deep House Bass"));
+    EXPECT_THAT(names("\"bd\""), testing::IsEmpty());
+    EXPECT_THAT(run({"search", "tag:Tehcno"}).errors, testing::HasSubstr("did you mean \"Techno\"?"));
+    EXPECT_EQ(run({"search", "tag:Techno"}).errors, "");
     EXPECT_THAT(names("source:drums kick name-"), ElementsAre("Techno Kick", "Dark Kick 01"));
     EXPECT_THAT(names("type:strip, bass"), ElementsAre("Deep House Bass", "Warm Pad"));
     EXPECT_THAT(names("type:audio -source:Kick"),

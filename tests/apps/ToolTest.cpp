@@ -277,6 +277,8 @@ TEST(Usage, WrongWordsEndWithTwo) {
         EXPECT_THAT(result.output, IsEmpty());
         EXPECT_THAT(result.errors, Not(IsEmpty()));
     }
+    EXPECT_THAT(runTool({"--json", "autotg", "x"}).errors, HasSubstr("did you mean \"autotag\"?"));
+    EXPECT_THAT(runTool({"read"}).errors, Not(HasSubstr("did you mean")));
     EXPECT_EQ(runTool({"--help"}).status, 0);
     for (const char* command : {"autotag", "inspect", "keywords", "read", "taxonomy", "write"}) {
         EXPECT_THAT(runTool({command, "--help"}).output, HasSubstr("Example:\n  qvtag ")) << command;

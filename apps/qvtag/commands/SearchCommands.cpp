@@ -4,7 +4,9 @@
 #include "formats/QVContentTaggingTypes.h"
 #include "output/ItemTable.h"
 #include "output/StandardStreams.h"
+#include "output/TaggingWords.h"
 #include "platform/text/Decimal.h"
+#include "platform/text/Spelling.h"
 #include "platform/text/Text.h"
 #include "platform/text/Url.h"
 #include "taxonomy/TGRTTagging.h"
@@ -15,7 +17,9 @@
 #include <functional>
 #include <map>
 #include <memory>
+#include <type_traits>
 #include <unordered_map>
+#include <variant>
 
 #include <fmt/format.h>
 
@@ -123,8 +127,11 @@ ItemRow rowOf(const IndexedItem& item) {
         row.words.push_back({fmt::format("\"{}\"", printable(item.title)), Color::plain});
     if (const auto tempo = tempoOf(item))
         row.words.push_back({fmt::format("{:g} bpm", *tempo), Color::faint});
+    std::vector<ShownTag> tags;
     for (const IndexedTagging& tagging : item.taggings)
-        row.words.push_back({printable(textOf(tagging)), tagging.level ? Color::accent : Color::plain});
+        tags.push_back(
+            {tagging.label, tagging.category, textOf(tagging), tagging.ancestors, tagging.level.has_value()});
+    for (Word& word : wordsForTags(tags, false)) row.words.push_back(std::move(word));
     return row;
 }
 
@@ -160,6 +167,35 @@ std::optional<Query> queryOf(const Options& options, ContentDatabase& database, 
     return std::nullopt;
 }
 
+/// The labels that a query names as tags.
+void addLabels(const Condition& condition, std::vector<std::string>& labels) {
+    std::visit(
+        [&labels](const auto& match) {
+            if constexpr (requires { match.parts; }) {
+                for (const Condition& part : match.parts) addLabels(part, labels);
+            } else if constexpr (std::is_same_v<std::decay_t<decltype(match)>, TagMatch>) {
+                labels.push_back(match.label);
+            }
+        },
+        condition.is);
+}
+
+/// When nothing is found: the tags that were asked for and that nothing has, with what may have been meant.
+void noteUnknownTags(const Query& query, ContentDatabase& database, ToolContext& context) {
+    std::vector<std::string> wanted;
+    addLabels(query.condition, wanted);
+    const auto facets = wanted.empty() ? std::nullopt : database.facets(Query{});
+    if (!facets) return;
+    std::vector<std::string> known;
+    for (const Facet& facet : *facets) known.push_back(facet.label);
+    for (const std::string& label : wanted) {
+        const std::string_view meant = nearestSpelling(label, known);
+        if (!meant.empty() && spellingDistance(meant, label) > 0)
+            context.note(
+                fmt::format("no tag \"{}\"; did you mean \"{}\"?", printable(label), printable(meant)));
+    }
+}
+
 void searchItems(const Options& options, ToolContext& context) {
     const auto database = opened(options, context);
     const auto query = database ? queryOf(options, *database, context) : std::nullopt;
@@ -167,6 +203,7 @@ void searchItems(const Options& options, ToolContext& context) {
     Error error;
     const auto found = database->search(*query, options.limit, &error);
     if (!found) return context.itemFailed(error);
+    if (found->empty()) noteUnknownTags(*query, *database, context);
     if (context.format != Format::table) {
         Json json = Json::array();
         for (const Found& one : *found) json.push_back(jsonOf(*database, one.id, one.item, &error));

@@ -1,10 +1,12 @@
 #include "output/TaggingWords.h"
 
+#include "platform/base/Printable.h"
 #include "taxonomy/TaggingTypes.h"
 
 #include <algorithm>
 #include <array>
-#include <unordered_set>
+#include <set>
+#include <utility>
 
 namespace qvct::tool {
 namespace {
@@ -43,27 +45,38 @@ bool isBookkeeping(int rank) {
     return rank >= kBookkeeping;
 }
 
-std::vector<Word> wordsForTaggings(const std::vector<std::shared_ptr<TGRTTagging>>& taggings, bool all) {
-    std::unordered_set<const TGRTTag*> parents;
-    for (const auto& tagging : taggings)
-        for (auto above = tagging->tag()->parent(); above; above = above->parent())
-            parents.insert(above.get());
-    std::vector<std::pair<int, Word>> ranked;
-    for (const auto& tagging : taggings) {
-        const int rank = rankOfTag(tagging->category(), tagging->label());
-        const bool isShown = all || (!isBookkeeping(rank) && !parents.contains(tagging->tag().get()));
-        const Color color = isBookkeeping(rank) ? Color::faint
-                            : tagging->level()  ? Color::accent
-                                                : Color::plain;
-        if (isShown) ranked.push_back({rank, {textOfTagging(*tagging), color}});
+std::vector<Word> wordsForTags(const std::vector<ShownTag>& tags, bool all) {
+    std::set<std::pair<std::string_view, std::string_view>> parents;  // category and label
+    for (const ShownTag& tag : tags)
+        for (const std::string& ancestor : tag.ancestors) parents.emplace(tag.category, ancestor);
+    std::vector<std::pair<int, const ShownTag*>> ranked;
+    for (const ShownTag& tag : tags) {
+        const int rank = rankOfTag(tag.category, tag.label);
+        const bool isParent = parents.contains({tag.category, tag.label});
+        if (all || (!isBookkeeping(rank) && !isParent)) ranked.emplace_back(rank, &tag);
     }
     std::stable_sort(ranked.begin(), ranked.end(),
                      [](const auto& a, const auto& b) { return a.first < b.first; });
     std::vector<Word> words;
     words.reserve(ranked.size());
-    for (auto& [_, word] : ranked) words.push_back(std::move(word));
+    for (const auto& [rank, tag] : ranked) {
+        const Color color = isBookkeeping(rank) ? Color::faint : tag->hasLevel ? Color::accent : Color::plain;
+        words.push_back({printable(tag->text), color});
+    }
     if (words.empty()) words.push_back({"no tags", Color::faint});
     return words;
+}
+
+std::vector<Word> wordsForTaggings(const std::vector<std::shared_ptr<TGRTTagging>>& taggings, bool all) {
+    std::vector<ShownTag> tags;
+    tags.reserve(taggings.size());
+    for (const auto& tagging : taggings) {
+        ShownTag tag{
+            tagging->label(), tagging->category(), textOfTagging(*tagging), {}, tagging->level() != nullptr};
+        for (const auto& ancestor : tagging->tag()->ancestors()) tag.ancestors.push_back(ancestor->label());
+        tags.push_back(std::move(tag));
+    }
+    return wordsForTags(tags, all);
 }
 
 }  // namespace qvct::tool

@@ -209,6 +209,17 @@ class Decision {
             }
         }
         if (!held.empty()) held.front()->confidence *= 1 - weights_.contradiction * second / 2;
+        dropWholes(held);
+    }
+
+    /// A folder of drums speaks for the bongo in it, and a bongo is no drum kit.
+    void dropWholes(const std::vector<Candidate*>& held) const {
+        for (Candidate* whole : held) {
+            const auto part = std::find_if(held.begin(), held.end(), [&](const Candidate* other) {
+                return isOpen(*other) && isKindred(*whole->tag, *other->tag);
+            });
+            if (part != held.end()) lose(*whole, **part);
+        }
     }
 
     Resolution result() {

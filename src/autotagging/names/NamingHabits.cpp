@@ -313,6 +313,18 @@ std::pair<NamingHabits::Word, NamingHabits::Word> NamingHabits::packedWords(std:
     return {};
 }
 
+std::vector<std::string> NamingHabits::labelsMeant(std::string_view text) const {
+    NamePieces reader;
+    std::string buffer;
+    const auto pieces = reader.read(text);
+    if (pieces.empty()) return {};
+    Word word = wordAt(pieces, buffer);
+    if (word.pieces == 0 && pieces.size() == 1) word = packedWords(pieces.front().folded).first;
+    const bool isMeant = word.pieces == pieces.size() && word.meaning != Word::kNoMeaning &&
+                         word.strength != NameStrength::hint;
+    return isMeant ? std::vector{meanings_[word.meaning].label} : std::vector<std::string>();
+}
+
 std::shared_ptr<const NamingHabits> NamingHabits::initWithDictionaries(
     std::span<const PropertyList::Dictionary> dictionaries, const TGRTTaxonomy& taxonomy, Error* error) {
     NamingHabitsReader reader(taxonomy);

@@ -91,6 +91,9 @@ class NamingHabits {
     /// first has no pieces when it is neither.
     std::pair<Word, Word> packedWords(std::string_view folded) const;
 
+    /// The labels that a whole text says plainly or by an abbreviation: Kick for "bd" and "bass drum".
+    std::vector<std::string> labelsMeant(std::string_view text) const;
+
   private:
     struct Hash {
         using is_transparent = void;
