@@ -54,7 +54,8 @@ TEST(Explain, LeavesToStrictTaggingWhatTheServicesSay) {
         for (const json& tagging : item["taggings"]) all += tagging["label"].get<std::string>() + ";";
         return all;
     };
-    EXPECT_THAT(labels("--strict"), testing::AllOf(HasSubstr("Bass;"), Not(HasSubstr("Kick;"))));
+    for (const char* option : {"--strict", "--services=keywords,user"})
+        EXPECT_THAT(labels(option), testing::AllOf(HasSubstr("Bass;"), Not(HasSubstr("Kick;")))) << option;
     EXPECT_THAT(labels("--all"), testing::AllOf(HasSubstr("Kick;"), Not(HasSubstr("Bass;"))));
 }
 

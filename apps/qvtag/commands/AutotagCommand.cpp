@@ -87,6 +87,7 @@ void addAnyRhythm(ContentItem& item, const TGRTTaxonomy& taxonomy, ObjectSet<TGR
 
 void run(const Options& options, ToolContext& context) {
     const auto bits = optionsForServices(options.tagger.services, context);
+    const bool isStrict = options.isStrict || (bits & QVCTAutoTaggingOptionNames) == 0;
     const auto aggregator = options.tagger.aggregator(context);
     const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
     std::vector<ItemRow> rows;
@@ -96,7 +97,7 @@ void run(const Options& options, ToolContext& context) {
     context.forEachContentItemBelow(
         options.paths, options.links, [&](const URL& url, const std::string& root) {
             const auto item = std::make_shared<ContentItem>(url, ContentItem::Reading{bits, nullptr});
-            auto found = options.isStrict
+            auto found = isStrict
                              ? aggregator->taggingsOfItem(item, *taxonomy, bits & ~QVCTAutoTaggingOptionNames)
                              : tagger.report(item, ItemNames(url.path(), root), bits).taggings();
             if (options.measuresAnyRhythm) addAnyRhythm(*item, *taxonomy, found);
