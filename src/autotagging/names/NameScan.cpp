@@ -74,8 +74,9 @@ std::size_t NameScan::readWord(std::size_t at, const Word& word) {
 }
 
 void NameScan::noteKindInside(const NamePiece& piece) {
-    constexpr std::size_t shortest = 4;
-    for (std::size_t at = 0; at + shortest <= piece.folded.size(); ++at) {
+    constexpr std::size_t shortest = 4, longest = 12;
+    const std::size_t size = piece.folded.size();
+    for (std::size_t at = size - std::min(size, longest); at + shortest <= size; ++at) {
         const NameRole role = habits_.roleOf(piece.folded.substr(at));
         if (role == NameRole::loop || (at == 0 && role == NameRole::oneShot)) noteKind(role);
     }
