@@ -148,6 +148,7 @@ TEST(Names, CountFromTheItemUpToTheFolderThatWasNamed) {
     EXPECT_THAT(names("/a/b/c/Kick.wav", "/a/b/c/Kick.wav"), ElementsAre("Kick", "c", "b"));
     EXPECT_THAT(names("/a/b/c/Warm.patch/", ""), ElementsAre("Warm", "c", "b"));
     EXPECT_THAT(names("/.wav", ""), ElementsAre(".wav"));
+    EXPECT_THAT(names("/a/bc/d/e/Kick.wav", "/a/b"), ElementsAre("Kick", "e", "d"));
 }
 
 TEST(Names, CostLittleHoweverLongTheyAre) {
@@ -193,6 +194,8 @@ TEST(NamingHabits, TellWhichEntryIsWrong) {
         {"{ Meanings = { Kick = { words = (\"a b c d e f\"); }; }; }", "Kick", "is no word or phrase"},
         {"{ Meanings = { Kick = { words = ({ a = b; }); }; }; }", "Kick", "is no list of texts"},
         {"{ Meanings = { Kick = (boink); }; }", "Kick", "has no lists"},
+        {"{ Meanings = { Kick = { hints = (a, a, a, a, a, a, a, a, a, a); }; }; }", "Kick",
+         "more than 8 things"},
         {"{ Notes = { re = 12; }; }", "re", "is no note"},
         {"{ Tempo = (boink); Counts = (boink); }", "Counts", "stands in another"},
     };

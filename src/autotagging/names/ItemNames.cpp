@@ -16,7 +16,8 @@ ItemNames::ItemNames(std::string path, std::string_view root) : path_(std::move(
     constexpr std::size_t foldersWithoutRoot = 2;
     std::string_view rest = withoutSlashes(path_);
     root = withoutSlashes(root);
-    const bool isBelowRoot = !root.empty() && rest != root && rest.starts_with(root);
+    const bool isBelowRoot = !root.empty() && rest.size() > root.size() && rest.starts_with(root) &&
+                             (root.ends_with('/') || rest[root.size()] == '/');
     const std::size_t most = 1 + (isBelowRoot ? kMostFolders : foldersWithoutRoot);
     while (!rest.empty() && rest != "/" && names_.size() < most) {
         const std::size_t slash = rest.rfind('/');

@@ -26,6 +26,9 @@ using Dictionary = PropertyList::Dictionary;
 constexpr std::array<std::pair<std::string_view, NameStrength>, 3> kStrengths = {
     {{"words", NameStrength::word}, {"short", NameStrength::abbreviation}, {"hints", NameStrength::hint}}};
 
+/// A word that may mean more says nothing.
+constexpr std::size_t kMostHints = 8;
+
 /// A phrase that is written as one piece.
 NamingHabits::Word packed(NamingHabits::Word phrase) {
     phrase.pieces = 1;
@@ -184,8 +187,10 @@ class NamingHabitsReader {
             std::swap(place->word.other, word.other);
         }
         if (place->source == source_ && word.strength == NameStrength::hint) {
-            addHint(*place, word);
-            return true;
+            if (addHint(*place, word)) return true;
+            return fail(error, kErrorTooLarge,
+                        fmt::format("\"{}\" hints at more than {} things", printable(text), kMostHints),
+                        {.part = entry});
         }
         if (place->source == source_) {
             return fail(error, kErrorMalformed,
@@ -198,12 +203,15 @@ class NamingHabitsReader {
     }
 
     /// A word may hint at several things besides what it says.
-    void addHint(NamingHabits::Entry& place, Word word) {
+    bool addHint(NamingHabits::Entry& place, Word word) {
         std::uint32_t* last = &place.word.other;
-        while (*last != Word::kNoMeaning) last = &habits_->others_[*last].other;
+        std::size_t count = 1;
+        for (; *last != Word::kNoMeaning; ++count) last = &habits_->others_[*last].other;
+        if (count >= kMostHints) return false;
         *last = static_cast<std::uint32_t>(habits_->others_.size());
         word.other = Word::kNoMeaning;
         habits_->others_.push_back(word);
+        return true;
     }
 
     void addOwnWord(const std::string& text, const std::string& label) {
