@@ -65,6 +65,8 @@ class KeywordJudge {
                 claim.confidence = std::min(claim.confidence, named.confidence);
                 return;
             }
+            // A keyword of the same word says something else of it, as a user's own may.
+            if (claim.evidence.what.size() >= named.evidence.what.size()) continue;
             const auto its = taxonomy_.findTagForLabel(named.label);
             const std::string category = its ? its->categoryIdentifier() : std::string();
             if (category == tag.categoryIdentifier() || category == QVCategoryGenresIdentifier)
@@ -102,12 +104,14 @@ ObjectSet<TGRTTagging> ItemReport::taggings() const {
 
 ItemTagger::ItemTagger(std::shared_ptr<QVTaggingAggregator> aggregator,
                        std::shared_ptr<const TGRTTaxonomy> taxonomy)
-    : aggregator_(std::move(aggregator)),
-      taxonomy_(std::move(taxonomy)),
-      resolver_(taxonomy_),
-      reader_(std::make_unique<NameReader>()) {}
+    : aggregator_(std::move(aggregator)), taxonomy_(std::move(taxonomy)), resolver_(taxonomy_) {}
 
 ItemTagger::~ItemTagger() = default;
+
+NameReader& ItemTagger::reader() {
+    if (!reader_) reader_ = std::make_unique<NameReader>(NamingHabits::defaultHabits(), resolver_.weights());
+    return *reader_;
+}
 
 ItemReport ItemTagger::report(const std::shared_ptr<ContentItem>& item, const ItemNames& names,
                               std::uint64_t options) {
@@ -116,7 +120,7 @@ ItemReport ItemTagger::report(const std::shared_ptr<ContentItem>& item, const It
         aggregator_->claimsOfItem(item, names.all(), options & ~QVCTAutoTaggingOptionNames);
     NameReading reading;
     if ((options & QVCTAutoTaggingOptionNames) != 0) {
-        reading = reader_->read(names.all());
+        reading = reader().read(names.all());
         const KeywordJudge judge(reading, *taxonomy_);
         for (TagClaim& claim : claims)
             if (claim.service == kKeywords) judge.judge(claim);
@@ -129,7 +133,7 @@ ItemReport ItemTagger::report(const std::shared_ptr<ContentItem>& item, const It
 }
 
 ItemReport ItemTagger::reportOfNames(const ItemNames& names, SoundKind otherwise) {
-    NameReading reading = reader_->read(names.all());
+    NameReading reading = reader().read(names.all());
     ItemReport report;
     report.tempo = reading.tempo;
     report.kind = reading.kind == SoundKind::unsaid ? otherwise : reading.kind;

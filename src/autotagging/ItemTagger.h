@@ -49,10 +49,12 @@ class QVCT_API ItemTagger {
     ItemReport reportOfNames(const ItemNames& names, SoundKind otherwise);
 
   private:
+    NameReader& reader();
+
     std::shared_ptr<QVTaggingAggregator> aggregator_;
     std::shared_ptr<const TGRTTaxonomy> taxonomy_;
     ClaimResolver resolver_;
-    std::unique_ptr<NameReader> reader_;
+    std::unique_ptr<NameReader> reader_;  // made when names are asked for
 };
 
 }  // namespace qvct

@@ -81,7 +81,7 @@ QVTaggingAggregator::Services QVTaggingAggregator::defaultTaggingServicesWithRul
             QVCTSoftwareInstrumentTaggingService::init(),
             std::make_shared<QVCTUserGeneratedTaggingService>(),
             std::make_shared<QVCTTranslateTagsTaggingService>(),
-            QVCTNamesTaggingService::init()};
+            std::make_shared<QVCTNamesTaggingService>()};
 }
 
 QVTaggingAggregator::QVTaggingAggregator(Services services) : taggingServices_(std::move(services)) {

@@ -4,12 +4,9 @@
 
 namespace qvct {
 
-std::shared_ptr<QVCTNamesTaggingService> QVCTNamesTaggingService::init() {
-    return initWithReader(NameReader());
-}
-
-std::shared_ptr<QVCTNamesTaggingService> QVCTNamesTaggingService::initWithReader(NameReader reader) {
-    return std::shared_ptr<QVCTNamesTaggingService>(new QVCTNamesTaggingService(std::move(reader)));
+NameReader& QVCTNamesTaggingService::reader() {
+    if (!reader_) reader_.emplace();
+    return *reader_;
 }
 
 TagDictionarySet QVCTNamesTaggingService::tagsWithContentsOfURL(
@@ -19,14 +16,14 @@ TagDictionarySet QVCTNamesTaggingService::tagsWithContentsOfURL(
     TagDictionarySet tags;
     if ((options & QVCTAutoTaggingOptionNames) == 0) return tags;
     const ItemNames names(url.path());
-    for (const TagClaim& claim : reader_.read(names.all()).claims)
+    for (const TagClaim& claim : reader().read(names.all()).claims)
         tags.insert(tagDictionary(claim.label, claim.level));
     return tags;
 }
 
 std::vector<TagClaim> QVCTNamesTaggingService::claims(const TaggedItem& item, std::uint64_t options) {
     if ((options & QVCTAutoTaggingOptionNames) == 0) return {};
-    return reader_.read(item.names).claims;
+    return reader().read(item.names).claims;
 }
 
 }  // namespace qvct

@@ -4,19 +4,17 @@
 #include "autotagging/services/QVCTAutoTaggingService.h"
 
 #include <memory>
+#include <optional>
 
 namespace qvct {
 
 /// Tags from the name of an item and of the folders that it lies in, read as people write them:
 /// "BD0010", "Kick_01", "VEH_Deep_House_Synth_Loop_124_Am".
 ///
+/// Habits and weights are read on first use: the built-in ones, or those that a resource folder has.
 /// Use from one thread at a time. Malformed bytes separate words.
 class QVCTNamesTaggingService : public QVCTAutoTaggingService {
   public:
-    /// With the built-in habits and weights, or those that a resource folder has.
-    static std::shared_ptr<QVCTNamesTaggingService> init();
-    static std::shared_ptr<QVCTNamesTaggingService> initWithReader(NameReader reader);
-
     TagDictionarySet tagsWithContentsOfURL(const URL& url,
                                            const std::shared_ptr<QVCTXMLDocument>& xmlDocument,
                                            const std::shared_ptr<TGRTMetaData>& metaData,
@@ -26,9 +24,9 @@ class QVCTNamesTaggingService : public QVCTAutoTaggingService {
     std::string_view name() const override { return "names"; }
 
   private:
-    explicit QVCTNamesTaggingService(NameReader reader) : reader_(std::move(reader)) {}
+    NameReader& reader();
 
-    NameReader reader_;
+    std::optional<NameReader> reader_;  // since most aggregators are never asked for names
 };
 
 }  // namespace qvct
