@@ -118,6 +118,7 @@ struct ContentDescriber::Implementation {
     RegularExpression tempoInName = *RegularExpression::compile(
         R"((?<![\d.,])(\d{2,3}(?:[.,]\d+)?)[\s_-]?bpm(?![\p{L}\d]))", RegularExpression::Case::insensitive);
     std::optional<double> namedTempo;  // of the item at hand, as its names state it
+    std::optional<int> namedBeats;
 
     void addAllTaggings(IndexedItem& item, const std::shared_ptr<ContentItem>& content,
                         const TGRTMetaData* record, const Taggings& withVirtual) {
@@ -147,6 +148,7 @@ struct ContentDescriber::Implementation {
         const std::string path = content->url().path();
         const ItemReport report = tagger.report(content, ItemNames(path, rootOf(path)), services);
         namedTempo = report.tempo;
+        namedBeats = report.beats;
         for (const HeldTag& held : report.resolution.held) {
             const auto tagging = held.tagging();
             if (!tagging || !known.insert(tagging)) continue;
@@ -163,6 +165,7 @@ struct ContentDescriber::Implementation {
             addNumber(item, QVContentKeyBeatCount, file->beatCount());
             if (file->bpm() > 0) addNumber(item, "Tempo", double{file->bpm()});
         }
+        if (namedBeats) addNumber(item, QVContentKeyBeatCount, *namedBeats);
         if (hasValue(item, "Tempo")) return;
         if (namedTempo) return addNumber(item, "Tempo", *namedTempo);
         const std::u16string text = utf16FromUtf8(fileName);
@@ -180,7 +183,7 @@ ContentDescriber::~ContentDescriber() = default;
 
 std::uint64_t ContentDescriber::digest(std::uint64_t services) {
     // Raised when a change makes items be described differently although the version stays the same.
-    constexpr std::uint64_t edition = 5;
+    constexpr std::uint64_t edition = 6;
     Digest digest;
     digest.add(services);
     digest.add(version());
@@ -219,6 +222,7 @@ std::optional<IndexedItem> ContentDescriber::describe(const std::string& path, E
     for (const auto& dependency : object->dependencyItems())
         item.dependencies.push_back({dependency->UUID(), dependency->path()});
     its.namedTempo.reset();
+    its.namedBeats.reset();
     its.addAllTaggings(item, content, record.get(), object->taggingDatas());
     addValues(item, object->valueDatas());
     its.addTempoAndBeats(item, content->fileData().get(), url.lastPathComponent());

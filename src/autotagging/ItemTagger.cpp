@@ -3,7 +3,9 @@
 #include "autotagging/ContentItem.h"
 #include "autotagging/QVTaggingAggregator.h"
 #include "autotagging/names/NameReader.h"
+#include "autotagging/names/TempoByLength.h"
 #include "autotagging/services/QVCTAutoTaggingService.h"
+#include "media/loopfile/LCFileData.h"
 #include "taxonomy/TaggingTypes.h"
 
 #include <algorithm>
@@ -14,6 +16,7 @@ namespace qvct {
 namespace {
 
 constexpr std::string_view kKeywords = "keywords";
+constexpr std::string_view kContentType = "content-type";
 constexpr std::string_view kOneShot = "One Shot";
 
 /// Judges what keywords claim by what the names mean: a keyword sees a word, and no more.
@@ -86,10 +89,36 @@ class KeywordJudge {
     const TGRTTaxonomy& taxonomy_;
 };
 
+std::optional<int> beatsOf(const NameReading& reading) {
+    constexpr int usualBeatsOfBar = 4;
+    if (reading.beats || !reading.bars) return reading.beats;
+    return *reading.bars * usualBeatsOfBar;
+}
+
+/// A number of a name that agrees with the length of the sound is its tempo, and the sound a loop.
+void addTempoByLength(NameReading& reading, ContentItem& item, ItemReport& report) {
+    if (reading.possibleTempos.empty()) return;
+    const auto file = item.fileData();
+    const auto fitting = file ? tempoThatFits(reading, file->lengthInSeconds()) : std::nullopt;
+    if (!fitting) return;
+    report.tempo = fitting->tempo;
+    report.beats = fitting->beats;
+    report.isTempoFromLength = true;
+    if (reading.kind == SoundKind::unsaid) reading.kind = SoundKind::loop;
+}
+
+/// What is short is a single sound, unless its name says that it is to be repeated.
+void judgeOneShot(std::vector<TagClaim>& claims, SoundKind named) {
+    if (named != SoundKind::loop) return;
+    for (TagClaim& claim : claims)
+        if (claim.label == kOneShot && claim.service == kContentType)
+            claim.doubt = "its name says that it is a loop";
+}
+
 SoundKind kindOf(const NameReading& reading, const std::vector<TagClaim>& claims) {
     if (reading.kind != SoundKind::unsaid) return reading.kind;
     const bool isOneShot = std::any_of(claims.begin(), claims.end(), [](const TagClaim& claim) {
-        return claim.label == kOneShot && claim.service == "content-type";
+        return claim.label == kOneShot && claim.service == kContentType;
     });
     return isOneShot ? SoundKind::oneShot : SoundKind::unsaid;
 }
@@ -124,9 +153,12 @@ ItemReport ItemTagger::report(const std::shared_ptr<ContentItem>& item, const It
         const KeywordJudge judge(reading, *taxonomy_);
         for (TagClaim& claim : claims)
             if (claim.service == kKeywords) judge.judge(claim);
+        report.tempo = reading.tempo;
+        report.beats = beatsOf(reading);
+        addTempoByLength(reading, *item, report);
+        judgeOneShot(claims, reading.kind);
         claims.insert(claims.end(), reading.claims.begin(), reading.claims.end());
     }
-    report.tempo = reading.tempo;
     report.kind = kindOf(reading, claims);
     report.resolution = resolver_.resolve(std::move(claims), report.kind);
     return report;
@@ -136,6 +168,7 @@ ItemReport ItemTagger::reportOfNames(const ItemNames& names, SoundKind otherwise
     NameReading reading = reader().read(names.all());
     ItemReport report;
     report.tempo = reading.tempo;
+    report.beats = beatsOf(reading);
     report.kind = reading.kind == SoundKind::unsaid ? otherwise : reading.kind;
     report.resolution = resolver_.resolve(std::move(reading.claims), report.kind);
     return report;

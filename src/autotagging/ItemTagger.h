@@ -21,6 +21,10 @@ class TGRTTaxonomy;
 struct QVCT_API ItemReport {
     Resolution resolution;
     std::optional<double> tempo;  ///< Beats a minute that its names state.
+    /// In all, as its names state them; a bar counts four.
+    std::optional<int> beats;
+    /// The tempo is a bare number in its name, which holds since the sound is `beats` long at it.
+    bool isTempoFromLength = false;
     SoundKind kind = SoundKind::unsaid;
 
     /// The tags that hold, marked as automatic.

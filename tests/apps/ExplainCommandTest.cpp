@@ -45,6 +45,19 @@ TEST(Explain, ShowsWhyEachTagIsThereAndWhatWasDropped) {
     EXPECT_THAT(table, HasSubstr("\"Snares\" in the folder \"Snares\""));
 }
 
+TEST(Explain, TellsThatTheLengthAgreesWithATempo) {
+    const TemporaryFolder folder;
+    const Wav wav;
+    const std::string path =
+        folder.write("Funk (90).wav", wav.file(wav.format(1, 900, 8) + wav.data(600 * 16)));
+    EXPECT_THAT(runTool({"explain", path}).output,
+                HasSubstr("  loop  90 bpm, since it is as long as 16 beats\n"));
+    const json item = runTool({"--json", "explain", path}).json()[0];
+    EXPECT_EQ(item["tempo"], 90);
+    EXPECT_EQ(item["beats"], 16);
+    EXPECT_EQ(item["tempoFromLength"], true);
+}
+
 TEST(Explain, LeavesToStrictTaggingWhatTheServicesSay) {
     const TemporaryFolder folder;
     const std::string path = folder.write("Bass Drum 01.wav", sound());

@@ -6,9 +6,11 @@
 #include "support/AudioFixtures.h"
 #include "support/TemporaryFolder.h"
 #include "taxonomy/TGRTTagging.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <algorithm>
 #include <random>
+#include <ranges>
 #include <set>
 
 #include <gmock/gmock.h>
@@ -246,6 +248,158 @@ TEST_F(Tagging, OfNamesAloneNeedsNoFile) {
     EXPECT_EQ(report.kind, SoundKind::loop);
     EXPECT_EQ(report.tempo, 98);
     EXPECT_THAT(heldOf(report.resolution), IsSupersetOf({"Bass", "E", "Minor KeyType"}));
+}
+
+TEST_F(Tagging, KnowsWhatGeneralMidiAndItsVariantsCallTheirSounds) {
+    const std::pair<const char*, std::string_view> rows[] = {
+        {"Piano", "Acoustic Grand Piano, Bright Acoustic Piano, Honky-tonk Piano, HnkyTonk"},
+        {"Electric Piano", "Electric Grand Piano, Electric Piano 1, Electric Piano 2, E.Grand"},
+        {"Harpsichord", "Harpsichord"},
+        {"Clavinet", "Clavi"},
+        {"Celesta", "Celesta"},
+        {"Glockenspiel", "Glockenspiel, Music Box"},
+        {"Vibraphone", "Vibraphone"},
+        {"Marimba", "Marimba"},
+        {"Xylophone", "Xylophone"},
+        {"Tubular Bells", "Tubular Bells"},
+        {"Dulcimer", "Dulcimer, Santur"},
+        {"Organ", "Drawbar Organ, Percussive Organ, Rock Organ, Church Organ, Reed Organ"},
+        {"Accordion", "Accordion, Tango Accordion"},
+        {"Harmonica", "Harmonica"},
+        {"Classical Guitar", "Acoustic Guitar (nylon), Nylon-str.Gt, NylonGtr"},
+        {"Acoustic Guitar", "Acoustic Guitar (steel), Steel-str.Gt"},
+        {"Electric Guitar",
+         "Electric Guitar (jazz), Electric Guitar (clean), Electric Guitar (muted), Overdriven Guitar, "
+         "Distortion Guitar, Jazz Gt., DistortionGt, Dist.Gtr, CleanGtr"},
+        {"Guitar", "Guitar harmonics, Guitar Fret Noise, Gt.FretNoise"},
+        {"Acoustic Bass", "Acoustic Bass"},
+        {"Electric Bass",
+         "Electric Bass (finger), Electric Bass (pick), Fretless Bass, Slap Bass 1, Slap Bass 2, Fingered "
+         "Bs., FngrBass, SlapBas1"},
+        {"Synth Bass", "Synth Bass 1, Synth Bass 2"},
+        {"Violin", "Violin"},
+        {"Viola", "Viola"},
+        {"Cello", "Cello"},
+        {"Double Bass", "Contrabass"},
+        {"String Ensemble", "Tremolo Strings, Pizzicato Strings, String Ensemble 1, String Ensemble 2"},
+        {"Harp", "Orchestral Harp"},
+        {"Timpani", "Timpani"},
+        {"Synth Strings", "SynthStrings 1, SynthStrings 2, SynStr1"},
+        {"Choir", "Choir Aahs, Voice Oohs"},
+        {"Synth Voice", "Synth Voice, SynVox"},
+        {"Stab", "Orchestra Hit"},
+        {"Trumpet", "Trumpet, Muted Trumpet"},
+        {"Trombone", "Trombone"},
+        {"Tuba", "Tuba"},
+        {"Horn", "French Horn"},
+        {"Brass Section", "Brass Section, BrasSect"},
+        {"Synth Brass", "SynthBrass 1, SynthBrass 2, SynBras1"},
+        {"Saxophone", "Soprano Sax, Alto Sax, Tenor Sax, Baritone Sax"},
+        {"Oboe", "Oboe"},
+        {"English Horn", "English Horn, Eng.Horn"},
+        {"Bassoon", "Bassoon"},
+        {"Clarinet", "Clarinet"},
+        {"Flute", "Piccolo, Flute"},
+        {"Recorder", "Recorder"},
+        {"Pan Flute", "Pan Flute"},
+        {"Other Winds", "Blown Bottle"},
+        {"Shakuhachi", "Shakuhachi, Shakhchi"},
+        {"", "Whistle"},
+        {"Ocarina", "Ocarina"},
+        {"Lead",
+         "Lead 1 (square), Lead 2 (sawtooth), Lead 3 (calliope), Lead 4 (chiff), Lead 5 (charang), Lead 6 "
+         "(voice), Lead 7 (fifths), Lead 8 (bass + lead)"},
+        {"Pad",
+         "Pad 1 (new age), Pad 2 (warm), Pad 3 (polysynth), Pad 4 (choir), Pad 5 (bowed), Pad 6 (metallic), "
+         "Pad 7 (halo), Pad 8 (sweep)"},
+        {"Sound Effects",
+         "FX 1 (rain), FX 2 (soundtrack), FX 3 (crystal), FX 4 (atmosphere), FX 5 (brightness), FX 6 "
+         "(goblins), FX 7 (echoes), FX 8 (sci-fi), Telephone Ring, Applause, Gunshot"},
+        {"Sitar", "Sitar"},
+        {"Banjo", "Banjo"},
+        {"Shamisen", "Shamisen"},
+        {"Koto", "Koto"},
+        {"Kalimba", "Kalimba"},
+        {"Bagpipes", "Bag pipe"},
+        {"Fiddle", "Fiddle"},
+        {"Woodwinds", "Shanai"},
+        {"Bells", "Tinkle Bell"},
+        {"Agogo", "Agogo, High Agogo, Low Agogo"},
+        {"Steel Drum", "Steel Drums, SteelDrm"},
+        {"Woodblock", "Woodblock, Hi Wood Block, Low Wood Block"},
+        {"Taiko", "Taiko Drum"},
+        {"Tom", "Melodic Tom, Low Floor Tom, High Floor Tom, Low Tom, Low-Mid Tom, Hi-Mid Tom, High Tom"},
+        {"Drums", "Synth Drum"},
+        {"Cymbal", "Reverse Cymbal, Chinese Cymbal, Splash Cymbal, RevCymbl"},
+        {"Noise", "Breath Noise"},
+        {"Nature", "Seashore, Bird Tweet"},
+        {"Machinery", "Helicopter"},
+        {"Kick", "Acoustic Bass Drum, Bass Drum 1, 808 Bass Drum, Concert BD"},
+        {"Rim", "Side Stick"},
+        {"Snare", "Acoustic Snare, Electric Snare, Brush Slap"},
+        {"Claps", "Hand Clap"},
+        {"Hi-Hat", "Closed Hi Hat, Pedal Hi-Hat, Open Hi-Hat, TR-808 CHH"},
+        {"Crash", "Crash Cymbal 1, Crash Cymbal 2"},
+        {"Ride", "Ride Cymbal 1, Ride Bell, Ride Cymbal 2"},
+        {"Tambourine", "Tambourine"},
+        {"Cowbell", "Cowbell"},
+        {"Percussion", "Vibraslap, Short Whistle, Long Whistle, Samba Whistle H, Metronome Bell"},
+        {"Bongo", "Hi Bongo, Low Bongo"},
+        {"Conga", "Mute Hi Conga, Open Hi Conga, Low Conga, Conga H Mute"},
+        {"Timbales", "High Timbale, Low Timbale"},
+        {"Cabasa", "Cabasa"},
+        {"Maracas", "Maracas"},
+        {"Guiro", "Short Guiro, Long Guiro"},
+        {"Clave", "Claves"},
+        {"Cuica", "Mute Cuica, Open Cuica"},
+        {"Triangle", "Mute Triangle, Open Triangle"},
+        {"Turntable", "Scratch Push"},
+        {"Sleigh Bells", "Jingle Bell"},
+        {"Surdo", "Mute Surdo"},
+        {"Wind Chimes", "Bell Tree"},
+        {"Castanets", "Castanets"},
+    };
+    for (const auto& [label, names] : rows) {
+        for (const auto& part : names | std::views::split(std::string_view(", "))) {
+            const std::string name(part.begin(), part.end());
+            const ItemReport report =
+                tagger_.reportOfNames(ItemNames("/none/" + name + ".wav", "/none"), SoundKind::oneShot);
+            std::string instruments;  // without the parents, which the last one brings
+            for (const HeldTag& held : report.resolution.held)
+                if (held.tag->categoryIdentifier() == QVCategorySourceIdentifier && !held.claims.empty())
+                    instruments += held.tag->label();
+            EXPECT_EQ(instruments, label) << name;
+        }
+    }
+}
+
+TEST_F(Tagging, TakesANumberThatAgreesWithTheLengthForTheTempo) {
+    const struct {
+        const char* name;
+        double seconds, tempo;
+        int beats;
+        bool isLoop = true;
+    } rows[] = {
+        {"Funk (90)", 16 * 60 / 90.0, 90, 16},
+        {"Funk 90", 8 * 60 / 90.0 * 1.01, 0, 0, false},
+        {"Funk 95 120 4 bars", 16 * 60 / 95.0 * 1.008, 95, 16},
+        {"Waltz 100 140 8 bars", 24 * 60 / 140.0, 140, 24},
+        {"Funk 60 120", 8, 0, 0, false},
+        {"Funk 120", 2, 0, 0, false},
+        {"Kick 120 one shot", 4, 0, 0, false},
+        {"Drum Loop 70", 8, 70, 0},
+    };
+    const test::Wav wav;
+    for (const auto& row : rows) {
+        const auto frames = static_cast<std::size_t>(row.seconds * 1000);
+        const std::string path = folder_.write(std::string("Root/") + row.name + ".wav",
+                                               wav.file(wav.format(1, 1000, 8) + wav.data(frames)));
+        const Labels labels = tag(path, folder_.path("Root"));
+        EXPECT_EQ(report_.tempo.value_or(0), row.tempo) << row.name;
+        EXPECT_EQ(report_.beats.value_or(0), row.beats) << row.name;
+        EXPECT_EQ(report_.kind == SoundKind::loop, row.isLoop) << row.name;
+        EXPECT_EQ(std::count(labels.begin(), labels.end(), "One Shot"), row.isLoop ? 0 : 1) << row.name;
+    }
 }
 
 }  // namespace

@@ -2,6 +2,7 @@
 #include "autotagging/names/NameReader.h"
 #include "platform/data/PropertyListFile.h"
 #include "platform/files/ResourceBundle.h"
+#include "resources/QVCTCompiledResources.h"
 #include "support/CapturedLog.h"
 #include "support/ProcessorClock.h"
 #include "support/TemporaryFolder.h"
@@ -72,8 +73,33 @@ TEST(Names, AreReadAsPeopleWriteThem) {
         {"Bell\xff"
          "Clap",
          {"Bells", "Claps"}},
+        {"ANMLDog_Big Dog Barking_MK_LIB", {"Nature"}},
+        {"AMBForst-Dusk_Quiet Woods_Kick_Snare", {"Atmosphere", "Nature", "Sound Effects"}},
+        {"GLASCrsh_Window Crash", {"Sound Effects"}},
+        {"VOXFem_Woman Calls", {"Female Voice", "Sound Effects"}},
+        {"MUSCPerc_Snare Roll", {"Percussion", "Roll", "Snare"}},
+        {"METLImpt", {"Impact"}},
+        {"WIND_Gusty Canyon_MK_LIB", {"Nature"}},
+        {"WIND_Flute", {"Flute"}},
+        {"GLASPad_Kick", {"Kick", "Pad"}},
+        {"METLImpt Kick", {"Kick"}},
+        {"metlimpt_Kick", {"Kick"}},
+        {"Kick_METLImpt_Snare", {"Kick", "Snare"}},
     };
     for (const auto& [name, labels] : rows) EXPECT_EQ(labelsOf(readingOf(name)), labels) << name;
+}
+
+TEST(Names, BeginWithTheCodeOfAnyCategory) {
+    const auto habits = QVCTCompiledResources::NamingHabitsPlist();
+    std::set<std::string> codes;
+    for (const auto& [label, list] : *habits->dictionary("Prefixes")) {
+        for (const PropertyList& code : *list.array()) {
+            codes.insert(*code.string());
+            EXPECT_THAT(labelsOf(readingOf(*code.string() + "_One Two_AB_CD")), Contains(label))
+                << *code.string();
+        }
+    }
+    EXPECT_EQ(codes.size(), 729U);
 }
 
 TEST(Names, DoNotSayWhatTheyOnlySeemToSay) {
@@ -91,6 +117,7 @@ TEST(Names, TellKeyTempoAndKindWhereTheyStand) {
         std::string name, key, mode;
         double tempo = 0;
         SoundKind kind = SoundKind::unsaid;
+        int bars = 0, beats = 0;
     } rows[] = {
         {"VEH_Deep_House_Synth_Loop_124_Am", "A", "Minor", 124, SoundKind::loop},
         {"Piano Loop 90 Bbmaj", "ASharp", "Major", 90, SoundKind::loop},
@@ -114,6 +141,17 @@ TEST(Names, TellKeyTempoAndKindWhereTheyStand) {
         {"Loop 120 130", "", "", 0, SoundKind::loop},
         {"Kick 124 one shot", "", "", 0, SoundKind::oneShot},
         {"Snare 101", "", ""},
+        {"Cello_ff_R", "", ""},
+        {"Piano_f_L", "", ""},
+        {"Drums 4bars 120", "", "", 120, SoundKind::loop, 4},
+        {"Groove 120 8-bar am", "A", "Minor", 120, SoundKind::loop, 8},
+        {"Bass 64 Beats 120", "", "", 120, SoundKind::loop, 0, 64},
+        {"Loop 90 Beats", "", "", 0, SoundKind::loop},
+        {"Loop 64 steps 96 kHz", "", "", 0, SoundKind::loop},
+        {"One Shot 2 bars", "", "", 0, SoundKind::oneShot, 2},
+        {"Vol 2 Beats", "", ""},
+        {"SP12 Beats", "", ""},
+        {"Bar 3 A", "", ""},
     };
     for (const auto& row : rows) {
         const NameReading reading = readingOf(row.name);
@@ -127,6 +165,8 @@ TEST(Names, TellKeyTempoAndKindWhereTheyStand) {
         EXPECT_EQ(mode, row.mode) << row.name;
         EXPECT_EQ(reading.tempo.value_or(0), row.tempo) << row.name;
         EXPECT_EQ(reading.kind, row.kind) << row.name;
+        EXPECT_EQ(reading.bars.value_or(0), row.bars) << row.name;
+        EXPECT_EQ(reading.beats.value_or(0), row.beats) << row.name;
     }
 }
 
@@ -197,6 +237,8 @@ TEST(NamingHabits, TellWhichEntryIsWrong) {
         {"{ Meanings = { Kick = { hints = (a, a, a, a, a, a, a, a, a, a); }; }; }", "Kick",
          "more than 8 things"},
         {"{ Notes = { re = 12; }; }", "re", "is no note"},
+        {"{ Programs = { Kick = boink; }; }", "Kick", "is no list of texts"},
+        {"{ Prefixes = { Kick = (KICKOne, { a = b; }); }; }", "Kick", "is no list of texts"},
         {"{ Tempo = (boink); Counts = (boink); }", "Counts", "stands in another"},
     };
     for (const auto& row : rows) {

@@ -163,6 +163,7 @@ TEST_F(Describing, GivesValuesThatAreKnown) {
                   {{"Tempo", 86.6}, {"BeatCount", 7}, {"SignatureTop", 3}, {"SignatureBottom", 4}}},
                  {"Kick 122bpm.wav", wav.file(wav.format() + wav.data()), {{"Tempo", 122}}},
                  {"Kick_97.5 BPM_A.wav", wav.file(wav.format() + wav.data()), {{"Tempo", 97.5}}},
+                 {"Beat 2 bars.wav", wav.file(wav.format() + wav.data()), {{"BeatCount", 8}}},
                  {"Kick 1122bpm.wav", wav.file(wav.format() + wav.data()), {}},
                  {"Kick 120bpmx.wav", wav.file(wav.format() + wav.data()), {}},
                  {"empty.wav", wav.file(wav.format() + wav.data(0)), {}}};

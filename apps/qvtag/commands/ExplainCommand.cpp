@@ -52,6 +52,8 @@ Json jsonOfItem(const URL& url, const Stored& stored, const ItemReport& report) 
     json["path"] = url.path();
     json["kind"] = report.kind == SoundKind::unsaid ? Json() : Json(nameOf(report.kind));
     json["tempo"] = report.tempo ? jsonOfNumber(*report.tempo) : Json();
+    json["tempoFromLength"] = report.isTempoFromLength;
+    json["beats"] = report.beats ? Json(*report.beats) : Json();
     json["taggings"] = Json::array();
     for (const auto& tagging : sortedTaggings(stored)) {
         Json its = jsonOfTagging(*tagging);
@@ -138,6 +140,8 @@ void printItem(const URL& url, const Stored& stored, const ItemReport& report, c
     print("{}", colored(terminal, Color::strong, printable(url.path())));
     if (report.kind != SoundKind::unsaid) print("  {}", nameOf(report.kind));
     if (report.tempo) print("  {:g} bpm", *report.tempo);
+    if (report.beats)
+        print("{}{} beats", report.isTempoFromLength ? ", since it is as long as " : "  ", *report.beats);
     print("\n");
     const std::vector<Line> lines = linesOf(stored, report);
     std::size_t width = 0;

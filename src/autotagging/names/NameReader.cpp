@@ -1,6 +1,5 @@
 #include "autotagging/names/NameReader.h"
 
-#include "autotagging/names/NameScan.h"
 #include "taxonomy/TaggingTypes.h"
 
 #include <algorithm>
@@ -64,17 +63,18 @@ NameReading NameReader::read(std::span<const std::string_view> names) {
     for (std::size_t i = 0; i < names.size(); ++i) {
         const std::string_view name = names[i];
         const auto distance = static_cast<int>(i);
-        const NameScan scan(*habits_, name, pieces_.read(name), buffer_);
+        const auto owner = i == 0 ? NameScan::Owner::item : NameScan::Owner::folder;
+        const NameScan scan(*habits_, name, pieces_.read(name), owner, buffer_);
         Claims claims(reading, name, distance);
         for (const NameScan::Meant& meant : scan.meant()) {
             const bool isLetter = meant.end - meant.offset == 1;
             if (i > 0 && isLetter) continue;
             const NamedMeaning& meaning = habits_->meaning(meant.word.meaning);
-            const bool isHint = i > 0 && scan.isOfPack();
+            const bool isHint = (i > 0 && scan.isOfPack()) || isForeign(meant, scan.prefix());
             const double confidence = confidenceOf(isHint ? NameStrength::hint : meant.word.strength);
-            TagClaim& claim =
-                claims.add(i > 0 ? meaning.inFolders : meaning.label, meant.offset, meant.end,
-                           meaning.isFigurative ? std::min(confidence, weights_.figure) : confidence);
+            const bool isFigure = meaning.isFigurative && !meant.isOfPrefix;
+            TagClaim& claim = claims.add(i > 0 ? meaning.inFolders : meaning.label, meant.offset, meant.end,
+                                         isFigure ? std::min(confidence, weights_.figure) : confidence);
             claim.level = meaning.level;
             claim.isHead = meant.end == scan.meant().back().end;
         }
@@ -82,12 +82,28 @@ NameReading NameReader::read(std::span<const std::string_view> names) {
         // What the name itself says of these holds whatever its folders say.
         if (!reading.tempo) reading.tempo = scan.tempo();
         if (reading.kind == SoundKind::unsaid) reading.kind = scan.kind();
+        if (!reading.bars) reading.bars = scan.bars();
+        if (!reading.beats) reading.beats = scan.beats();
+        if (i == 0 && !reading.tempo) reading.possibleTempos = scan.possibleTempos();
         const auto key = hasKey ? std::nullopt : scan.key();
         if (!key) continue;
         claims.add(*key, weights_.key);
         hasKey = true;
     }
+    if (reading.tempo) reading.possibleTempos.clear();
+    const bool hasLength = reading.bars || reading.beats;
+    if (reading.kind == SoundKind::unsaid && hasLength) reading.kind = SoundKind::loop;
     return reading;
+}
+
+/// "GLASCrsh_Window Crash" is glass: behind a prefix, words for what does not go with it only describe.
+bool NameReader::isForeign(const NameScan::Meant& meant, std::span<const NamingHabits::Word> prefix) const {
+    const NamedMeaning& meaning = habits_->meaning(meant.word.meaning);
+    if (prefix.empty() || meant.isOfPrefix || meaning.category != QVCategorySourceIdentifier) return false;
+    return std::none_of(prefix.begin(), prefix.end(), [&](const NamingHabits::Word& word) {
+        const std::string& root = habits_->meaning(word.meaning).root;
+        return root == meaning.root || weights_.goTogether(root, meaning.root);
+    });
 }
 
 }  // namespace qvct

@@ -4,6 +4,7 @@
 #include "autotagging/evidence/SoundKind.h"
 #include "autotagging/evidence/TagClaim.h"
 #include "autotagging/names/NamePieces.h"
+#include "autotagging/names/NameScan.h"
 #include "autotagging/names/NamingHabits.h"
 
 #include <cstdint>
@@ -28,6 +29,11 @@ struct NameReading {
     std::vector<TagClaim> claims;
     std::vector<Silence> silences;
     std::optional<double> tempo;  ///< Beats a minute.
+    /// Numbers of the item's own name that may be its tempo if its length agrees; none where `tempo` is
+    /// known.
+    std::vector<double> possibleTempos;
+    std::optional<int> bars;   ///< How long it is said to be.
+    std::optional<int> beats;  ///< The same in beats.
     SoundKind kind = SoundKind::unsaid;
 };
 
@@ -47,6 +53,7 @@ class NameReader {
 
   private:
     double confidenceOf(NameStrength strength) const;
+    bool isForeign(const NameScan::Meant& meant, std::span<const NamingHabits::Word> prefix) const;
 
     std::shared_ptr<const NamingHabits> habits_;
     EvidenceWeights weights_;

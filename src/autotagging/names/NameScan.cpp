@@ -1,8 +1,10 @@
 #include "autotagging/names/NameScan.h"
 
+#include "autotagging/names/NamePrefix.h"
 #include "taxonomy/TaggingTypes.h"
 
 #include <algorithm>
+#include <bit>
 #include <charconv>
 
 namespace qvct {
@@ -12,8 +14,12 @@ using Pieces = std::span<const NamePiece>;
 using Word = NamingHabits::Word;
 
 constexpr double kSlowest = 40, kFastest = 250;
+
 /// What stands alone, without "bpm", is a tempo only in the range of dance and film music.
-constexpr double kSlowestAlone = 60, kFastestAlone = 190;
+bool canStandAlone(double tempo) {
+    constexpr double slowest = 60, fastest = 190;
+    return tempo >= slowest && tempo <= fastest;
+}
 
 /// Up to three digits, and with the piece behind them "87.5".
 std::optional<double> numberAt(Pieces pieces, std::string_view name) {
@@ -39,9 +45,25 @@ bool isLetter(const NamePiece& piece) {
 
 }  // namespace
 
-NameScan::NameScan(const NamingHabits& habits, std::string_view name, Pieces pieces, std::string& buffer)
+NameScan::NameScan(const NamingHabits& habits, std::string_view name, Pieces pieces, Owner owner,
+                   std::string& buffer)
     : habits_(habits), name_(name), pieces_(pieces), buffer_(buffer) {
-    for (std::size_t at = 0; at < pieces_.size();) at += readAt(at);
+    for (std::size_t at = owner == Owner::item ? readPrefix() : 0; at < pieces_.size();) at += readAt(at);
+}
+
+/// The pieces that the code of a category takes, which stand for nothing else.
+std::size_t NameScan::readPrefix() {
+    const auto prefix = namePrefixOf(name_);
+    if (!prefix) return 0;
+    prefix_ = habits_.wordsOfPrefix(prefix->code);
+    if (prefix_.empty()) return 0;
+    const auto end = static_cast<std::uint32_t>(prefix->code.size());
+    for (const Word& word : prefix_) meant_.push_back({word, 0, end, true});
+    makers_ = prefix->makers;
+    if (makers_.first < makers_.second) silences_.push_back(makers_);
+    const auto behind = std::find_if(pieces_.begin(), pieces_.end(),
+                                     [end](const NamePiece& piece) { return piece.offset >= end; });
+    return static_cast<std::size_t>(behind - pieces_.begin());
 }
 
 std::size_t NameScan::readAt(std::size_t at) {
@@ -65,10 +87,15 @@ std::size_t NameScan::readWord(std::size_t at, const Word& word) {
     addMeant(word, offset, end);
     if (word.pieces > 1) addWordsIn(word, pieces_.subspan(at, word.pieces));
     if (word.role == NameRole::silent) silences_.emplace_back(offset, end);
-    if (word.role == NameRole::tempo && !tempos_.empty() && at > 0 && pieces_[at - 1].isNumber())
+    if (word.role == NameRole::tempo && !tempos_.empty() && tempos_.back().end == at)
         tempos_.back().isSaid = true;
-    // "Vol 2", "Take C": what is counted is neither a tempo nor a note.
-    const bool isCounted = word.role == NameRole::count && behind < pieces_.size() &&
+    const bool isUnit =
+        word.role == NameRole::unit || word.role == NameRole::bars || word.role == NameRole::beats;
+    const bool isOfNumber = isUnit && at > 0 && behindNumber_ == at;
+    if (isOfNumber) noteUnit(at, word.role);
+    // "Vol 2", "Take C", "Bar 3": what is counted is neither a tempo nor a note.
+    const bool isCounted = (word.role == NameRole::count || (isUnit && !isOfNumber)) &&
+                           behind < pieces_.size() &&
                            (pieces_[behind].isNumber() || isLetter(pieces_[behind]));
     return word.pieces + (isCounted ? 1U : 0U);
 }
@@ -87,7 +114,26 @@ void NameScan::noteKind(NameRole role) {
     saysOneShot_ = saysOneShot_ || role == NameRole::oneShot;
 }
 
+/// "4 bars", "16beats", "64 steps", "96 kHz": the number before it is no tempo.
+void NameScan::noteUnit(std::size_t at, NameRole role) {
+    constexpr int most = 64;
+    if (!tempos_.empty() && tempos_.back().end == at) tempos_.pop_back();
+    const auto number = static_cast<int>(numberAt(pieces_.subspan(at - 1, 1), name_).value_or(0));
+    // The beats of an "SP12" are not twelve.
+    const bool isPartOfWord = pieces_[at - 1].isJoined && !pieces_[at].isJoined;
+    if (number < 1 || number > most || isPartOfWord) return;
+    if (role == NameRole::bars) bars_ = number;
+    // Music has beats by twos and threes; "Top 40 Beats" are none.
+    const int rest = number >> std::countr_zero(static_cast<unsigned>(number));
+    if (role == NameRole::beats && (rest == 1 || rest == 3)) beats_ = number;
+}
+
+bool NameScan::isOfMaker(std::uint32_t offset) const {
+    return offset >= makers_.first && offset < makers_.second;
+}
+
 void NameScan::addMeant(const Word& word, std::uint32_t offset, std::uint32_t end) {
+    if (isOfMaker(offset)) return;
     // A letter stands for a word only where a name begins with it: "K_01".
     if (end - offset == 1 && offset != pieces_.front().offset) return;
     if (word.meaning != Word::kNoMeaning) meant_.push_back({word, offset, end});
@@ -97,7 +143,7 @@ void NameScan::addMeant(const Word& word, std::uint32_t offset, std::uint32_t en
 
 /// "Drum Fill" is a fill, and of drums; but there is no bass in "Drum and Bass".
 void NameScan::addWordsIn(const Word& phrase, std::span<const NamePiece> pieces) {
-    if (phrase.meaning == Word::kNoMeaning || phrase.role == NameRole::silent) return;
+    if (phrase.meaning == Word::kNoMeaning || isOfMaker(pieces.front().offset)) return;
     const std::string& category = habits_.meaning(phrase.meaning).category;
     if (category == QVCategoryGenresIdentifier) return;
     for (std::size_t i = 0; i < pieces.size(); ++i) {
@@ -121,13 +167,15 @@ std::size_t NameScan::readNumber(std::size_t at) {
     const auto number = numberAt(pieces_.subspan(at), name_);
     const bool isWhole = !number || *number == static_cast<int>(*number);
     const std::size_t read = isWhole ? 1 : 2;
+    // What a pack's number counts is none of the sound: "Vol 2 Beats".
+    if (before_ != NameRole::pack) behindNumber_ = at + read;
     if (!number || *number < kSlowest || *number > kFastest) return read;
     const bool isSaid = before_ == NameRole::tempo;
     // "TR808", "v124": part of a word.
     const bool isPartOfWord =
         pieces_[at].isJoined || (at + read < pieces_.size() && pieces_[at + read].isJoined &&
                                  habits_.roleOf(pieces_[at + read].folded) != NameRole::tempo);
-    if (isSaid || !isPartOfWord) tempos_.push_back({*number, isSaid});
+    if (isSaid || !isPartOfWord) tempos_.push_back({*number, isSaid, at + read});
     return read;
 }
 
@@ -148,14 +196,22 @@ std::optional<double> NameScan::tempo() const {
     if (said != tempos_.end()) return said->number;
     const bool hasSureKey = std::any_of(
         keys_.begin(), keys_.end(), [](const Key& key) { return key.key.mode != NamedKey::Mode::unsaid; });
-    if ((!saysLoop_ && !hasSureKey) || saysOneShot_) return std::nullopt;
+    if ((!isLoop() && !hasSureKey) || saysOneShot_) return std::nullopt;
     std::optional<double> alone;
     for (const Tempo& tempo : tempos_) {
-        if (tempo.number < kSlowestAlone || tempo.number > kFastestAlone) continue;
+        if (!canStandAlone(tempo.number)) continue;
         if (alone && *alone != tempo.number) return std::nullopt;
         alone = tempo.number;
     }
     return alone;
+}
+
+std::vector<double> NameScan::possibleTempos() const {
+    std::vector<double> numbers;
+    if (saysOneShot_) return numbers;
+    for (const Tempo& tempo : tempos_)
+        if (canStandAlone(tempo.number)) numbers.push_back(tempo.number);
+    return numbers;
 }
 
 std::optional<NamedKey> NameScan::key() const {
@@ -173,7 +229,7 @@ std::optional<NamedKey> NameScan::key() const {
 bool NameScan::canStand(const Key& key) const {
     if (hasNote_) return false;
     if (key.isAnnounced) return true;
-    const bool isOfMusic = saysLoop_ || tempo().has_value();
+    const bool isOfMusic = isLoop() || tempo().has_value();
     const NamePiece& first = pieces_[key.piece];
     const std::size_t behind = key.piece + key.key.pieces;
     const bool isCapital = first.text.front() >= 'A' && first.text.front() <= 'G';
@@ -204,7 +260,7 @@ bool NameScan::canLetterStand(const Key& key) const {
     if (habits_.roleOf(before.folded) == NameRole::loop) return false;
     const bool isOfPitched = saysPitched();
     const bool isLast = key.piece + key.key.pieces == pieces_.size();
-    if (isOfPitched && (saysLoop_ || tempo() || (key.isBehindPitched && isLast))) return true;
+    if (isOfPitched && (isLoop() || tempo() || (key.isBehindPitched && isLast))) return true;
     if (!meant_.empty() && !isOfPitched) return false;
     if (tempo()) return true;
     const bool isSpaced = before.end() + 1 == pieces_[key.piece].offset && name_[before.end()] == ' ';

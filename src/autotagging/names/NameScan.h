@@ -23,18 +23,24 @@ class NameScan {
         NamingHabits::Word word;
         std::uint32_t offset;  ///< In the name, in bytes.
         std::uint32_t end;
+        bool isOfPrefix = false;
     };
     /// A number that may be a tempo.
     struct Tempo {
         double number;
-        bool isSaid;  ///< "bpm" stands beside it.
+        bool isSaid;      ///< "bpm" stands beside it.
+        std::size_t end;  ///< The piece behind it.
     };
+    /// Whose name it is: only an item's begins with the code of a category.
+    enum class Owner : std::uint8_t { item, folder };
 
     /// `buffer` is for its own use.
     NameScan(const NamingHabits& habits, std::string_view name, std::span<const NamePiece> pieces,
-             std::string& buffer);
+             Owner owner, std::string& buffer);
 
     const std::vector<Meant>& meant() const { return meant_; }
+    /// What the code says that the name begins with; it comes first in `meant`.
+    std::span<const NamingHabits::Word> prefix() const { return prefix_; }
     /// Where phrases stand whose words do not mean what they say elsewhere: offset and end.
     const std::vector<std::pair<std::uint32_t, std::uint32_t>>& silences() const { return silences_; }
     SoundKind kind() const {
@@ -42,8 +48,13 @@ class NameScan {
     }
     /// It is called by its maker: a volume, a collection.
     bool isOfPack() const { return isOfPack_; }
+    /// How long it is: "4 bars".
+    std::optional<int> bars() const { return bars_; }
+    std::optional<int> beats() const { return beats_; }
     /// Nothing when the name says none, or several.
     std::optional<double> tempo() const;
+    /// The numbers that might be one if more spoke for it.
+    std::vector<double> possibleTempos() const;
     std::optional<NamedKey> key() const;
 
   private:
@@ -54,15 +65,19 @@ class NameScan {
         bool isBehindPitched;
     };
 
+    std::size_t readPrefix();
     std::size_t readAt(std::size_t at);
     std::size_t readWord(std::size_t at, const NamingHabits::Word& word);
     void noteKindInside(const NamePiece& piece);
     void noteKind(NameRole role);
     void addMeant(const NamingHabits::Word& word, std::uint32_t offset, std::uint32_t end);
     void addWordsIn(const NamingHabits::Word& phrase, std::span<const NamePiece> pieces);
+    void noteUnit(std::size_t at, NameRole role);
+    bool isOfMaker(std::uint32_t offset) const;
     std::size_t readKey(std::size_t at, const NamedKey& key);
     std::size_t readNumber(std::size_t at);
     std::size_t readPacked(std::size_t at);
+    bool isLoop() const { return saysLoop_ || bars_ || beats_; }
     bool canStand(const Key& key) const;
     bool saysPitched() const;
     bool canLetterStand(const Key& key) const;
@@ -75,6 +90,10 @@ class NameScan {
     std::vector<std::pair<std::uint32_t, std::uint32_t>> silences_;
     std::vector<Key> keys_;
     std::vector<Tempo> tempos_;
+    std::span<const NamingHabits::Word> prefix_;
+    std::pair<std::uint32_t, std::uint32_t> makers_ = {0, 0};  // who they are is no sound
+    std::optional<int> bars_, beats_;
+    std::size_t behindNumber_ = 0;      // the piece behind the last one that was read
     NameRole before_ = NameRole::none;  // of the word before the piece at hand
     bool saysLoop_ = false, saysOneShot_ = false, isOfPack_ = false, hasNote_ = false;
 };

@@ -48,7 +48,7 @@ struct RoleList {
     std::string_view key;  // empty: the part is the list itself
     NameRole role;
 };
-constexpr std::array<RoleList, 12> kRoleLists = {{{"Kinds", "Loop", NameRole::loop},
+constexpr std::array<RoleList, 15> kRoleLists = {{{"Kinds", "Loop", NameRole::loop},
                                                   {"Kinds", "One Shot", NameRole::oneShot},
                                                   {"Modes", "Major", NameRole::major},
                                                   {"Modes", "Minor", NameRole::minor},
@@ -57,6 +57,9 @@ constexpr std::array<RoleList, 12> kRoleLists = {{{"Kinds", "Loop", NameRole::lo
                                                   {"Accidentals", "flat", NameRole::flat},
                                                   {"Tempo", "", NameRole::tempo},
                                                   {"Counts", "", NameRole::count},
+                                                  {"Units", "", NameRole::unit},
+                                                  {"Lengths", "Bars", NameRole::bars},
+                                                  {"Lengths", "Beats", NameRole::beats},
                                                   {"Silent", "", NameRole::silent},
                                                   {"Packs", "", NameRole::pack},
                                                   {"Keys", "", NameRole::key}}};
@@ -77,7 +80,8 @@ class NamingHabitsReader {
         if (const Dictionary* labels = dictionary.dictionary("InFolders"))
             for (const auto& [label, value] : *labels)
                 if (value.string() != nullptr) inFolders_[label] = *value.string();
-        return addNotes(dictionary, error) && addRoles(dictionary, error) && addMeanings(dictionary, error);
+        return addNotes(dictionary, error) && addRoles(dictionary, error) && addMeanings(dictionary, error) &&
+               addPrograms(dictionary, error) && addPrefixes(dictionary, error);
     }
 
     /// The labels of the taxonomy, and the words of the keyword mapping, say themselves unless an entry says
@@ -95,6 +99,7 @@ class NamingHabitsReader {
         for (NamedMeaning& meaning : habits_->meanings_) {
             meaning.isPitched = belongsTo(pitched_, meaning.label);
             meaning.isFigurative = belongsTo(figurative_, meaning.label);
+            meaning.root = taxonomy_.findTagForLabel(meaning.label)->rootTag()->label();
             const auto found = inFolders_.find(meaning.label);
             meaning.inFolders = found == inFolders_.end() ? meaning.label : found->second;
         }
@@ -149,6 +154,45 @@ class NamingHabitsReader {
         });
     }
 
+    /// Of the labels of a part that are known, each with its list.
+    template <typename Add>
+    bool addLists(const Dictionary& dictionary, std::string_view part, Error* error, Add add) {
+        const Dictionary* lists = dictionary.dictionary(part);
+        if (lists == nullptr) return true;
+        return std::all_of(lists->begin(), lists->end(), [&](const auto& entry) {
+            const PropertyList::Array* list = entry.value.array();
+            if (list == nullptr)
+                return fail(error, kErrorMalformed, "is no list of texts", {.part = entry.key});
+            const auto meaning = numberOf(entry.key);
+            return !meaning || add(*list, *meaning, entry.key);
+        });
+    }
+
+    bool addPrograms(const Dictionary& dictionary, Error* error) {
+        return addLists(
+            dictionary, "Programs", error,
+            [&](const PropertyList::Array& names, std::uint32_t meaning, const std::string& label) {
+                return addAll(names, {.meaning = meaning}, label, error);
+            });
+    }
+
+    /// The first label of a code is what it says; others go with it.
+    bool addPrefixes(const Dictionary& dictionary, Error* error) {
+        const auto add = [&](const PropertyList::Array& codes, std::uint32_t meaning,
+                             const std::string& label) {
+            return std::all_of(codes.begin(), codes.end(), [&](const PropertyList& code) {
+                if (code.string() == nullptr)
+                    return fail(error, kErrorMalformed, "is no list of texts", {.part = label});
+                std::vector<Word>& words = habits_->prefixes_[*code.string()];
+                words.push_back(
+                    {.meaning = meaning,
+                     .strength = words.empty() ? NameStrength::word : NameStrength::abbreviation});
+                return true;
+            });
+        };
+        return addLists(dictionary, "Prefixes", error, add);
+    }
+
     bool addMeaning(std::uint32_t meaning, const Dictionary& lists, const std::string& entry, Error* error) {
         return std::all_of(kStrengths.begin(), kStrengths.end(), [&](const auto& strength) {
             const PropertyList::Array* words = lists.array(strength.first);
@@ -182,6 +226,7 @@ class NamingHabitsReader {
             return fail(error, kErrorMalformed, fmt::format("\"{}\" is no word or phrase", printable(text)),
                         {.part = entry});
         }
+        if (place->source == source_ && saysTheSame(place->word, word)) return true;
         if (place->source == source_ && place->word.strength == NameStrength::hint) {
             std::swap(place->word, word);
             std::swap(place->word.other, word.other);
@@ -200,6 +245,15 @@ class NamingHabitsReader {
         place->word = word;
         place->source = source_;
         return true;
+    }
+
+    bool saysTheSame(const Word& a, const Word& b) const {
+        if (a.strength != b.strength || a.strength == NameStrength::hint || a.role != b.role) return false;
+        if (a.meaning == b.meaning) return true;
+        if (a.meaning == Word::kNoMeaning || b.meaning == Word::kNoMeaning) return false;
+        const NamedMeaning& its = habits_->meanings_[a.meaning];
+        const NamedMeaning& other = habits_->meanings_[b.meaning];
+        return its.label == other.label && its.level == other.level;
     }
 
     /// A word may hint at several things besides what it says.
@@ -254,6 +308,12 @@ class NamingHabitsReader {
     std::map<std::string, std::string> inFolders_;
     std::uint8_t source_ = 0;
 };
+
+std::span<const NamingHabits::Word> NamingHabits::wordsOfPrefix(std::string_view code) const {
+    const auto found = prefixes_.find(code);
+    if (found == prefixes_.end()) return {};
+    return found->second;
+}
 
 const NamingHabits::Entry* NamingHabits::find(std::string_view text) const {
     const auto found = entries_.find(text);

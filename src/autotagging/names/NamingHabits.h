@@ -26,6 +26,7 @@ struct NamedMeaning {
     std::string label;
     std::optional<double> level;
     std::string category;
+    std::string root;           ///< The outermost of its parents, or itself.
     bool isPitched = false;     ///< Something that plays notes.
     bool isFigurative = false;  ///< Its words often only describe something else.
     std::string inFolders;      ///< The label that stands for it in a folder's name.
@@ -43,6 +44,9 @@ enum class NameRole : std::uint8_t {
     flat,
     tempo,
     count,
+    unit,
+    bars,
+    beats,
     silent,
     pack,
     key
@@ -80,6 +84,8 @@ class NamingHabits {
 
     const NamedMeaning& meaning(std::uint32_t index) const { return meanings_[index]; }
     const Word& other(std::uint32_t index) const { return others_[index]; }
+    /// What a prefix stands for, the likeliest first; see NamePrefix. Empty when it stands for nothing.
+    std::span<const Word> wordsOfPrefix(std::string_view code) const;
     /// Of a folded word.
     NameRole roleOf(std::string_view folded) const;
     /// The semitones above C of a note that is called by a syllable: "re".
@@ -105,6 +111,7 @@ class NamingHabits {
         std::uint8_t source = 0;   // number of the dictionary that it comes from
     };
     using Entries = std::unordered_map<std::string, Entry, Hash, std::equal_to<>>;
+    using Prefixes = std::unordered_map<std::string, std::vector<Word>, Hash, std::equal_to<>>;
 
     const Entry* find(std::string_view text) const;
     /// Plurals included.
@@ -114,6 +121,7 @@ class NamingHabits {
     std::vector<Word> others_;
     std::map<std::string, int, std::less<>> notes_;
     Entries entries_;
+    Prefixes prefixes_;
 
     friend class NamingHabitsReader;
 };
