@@ -1,5 +1,6 @@
 #include "autotagging/names/NameReader.h"
 
+#include "autotagging/names/NameScan.h"
 #include "taxonomy/TaggingTypes.h"
 
 #include <algorithm>
@@ -70,7 +71,9 @@ NameReading NameReader::read(std::span<const std::string_view> names) {
             const bool isLetter = meant.end - meant.offset == 1;
             if (i > 0 && isLetter) continue;
             const NamedMeaning& meaning = habits_->meaning(meant.word.meaning);
-            const bool isHint = (i > 0 && scan.isOfPack()) || isForeign(meant, scan.prefix());
+            const bool isInstrument = meaning.category == QVCategorySourceIdentifier && !meant.isOfPrefix;
+            const bool isOfPack = i > 0 && scan.isOfPack();
+            const bool isHint = isInstrument && (isOfPack || isForeign(meaning, scan.prefix()));
             const double confidence = confidenceOf(isHint ? NameStrength::hint : meant.word.strength);
             const bool isFigure = meaning.isFigurative && !meant.isOfPrefix;
             TagClaim& claim = claims.add(i > 0 ? meaning.inFolders : meaning.label, meant.offset, meant.end,
@@ -97,10 +100,8 @@ NameReading NameReader::read(std::span<const std::string_view> names) {
 }
 
 /// "GLASCrsh_Window Crash" is glass: behind a prefix, words for what does not go with it only describe.
-bool NameReader::isForeign(const NameScan::Meant& meant, std::span<const NamingHabits::Word> prefix) const {
-    const NamedMeaning& meaning = habits_->meaning(meant.word.meaning);
-    if (prefix.empty() || meant.isOfPrefix || meaning.category != QVCategorySourceIdentifier) return false;
-    return std::none_of(prefix.begin(), prefix.end(), [&](const NamingHabits::Word& word) {
+bool NameReader::isForeign(const NamedMeaning& meaning, std::span<const NamingHabits::Word> prefix) const {
+    return !prefix.empty() && std::none_of(prefix.begin(), prefix.end(), [&](const NamingHabits::Word& word) {
         const std::string& root = habits_->meaning(word.meaning).root;
         return root == meaning.root || weights_.goTogether(root, meaning.root);
     });

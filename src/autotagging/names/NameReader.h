@@ -4,7 +4,6 @@
 #include "autotagging/evidence/SoundKind.h"
 #include "autotagging/evidence/TagClaim.h"
 #include "autotagging/names/NamePieces.h"
-#include "autotagging/names/NameScan.h"
 #include "autotagging/names/NamingHabits.h"
 
 #include <cstdint>
@@ -53,7 +52,7 @@ class NameReader {
 
   private:
     double confidenceOf(NameStrength strength) const;
-    bool isForeign(const NameScan::Meant& meant, std::span<const NamingHabits::Word> prefix) const;
+    bool isForeign(const NamedMeaning& meaning, std::span<const NamingHabits::Word> prefix) const;
 
     std::shared_ptr<const NamingHabits> habits_;
     EvidenceWeights weights_;

@@ -93,8 +93,12 @@ std::size_t NameScan::readWord(std::size_t at, const Word& word) {
         word.role == NameRole::unit || word.role == NameRole::bars || word.role == NameRole::beats;
     const bool isOfNumber = isUnit && at > 0 && behindNumber_ == at;
     if (isOfNumber) noteUnit(at, word.role);
+    // A layer has a word behind what it is one of; "MF_Bass" may be a maker.
+    const bool isLayer = word.role == NameRole::layer && at > 0;
+    isLayer_ = isLayer_ || isLayer;
+    isOfPack_ = isOfPack_ || word.role == NameRole::pack;
     // "Vol 2", "Take C", "Bar 3": what is counted is neither a tempo nor a note.
-    const bool isCounted = (word.role == NameRole::count || (isUnit && !isOfNumber)) &&
+    const bool isCounted = (word.role == NameRole::count || isLayer || (isUnit && !isOfNumber)) &&
                            behind < pieces_.size() &&
                            (pieces_[behind].isNumber() || isLetter(pieces_[behind]));
     return word.pieces + (isCounted ? 1U : 0U);
@@ -225,11 +229,13 @@ std::optional<NamedKey> NameScan::key() const {
 }
 
 /// A key stands where music is meant: beside a tempo, in what is called a loop, behind an instrument, alone
-/// in brackets or at the end. "A Day", "Take C", "3 AM" and "Plan B" are none.
+/// in brackets or at the end; one layer of an instrument plays a note. "A Day", "Take C", "3 AM" and "Plan B"
+/// are none.
 bool NameScan::canStand(const Key& key) const {
     if (hasNote_) return false;
     if (key.isAnnounced) return true;
     const bool isOfMusic = isLoop() || tempo().has_value();
+    if (isLayer_ && !isOfMusic) return false;
     const NamePiece& first = pieces_[key.piece];
     const std::size_t behind = key.piece + key.key.pieces;
     const bool isCapital = first.text.front() >= 'A' && first.text.front() <= 'G';

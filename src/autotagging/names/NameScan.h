@@ -95,7 +95,7 @@ class NameScan {
     std::optional<int> bars_, beats_;
     std::size_t behindNumber_ = 0;      // the piece behind the last one that was read
     NameRole before_ = NameRole::none;  // of the word before the piece at hand
-    bool saysLoop_ = false, saysOneShot_ = false, isOfPack_ = false, hasNote_ = false;
+    bool saysLoop_ = false, saysOneShot_ = false, isOfPack_ = false, hasNote_ = false, isLayer_ = false;
 };
 
 }  // namespace qvct

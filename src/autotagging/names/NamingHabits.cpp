@@ -48,7 +48,7 @@ struct RoleList {
     std::string_view key;  // empty: the part is the list itself
     NameRole role;
 };
-constexpr std::array<RoleList, 15> kRoleLists = {{{"Kinds", "Loop", NameRole::loop},
+constexpr std::array<RoleList, 16> kRoleLists = {{{"Kinds", "Loop", NameRole::loop},
                                                   {"Kinds", "One Shot", NameRole::oneShot},
                                                   {"Modes", "Major", NameRole::major},
                                                   {"Modes", "Minor", NameRole::minor},
@@ -57,6 +57,7 @@ constexpr std::array<RoleList, 15> kRoleLists = {{{"Kinds", "Loop", NameRole::lo
                                                   {"Accidentals", "flat", NameRole::flat},
                                                   {"Tempo", "", NameRole::tempo},
                                                   {"Counts", "", NameRole::count},
+                                                  {"Layers", "", NameRole::layer},
                                                   {"Units", "", NameRole::unit},
                                                   {"Lengths", "Bars", NameRole::bars},
                                                   {"Lengths", "Beats", NameRole::beats},

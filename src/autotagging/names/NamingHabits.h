@@ -44,6 +44,7 @@ enum class NameRole : std::uint8_t {
     flat,
     tempo,
     count,
+    layer,
     unit,
     bars,
     beats,
