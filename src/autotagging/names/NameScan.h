@@ -43,7 +43,8 @@ class NameScan {
     /// It is called by its maker: a volume, a collection.
     bool isOfPack() const { return isOfPack_; }
     /// Nothing when the name says none, or several.
-    std::optional<double> tempo() const;
+    /// `kind`: what names nearer to the item say.
+    std::optional<double> tempo(SoundKind kind = SoundKind::unsaid) const;
     std::optional<NamedKey> key() const;
 
   private:
@@ -52,6 +53,7 @@ class NameScan {
         std::size_t piece;
         bool isAnnounced;  // by "key"
         bool isBehindPitched;
+        bool isVariant;  // "Take C", "E string", "Clarinet in B"
     };
 
     std::size_t readAt(std::size_t at);
@@ -61,11 +63,15 @@ class NameScan {
     void addMeant(const NamingHabits::Word& word, std::uint32_t offset, std::uint32_t end);
     void addWordsIn(const NamingHabits::Word& phrase, std::span<const NamePiece> pieces);
     std::size_t readKey(std::size_t at, const NamedKey& key);
+    bool isVariantAt(std::size_t at, const NamedKey& key) const;
     std::size_t readNumber(std::size_t at);
     std::size_t readPacked(std::size_t at);
     bool canStand(const Key& key) const;
+    bool saysPassage() const;
     bool saysPitched() const;
     bool canLetterStand(const Key& key) const;
+    bool beginsWord(const Key& key) const;
+    bool numbers(const Key& key) const;
 
     const NamingHabits& habits_;
     std::string_view name_;
