@@ -164,7 +164,8 @@ TEST(ClaimResolver, DecidesTheSameInWhateverOrder) {
 
 TEST(EvidenceWeights, TellWhichEntryIsWrong) {
     const std::string whole =
-        "{ Strengths = { word = 1; abbreviation = 1; hint = 1; figure = 1; key = 1; }; Services = { rules = "
+        "{ Strengths = { word = 1; abbreviation = 1; likeness = 1; hint = 1; figure = 1; key = 1; }; "
+        "Services = { rules = "
         "1; }; "
         "Distances = (1); Together = ((Drums, Percussion)); HeadWord = 0; Support = 0; Contradiction = 0; "
         "Threshold = 0.5; }";

@@ -70,6 +70,15 @@ TEST(Names, AreReadAsPeopleWriteThem) {
         {"Drum'n'Bass", {"Drum'n'Bass"}},
         {"drum & bass", {"Drum'n'Bass"}},
         {"\xd1\x82\xd0\xbe\xd0\xbc", {"Tom"}},
+        {"Harmnica 2", {"Harmonica"}},
+        {"SlowStrng", {"Strings"}},
+        {"Triang 1", {"Triangle"}},
+        {"vibrophone", {"Vibraphone"}},
+        {"Shakuhatchi", {"Shakuhachi"}},
+        {"hoarseorgan", {"Organ"}},
+        {"FMbass", {"Bass"}},
+        {"Electric Pno", {"Electric", "Electric Piano", "Piano"}},
+        {"Synvox 3", {"Synth", "Synth Voice", "Voice"}},
         {"Bell\xff"
          "Clap",
          {"Bells", "Claps"}},
@@ -104,8 +113,10 @@ TEST(Names, BeginWithTheCodeOfAnyCategory) {
 
 TEST(Names, DoNotSayWhatTheyOnlySeemToSay) {
     for (const char* name :
-         {"", "808", "v127 rr2", "Hard Drive", "Section B", "Plan B", "3 AM", "Vol 2", "C", "A Day", "Take C",
-          "TR808", "abcdefgh", "Kit", "()[]--__", "9A", "Sat", "Bdelay", "Charm"}) {
+         {"",         "808",    "v127 rr2", "Hard Drive", "Section B", "Plan B",     "3 AM",
+          "Vol 2",    "C",      "A Day",    "Take C",     "TR808",     "abcdefgh",   "Kit",
+          "()[]--__", "9A",     "Sat",      "Bdelay",     "Charm",     "Miami Vice", "Monkeys",
+          "Strong",   "Symbol", "Override", "Clip 3",     "Club",      "Rinse",      "Recorded"}) {
         const NameReading reading = readingOf(name);
         EXPECT_THAT(labelsOf(reading), IsEmpty()) << name;
         EXPECT_FALSE(reading.tempo) << name;
@@ -131,6 +142,22 @@ TEST(Names, TellKeyTempoAndKindWhereTheyStand) {
         {"Bajo Re menor", "D", "Minor"},
         {"Strings C Lydian", "C", ""},
         {"Bass Loop 124 F", "F", "", 124, SoundKind::loop},
+        {"Strings B\xe2\x99\xadm 90bpm", "ASharp", "Minor", 90},
+        {"Pad Fis-Moll", "FSharp", "Minor"},
+        {"Lead E harmonic minor", "E", "Minor"},
+        {"Melody 92 Am", "A", "Minor", 92},
+        {"E String Guitar 90bpm", "", "", 90},
+        {"Clarinet in Bb 100bpm", "", "", 100},
+        {"Bb Trumpet 100bpm", "", "", 100},
+        {"Deep G-House Bass Loop 124", "", "", 124, SoundKind::loop},
+        {"Like A Synth Loop 120", "", "", 120, SoundKind::loop},
+        {"Bass Loop 01 A 120bpm", "", "", 120, SoundKind::loop},
+        {"Synth D50 Loop 120", "", "", 120, SoundKind::loop},
+        {"Synth_A_B_120bpm", "", "", 120},
+        {"Strings 90 C loop", "C", "", 90, SoundKind::loop},
+        {"Drone in D", "D", ""},
+        {"Pad_Fsus2", "F", ""},
+        {"Synth Group C 120bpm", "", "", 120},
         {"Fm Pad", "F", "Minor"},
         {"FM Pad", "", ""},
         {"Piano A2", "", ""},

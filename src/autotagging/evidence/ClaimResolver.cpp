@@ -98,13 +98,19 @@ class Decision {
         return claim.isHead ? together(weight, weights_.headWord) : weight;
     }
 
-    /// Keywords and naming habits read the same words: they are one source.
-    static std::string_view sourceOf(const TagClaim& claim) {
-        return claim.service == "keywords" ? std::string_view("names") : claim.service;
+    /// Keywords and naming habits read the same words: they are one source. The name of an item and those of
+    /// its folders are several.
+    struct Source {
+        std::string_view service;
+        int distance;
+        friend bool operator==(const Source&, const Source&) = default;
+    };
+    static Source sourceOf(const TagClaim& claim) {
+        return {claim.service == "keywords" ? std::string_view("names") : claim.service, claim.distance};
     }
 
     void weigh(Candidate& candidate) const {
-        std::vector<std::pair<std::string_view, double>> sources;
+        std::vector<std::pair<Source, double>> sources;
         for (TagClaim& claim : candidate.claims) {
             claim.confidence = claim.doubt.empty() ? weightOf(claim) : 0;
             const auto source = std::find_if(sources.begin(), sources.end(), [&](const auto& known) {

@@ -66,6 +66,7 @@ std::optional<EvidenceWeights> EvidenceWeights::weightsWithDictionary(const Dict
     const Dictionary& strengths = read.dictionary(dictionary, "Strengths");
     weights.word = read.number(strengths, "word");
     weights.abbreviation = read.number(strengths, "abbreviation");
+    weights.likeness = read.number(strengths, "likeness");
     weights.hint = read.number(strengths, "hint");
     weights.figure = read.number(strengths, "figure");
     weights.key = read.number(strengths, "key");

@@ -16,6 +16,7 @@ namespace qvct {
 struct QVCT_API EvidenceWeights {
     double word = 0;          ///< What a plain word of a name says.
     double abbreviation = 0;  ///< What an abbreviation says.
+    double likeness = 0;      ///< What is near to a word, or ends with one.
     double hint = 0;          ///< What a word says that often means something else.
     double figure = 0;        ///< What a word says that often only describes something else.
     double key = 0;           ///< A key that a name spells.

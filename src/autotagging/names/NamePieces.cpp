@@ -8,11 +8,12 @@
 namespace qvct {
 
 NamePieces::Class NamePieces::classOf(std::int32_t character) {
-    constexpr std::int32_t sharpSign = 0x266F, rightQuote = 0x2019;
+    constexpr std::int32_t sharpSign = 0x266F, flatSign = 0x266D, rightQuote = 0x2019;
     if (character >= 'a' && character <= 'z') return Class::small;
     if (character >= 'A' && character <= 'Z') return Class::capital;
     if (character >= '0' && character <= '9') return Class::digit;
     if (character == '#' || character == sharpSign) return Class::sharp;
+    if (character == flatSign) return Class::flat;
     if (character == '(' || character == '[' || character == '{') return Class::open;
     if (character == ')' || character == ']' || character == '}') return Class::close;
     if (character == '\'' || character == rightQuote) return Class::apostrophe;
@@ -103,8 +104,9 @@ std::span<const NamePiece> NamePieces::read(std::string_view name) {
         } else if (kind == Class::digit) {
             end = endOfRun(at, kind);
             add(name, at, end, NamePiece::Kind::number, isInBrackets);
-        } else if (kind == Class::sharp) {
-            add(name, at, end, NamePiece::Kind::sharp, isInBrackets);
+        } else if (kind == Class::sharp || kind == Class::flat) {
+            add(name, at, end, kind == Class::sharp ? NamePiece::Kind::sharp : NamePiece::Kind::flat,
+                isInBrackets);
         } else if (kind == Class::open || kind == Class::close) {
             isInBrackets = kind == Class::open;
         }

@@ -8,9 +8,9 @@
 
 namespace qvct {
 
-/// A piece of a name, as people read it: a word, a number or a sharp sign.
+/// A piece of a name, as people read it: a word, a number, a sharp or a flat sign.
 struct NamePiece {
-    enum class Kind : std::uint8_t { word, number, sharp };
+    enum class Kind : std::uint8_t { word, number, sharp, flat };
 
     std::string_view text;     ///< As it stands in the name.
     std::string_view folded;   ///< The same without case and diacritics.
@@ -46,6 +46,7 @@ class NamePieces {
         digit,
         mark,
         sharp,
+        flat,
         open,
         close,
         apostrophe,

@@ -5,6 +5,7 @@
 
 #include <algorithm>
 #include <array>
+#include <cstdlib>
 
 namespace qvct {
 namespace {
@@ -52,6 +53,8 @@ double NameReader::confidenceOf(NameStrength strength) const {
             return weights_.word;
         case NameStrength::abbreviation:
             return weights_.abbreviation;
+        case NameStrength::likeness:
+            return weights_.likeness;
         case NameStrength::hint:
             return weights_.hint;
     }
@@ -60,6 +63,7 @@ double NameReader::confidenceOf(NameStrength strength) const {
 
 NameReading NameReader::read(std::span<const std::string_view> names) {
     NameReading reading;
+    combinable_.clear();
     bool hasKey = false;
     for (std::size_t i = 0; i < names.size(); ++i) {
         const std::string_view name = names[i];
@@ -79,11 +83,12 @@ NameReading NameReader::read(std::span<const std::string_view> names) {
             TagClaim& claim = claims.add(i > 0 ? meaning.inFolders : meaning.label, meant.offset, meant.end,
                                          isFigure ? std::min(confidence, weights_.figure) : confidence);
             claim.level = meaning.level;
+            if (!meaning.combinations.empty()) combinable_.push_back({reading.claims.size() - 1, &meaning});
             claim.isHead = meant.end == scan.meant().back().end;
         }
         for (const auto& [offset, end] : scan.silences()) reading.silences.push_back({distance, offset, end});
         // What the name itself says of these holds whatever its folders say.
-        if (!reading.tempo) reading.tempo = scan.tempo();
+        if (!reading.tempo) reading.tempo = scan.tempo(reading.kind);
         if (reading.kind == SoundKind::unsaid) reading.kind = scan.kind();
         if (!reading.bars) reading.bars = scan.bars();
         if (!reading.beats) reading.beats = scan.beats();
@@ -96,6 +101,7 @@ NameReading NameReader::read(std::span<const std::string_view> names) {
     if (reading.tempo) reading.possibleTempos.clear();
     const bool hasLength = reading.bars || reading.beats;
     if (reading.kind == SoundKind::unsaid && hasLength) reading.kind = SoundKind::loop;
+    combine(reading);
     return reading;
 }
 
@@ -105,6 +111,36 @@ bool NameReader::isForeign(const NamedMeaning& meaning, std::span<const NamingHa
         const std::string& root = habits_->meaning(word.meaning).root;
         return root == meaning.root || weights_.goTogether(root, meaning.root);
     });
+}
+
+/// Of a bass in a folder of synthesizers: that it is a synth bass, as surely as the less sure of both says
+/// so.
+void NameReader::combine(NameReading& reading) const {
+    const std::size_t count = reading.claims.size();
+    for (const auto& [number, meaning] : combinable_) {
+        for (std::size_t i = 0; i < count; ++i) {
+            if (std::abs(reading.claims[i].distance - reading.claims[number].distance) > 1) continue;
+            const double confidence =
+                std::min(reading.claims[number].confidence, reading.claims[i].confidence);
+            for (const auto& [with, label] : meaning->combinations)
+                if (reading.claims[i].label == with) combine(reading, number, label, confidence);
+        }
+    }
+}
+
+void NameReader::combine(NameReading& reading, std::size_t number, const std::string& label,
+                         double confidence) {
+    const auto known = std::find_if(reading.claims.begin(), reading.claims.end(), [&](const TagClaim& claim) {
+        return claim.label == label && claim.distance == reading.claims[number].distance;
+    });
+    if (known != reading.claims.end()) {
+        known->confidence = std::max(known->confidence, confidence);
+        return;
+    }
+    TagClaim claim = reading.claims[number];
+    claim.label = label;
+    claim.confidence = confidence;
+    reading.claims.push_back(std::move(claim));
 }
 
 }  // namespace qvct

@@ -51,12 +51,22 @@ class NameReader {
     NameReading read(std::span<const std::string_view> names);
 
   private:
+    /// A claim that may be one for something finer.
+    struct Combinable {
+        std::size_t claim;
+        const NamedMeaning* meaning;
+    };
+
     double confidenceOf(NameStrength strength) const;
     bool isForeign(const NamedMeaning& meaning, std::span<const NamingHabits::Word> prefix) const;
+    void combine(NameReading& reading) const;
+    static void combine(NameReading& reading, std::size_t number, const std::string& label,
+                        double confidence);
 
     std::shared_ptr<const NamingHabits> habits_;
     EvidenceWeights weights_;
     NamePieces pieces_;
+    std::vector<Combinable> combinable_;
     std::string buffer_;
 };
 

@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <bit>
 #include <charconv>
+#include <cmath>
 
 namespace qvct {
 namespace {
@@ -13,6 +14,7 @@ namespace {
 using Pieces = std::span<const NamePiece>;
 using Word = NamingHabits::Word;
 
+constexpr std::string_view kPart = "Part";  // the category
 constexpr double kSlowest = 40, kFastest = 250;
 
 /// What stands alone, without "bpm", is a tempo only in the range of dance and film music.
@@ -160,11 +162,30 @@ void NameScan::addWordsIn(const Word& phrase, std::span<const NamePiece> pieces)
 
 std::size_t NameScan::readKey(std::size_t at, const NamedKey& key) {
     hasNote_ = hasNote_ || key.hasOctave;
-    const bool isBehindPitched = at > 0 && !meant_.empty() && meant_.back().end == pieces_[at - 1].end() &&
+    // "Pad D", "Drone in D"
+    const std::size_t front = at > 1 && pieces_[at - 1].folded == "in" ? at - 1 : at;
+    const bool isBehindPitched = front > 0 && !meant_.empty() &&
+                                 meant_.back().end == pieces_[front - 1].end() &&
                                  habits_.meaning(meant_.back().word.meaning).isPitched;
-    if (!key.hasOctave) keys_.push_back({key, at, before_ == NameRole::key, isBehindPitched});
+    if (!key.hasOctave)
+        keys_.push_back({key, at, before_ == NameRole::key, isBehindPitched, isVariantAt(at, key)});
     before_ = NameRole::none;
     return key.pieces;
+}
+
+/// A letter beside a word for variants or strings tells which; beside the word for a wind instrument, how it
+/// is tuned.
+bool NameScan::isVariantAt(std::size_t at, const NamedKey& key) const {
+    if (key.mode != NamedKey::Mode::unsaid || key.isSpelledOut) return false;
+    const std::size_t behind = at + key.pieces;
+    const Word next = behind < pieces_.size() ? habits_.wordAt(pieces_.subspan(behind), buffer_) : Word{};
+    if (!key.hasAccidental && (before_ == NameRole::variant || next.role == NameRole::variant)) return true;
+    const auto isTransposing = [this](const Word& word) {
+        return word.meaning != Word::kNoMeaning && habits_.meaning(word.meaning).isTransposing;
+    };
+    if (isTransposing(next)) return true;
+    return at > 1 && pieces_[at - 1].folded == "in" && !meant_.empty() &&
+           meant_.back().end == pieces_[at - 2].end() && isTransposing(meant_.back().word);
 }
 
 std::size_t NameScan::readNumber(std::size_t at) {
@@ -185,7 +206,8 @@ std::size_t NameScan::readNumber(std::size_t at) {
 
 std::size_t NameScan::readPacked(std::size_t at) {
     noteKindInside(pieces_[at]);
-    const auto [first, second] = habits_.packedWords(pieces_[at].folded);
+    auto [first, second] = habits_.packedWords(pieces_[at].folded);
+    if (first.pieces == 0) first = habits_.nearWord(pieces_[at]);
     for (const Word& word : {first, second}) {
         if (word.pieces == 0) break;
         noteKind(word.role);
@@ -194,13 +216,15 @@ std::size_t NameScan::readPacked(std::size_t at) {
     return 1;
 }
 
-std::optional<double> NameScan::tempo() const {
+std::optional<double> NameScan::tempo(SoundKind kind) const {
     const auto said =
         std::find_if(tempos_.begin(), tempos_.end(), [](const Tempo& tempo) { return tempo.isSaid; });
     if (said != tempos_.end()) return said->number;
     const bool hasSureKey = std::any_of(
         keys_.begin(), keys_.end(), [](const Key& key) { return key.key.mode != NamedKey::Mode::unsaid; });
-    if ((!isLoop() && !hasSureKey) || saysOneShot_) return std::nullopt;
+    // "Jungle/160/think loop.wav"
+    const bool isAllOfLoop = kind == SoundKind::loop && pieces_.size() == 1;
+    if ((!isLoop() && !hasSureKey && !isAllOfLoop && !saysPassage()) || saysOneShot_) return std::nullopt;
     std::optional<double> alone;
     for (const Tempo& tempo : tempos_) {
         if (!canStandAlone(tempo.number)) continue;
@@ -232,7 +256,7 @@ std::optional<NamedKey> NameScan::key() const {
 /// in brackets or at the end; one layer of an instrument plays a note. "A Day", "Take C", "3 AM" and "Plan B"
 /// are none.
 bool NameScan::canStand(const Key& key) const {
-    if (hasNote_) return false;
+    if (hasNote_ || key.isVariant) return false;
     if (key.isAnnounced) return true;
     const bool isOfMusic = isLoop() || tempo().has_value();
     if (isLayer_ && !isOfMusic) return false;
@@ -249,10 +273,18 @@ bool NameScan::canStand(const Key& key) const {
     if (key.key.isSpelledOut) return isCapital || isOfMusic || isSyllable;
     if (key.key.mode != NamedKey::Mode::unsaid)
         return isOfMusic || (isCapital && (isSetApart || key.isBehindPitched));
-    const bool hasSign = key.key.pieces > 1 && pieces_[key.piece + 1].kind == NamePiece::Kind::sharp;
+    const bool hasSign = key.key.pieces > 1 && !pieces_[key.piece + 1].isWord();
     if (key.key.hasAccidental)
         return isOfMusic || (isCapital && (isSetApart || hasSign || key.isBehindPitched));
     return isCapital && key.piece > 0 && canLetterStand(key);
+}
+
+/// Music that is played, which has a tempo as a loop has: "Melody 120".
+bool NameScan::saysPassage() const {
+    return std::any_of(meant_.begin(), meant_.end(), [&](const Meant& meant) {
+        const NamedMeaning& meaning = habits_.meaning(meant.word.meaning);
+        return meaning.category == kPart && meaning.isPitched;
+    });
 }
 
 bool NameScan::saysPitched() const {
@@ -260,10 +292,38 @@ bool NameScan::saysPitched() const {
                        [&](const Meant& meant) { return habits_.meaning(meant.word.meaning).isPitched; });
 }
 
+/// "G-House", and the article in "Like A Synth".
+bool NameScan::beginsWord(const Key& key) const {
+    const std::size_t behind = key.piece + key.key.pieces;
+    if (behind >= pieces_.size() || !pieces_[behind].isWord()) return false;
+    const NamePiece& letter = pieces_[key.piece];
+    if (letter.end() + 1 != pieces_[behind].offset) return false;
+    const char mark = name_[letter.end()];
+    const char markBefore = letter.offset > 0 ? name_[letter.offset - 1] : '\0';
+    return (mark == '-' && markBefore != '-') || (mark == ' ' && markBefore == ' ' && letter.text == "A");
+}
+
+/// "Loop 01 A", "D50", "A_B": which of several, or a part of a number.
+bool NameScan::numbers(const Key& key) const {
+    const NamePiece& before = pieces_[key.piece - 1];
+    const std::size_t behind = key.piece + key.key.pieces;
+    const NamePiece* next = behind < pieces_.size() ? &pieces_[behind] : nullptr;
+    const auto isLoneLetter = [](const NamePiece& piece) {
+        return isLetter(piece) && piece.folded >= "a" && piece.folded <= "g";
+    };
+    const auto isTempo = [&](const NamePiece& piece) {
+        const auto number = numberAt({&piece, 1}, name_);
+        return number && tempo() && *number == std::floor(*tempo());
+    };
+    if (isLoneLetter(before) || (next != nullptr && isLoneLetter(*next))) return true;
+    if (before.isNumber() && !isTempo(before)) return true;
+    return next != nullptr && next->isNumber() && next->isJoined && !isTempo(*next);
+}
+
 /// "Loop_A" and "Plan B" are variants of something; drums have no key.
 bool NameScan::canLetterStand(const Key& key) const {
     const NamePiece& before = pieces_[key.piece - 1];
-    if (habits_.roleOf(before.folded) == NameRole::loop) return false;
+    if (habits_.roleOf(before.folded) == NameRole::loop || beginsWord(key) || numbers(key)) return false;
     const bool isOfPitched = saysPitched();
     const bool isLast = key.piece + key.key.pieces == pieces_.size();
     if (isOfPitched && (isLoop() || tempo() || (key.isBehindPitched && isLast))) return true;

@@ -52,7 +52,8 @@ class NameScan {
     std::optional<int> bars() const { return bars_; }
     std::optional<int> beats() const { return beats_; }
     /// Nothing when the name says none, or several.
-    std::optional<double> tempo() const;
+    /// `kind`: what names nearer to the item say.
+    std::optional<double> tempo(SoundKind kind = SoundKind::unsaid) const;
     /// The numbers that might be one if more spoke for it.
     std::vector<double> possibleTempos() const;
     std::optional<NamedKey> key() const;
@@ -63,6 +64,7 @@ class NameScan {
         std::size_t piece;
         bool isAnnounced;  // by "key"
         bool isBehindPitched;
+        bool isVariant;  // "Take C", "E string", "Clarinet in B"
     };
 
     std::size_t readPrefix();
@@ -75,12 +77,16 @@ class NameScan {
     void noteUnit(std::size_t at, NameRole role);
     bool isOfMaker(std::uint32_t offset) const;
     std::size_t readKey(std::size_t at, const NamedKey& key);
+    bool isVariantAt(std::size_t at, const NamedKey& key) const;
     std::size_t readNumber(std::size_t at);
     std::size_t readPacked(std::size_t at);
     bool isLoop() const { return saysLoop_ || bars_ || beats_; }
     bool canStand(const Key& key) const;
+    bool saysPassage() const;
     bool saysPitched() const;
     bool canLetterStand(const Key& key) const;
+    bool beginsWord(const Key& key) const;
+    bool numbers(const Key& key) const;
 
     const NamingHabits& habits_;
     std::string_view name_;

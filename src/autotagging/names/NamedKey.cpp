@@ -4,6 +4,7 @@
 #include "autotagging/names/NamingHabits.h"
 
 #include <array>
+#include <string>
 #include <string_view>
 
 namespace qvct {
@@ -58,7 +59,7 @@ class KeyParser {
         if (consume(rest, "sharp")) shift(1);
         if (!key_.hasAccidental && (consume(rest, "flat") || consume(rest, "b"))) shift(-1);
         if (!rest.empty() && !takeMode(rest)) return std::nullopt;
-        if (key_.mode == NamedKey::Mode::unsaid) takeFollowing();
+        if (key_.mode == NamedKey::Mode::unsaid && !key_.isSpelledOut) takeFollowing();
         return key_;
     }
 
@@ -81,20 +82,19 @@ class KeyParser {
             key_.mode = NamedKey::Mode::minor;
             return true;
         }
-        const NameRole role = habits_.roleOf(word);
+        return takeMode(habits_.roleOf(word));
+    }
+
+    bool takeMode(NameRole role) {
         if (role == NameRole::major) key_.mode = NamedKey::Mode::major;
         if (role == NameRole::minor) key_.mode = NamedKey::Mode::minor;
         key_.isSpelledOut = role == NameRole::major || role == NameRole::minor || role == NameRole::scale;
         return key_.isSpelledOut;
     }
 
-    /// The pieces behind the letter: "#", "3", "flat", "minor".
+    /// The pieces behind the letter: "#", "3", "flat", "minor", "harmonic minor".
     void takeFollowing() {
-        if (has(key_.pieces) && next().kind == NamePiece::Kind::sharp && next().isJoined &&
-            !key_.hasAccidental) {
-            shift(1);
-            ++key_.pieces;
-        }
+        takeSign();
         if (has(key_.pieces) && next().isJoined && next().isNumber() && next().text.size() == 1) {
             key_.hasOctave = true;
             ++key_.pieces;
@@ -108,8 +108,21 @@ class KeyParser {
             }
         }
         if (!has(key_.pieces) || !next().isWord()) return;
-        const bool isLetter = next().folded == "m";
-        if ((!isLetter || (next().isJoined && next().text == "m")) && takeMode(next().folded)) ++key_.pieces;
+        if (next().folded == "m") {
+            if (next().isJoined && next().text == "m" && takeMode("m")) ++key_.pieces;
+            return;
+        }
+        std::string buffer;
+        const NamingHabits::Word word = habits_.wordAt(pieces_.subspan(key_.pieces), buffer);
+        if (word.pieces > 0 && takeMode(word.role)) key_.pieces += word.pieces;
+    }
+
+    void takeSign() {
+        if (!has(key_.pieces) || key_.hasAccidental || !next().isJoined) return;
+        const bool isSharp = next().kind == NamePiece::Kind::sharp;
+        if (!isSharp && next().kind != NamePiece::Kind::flat) return;
+        shift(isSharp ? 1 : -1);
+        ++key_.pieces;
     }
 
     bool has(std::size_t at) const { return at < pieces_.size(); }

@@ -25,8 +25,8 @@ struct NamedKey {
     std::uint32_t end = 0;
 };
 
-/// The key that begins with the first piece: "A", "Bb", "C#m", "F# minor", "Ebmaj", "A_min", "a moll", "8A".
-/// Nothing when no key is spelled there. Whether one can stand there is not judged.
+/// The key that begins with the first piece: "A", "Bb", "C#m", "F# minor", "Ebmaj", "A_min", "a moll", "E
+/// harmonic minor", "8A". Nothing when no key is spelled there. Whether one can stand there is not judged.
 std::optional<NamedKey> namedKeyAt(std::span<const NamePiece> pieces, const NamingHabits& habits);
 
 }  // namespace qvct

@@ -10,11 +10,12 @@
 #include "resources/ReplacementFile.h"
 #include "taxonomy/TGRTTaxonomy.h"
 #include "taxonomy/TagNormalization.h"
+#include "taxonomy/TaggingTypes.h"
 
 #include <algorithm>
 #include <array>
 #include <map>
-#include <unordered_set>
+#include <set>
 
 #include <fmt/format.h>
 
@@ -48,7 +49,7 @@ struct RoleList {
     std::string_view key;  // empty: the part is the list itself
     NameRole role;
 };
-constexpr std::array<RoleList, 16> kRoleLists = {{{"Kinds", "Loop", NameRole::loop},
+constexpr std::array<RoleList, 17> kRoleLists = {{{"Kinds", "Loop", NameRole::loop},
                                                   {"Kinds", "One Shot", NameRole::oneShot},
                                                   {"Modes", "Major", NameRole::major},
                                                   {"Modes", "Minor", NameRole::minor},
@@ -63,7 +64,8 @@ constexpr std::array<RoleList, 16> kRoleLists = {{{"Kinds", "Loop", NameRole::lo
                                                   {"Lengths", "Beats", NameRole::beats},
                                                   {"Silent", "", NameRole::silent},
                                                   {"Packs", "", NameRole::pack},
-                                                  {"Keys", "", NameRole::key}}};
+                                                  {"Keys", "", NameRole::key},
+                                                  {"Variants", "", NameRole::variant}}};
 
 }  // namespace
 
@@ -75,13 +77,15 @@ class NamingHabitsReader {
 
     bool add(const Dictionary& dictionary, Error* error) {
         ++source_;
-        addNames(dictionary, "Pitched", pitched_);
-        addNames(dictionary, "Figurative", figurative_);
-        addNames(dictionary, "Categories", categories_);
+        addNames(dictionary.array("Pitched"), pitched_);
+        addNames(dictionary.array("Figurative"), figurative_);
+        addNames(dictionary.array("Transposing"), transposing_);
+        addNames(dictionary.array("Categories"), categories_);
         if (const Dictionary* labels = dictionary.dictionary("InFolders"))
             for (const auto& [label, value] : *labels)
                 if (value.string() != nullptr) inFolders_[label] = *value.string();
-        return addNotes(dictionary, error) && addRoles(dictionary, error) && addMeanings(dictionary, error) &&
+        return addCombinations(dictionary, error) && addNotes(dictionary, error) &&
+               addRoles(dictionary, error) && addMeanings(dictionary, error) &&
                addPrograms(dictionary, error) && addPrefixes(dictionary, error);
     }
 
@@ -99,23 +103,44 @@ class NamingHabitsReader {
     std::shared_ptr<const NamingHabits> finish() && {
         for (NamedMeaning& meaning : habits_->meanings_) {
             meaning.isPitched = belongsTo(pitched_, meaning.label);
+            meaning.isTransposing = belongsTo(transposing_, meaning.label);
             meaning.isFigurative = belongsTo(figurative_, meaning.label);
             meaning.root = taxonomy_.findTagForLabel(meaning.label)->rootTag()->label();
             const auto found = inFolders_.find(meaning.label);
             meaning.inFolders = found == inFolders_.end() ? meaning.label : found->second;
+            const auto combined = combinations_.find(meaning.label);
+            if (combined != combinations_.end()) meaning.combinations = combined->second;
         }
+        addNearWords();
         return std::move(habits_);
     }
 
   private:
     using Word = NamingHabits::Word;
-    using Names = std::unordered_set<std::string>;
+    using Names = std::set<std::string>;
 
-    static void addNames(const Dictionary& dictionary, std::string_view key, Names& names) {
-        const PropertyList::Array* list = dictionary.array(key);
-        if (list == nullptr) return;
+    static bool addNames(const PropertyList::Array* list, Names& names) {
+        if (list == nullptr) return false;
         for (const PropertyList& name : *list)
             if (name.string() != nullptr) names.insert(*name.string());
+        return true;
+    }
+
+    /// A label stands for each pair of those in its two lists.
+    bool addCombinations(const Dictionary& dictionary, Error* error) {
+        const Dictionary* combined = dictionary.dictionary("Combined");
+        if (combined == nullptr) return true;
+        return std::all_of(combined->begin(), combined->end(), [&](const auto& entry) {
+            const PropertyList::Array* lists = entry.value.array();
+            Names parts, others;
+            if (lists == nullptr || lists->size() != 2 || !addNames((*lists)[0].array(), parts) ||
+                !addNames((*lists)[1].array(), others))
+                return fail(error, kErrorMalformed, "is no pair of lists of labels", {.part = entry.key});
+            if (!taxonomy_.findTagForLabel(entry.key)) return true;
+            for (const std::string& part : parts)
+                for (const std::string& other : others) combinations_[part].push_back({other, entry.key});
+            return true;
+        });
     }
 
     bool addNotes(const Dictionary& dictionary, Error* error) {
@@ -228,6 +253,14 @@ class NamingHabitsReader {
                         {.part = entry});
         }
         if (place->source == source_ && saysTheSame(place->word, word)) return true;
+        // An instrument's string is one of several, too.
+        const bool isVariant = place->source == source_ && place->word.role == NameRole::variant &&
+                               place->word.meaning == Word::kNoMeaning;
+        if (isVariant && word.meaning != Word::kNoMeaning) {
+            word.role = NameRole::variant;
+            place->word = word;
+            return true;
+        }
         if (place->source == source_ && place->word.strength == NameStrength::hint) {
             std::swap(place->word, word);
             std::swap(place->word.other, word.other);
@@ -294,6 +327,14 @@ class NamingHabitsReader {
         return &habits_->entries_[phrase];
     }
 
+    /// In an order of their own, for that of a hash table is none.
+    void addNearWords() {
+        std::map<std::string_view, std::string_view> labels;
+        for (const auto& [text, entry] : habits_->entries_)
+            if (habits_->isInstrument(entry.word)) labels[text] = habits_->meaning(entry.word.meaning).label;
+        for (const auto& [text, label] : labels) habits_->near_.add(text, label);
+    }
+
     bool belongsTo(const Names& labels, const std::string& label) const {
         for (auto tag = taxonomy_.findTagForLabel(label); tag; tag = tag->parent())
             if (labels.contains(tag->label())) return true;
@@ -305,8 +346,10 @@ class NamingHabitsReader {
     NamePieces pieces_;
     Names pitched_;
     Names figurative_;
+    Names transposing_;
     Names categories_;
     std::map<std::string, std::string> inFolders_;
+    std::map<std::string, std::vector<NamedMeaning::Combination>> combinations_;
     std::uint8_t source_ = 0;
 };
 
@@ -378,6 +421,29 @@ std::pair<NamingHabits::Word, NamingHabits::Word> NamingHabits::packedWords(std:
         const Word* first = plain(folded.substr(0, at));
         const Word* second = first == nullptr ? nullptr : plain(folded.substr(at));
         if (second != nullptr) return {*first, *second};
+    }
+    return {};
+}
+
+bool NamingHabits::isInstrument(const Word& word) const {
+    return word.pieces == 1 && word.strength == NameStrength::word && word.meaning != Word::kNoMeaning &&
+           meanings_[word.meaning].category == QVCategorySourceIdentifier;
+}
+
+NamingHabits::Word NamingHabits::nearWord(const NamePiece& piece) const {
+    constexpr std::size_t shortestEnd = 4, longest = 24;
+    // "FMbass" is split before the M.
+    const std::size_t shortestStart = piece.isJoined ? 1 : 2;
+    const std::string_view folded = piece.folded;
+    const auto like = [](Word word) {
+        word.strength = NameStrength::likeness;
+        return word;
+    };
+    if (const std::string* word = near_.wordFor(folded)) return like(find(*word)->word);
+    if (folded.size() > longest) return {};
+    for (std::size_t at = shortestStart; at + shortestEnd <= folded.size(); ++at) {
+        const Word* word = findWord(folded.substr(at));
+        if (word != nullptr && isInstrument(*word)) return like(*word);
     }
     return {};
 }

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "autotagging/names/NearWords.h"
 #include "platform/base/Error.h"
 #include "platform/data/PropertyList.h"
 
@@ -19,17 +20,25 @@ class TGRTTaxonomy;
 struct NamePiece;
 
 /// How plainly a word says what it says.
-enum class NameStrength : std::uint8_t { word, abbreviation, hint };
+enum class NameStrength : std::uint8_t { word, abbreviation, likeness, hint };
 
 /// A tag that a word or phrase of a name stands for.
 struct NamedMeaning {
+    /// What it is if another thing is said as well: a bass that is a synth is a synth bass.
+    struct Combination {
+        std::string with;
+        std::string label;
+    };
+
     std::string label;
     std::optional<double> level;
     std::string category;
-    std::string root;           ///< The outermost of its parents, or itself.
-    bool isPitched = false;     ///< Something that plays notes.
-    bool isFigurative = false;  ///< Its words often only describe something else.
-    std::string inFolders;      ///< The label that stands for it in a folder's name.
+    std::string root;            ///< The outermost of its parents, or itself.
+    bool isPitched = false;      ///< Something that plays notes.
+    bool isTransposing = false;  ///< An instrument that may be called by its own key ("Clarinet in Bb").
+    bool isFigurative = false;   ///< Its words often only describe something else.
+    std::string inFolders;       ///< The label that stands for it in a folder's name.
+    std::vector<Combination> combinations;
 };
 
 /// What else a word of a name may be.
@@ -50,7 +59,8 @@ enum class NameRole : std::uint8_t {
     beats,
     silent,
     pack,
-    key
+    key,
+    variant
 };
 
 /// How people name sounds: which words, abbreviations and phrases stand for which tags, and which words say
@@ -97,6 +107,9 @@ class NamingHabits {
     /// The two words that a piece is packed together from ("snareroll"), or the one phrase ("deephouse"); the
     /// first has no pieces when it is neither.
     std::pair<Word, Word> packedWords(std::string_view folded) const;
+    /// The instrument that a piece which is no word itself may stand for: a word that is shortened or
+    /// misspelled ("harmnica"), or the one that it ends with ("hoarseorgan"). Without pieces when none.
+    Word nearWord(const NamePiece& piece) const;
 
     /// The labels that a whole text says plainly or by an abbreviation: Kick for "bd" and "bass drum".
     std::vector<std::string> labelsMeant(std::string_view text) const;
@@ -117,12 +130,15 @@ class NamingHabits {
     const Entry* find(std::string_view text) const;
     /// Plurals included.
     const Word* findWord(std::string_view text) const;
+    /// A single word that says plainly that something is an instrument.
+    bool isInstrument(const Word& word) const;
 
     std::vector<NamedMeaning> meanings_;
     std::vector<Word> others_;
     std::map<std::string, int, std::less<>> notes_;
     Entries entries_;
     Prefixes prefixes_;
+    NearWords near_;
 
     friend class NamingHabitsReader;
 };
