@@ -82,7 +82,7 @@ TEST(Names, AreReadAsPeopleWriteThem) {
         {"Bell\xff"
          "Clap",
          {"Bells", "Claps"}},
-        {"ANMLDog_Big Dog Barking_MK_LIB", {"Nature"}},
+        {"ANMLBat_Flutter In A Cave_MK_LIB", {"Nature"}},
         {"AMBForst-Dusk_Quiet Woods_Kick_Snare", {"Atmosphere", "Nature", "Sound Effects"}},
         {"GLASCrsh_Window Crash", {"Sound Effects"}},
         {"VOXFem_Woman Calls", {"Female Voice", "Sound Effects"}},
