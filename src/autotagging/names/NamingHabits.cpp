@@ -431,21 +431,13 @@ bool NamingHabits::isInstrument(const Word& word) const {
 }
 
 NamingHabits::Word NamingHabits::nearWord(const NamePiece& piece) const {
-    constexpr std::size_t shortestEnd = 4, longest = 24;
+    const std::string* known = near_.wordFor(piece.folded);
     // "FMbass" is split before the M.
-    const std::size_t shortestStart = piece.isJoined ? 1 : 2;
-    const std::string_view folded = piece.folded;
-    const auto like = [](Word word) {
-        word.strength = NameStrength::likeness;
-        return word;
-    };
-    if (const std::string* word = near_.wordFor(folded)) return like(find(*word)->word);
-    if (folded.size() > longest) return {};
-    for (std::size_t at = shortestStart; at + shortestEnd <= folded.size(); ++at) {
-        const Word* word = findWord(folded.substr(at));
-        if (word != nullptr && isInstrument(*word)) return like(*word);
-    }
-    return {};
+    if (known == nullptr) known = near_.wordAtEndOf(piece.folded, piece.isJoined ? 1 : 2);
+    if (known == nullptr) return {};
+    Word word = find(*known)->word;
+    word.strength = NameStrength::likeness;
+    return word;
 }
 
 std::vector<std::string> NamingHabits::labelsMeant(std::string_view text) const {

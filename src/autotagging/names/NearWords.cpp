@@ -1,12 +1,14 @@
 #include "autotagging/names/NearWords.h"
 
 #include <algorithm>
+#include <bit>
 #include <optional>
 
 namespace qvct {
 namespace {
 
 constexpr std::size_t kShortestWord = 5, kShortestPiece = 4, kLongest = 24;
+constexpr std::size_t kEnding = 4;
 constexpr int kTooFar = 3;
 
 bool isLatin(std::string_view text) {
@@ -15,6 +17,12 @@ bool isLatin(std::string_view text) {
 
 bool isVowel(char letter) {
     return std::string_view("aeiouy").find(letter) != std::string_view::npos;
+}
+
+std::uint32_t lettersOf(std::string_view text) {
+    std::uint32_t letters = 0;
+    for (const char letter : text) letters |= std::uint32_t{1} << static_cast<unsigned>(letter - 'a');
+    return letters;
 }
 
 /// How many consonants a word loses when nothing but letters are left out; nothing when it is not so. One of
@@ -65,8 +73,11 @@ int farness(std::string_view piece, std::string_view word) {
 }  // namespace
 
 void NearWords::add(std::string_view word, std::string_view label) {
-    if (word.size() < kShortestWord || word.size() > kLongest || !isLatin(word)) return;
-    words_[static_cast<std::size_t>(word.front() - 'a')].push_back({std::string(word), std::string(label)});
+    if (word.size() < kEnding || word.size() > kLongest || !isLatin(word)) return;
+    endings_[std::string(word.substr(word.size() - kEnding))].emplace_back(word);
+    if (word.size() < kShortestWord) return;
+    words_[static_cast<std::size_t>(word.front() - 'a')].push_back(
+        {std::string(word), std::string(label), lettersOf(word)});
 }
 
 const std::string* NearWords::wordFor(std::string_view folded) const {
@@ -74,7 +85,9 @@ const std::string* NearWords::wordFor(std::string_view folded) const {
     int nearest = kTooFar;
     const Known* found = nullptr;
     bool isUnclear = false;
+    const std::uint32_t letters = lettersOf(folded);
     for (const Known& known : words_[static_cast<std::size_t>(folded.front() - 'a')]) {
+        if (std::popcount(letters & ~known.letters) > 1 || known.word.size() + 1 < folded.size()) continue;
         const int far = farness(folded, inTheSingular(known.word, folded));
         if (far > nearest || far == kTooFar) continue;
         isUnclear = far == nearest && (isUnclear || found->label != known.label);
@@ -82,6 +95,25 @@ const std::string* NearWords::wordFor(std::string_view folded) const {
         nearest = far;
     }
     return isUnclear || found == nullptr ? nullptr : &found->word;
+}
+
+const std::string* NearWords::wordAtEndOf(std::string_view folded, std::size_t lettersBefore) const {
+    if (folded.size() > kLongest) return nullptr;
+    const std::string* found = ending(folded, lettersBefore);
+    if (found != nullptr || !folded.ends_with('s')) return found;
+    return ending(folded.substr(0, folded.size() - 1), lettersBefore);
+}
+
+const std::string* NearWords::ending(std::string_view folded, std::size_t lettersBefore) const {
+    if (folded.size() < kEnding + lettersBefore) return nullptr;
+    const auto found = endings_.find(std::string(folded.substr(folded.size() - kEnding)));
+    if (found == endings_.end()) return nullptr;
+    const std::string* longest = nullptr;
+    for (const std::string& word : found->second) {
+        const bool isAtEnd = word.size() + lettersBefore <= folded.size() && folded.ends_with(word);
+        if (isAtEnd && (longest == nullptr || word.size() > longest->size())) longest = &word;
+    }
+    return longest;
 }
 
 }  // namespace qvct
