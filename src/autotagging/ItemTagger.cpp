@@ -4,9 +4,12 @@
 #include "autotagging/QVTaggingAggregator.h"
 #include "autotagging/names/NameReader.h"
 #include "autotagging/services/QVCTAutoTaggingService.h"
+#include "metadata/TGRTMetaData.h"
+#include "platform/base/Printable.h"
 #include "taxonomy/TaggingTypes.h"
 
 #include <algorithm>
+#include <utility>
 
 #include <fmt/format.h>
 
@@ -86,10 +89,14 @@ class KeywordJudge {
     const TGRTTaxonomy& taxonomy_;
 };
 
+std::string_view nameOf(std::string_view folder) {
+    return folder.substr(folder.rfind('/') + 1);
+}
+
 SoundKind kindOf(const NameReading& reading, const std::vector<TagClaim>& claims) {
     if (reading.kind != SoundKind::unsaid) return reading.kind;
     const bool isOneShot = std::any_of(claims.begin(), claims.end(), [](const TagClaim& claim) {
-        return claim.label == kOneShot && claim.service == "content-type";
+        return claim.label == kOneShot && claim.service == "content-type" && claim.doubt.empty();
     });
     return isOneShot ? SoundKind::oneShot : SoundKind::unsaid;
 }
@@ -113,6 +120,30 @@ NameReader& ItemTagger::reader() {
     return *reader_;
 }
 
+Rejections ItemTagger::rejectionsOf(ContentItem& item, const ItemNames& names) {
+    Rejections rejections;
+    const auto record = item.record();
+    if (record && !record->rejectedLabels().empty())
+        rejections.add(std::make_shared<const Rejections::Labels>(record->rejectedLabels()), "in its record");
+    for (const std::string_view folder : names.folders()) {
+        if (auto labels = folders_.ofFolder(folder))
+            rejections.add(std::move(labels), fmt::format("in the folder \"{}\"", printable(nameOf(folder))));
+    }
+    if (!record || rejections.empty()) return rejections;
+    for (const auto& tagging : record->taggings())
+        if (!tagging->isAutoTagging()) rejections.except(*tagging->tag());
+    return rejections;
+}
+
+void ItemTagger::reject(std::vector<TagClaim>& claims, const Rejections& rejections) const {
+    if (rejections.empty()) return;
+    for (TagClaim& claim : claims) {
+        const auto tag = taxonomy_->findTagForLabel(claim.label);
+        std::string reason = tag ? rejections.reasonFor(*tag) : std::string();
+        if (!reason.empty()) claim.doubt = std::move(reason);
+    }
+}
+
 ItemReport ItemTagger::report(const std::shared_ptr<ContentItem>& item, const ItemNames& names,
                               std::uint64_t options) {
     ItemReport report;
@@ -126,6 +157,8 @@ ItemReport ItemTagger::report(const std::shared_ptr<ContentItem>& item, const It
             if (claim.service == kKeywords) judge.judge(claim);
         claims.insert(claims.end(), reading.claims.begin(), reading.claims.end());
     }
+    report.rejections = rejectionsOf(*item, names);
+    reject(claims, report.rejections);
     report.tempo = reading.tempo;
     report.kind = kindOf(reading, claims);
     report.resolution = resolver_.resolve(std::move(claims), report.kind);
