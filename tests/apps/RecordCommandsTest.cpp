@@ -163,6 +163,7 @@ TEST(Write, ADryRunRefusesWhatTheWriteRefuses) {
     items.folder.write("Taken.ostrax/Resources", "no folder");
     std::filesystem::permissions(items.folder.path("shot.aif"), std::filesystem::perms::owner_read);
     for (const std::vector<std::string>& change : {std::vector<std::string>{"--name", "a\x01"},
+                                                   {"--reject", "Kick"},
                                                    {"--add", "Genres/House"},
                                                    {"--name", "B", "--verify"}}) {
         std::vector<std::string> arguments = {"write", "--json", items.folder.path()};
