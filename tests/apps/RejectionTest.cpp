@@ -116,7 +116,9 @@ TEST(Reject, WhatIsSaidLastCounts) {
 
     // What a service stored becomes the person's own.
     write({"--add", "Source/Bass", item});
-    for (const json& tagging : recordOf(item)["taggings"]) EXPECT_EQ(tagging["auto"], false) << tagging;
+    const json record = recordOf(item);
+    EXPECT_EQ(labelsOf(record["taggings"]), (Labels{"Bass", "Kick"}));
+    for (const json& tagging : record["taggings"]) EXPECT_EQ(tagging["auto"], false) << tagging;
 }
 
 TEST(Reject, OfAFolderHoldsForWhatIsPutIntoItLater) {
