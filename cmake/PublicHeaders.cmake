@@ -42,6 +42,7 @@ set(QVCT_PUBLIC_HEADERS
   metadata/TGRTMetaData.h
   formats/ContentWalk.h
   formats/ContentWriters.h
+  formats/FolderRejections.h
   formats/ItemFile.h
   formats/LinkRule.h
   formats/QVContentEditorFileUtilities.h
@@ -59,6 +60,7 @@ set(QVCT_PUBLIC_HEADERS
   autotagging/ItemTagger.h
   autotagging/evidence/ClaimResolver.h
   autotagging/evidence/EvidenceWeights.h
+  autotagging/evidence/Rejections.h
   autotagging/evidence/SoundKind.h
   autotagging/evidence/TagClaim.h
   autotagging/names/ItemNames.h

@@ -47,6 +47,13 @@ void addTaggings(IndexedItem& item, Taggings& known, const Taggings& added, Prov
     }
 }
 
+Taggings withoutRejected(const Taggings& taggings, const Rejections& rejections) {
+    Taggings result;
+    for (const auto& tagging : taggings)
+        if (rejections.reasonFor(*tagging->tag()).empty()) result.insert(tagging);
+    return result;
+}
+
 /// The word, or the rule: what a person needs to understand the tag.
 std::string evidenceOf(const TagClaim& claim) {
     constexpr std::size_t longest = 80;
@@ -122,10 +129,13 @@ struct ContentDescriber::Implementation {
 
     void addAllTaggings(IndexedItem& item, const std::shared_ptr<ContentItem>& content,
                         const TGRTMetaData* record, const Taggings& withVirtual) {
+        const auto report = reportOf(content);
+        const Rejections rejections = report ? report->rejections : Rejections();
         Taggings known;
-        if (record != nullptr) addTaggings(item, known, record->taggings(), Provenance::stored);
-        addTaggings(item, known, withVirtual, Provenance::virtualTag);
-        if ((services & QVCTAutoTaggingOptionNames) != 0) return addDecided(item, known, content);
+        if (record != nullptr)
+            addTaggings(item, known, withoutRejected(record->taggings(), rejections), Provenance::stored);
+        addTaggings(item, known, withoutRejected(withVirtual, rejections), Provenance::virtualTag);
+        if (report) return addDecided(item, known, *report);
         for (const auto& [name, option] : kTaggingServiceNames) {
             if ((services & option) == 0) continue;
             addTaggings(item, known, aggregator->taggingsOfItem(content, *taxonomyOfServices, option),
@@ -144,9 +154,14 @@ struct ContentDescriber::Implementation {
         return root;
     }
 
-    void addDecided(IndexedItem& item, Taggings& known, const std::shared_ptr<ContentItem>& content) {
+    /// Nothing unless names are among the services: then all that they say holds.
+    std::optional<ItemReport> reportOf(const std::shared_ptr<ContentItem>& content) {
+        if ((services & QVCTAutoTaggingOptionNames) == 0) return std::nullopt;
         const std::string path = content->url().path();
-        const ItemReport report = tagger.report(content, ItemNames(path, rootOf(path)), services);
+        return tagger.report(content, ItemNames(path, rootOf(path)), services);
+    }
+
+    void addDecided(IndexedItem& item, Taggings& known, const ItemReport& report) {
         namedTempo = report.tempo;
         namedBeats = report.beats;
         for (const HeldTag& held : report.resolution.held) {

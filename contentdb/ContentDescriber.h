@@ -18,7 +18,8 @@ namespace qvct::contentdb {
 /// first of them. With naming habits among the services (QVCTAutoTaggingOptionNames) it is decided as
 /// `ItemTagger` does which of their tags hold; without them all do, the services in the order of
 /// `kTaggingServiceNames`, as the aggregator gives them. Labels that the taxonomy does not know are kept if
-/// they come from the record.
+/// they come from the record. Where it is decided, what a person rejected is left out, also of what services
+/// stored and of what follows from the record.
 ///
 /// Values are those of the record, without numbers that mean "unknown". "Tempo" and "BeatCount" may also come
 /// from chunks of other makers, and failing that the tempo from a name such as "Beat 122bpm".

@@ -90,7 +90,8 @@ struct IndexOptions {
 /// Brings the database up to date with the folders, making it if there is none.
 ///
 /// An item is read when it is new, when its size, times or inode have changed (or those of the record,
-/// description or preview beside it), or when another describer described it. Items are read in worker
+/// description or preview beside it), when something else is rejected for a folder that it lies in, or when
+/// another describer described it. Items are read in worker
 /// programs: one that crashes its worker, takes too long, or has a description of more than 16 MiB, is stored
 /// as failed and costs no other item. The workers are given the files that replace resources here, end with
 /// this process, and inherit none of its open files but standard error; what they log is logged here, from
@@ -102,7 +103,7 @@ struct IndexOptions {
 /// Nothing, and an error, when there is no such folder, the database cannot be written, another run is going
 /// on, or the worker program cannot be run. What was stored until then stays.
 /// @cost  One reading of the database file, 25 ms for 100,000 items. An unchanged folder: one listing and one
-///   look at each file. Memory is bounded whatever the size.
+///   look at each file and at what is said of the folder. Memory is bounded whatever the size.
 QVCT_API std::optional<IndexProgress> indexLibrary(const IndexOptions& options, Error* error = nullptr);
 
 /// The same in threads of this process, `IndexOptions::workers` of them, each with a describer that the

@@ -14,6 +14,8 @@ Dictionary stored(const TGRTMetaData& record) {
     Dictionary result = {{"Tagging", TGRTTagging::taggingDictionaryForTaggings(record.taggings())},
                          {"SubType", record.subFileType()},
                          {"Values", TGRTKeyValue::keyValueDictionaryForKeyValues(record.keyValues())},
+                         {"Rejected", PropertyList::Array(record.rejectedLabels().begin(),
+                                                          record.rejectedLabels().end())},
                          {"ContentInfo", record.contentInfo()->dictionary()}};
     if (record.displayName()) result.set("DisplayName", *record.displayName());
     return result;
@@ -24,6 +26,7 @@ std::string rewritten(PresetText preset, const TGRTMetaData& record) {
     setTaggings(preset, record.taggings());
     setContentInfo(preset, *record.contentInfo());
     setDescription(preset, record);
+    setRejectedLabels(preset, record.rejectedLabels());
     return preset.text();
 }
 

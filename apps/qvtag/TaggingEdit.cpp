@@ -56,6 +56,34 @@ std::string problemOf(std::string_view text, const std::optional<TagArgument>& r
                        similarTags(argument.label, taxonomy));
 }
 
+/// The label that a text names, alone or behind its category.
+struct NamedLabel {
+    std::string label;
+    std::string problem;  ///< Empty when nothing is wrong.
+};
+
+NamedLabel namedLabel(const std::string& text, bool creates) {
+    const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
+    const bool isText = isValidUtf8(text);
+    if (isText && taxonomy->findTagForLabel(text)) return {text, {}};
+    const auto argument = TagArgument::parse(text, false);
+    if (isText && !creates) {
+        if (argument) return {argument->label, problemOf(text, argument, false)};
+        return {{}, fmt::format("no tag \"{}\"{}", printable(text), similarTags(text, taxonomy))};
+    }
+    std::string label = isText ? normalizedTagString(argument ? argument->label : text) : std::string();
+    std::string problem = label.empty() ? fmt::format("\"{}\" is no label", printable(text)) : std::string();
+    return {std::move(label), std::move(problem)};
+}
+
+/// Whether it is one of the labels, or below one.
+bool isAtOrBelow(const TGRTTagging& tagging, const std::set<std::string>& labels) {
+    if (labels.contains(tagging.label())) return true;
+    const auto above = tagging.tag()->ancestors();
+    return std::any_of(above.begin(), above.end(),
+                       [&labels](const auto& tag) { return labels.contains(tag->label()); });
+}
+
 bool isOfTag(const TGRTTagging& tagging, std::string_view category, std::string_view label) {
     return tagging.category() == category && tagging.label() == label;
 }
@@ -107,14 +135,32 @@ std::string TaggingEdit::remove(const std::string& text) {
     return isAdded ? fmt::format("\"{}\" is both added and removed", printable(text)) : "";
 }
 
-std::optional<TaggingEdit> TaggingEdit::make(const std::vector<std::string>& add,
-                                             const std::vector<std::string>& remove, bool creates,
-                                             ToolContext& context) {
+std::string TaggingEdit::reject(const std::string& text, bool creates) {
+    NamedLabel named = namedLabel(text, creates);
+    if (!named.problem.empty()) return named.problem;
+    rejected_.insert(std::move(named.label));
+    const bool isAdded = std::any_of(added_.begin(), added_.end(),
+                                     [this](const auto& added) { return isAtOrBelow(*added, rejected_); });
+    return isAdded ? fmt::format("\"{}\" is both added and rejected", printable(text)) : "";
+}
+
+std::string TaggingEdit::accept(const std::string& text, bool creates) {
+    NamedLabel named = namedLabel(text, creates);
+    if (!named.problem.empty()) return named.problem;
+    const bool isRejected = rejected_.contains(named.label);
+    accepted_.insert(std::move(named.label));
+    return isRejected ? fmt::format("\"{}\" is both rejected and accepted", printable(text)) : "";
+}
+
+std::optional<TaggingEdit> TaggingEdit::make(const TaggingArguments& arguments, ToolContext& context) {
     TaggingEdit edit;
     std::vector<std::string> problems;
-    problems.reserve(add.size() + remove.size());
-    for (const std::string& text : add) problems.push_back(edit.add(text, creates));
-    for (const std::string& text : remove) problems.push_back(edit.remove(text));
+    problems.reserve(arguments.add.size() + arguments.remove.size() + arguments.reject.size() +
+                     arguments.accept.size());
+    for (const std::string& text : arguments.add) problems.push_back(edit.add(text, arguments.creates));
+    for (const std::string& text : arguments.remove) problems.push_back(edit.remove(text));
+    for (const std::string& text : arguments.reject) problems.push_back(edit.reject(text, arguments.creates));
+    for (const std::string& text : arguments.accept) problems.push_back(edit.accept(text, arguments.creates));
     std::erase(problems, "");
     for (const std::string& problem : problems) context.usageFailed(problem);
     return problems.empty() ? std::optional(edit) : std::nullopt;
@@ -127,18 +173,30 @@ ObjectSet<TGRTTagging> TaggingEdit::apply(const ObjectSet<TGRTTagging>& taggings
             return isOfTag(*tagging, tag.category, tag.label);
         });
         const bool isReplaced = std::any_of(added_.begin(), added_.end(), [&](const auto& added) {
-            return isOfTag(*tagging, added->category(), added->label()) && !added->isEqual(*tagging);
+            return isOfTag(*tagging, added->category(), added->label()) &&
+                   (!added->isEqual(*tagging) || tagging->isAutoTagging());
         });
-        if (!isRemoved && !isReplaced) result.insert(tagging);
+        if (!isRemoved && !isReplaced && !isAtOrBelow(*tagging, rejected_)) result.insert(tagging);
     }
     for (const auto& tagging : added_) result.insert(tagging);
     return result;
 }
 
+std::set<std::string> TaggingEdit::apply(std::set<std::string> rejectedLabels) const {
+    for (const std::string& label : accepted_) rejectedLabels.erase(label);
+    for (const auto& tagging : added_) {
+        rejectedLabels.erase(tagging->label());
+        for (const auto& above : tagging->tag()->ancestors()) rejectedLabels.erase(above->label());
+    }
+    rejectedLabels.insert(rejected_.begin(), rejected_.end());
+    return rejectedLabels;
+}
+
 ObjectSet<TGRTTagging> difference(const ObjectSet<TGRTTagging>& a, const ObjectSet<TGRTTagging>& b) {
     ObjectSet<TGRTTagging> result;
     for (const auto& tagging : a) {
-        if (!b.contains(*tagging)) result.insert(tagging);
+        const TGRTTagging* same = b.find(*tagging);
+        if (same == nullptr || same->isAutoTagging() != tagging->isAutoTagging()) result.insert(tagging);
     }
     return result;
 }

@@ -6,6 +6,7 @@
 
 #include <memory>
 #include <optional>
+#include <set>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -27,30 +28,46 @@ struct TagArgument {
     static std::optional<TagArgument> parse(std::string_view text, bool takesLevel);
 };
 
-/// A change of an item's taggings.
+/// What is to be changed, as typed. Tags to reject and to accept may come without their category.
+struct TaggingArguments {
+    std::vector<std::string> add;
+    std::vector<std::string> remove;
+    std::vector<std::string> reject;
+    std::vector<std::string> accept;
+    bool creates = false;  ///< The default taxonomy need not know the tags.
+};
+
+/// A change of an item's taggings, and of the tags that are rejected for it.
+///
+/// What is said last counts: an item has no tag that it rejects, nor one below that.
 class TaggingEdit {
   public:
-    /// Wrong arguments are reported as wrong usage. Tags to add must be in the default taxonomy, unless
-    /// `creates`.
-    static std::optional<TaggingEdit> make(const std::vector<std::string>& add,
-                                           const std::vector<std::string>& remove, bool creates,
-                                           ToolContext& context);
+    /// Wrong arguments are reported as wrong usage.
+    static std::optional<TaggingEdit> make(const TaggingArguments& arguments, ToolContext& context);
 
-    bool isEmpty() const { return added_.empty() && removed_.empty(); }
-    /// The taggings without those to remove, and with those to add; these replace the same tag at another
-    /// level.
+    bool isEmpty() const {
+        return added_.empty() && removed_.empty() && rejected_.empty() && accepted_.empty();
+    }
+    /// The taggings without those to remove or reject, and with those to add; these replace the same tag at
+    /// another level, or that a service set.
     ObjectSet<TGRTTagging> apply(const ObjectSet<TGRTTagging>& taggings) const;
+    /// The rejected labels without those to accept or add and those above these, and with those to reject.
+    std::set<std::string> apply(std::set<std::string> rejectedLabels) const;
 
   private:
     /// Each answers what is wrong; nothing when nothing is.
     std::string add(const std::string& text, bool creates);
     std::string remove(const std::string& text);
+    std::string reject(const std::string& text, bool creates);
+    std::string accept(const std::string& text, bool creates);
 
     std::vector<std::shared_ptr<TGRTTagging>> added_;
     std::vector<TagArgument> removed_;
+    std::set<std::string> rejected_;
+    std::set<std::string> accepted_;
 };
 
-/// The taggings of `a` that are not in `b`.
+/// The taggings of `a` that are not in `b`, or are there by a service where a person set them, or vice versa.
 ObjectSet<TGRTTagging> difference(const ObjectSet<TGRTTagging>& a, const ObjectSet<TGRTTagging>& b);
 
 }  // namespace qvct::tool

@@ -14,6 +14,7 @@ namespace {
 std::string untouchedText(PresetText& preset) {
     std::string text = textWithoutRecord(preset);
     setTaggings(preset, {});
+    setRejectedLabels(preset, {});
     setDescription(preset, *TGRTMetaData::init());
     for (const PresetText::Section& section : preset.sections()) {
         for (const PresetText::Item& item : section.items)
@@ -72,7 +73,8 @@ std::vector<std::string> Verification::faultsAfterWriting(const TGRTMetaData& ex
         if (!error.isSet()) fail(&error, kErrorUnwritable, "no record is there");
         addError();
     } else if (!(stored->taggings() == expected.taggings()) ||
-               stored->displayName().value_or("") != expected.displayName().value_or("")) {
+               stored->displayName().value_or("") != expected.displayName().value_or("") ||
+               stored->rejectedLabels() != expected.rejectedLabels()) {
         faults.emplace_back("the record that is there is not the one that was written");
     }
     return faults;

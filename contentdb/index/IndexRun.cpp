@@ -66,7 +66,11 @@ bool IndexRun::walk(const std::string& folder) {
         unreadable_.insert(path);
         if (options_.failed) options_.failed(error);
     };
-    const auto show = [&](const ContentFolder& found) { return visit(found.path, listedItems(found, tell)); };
+    const auto show = [&](const ContentFolder& found) {
+        std::vector<ListedItem> items = listedItems(found, tell);
+        includeRejections(items, found.path, folder, rejections_);
+        return visit(found.path, items);
+    };
     if (isDirectory(folder)) walkContentFolders(folder, show, tell, options_.links);
     if (listed_ == 0 && !options_.pruneRoots) bareRoots_.emplace(folder, 0);
     return canDescribe_;

@@ -68,6 +68,7 @@ class IndexRun {
     DescriberPool& describers_;
     StoreWriter writer_;
     IndexProgress progress_;
+    FolderRejections rejections_;
     ItemId nextId_;
     bool isNewDatabase_;
     bool isStopped_ = false;

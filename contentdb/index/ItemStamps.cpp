@@ -1,10 +1,13 @@
 #include "contentdb/index/ItemStamps.h"
 
+#include "autotagging/names/ItemNames.h"
 #include "contentdb/index/BundleWalk.h"
+#include "contentdb/store/Digest.h"
 #include "platform/files/Paths.h"
 
 #include <algorithm>
 #include <array>
+#include <cstdint>
 #include <string>
 
 namespace qvct::contentdb {
@@ -62,6 +65,22 @@ std::vector<ListedItem> listedItems(const ContentFolder& folder, const WalkFailu
         items.push_back(item);
     }
     return items;
+}
+
+void includeRejections(std::vector<ListedItem>& items, const std::string& folder, std::string_view root,
+                       FolderRejections& rejections) {
+    if (items.empty()) return;
+    Digest digest;
+    bool isNone = true;
+    const ItemNames names(pathIn(folder, items.front().name), root);
+    for (const std::string_view above : names.folders()) {
+        const auto labels = rejections.ofFolder(above);
+        if (!labels) continue;
+        isNone = false;
+        for (const std::string& label : *labels) digest.add(label);
+    }
+    if (isNone) return;
+    for (ListedItem& item : items) item.stamp.modified ^= static_cast<std::int64_t>(digest.value());
 }
 
 }  // namespace qvct::contentdb

@@ -11,8 +11,8 @@ namespace qvct::contentdb {
 /// A content item as a folder lists it.
 struct ListedItem {
     std::string_view name;
-    /// Also shows changes of the record, description and preview beside the item, and of everything in a
-    /// bundle.
+    /// Also shows changes of the record, description and preview beside the item, of everything in a bundle,
+    /// and of what is rejected for its folders.
     ItemStamp stamp;
 };
 

@@ -6,9 +6,12 @@
 #include "autotagging/names/TempoByLength.h"
 #include "autotagging/services/QVCTAutoTaggingService.h"
 #include "media/loopfile/LCFileData.h"
+#include "metadata/TGRTMetaData.h"
+#include "platform/base/Printable.h"
 #include "taxonomy/TaggingTypes.h"
 
 #include <algorithm>
+#include <utility>
 
 #include <fmt/format.h>
 
@@ -115,10 +118,14 @@ void judgeOneShot(std::vector<TagClaim>& claims, SoundKind named) {
             claim.doubt = "its name says that it is a loop";
 }
 
+std::string_view nameOf(std::string_view folder) {
+    return folder.substr(folder.rfind('/') + 1);
+}
+
 SoundKind kindOf(const NameReading& reading, const std::vector<TagClaim>& claims) {
     if (reading.kind != SoundKind::unsaid) return reading.kind;
     const bool isOneShot = std::any_of(claims.begin(), claims.end(), [](const TagClaim& claim) {
-        return claim.label == kOneShot && claim.service == kContentType;
+        return claim.label == kOneShot && claim.service == kContentType && claim.doubt.empty();
     });
     return isOneShot ? SoundKind::oneShot : SoundKind::unsaid;
 }
@@ -142,6 +149,30 @@ NameReader& ItemTagger::reader() {
     return *reader_;
 }
 
+Rejections ItemTagger::rejectionsOf(ContentItem& item, const ItemNames& names) {
+    Rejections rejections;
+    const auto record = item.record();
+    if (record && !record->rejectedLabels().empty())
+        rejections.add(std::make_shared<const Rejections::Labels>(record->rejectedLabels()), "in its record");
+    for (const std::string_view folder : names.folders()) {
+        if (auto labels = folders_.ofFolder(folder))
+            rejections.add(std::move(labels), fmt::format("in the folder \"{}\"", printable(nameOf(folder))));
+    }
+    if (!record || rejections.empty()) return rejections;
+    for (const auto& tagging : record->taggings())
+        if (!tagging->isAutoTagging()) rejections.except(*tagging->tag());
+    return rejections;
+}
+
+void ItemTagger::reject(std::vector<TagClaim>& claims, const Rejections& rejections) const {
+    if (rejections.empty()) return;
+    for (TagClaim& claim : claims) {
+        const auto tag = taxonomy_->findTagForLabel(claim.label);
+        std::string reason = tag ? rejections.reasonFor(*tag) : std::string();
+        if (!reason.empty()) claim.doubt = std::move(reason);
+    }
+}
+
 ItemReport ItemTagger::report(const std::shared_ptr<ContentItem>& item, const ItemNames& names,
                               std::uint64_t options) {
     ItemReport report;
@@ -159,6 +190,8 @@ ItemReport ItemTagger::report(const std::shared_ptr<ContentItem>& item, const It
         judgeOneShot(claims, reading.kind);
         claims.insert(claims.end(), reading.claims.begin(), reading.claims.end());
     }
+    report.rejections = rejectionsOf(*item, names);
+    reject(claims, report.rejections);
     report.kind = kindOf(reading, claims);
     report.resolution = resolver_.resolve(std::move(claims), report.kind);
     return report;

@@ -1,7 +1,9 @@
 #pragma once
 
 #include "autotagging/evidence/ClaimResolver.h"
+#include "autotagging/evidence/Rejections.h"
 #include "autotagging/names/ItemNames.h"
+#include "formats/FolderRejections.h"
 #include "platform/base/Export.h"
 #include "platform/base/ObjectSet.h"
 
@@ -26,15 +28,19 @@ struct QVCT_API ItemReport {
     /// The tempo is a bare number in its name, which holds since the sound is `beats` long at it.
     bool isTempoFromLength = false;
     SoundKind kind = SoundKind::unsaid;
+    /// What a person rejected for the item; `resolution` is without it. A host holds its own tags against it.
+    Rejections rejections;
 
     /// The tags that hold, marked as automatic.
     ObjectSet<TGRTTagging> taggings() const;
 };
 
 /// Tags items as a person would: weighs what the services claim, lets what stands in an item's own name
-/// outweigh what its folders say, and decides between tags that exclude each other.
+/// outweigh what its folders say, and decides between tags that exclude each other. What a person rejected,
+/// for the item or for a folder whose name counts, it does not say again.
 ///
-/// Use one from one thread at a time, like its aggregator.
+/// What folders reject is read once: make a new one for each run. Use one from one thread at a time, like its
+/// aggregator.
 class QVCT_API ItemTagger {
   public:
     /// Labels are resolved in that taxonomy.
@@ -48,16 +54,19 @@ class QVCT_API ItemTagger {
     ItemReport report(const std::shared_ptr<ContentItem>& item, const ItemNames& names,
                       std::uint64_t options);
 
-    /// What names alone tell, without a look at the item, for all that it needs not exist. `otherwise`: what
-    /// it is where they do not say.
+    /// What names alone tell, without a look at the item, for all that it needs not exist, nor at what is
+    /// rejected. `otherwise`: what it is where they do not say.
     ItemReport reportOfNames(const ItemNames& names, SoundKind otherwise);
 
   private:
     NameReader& reader();
+    Rejections rejectionsOf(ContentItem& item, const ItemNames& names);
+    void reject(std::vector<TagClaim>& claims, const Rejections& rejections) const;
 
     std::shared_ptr<QVTaggingAggregator> aggregator_;
     std::shared_ptr<const TGRTTaxonomy> taxonomy_;
     ClaimResolver resolver_;
+    FolderRejections folders_;
     std::unique_ptr<NameReader> reader_;  // made when names are asked for
 };
 

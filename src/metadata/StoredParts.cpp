@@ -11,6 +11,7 @@
 #include <string>
 #include <unordered_map>
 #include <unordered_set>
+#include <utility>
 #include <vector>
 
 namespace qvct {
@@ -261,6 +262,35 @@ PropertyList storedKeyValues(const PropertyList* stored, const ObjectSet<TGRTKey
     const auto before =
         TGRTKeyValue::keyValueDictionaryForKeyValues(TGRTKeyValue::keyValuesWithDictionary(stored));
     return changed(*stored->dictionary(), before, after);
+}
+
+std::optional<PropertyList> storedRejections(const PropertyList* stored,
+                                             const std::set<std::string>& labels) {
+    if (rejectedLabels(stored) == labels)
+        return stored == nullptr ? std::nullopt : std::optional<PropertyList>(*stored);
+    Array result(labels.begin(), labels.end());
+    if (stored != nullptr && stored->array() != nullptr) {
+        for (const PropertyList& element : *stored->array())
+            if (element.string() == nullptr) result.push_back(element);
+    }
+    return result.empty() ? std::nullopt : std::optional<PropertyList>(std::move(result));
+}
+
+std::set<std::string> rejectedLabels(const PropertyList* stored) {
+    std::set<std::string> labels;
+    if (stored == nullptr || stored->array() == nullptr) return labels;
+    for (const PropertyList& element : *stored->array())
+        if (element.string() != nullptr) labels.insert(*element.string());
+    return labels;
+}
+
+void storeRejections(Dictionary& stored, const std::set<std::string>& labels) {
+    auto rejected = storedRejections(std::as_const(stored).value(QVContentTaggingRejectedKeyName), labels);
+    if (rejected) {
+        stored.set(QVContentTaggingRejectedKeyName, *std::move(rejected));
+    } else {
+        stored.remove(QVContentTaggingRejectedKeyName);
+    }
 }
 
 }  // namespace qvct

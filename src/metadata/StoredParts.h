@@ -6,6 +6,10 @@
 #include "platform/data/PropertyList.h"
 #include "taxonomy/TGRTTagging.h"
 
+#include <optional>
+#include <set>
+#include <string>
+
 namespace qvct {
 
 // The parts of a record as they are to be stored where something is stored already (null for nothing).
@@ -20,5 +24,12 @@ namespace qvct {
 PropertyList storedTaggings(const PropertyList* stored, const ObjectSet<TGRTTagging>& taggings);
 PropertyList storedContentInfo(const PropertyList* stored, const TGRTContentInfo& contentInfo);
 PropertyList storedKeyValues(const PropertyList* stored, const ObjectSet<TGRTKeyValue>& keyValues);
+/// Nothing when nothing is to be stored.
+std::optional<PropertyList> storedRejections(const PropertyList* stored, const std::set<std::string>& labels);
+
+/// The texts of a stored array of rejected labels; none for null or another value.
+std::set<std::string> rejectedLabels(const PropertyList* stored);
+/// Puts what `storedRejections` answers into a stored dictionary.
+void storeRejections(PropertyList::Dictionary& stored, const std::set<std::string>& labels);
 
 }  // namespace qvct

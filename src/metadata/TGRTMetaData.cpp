@@ -24,7 +24,7 @@ bool isKeyOfRecord(std::string_view key) {
     constexpr std::array keys = {QVContentTaggingKeyName,        QVContentInfoKey,
                                  QVContentKeyValueDataKey,       QVContentTaggingTypeKeyName,
                                  QVContentTaggingSubTypeKeyName, QVContentTaggingDisplayKeyName,
-                                 QVContentTaggingUUIDKeyName};
+                                 QVContentTaggingUUIDKeyName,    QVContentTaggingRejectedKeyName};
     return std::find(keys.begin(), keys.end(), key) != keys.end();
 }
 
@@ -42,6 +42,11 @@ std::shared_ptr<TGRTMetaData> TGRTMetaData::init() {
 
 void TGRTMetaData::setContentInfo(const std::shared_ptr<TGRTContentInfo>& contentInfo) {
     contentInfo_ = contentInfo ? contentInfo->copy() : nullptr;
+}
+
+const std::set<std::string>& TGRTMetaData::rejectedLabels() const {
+    static const std::set<std::string> none;
+    return rejectedLabels_ ? *rejectedLabels_ : none;
 }
 
 std::optional<PropertyList> TGRTMetaData::valueForKey(std::string_view key) const {
@@ -63,6 +68,7 @@ void TGRTMetaData::storeInto(PropertyList::Dictionary& stored) const {
     } else if (stored.string(QVContentTaggingDisplayKeyName) != nullptr) {
         stored.remove(QVContentTaggingDisplayKeyName);
     }
+    if (rejectedLabels_) storeRejections(stored, *rejectedLabels_);
 }
 
 void TGRTMetaData::storeOver(PropertyList::Dictionary& stored) const {
@@ -95,6 +101,7 @@ std::shared_ptr<TGRTMetaData> TGRTMetaData::metaDataFromDictionary(const Propert
     record->contentInfo_ = contentInfoFromDictionary(*dictionary);
     record->keyValues_ = keyValuesFromDictionary(*dictionary);
     record->taggings_ = taggingsFromDictionary(*dictionary, taxonomy);
+    record->rejectedLabels_ = rejectedLabelsFromDictionary(*dictionary);
     for (const auto& entry : *dictionary) {
         if (!isKeyOfRecord(entry.key)) record->foreignKeys_.insert(entry.key);
     }
@@ -113,6 +120,10 @@ std::shared_ptr<TGRTContentInfo> TGRTMetaData::contentInfoFromDictionary(
 
 ObjectSet<TGRTKeyValue> TGRTMetaData::keyValuesFromDictionary(const PropertyList::Dictionary& dictionary) {
     return TGRTKeyValue::keyValuesWithDictionary(dictionary.value(QVContentKeyValueDataKey));
+}
+
+std::set<std::string> TGRTMetaData::rejectedLabelsFromDictionary(const PropertyList::Dictionary& dictionary) {
+    return qvct::rejectedLabels(dictionary.value(QVContentTaggingRejectedKeyName));
 }
 
 std::string TGRTMetaData::description() const {

@@ -47,6 +47,11 @@ class QVCT_API TGRTMetaData : public Object {
     const std::shared_ptr<TGRTContentInfo>& contentInfo() const { return contentInfo_; }
     /// Keeps a copy.
     void setContentInfo(const std::shared_ptr<TGRTContentInfo>& contentInfo);
+    /// Labels of tags that a person rejected: neither these nor the tags below them are derived again.
+    const std::set<std::string>& rejectedLabels() const;
+    void setRejectedLabels(std::set<std::string> labels) { rejectedLabels_ = std::move(labels); }
+    /// Whether they were read or set. A record that does not know them leaves those that are stored.
+    bool knowsRejectedLabels() const { return rejectedLabels_.has_value(); }
 
     /// The value of the key-value item with that key.
     std::optional<PropertyList> valueForKey(std::string_view key) const;
@@ -79,6 +84,8 @@ class QVCT_API TGRTMetaData : public Object {
         const PropertyList::Dictionary& dictionary);
     /// The key values alone; none without that entry.
     static ObjectSet<TGRTKeyValue> keyValuesFromDictionary(const PropertyList::Dictionary& dictionary);
+    /// The rejected labels alone; none without that entry.
+    static std::set<std::string> rejectedLabelsFromDictionary(const PropertyList::Dictionary& dictionary);
 
     std::string description() const override;
 
@@ -91,6 +98,7 @@ class QVCT_API TGRTMetaData : public Object {
     ObjectSet<TGRTTagging> taggings_;
     ObjectSet<TGRTKeyValue> keyValues_;
     std::shared_ptr<TGRTContentInfo> contentInfo_;
+    std::optional<std::set<std::string>> rejectedLabels_;
     std::set<std::string, std::less<>> foreignKeys_;  // of the dictionary that it was read from
 };
 

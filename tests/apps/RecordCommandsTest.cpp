@@ -62,7 +62,7 @@ TEST(Read, GivesOneRecordAnItem) {
         std::vector<std::string> keys;
         for (const auto& [key, value] : record.items()) keys.push_back(key);
         EXPECT_THAT(keys, testing::UnorderedElementsAre("path", "displayName", "fileType", "subFileType",
-                                                        "taggings", "keyValues", "contentInfo"));
+                                                        "taggings", "rejected", "keyValues", "contentInfo"));
         EXPECT_TRUE(record["displayName"].is_null());
         EXPECT_THAT(record["taggings"], IsEmpty());
     }
@@ -163,6 +163,7 @@ TEST(Write, ADryRunRefusesWhatTheWriteRefuses) {
     items.folder.write("Taken.ostrax/Resources", "no folder");
     std::filesystem::permissions(items.folder.path("shot.aif"), std::filesystem::perms::owner_read);
     for (const std::vector<std::string>& change : {std::vector<std::string>{"--name", "a\x01"},
+                                                   {"--reject", "Kick"},
                                                    {"--add", "Genres/House"},
                                                    {"--name", "B", "--verify"}}) {
         std::vector<std::string> arguments = {"write", "--json", items.folder.path()};
@@ -192,6 +193,13 @@ TEST(Write, RefusesWrongWordsBeforeAnythingIsTouched) {
         {{"--add", "Source/House"}, "no tag \"House\" in Source; there are: Genres/House, "},
         {{"--add", "Genre/House"}, "no category \"Genre\"; there are: Artist"},
         {{"--add", "House"}, "\"House\" is no Category/Label"},
+        {{"--reject", "Kik"}, "no tag \"Kik\"; did you mean \"Source/Kick\"?"},
+        {{"--reject", "Genres/Kick"}, "no tag \"Kick\" in Genres; there are: Source/Kick"},
+        {{"--accept", "Sorce/Kick"}, "no category \"Sorce\""},
+        {{"--reject", "Electronic Music"}, "\"Electronic Music\" is both added and rejected"},
+        {{"--reject", "Kick", "--accept", "Source/Kick"}, "is both rejected and accepted"},
+        {{"--create", "--reject", ""}, "\"\" is no label"},
+        {{"--folder", "--reject", "Kick"}, "--folder"},
         {{"--create", "--add", "Genres/House=1.5"}, "\"Genres/House=1.5\": the level is out of range"},
         {{"--create", "--add", "Genres/House=150%"}, "the level is out of range, which is 0 to 1, or 0% to"},
         {{"--create", "--add", "Genres/House=-1"}, "out of range"},

@@ -2,6 +2,8 @@
 #include "autotagging/ItemTagger.h"
 #include "autotagging/QVTaggingAggregator.h"
 #include "autotagging/services/TaggingServiceNames.h"
+#include "formats/FolderRejections.h"
+#include "formats/TGRTFileNode.h"
 #include "platform/data/PropertyListFile.h"
 #include "support/AudioFixtures.h"
 #include "support/TemporaryFolder.h"
@@ -9,6 +11,7 @@
 #include "taxonomy/TaggingTypes.h"
 
 #include <algorithm>
+#include <iterator>
 #include <random>
 #include <ranges>
 #include <set>
@@ -239,6 +242,65 @@ TEST_F(Tagging, KeepsWhatOtherServicesSay) {
     }
     EXPECT_THAT(tag(path, "", QVCTAutoTaggingOptionContentType), ElementsAre("One Shot"));
     EXPECT_THAT(tag(path, "", 0), ElementsAre());
+}
+
+TEST_F(Tagging, DoesNotSayAgainWhatAPersonRejected) {
+    const std::string path = sound("Root/Drums/Kick Dark.wav");
+    const URL url = URL::fileURLWithPath(path);
+    const Labels all = {"Bright / Dark", "Drums", "Kick", "One Shot", "User generated"};
+    const auto without = [&all](const Labels& rejected) {
+        Labels left;
+        std::set_difference(all.begin(), all.end(), rejected.begin(), rejected.end(),
+                            std::back_inserter(left));
+        return left;
+    };
+    using Rejected = std::set<std::string>;
+    const auto kick = TGRTTagging::initWithTag(TGRTTaxonomy::defaultTaxonomy()->findTagForLabel("Kick"), {});
+    const struct {
+        const char* what;
+        Rejected item, folder, root;
+        bool hasKick;  // a person says that it is one
+        Labels dropped;
+        const char* reason;  // of the first that is dropped
+    } rows[] = {
+        {"nothing is rejected", {}, {}, {}, false, {}, ""},
+        {"a folder says what a rejected tag is a kind of",
+         {"Kick"},
+         {},
+         {},
+         false,
+         {"Kick"},
+         "in its record"},
+        {"what is no drum is no kick", {"Drums"}, {}, {}, false, {"Drums", "Kick"}, "in its record"},
+        {"in its folder", {}, {"Kick"}, {}, false, {"Kick"}, "in the folder \"Drums\""},
+        {"in the folder that was named", {}, {}, {"Kick"}, false, {"Kick"}, "in the folder \"Root\""},
+        {"what a service alone says", {"One Shot"}, {}, {}, false, {"One Shot"}, "in its record"},
+        {"a label of no tag", {"Boink"}, {"Boink"}, {}, false, {}, ""},
+        {"a person outranks folders", {}, {"Kick"}, {"Drums"}, true, {}, ""},
+    };
+    for (const auto& row : rows) {
+        const auto record = TGRTMetaData::init();
+        record->setRejectedLabels(row.item);
+        if (row.hasKick) record->setTaggings({kick});
+        ASSERT_TRUE(
+            TGRTFileNode::nodeWithFileURL(url)->metaDataWriterForFileURL(url)->writeMetaData(record, url));
+        ASSERT_TRUE(setRejectedLabelsOfFolder(row.folder, folder_.path("Root/Drums")));
+        ASSERT_TRUE(setRejectedLabelsOfFolder(row.root, folder_.path("Root")));
+        ASSERT_TRUE(setRejectedLabelsOfFolder({"Bright / Dark"}, folder_.path()));  // above the root
+        ItemTagger tagger(QVTaggingAggregator::defaultTaggingAggregator(), TGRTTaxonomy::defaultTaxonomy());
+        const ItemReport report =
+            tagger.report(std::make_shared<ContentItem>(url), ItemNames(path, folder_.path("Root")),
+                          optionsForAllTaggingServices());
+        EXPECT_EQ(heldOf(report.resolution), without(row.dropped)) << row.what;
+        for (const std::string& label : row.dropped) {
+            const auto hit = std::find_if(report.resolution.dropped.begin(), report.resolution.dropped.end(),
+                                          [&label](const DroppedTag& tag) { return tag.label == label; });
+            ASSERT_NE(hit, report.resolution.dropped.end()) << row.what << label;
+            EXPECT_THAT(hit->reason,
+                        testing::AllOf(testing::HasSubstr("rejected "), testing::HasSubstr(row.reason)))
+                << row.what;
+        }
+    }
 }
 
 TEST_F(Tagging, OfNamesAloneNeedsNoFile) {

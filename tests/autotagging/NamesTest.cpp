@@ -221,6 +221,10 @@ TEST(Names, CountFromTheItemUpToTheFolderThatWasNamed) {
     EXPECT_THAT(names("/a/b/c/Warm.patch/", ""), ElementsAre("Warm", "c", "b"));
     EXPECT_THAT(names("/.wav", ""), ElementsAre(".wav"));
     EXPECT_THAT(names("/a/bc/d/e/Kick.wav", "/a/b"), ElementsAre("Kick", "e", "d"));
+    EXPECT_THAT(ItemNames("/C/Pack/Kick.1/Kick.wav", "/C/Pack").folders(),
+                ElementsAre("/C/Pack/Kick.1", "/C/Pack"));
+    EXPECT_THAT(ItemNames("/a/b/c/Warm.patch/", "").folders(), ElementsAre("/a/b/c", "/a/b"));
+    EXPECT_THAT(ItemNames("/Kick.wav", "").folders(), ElementsAre());
 }
 
 TEST(Names, CostLittleHoweverLongTheyAre) {

@@ -208,6 +208,21 @@ TEST(ForeignEntries, SurviveEveryKindOfWrite) {
             }
 
             auto record = read(url);
+            record->setRejectedLabels({"Snare", "Kick"});
+            ASSERT_TRUE(writeMetaData(url, record)) << what;
+            Dictionary rejecting = original;
+            rejecting.set("Rejected", Array{"Kick", "Snare"});
+            ASSERT_EQ(item.stored(folder), rejecting) << what;
+            ASSERT_TRUE(writeTaggings(url, TGRTMetaData::init())) << what;
+            ASSERT_TRUE(writeTaggings(url, record)) << what;
+            EXPECT_EQ(read(url)->rejectedLabels(), record->rejectedLabels()) << what;
+            item.store(folder, rejecting);
+            record = read(url);
+            record->setRejectedLabels({});
+            ASSERT_TRUE(writeMetaData(url, record)) << what;
+            ASSERT_EQ(item.stored(folder), original) << what;
+
+            record = read(url);
             record->setDisplayName("New");
             ASSERT_TRUE(writeMetaData(url, record)) << what;
             Dictionary expected = original;

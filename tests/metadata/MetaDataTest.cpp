@@ -5,6 +5,8 @@
 #include "taxonomy/TaggingTypes.h"
 
 #include <limits>
+#include <optional>
+#include <set>
 
 #include <gmock/gmock.h>
 
@@ -110,6 +112,47 @@ TEST(MetaData, CountsWrongTypesAsAbsent) {
     EXPECT_EQ(record->subFileType(), 7);
     EXPECT_EQ(record->displayName(), std::nullopt);
     EXPECT_EQ(TGRTMetaData::metaDataFromDictionary(nullptr, *TGRTTaxonomy::defaultTaxonomy()), nullptr);
+}
+
+TEST(MetaData, StoresRejectedLabelsOnlyWhereThereAreSome) {
+    const Dictionary none;
+    const struct {
+        const char* what;
+        Dictionary stored;
+        std::optional<std::set<std::string>> labels;
+        Dictionary after;  // without what every record stores
+    } cases[] = {
+        {"none where none are", none, std::set<std::string>{}, none},
+        {"a new one", none, std::set<std::string>{"Snare", "Kick"}, {{"Rejected", Array{"Kick", "Snare"}}}},
+        {"what is no label stands behind the others",
+         {{"Rejected", Array{5, "Kick"}}},
+         std::set<std::string>{"Snare"},
+         {{"Rejected", Array{"Snare", 5}}}},
+        {"the same in another order stays",
+         {{"Rejected", Array{"Snare", 5, "Kick"}}},
+         std::set<std::string>{"Kick", "Snare"},
+         {{"Rejected", Array{"Snare", 5, "Kick"}}}},
+        {"the last is taken back", {{"Rejected", Array{"Kick"}}}, std::set<std::string>{}, none},
+        {"another type stays", {{"Rejected", "Kick"}}, std::set<std::string>{}, {{"Rejected", "Kick"}}},
+        {"and makes room", {{"Rejected", 5}}, std::set<std::string>{"Kick"}, {{"Rejected", Array{"Kick"}}}},
+        {"a record that does not know them leaves them",
+         {{"Rejected", Array{"Kick"}}},
+         std::nullopt,
+         {{"Rejected", Array{"Kick"}}}},
+    };
+    for (const auto& c : cases) {
+        const auto record = TGRTMetaData::init();
+        if (c.labels) record->setRejectedLabels(*c.labels);
+        for (const auto& store : {&TGRTMetaData::storeInto, &TGRTMetaData::storeOver}) {
+            Dictionary stored = c.stored;
+            ((*record).*store)(stored);
+            if (c.labels) {
+                EXPECT_EQ(recordOf(stored)->rejectedLabels(), *c.labels) << c.what;
+            }
+            for (const char* key : {"Tagging", "KeyValueData", "Type"}) stored.remove(key);
+            EXPECT_EQ(PropertyList(stored), PropertyList(c.after)) << c.what;
+        }
+    }
 }
 
 TEST(MetaData, KeepsACopyOfItsContentInfo) {

@@ -32,7 +32,8 @@ PropertyList validRecord() {
         {"KeyValueData", Dictionary{{"BeatCount", 8}, {"Comment", "x"}, {"Tempo", 120.5}}},
         {"Type", 2},
         {"SubType", 4},
-        {"DisplayName", "Deep"}};
+        {"DisplayName", "Deep"},
+        {"Rejected", Array{"Kick", 5}}};
 }
 
 class Mutator {
@@ -165,6 +166,7 @@ TEST(DamagedRecords, AreReadAsFarAsTheyGo) {
         ASSERT_LE(again->taggings().size(), record->taggings().size()) << seed;
         ASSERT_EQ(again->taggings().empty(), record->taggings().empty()) << seed;
         ASSERT_EQ(again->keyValues(), record->keyValues()) << seed;
+        ASSERT_EQ(again->rejectedLabels(), record->rejectedLabels()) << seed;
         ASSERT_EQ(again->contentInfo()->assetDependencyPaths(), record->contentInfo()->assetDependencyPaths())
             << seed;
         ASSERT_FALSE(record->description().empty());

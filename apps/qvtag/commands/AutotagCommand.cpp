@@ -68,7 +68,8 @@ bool isGraded(const ObjectSet<TGRTTagging>& taggings) {
 }
 
 /// Grades the rhythm of audio that the rhythm service leaves alone, if its length in beats is known.
-void addAnyRhythm(ContentItem& item, const TGRTTaxonomy& taxonomy, ObjectSet<TGRTTagging>& taggings) {
+void addAnyRhythm(ContentItem& item, const TGRTTaxonomy& taxonomy, const Rejections& rejections,
+                  ObjectSet<TGRTTagging>& taggings) {
     if (isGraded(taggings)) return;
     const auto data = item.fileData();
     if (!data || data->beatCount() == 0) return;
@@ -80,7 +81,8 @@ void addAnyRhythm(ContentItem& item, const TGRTTaxonomy& taxonomy, ObjectSet<TGR
         auto tagging =
             TGRTTagging::initWithTag(taxonomy.findTagForLabel(*tag.string(kTagDictionaryLabelKey)),
                                      TGRTLevel::levelWithWeight(*tag.doubleValue(kTagDictionaryLevelKey)));
-        if (tagging) tagging->setIsAutoTagging(true);
+        if (!tagging || !rejections.reasonFor(*tagging->tag()).empty()) continue;
+        tagging->setIsAutoTagging(true);
         taggings.insert(tagging);
     }
 }
@@ -97,10 +99,12 @@ void run(const Options& options, ToolContext& context) {
     context.forEachContentItemBelow(
         options.paths, options.links, [&](const URL& url, const std::string& root) {
             const auto item = std::make_shared<ContentItem>(url, ContentItem::Reading{bits, nullptr});
+            const ItemReport report =
+                isStrict ? ItemReport() : tagger.report(item, ItemNames(url.path(), root), bits);
             auto found = isStrict
                              ? aggregator->taggingsOfItem(item, *taxonomy, bits & ~QVCTAutoTaggingOptionNames)
-                             : tagger.report(item, ItemNames(url.path(), root), bits).taggings();
-            if (options.measuresAnyRhythm) addAnyRhythm(*item, *taxonomy, found);
+                             : report.taggings();
+            if (options.measuresAnyRhythm) addAnyRhythm(*item, *taxonomy, report.rejections, found);
             const Taggings taggings = sortedTaggings(found);
             totals.add(taggings);
             if (context.format == Format::table) {

@@ -12,6 +12,7 @@
 
 #include <algorithm>
 #include <memory>
+#include <utility>
 
 #include <fmt/format.h>
 
@@ -81,6 +82,20 @@ Json jsonOfItem(const URL& url, const Stored& stored, const ItemReport& report) 
     return json;
 }
 
+/// Takes out what a person rejected for a folder and what an earlier run may have stored.
+Stored withoutRejected(const Stored& stored, ItemReport& report) {
+    Stored kept;
+    for (const auto& tagging : stored) {
+        std::string reason = report.rejections.reasonFor(*tagging->tag());
+        if (reason.empty()) {
+            kept.insert(tagging);
+        } else {
+            report.resolution.dropped.push_back({tagging->label(), 1, std::move(reason), {}});
+        }
+    }
+    return kept;
+}
+
 /// "Kick" in the name, rule 3, user
 std::string textOf(const TagClaim& claim) {
     const auto& [what, where, offset] = claim.evidence;
@@ -103,6 +118,8 @@ std::string textOf(const std::vector<TagClaim>& claims) {
     return join(texts, ", ");
 }
 
+constexpr std::string_view kStored = "stored in the file";
+
 struct Line {
     std::string tag;
     std::string confidence;
@@ -117,7 +134,7 @@ std::string percent(double confidence) {
 std::vector<Line> linesOf(const Stored& stored, const ItemReport& report) {
     std::vector<Line> lines;
     for (const auto& tagging : sortedTaggings(stored))
-        lines.push_back({textOfTagging(*tagging), "", "stored in the file"});
+        lines.push_back({textOfTagging(*tagging), "", std::string(kStored)});
     std::vector<const HeldTag*> held;
     for (const HeldTag& tag : report.resolution.held) held.push_back(&tag);
     const auto rank = [](const HeldTag* tag) {
@@ -131,8 +148,10 @@ std::vector<Line> linesOf(const Stored& stored, const ItemReport& report) {
                          isParent || isBookkeeping(rank(tag)) ? Color::faint : Color::strong});
     }
     for (const DroppedTag& tag : report.resolution.dropped)
-        lines.push_back({"not " + tag.label, percent(tag.confidence),
-                         fmt::format("{}: {}", tag.reason, textOf(tag.claims.front())), Color::faint});
+        lines.push_back({"not " + printable(tag.label), percent(tag.confidence),
+                         fmt::format("{}: {}", tag.reason,
+                                     tag.claims.empty() ? std::string(kStored) : textOf(tag.claims.front())),
+                         Color::faint});
     return lines;
 }
 
@@ -160,8 +179,8 @@ void run(const Options& options, ToolContext& context) {
         options.paths, options.links, [&](const URL& url, const std::string& root) {
             const auto item = std::make_shared<ContentItem>(url, ContentItem::Reading{bits, nullptr});
             const auto record = item->record();
-            const Stored stored = record ? record->taggings() : Stored();
-            const ItemReport report = tagger.report(item, ItemNames(url.path(), root), bits);
+            ItemReport report = tagger.report(item, ItemNames(url.path(), root), bits);
+            const Stored stored = withoutRejected(record ? record->taggings() : Stored(), report);
             if (context.format == Format::table) {
                 printItem(url, stored, report, context.terminal());
             } else {

@@ -45,6 +45,7 @@ Json jsonOfRecord(const URL& url, const TGRTMetaData& record) {
     json["taggings"] = Json::array();
     for (const auto& tagging : sortedTaggings(record.taggings()))
         json["taggings"].push_back(jsonOfTagging(*tagging));
+    json["rejected"] = record.rejectedLabels();
     json["keyValues"] = jsonOfPropertyList(TGRTKeyValue::keyValueDictionaryForKeyValues(record.keyValues()));
     json["contentInfo"] =
         record.contentInfo() ? jsonOfPropertyList(record.contentInfo()->dictionary()) : Json::object();
@@ -57,9 +58,13 @@ void printRecord(const URL& url, const TGRTMetaData& record, const Terminal& ter
     const std::string name = record.displayName().value_or("");
     if (!name.empty()) printField(terminal, "name", {{printable(name), Color::plain}});
     printTaggings(terminal, record.taggings());
+    std::vector<Word> words;
+    for (const std::string& label : record.rejectedLabels())
+        words.push_back({printable(label), Color::plain});
+    printField(terminal, "rejected", words);
     printKeyValues(terminal, record.keyValues());
     if (!record.contentInfo()) return;
-    std::vector<Word> words;
+    words.clear();
     for (const std::string& path : record.contentInfo()->assetDependencyPaths())
         words.push_back({printable(path), Color::plain});
     printField(terminal, "needs", words);

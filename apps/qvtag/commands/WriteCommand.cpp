@@ -2,6 +2,8 @@
 #include "TaggingEdit.h"
 #include "Verification.h"
 #include "commands/Commands.h"
+#include "formats/ContentNames.h"
+#include "formats/FolderRejections.h"
 #include "formats/TGRTFileNode.h"
 #include "formats/bundle/TGRTBundleTypeValidators.h"
 #include "formats/settings/TGRTBinaryFileMetaDataReader.h"
@@ -12,8 +14,10 @@
 
 #include <algorithm>
 #include <filesystem>
+#include <iterator>
 #include <memory>
 #include <optional>
+#include <set>
 
 #include <fmt/format.h>
 
@@ -23,21 +27,24 @@ namespace {
 struct Options {
     std::vector<std::string> paths;
     LinksOutside links = LinksOutside::none;
-    std::vector<std::string> add;
-    std::vector<std::string> remove;
+    TaggingArguments tags;
     std::optional<std::string> name;
-    bool creates = false;
+    bool isOfFolders = false;
     bool isDryRun = false;
     bool verifies = false;
     bool keepsTimes = false;
 };
 
-/// What a write is to do, or has done, to one item.
+using Labels = std::set<std::string>;
+
+/// What a write is to do, or has done, to one item or folder.
 struct Change {
     URL url;
     std::shared_ptr<TGRTMetaData> record = {};  // as it is to be
     ObjectSet<TGRTTagging> added = {};
     ObjectSet<TGRTTagging> removed = {};
+    Labels rejected = {};
+    Labels accepted = {};
     std::string oldName = {};
     std::optional<std::string> newName = {};
     bool isWritten = false;
@@ -45,7 +52,14 @@ struct Change {
     std::optional<Verification> verification = {};  // of what was written
     std::vector<std::string> faults = {};           // what the verification found
 
-    bool isNone() const { return added.empty() && removed.empty() && !newName; }
+    bool changesRejections() const { return !rejected.empty() || !accepted.empty(); }
+    bool isNone() const { return added.empty() && removed.empty() && !changesRejections() && !newName; }
+    void setRejections(const Labels& before, const Labels& after) {
+        std::set_difference(after.begin(), after.end(), before.begin(), before.end(),
+                            std::inserter(rejected, rejected.end()));
+        std::set_difference(before.begin(), before.end(), after.begin(), after.end(),
+                            std::inserter(accepted, accepted.end()));
+    }
 };
 
 /// Why nothing can be written to an item of a kind that has no writer.
@@ -82,6 +96,9 @@ std::optional<Change> changeOfItem(const URL& url, const TaggingEdit& edit, cons
     change.record->setTaggings(edit.apply(before));
     change.added = difference(change.record->taggings(), before);
     change.removed = difference(before, change.record->taggings());
+    const Labels rejectedBefore = change.record->rejectedLabels();
+    change.record->setRejectedLabels(edit.apply(rejectedBefore));
+    change.setRejections(rejectedBefore, change.record->rejectedLabels());
     change.oldName = change.record->displayName().value_or("");
     if (options.name && *options.name != change.oldName) {
         change.newName = options.name;
@@ -99,13 +116,17 @@ void updateSubType(const Change& change) {
         change.record->setSubFileType(writer->subTypeFromTaggings(change.record->taggings()));
 }
 
+ContentWriteOptions writeOptions(const Options& options, const FileStamp& former) {
+    return {.keepsTimes = options.keepsTimes,
+            .verifies = options.verifies,
+            .isDryRun = options.isDryRun,
+            .expected = former};
+}
+
 bool write(const Change& change, const Options& options, Error* error) {
-    const ContentWriteOptions how{.keepsTimes = options.keepsTimes,
-                                  .verifies = options.verifies,
-                                  .isDryRun = options.isDryRun,
-                                  .expected = change.former};
+    const ContentWriteOptions how = writeOptions(options, change.former);
     const auto node = TGRTFileNode::nodeWithFileURL(change.url);
-    if (change.newName) {
+    if (change.newName || change.changesRejections()) {
         updateSubType(change);
         const auto writer = node->metaDataWriterForFileURL(change.url);
         return writer && writer->writeMetaData(change.record, change.url, error, how);
@@ -141,6 +162,14 @@ bool leadsAway(const std::string& record, const URL& url) {
     return !LinkRule(folder.path(), LinksOutside::none).follows(record, false);
 }
 
+/// Whether the file with the record of an item or folder may be written to; if not, that is reported.
+bool mayWriteTo(const std::string& record, const URL& url, const Options& options, ToolContext& context) {
+    if (options.links == LinksOutside::all || !leadsAway(record, url)) return true;
+    context.itemFailed(errorOf(kErrorInvalidArgument,
+                               "leads out of its folder, and is written to only with --follow", {record}));
+    return false;
+}
+
 /// Reads, changes and writes an item while holding its turn; tries once more if another program saves it
 /// meanwhile.
 std::optional<Change> editItem(const URL& url, const TaggingEdit& edit, const Options& options,
@@ -148,12 +177,7 @@ std::optional<Change> editItem(const URL& url, const TaggingEdit& edit, const Op
     Error error;
     const auto turn = EditLock::acquire(url.path(), &error);
     const std::string record = TGRTFileNode::nodeWithFileURL(url)->recordURL().path();
-    if (options.links != LinksOutside::all && leadsAway(record, url)) {
-        context.itemFailed(errorOf(kErrorInvalidArgument,
-                                   "leads out of its folder, and is written to only with --follow",
-                                   {record}));
-        return std::nullopt;
-    }
+    if (!mayWriteTo(record, url, options, context)) return std::nullopt;
     constexpr int kAttempts = 10;
     for (int attempt = 0; turn && attempt < kAttempts; ++attempt) {
         const FileStamp former = FileStamp::ofFile(record);
@@ -165,6 +189,35 @@ std::optional<Change> editItem(const URL& url, const TaggingEdit& edit, const Op
         if (FileStamp::ofFile(record) == former) break;
     }
     if (!error.isSet()) fail(&error, kErrorUnwritable, "cannot be written", {url.path()});
+    context.itemFailed(error);
+    return std::nullopt;
+}
+
+/// Changes what a folder rejects, while holding the turn of its items.
+std::optional<Change> editFolder(const URL& url, const TaggingEdit& edit, const Options& options,
+                                 ToolContext& context) {
+    const std::string& path = url.path();
+    const std::string record = folderRecordPath(path);
+    if (!isDirectory(path) || ContentNames().kindOf(url.lastPathComponent()) == ContentKind::bundle) {
+        const char* reason =
+            fileExists(path) ? "is an item and no folder of items: leave out --folder" : "no such folder";
+        context.itemFailed(errorOf(kErrorInvalidArgument, reason, {path}));
+        return std::nullopt;
+    }
+    if (!mayWriteTo(record, url, options, context)) return std::nullopt;
+    Error error;
+    const auto turn = EditLock::acquire(record, &error);
+    Change change{.url = url, .former = FileStamp::ofFile(record)};
+    const auto before = turn ? rejectedLabelsOfFolder(path, &error) : std::nullopt;
+    if (before) {
+        const Labels after = edit.apply(*before);
+        change.setRejections(*before, after);
+        if (change.isNone()) return change;
+        const bool isDone =
+            setRejectedLabelsOfFolder(after, path, &error, writeOptions(options, change.former));
+        change.isWritten = isDone && !options.isDryRun;
+        if (isDone) return change;
+    }
     context.itemFailed(error);
     return std::nullopt;
 }
@@ -181,6 +234,8 @@ Json jsonOfChange(const Change& change) {
     json["written"] = change.isWritten;
     json["added"] = jsonOfTaggings(change.added);
     json["removed"] = jsonOfTaggings(change.removed);
+    json["rejected"] = change.rejected;
+    json["accepted"] = change.accepted;
     json["name"] = change.newName ? Json{{"from", change.oldName}, {"to", *change.newName}} : Json();
     if (!change.verification) {
         json["verified"] = nullptr;
@@ -197,6 +252,8 @@ void printChange(const Change& change, const Terminal& terminal) {
         print("  - {}/{}\n", printable(tagging->category()), textOfTagging(*tagging));
     for (const auto& tagging : sortedTaggings(change.added))
         print("  + {}/{}\n", printable(tagging->category()), textOfTagging(*tagging));
+    for (const std::string& label : change.accepted) print("  accept {}\n", printable(label));
+    for (const std::string& label : change.rejected) print("  reject {}\n", printable(label));
     if (change.newName)
         print("  name \"{}\" becomes \"{}\"\n", printable(change.oldName), printable(*change.newName));
     if (change.isNone()) print("  {}\n", colored(terminal, Color::faint, "nothing to change"));
@@ -204,18 +261,32 @@ void printChange(const Change& change, const Terminal& terminal) {
         print("  {}\n", colored(terminal, Color::faint, change.verification->description()));
 }
 
+/// What is to be changed: the folders themselves, or the items at and below the paths.
+std::vector<URL> targetsOf(const Options& options, ToolContext& context) {
+    if (!options.isOfFolders) return context.contentItems(options.paths, options.links);
+    std::vector<URL> folders;
+    for (const std::string& path : options.paths) {
+        folders.push_back(URL::fileURLWithPath(path));
+        if (isValidUtf8(path)) continue;
+        context.itemFailed(errorOf(kErrorInvalidArgument, "the name is not UTF-8", {path}));
+        folders.pop_back();
+    }
+    return folders;
+}
+
 void run(const Options& options, ToolContext& context) {
-    const auto edit = TaggingEdit::make(options.add, options.remove, options.creates, context);
+    const auto edit = TaggingEdit::make(options.tags, context);
     if (!edit) return;
     if (edit->isEmpty() && !options.name)
-        return context.usageFailed("nothing to write: --add, --remove or --name");
+        return context.usageFailed("nothing to write: --add, --remove, --reject, --accept or --name");
     if (options.name && !isValidUtf8(*options.name))
         return context.usageFailed(fmt::format("the name \"{}\" is not UTF-8", printable(*options.name)));
     Json json = Json::array();
     std::size_t written = 0;
     std::size_t unchanged = 0;
-    for (const URL& url : context.contentItems(options.paths, options.links)) {
-        const auto change = editItem(url, *edit, options, context);
+    for (const URL& url : targetsOf(options, context)) {
+        const auto change = options.isOfFolders ? editFolder(url, *edit, options, context)
+                                                : editItem(url, *edit, options, context);
         if (!change) continue;
         unchanged += change->isNone() ? 1 : 0;
         written += change->isWritten ? 1 : 0;
@@ -228,7 +299,8 @@ void run(const Options& options, ToolContext& context) {
     if (context.format != Format::table) return printJson(json, context.format);
     context.note(options.isDryRun
                      ? std::string("nothing was written: this is a dry run")
-                     : fmt::format("{} written, {} unchanged", counted(written, "item"), unchanged));
+                     : fmt::format("{} written, {} unchanged",
+                                   counted(written, options.isOfFolders ? "folder" : "item"), unchanged));
 }
 
 }  // namespace
@@ -238,21 +310,39 @@ void addWriteCommand(Command& tool, ToolContext& context) {
     Command command = tool.addCommand("write", "Changes the tags and the name that items store");
     command.addOption("paths", options->paths, "Files and folders").required().valueName("PATH");
     command.addFollowFlag(options->links);
-    command.addOption("--add", options->add, "Tag to add, or to give another level (0 to 1, or a percentage)")
-        .valueName("CATEGORY/LABEL[=LEVEL]")
+    TaggingArguments& tags = options->tags;
+    Option add =
+        command.addOption("--add", tags.add, "Tag to add, or to give another level (0 to 1, or a percentage)")
+            .valueName("CATEGORY/LABEL[=LEVEL]")
+            .oneWordEach();
+    Option remove = command.addOption("--remove", tags.remove, "Tag to remove, whatever its level")
+                        .valueName("CATEGORY/LABEL")
+                        .oneWordEach();
+    command.addOption("--reject", tags.reject, "Tag that is not so: it is removed, and not derived again")
+        .valueName("[CATEGORY/]LABEL")
         .oneWordEach();
-    command.addOption("--remove", options->remove, "Tag to remove, whatever its level")
-        .valueName("CATEGORY/LABEL")
+    command.addOption("--accept", tags.accept, "Tag that may be derived again after all")
+        .valueName("[CATEGORY/]LABEL")
         .oneWordEach();
-    command.addOption("--name", options->name, "Display name").valueName("NAME");
-    command.addFlag("--create", options->creates, "Also add tags that the taxonomy does not know");
+    Option name = command.addOption("--name", options->name, "Display name").valueName("NAME");
+    command.addFlag("--create", tags.creates,
+                    "Also add, reject and accept tags that the taxonomy does not know");
     command.addFlag("--dry-run", options->isDryRun, "Show what would change, and write nothing");
-    command.addFlag("--verify", options->verifies,
-                    "Compare audio and all that is not ours before and after, and read the record back");
+    Option verify =
+        command.addFlag("--verify", options->verifies,
+                        "Compare audio and all that is not ours before and after, and read the record back");
     command.addFlag("--keep-times", options->keepsTimes, "Files keep their times of access and change");
+    command
+        .addFlag("--folder", options->isOfFolders,
+                 "Reject and accept for the folders themselves: all that lies in them, now and later")
+        .excludes(add)
+        .excludes(remove)
+        .excludes(name)
+        .excludes(verify);
     command.footer(
         "The first \"/\" separates category and label: \"Sound Descriptors/Bright / Dark=25%\".\n"
-        "Example:\n  qvtag write --add Genres/House --add \"Source/Bass=0.5\" --dry-run Loops");
+        "Example:\n  qvtag write --add Genres/House --add \"Source/Bass=0.5\" --dry-run Loops\n"
+        "  qvtag write --reject Drums --folder Loops");
     command.callback([options, &context] { run(*options, context); });
 }
 

@@ -30,4 +30,13 @@ ItemNames::ItemNames(std::string path, std::string_view root) : path_(std::move(
     }
 }
 
+std::vector<std::string_view> ItemNames::folders() const {
+    std::vector<std::string_view> folders;
+    for (std::size_t i = 1; i < names_.size(); ++i) {
+        const auto end = static_cast<std::size_t>(names_[i].data() + names_[i].size() - path_.data());
+        folders.push_back(std::string_view(path_).substr(0, end));
+    }
+    return folders;
+}
+
 }  // namespace qvct

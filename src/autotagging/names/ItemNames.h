@@ -20,6 +20,8 @@ class QVCT_API ItemNames {
 
     /// As long as this object lives.
     std::span<const std::string_view> all() const { return names_; }
+    /// The paths of the folders whose names are among them, in the same order; as long as this object lives.
+    std::vector<std::string_view> folders() const;
 
   private:
     std::string path_;

@@ -37,6 +37,7 @@ std::shared_ptr<TGRTMetaData> TGRTAudioFileMetaDataReader::readMetaDataFromFile(
     record->setSubFileType(subType);
     record->setContentInfo(readContentInfoFromFileData(fileData));
     record->setDisplayName(fileData->displayName());
+    record->setRejectedLabels(TGRTMetaData::rejectedLabelsFromDictionary(fileData->record()));
     return record;
 }
 

@@ -8,6 +8,8 @@
 #include "taxonomy/TaggingTypes.h"
 
 #include <functional>
+#include <set>
+#include <string>
 
 namespace qvct {
 namespace {
@@ -40,6 +42,11 @@ void setContentInfo(LCFileData& fileData, const TGRTContentInfo* contentInfo) {
     if (changed.dictionary() != nullptr) fileData.setContentInfoDictionary(*changed.dictionary());
 }
 
+void setRejectedLabels(LCFileData& fileData, const std::set<std::string>& labels) {
+    fileData.setRejectedLabels(
+        storedRejections(fileData.record().value(QVContentTaggingRejectedKeyName), labels));
+}
+
 }  // namespace
 
 bool TGRTAudioFileTaggingWriter::writeTaggings(const ObjectSet<TGRTTagging>& taggings, const URL& url,
@@ -64,6 +71,7 @@ bool TGRTAudioFileMetaDataWriter::writeMetaData(const std::shared_ptr<TGRTMetaDa
         const bool hasSome = contentInfo != nullptr && !contentInfo->dictionary().empty();
         if (hasSome || fileData.contentInfoDictionary() != nullptr) setContentInfo(fileData, contentInfo);
         fileData.setDisplayName(metaData->displayName().value_or(std::string{}));
+        if (metaData->knowsRejectedLabels()) setRejectedLabels(fileData, metaData->rejectedLabels());
     };
     return changeFileData(url, isLoopType(), change, error, options);
 }

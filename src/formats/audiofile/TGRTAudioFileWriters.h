@@ -23,8 +23,8 @@ class TGRTAudioFileContentInfoWriter : public TGRTContentInfoWriter {
                           Error* error = nullptr, const ContentWriteOptions& options = {}) const override;
 };
 
-/// Writes taggings, content info and display name. Key values, file type and UUID are not written: what the
-/// file says about the music stays.
+/// Writes taggings, content info, display name and rejected labels. Key values, file type and UUID are not
+/// written: what the file says about the music stays.
 class TGRTAudioFileMetaDataWriter : public TGRTMetaDataWriter {
   public:
     virtual bool isLoopType() const { return false; }

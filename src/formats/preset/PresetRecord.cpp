@@ -99,6 +99,15 @@ Reading<PropertyList::Dictionary> readTaggings(const PresetText& preset) {
     return reading;
 }
 
+Reading<std::set<std::string>> readRejectedLabels(const PresetText& preset) {
+    Reading<std::set<std::string>> reading;
+    for (auto& [key, value] : preset.items(kTagging)) {
+        reading.isRead.push_back(key == QVContentTaggingRejectedKeyName);
+        if (reading.isRead.back()) reading.value.insert(std::move(value));
+    }
+    return reading;
+}
+
 Reading<PropertyList::Array> readApplications(const PresetText& preset) {
     Reading<PropertyList::Array> reading;
     for (const PresetText::Item& item : preset.items(kApplicationInfo)) {
@@ -175,6 +184,7 @@ std::shared_ptr<TGRTMetaData> recordOfPreset(const PresetText& preset, TGRTTaxon
     record->setFileType(kFileTypeSynthPreset);
     const PropertyList taggings(readTaggings(preset).value);
     record->setTaggings(TGRTTagging::taggingsWithTaggingDictionary(&taggings, taxonomy));
+    record->setRejectedLabels(readRejectedLabels(preset).value);
     const PropertyList contentInfo(PropertyList::Dictionary{
         {std::string(QVContentInfoApplicationInfosKey), readApplications(preset).value},
         {std::string(QVContentInfoDependenciesKey), readDependencies(preset).value}});
@@ -217,6 +227,14 @@ void setContentInfo(PresetText& preset, const TGRTContentInfo& contentInfo) {
                     {QVContentInfoAppIdentifierKey, QVContentInfoMinimumVersionKey, QVContentInfoLegacyKey},
                     readApplications(preset).isRead, applications);
     preset.setItems(kAssetDependencies, {kPath}, readDependencies(preset).isRead, paths);
+}
+
+void setRejectedLabels(PresetText& preset, const std::set<std::string>& labels) {
+    const auto before = readRejectedLabels(preset);
+    if (before.value == labels) return;
+    PresetText::Items items;
+    for (const std::string& label : labels) addItem(items, QVContentTaggingRejectedKeyName, label);
+    preset.setItems(kTagging, {}, before.isRead, items);
 }
 
 void setDescription(PresetText& preset, const TGRTMetaData& record) {

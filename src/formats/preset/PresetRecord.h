@@ -5,6 +5,8 @@
 #include "taxonomy/TGRTTaxonomy.h"
 
 #include <memory>
+#include <set>
+#include <string>
 
 namespace qvct {
 
@@ -16,6 +18,7 @@ std::shared_ptr<TGRTMetaData> recordOfPreset(const PresetText& preset, TGRTTaxon
 /// Replaces the stored taggings and removes the stored UUID.
 void setTaggings(PresetText& preset, const ObjectSet<TGRTTagging>& taggings);
 void setContentInfo(PresetText& preset, const TGRTContentInfo& contentInfo);
+void setRejectedLabels(PresetText& preset, const std::set<std::string>& labels);
 /// Replaces display name and key values, and the sub type unless the record has none.
 void setDescription(PresetText& preset, const TGRTMetaData& record);
 

@@ -59,6 +59,7 @@ bool TGRTVorthalPresetMetaDataWriter::writeMetaData(const std::shared_ptr<TGRTMe
         setTaggings(preset, metaData->taggings());
         if (metaData->contentInfo()) setContentInfo(preset, *metaData->contentInfo());
         setDescription(preset, *metaData);
+        if (metaData->knowsRejectedLabels()) setRejectedLabels(preset, metaData->rejectedLabels());
     };
     return changePreset(url, change, error, options);
 }

@@ -59,6 +59,7 @@ std::shared_ptr<TGRTMetaData> TGRTBinaryFileMetaDataReader::readMetaDataFromFile
     const PropertyList::Dictionary dictionary = extracted.value_or(PropertyList::Dictionary{});
     auto record = TGRTMetaData::init();
     record->setTaggings(TGRTMetaData::taggingsFromDictionary(dictionary, *taxonomy()));
+    record->setRejectedLabels(TGRTMetaData::rejectedLabelsFromDictionary(dictionary));
     if (dictionary.value(QVContentTaggingTypeKeyName) != nullptr)
         record->setFileType(dictionary.integerValue(QVContentTaggingTypeKeyName).value_or(kFileTypeNone));
     if (const auto* name = dictionary.string(QVContentTaggingDisplayKeyName)) record->setDisplayName(*name);

@@ -91,6 +91,14 @@ void LCFileData::setContentInfoDictionary(Dictionary value) {
     record_.set(QVContentInfoKey, std::move(value));
 }
 
+void LCFileData::setRejectedLabels(std::optional<PropertyList> value) {
+    if (value) {
+        record_.set(QVContentTaggingRejectedKeyName, *std::move(value));
+    } else {
+        record_.remove(QVContentTaggingRejectedKeyName);
+    }
+}
+
 std::string LCFileData::displayName() const {
     return text(QVContentTaggingDisplayKeyName).value_or(facts_.displayName);
 }

@@ -66,6 +66,8 @@ class LCFileData {
     /// Null when there is none.
     const Dictionary* contentInfoDictionary() const;
     void setContentInfoDictionary(Dictionary value);
+    /// Labels of tags that a person rejected, an array as the record holds it; nothing removes it.
+    void setRejectedLabels(std::optional<PropertyList> value);
     std::string displayName() const;
     void setDisplayName(std::string_view value);
 

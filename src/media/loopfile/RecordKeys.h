@@ -14,6 +14,7 @@ inline constexpr std::string_view QVContentTaggingTypeKeyName = "Type";
 inline constexpr std::string_view QVContentTaggingSubTypeKeyName = "SubType";
 inline constexpr std::string_view QVContentTaggingDisplayKeyName = "DisplayName";
 inline constexpr std::string_view QVContentTaggingUUIDKeyName = "UUID";
+inline constexpr std::string_view QVContentTaggingRejectedKeyName = "Rejected";
 /// @}
 
 /// @{

@@ -111,6 +111,22 @@ TEST(Presets, KeepLinesThatMakeNoSenseWhereTheyStand) {
     }
 }
 
+TEST(Presets, SayWhatIsRejectedBehindTheirTags) {
+    const TemporaryFolder folder;
+    const std::string path = folder.write("a.vcp", kPreset);
+    const auto record = read(path);
+    record->setRejectedLabels({"A = B", "Kick"});
+    ASSERT_TRUE(TGRTVorthalPresetMetaDataWriter().writeMetaData(record, urlOf(path)));
+    EXPECT_THAT(*readTextFile(path), HasSubstr("\nRejected = A \\= B\nRejected = Kick\n</tagging>\n"));
+    ASSERT_TRUE(TGRTVorthalPresetMetaDataWriter().writeMetaData(TGRTMetaData::init(), urlOf(path)));
+    const auto again = read(path);
+    EXPECT_EQ(again->rejectedLabels(), record->rejectedLabels());
+    again->setRejectedLabels({});
+    again->setTaggings(record->taggings());
+    ASSERT_TRUE(TGRTVorthalPresetMetaDataWriter().writeMetaData(again, urlOf(path)));
+    EXPECT_THAT(*readTextFile(path), testing::Not(HasSubstr("Rejected")));
+}
+
 TEST(Presets, KeepEveryTextThatARecordHolds) {
     const TemporaryFolder folder;
     const std::string awkward = "a = b\\n \\= \r\n</tagging>\nAttribs = 4001 \xe2\x99\xab ";
