@@ -57,6 +57,7 @@ set(QVCT_PUBLIC_HEADERS
   autotagging/xml/QVCTXMLDocument.h
   autotagging/xml/QVSKXMLNode.h
   autotagging/ItemTagger.h
+  autotagging/ResourceFiles.h
   autotagging/evidence/ClaimResolver.h
   autotagging/evidence/EvidenceWeights.h
   autotagging/evidence/SoundKind.h

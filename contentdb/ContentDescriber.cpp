@@ -3,6 +3,7 @@
 #include "autotagging/ContentItem.h"
 #include "autotagging/ItemTagger.h"
 #include "autotagging/QVTaggingAggregator.h"
+#include "autotagging/ResourceFiles.h"
 #include "contentdb/index/PayloadHash.h"
 #include "contentdb/store/Digest.h"
 #include "formats/QVContentTaggingTypes.h"
@@ -14,7 +15,6 @@
 #include "platform/text/Decimal.h"
 #include "platform/text/RegularExpression.h"
 #include "platform/text/Text.h"
-#include "resources/ReplacementFile.h"
 
 #include <array>
 #include <cmath>
@@ -185,7 +185,7 @@ std::uint64_t ContentDescriber::digest(std::uint64_t services) {
     digest.add(services);
     digest.add(version());
     digest.add(edition);
-    for (const ResourceFile& resource : kResourceFiles) {
+    for (const ResourceFile& resource : resourceFiles()) {
         const auto path = replacementFile(resource);
         const auto bytes = path ? readFile(*path) : std::nullopt;
         if (!bytes) continue;

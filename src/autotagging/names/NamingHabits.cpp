@@ -2,12 +2,8 @@
 
 #include "autotagging/keywords/QVCTKeywordExtractor.h"
 #include "autotagging/names/NamePieces.h"
-#include "platform/base/Log.h"
-#include "platform/base/Printable.h"
 #include "platform/data/PropertyListFile.h"
-#include "platform/text/Text.h"
 #include "resources/QVCTCompiledResources.h"
-#include "resources/ReplacementFile.h"
 #include "taxonomy/TGRTTaxonomy.h"
 #include "taxonomy/TagNormalization.h"
 
@@ -35,11 +31,8 @@ NamingHabits::Word packed(NamingHabits::Word phrase) {
     return phrase;
 }
 
-/// Whether a number is not zero, or a text begins with such a number: the old text form knows only texts.
-bool isYes(const PropertyList* value) {
-    if (value == nullptr) return false;
-    return (value->string() != nullptr ? leadingNumber(*value->string())
-                                       : value->doubleValue().value_or(0)) != 0;
+Dictionary builtInHabits() {
+    return QVCTCompiledResources::NamingHabitsPlist().value_or(Dictionary{});
 }
 
 /// Where the words of each role stand in the dictionary.
@@ -63,7 +56,7 @@ constexpr std::array<RoleList, 12> kRoleLists = {{{"Kinds", "Loop", NameRole::lo
 
 }  // namespace
 
-/// Builds habits from dictionaries, entry by entry.
+/// Builds habits from dictionaries, entry by entry, up to the first fault.
 class NamingHabitsReader {
   public:
     explicit NamingHabitsReader(const TGRTTaxonomy& taxonomy)
@@ -74,11 +67,11 @@ class NamingHabitsReader {
         addNames(dictionary, "Pitched", pitched_);
         addNames(dictionary, "Figurative", figurative_);
         addNames(dictionary, "Categories", categories_);
-        if (const Dictionary* labels = dictionary.dictionary("InFolders"))
-            for (const auto& [label, value] : *labels)
-                if (value.string() != nullptr) inFolders_[label] = *value.string();
-        return addNotes(dictionary, error) && addRoles(dictionary, error) && addMeanings(dictionary, error);
+        return areParts(dictionary, error) && addFolders(dictionary, error) && addNotes(dictionary, error) &&
+               addRoles(dictionary, error) && addMeanings(dictionary, error);
     }
+    /// Where the fault is.
+    const PropertyListPath& place() const { return place_; }
 
     /// The labels of the taxonomy, and the words of the keyword mapping, say themselves unless an entry says
     /// something else.
@@ -112,15 +105,59 @@ class NamingHabitsReader {
             if (name.string() != nullptr) names.insert(*name.string());
     }
 
+    bool refuse(Error* error, std::string reason, PropertyListPath path) {
+        place_ = std::move(path);
+        return failAtValue(error, kErrorMalformed, std::move(reason), place_);
+    }
+
+    /// Whether dictionaries stand where dictionaries must, and lists where lists must.
+    bool areParts(const Dictionary& dictionary, Error* error) {
+        for (const char* part : {"Meanings", "Kinds", "Modes", "Notes", "Accidentals", "InFolders"}) {
+            if (dictionary.value(part) != nullptr && dictionary.dictionary(part) == nullptr)
+                return refuse(error, "is no dictionary", {part});
+        }
+        for (const char* part : {"Pitched", "Figurative", "Categories"}) {
+            const PropertyList* list = dictionary.value(part);
+            if (list != nullptr && !isListOfTexts(*list)) return refuse(error, "is no list of texts", {part});
+        }
+        return true;
+    }
+
+    static bool isListOfTexts(const PropertyList& value) {
+        const PropertyList::Array* list = value.array();
+        return list != nullptr && std::all_of(list->begin(), list->end(),
+                                              [](const auto& text) { return text.string() != nullptr; });
+    }
+
+    bool addFolders(const Dictionary& dictionary, Error* error) {
+        const Dictionary* labels = dictionary.dictionary("InFolders");
+        if (labels == nullptr) return true;
+        for (const auto& [label, value] : *labels) {
+            if (value.string() == nullptr) return refuse(error, "is no label", {"InFolders", label});
+            inFolders_[label] = *value.string();
+        }
+        return std::all_of(labels->begin(), labels->end(), [&](const auto& entry) {
+            return !leadsBack(entry.key) ||
+                   refuse(error, "leads back to itself by what stands for it", {"InFolders", entry.key});
+        });
+    }
+
+    bool leadsBack(const std::string& label) const {
+        auto found = inFolders_.find(label);
+        for (std::size_t step = 0; step < inFolders_.size() && found != inFolders_.end(); ++step) {
+            if (found->second == label) return true;
+            found = inFolders_.find(found->second);
+        }
+        return false;
+    }
+
     bool addNotes(const Dictionary& dictionary, Error* error) {
         const Dictionary* notes = dictionary.dictionary("Notes");
         if (notes == nullptr) return true;
         return std::all_of(notes->begin(), notes->end(), [&](const auto& entry) {
-            const std::string* text = entry.value.string();
-            const double note =
-                text != nullptr ? leadingNumber(*text) : entry.value.doubleValue().value_or(-1);
-            if (note < 0 || note > 11)
-                return fail(error, kErrorMalformed, "is no note from 0 to 11", {.part = entry.key});
+            const double note = entry.value.numberValue().value_or(-1);
+            if (!(note >= 0 && note <= 11))
+                return refuse(error, "is no note from 0 to 11", {"Notes", entry.key});
             habits_->notes_[entry.key] = static_cast<int>(note);
             return true;
         });
@@ -129,10 +166,10 @@ class NamingHabitsReader {
     bool addRoles(const Dictionary& dictionary, Error* error) {
         for (const auto& [part, key, role] : kRoleLists) {
             const Dictionary* lists = key.empty() ? &dictionary : dictionary.dictionary(part);
-            const PropertyList::Array* words =
-                lists == nullptr ? nullptr : lists->array(key.empty() ? part : key);
-            const std::string entry = key.empty() ? std::string(part) : fmt::format("{}, {}", part, key);
-            if (words != nullptr && !addAll(*words, {.role = role}, entry, error)) return false;
+            const PropertyList* words = lists == nullptr ? nullptr : lists->value(key.empty() ? part : key);
+            PropertyListPath path = {std::string(part)};
+            if (!key.empty()) path.emplace_back(std::string(key));
+            if (words != nullptr && !addAll(*words, {.role = role}, path, error)) return false;
         }
         return true;
     }
@@ -142,8 +179,7 @@ class NamingHabitsReader {
         if (meanings == nullptr) return true;
         return std::all_of(meanings->begin(), meanings->end(), [&](const auto& entry) {
             const Dictionary* lists = entry.value.dictionary();
-            if (lists == nullptr)
-                return fail(error, kErrorMalformed, "has no lists of words", {.part = entry.key});
+            if (lists == nullptr) return refuse(error, "has no lists of words", {"Meanings", entry.key});
             const auto meaning = numberOf(entry.key);
             return !meaning || addMeaning(*meaning, *lists, entry.key, error);
         });
@@ -151,9 +187,9 @@ class NamingHabitsReader {
 
     bool addMeaning(std::uint32_t meaning, const Dictionary& lists, const std::string& entry, Error* error) {
         return std::all_of(kStrengths.begin(), kStrengths.end(), [&](const auto& strength) {
-            const PropertyList::Array* words = lists.array(strength.first);
-            return words == nullptr ||
-                   addAll(*words, {.meaning = meaning, .strength = strength.second}, entry, error);
+            const PropertyList* words = lists.value(strength.first);
+            return words == nullptr || addAll(*words, {.meaning = meaning, .strength = strength.second},
+                                              {"Meanings", entry, std::string(strength.first)}, error);
         });
     }
 
@@ -168,38 +204,40 @@ class NamingHabitsReader {
         return static_cast<std::uint32_t>(habits_->meanings_.size() - 1);
     }
 
-    bool addAll(const PropertyList::Array& words, Word word, const std::string& entry, Error* error) {
-        return std::all_of(words.begin(), words.end(), [&](const PropertyList& text) {
-            return text.string() != nullptr
-                       ? addWord(*text.string(), word, entry, error)
-                       : fail(error, kErrorMalformed, "is no list of texts", {.part = entry});
-        });
+    bool addAll(const PropertyList& words, Word word, const PropertyListPath& path, Error* error) {
+        if (!isListOfTexts(words)) return refuse(error, "is no list of texts", path);
+        const PropertyList::Array& texts = *words.array();
+        for (std::size_t i = 0; i < texts.size(); ++i) {
+            const std::string fault = addWord(*texts[i].string(), word);
+            if (fault.empty()) continue;
+            PropertyListPath place = path;
+            place.emplace_back(i);
+            return refuse(error, fmt::format("\"{}\" {}", *texts[i].string(), fault), std::move(place));
+        }
+        return true;
     }
 
-    bool addWord(const std::string& text, Word word, const std::string& entry, Error* error) {
+    /// What is wrong with the word; nothing when it was added.
+    std::string addWord(const std::string& text, Word word) {
         NamingHabits::Entry* place = placeFor(text, word.pieces);
-        if (place == nullptr) {
-            return fail(error, kErrorMalformed, fmt::format("\"{}\" is no word or phrase", printable(text)),
-                        {.part = entry});
-        }
+        if (place == nullptr) return "is no word or phrase";
         if (place->source == source_ && place->word.strength == NameStrength::hint) {
             std::swap(place->word, word);
             std::swap(place->word.other, word.other);
         }
         if (place->source == source_ && word.strength == NameStrength::hint) {
-            if (addHint(*place, word)) return true;
-            return fail(error, kErrorTooLarge,
-                        fmt::format("\"{}\" hints at more than {} things", printable(text), kMostHints),
-                        {.part = entry});
+            if (addHint(*place, word)) return {};
+            return fmt::format("hints at more than {} things", kMostHints);
         }
         if (place->source == source_) {
-            return fail(error, kErrorMalformed,
-                        fmt::format("\"{}\" stands in another entry as well", printable(text)),
-                        {.part = entry});
+            return place->word.meaning == Word::kNoMeaning
+                       ? "stands in another entry as well"
+                       : fmt::format("stands in another entry as well, for {}",
+                                     habits_->meaning(place->word.meaning).label);
         }
         place->word = word;
         place->source = source_;
-        return true;
+        return {};
     }
 
     /// A word may hint at several things besides what it says.
@@ -253,7 +291,27 @@ class NamingHabitsReader {
     Names categories_;
     std::map<std::string, std::string> inFolders_;
     std::uint8_t source_ = 0;
+    PropertyListPath place_;
 };
+
+namespace {
+
+/// Those of a file, alone or added to the built-in ones; null, and an error with the line, when it has a
+/// fault.
+std::shared_ptr<const NamingHabits> habitsInFile(const std::string& path, Error* error) {
+    auto own = readDictionaryFile(path, error);
+    if (!own) return nullptr;
+    std::vector<Dictionary> dictionaries;
+    if (own->boolValue("Adds")) dictionaries.push_back(builtInHabits());
+    dictionaries.push_back(*std::move(own));
+    PropertyListPath place;
+    auto habits =
+        NamingHabits::initWithDictionaries(dictionaries, *TGRTTaxonomy::defaultTaxonomy(), error, &place);
+    if (!habits) failInFile(path, place, error);
+    return habits;
+}
+
+}  // namespace
 
 const NamingHabits::Entry* NamingHabits::find(std::string_view text) const {
     const auto found = entries_.find(text);
@@ -334,30 +392,28 @@ std::vector<std::string> NamingHabits::labelsMeant(std::string_view text) const 
 }
 
 std::shared_ptr<const NamingHabits> NamingHabits::initWithDictionaries(
-    std::span<const PropertyList::Dictionary> dictionaries, const TGRTTaxonomy& taxonomy, Error* error) {
+    std::span<const PropertyList::Dictionary> dictionaries, const TGRTTaxonomy& taxonomy, Error* error,
+    PropertyListPath* place) {
     NamingHabitsReader reader(taxonomy);
-    for (const PropertyList::Dictionary& dictionary : dictionaries)
-        if (!reader.add(dictionary, error)) return nullptr;
+    for (const PropertyList::Dictionary& dictionary : dictionaries) {
+        if (reader.add(dictionary, error)) continue;
+        if (place != nullptr) *place = reader.place();
+        return nullptr;
+    }
     reader.addOwnWords(QVCTKeywordExtractor::defaultKeywordMapping());
     return std::move(reader).finish();
 }
 
+ResourceFile NamingHabits::file() {
+    return {"NamingHabits", "plist",
+            [](const std::string& path, Error* error) { return habitsInFile(path, error) != nullptr; }};
+}
+
 std::shared_ptr<const NamingHabits> NamingHabits::defaultHabits() {
-    const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
-    const auto builtIn = [] { return QVCTCompiledResources::NamingHabitsPlist().value_or(Dictionary{}); };
-    if (const auto path = replacementFile({"NamingHabits", "plist"})) {
-        std::vector<Dictionary> dictionaries;
-        Error error;
-        auto own = readDictionaryFile(*path, &error);
-        if (own && isYes(own->value("Adds"))) dictionaries.push_back(builtIn());
-        if (own) dictionaries.push_back(*std::move(own));
-        auto habits = error.isSet() ? nullptr : initWithDictionaries(dictionaries, *taxonomy, &error);
-        if (habits) return habits;
-        failIn(*path, &error);
-        log(fmt::format("{} (using the built-in naming habits)", error.message()));
-    }
-    const Dictionary own[] = {builtIn()};
-    return initWithDictionaries(own, *taxonomy);
+    const auto path = replacementFile(file());
+    if (auto habits = path ? habitsInFile(*path, nullptr) : nullptr) return habits;
+    const Dictionary own[] = {builtInHabits()};
+    return initWithDictionaries(own, *TGRTTaxonomy::defaultTaxonomy());
 }
 
 }  // namespace qvct
