@@ -77,6 +77,7 @@ set(QVCT_PUBLIC_HEADERS
 set(QVCT_PUBLIC_DATABASE_HEADERS
   contentdb/ContentDatabase.h
   contentdb/ContentDescriber.h
+  contentdb/Explanation.h
   contentdb/IndexedItem.h
   contentdb/Indexer.h
   contentdb/IndexWorker.h

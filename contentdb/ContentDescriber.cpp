@@ -6,6 +6,7 @@
 #include "autotagging/ResourceFiles.h"
 #include "contentdb/index/PayloadHash.h"
 #include "contentdb/store/Digest.h"
+#include "contentdb/store/ExplanationCodec.h"
 #include "formats/QVContentTaggingTypes.h"
 #include "indexing/TGRTIndexableContentObject.h"
 #include "media/loopfile/LCFileData.h"
@@ -47,12 +48,14 @@ void addTaggings(IndexedItem& item, Taggings& known, const Taggings& added, Prov
     }
 }
 
-/// The word, or the rule: what a person needs to understand the tag.
-std::string evidenceOf(const TagClaim& claim) {
-    constexpr std::size_t longest = 80;
-    const std::string& text =
-        claim.evidence.what.empty() || claim.service == "rules" ? claim.evidence.where : claim.evidence.what;
-    return text.size() <= longest ? text : std::string();
+/// Which of the item's taggings it is; their number when it is none.
+std::size_t placeOf(const TGRTTagging& tagging, const IndexedItem& item) {
+    const IndexedTagging wanted = indexed(tagging, Provenance::automatic, {});
+    const auto found =
+        std::find_if(item.taggings.begin(), item.taggings.end(), [&wanted](const IndexedTagging& its) {
+            return its.label == wanted.label && its.category == wanted.category && its.level == wanted.level;
+        });
+    return static_cast<std::size_t>(found - item.taggings.begin());
 }
 
 /// Whether the number only says that nothing is known.
@@ -145,17 +148,21 @@ struct ContentDescriber::Implementation {
 
     void addDecided(IndexedItem& item, Taggings& known, const std::shared_ptr<ContentItem>& content) {
         const std::string path = content->url().path();
-        const ItemReport report = tagger.report(content, ItemNames(path, rootOf(path)), services);
+        ItemReport report = tagger.report(content, ItemNames(path, rootOf(path)), services);
         namedTempo = report.tempo;
-        for (const HeldTag& held : report.resolution.held) {
+        Explanation explanation{true, report.kind, report.tempo, {}, std::move(report.resolution.dropped)};
+        for (HeldTag& held : report.resolution.held) {
             const auto tagging = held.tagging();
-            if (!tagging || !known.insert(tagging)) continue;
-            const TagClaim* best = held.claims.empty() ? nullptr : &held.claims.front();
-            auto& added = item.taggings.emplace_back(indexed(
-                *tagging, Provenance::automatic, best == nullptr ? std::string_view() : best->service));
-            added.confidence = static_cast<float>(held.confidence);
-            if (best != nullptr) added.evidence = evidenceOf(*best);
+            if (!tagging) continue;
+            const bool isNew = known.insert(tagging);
+            const std::size_t place = isNew ? item.taggings.size() : placeOf(*tagging, item);
+            const std::string_view service =
+                held.claims.empty() ? std::string_view() : held.claims.front().service;
+            if (isNew) item.taggings.push_back(indexed(*tagging, Provenance::automatic, service));
+            if (place < item.taggings.size())
+                explanation.held.push_back({place, held.confidence, std::move(held.claims)});
         }
+        item.explanation = encodedExplanation(explanation, item.path);
     }
 
     void addTempoAndBeats(IndexedItem& item, const LCFileData* file, const std::string& fileName) {
@@ -180,7 +187,7 @@ ContentDescriber::~ContentDescriber() = default;
 
 std::uint64_t ContentDescriber::digest(std::uint64_t services) {
     // Raised when a change makes items be described differently although the version stays the same.
-    constexpr std::uint64_t edition = 5;
+    constexpr std::uint64_t edition = 6;
     Digest digest;
     digest.add(services);
     digest.add(version());
@@ -209,6 +216,7 @@ std::optional<IndexedItem> ContentDescriber::describe(const std::string& path, E
     const auto object = TGRTIndexableContentObject::indexableContentObjectForMetaData(record.get(), url,
                                                                                       *its.taxonomyOfRecords);
     IndexedItem item;
+    item.path = path;
     item.name = url.lastPathComponentWithoutExtension();
     if (object->displayName() != item.name) item.title = object->displayName();
     item.fileType = object->fileType();
