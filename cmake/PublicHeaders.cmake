@@ -58,6 +58,7 @@ set(QVCT_PUBLIC_HEADERS
   autotagging/xml/QVCTXMLDocument.h
   autotagging/xml/QVSKXMLNode.h
   autotagging/ItemTagger.h
+  autotagging/ResourceFiles.h
   autotagging/evidence/ClaimResolver.h
   autotagging/evidence/EvidenceWeights.h
   autotagging/evidence/Rejections.h
@@ -78,6 +79,7 @@ set(QVCT_PUBLIC_HEADERS
 set(QVCT_PUBLIC_DATABASE_HEADERS
   contentdb/ContentDatabase.h
   contentdb/ContentDescriber.h
+  contentdb/Explanation.h
   contentdb/IndexedItem.h
   contentdb/Indexer.h
   contentdb/IndexWorker.h

@@ -3,8 +3,10 @@
 #include "autotagging/ContentItem.h"
 #include "autotagging/ItemTagger.h"
 #include "autotagging/QVTaggingAggregator.h"
+#include "autotagging/ResourceFiles.h"
 #include "contentdb/index/PayloadHash.h"
 #include "contentdb/store/Digest.h"
+#include "contentdb/store/ExplanationCodec.h"
 #include "formats/QVContentTaggingTypes.h"
 #include "indexing/TGRTIndexableContentObject.h"
 #include "media/loopfile/LCFileData.h"
@@ -14,7 +16,6 @@
 #include "platform/text/Decimal.h"
 #include "platform/text/RegularExpression.h"
 #include "platform/text/Text.h"
-#include "resources/ReplacementFile.h"
 
 #include <array>
 #include <cmath>
@@ -47,19 +48,14 @@ void addTaggings(IndexedItem& item, Taggings& known, const Taggings& added, Prov
     }
 }
 
-Taggings withoutRejected(const Taggings& taggings, const Rejections& rejections) {
-    Taggings result;
-    for (const auto& tagging : taggings)
-        if (rejections.reasonFor(*tagging->tag()).empty()) result.insert(tagging);
-    return result;
-}
-
-/// The word, or the rule: what a person needs to understand the tag.
-std::string evidenceOf(const TagClaim& claim) {
-    constexpr std::size_t longest = 80;
-    const std::string& text =
-        claim.evidence.what.empty() || claim.service == "rules" ? claim.evidence.where : claim.evidence.what;
-    return text.size() <= longest ? text : std::string();
+/// Which of the item's taggings it is; their number when it is none.
+std::size_t placeOf(const TGRTTagging& tagging, const IndexedItem& item) {
+    const IndexedTagging wanted = indexed(tagging, Provenance::automatic, {});
+    const auto found =
+        std::find_if(item.taggings.begin(), item.taggings.end(), [&wanted](const IndexedTagging& its) {
+            return its.label == wanted.label && its.category == wanted.category && its.level == wanted.level;
+        });
+    return static_cast<std::size_t>(found - item.taggings.begin());
 }
 
 /// Whether the number only says that nothing is known.
@@ -129,13 +125,14 @@ struct ContentDescriber::Implementation {
 
     void addAllTaggings(IndexedItem& item, const std::shared_ptr<ContentItem>& content,
                         const TGRTMetaData* record, const Taggings& withVirtual) {
-        const auto report = reportOf(content);
-        const Rejections rejections = report ? report->rejections : Rejections();
+        auto report = reportOf(content);
         Taggings known;
-        if (record != nullptr)
-            addTaggings(item, known, withoutRejected(record->taggings(), rejections), Provenance::stored);
-        addTaggings(item, known, withoutRejected(withVirtual, rejections), Provenance::virtualTag);
-        if (report) return addDecided(item, known, *report);
+        const auto add = [&](const Taggings& taggings, Provenance provenance) {
+            addTaggings(item, known, report ? report->withoutRejected(taggings) : taggings, provenance);
+        };
+        if (record != nullptr) add(record->taggings(), Provenance::stored);
+        add(withVirtual, Provenance::virtualTag);
+        if (report) return addDecided(item, known, *std::move(report));
         for (const auto& [name, option] : kTaggingServiceNames) {
             if ((services & option) == 0) continue;
             addTaggings(item, known, aggregator->taggingsOfItem(content, *taxonomyOfServices, option),
@@ -158,21 +155,32 @@ struct ContentDescriber::Implementation {
     std::optional<ItemReport> reportOf(const std::shared_ptr<ContentItem>& content) {
         if ((services & QVCTAutoTaggingOptionNames) == 0) return std::nullopt;
         const std::string path = content->url().path();
-        return tagger.report(content, ItemNames(path, rootOf(path)), services);
-    }
-
-    void addDecided(IndexedItem& item, Taggings& known, const ItemReport& report) {
+        ItemReport report = tagger.report(content, ItemNames(path, rootOf(path)), services);
         namedTempo = report.tempo;
         namedBeats = report.beats;
-        for (const HeldTag& held : report.resolution.held) {
+        return report;
+    }
+
+    void addDecided(IndexedItem& item, Taggings& known, ItemReport report) {
+        Explanation explanation;
+        explanation.isWhole = true;
+        explanation.kind = report.kind;
+        explanation.tempo = report.tempo;
+        explanation.isTempoFromLength = report.isTempoFromLength;
+        explanation.beats = report.beats;
+        explanation.dropped = std::move(report.resolution.dropped);
+        for (HeldTag& held : report.resolution.held) {
             const auto tagging = held.tagging();
-            if (!tagging || !known.insert(tagging)) continue;
-            const TagClaim* best = held.claims.empty() ? nullptr : &held.claims.front();
-            auto& added = item.taggings.emplace_back(indexed(
-                *tagging, Provenance::automatic, best == nullptr ? std::string_view() : best->service));
-            added.confidence = static_cast<float>(held.confidence);
-            if (best != nullptr) added.evidence = evidenceOf(*best);
+            if (!tagging) continue;
+            const bool isNew = known.insert(tagging);
+            const std::size_t place = isNew ? item.taggings.size() : placeOf(*tagging, item);
+            const std::string_view service =
+                held.claims.empty() ? std::string_view() : held.claims.front().service;
+            if (isNew) item.taggings.push_back(indexed(*tagging, Provenance::automatic, service));
+            if (place < item.taggings.size())
+                explanation.held.push_back({place, held.confidence, std::move(held.claims)});
         }
+        item.explanation = encodedExplanation(explanation, item.path);
     }
 
     void addTempoAndBeats(IndexedItem& item, const LCFileData* file, const std::string& fileName) {
@@ -203,7 +211,7 @@ std::uint64_t ContentDescriber::digest(std::uint64_t services) {
     digest.add(services);
     digest.add(version());
     digest.add(edition);
-    for (const ResourceFile& resource : kResourceFiles) {
+    for (const ResourceFile& resource : resourceFiles()) {
         const auto path = replacementFile(resource);
         const auto bytes = path ? readFile(*path) : std::nullopt;
         if (!bytes) continue;
@@ -227,6 +235,7 @@ std::optional<IndexedItem> ContentDescriber::describe(const std::string& path, E
     const auto object = TGRTIndexableContentObject::indexableContentObjectForMetaData(record.get(), url,
                                                                                       *its.taxonomyOfRecords);
     IndexedItem item;
+    item.path = path;
     item.name = url.lastPathComponentWithoutExtension();
     if (object->displayName() != item.name) item.title = object->displayName();
     item.fileType = object->fileType();

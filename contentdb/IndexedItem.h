@@ -33,10 +33,6 @@ struct IndexedTagging {
     std::string service;
     /// A service made it, now or before it was stored.
     bool isAuto = false;
-    /// How sure the services are, in [0, 1], and what they saw: a word of the name, a rule. Only of those
-    /// that are automatic.
-    std::optional<float> confidence = {};
-    std::string evidence = {};
 
     bool operator==(const IndexedTagging&) const = default;
 };
@@ -84,6 +80,9 @@ struct IndexedItem {
     std::int64_t subFileType = 0;
     bool previewAvailable = false;
     std::vector<IndexedTagging> taggings;
+    /// Why the services' taggings hold, for `explanationOf`, in a form that is the database's own. Empty when
+    /// the describer does not say.
+    std::string explanation;
     /// Numbers under the keys of the record ("BeatCount", "MidiRootNote", ...) and "Tempo" in beats a minute.
     std::vector<IndexedValue> values;
     std::vector<std::string> packs;

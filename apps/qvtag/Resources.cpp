@@ -1,11 +1,11 @@
 #include "Resources.h"
 
 #include "ToolContext.h"
+#include "autotagging/ResourceFiles.h"
 #include "autotagging/keywords/QVCTKeywordExtractor.h"
 #include "platform/data/PropertyListFile.h"
 #include "platform/files/FileAccess.h"
 #include "platform/files/ResourceBundle.h"
-#include "resources/ReplacementFile.h"
 #include "resources/ResourceDictionary.h"
 
 namespace qvct::tool {
@@ -17,7 +17,7 @@ void useResources(const std::string& directory, const std::string& taxonomyFile,
         context.itemFailed(errorOf(kErrorUnreadable, "no such resource folder", {folder}));
     }
     if (!taxonomyFile.empty()) ResourceBundle::setPathForResource("DefaultTaxonomy", "plist", taxonomyFile);
-    for (const ResourceFile& resource : kResourceFiles) {
+    for (const ResourceFile& resource : resourceFiles()) {
         Error error;
         const auto path = replacementFile(resource, &error);
         if (error.isSet()) context.itemFailed(error);

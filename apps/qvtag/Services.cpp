@@ -1,6 +1,5 @@
 #include "Services.h"
 
-#include "CommandLine.h"
 #include "autotagging/services/TaggingServiceNames.h"
 #include "platform/text/Text.h"
 
@@ -20,8 +19,8 @@ std::string allNames() {
 
 }  // namespace
 
-void addServicesOption(Command& command, std::vector<std::string>& names) {
-    command.addOption("--services", names, "Only these services derive tags: " + allNames())
+Option addServicesOption(Command& command, std::vector<std::string>& names) {
+    return command.addOption("--services", names, "Only these services derive tags: " + allNames())
         .separatedBy(',')
         .oneWordEach()
         .valueName("A,B");

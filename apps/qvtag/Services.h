@@ -1,5 +1,6 @@
 #pragma once
 
+#include "CommandLine.h"
 #include "ToolContext.h"
 
 #include <cstdint>
@@ -8,10 +9,8 @@
 
 namespace qvct::tool {
 
-class Command;
-
 /// Adds "--services", which takes one list, so that paths may follow it.
-void addServicesOption(Command& command, std::vector<std::string>& names);
+Option addServicesOption(Command& command, std::vector<std::string>& names);
 
 /// The options of the services by name; of all of them when none is named. A wrong name is reported and left
 /// out.

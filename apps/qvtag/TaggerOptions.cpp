@@ -1,6 +1,5 @@
 #include "TaggerOptions.h"
 
-#include "CommandLine.h"
 #include "Resources.h"
 #include "Services.h"
 #include "ToolContext.h"
@@ -34,12 +33,20 @@ Settings keywordsIn(const std::string& file, ToolContext& context) {
 
 }  // namespace
 
-void TaggerOptions::addTo(Command& command) {
-    addServicesOption(command, services);
-    command.addOption("--keywords", keywordsFile, "Property list of keywords to use instead of the built-in")
-        .valueName("FILE");
-    command.addOption("--rules", rulesFile, "Property list of rules to use instead of the built-in")
-        .valueName("FILE");
+Option TaggerOptions::addTo(Command& command, const Option* other) {
+    const Option itsPaths = command.addOption("paths", paths, "Files and folders").valueName("PATH");
+    const auto excluding = [other](Option option) {
+        if (other != nullptr) option.excludes(*other);
+    };
+    excluding(command.addFollowFlag(links));
+    excluding(addServicesOption(command, services));
+    excluding(
+        command
+            .addOption("--keywords", keywordsFile, "Property list of keywords to use instead of the built-in")
+            .valueName("FILE"));
+    excluding(command.addOption("--rules", rulesFile, "Property list of rules to use instead of the built-in")
+                  .valueName("FILE"));
+    return itsPaths;
 }
 
 std::shared_ptr<QVTaggingAggregator> TaggerOptions::aggregator(ToolContext& context) const {

@@ -42,6 +42,8 @@ class ToolContext {
     void note(std::string_view message) const;
     /// 0 done, 1 some items failed, 2 wrong usage.
     int exitStatus() const { return exitStatus_; }
+    /// Whether `usageFailed` was called.
+    bool isUsageWrong() const { return exitStatus_ == 2; }
 
     /// Calls `show` for every content item at or below the paths as it is found, until output is lost. What
     /// cannot be read is reported. Names that are not UTF-8 are reported and left out. One note lists the

@@ -1,8 +1,8 @@
 #include "contentdb/index/WorkerSettings.h"
 
+#include "autotagging/ResourceFiles.h"
 #include "contentdb/store/ItemCodec.h"
 #include "platform/files/ResourceBundle.h"
-#include "resources/ReplacementFile.h"
 
 #include <optional>
 
@@ -11,7 +11,7 @@ namespace qvct::contentdb {
 std::string encodedWorkerSettings() {
     ByteWriter out;
     out.text(ResourceBundle::directory());
-    for (const ResourceFile& resource : kResourceFiles) {
+    for (const ResourceFile& resource : resourceFiles()) {
         // Decided here, so that every worker uses the same file and a broken one is reported only once.
         const auto path = replacementFile(resource);
         out.text(path.value_or(std::string()));
@@ -22,7 +22,7 @@ std::string encodedWorkerSettings() {
 void applyWorkerSettings(std::string_view settings) {
     ByteReader in(settings);
     ResourceBundle::setDirectory(std::string(in.text()));
-    for (const ResourceFile& resource : kResourceFiles) {
+    for (const ResourceFile& resource : resourceFiles()) {
         const std::string path(in.text());
         ResourceBundle::setPathForResource(resource.name, resource.extension,
                                            path.empty() ? std::nullopt : std::optional(path));

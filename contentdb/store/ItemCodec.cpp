@@ -1,8 +1,9 @@
 #include "contentdb/store/ItemCodec.h"
 
-#include <algorithm>
+#include "contentdb/store/ExplanationCodec.h"
+#include "contentdb/store/ServiceNumbers.h"
+
 #include <bit>
-#include <cmath>
 #include <cstring>
 
 namespace qvct::contentdb {
@@ -18,29 +19,33 @@ void write(ByteWriter& out, const IndexedTagging& tagging) {
     out.number(tagging.level ? 1 : 0);
     if (tagging.level) out.number(std::bit_cast<std::uint32_t>(*tagging.level));
     out.number(static_cast<std::uint64_t>(tagging.provenance));
-    out.text(tagging.service);
+    // Its number takes less room, and is a character that no name is made of.
+    const std::size_t number = numberOfService(tagging.service);
+    out.text(number == 0 ? tagging.service : std::string(1, static_cast<char>(number)));
     out.number(tagging.isAuto ? 1 : 0);
 }
 
-constexpr float kConfidenceSteps = 1000;
+/// Stands before an explanation. Earlier editions have here, of every tagging, 0 or one more than its
+/// confidence in thousandths, and then the evidence; no tag holds with a confidence of 0.
+constexpr std::uint64_t kExplanationFollows = 1;
 
-/// Of every tagging: 0, or one more than its confidence in thousandths, and the evidence.
-void writeEvidence(ByteWriter& out, const std::vector<IndexedTagging>& taggings) {
-    for (const IndexedTagging& tagging : taggings) {
-        const auto& confidence = tagging.confidence;
-        out.number(confidence ? 1 + static_cast<std::uint64_t>(std::lround(*confidence * kConfidenceSteps))
-                              : 0);
-        if (confidence) out.text(tagging.evidence);
-    }
-}
-
-void readEvidence(ByteReader& in, std::vector<IndexedTagging>& taggings) {
-    for (IndexedTagging& tagging : taggings) {
-        const std::uint64_t steps = in.number();
+/// What those editions kept, in the form of today.
+std::string explanationOfEarlierEdition(ByteReader& in, std::uint64_t steps, const IndexedItem& item) {
+    constexpr double kSteps = 1000;
+    Explanation explanation;
+    for (std::size_t i = 0; i < item.taggings.size(); ++i) {
+        if (i > 0) steps = in.number();
         if (steps == 0) continue;
-        tagging.confidence = std::min(static_cast<float>(steps - 1) / kConfidenceSteps, 1.0F);
-        tagging.evidence = in.text();
+        Explanation::Held& held = explanation.held.emplace_back();
+        held.tagging = i;
+        held.confidence = static_cast<double>(steps - 1) / kSteps;
+        TagClaim claim;
+        claim.service = serviceOfNumber(numberOfService(item.taggings[i].service));
+        claim.confidence = held.confidence;
+        claim.evidence.what = in.text();
+        if (!item.taggings[i].service.empty()) held.claims.push_back(std::move(claim));
     }
+    return encodedExplanation(explanation, {});
 }
 
 IndexedTagging readTagging(ByteReader& in) {
@@ -50,7 +55,9 @@ IndexedTagging readTagging(ByteReader& in) {
     for (std::size_t left = in.count(); left > 0; --left) tagging.ancestors.emplace_back(in.text());
     if (in.number() != 0) tagging.level = std::bit_cast<float>(static_cast<std::uint32_t>(in.number()));
     tagging.provenance = static_cast<Provenance>(in.number());
-    tagging.service = in.text();
+    const std::string_view service = in.text();
+    const std::size_t number = service.size() == 1 ? static_cast<unsigned char>(service[0]) : 0;
+    tagging.service = number > 0 && number < ' ' ? serviceOfNumber(number) : service;
     tagging.isAuto = in.number() != 0;
     return tagging;
 }
@@ -172,10 +179,10 @@ std::string encodedDescription(const IndexedItem& item) {
         out.text(dependency.path);
     }
     out.text(item.failure);
-    const bool hasEvidence = std::any_of(item.taggings.begin(), item.taggings.end(),
-                                         [](const auto& tagging) { return tagging.confidence.has_value(); });
-    if (!item.title.empty() || hasEvidence) out.text(item.title);
-    if (hasEvidence) writeEvidence(out, item.taggings);
+    if (!item.title.empty() || !item.explanation.empty()) out.text(item.title);
+    if (item.explanation.empty()) return out.take();
+    out.number(kExplanationFollows);
+    out.text(item.explanation);
     return out.take();
 }
 
@@ -196,7 +203,11 @@ bool decodeDescription(std::string_view bytes, IndexedItem& item) {
     }
     item.failure = in.text();
     if (!in.isAtEnd()) item.title = in.text();
-    if (!in.isAtEnd()) readEvidence(in, item.taggings);
+    if (!in.isAtEnd()) {
+        const std::uint64_t first = in.number();
+        item.explanation = first == kExplanationFollows ? std::string(in.text())
+                                                        : explanationOfEarlierEdition(in, first, item);
+    }
     return in.isIntact() && in.isAtEnd();
 }
 

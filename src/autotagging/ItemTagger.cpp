@@ -138,6 +138,19 @@ ObjectSet<TGRTTagging> ItemReport::taggings() const {
     return taggings;
 }
 
+ObjectSet<TGRTTagging> ItemReport::withoutRejected(const ObjectSet<TGRTTagging>& stored) {
+    ObjectSet<TGRTTagging> kept;
+    for (const auto& tagging : stored) {
+        std::string reason = rejections.reasonFor(*tagging->tag());
+        if (reason.empty()) {
+            kept.insert(tagging);
+        } else {
+            resolution.dropped.push_back({tagging->label(), 1, std::move(reason), {}});
+        }
+    }
+    return kept;
+}
+
 ItemTagger::ItemTagger(std::shared_ptr<QVTaggingAggregator> aggregator,
                        std::shared_ptr<const TGRTTaxonomy> taxonomy)
     : aggregator_(std::move(aggregator)), taxonomy_(std::move(taxonomy)), resolver_(taxonomy_) {}

@@ -33,6 +33,8 @@ struct QVCT_API ItemReport {
 
     /// The tags that hold, marked as automatic.
     ObjectSet<TGRTTagging> taggings() const;
+    /// Those that a person did not reject; the others are added to what does not hold.
+    ObjectSet<TGRTTagging> withoutRejected(const ObjectSet<TGRTTagging>& stored);
 };
 
 /// Tags items as a person would: weighs what the services claim, lets what stands in an item's own name

@@ -33,6 +33,7 @@ bool isMappingTable(std::string_view text, const std::string& path, Error* error
 }
 
 bool isUsable(const ResourceFile& resource, const std::string& path, Error* error) {
+    if (resource.isUsable != nullptr) return resource.isUsable(path, error);
     if (resource.extension == "plist") return readResourceDictionary(resource.name, path, error).has_value();
     const auto text = readTextFile(path, error);
     return text && (!resource.name.ends_with("TaxonomyMapping") || isMappingTable(*text, path, error));

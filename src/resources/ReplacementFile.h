@@ -9,25 +9,14 @@
 
 namespace qvct {
 
-/// The name of a data file that is built into the library and that another file may replace.
+/// A data file that is built into the library and that another file may replace; `resourceFiles` lists them.
 struct ResourceFile {
     std::string_view name;
     std::string_view extension;
+    /// Whether the file at the path can be used; else false, and an error. Null where its form is all that
+    /// has to be right.
+    bool (*isUsable)(const std::string& path, Error* error) = nullptr;
 };
-
-/// The names of all such files.
-inline constexpr ResourceFile kResourceFiles[] = {{"DefaultTaxonomy", "plist"},
-                                                  {"DefaultRules", "plist"},
-                                                  {"DefaultKeywordMapping", "plist"},
-                                                  {"LegacyLoopTaxonomy", "plist"},
-                                                  {"LegacyLoopTaxonomyMapping", "csv"},
-                                                  {"LegacyVorthalTaxonomy", "plist"},
-                                                  {"LegacyVorthalTaxonomyMapping", "csv"},
-                                                  {"PackDisplayNames", "csv"},
-                                                  {"EvidenceWeights", "plist"},
-                                                  {"NamingHabits", "plist"},
-                                                  {"QVSearchKit", "js"},
-                                                  {"ExtractSoftwareInstrumentsRule", "js"}};
 
 /// The path of the file that replaces a resource: the one that `ResourceBundle` finds, provided that it is
 /// valid for that resource. Nothing when there is none or it is broken; use the built-in resource then. A

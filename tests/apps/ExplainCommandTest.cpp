@@ -1,6 +1,8 @@
 #include "support/AudioFixtures.h"
 #include "support/RunTool.h"
 
+#include <filesystem>
+
 #include <gmock/gmock.h>
 
 namespace qvct::test {
@@ -45,17 +47,120 @@ TEST(Explain, ShowsWhyEachTagIsThereAndWhatWasDropped) {
     EXPECT_THAT(table, HasSubstr("\"Snares\" in the folder \"Snares\""));
 }
 
+/// The tags that only databases know, which follow from the file, are left out.
+json withoutVirtual(json items) {
+    for (json& item : items) {
+        json taggings = json::array();
+        for (json& tagging : item["taggings"])
+            if (tagging["state"] != "virtual") taggings.push_back(std::move(tagging));
+        item["taggings"] = std::move(taggings);
+    }
+    return items;
+}
+
 TEST(Explain, TellsThatTheLengthAgreesWithATempo) {
     const TemporaryFolder folder;
     const Wav wav;
     const std::string path =
-        folder.write("Funk (90).wav", wav.file(wav.format(1, 900, 8) + wav.data(600 * 16)));
+        folder.write("Grooves/Funk (90).wav", wav.file(wav.format(1, 900, 8) + wav.data(600 * 16)));
     EXPECT_THAT(runTool({"explain", path}).output,
                 HasSubstr("  loop  90 bpm, since it is as long as 16 beats\n"));
-    const json item = runTool({"--json", "explain", path}).json()[0];
+    ASSERT_EQ(runTool({"index", folder.path("Grooves"), "--db", folder.path("db")}).status, 0);
+    const json items = runTool({"--json", "explain", folder.path("Grooves")}).json();
+    EXPECT_EQ(withoutVirtual(runTool({"--json", "explain", "--db", folder.path("db"), path}).json()), items);
+    const json& item = items[0];
     EXPECT_EQ(item["tempo"], 90);
     EXPECT_EQ(item["beats"], 16);
     EXPECT_EQ(item["tempoFromLength"], true);
+}
+
+TEST(Explain, OfADatabaseSaysTheSameWithoutTheFiles) {
+    const TemporaryFolder folder;
+    const std::string kick = folder.write("sounds/Pack/Snares/Bass Drum 01.wav", sound());
+    const Wav wav;
+    const std::string loop = folder.write("sounds/Pack/House Loops/Deep House Beat 122bpm Am.wav",
+                                          wav.file(wav.format() + wav.acid(2, 57, 8, 122) + wav.data(40000)));
+    const std::string drive = folder.write("sounds/Hard Drive/Snare Sample.wav", "RIFF");
+    const std::string odd = folder.write("sounds/Zorp.wav", sound());
+    ASSERT_EQ(runTool({"write", "--add", "Genres/House", kick}).status, 0);
+    ASSERT_EQ(runTool({"write", "--create", "--add", "My Moods/Misty", odd}).status, 0);
+    ASSERT_EQ(runTool({"index", folder.path("sounds"), "--db", folder.path("db")}).status, 1);  // no sound
+    ASSERT_EQ(runTool({"db", "merge", folder.path("db"), "--db", folder.path("merged")}).status, 0);
+    std::vector<std::string> paths;
+    json fromFiles = json::array();
+    const json all = runTool({"--json", "explain", folder.path("sounds")}).json();
+    for (const json& item : all) {
+        if (item["path"] == drive) continue;
+        paths.push_back(item["path"]);
+        fromFiles.push_back(item);
+    }
+    ASSERT_EQ(paths.size(), 3U);
+    std::filesystem::remove_all(folder.path("sounds"));
+    for (const char* name : {"db", "merged"}) {
+        std::vector<std::string> words = {"--json", "explain", "--db", folder.path(name)};
+        words.insert(words.end(), paths.begin(), paths.end());
+        const ToolResult result = runTool(words);
+        EXPECT_EQ(result.status, 0) << result.errors;
+        EXPECT_EQ(withoutVirtual(result.json()), fromFiles) << name;
+    }
+    const ToolResult table = runTool({"explain", "--db", folder.path("db"), "--query", "tag:Kick", odd});
+    EXPECT_THAT(table.output, testing::AllOf(HasSubstr(kick), HasSubstr("\"Bass Drum\" in the name"),
+                                             HasSubstr("\"Snares\" in the folder \"Snares\""),
+                                             HasSubstr("Misty"), Not(HasSubstr(loop))));
+    const json found = runTool({"--json", "explain", "--db", folder.path("db"), "--query", "bpm:122"}).json();
+    ASSERT_EQ(found.size(), 1U);
+    EXPECT_EQ((*find(found[0]["taggings"], "A"))["state"], "virtual");
+    // What stands in no database, or failed when it was indexed.
+    for (const std::string& path : {drive, folder.path("none.wav"), folder.path("sounds")}) {
+        const ToolResult failed = runTool({"explain", "--db", folder.path("db"), path});
+        EXPECT_EQ(failed.status, 1) << path;
+        EXPECT_THAT(failed.errors, HasSubstr(path + ": "));
+    }
+    const std::vector<std::string> wrong[] = {{"explain"},
+                                              {"explain", "--db", folder.path("db")},
+                                              {"explain", "--query", "kick", kick},
+                                              {"explain", "--db", folder.path("db"), "--services=user", kick},
+                                              {"explain", "--db", folder.path("db"), "--query", "bpm:x"}};
+    for (const auto& words : wrong) EXPECT_EQ(runTool(words).status, 2) << words.back();
+}
+
+TEST(Explain, OfADatabaseWithoutReasonsSaysSo) {
+    const TemporaryFolder folder;
+    const std::string path = folder.write("sounds/Snare 1.wav", sound());
+    ASSERT_EQ(
+        runTool({"index", "--services=keywords", folder.path("sounds"), "--db", folder.path("db")}).status,
+        0);
+    const ToolResult result = runTool({"--json", "explain", "--db", folder.path("db"), path});
+    const json item = result.json()[0];
+    EXPECT_EQ((*find(item["taggings"], "Snare"))["evidence"][0]["service"], "keywords");
+    EXPECT_TRUE(item["dropped"].empty());
+    EXPECT_THAT(result.errors, HasSubstr("of 1 item only what holds is in the database"));
+}
+
+TEST(Explain, TellsOnceWhatIsWrongWithHabitsAndWeights) {
+    const TemporaryFolder folder;
+    folder.write("sounds/BD 1.wav", sound());
+    folder.write("sounds/Snare 1.wav", sound());
+    const std::pair<std::string, std::string> broken[] = {
+        {"NamingHabits.plist", "{ Meanings = {\n Kick = bd; }; }"},
+        {"EvidenceWeights.plist", "{ Strengths = {\n word = 2; }; }"}};
+    for (const auto& [name, text] : broken) {
+        const TemporaryFolder resources;
+        const std::string path = resources.write(name, text);
+        const std::vector<std::string> commands[] = {
+            {"autotag", folder.path("sounds")},
+            {"index", folder.path("sounds"), "--db", resources.path("db"), "--workers", "2"}};
+        for (std::vector<std::string> words : commands) {
+            words.insert(words.begin(), {"--resources", resources.path()});
+            const ToolResult result = runTool(words);
+            EXPECT_EQ(result.status, 1) << words[2];
+            EXPECT_THAT(result.errors, HasSubstr("line 2: "));
+            const std::size_t first = result.errors.find(path);
+            EXPECT_NE(first, std::string::npos) << words[2];
+            EXPECT_EQ(result.errors.find(path, first + 1), std::string::npos) << result.errors;
+        }
+        EXPECT_THAT(runTool({"search", "tag:Kick", "--db", resources.path("db")}).output, HasSubstr("BD 1"));
+    }
 }
 
 TEST(Explain, LeavesToStrictTaggingWhatTheServicesSay) {

@@ -5,7 +5,9 @@
 #include "formats/FolderRejections.h"
 #include "formats/TGRTFileNode.h"
 #include "platform/data/PropertyListFile.h"
+#include "platform/files/ResourceBundle.h"
 #include "support/AudioFixtures.h"
+#include "support/CapturedLog.h"
 #include "support/TemporaryFolder.h"
 #include "taxonomy/TGRTTagging.h"
 #include "taxonomy/TaggingTypes.h"
@@ -179,18 +181,31 @@ TEST(EvidenceWeights, TellWhichEntryIsWrong) {
     };
     Error none;
     ASSERT_TRUE(read(whole, &none)) << none.message();
-    const std::pair<std::string, std::string> faults[] = {{"hint = 1", "hint"},
-                                                          {"rules = 1", "rules"},
-                                                          {"Distances = (1)", "Distances"},
-                                                          {"Threshold = 0.5", "Threshold"}};
-    for (const auto& [entry, part] : faults) {
+    const struct {
+        std::string entry, wrong, part;
+    } faults[] = {{"hint = 1", "hint = 1.5", "Strengths, hint"},
+                  {"hint = 1", "hint = much", "Strengths, hint"},
+                  {"rules = 1", "rules = -1", "Services, rules"},
+                  {"Distances = (1)", "Distances = ()", "Distances"},
+                  {"Distances = (1)", "Distances = (1,\n nan)", "Distances"},
+                  {"(Drums, Percussion)", "(Drums, (Percussion))", "Together"},
+                  {"Threshold = 0.5;", "", "Threshold"}};
+    for (const auto& [entry, wrong, part] : faults) {
         std::string text = whole;
-        const bool isList = entry.ends_with(')');
-        text.replace(text.find(entry), entry.size(), part + (isList ? " = ()" : " = 1.5"));
+        text.replace(text.find(entry), entry.size(), wrong);
         Error error;
-        EXPECT_FALSE(read(text, &error)) << entry;
-        EXPECT_EQ(error.part, part);
+        EXPECT_FALSE(read(text, &error)) << wrong;
+        EXPECT_EQ(error.part, part) << wrong;
     }
+    const test::TemporaryFolder folder;
+    folder.write("EvidenceWeights.plist", "{ Strengths = {\n word = 2; }; }");
+    ResourceBundle::setDirectory(folder.path());
+    const test::CapturedLog log;
+    for (int time = 0; time < 2; ++time) EXPECT_GT(EvidenceWeights::defaultWeights().threshold, 0);
+    ResourceBundle::setDirectory("");
+    EXPECT_THAT(log.messages(), ElementsAre(folder.path("EvidenceWeights.plist") +
+                                            ": Strengths, word, line 2: is no number from 0 to 1 (using the "
+                                            "built-in one)"));
 }
 
 class Tagging : public testing::Test {

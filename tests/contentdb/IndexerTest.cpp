@@ -1,11 +1,11 @@
 #include "Library.h"
 #include "NameDescriber.h"
+#include "autotagging/ResourceFiles.h"
 #include "contentdb/ContentDescriber.h"
 #include "contentdb/index/WorkerMessages.h"
 #include "contentdb/store/RunLock.h"
 #include "platform/base/Version.h"
 #include "platform/files/ResourceBundle.h"
-#include "resources/ReplacementFile.h"
 #include "support/CapturedLog.h"
 
 #include <atomic>
@@ -714,8 +714,8 @@ TEST_F(Indexing, IsDescribedByOurWorkersAsInThisProcess) {
     ::setenv("QVCT_INDEX_WORKER", QVCT_INDEX_WORKER, 1);
     EXPECT_TRUE(indexLibrary(options, &error)) << error.message();
     ::unsetenv("QVCT_INDEX_WORKER");
-    for (const auto& [name, extension] : kResourceFiles)
-        ResourceBundle::setPathForResource(name, extension, std::nullopt);
+    for (const ResourceFile& resource : resourceFiles())
+        ResourceBundle::setPathForResource(resource.name, resource.extension, std::nullopt);
     const std::string path = library() + "/Zorp Pad.cst";
     const auto item = ContentDatabase::open(options.database)->item(path)->item;
     EXPECT_EQ(item, ContentDatabase::open(folder_.path("threads"))->item(path)->item);

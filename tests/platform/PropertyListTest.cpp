@@ -1,6 +1,7 @@
 #include "platform/data/Json.h"
 #include "platform/data/PropertyList.h"
 #include "platform/data/PropertyListFile.h"
+#include "platform/data/PropertyListPlace.h"
 #include "support/AudioFixtures.h"
 #include "support/ProcessorClock.h"
 #include "support/TemporaryFolder.h"
@@ -408,12 +409,13 @@ TEST(PropertyList, FaultsNameTheirByteInTheFile) {
         std::string bytes;
         const char* message;
     } const cases[] = {
-        {"text", xml, "XML property list, byte 14: text between elements"},
-        {"behind a mark", "\xEF\xBB\xBF" + xml, "XML property list, byte 17: text between elements"},
+        {"text", xml, "XML property list, line 1, byte 14: text between elements"},
+        {"behind a mark", "\xEF\xBB\xBF" + xml, "XML property list, line 1, byte 17: text between elements"},
         {"in UTF-16", utf16("<!-- \U0001f941 -->" + xml, true, true),
-         "XML property list, byte 52: text between elements"},
+         "XML property list, line 1, byte 52: text between elements"},
         {"number", "<plist>\n<integer>x</integer></plist>", "byte 8: not a whole number"},
-        {"element", "<plist><dict><key>a</key>\n<word/></dict></plist>", "byte 26: an element that is none"},
+        {"element", "<plist><dict><key>a</key>\n<word/></dict></plist>",
+         "line 2, byte 26: an element that is none"},
         {"mismatch", "<plist><array>\n</dict></plist>", "byte 15: not well-formed"},
         {"cut short", "<plist><array>", "byte 14: not well-formed"},
         {"data", "<plist><data>AAAA\nAA*A</data></plist>", "byte 20: data that is not base 64"},
@@ -426,11 +428,11 @@ TEST(PropertyList, FaultsNameTheirByteInTheFile) {
         {"half a pair", utf16("<a", false, true) + "\x3d\xd8>",
          "text property list, byte 6: half a character"},
         {"odd", utf16("<a>", false, true) + "x", "byte 8: half a character"},
-        {"no list", "hello", "old-style property list, byte 0: neither a dictionary"},
-        {"empty", "", "old-style property list, byte 0: neither a dictionary"},
+        {"no list", "hello", "old-style property list, line 1, byte 0: neither a dictionary"},
+        {"empty", "", "old-style property list, line 1, byte 0: neither a dictionary"},
         {"no semicolon", "{a = b c = d;}", "byte 7: no \";\""},
         {"no equals sign", "{a b}", "byte 3: no \"=\""},
-        {"no comma", "(a b)", "byte 3: no \",\""},
+        {"no comma", "(a\r\nb)", "line 2, byte 4: no \",\""},
         {"no end", "{a = (b,", "byte 8: it ends too early"},
         {"no quote", "( \"a)", "byte 2: a text that does not end"},
         {"no comment's end", "{ /* }", "byte 2: a comment that does not end"},
@@ -454,14 +456,49 @@ TEST(PropertyList, FaultsNameTheirByteInTheFile) {
     }
 }
 
+TEST(PropertyList, ValuesAreFoundOnTheirLines) {
+    const std::string old =
+        "// a list\n{\n  a = (x,\n    y, {\n b = z; });\r\n  \"c\" =\n q; a = (w,\r v);\n}\n";
+    const std::string xml =
+        "<plist>\n<dict>\n<key>a</key>\n<array>\n<string>x</string>\n\n<dict>"
+        "<key>b</key><true/></dict></array></dict>\n</plist>";
+    const struct {
+        const char* what;
+        std::string bytes;
+        PropertyListPath path;
+        std::uint64_t line;  // 0: none
+    } cases[] = {
+        {"key", old, {"c"}, 6},
+        {"last of two", old, {"a"}, 7},
+        {"item behind a break of another kind", old, {"a", 1U}, 8},
+        {"not there", old, {"a", 2U, "b"}, 5},
+        {"nor what is above", old, {"d", 1U}, 0},
+        {"key in XML", xml, {"a"}, 3},
+        {"item in XML", xml, {"a", 0U}, 5},
+        {"inside of an item", xml, {"a", 1U, "b"}, 7},
+        {"a number is no key", xml, {"a", "0"}, 3},
+        {"in UTF-16", utf16(xml, true, true), {"a", 0U}, 5},
+        {"binary",
+         serializePropertyList(PropertyList::Dictionary{{"a", 1}}, PropertyListFormat::binary),
+         {"a"},
+         0},
+        {"no list", "a", {"a"}, 0},
+    };
+    for (const auto& c : cases) {
+        const auto line =
+            lineOfValue({reinterpret_cast<const std::uint8_t*>(c.bytes.data()), c.bytes.size()}, c.path);
+        EXPECT_EQ(line.value_or(0), c.line) << c.what;
+    }
+}
+
 TEST(PropertyList, WhatStandsBehindAnXmlListIsNotRewrittenAway) {
     struct {
         const char* behind;
         const char* message;  // null: rewritten
     } const cases[] = {
         {" \n<!-- comment --><?instruction?>\n", nullptr},
-        {"\n<plist/>", "XML property list, byte 23: something behind the end"},
-        {"<!-- not ended", "XML property list, byte 22: something behind the end"},
+        {"\n<plist/>", "XML property list, line 2, byte 23: something behind the end"},
+        {"<!-- not ended", "XML property list, line 1, byte 22: something behind the end"},
     };
     for (const auto& c : cases) {
         const std::string bytes = std::string("<plist><dict/></plist>") + c.behind;

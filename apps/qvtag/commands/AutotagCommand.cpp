@@ -23,8 +23,6 @@ namespace qvct::tool {
 namespace {
 
 struct Options {
-    std::vector<std::string> paths;
-    LinksOutside links = LinksOutside::files;
     TaggerOptions tagger;
     bool measuresAnyRhythm = false;
     bool isStrict = false;
@@ -97,7 +95,7 @@ void run(const Options& options, ToolContext& context) {
     Totals totals;
     ItemTagger tagger(aggregator, taxonomy);
     context.forEachContentItemBelow(
-        options.paths, options.links, [&](const URL& url, const std::string& root) {
+        options.tagger.paths, options.tagger.links, [&](const URL& url, const std::string& root) {
             const auto item = std::make_shared<ContentItem>(url, ContentItem::Reading{bits, nullptr});
             const ItemReport report =
                 isStrict ? ItemReport() : tagger.report(item, ItemNames(url.path(), root), bits);
@@ -124,9 +122,7 @@ void run(const Options& options, ToolContext& context) {
 void addAutotagCommand(Command& tool, ToolContext& context) {
     const auto options = std::make_shared<Options>();
     Command command = tool.addCommand("autotag", "Derives tags for files and for everything below folders");
-    command.addOption("paths", options->paths, "Files and folders").required().valueName("PATH");
-    command.addFollowFlag(options->links);
-    options->tagger.addTo(command);
+    options->tagger.addTo(command).required();
     command.addFlag("--strict", options->isStrict,
                     "Give all that the services say, as they say it; names are not read");
     command.addFlag("--all", options->showsAll,

@@ -59,7 +59,9 @@ std::uint64_t countItems(const std::string& folder, LinksOutside links) {
 
 void run(Options& options, ToolContext& context) {
     const auto services = optionsForServices(options.services, context);
-    if (context.exitStatus() != 0) return;  // indexing with fewer services would mark the items as done
+    // Indexing with fewer services would mark the items as done. That a resource is broken does no harm: the
+    // built-in one is used, and items are read again when it is whole.
+    if (context.isUsageWrong()) return;
     Progress bar(context.quiet);
     IndexOptions& index = options.index;
     index.services = services;

@@ -1,12 +1,12 @@
 #include "CommandLine.h"
+#include "DatabaseAccess.h"
 #include "commands/Commands.h"
-#include "contentdb/ContentDatabase.h"
+#include "contentdb/Explanation.h"
 #include "formats/QVContentTaggingTypes.h"
 #include "output/ItemTable.h"
 #include "output/StandardStreams.h"
 #include "output/TaggingWords.h"
 #include "platform/text/Decimal.h"
-#include "platform/text/Spelling.h"
 #include "platform/text/Text.h"
 #include "platform/text/Url.h"
 #include "taxonomy/TGRTTagging.h"
@@ -14,10 +14,8 @@
 
 #include <algorithm>
 #include <cmath>
-#include <functional>
 #include <map>
 #include <memory>
-#include <type_traits>
 #include <unordered_map>
 #include <variant>
 
@@ -56,7 +54,15 @@ std::int64_t weightLevelOf(const IndexedTagging& tagging) {
     return known ? known->weightLevel() : std::lround(tagging.level.value_or(1) * tenths);
 }
 
-Json jsonOf(const IndexedTagging& tagging) {
+/// The word, or the rule: what a person needs to understand the tag.
+Json jsonOfEvidence(const TagClaim& claim) {
+    const auto& [what, where, offset] = claim.evidence;
+    const std::string& text = what.empty() || claim.service == "rules" ? where : what;
+    return text.empty() ? Json() : Json(text);
+}
+
+/// `held`: why it holds, where that is known.
+Json jsonOf(const IndexedTagging& tagging, const Explanation::Held* held) {
     Json json;
     json["label"] = tagging.label;
     json["parent"] = tagging.ancestors.empty() ? Json() : Json(tagging.ancestors[0]);
@@ -66,8 +72,23 @@ Json jsonOf(const IndexedTagging& tagging) {
     json["weightLevel"] = weightLevelOf(tagging);
     json["provenance"] = nameOf(tagging.provenance);
     json["service"] = tagging.service.empty() ? Json() : Json(tagging.service);
-    json["confidence"] = tagging.confidence ? jsonOfNumber(*tagging.confidence) : Json();
-    json["evidence"] = tagging.evidence.empty() ? Json() : Json(tagging.evidence);
+    json["confidence"] = held == nullptr ? Json() : jsonOfNumber(held->confidence);
+    json["evidence"] =
+        held == nullptr || held->claims.empty() ? Json() : jsonOfEvidence(held->claims.front());
+    return json;
+}
+
+Json jsonOfTaggings(const IndexedItem& item) {
+    const Explanation explanation = explanationOf(item);
+    std::vector<const Explanation::Held*> reasons(item.taggings.size());
+    for (const Explanation::Held& held : explanation.held) {
+        const bool isWeighed = !item.explanation.empty();
+        const bool isAutomatic = item.taggings[held.tagging].provenance == Provenance::automatic;
+        if (isWeighed && isAutomatic) reasons[held.tagging] = &held;
+    }
+    Json json = Json::array();
+    for (std::size_t i = 0; i < item.taggings.size(); ++i)
+        json.push_back(jsonOf(item.taggings[i], reasons[i]));
     return json;
 }
 
@@ -99,8 +120,7 @@ Json jsonOf(ContentDatabase& database, ItemId id, const IndexedItem& item, Error
     json["fileType"] = item.fileType;
     json["subFileType"] = item.subFileType;
     json["previewAvailable"] = item.previewAvailable;
-    json["taggings"] = Json::array();
-    for (const IndexedTagging& tagging : item.taggings) json["taggings"].push_back(jsonOf(tagging));
+    json["taggings"] = jsonOfTaggings(item);
     json["keyValues"] = jsonOf(item.values);
     json["packages"] = item.packs;
     json["dependencies"] = Json::array();
@@ -135,75 +155,12 @@ ItemRow rowOf(const IndexedItem& item) {
     return row;
 }
 
-std::unique_ptr<ContentDatabase> opened(const Options& options, ToolContext& context) {
-    Error error;
-    auto database = ContentDatabase::open(options.database, &error);
-    if (!database) context.itemFailed(error);
-    if (database && database->isBeingIndexed())
-        context.note(errorOf(kErrorUnreadable,
-                             "a run of `index` is going on; this is what it has stored so far",
-                             {options.database})
-                         .message());
-    return database;
-}
-
-/// The query; or nothing, after a message that points at the fault.
-std::optional<Query> queryOf(const Options& options, ContentDatabase& database, ToolContext& context) {
-    Error error;
-    const auto vocabulary = database.vocabulary(&error);
-    if (!vocabulary) {
-        context.itemFailed(error);
-        return std::nullopt;
-    }
-    const std::string text = join(options.words, " ");
-    QueryError fault;
-    auto query = parseQuery(text, *vocabulary, &fault);
-    if (query) return query;
-    const std::string before = printable(std::string_view(text).substr(0, fault.position));
-    const std::string marked = printable(std::string_view(text).substr(fault.position, fault.length));
-    context.usageFailed(fmt::format("{}\n  {}\n  {}{}", fault.message, printable(text),
-                                    std::string(displayWidth(before), ' '),
-                                    std::string(std::max<std::size_t>(1, displayWidth(marked)), '^')));
-    return std::nullopt;
-}
-
-/// The labels that a query names as tags.
-void addLabels(const Condition& condition, std::vector<std::string>& labels) {
-    std::visit(
-        [&labels](const auto& match) {
-            if constexpr (requires { match.parts; }) {
-                for (const Condition& part : match.parts) addLabels(part, labels);
-            } else if constexpr (std::is_same_v<std::decay_t<decltype(match)>, TagMatch>) {
-                labels.push_back(match.label);
-            }
-        },
-        condition.is);
-}
-
-/// When nothing is found: the tags that were asked for and that nothing has, with what may have been meant.
-void noteUnknownTags(const Query& query, ContentDatabase& database, ToolContext& context) {
-    std::vector<std::string> wanted;
-    addLabels(query.condition, wanted);
-    const auto facets = wanted.empty() ? std::nullopt : database.facets(Query{});
-    if (!facets) return;
-    std::vector<std::string> known;
-    for (const Facet& facet : *facets) known.push_back(facet.label);
-    for (const std::string& label : wanted) {
-        const std::string_view meant = nearestSpelling(label, known);
-        if (!meant.empty() && spellingDistance(meant, label) > 0)
-            context.note(
-                fmt::format("no tag \"{}\"; did you mean \"{}\"?", printable(label), printable(meant)));
-    }
-}
-
 void searchItems(const Options& options, ToolContext& context) {
-    const auto database = opened(options, context);
-    const auto query = database ? queryOf(options, *database, context) : std::nullopt;
-    if (!query) return;
+    const auto database = openDatabase(options.database, context);
+    const auto query = database ? queryIn(join(options.words, " "), *database, context) : std::nullopt;
+    const auto found = query ? searched(*query, options.limit, *database, context) : std::nullopt;
+    if (!found) return;
     Error error;
-    const auto found = database->search(*query, options.limit, &error);
-    if (!found) return context.itemFailed(error);
-    if (found->empty()) noteUnknownTags(*query, *database, context);
     if (context.format != Format::table) {
         Json json = Json::array();
         for (const Found& one : *found) json.push_back(jsonOf(*database, one.id, one.item, &error));
@@ -220,8 +177,8 @@ void searchItems(const Options& options, ToolContext& context) {
 }
 
 void countTags(const Options& options, ToolContext& context) {
-    const auto database = opened(options, context);
-    const auto query = database ? queryOf(options, *database, context) : std::nullopt;
+    const auto database = openDatabase(options.database, context);
+    const auto query = database ? queryIn(join(options.words, " "), *database, context) : std::nullopt;
     if (!query) return;
     Error error;
     const auto found = database->facets(*query, &error);
@@ -241,7 +198,7 @@ void countTags(const Options& options, ToolContext& context) {
 }
 
 void findSimilar(const Options& options, ToolContext& context) {
-    const auto database = opened(options, context);
+    const auto database = openDatabase(options.database, context);
     if (!database) return;
     Error error;
     const auto found = database->similar(URL::fileURLWithPath(options.path).path(), options.limit, &error);

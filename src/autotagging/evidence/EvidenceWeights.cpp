@@ -1,105 +1,132 @@
 #include "autotagging/evidence/EvidenceWeights.h"
 
-#include "platform/base/Log.h"
 #include "platform/data/PropertyListFile.h"
-#include "platform/text/Text.h"
+#include "platform/data/PropertyListPlace.h"
 #include "resources/QVCTCompiledResources.h"
-#include "resources/ReplacementFile.h"
 
 #include <algorithm>
-
-#include <fmt/format.h>
+#include <utility>
 
 namespace qvct {
 namespace {
 
 using Dictionary = PropertyList::Dictionary;
 
-/// Reads numbers, and keeps the first fault.
-class Reader {
-  public:
-    explicit Reader(Error* error) : error_(error) {}
+/// A dictionary, and the keys that lead to it.
+struct Section {
+    const Dictionary* entries;
+    PropertyListPath path;
 
-    double number(const PropertyList* value, const std::string& entry) {
-        const std::string* text = value == nullptr ? nullptr : value->string();
-        const auto number = value == nullptr  ? std::nullopt
-                            : text != nullptr ? std::optional(leadingNumber(*text))
-                                              : value->doubleValue();
-        const bool isWeight = number && *number >= 0 && *number <= 1;
-        if (!isWeight && isSound_)
-            isSound_ = fail(error_, kErrorMalformed, "is no number from 0 to 1", {.part = entry});
-        return isWeight ? *number : 0;
+    PropertyListPath pathOf(std::string key) const {
+        PropertyListPath result = path;
+        result.push_back(std::move(key));
+        return result;
     }
-    double number(const Dictionary& dictionary, const std::string& key) {
-        return number(dictionary.value(key), key);
-    }
-    const Dictionary& dictionary(const Dictionary& dictionary, const std::string& key) {
-        static const Dictionary empty;
-        const Dictionary* found = dictionary.dictionary(key);
-        return found == nullptr ? empty : *found;
-    }
-    std::vector<std::string> texts(const PropertyList& value, const std::string& entry) {
-        std::vector<std::string> texts;
-        const PropertyList::Array* list = value.array();
-        for (const PropertyList& text : list == nullptr ? PropertyList::Array() : *list) {
-            if (text.string() != nullptr) texts.push_back(*text.string());
-        }
-        if (texts.size() < 2) fault(entry, "is no list of lists of labels");
-        return texts;
-    }
-    void fault(const std::string& entry, std::string reason) {
-        if (isSound_) isSound_ = fail(error_, kErrorMalformed, std::move(reason), {.part = entry});
-    }
-    bool isSound() const { return isSound_; }
-
-  private:
-    Error* error_;
-    bool isSound_ = true;
 };
 
-}  // namespace
+/// Reads numbers and labels, and keeps the first fault and its place.
+class Reader {
+  public:
+    double number(const PropertyList* value, PropertyListPath path) {
+        const auto number = value == nullptr ? std::nullopt : value->numberValue();
+        const bool isWeight = number && *number >= 0 && *number <= 1;
+        if (!isWeight) fault("is no number from 0 to 1", std::move(path));
+        return isWeight ? *number : 0;
+    }
+    double number(const Section& section, const std::string& key) {
+        return number(section.entries->value(key), section.pathOf(key));
+    }
+    static Section section(const Section& above, const std::string& key) {
+        static const Dictionary empty;
+        const Dictionary* found = above.entries->dictionary(key);
+        return {found == nullptr ? &empty : found, above.pathOf(key)};
+    }
+    std::vector<std::string> labels(const PropertyList& value, PropertyListPath path) {
+        std::vector<std::string> labels;
+        const PropertyList::Array* list = value.array();
+        for (const PropertyList& label : list == nullptr ? PropertyList::Array() : *list) {
+            if (label.string() != nullptr) labels.push_back(*label.string());
+        }
+        if (list == nullptr || labels.size() < 2 || labels.size() != list->size())
+            fault("is no list of two labels or more", std::move(path));
+        return labels;
+    }
+    void fault(std::string reason, PropertyListPath path) {
+        if (error_.isSet()) return;
+        failAtValue(&error_, kErrorMalformed, std::move(reason), path);
+        place_ = std::move(path);
+    }
+    const Error& error() const { return error_; }
+    const PropertyListPath& place() const { return place_; }
 
-std::optional<EvidenceWeights> EvidenceWeights::weightsWithDictionary(const Dictionary& dictionary,
-                                                                      Error* error) {
-    Reader read(error);
+  private:
+    Error error_;
+    PropertyListPath place_;
+};
+
+EvidenceWeights weightsIn(const Dictionary& dictionary, Reader& read) {
+    const Section root{&dictionary, {}};
     EvidenceWeights weights;
-    const Dictionary& strengths = read.dictionary(dictionary, "Strengths");
+    const Section strengths = Reader::section(root, "Strengths");
     weights.word = read.number(strengths, "word");
     weights.abbreviation = read.number(strengths, "abbreviation");
     weights.likeness = read.number(strengths, "likeness");
     weights.hint = read.number(strengths, "hint");
     weights.figure = read.number(strengths, "figure");
     weights.key = read.number(strengths, "key");
-    for (const auto& [name, value] : read.dictionary(dictionary, "Services"))
-        weights.services[name] = read.number(&value, name);
-    if (const PropertyList::Array* distances = dictionary.array("Distances"))
-        for (const PropertyList& value : *distances)
-            weights.distances.push_back(read.number(&value, "Distances"));
-    if (weights.distances.empty()) read.fault("Distances", "there are none");
-    if (const PropertyList::Array* groups = dictionary.array("Together")) {
-        for (const PropertyList& group : *groups) weights.together.push_back(read.texts(group, "Together"));
-    }
-    weights.headWord = read.number(dictionary, "HeadWord");
-    weights.support = read.number(dictionary, "Support");
-    weights.contradiction = read.number(dictionary, "Contradiction");
-    weights.threshold = read.number(dictionary, "Threshold");
-    return read.isSound() ? std::optional(std::move(weights)) : std::nullopt;
+    const Section services = Reader::section(root, "Services");
+    for (const auto& [name, value] : *services.entries)
+        weights.services[name] = read.number(&value, services.pathOf(name));
+    const PropertyList::Array none;
+    const auto listOf = [&](std::string_view key) -> const PropertyList::Array& {
+        const PropertyList::Array* list = dictionary.array(key);
+        return list == nullptr ? none : *list;
+    };
+    for (const PropertyList& value : listOf("Distances"))
+        weights.distances.push_back(read.number(&value, {"Distances", weights.distances.size()}));
+    if (weights.distances.empty()) read.fault("there are none", {"Distances"});
+    for (const PropertyList& group : listOf("Together"))
+        weights.together.push_back(read.labels(group, {"Together", weights.together.size()}));
+    weights.headWord = read.number(root, "HeadWord");
+    weights.support = read.number(root, "Support");
+    weights.contradiction = read.number(root, "Contradiction");
+    weights.threshold = read.number(root, "Threshold");
+    return weights;
+}
+
+std::optional<EvidenceWeights> weightsInFile(const std::string& path, Error* error) {
+    const auto dictionary = readDictionaryFile(path, error);
+    if (!dictionary) return std::nullopt;
+    Reader read;
+    EvidenceWeights weights = weightsIn(*dictionary, read);
+    if (!read.error().isSet()) return weights;
+    if (error != nullptr) *error = read.error();
+    failInFile(path, read.place(), error);
+    return std::nullopt;
+}
+
+}  // namespace
+
+std::optional<EvidenceWeights> EvidenceWeights::weightsWithDictionary(const Dictionary& dictionary,
+                                                                      Error* error) {
+    Reader read;
+    EvidenceWeights weights = weightsIn(dictionary, read);
+    if (!read.error().isSet()) return weights;
+    if (error != nullptr) *error = read.error();
+    return std::nullopt;
+}
+
+ResourceFile EvidenceWeights::file() {
+    return {"EvidenceWeights", "plist",
+            [](const std::string& path, Error* error) { return weightsInFile(path, error).has_value(); }};
 }
 
 EvidenceWeights EvidenceWeights::defaultWeights() {
-    const auto read = [](const std::string& path) -> std::optional<EvidenceWeights> {
-        Error error;
-        const auto dictionary = readDictionaryFile(path, &error);
-        auto weights = dictionary ? weightsWithDictionary(*dictionary, &error) : std::nullopt;
-        if (weights) return weights;
-        failIn(path, &error);
-        log(fmt::format("{} (using the built-in weights)", error.message()));
-        return std::nullopt;
-    };
+    const auto read = [](const std::string& path) { return weightsInFile(path, nullptr); };
     const auto builtIn = [] {
         return weightsWithDictionary(QVCTCompiledResources::EvidenceWeightsPlist().value_or(Dictionary{}));
     };
-    return replacedOrBuiltIn({"EvidenceWeights", "plist"}, read, builtIn).value_or(EvidenceWeights{});
+    return replacedOrBuiltIn(file(), read, builtIn).value_or(EvidenceWeights{});
 }
 
 double EvidenceWeights::ofService(std::string_view name) const {

@@ -3,6 +3,7 @@
 #include "platform/base/Error.h"
 #include "platform/base/Export.h"
 #include "platform/data/PropertyList.h"
+#include "resources/ReplacementFile.h"
 
 #include <map>
 #include <optional>
@@ -30,7 +31,11 @@ struct QVCT_API EvidenceWeights {
 
     /// Those of the file that replaces the built-in ones, else the built-in ones.
     static EvidenceWeights defaultWeights();
-    /// Nothing, and an error that names the entry, when one is missing or no number in [0, 1].
+    /// The file that may replace them. It is broken, with an error that names the line and the entry, when
+    /// `weightsWithDictionary` has a fault to find.
+    static ResourceFile file();
+    /// Nothing, and an error that names the entry, when one is missing, is no number in [0, 1] or no list of
+    /// labels.
     static std::optional<EvidenceWeights> weightsWithDictionary(const PropertyList::Dictionary& dictionary,
                                                                 Error* error = nullptr);
 

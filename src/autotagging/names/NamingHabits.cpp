@@ -2,12 +2,8 @@
 
 #include "autotagging/keywords/QVCTKeywordExtractor.h"
 #include "autotagging/names/NamePieces.h"
-#include "platform/base/Log.h"
-#include "platform/base/Printable.h"
 #include "platform/data/PropertyListFile.h"
-#include "platform/text/Text.h"
 #include "resources/QVCTCompiledResources.h"
-#include "resources/ReplacementFile.h"
 #include "taxonomy/TGRTTaxonomy.h"
 #include "taxonomy/TagNormalization.h"
 #include "taxonomy/TaggingTypes.h"
@@ -36,11 +32,8 @@ NamingHabits::Word packed(NamingHabits::Word phrase) {
     return phrase;
 }
 
-/// Whether a number is not zero, or a text begins with such a number: the old text form knows only texts.
-bool isYes(const PropertyList* value) {
-    if (value == nullptr) return false;
-    return (value->string() != nullptr ? leadingNumber(*value->string())
-                                       : value->doubleValue().value_or(0)) != 0;
+Dictionary builtInHabits() {
+    return QVCTCompiledResources::NamingHabitsPlist().value_or(Dictionary{});
 }
 
 /// Where the words of each role stand in the dictionary.
@@ -69,7 +62,7 @@ constexpr std::array<RoleList, 17> kRoleLists = {{{"Kinds", "Loop", NameRole::lo
 
 }  // namespace
 
-/// Builds habits from dictionaries, entry by entry.
+/// Builds habits from dictionaries, entry by entry, up to the first fault.
 class NamingHabitsReader {
   public:
     explicit NamingHabitsReader(const TGRTTaxonomy& taxonomy)
@@ -81,13 +74,13 @@ class NamingHabitsReader {
         addNames(dictionary.array("Figurative"), figurative_);
         addNames(dictionary.array("Transposing"), transposing_);
         addNames(dictionary.array("Categories"), categories_);
-        if (const Dictionary* labels = dictionary.dictionary("InFolders"))
-            for (const auto& [label, value] : *labels)
-                if (value.string() != nullptr) inFolders_[label] = *value.string();
-        return addCombinations(dictionary, error) && addNotes(dictionary, error) &&
+        return areParts(dictionary, error) && addFolders(dictionary, error) &&
+               addCombinations(dictionary, error) && addNotes(dictionary, error) &&
                addRoles(dictionary, error) && addMeanings(dictionary, error) &&
                addPrograms(dictionary, error) && addPrefixes(dictionary, error);
     }
+    /// Where the fault is.
+    const PropertyListPath& place() const { return place_; }
 
     /// The labels of the taxonomy, and the words of the keyword mapping, say themselves unless an entry says
     /// something else.
@@ -119,11 +112,10 @@ class NamingHabitsReader {
     using Word = NamingHabits::Word;
     using Names = std::set<std::string>;
 
-    static bool addNames(const PropertyList::Array* list, Names& names) {
-        if (list == nullptr) return false;
+    static void addNames(const PropertyList::Array* list, Names& names) {
+        if (list == nullptr) return;
         for (const PropertyList& name : *list)
             if (name.string() != nullptr) names.insert(*name.string());
-        return true;
     }
 
     /// A label stands for each pair of those in its two lists.
@@ -132,10 +124,12 @@ class NamingHabitsReader {
         if (combined == nullptr) return true;
         return std::all_of(combined->begin(), combined->end(), [&](const auto& entry) {
             const PropertyList::Array* lists = entry.value.array();
+            if (lists == nullptr || lists->size() != 2 || !isListOfTexts((*lists)[0]) ||
+                !isListOfTexts((*lists)[1]))
+                return refuse(error, "is no pair of lists of labels", {"Combined", entry.key});
             Names parts, others;
-            if (lists == nullptr || lists->size() != 2 || !addNames((*lists)[0].array(), parts) ||
-                !addNames((*lists)[1].array(), others))
-                return fail(error, kErrorMalformed, "is no pair of lists of labels", {.part = entry.key});
+            addNames((*lists)[0].array(), parts);
+            addNames((*lists)[1].array(), others);
             if (!taxonomy_.findTagForLabel(entry.key)) return true;
             for (const std::string& part : parts)
                 for (const std::string& other : others) combinations_[part].push_back({other, entry.key});
@@ -143,15 +137,60 @@ class NamingHabitsReader {
         });
     }
 
+    bool refuse(Error* error, std::string reason, PropertyListPath path) {
+        place_ = std::move(path);
+        return failAtValue(error, kErrorMalformed, std::move(reason), place_);
+    }
+
+    /// Whether dictionaries stand where dictionaries must, and lists where lists must.
+    bool areParts(const Dictionary& dictionary, Error* error) {
+        for (const char* part : {"Meanings", "Kinds", "Modes", "Notes", "Accidentals", "InFolders",
+                                 "Combined", "Programs", "Prefixes"}) {
+            if (dictionary.value(part) != nullptr && dictionary.dictionary(part) == nullptr)
+                return refuse(error, "is no dictionary", {part});
+        }
+        for (const char* part : {"Pitched", "Figurative", "Transposing", "Categories"}) {
+            const PropertyList* list = dictionary.value(part);
+            if (list != nullptr && !isListOfTexts(*list)) return refuse(error, "is no list of texts", {part});
+        }
+        return true;
+    }
+
+    static bool isListOfTexts(const PropertyList& value) {
+        const PropertyList::Array* list = value.array();
+        return list != nullptr && std::all_of(list->begin(), list->end(),
+                                              [](const auto& text) { return text.string() != nullptr; });
+    }
+
+    bool addFolders(const Dictionary& dictionary, Error* error) {
+        const Dictionary* labels = dictionary.dictionary("InFolders");
+        if (labels == nullptr) return true;
+        for (const auto& [label, value] : *labels) {
+            if (value.string() == nullptr) return refuse(error, "is no label", {"InFolders", label});
+            inFolders_[label] = *value.string();
+        }
+        return std::all_of(labels->begin(), labels->end(), [&](const auto& entry) {
+            return !leadsBack(entry.key) ||
+                   refuse(error, "leads back to itself by what stands for it", {"InFolders", entry.key});
+        });
+    }
+
+    bool leadsBack(const std::string& label) const {
+        auto found = inFolders_.find(label);
+        for (std::size_t step = 0; step < inFolders_.size() && found != inFolders_.end(); ++step) {
+            if (found->second == label) return true;
+            found = inFolders_.find(found->second);
+        }
+        return false;
+    }
+
     bool addNotes(const Dictionary& dictionary, Error* error) {
         const Dictionary* notes = dictionary.dictionary("Notes");
         if (notes == nullptr) return true;
         return std::all_of(notes->begin(), notes->end(), [&](const auto& entry) {
-            const std::string* text = entry.value.string();
-            const double note =
-                text != nullptr ? leadingNumber(*text) : entry.value.doubleValue().value_or(-1);
-            if (note < 0 || note > 11)
-                return fail(error, kErrorMalformed, "is no note from 0 to 11", {.part = entry.key});
+            const double note = entry.value.numberValue().value_or(-1);
+            if (!(note >= 0 && note <= 11))
+                return refuse(error, "is no note from 0 to 11", {"Notes", entry.key});
             habits_->notes_[entry.key] = static_cast<int>(note);
             return true;
         });
@@ -160,10 +199,10 @@ class NamingHabitsReader {
     bool addRoles(const Dictionary& dictionary, Error* error) {
         for (const auto& [part, key, role] : kRoleLists) {
             const Dictionary* lists = key.empty() ? &dictionary : dictionary.dictionary(part);
-            const PropertyList::Array* words =
-                lists == nullptr ? nullptr : lists->array(key.empty() ? part : key);
-            const std::string entry = key.empty() ? std::string(part) : fmt::format("{}, {}", part, key);
-            if (words != nullptr && !addAll(*words, {.role = role}, entry, error)) return false;
+            const PropertyList* words = lists == nullptr ? nullptr : lists->value(key.empty() ? part : key);
+            PropertyListPath path = {std::string(part)};
+            if (!key.empty()) path.emplace_back(std::string(key));
+            if (words != nullptr && !addAll(*words, {.role = role}, path, error)) return false;
         }
         return true;
     }
@@ -173,8 +212,7 @@ class NamingHabitsReader {
         if (meanings == nullptr) return true;
         return std::all_of(meanings->begin(), meanings->end(), [&](const auto& entry) {
             const Dictionary* lists = entry.value.dictionary();
-            if (lists == nullptr)
-                return fail(error, kErrorMalformed, "has no lists of words", {.part = entry.key});
+            if (lists == nullptr) return refuse(error, "has no lists of words", {"Meanings", entry.key});
             const auto meaning = numberOf(entry.key);
             return !meaning || addMeaning(*meaning, *lists, entry.key, error);
         });
@@ -186,44 +224,39 @@ class NamingHabitsReader {
         const Dictionary* lists = dictionary.dictionary(part);
         if (lists == nullptr) return true;
         return std::all_of(lists->begin(), lists->end(), [&](const auto& entry) {
-            const PropertyList::Array* list = entry.value.array();
-            if (list == nullptr)
-                return fail(error, kErrorMalformed, "is no list of texts", {.part = entry.key});
+            if (!isListOfTexts(entry.value))
+                return refuse(error, "is no list of texts", {std::string(part), entry.key});
             const auto meaning = numberOf(entry.key);
-            return !meaning || add(*list, *meaning, entry.key);
+            return !meaning || add(entry.value, *meaning, entry.key);
         });
     }
 
     bool addPrograms(const Dictionary& dictionary, Error* error) {
-        return addLists(
-            dictionary, "Programs", error,
-            [&](const PropertyList::Array& names, std::uint32_t meaning, const std::string& label) {
-                return addAll(names, {.meaning = meaning}, label, error);
-            });
+        return addLists(dictionary, "Programs", error,
+                        [&](const PropertyList& names, std::uint32_t meaning, const std::string& label) {
+                            return addAll(names, {.meaning = meaning}, {"Programs", label}, error);
+                        });
     }
 
     /// The first label of a code is what it says; others go with it.
     bool addPrefixes(const Dictionary& dictionary, Error* error) {
-        const auto add = [&](const PropertyList::Array& codes, std::uint32_t meaning,
-                             const std::string& label) {
-            return std::all_of(codes.begin(), codes.end(), [&](const PropertyList& code) {
-                if (code.string() == nullptr)
-                    return fail(error, kErrorMalformed, "is no list of texts", {.part = label});
+        const auto add = [&](const PropertyList& codes, std::uint32_t meaning, const std::string&) {
+            for (const PropertyList& code : *codes.array()) {
                 std::vector<Word>& words = habits_->prefixes_[*code.string()];
                 words.push_back(
                     {.meaning = meaning,
                      .strength = words.empty() ? NameStrength::word : NameStrength::abbreviation});
-                return true;
-            });
+            }
+            return true;
         };
         return addLists(dictionary, "Prefixes", error, add);
     }
 
     bool addMeaning(std::uint32_t meaning, const Dictionary& lists, const std::string& entry, Error* error) {
         return std::all_of(kStrengths.begin(), kStrengths.end(), [&](const auto& strength) {
-            const PropertyList::Array* words = lists.array(strength.first);
-            return words == nullptr ||
-                   addAll(*words, {.meaning = meaning, .strength = strength.second}, entry, error);
+            const PropertyList* words = lists.value(strength.first);
+            return words == nullptr || addAll(*words, {.meaning = meaning, .strength = strength.second},
+                                              {"Meanings", entry, std::string(strength.first)}, error);
         });
     }
 
@@ -238,47 +271,49 @@ class NamingHabitsReader {
         return static_cast<std::uint32_t>(habits_->meanings_.size() - 1);
     }
 
-    bool addAll(const PropertyList::Array& words, Word word, const std::string& entry, Error* error) {
-        return std::all_of(words.begin(), words.end(), [&](const PropertyList& text) {
-            return text.string() != nullptr
-                       ? addWord(*text.string(), word, entry, error)
-                       : fail(error, kErrorMalformed, "is no list of texts", {.part = entry});
-        });
+    bool addAll(const PropertyList& words, Word word, const PropertyListPath& path, Error* error) {
+        if (!isListOfTexts(words)) return refuse(error, "is no list of texts", path);
+        const PropertyList::Array& texts = *words.array();
+        for (std::size_t i = 0; i < texts.size(); ++i) {
+            const std::string fault = addWord(*texts[i].string(), word);
+            if (fault.empty()) continue;
+            PropertyListPath place = path;
+            place.emplace_back(i);
+            return refuse(error, fmt::format("\"{}\" {}", *texts[i].string(), fault), std::move(place));
+        }
+        return true;
     }
 
-    bool addWord(const std::string& text, Word word, const std::string& entry, Error* error) {
+    /// What is wrong with the word; nothing when it was added.
+    std::string addWord(const std::string& text, Word word) {
         NamingHabits::Entry* place = placeFor(text, word.pieces);
-        if (place == nullptr) {
-            return fail(error, kErrorMalformed, fmt::format("\"{}\" is no word or phrase", printable(text)),
-                        {.part = entry});
-        }
-        if (place->source == source_ && saysTheSame(place->word, word)) return true;
+        if (place == nullptr) return "is no word or phrase";
+        if (place->source == source_ && saysTheSame(place->word, word)) return {};
         // An instrument's string is one of several, too.
         const bool isVariant = place->source == source_ && place->word.role == NameRole::variant &&
                                place->word.meaning == Word::kNoMeaning;
         if (isVariant && word.meaning != Word::kNoMeaning) {
             word.role = NameRole::variant;
             place->word = word;
-            return true;
+            return {};
         }
         if (place->source == source_ && place->word.strength == NameStrength::hint) {
             std::swap(place->word, word);
             std::swap(place->word.other, word.other);
         }
         if (place->source == source_ && word.strength == NameStrength::hint) {
-            if (addHint(*place, word)) return true;
-            return fail(error, kErrorTooLarge,
-                        fmt::format("\"{}\" hints at more than {} things", printable(text), kMostHints),
-                        {.part = entry});
+            if (addHint(*place, word)) return {};
+            return fmt::format("hints at more than {} things", kMostHints);
         }
         if (place->source == source_) {
-            return fail(error, kErrorMalformed,
-                        fmt::format("\"{}\" stands in another entry as well", printable(text)),
-                        {.part = entry});
+            return place->word.meaning == Word::kNoMeaning
+                       ? "stands in another entry as well"
+                       : fmt::format("stands in another entry as well, for {}",
+                                     habits_->meaning(place->word.meaning).label);
         }
         place->word = word;
         place->source = source_;
-        return true;
+        return {};
     }
 
     bool saysTheSame(const Word& a, const Word& b) const {
@@ -351,6 +386,7 @@ class NamingHabitsReader {
     std::map<std::string, std::string> inFolders_;
     std::map<std::string, std::vector<NamedMeaning::Combination>> combinations_;
     std::uint8_t source_ = 0;
+    PropertyListPath place_;
 };
 
 std::span<const NamingHabits::Word> NamingHabits::wordsOfPrefix(std::string_view code) const {
@@ -358,6 +394,25 @@ std::span<const NamingHabits::Word> NamingHabits::wordsOfPrefix(std::string_view
     if (found == prefixes_.end()) return {};
     return found->second;
 }
+
+namespace {
+
+/// Those of a file, alone or added to the built-in ones; null, and an error with the line, when it has a
+/// fault.
+std::shared_ptr<const NamingHabits> habitsInFile(const std::string& path, Error* error) {
+    auto own = readDictionaryFile(path, error);
+    if (!own) return nullptr;
+    std::vector<Dictionary> dictionaries;
+    if (own->boolValue("Adds")) dictionaries.push_back(builtInHabits());
+    dictionaries.push_back(*std::move(own));
+    PropertyListPath place;
+    auto habits =
+        NamingHabits::initWithDictionaries(dictionaries, *TGRTTaxonomy::defaultTaxonomy(), error, &place);
+    if (!habits) failInFile(path, place, error);
+    return habits;
+}
+
+}  // namespace
 
 const NamingHabits::Entry* NamingHabits::find(std::string_view text) const {
     const auto found = entries_.find(text);
@@ -453,30 +508,28 @@ std::vector<std::string> NamingHabits::labelsMeant(std::string_view text) const 
 }
 
 std::shared_ptr<const NamingHabits> NamingHabits::initWithDictionaries(
-    std::span<const PropertyList::Dictionary> dictionaries, const TGRTTaxonomy& taxonomy, Error* error) {
+    std::span<const PropertyList::Dictionary> dictionaries, const TGRTTaxonomy& taxonomy, Error* error,
+    PropertyListPath* place) {
     NamingHabitsReader reader(taxonomy);
-    for (const PropertyList::Dictionary& dictionary : dictionaries)
-        if (!reader.add(dictionary, error)) return nullptr;
+    for (const PropertyList::Dictionary& dictionary : dictionaries) {
+        if (reader.add(dictionary, error)) continue;
+        if (place != nullptr) *place = reader.place();
+        return nullptr;
+    }
     reader.addOwnWords(QVCTKeywordExtractor::defaultKeywordMapping());
     return std::move(reader).finish();
 }
 
+ResourceFile NamingHabits::file() {
+    return {"NamingHabits", "plist",
+            [](const std::string& path, Error* error) { return habitsInFile(path, error) != nullptr; }};
+}
+
 std::shared_ptr<const NamingHabits> NamingHabits::defaultHabits() {
-    const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
-    const auto builtIn = [] { return QVCTCompiledResources::NamingHabitsPlist().value_or(Dictionary{}); };
-    if (const auto path = replacementFile({"NamingHabits", "plist"})) {
-        std::vector<Dictionary> dictionaries;
-        Error error;
-        auto own = readDictionaryFile(*path, &error);
-        if (own && isYes(own->value("Adds"))) dictionaries.push_back(builtIn());
-        if (own) dictionaries.push_back(*std::move(own));
-        auto habits = error.isSet() ? nullptr : initWithDictionaries(dictionaries, *taxonomy, &error);
-        if (habits) return habits;
-        failIn(*path, &error);
-        log(fmt::format("{} (using the built-in naming habits)", error.message()));
-    }
-    const Dictionary own[] = {builtIn()};
-    return initWithDictionaries(own, *taxonomy);
+    const auto path = replacementFile(file());
+    if (auto habits = path ? habitsInFile(*path, nullptr) : nullptr) return habits;
+    const Dictionary own[] = {builtInHabits()};
+    return initWithDictionaries(own, *TGRTTaxonomy::defaultTaxonomy());
 }
 
 }  // namespace qvct

@@ -3,6 +3,8 @@
 #include "autotagging/names/NearWords.h"
 #include "platform/base/Error.h"
 #include "platform/data/PropertyList.h"
+#include "platform/data/PropertyListPlace.h"
+#include "resources/ReplacementFile.h"
 
 #include <cstdint>
 #include <map>
@@ -86,12 +88,16 @@ class NamingHabits {
     /// when that file says so.
     /// @cost  Some milliseconds.
     static std::shared_ptr<const NamingHabits> defaultHabits();
-    /// From dictionaries, of which a later one may give words of an earlier one another meaning. Null, and an
-    /// error that names the entry, when an entry contradicts another of its own dictionary, or is not what it
-    /// should be. Labels that the taxonomy does not know are passed over.
+    /// That file. It is broken, with an error that names the line and the entry, when `initWithDictionaries`
+    /// has a fault to find.
+    static ResourceFile file();
+    /// From dictionaries, of which a later one may give words of an earlier one another meaning. Null, with
+    /// an error that names the entry and `place` set to its path, when an entry contradicts another of its
+    /// own dictionary, leads back to itself, or is not what it should be. Labels that the taxonomy does not
+    /// know are passed over.
     static std::shared_ptr<const NamingHabits> initWithDictionaries(
         std::span<const PropertyList::Dictionary> dictionaries, const TGRTTaxonomy& taxonomy,
-        Error* error = nullptr);
+        Error* error = nullptr, PropertyListPath* place = nullptr);
 
     const NamedMeaning& meaning(std::uint32_t index) const { return meanings_[index]; }
     const Word& other(std::uint32_t index) const { return others_[index]; }

@@ -14,6 +14,7 @@ struct TaggingServiceName {
     std::uint64_t option;
 };
 
+/// Databases number them: further ones come last.
 inline constexpr std::array<TaggingServiceName, 8> kTaggingServiceNames = {
     {{"keywords", QVCTAutoTaggingOptionFilenameKeywords},
      {"rules", QVCTAutoTaggingOptionXMLRules},

@@ -38,7 +38,8 @@ int digitOf(char c) {
 
 class Reader {
   public:
-    Reader(std::string_view text, PropertyListFault& fault) : text_(text), fault_(fault) {}
+    Reader(std::string_view text, PropertyListFault& fault, PropertyListPlace* wanted)
+        : text_(text), fault_(fault), wanted_(wanted) {}
 
     std::optional<PropertyList> read() {
         if (!skipBlanks()) return std::nullopt;
@@ -60,6 +61,11 @@ class Reader {
     bool refuse(std::string_view reason, ErrorCode code = kErrorMalformed) {
         fault_ = {code, at_, std::string(reason)};
         return false;
+    }
+
+    /// Keeps the offset, if the value that comes next is the one that is looked for.
+    void note(std::size_t offset) {
+        if (wanted_ != nullptr && builder_.isNext(wanted_->path)) wanted_->offset = offset;
     }
 
     /// The character ahead; 0 at the end.
@@ -128,9 +134,11 @@ class Reader {
         if (!skipBlanks()) return false;
         if (take('}')) return close();
         std::string key;
+        const std::size_t start = at_;
         if (!readWord(key) || !skipBlanks()) return false;
         if (!count()) return false;
         builder_.key(key);
+        note(start);
         if (next() == ';') {  // a key alone stands for itself
             builder_.add(std::move(key));
             return count();
@@ -146,6 +154,7 @@ class Reader {
         isFirst_ = false;
         if (!skipBlanks()) return false;
         if (take(')')) return close();
+        note(at_);
         return readValue();
     }
 
@@ -246,6 +255,7 @@ class Reader {
 
     std::string_view text_;
     PropertyListFault& fault_;
+    PropertyListPlace* wanted_;
     std::size_t at_ = 0;
     std::size_t values_ = 0;
     bool isFirst_ = false;  // nothing was read in the innermost container yet
@@ -254,8 +264,9 @@ class Reader {
 
 }  // namespace
 
-std::optional<PropertyList> parseOldStylePropertyList(std::string_view text, PropertyListFault& fault) {
-    return Reader(text, fault).read();
+std::optional<PropertyList> parseOldStylePropertyList(std::string_view text, PropertyListFault& fault,
+                                                      PropertyListPlace* wanted) {
+    return Reader(text, fault, wanted).read();
 }
 
 }  // namespace qvct

@@ -2,6 +2,7 @@
 
 #include "platform/data/PropertyList.h"
 #include "platform/data/PropertyListGuard.h"
+#include "platform/data/PropertyListPlace.h"
 
 #include <optional>
 #include <string_view>
@@ -14,7 +15,9 @@ namespace qvct {
 /// A bare word alone is not taken for a list, since nearly any text begins with one. Nothing, and the fault,
 /// for a text that is no list, is nested deeper than kDeepestPropertyList, has more than
 /// mostPropertyListValues, or goes on behind the value.
+/// @param wanted  A value to be looked for on the way, if not null.
 /// @cost  O(size), without recursion.
-std::optional<PropertyList> parseOldStylePropertyList(std::string_view text, PropertyListFault& fault);
+std::optional<PropertyList> parseOldStylePropertyList(std::string_view text, PropertyListFault& fault,
+                                                      PropertyListPlace* wanted = nullptr);
 
 }  // namespace qvct

@@ -133,6 +133,11 @@ std::optional<std::int64_t> PropertyList::integerValue() const {
     return static_cast<std::int64_t>(*number);
 }
 
+std::optional<double> PropertyList::numberValue() const {
+    const std::string* text = string();
+    return text != nullptr ? numberIn(*text) : doubleValue();
+}
+
 bool PropertyList::boolValue() const {
     if (const std::string* text = string()) {
         const std::size_t first = text->find_first_not_of(" \t+-0");

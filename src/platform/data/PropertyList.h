@@ -122,6 +122,8 @@ class QVCT_API PropertyList {
     bool isNumber() const;
     /// A number's value, or the number that a string begins with (0 when none); nothing for other types.
     std::optional<double> doubleValue() const;
+    /// The same, but nothing for a string that is no number as a whole.
+    std::optional<double> numberValue() const;
     /// Like `doubleValue`, truncated toward zero and clamped to the range of the type.
     std::optional<std::int64_t> integerValue() const;
     /// Whether it is a number other than 0, or a string that says yes ("YES", "true", "1", ...).

@@ -58,6 +58,16 @@ void PropertyListBuilder::add(PropertyList value) {
     }
 }
 
+bool PropertyListBuilder::isNext(const PropertyListPath& path) const {
+    return std::equal(path.begin(), path.end(), open_.begin(), open_.end(),
+                      [](const auto& step, const Open& open) {
+                          const PropertyList::Array* items = open.container.array();
+                          const auto* key = std::get_if<std::string>(&step);
+                          return items == nullptr ? key != nullptr && *key == open.key
+                                                  : key == nullptr && std::get<1>(step) == items->size();
+                      });
+}
+
 void PropertyListBuilder::close() {
     PropertyList container = std::move(open_.back().container);
     open_.pop_back();

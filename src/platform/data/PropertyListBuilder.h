@@ -1,6 +1,7 @@
 #pragma once
 
 #include "platform/data/PropertyList.h"
+#include "platform/data/PropertyListPlace.h"
 
 #include <string>
 #include <string_view>
@@ -28,6 +29,8 @@ class PropertyListBuilder {
     std::size_t depth() const { return open_.size(); }
     /// Whether the innermost container is a dictionary.
     bool isInDictionary() const { return open_.back().container.dictionary() != nullptr; }
+    /// Whether the value that comes next is the one at the path.
+    bool isNext(const PropertyListPath& path) const;
     /// What was built, all containers being closed.
     PropertyList take() { return std::move(root_); }
 

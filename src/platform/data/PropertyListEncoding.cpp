@@ -53,6 +53,17 @@ std::size_t loneSurrogate(std::u16string_view units) {
 
 }  // namespace
 
+bool isBinaryPropertyList(std::span<const std::uint8_t> bytes) {
+    return textOf(bytes).starts_with("bplist");
+}
+
+bool isXmlPropertyList(std::string_view text) {
+    const std::size_t start = std::min(text.find_first_not_of(" \t\r\n"), text.size());
+    if (!text.substr(start).starts_with('<')) return false;
+    const std::size_t end = text.find_first_not_of(" \t\r\n0123456789abcdefABCDEF", start + 1);
+    return end == std::string_view::npos || text[end] != '>';
+}
+
 std::optional<PropertyListCharacters> PropertyListCharacters::decode(std::span<const std::uint8_t> bytes,
                                                                      PropertyListFault& fault) {
     PropertyListCharacters result;

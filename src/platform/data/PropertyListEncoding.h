@@ -11,6 +11,10 @@
 
 namespace qvct {
 
+bool isBinaryPropertyList(std::span<const std::uint8_t> bytes);
+/// Whether the text is meant as XML: it begins with a "<" that does not open data of the old text form.
+bool isXmlPropertyList(std::string_view text);
+
 /// The characters of a property list that is text, as UTF-8: a byte order mark in front means UTF-8 or UTF-16
 /// of either byte order, a zero byte beside a first "<" means UTF-16, too; anything else is UTF-8.
 class PropertyListCharacters {

@@ -13,7 +13,6 @@
 #include <algorithm>
 #include <array>
 #include <bit>
-#include <cstring>
 #include <limits>
 #include <memory>
 #include <utility>
@@ -279,18 +278,6 @@ std::size_t countOf(const PropertyList& value) {
     return count;
 }
 
-bool isBinary(std::span<const std::uint8_t> bytes) {
-    return bytes.size() >= 6 && std::memcmp(bytes.data(), "bplist", 6) == 0;
-}
-
-/// Whether it is meant as XML: it begins with a "<" that does not open data of the old text form.
-bool isXml(std::string_view text) {
-    const std::size_t start = std::min(text.find_first_not_of(" \t\r\n"), text.size());
-    if (!text.substr(start).starts_with('<')) return false;
-    const std::size_t end = text.find_first_not_of(" \t\r\n0123456789abcdefABCDEF", start + 1);
-    return end == std::string_view::npos || text[end] != '>';
-}
-
 /// The first byte behind the root element that is not part of a blank, zero, comment or instruction.
 std::optional<std::size_t> remainder(std::string_view text, std::size_t end) {
     constexpr std::string_view blanks(" \t\r\n\0", 5);
@@ -330,9 +317,10 @@ std::optional<PropertyList> parseXml(std::string_view text, PropertyListUse use,
     return std::nullopt;
 }
 
-bool failAt(Error* error, std::string_view form, const PropertyListFault& fault, std::size_t offset) {
+bool failAt(Error* error, std::string_view form, const PropertyListFault& fault, std::size_t offset,
+            std::optional<std::uint64_t> line = std::nullopt) {
     return fail(error, fault.code, fault.reason,
-                {.part = fmt::format("{} property list", form), .offset = offset});
+                {.part = fmt::format("{} property list", form), .line = line, .offset = offset});
 }
 
 }  // namespace
@@ -344,7 +332,7 @@ std::optional<PropertyList> parsePropertyList(std::span<const std::uint8_t> byte
         return std::nullopt;
     }
     PropertyListFault fault;
-    if (isBinary(bytes)) {
+    if (isBinaryPropertyList(bytes)) {
         auto value = parseBinary(bytes, fault);
         if (!value) failAt(error, "binary", fault, fault.offset);
         return value;
@@ -354,10 +342,13 @@ std::optional<PropertyList> parsePropertyList(std::span<const std::uint8_t> byte
         failAt(error, "text", fault, fault.offset);
         return std::nullopt;
     }
-    const bool isXmlForm = isXml(characters->text());
-    auto value = isXmlForm ? parseXml(characters->text(), use, fault)
-                           : parseOldStylePropertyList(characters->text(), fault);
-    if (!value) failAt(error, isXmlForm ? "XML" : "old-style", fault, characters->byteOffset(fault.offset));
+    const std::string_view text = characters->text();
+    const bool isXml = isXmlPropertyList(text);
+    auto value = isXml ? parseXml(text, use, fault) : parseOldStylePropertyList(text, fault);
+    if (!value) {
+        failAt(error, isXml ? "XML" : "old-style", fault, characters->byteOffset(fault.offset),
+               lineAt(text, fault.offset));
+    }
     return value;
 }
 

@@ -100,11 +100,6 @@ bool hasKnownMarkup(std::string_view narrow, bool isWide, Error* error) {
                 fmt::format("texts in the encoding \"{}\" are not read", printable(*name)), {.line = 1});
 }
 
-std::size_t lineAt(std::string_view text, std::size_t offset) {
-    return 1 + static_cast<std::size_t>(
-                   std::count(text.begin(), text.begin() + static_cast<std::ptrdiff_t>(offset), '\n'));
-}
-
 /// The offset of the quote that opens the value after the "=" at `equals`; the text's size when there is
 /// none.
 std::size_t valueBehind(std::string_view text, std::size_t equals) {

@@ -148,7 +148,8 @@ std::optional<PropertyList> dateOf(std::string_view text) {
 /// not be in a property list. `where()` answers the offset of an event's first byte.
 class Reader {
   public:
-    explicit Reader(std::size_t size) : mostValues_(mostPropertyListValues(size)) {}
+    Reader(std::size_t size, PropertyListPlace* wanted)
+        : mostValues_(mostPropertyListValues(size)), wanted_(wanted) {}
 
     template <typename Where>
     void start(std::string_view name, bool isPrefixed, Where where) {
@@ -159,6 +160,7 @@ class Reader {
         const bool isContainer = *element == Element::dictionary || *element == Element::array;
         if (isContainer && builder_.depth() >= static_cast<std::size_t>(kDeepestPropertyList))
             return refuse("nested too deeply", where(), kErrorTooLarge);
+        if (!open_.empty() && open_.back().element == Element::array) note(where);
         if (*element == Element::dictionary) builder_.openDictionary();
         if (*element == Element::array) builder_.openArray();
         if (!open_.empty()) ++open_.back().children;
@@ -203,6 +205,7 @@ class Reader {
                 break;
             case Element::key:
                 builder_.key(std::exchange(characters_, {}));
+                note([&closed] { return closed.offset; });
                 break;
             default:
                 add(closed);
@@ -223,6 +226,12 @@ class Reader {
         std::size_t children;
         std::size_t offset;  // of its characters, where it holds some
     };
+
+    /// Keeps the offset, if the value that comes next is the one that is looked for.
+    template <typename Where>
+    void note(Where where) {
+        if (wanted_ != nullptr && builder_.isNext(wanted_->path)) wanted_->offset = where();
+    }
 
     bool mayStandHere(Element element) const {
         if (open_.empty()) return element == Element::plist;
@@ -265,6 +274,7 @@ class Reader {
     }
 
     std::size_t mostValues_;
+    PropertyListPlace* wanted_;
     std::size_t values_ = 0;
     PropertyListBuilder builder_;
     std::vector<Open> open_;
@@ -276,7 +286,7 @@ class Reader {
 /// The parser, fed at once and stopped at the first fault or at the end of the root element.
 class Parser {
   public:
-    explicit Parser(std::string_view text) : text_(text), reader_(text.size()) {
+    Parser(std::string_view text, PropertyListPlace* wanted) : text_(text), reader_(text.size(), wanted) {
         xmlSAXHandler handler{};
         handler.initialized = XML_SAX2_MAGIC;
         handler.startElementNs = [](void* self, const xmlChar* name, const xmlChar* prefix, const xmlChar*,
@@ -385,8 +395,8 @@ class Parser {
 }  // namespace
 
 std::optional<PropertyList> parseXmlPropertyList(std::string_view text, std::size_t& end,
-                                                 PropertyListFault& fault) {
-    return Parser(text).parse(end, fault);
+                                                 PropertyListFault& fault, PropertyListPlace* wanted) {
+    return Parser(text, wanted).parse(end, fault);
 }
 
 }  // namespace qvct

@@ -2,6 +2,7 @@
 
 #include "platform/data/PropertyList.h"
 #include "platform/data/PropertyListGuard.h"
+#include "platform/data/PropertyListPlace.h"
 
 #include <cstddef>
 #include <optional>
@@ -18,8 +19,10 @@ namespace qvct {
 /// kDeepestPropertyList, more than mostPropertyListValues, kMostXmlAttributes or kMostXmlNameSpaces. If
 /// faults were tolerated, what follows them would be lost when the list is written again.
 /// @param end  Set to the offset behind the root element, unless there is a fault.
+/// @param wanted  A value to be looked for on the way, if not null.
 /// @cost  O(size), without recursion.
 std::optional<PropertyList> parseXmlPropertyList(std::string_view text, std::size_t& end,
-                                                 PropertyListFault& fault);
+                                                 PropertyListFault& fault,
+                                                 PropertyListPlace* wanted = nullptr);
 
 }  // namespace qvct

@@ -229,6 +229,25 @@ std::string replaceAll(std::string_view text, std::string_view from, std::string
     return join(split(text, from), to);
 }
 
+std::uint64_t lineAt(std::string_view text, std::size_t offset) {
+    const std::string_view before = text.substr(0, offset);
+    std::uint64_t line = 1;
+    for (std::size_t i = 0; i < before.size(); ++i) {
+        const bool isPairOfBreaks = before[i] == '\r' && i + 1 < text.size() && text[i + 1] == '\n';
+        line += before[i] == '\n' || (before[i] == '\r' && !isPairOfBreaks) ? 1 : 0;
+    }
+    return line;
+}
+
+std::optional<double> numberIn(std::string_view text) {
+    text = trimBlanksAndLineBreaks(text);
+    if (text.starts_with('+')) text.remove_prefix(1);
+    double value = 0;
+    const auto [end, status] = std::from_chars(text.data(), text.data() + text.size(), value);
+    const bool isNumber = status == std::errc{} && end == text.data() + text.size();
+    return isNumber ? std::optional(value) : std::nullopt;
+}
+
 double leadingNumber(std::string_view text) {
     const std::size_t first = text.find_first_not_of(" \t\n\r");
     if (first == std::string_view::npos) return 0;

@@ -2,6 +2,9 @@
 
 #include "platform/base/Printable.h"
 
+#include <cstddef>
+#include <cstdint>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -51,6 +54,10 @@ std::string_view trimPunctuation(std::string_view text);
 std::vector<std::string> split(std::string_view text, std::string_view separator);
 std::string join(const std::vector<std::string>& parts, std::string_view separator);
 std::string replaceAll(std::string_view text, std::string_view from, std::string_view to);
+/// The line, from 1, on which the byte at the offset stands.
+std::uint64_t lineAt(std::string_view text, std::size_t offset);
+/// The number that the text is, blanks around it aside and whatever the locale; nothing when it is none.
+std::optional<double> numberIn(std::string_view text);
 /// The number that the text begins with, blanks skipped and whatever the locale; 0 when there is none.
 double leadingNumber(std::string_view text);
 /// How many columns of a terminal the text takes.

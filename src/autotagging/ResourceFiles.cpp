@@ -1,0 +1,24 @@
+#include "autotagging/ResourceFiles.h"
+
+#include "autotagging/evidence/EvidenceWeights.h"
+#include "autotagging/names/NamingHabits.h"
+
+namespace qvct {
+
+std::span<const ResourceFile> resourceFiles() {
+    static const ResourceFile files[] = {{"DefaultTaxonomy", "plist"},
+                                         {"DefaultRules", "plist"},
+                                         {"DefaultKeywordMapping", "plist"},
+                                         {"LegacyLoopTaxonomy", "plist"},
+                                         {"LegacyLoopTaxonomyMapping", "csv"},
+                                         {"LegacyVorthalTaxonomy", "plist"},
+                                         {"LegacyVorthalTaxonomyMapping", "csv"},
+                                         {"PackDisplayNames", "csv"},
+                                         EvidenceWeights::file(),
+                                         NamingHabits::file(),
+                                         {"QVSearchKit", "js"},
+                                         {"ExtractSoftwareInstrumentsRule", "js"}};
+    return files;
+}
+
+}  // namespace qvct
