@@ -56,7 +56,7 @@ TEST(Errors, NameEachPlaceOnce) {
         Fails fails;
     } rows[] = {
         {"a missing file", folder.path("none"), {}, {}, readList},
-        {"a property list", folder.write("a.plist", "<plist><dict><key>"), {}, 18, readList},
+        {"a property list", folder.write("a.plist", "<plist><dict>\n<key>"), 2, 19, readList},
         {"XML", folder.write("a.xml", "\n\n<a" + attributes + ">"), 3, {}, readXml},
         {"a preset", folder.write("a.vcp", "fine\n\xff\n"), 2, {}, readPreset},
         {"a script", "", 2, {}, checkScript},
