@@ -133,9 +133,9 @@ TEST(Explanation, OfEarlierEditionsAndOtherDescribersIsWhatIsKnown) {
     ASSERT_TRUE(decodeDescription(descriptionOfEarlierEdition(), earlier));
     EXPECT_EQ(earlier.taggings, item().taggings);
     EXPECT_EQ(textOf(explanationOf(earlier)),
-              "false 0 0\n1 0.952\n  Kick names 0.952 'Kick' in '' at 0, 0 away; \n2 0.952\n");
+              "false 0 0 false -1\n1 0.952\n  Kick names 0.952 'Kick' in '' at 0, 0 away; \n2 0.952\n");
     const std::string outline =
-        "false 0 0\n1 1.000\n  Kick names 1.000 '' in '' at 0, 0 away; \n2 1.000\n"
+        "false 0 0 false -1\n1 1.000\n  Kick names 1.000 '' in '' at 0, 0 away; \n2 1.000\n"
         "3 1.000\n  Mono host 1.000 '' in '' at 0, 0 away; \n";
     EXPECT_EQ(textOf(explanationOf(item())), outline);
     // What is no explanation is none; whatever the bytes, no more is read than is there.
