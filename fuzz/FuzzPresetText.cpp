@@ -11,12 +11,12 @@ using Dictionary = PropertyList::Dictionary;
 
 /// What a record stores: weights are clamped, so that taggings themselves may differ after a write.
 Dictionary stored(const TGRTMetaData& record) {
-    Dictionary result = {{"Tagging", TGRTTagging::taggingDictionaryForTaggings(record.taggings())},
-                         {"SubType", record.subFileType()},
-                         {"Values", TGRTKeyValue::keyValueDictionaryForKeyValues(record.keyValues())},
-                         {"Rejected", PropertyList::Array(record.rejectedLabels().begin(),
-                                                          record.rejectedLabels().end())},
-                         {"ContentInfo", record.contentInfo()->dictionary()}};
+    Dictionary result = {
+        {"Tagging", TGRTTagging::taggingDictionaryForTaggings(record.taggings())},
+        {"SubType", record.subFileType()},
+        {"Values", TGRTKeyValue::keyValueDictionaryForKeyValues(record.keyValues())},
+        {"Rejected", PropertyList::Array(record.rejectedLabels().begin(), record.rejectedLabels().end())},
+        {"ContentInfo", record.contentInfo()->dictionary()}};
     if (record.displayName()) result.set("DisplayName", *record.displayName());
     return result;
 }
