@@ -71,10 +71,11 @@ class KeywordJudge {
                 claim.confidence = std::min(claim.confidence, named.confidence);
                 return;
             }
-            // A keyword of the same word says something else of it, as a user's own may.
-            if (claim.evidence.what.size() >= named.evidence.what.size()) continue;
             const auto its = taxonomy_.findTagForLabel(named.label);
-            const std::string category = its ? its->categoryIdentifier() : std::string();
+            if (its && isKey(*its)) other = &named;
+            // A keyword of the same word says something else of it, as a user's own may.
+            if (!its || claim.evidence.what.size() >= named.evidence.what.size()) continue;
+            const std::string& category = its->categoryIdentifier();
             if (category == tag.categoryIdentifier() || category == QVCategoryGenresIdentifier)
                 other = &named;
         }

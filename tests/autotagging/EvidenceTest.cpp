@@ -236,9 +236,15 @@ TEST_F(Tagging, LetsNothingAboveTheFolderCount) {
 TEST_F(Tagging, DoubtsKeywordsThatSeeOnlyAPartOfWhatIsMeant) {
     const struct {
         std::string name, dropped, held;
-    } rows[] = {{"Bass Drum 1.wav", "Bass", "Kick"},     {"Hard Drive Kick.wav", "Drive", "Kick"},
-                {"Synth A# Minor.wav", "A", "ASharp"},   {"Drum'n'Bass/Snare 1.wav", "Bass", "Snare"},
-                {"Snare Sample.wav", "Sample", "Snare"}, {"House Guitar Vol 2/01.wav", "Guitar", "House"}};
+    } rows[] = {{"Bass Drum 1.wav", "Bass", "Kick"},
+                {"Hard Drive Kick.wav", "Drive", "Kick"},
+                {"Synth A# Minor.wav", "A", "ASharp"},
+                {"Drum'n'Bass/Snare 1.wav", "Bass", "Snare"},
+                {"Snare Sample.wav", "Sample", "Snare"},
+                {"House Guitar Vol 2/01.wav", "Guitar", "House"},
+                {"Synth Fm.wav", "FM", "F"},
+                {"The Mysterious Bank/Kick 1.wav", "Mysterious", "Kick"},
+                {"SD_Pop_Strings.wav", "Snare", "Strings"}};
     for (const auto& [name, dropped, held] : rows) {
         const Labels labels = tag(sound("Root/" + name), folder_.path("Root"));
         EXPECT_THAT(labels, Contains(held)) << name;

@@ -112,10 +112,11 @@ TEST(Names, BeginWithTheCodeOfAnyCategory) {
 
 TEST(Names, DoNotSayWhatTheyOnlySeemToSay) {
     for (const char* name :
-         {"",       "808",    "v127 rr2", "Hard Drive", "Section B", "Plan B", "3 AM",     "Vol 2",
-          "C",      "A Day",  "Take C",   "TR808",      "abcdefgh",  "Kit",    "()[]--__", "9A",
-          "Sat",    "Bdelay", "Charm",    "Miami Vice", "Monkeys",   "Strong", "Symbol",   "Override",
-          "Clip 3", "Sounds", "Club",     "Rinse",      "Recorded"}) {
+         {"",         "808",        "v127 rr2", "Hard Drive", "Section B", "Plan B",
+          "3 AM",     "Vol 2",      "C",        "A Day",      "Take C",    "TR808",
+          "abcdefgh", "Kit",        "()[]--__", "9A",         "Sat",       "Bdelay",
+          "Charm",    "Miami Vice", "Monkeys",  "Strong",     "Symbol",    "Override",
+          "Clip 3",   "Sounds",     "Club",     "Rinse",      "Recorded",  "TM Wandering Star"}) {
         const NameReading reading = readingOf(name);
         EXPECT_THAT(labelsOf(reading), IsEmpty()) << name;
         EXPECT_FALSE(reading.tempo) << name;

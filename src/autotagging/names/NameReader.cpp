@@ -1,6 +1,5 @@
 #include "autotagging/names/NameReader.h"
 
-#include "autotagging/names/NameScan.h"
 #include "taxonomy/TaggingTypes.h"
 
 #include <algorithm>
@@ -77,7 +76,8 @@ NameReading NameReader::read(std::span<const std::string_view> names) {
             const NamedMeaning& meaning = habits_->meaning(meant.word.meaning);
             const bool isInstrument = meaning.category == QVCategorySourceIdentifier && !meant.isOfPrefix;
             const bool isOfPack = i > 0 && scan.isOfPack();
-            const bool isHint = isInstrument && (isOfPack || isForeign(meaning, scan.prefix()));
+            const bool isHint = (isInstrument && (isOfPack || isForeign(meaning, scan.prefix()))) ||
+                                (i > 0 && isOfTitle(meaning, scan)) || areInitials(meant, scan);
             const double confidence = confidenceOf(isHint ? NameStrength::hint : meant.word.strength);
             const bool isFigure = meaning.isFigurative && !meant.isOfPrefix;
             TagClaim& claim = claims.add(i > 0 ? meaning.inFolders : meaning.label, meant.offset, meant.end,
@@ -103,6 +103,26 @@ NameReading NameReader::read(std::span<const std::string_view> names) {
     if (reading.kind == SoundKind::unsaid && hasLength) reading.kind = SoundKind::loop;
     combine(reading);
     return reading;
+}
+
+/// A folder whose name has words that mean nothing has a title: "The Mysterious Bank" is not mysterious.
+bool NameReader::isOfTitle(const NamedMeaning& meaning, const NameScan& scan) {
+    return scan.unknownWords() > 0 && meaning.category != QVCategorySourceIdentifier &&
+           meaning.category != QVCategoryGenresIdentifier;
+}
+
+/// Two letters among words that mean nothing, or in front of a word for another instrument, are rather
+/// somebody's than a tom's: "TM Wandering Star", "SD_Pop_Strings".
+bool NameReader::areInitials(const NameScan::Meant& meant, const NameScan& scan) const {
+    if (meant.word.strength != NameStrength::abbreviation || meant.end - meant.offset > 2) return false;
+    if (scan.unknownWords() > 1) return true;
+    const std::string& root = habits_->meaning(meant.word.meaning).root;
+    return meant.offset == 0 && std::any_of(scan.meant().begin(), scan.meant().end(), [&](const auto& other) {
+               const NamedMeaning& its = habits_->meaning(other.word.meaning);
+               return other.word.strength == NameStrength::word &&
+                      its.category == QVCategorySourceIdentifier && its.root != root &&
+                      !weights_.goTogether(its.root, root);
+           });
 }
 
 /// "GLASCrsh_Window Crash" is glass: behind a prefix, words for what does not go with it only describe.

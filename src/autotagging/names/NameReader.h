@@ -4,6 +4,7 @@
 #include "autotagging/evidence/SoundKind.h"
 #include "autotagging/evidence/TagClaim.h"
 #include "autotagging/names/NamePieces.h"
+#include "autotagging/names/NameScan.h"
 #include "autotagging/names/NamingHabits.h"
 
 #include <cstdint>
@@ -58,6 +59,8 @@ class NameReader {
     };
 
     double confidenceOf(NameStrength strength) const;
+    static bool isOfTitle(const NamedMeaning& meaning, const NameScan& scan);
+    bool areInitials(const NameScan::Meant& meant, const NameScan& scan) const;
     bool isForeign(const NamedMeaning& meaning, std::span<const NamingHabits::Word> prefix) const;
     void combine(NameReading& reading) const;
     static void combine(NameReading& reading, std::size_t number, const std::string& label,

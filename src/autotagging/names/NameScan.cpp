@@ -208,6 +208,8 @@ std::size_t NameScan::readPacked(std::size_t at) {
     noteKindInside(pieces_[at]);
     auto [first, second] = habits_.packedWords(pieces_[at].folded);
     if (first.pieces == 0) first = habits_.nearWord(pieces_[at]);
+    constexpr std::size_t shortestWord = 3;
+    if (first.pieces == 0 && pieces_[at].folded.size() >= shortestWord) ++unknownWords_;
     for (const Word& word : {first, second}) {
         if (word.pieces == 0) break;
         noteKind(word.role);

@@ -48,6 +48,8 @@ class NameScan {
     }
     /// It is called by its maker: a volume, a collection.
     bool isOfPack() const { return isOfPack_; }
+    /// Words of three letters and more that mean nothing.
+    int unknownWords() const { return unknownWords_; }
     /// How long it is: "4 bars".
     std::optional<int> bars() const { return bars_; }
     std::optional<int> beats() const { return beats_; }
@@ -99,6 +101,7 @@ class NameScan {
     std::span<const NamingHabits::Word> prefix_;
     std::pair<std::uint32_t, std::uint32_t> makers_ = {0, 0};  // who they are is no sound
     std::optional<int> bars_, beats_;
+    int unknownWords_ = 0;
     std::size_t behindNumber_ = 0;      // the piece behind the last one that was read
     NameRole before_ = NameRole::none;  // of the word before the piece at hand
     bool saysLoop_ = false, saysOneShot_ = false, isOfPack_ = false, hasNote_ = false, isLayer_ = false;
