@@ -76,8 +76,9 @@ class KeywordJudge {
             // A keyword of the same word says something else of it, as a user's own may.
             if (!its || claim.evidence.what.size() >= named.evidence.what.size()) continue;
             const std::string& category = its->categoryIdentifier();
-            if (category == tag.categoryIdentifier() || category == QVCategoryGenresIdentifier)
-                other = &named;
+            const bool isOfGenre = tag.categoryIdentifier() == QVCategoryGenresIdentifier ||
+                                   category == QVCategoryGenresIdentifier;
+            if (isOfGenre || category == tag.categoryIdentifier()) other = &named;
         }
         if (other != nullptr) claim.doubt = fmt::format("\"{}\" is {}", other->evidence.what, other->label);
     }

@@ -115,13 +115,13 @@ bool NameReader::isOfTitle(const NamedMeaning& meaning, const NameScan& scan) {
 /// somebody's than a tom's: "TM Wandering Star", "SD_Pop_Strings".
 bool NameReader::areInitials(const NameScan::Meant& meant, const NameScan& scan) const {
     if (meant.word.strength != NameStrength::abbreviation || meant.end - meant.offset > 2) return false;
-    if (scan.unknownWords() > 1) return true;
+    const bool isAddress = meant.offset == 0 && scan.name().substr(meant.end).starts_with(' ');
+    if (scan.unknownWords() > (isAddress ? 0 : 1)) return true;
     const std::string& root = habits_->meaning(meant.word.meaning).root;
     return meant.offset == 0 && std::any_of(scan.meant().begin(), scan.meant().end(), [&](const auto& other) {
                const NamedMeaning& its = habits_->meaning(other.word.meaning);
                return other.word.strength == NameStrength::word &&
-                      its.category == QVCategorySourceIdentifier && its.root != root &&
-                      !weights_.goTogether(its.root, root);
+                      its.category == QVCategorySourceIdentifier && its.root != root;
            });
 }
 

@@ -147,16 +147,18 @@ void NameScan::addMeant(const Word& word, std::uint32_t offset, std::uint32_t en
         meant_.push_back({habits_.other(at), offset, end});
 }
 
-/// "Drum Fill" is a fill, and of drums; but there is no bass in "Drum and Bass".
+/// "Drum Fill" is a fill, and of drums; but there is no bass in "Drum and Bass", and no genre in "Jazz
+/// Guitar".
 void NameScan::addWordsIn(const Word& phrase, std::span<const NamePiece> pieces) {
     if (phrase.meaning == Word::kNoMeaning || isOfMaker(pieces.front().offset)) return;
     const std::string& category = habits_.meaning(phrase.meaning).category;
     if (category == QVCategoryGenresIdentifier) return;
     for (std::size_t i = 0; i < pieces.size(); ++i) {
         const Word word = habits_.wordAt(pieces.subspan(i, 1), buffer_);
-        const bool isOther =
-            word.meaning != Word::kNoMeaning && habits_.meaning(word.meaning).category != category;
-        if (isOther) meant_.push_back({word, pieces[i].offset, pieces[i].end()});
+        if (word.meaning == Word::kNoMeaning) continue;
+        const std::string& its = habits_.meaning(word.meaning).category;
+        if (its != category && its != QVCategoryGenresIdentifier)
+            meant_.push_back({word, pieces[i].offset, pieces[i].end()});
     }
 }
 

@@ -38,6 +38,7 @@ class NameScan {
     NameScan(const NamingHabits& habits, std::string_view name, std::span<const NamePiece> pieces,
              Owner owner, std::string& buffer);
 
+    std::string_view name() const { return name_; }
     const std::vector<Meant>& meant() const { return meant_; }
     /// What the code says that the name begins with; it comes first in `meant`.
     std::span<const NamingHabits::Word> prefix() const { return prefix_; }
