@@ -5,7 +5,9 @@
 #include "support/AudioFixtures.h"
 #include "support/RunTool.h"
 
+#include <chrono>
 #include <filesystem>
+#include <thread>
 
 #include <gmock/gmock.h>
 
@@ -128,6 +130,8 @@ TEST(Reject, OfAFolderHoldsForWhatIsPutIntoItLater) {
     const std::string other = folder.write("Library/Other/Kick.wav", sound());
     const std::string database = folder.path("db");
     const auto index = [&] {
+        // What has just changed would be read again by the run after this one.
+        std::this_thread::sleep_for(std::chrono::milliseconds(40));
         const ToolResult result = runTool({"--json", "index", root, "--db", database});
         EXPECT_EQ(result.status, 0) << result.errors;
         return result.json()["indexed"].get<int>();
