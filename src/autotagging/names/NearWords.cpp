@@ -2,7 +2,6 @@
 
 #include <algorithm>
 #include <bit>
-#include <optional>
 
 namespace qvct {
 namespace {
@@ -25,9 +24,9 @@ std::uint32_t lettersOf(std::string_view text) {
     return letters;
 }
 
-/// How many consonants a word loses when nothing but letters are left out; nothing when it is not so. One of
+/// How many consonants a word loses when nothing but letters are left out, else more than it can have. One of
 /// two equal letters is no loss.
-std::optional<std::size_t> consonantsLeftOut(std::string_view piece, std::string_view word) {
+std::size_t consonantsLeftOut(std::string_view piece, std::string_view word) {
     std::size_t lost = 0, at = 0;
     for (std::size_t i = 0; i < word.size(); ++i) {
         if (at < piece.size() && piece[at] == word[i]) {
@@ -36,7 +35,7 @@ std::optional<std::size_t> consonantsLeftOut(std::string_view piece, std::string
             ++lost;
         }
     }
-    return at == piece.size() ? std::optional(lost) : std::nullopt;
+    return at == piece.size() ? lost : kLongest + 1;
 }
 
 /// Whether one letter is too many, another one, or two changed places; the ends are as they should be.
@@ -60,7 +59,7 @@ std::string_view inTheSingular(std::string_view word, std::string_view piece) {
 int farness(std::string_view piece, std::string_view word) {
     constexpr std::size_t shortestWithError = 7, shortestWithLoss = 6;
     const bool isMost = 2 * piece.size() >= word.size();
-    const auto lost = isMost ? consonantsLeftOut(piece, word) : std::nullopt;
+    const std::size_t lost = isMost ? consonantsLeftOut(piece, word) : kLongest + 1;
     const bool hasVowel = std::any_of(piece.begin() + 1, piece.end(), isVowel);
     if (lost == 0 && (piece.size() > kShortestPiece || !hasVowel)) return 0;
     const bool isLongStart = piece.size() > kShortestPiece || 3 * piece.size() >= 2 * word.size();
