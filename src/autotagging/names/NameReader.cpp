@@ -74,14 +74,8 @@ NameReading NameReader::read(std::span<const std::string_view> names) {
             const bool isLetter = meant.end - meant.offset == 1;
             if (i > 0 && isLetter) continue;
             const NamedMeaning& meaning = habits_->meaning(meant.word.meaning);
-            const bool isInstrument = meaning.category == QVCategorySourceIdentifier && !meant.isOfPrefix;
-            const bool isOfPack = i > 0 && scan.isOfPack();
-            const bool isHint = (isInstrument && (isOfPack || isForeign(meaning, scan.prefix()))) ||
-                                (i > 0 && isOfTitle(meaning, scan)) || areInitials(meant, scan);
-            const double confidence = confidenceOf(isHint ? NameStrength::hint : meant.word.strength);
-            const bool isFigure = meaning.isFigurative && !meant.isOfPrefix;
             TagClaim& claim = claims.add(i > 0 ? meaning.inFolders : meaning.label, meant.offset, meant.end,
-                                         isFigure ? std::min(confidence, weights_.figure) : confidence);
+                                         confidenceOf(meant, scan, owner));
             claim.level = meaning.level;
             if (!meaning.combinations.empty()) combinable_.push_back({reading.claims.size() - 1, &meaning});
             claim.isHead = meant.end == scan.meant().back().end;
@@ -103,6 +97,19 @@ NameReading NameReader::read(std::span<const std::string_view> names) {
     if (reading.kind == SoundKind::unsaid && hasLength) reading.kind = SoundKind::loop;
     combine(reading);
     return reading;
+}
+
+double NameReader::confidenceOf(const NameScan::Meant& meant, const NameScan& scan,
+                                NameScan::Owner owner) const {
+    const NamedMeaning& meaning = habits_->meaning(meant.word.meaning);
+    const bool isOfFolder = owner == NameScan::Owner::folder;
+    const bool isInstrument = meaning.category == QVCategorySourceIdentifier && !meant.isOfPrefix;
+    const bool isForeigner =
+        isInstrument && ((isOfFolder && scan.isOfPack()) || isForeign(meaning, scan.prefix()));
+    const bool isHint = isForeigner || (isOfFolder && isOfTitle(meaning, scan)) || areInitials(meant, scan);
+    const double confidence = confidenceOf(isHint ? NameStrength::hint : meant.word.strength);
+    const bool isFigure = meaning.isFigurative && !meant.isOfPrefix;
+    return isFigure ? std::min(confidence, weights_.figure) : confidence;
 }
 
 /// A folder whose name has words that mean nothing has a title: "The Mysterious Bank" is not mysterious.

@@ -59,6 +59,7 @@ class NameReader {
     };
 
     double confidenceOf(NameStrength strength) const;
+    double confidenceOf(const NameScan::Meant& meant, const NameScan& scan, NameScan::Owner owner) const;
     static bool isOfTitle(const NamedMeaning& meaning, const NameScan& scan);
     bool areInitials(const NameScan::Meant& meant, const NameScan& scan) const;
     bool isForeign(const NamedMeaning& meaning, std::span<const NamingHabits::Word> prefix) const;

@@ -11,7 +11,8 @@ namespace {
 
 std::vector<int> likelyBeats(const NameReading& reading) {
     if (reading.beats) return {*reading.beats};
-    if (reading.bars) return {*reading.bars * 4, *reading.bars * 3};
+    constexpr int usualBeatsOfBar = 4, beatsOfWaltz = 3;
+    if (reading.bars) return {*reading.bars * usualBeatsOfBar, *reading.bars * beatsOfWaltz};
     return {8, 16, 32, 64};
 }
 
