@@ -1,8 +1,7 @@
 # The one interface target that every target of the project links: language level, warnings, sanitizers.
 add_library(qvct_build_flags INTERFACE)
 target_compile_features(qvct_build_flags INTERFACE cxx_std_20)
-target_compile_options(qvct_build_flags INTERFACE -Wall -Wextra -Wpedantic -Wconversion -Wshadow
-  $<$<CXX_COMPILER_ID:Clang>:-Wreserved-identifier>)
+target_compile_options(qvct_build_flags INTERFACE -Wall -Wextra -Wpedantic -Wconversion -Wshadow)
 if(QVCT_WARNINGS_AS_ERRORS)
   target_compile_options(qvct_build_flags INTERFACE -Werror)
 endif()
