@@ -5,7 +5,6 @@
 #include <string_view>
 
 // libxml2's names, declared here so that headers need none of its own.
-// NOLINTBEGIN(bugprone-reserved-identifier)
 struct _xmlBuffer;
 struct _xmlDoc;
 struct _xmlNode;
@@ -13,7 +12,6 @@ struct _xmlParserCtxt;
 struct _xmlXPathCompExpr;
 struct _xmlXPathContext;
 struct _xmlXPathObject;
-// NOLINTEND(bugprone-reserved-identifier)
 
 namespace qvct {
 
