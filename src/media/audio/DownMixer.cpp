@@ -1,5 +1,7 @@
 #include "media/audio/DownMixer.h"
 
+#include "media/audio/BoundedSample.h"
+
 #include <algorithm>
 #include <cmath>
 
@@ -7,12 +9,6 @@ namespace qvct {
 namespace {
 
 constexpr double kRate = 22050;
-constexpr float kLargest = 16;
-
-float bounded(float sample) {
-    if (std::abs(sample) <= kLargest) return sample;
-    return std::isfinite(sample) ? std::copysign(kLargest, sample) : 0;
-}
 
 }  // namespace
 
@@ -42,8 +38,8 @@ void DownMixer::mix(std::span<const float> frames, std::vector<float>& mixed) {
         float* out = mixed.data() + from;
         for (std::size_t i = 0; i < left / 2; ++i) {
             const float* f = frame + 4 * i;
-            out[i] =
-                bounded((f[0] * a + f[1] * b) + (f[2] * a + f[3] * b));  // in the order of the general case
+            out[i] = boundedSample((f[0] * a + f[1] * b) +
+                                   (f[2] * a + f[3] * b));  // in the order of the general case
         }
         frame += left / 2 * 4;
         left %= 2;
@@ -51,7 +47,7 @@ void DownMixer::mix(std::span<const float> frames, std::vector<float>& mixed) {
     for (; left > 0; --left, frame += width) {
         run_ += mixedFrame(frame);
         if (++runLength_ < factor_) continue;
-        mixed.push_back(bounded(run_));
+        mixed.push_back(boundedSample(run_));
         run_ = 0;
         runLength_ = 0;
     }
