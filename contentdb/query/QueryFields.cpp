@@ -8,6 +8,7 @@
 
 #include <algorithm>
 #include <array>
+#include <charconv>
 #include <utility>
 
 #include <fmt/format.h>
@@ -21,23 +22,35 @@ struct Name {
     std::string_view of;
 };
 
-constexpr std::array<Name, 17> kNames = {{{"name", Field::Kind::name, ""},
-                                          {"path", Field::Kind::path, ""},
-                                          {"type", Field::Kind::type, ""},
-                                          {"pack", Field::Kind::pack, ""},
-                                          {"tag", Field::Kind::tag, ""},
-                                          {"key", Field::Kind::key, ""},
-                                          {"level", Field::Kind::level, ""},
-                                          {"bpm", Field::Kind::number, "tempo"},
-                                          {"tempo", Field::Kind::number, "tempo"},
-                                          {"beats", Field::Kind::number, "beatcount"},
-                                          {"beatcount", Field::Kind::number, "beatcount"},
-                                          {"seconds", Field::Kind::number, "lengthinseconds"},
-                                          {"length", Field::Kind::number, "lengthinseconds"},
-                                          {"root", Field::Kind::number, "midirootnote"},
-                                          {"size", Field::Kind::number, "size"},
-                                          {"top", Field::Kind::number, "signaturetop"},
-                                          {"bottom", Field::Kind::number, "signaturebottom"}}};
+constexpr auto kNames = std::to_array<Name>({{"name", Field::Kind::name, ""},
+                                             {"path", Field::Kind::path, ""},
+                                             {"type", Field::Kind::type, ""},
+                                             {"pack", Field::Kind::pack, ""},
+                                             {"tag", Field::Kind::tag, ""},
+                                             {"key", Field::Kind::key, ""},
+                                             {"level", Field::Kind::level, ""},
+                                             {"bpm", Field::Kind::number, "tempo"},
+                                             {"tempo", Field::Kind::number, "tempo"},
+                                             {"beats", Field::Kind::number, "beatcount"},
+                                             {"beatcount", Field::Kind::number, "beatcount"},
+                                             {"seconds", Field::Kind::number, "lengthinseconds"},
+                                             {"length", Field::Kind::number, "lengthinseconds"},
+                                             {"root", Field::Kind::number, "midirootnote"},
+                                             {"size", Field::Kind::number, "size"},
+                                             {"top", Field::Kind::number, "signaturetop"},
+                                             {"bottom", Field::Kind::number, "signaturebottom"},
+                                             {"note", Field::Kind::number, "note"},
+                                             {"cents", Field::Kind::number, "cents"},
+                                             {"loudness", Field::Kind::number, "loudness"},
+                                             {"peak", Field::Kind::number, "truepeak"},
+                                             {"brightness", Field::Kind::number, "brightness"},
+                                             {"warmth", Field::Kind::number, "warmth"},
+                                             {"hardness", Field::Kind::number, "hardness"},
+                                             {"roughness", Field::Kind::number, "roughness"},
+                                             {"noisiness", Field::Kind::number, "noisiness"},
+                                             {"height", Field::Kind::number, "height"},
+                                             {"width", Field::Kind::number, "width"},
+                                             {"complexity", Field::Kind::number, "complexity"}});
 
 /// The categories whose name is the word or its plural; if there are none, those whose name begins with it.
 std::vector<std::string> categoriesNamed(const std::string& bare, const Vocabulary& vocabulary) {
@@ -58,6 +71,31 @@ std::vector<std::string> categoriesNamed(const std::string& bare, const Vocabula
 constexpr std::array<std::string_view, 12> kKeyTags = {
     QVTagCKey,      QVTagCSharpKey, QVTagDKey,      QVTagDSharpKey, QVTagEKey,      QVTagFKey,
     QVTagFSharpKey, QVTagGKey,      QVTagGSharpKey, QVTagAKey,      QVTagASharpKey, QVTagBKey};
+
+/// A note of any octave, and what stands behind it.
+struct Pitch {
+    int step;  // semitones above C: -1 to 12
+    std::string rest;
+};
+
+std::optional<Pitch> pitchAtBeginning(std::string_view text) {
+    constexpr std::array<int, 7> steps = {9, 11, 0, 2, 4, 5, 7};  // A to G
+    if (text.empty()) return std::nullopt;
+    const char letter = static_cast<char>(text[0] & ~0x20);
+    if (letter < 'A' || letter > 'G') return std::nullopt;
+    Pitch pitch{steps[static_cast<std::size_t>(letter - 'A')], folded(trimBlanks(text.substr(1)))};
+    const auto skip = [&pitch](std::string_view beginning) {
+        if (!pitch.rest.starts_with(beginning)) return false;
+        pitch.rest.erase(0, beginning.size());
+        return true;
+    };
+    if (skip("#") || skip("sharp") || skip("\xe2\x99\xaf")) {
+        ++pitch.step;
+    } else if (skip("b") || skip("flat") || skip("\xe2\x99\xad")) {
+        --pitch.step;
+    }
+    return pitch;
+}
 
 }  // namespace
 
@@ -82,24 +120,11 @@ std::optional<Field> fieldNamed(std::string_view word, const Vocabulary& vocabul
 }
 
 std::vector<std::string> keyLabels(std::string_view text) {
-    constexpr std::array<int, 7> steps = {9, 11, 0, 2, 4, 5, 7};  // A to G
-    if (text.empty()) return {};
-    const char letter = static_cast<char>(text[0] & ~0x20);
-    if (letter < 'A' || letter > 'G') return {};
-    int step = steps[static_cast<std::size_t>(letter - 'A')];
-    std::string rest = folded(trimBlanks(text.substr(1)));
-    const auto skip = [&rest](std::string_view beginning) {
-        if (!rest.starts_with(beginning)) return false;
-        rest.erase(0, beginning.size());
-        return true;
-    };
-    if (skip("#") || skip("sharp") || skip("\xe2\x99\xaf")) {
-        step = (step + 1) % 12;
-    } else if (skip("b") || skip("flat") || skip("\xe2\x99\xad")) {
-        step = (step + 11) % 12;
-    }
-    rest = bareName(rest);
-    std::vector<std::string> labels = {std::string(kKeyTags[static_cast<std::size_t>(step)])};
+    const auto pitch = pitchAtBeginning(text);
+    if (!pitch) return {};
+    std::vector<std::string> labels = {
+        std::string(kKeyTags[static_cast<std::size_t>(pitch->step + 12) % kKeyTags.size()])};
+    const std::string rest = bareName(pitch->rest);
     if (rest == "m" || rest == "min" || rest == "minor") {
         labels.emplace_back(QVTagMinorKeyType);
     } else if (rest == "maj" || rest == "major") {
@@ -108,6 +133,20 @@ std::vector<std::string> keyLabels(std::string_view text) {
         return {};
     }
     return labels;
+}
+
+std::optional<double> noteNamed(std::string_view text) {
+    const auto pitch = pitchAtBeginning(text);
+    if (!pitch) return std::nullopt;
+    int octave = 0;
+    const char* const last = pitch->rest.data() + pitch->rest.size();
+    const auto [stop, fault] = std::from_chars(pitch->rest.data(), last, octave);
+    if (fault != std::errc() || stop != last || octave < -1 || octave > 9) return std::nullopt;
+    return pitch->step + 12 * (octave + 1);
+}
+
+bool isOfNotes(std::string_view field) {
+    return field == "note" || field == "midirootnote";
 }
 
 std::set<std::string> keyTerms() {

@@ -16,6 +16,10 @@ std::optional<Field> fieldNamed(std::string_view word, const Vocabulary& vocabul
 /// The labels of the tags that stand for a musical key, such as "A", "C#", "Bbm" or "A minor"; empty when the
 /// text is no key.
 std::vector<std::string> keyLabels(std::string_view text);
+/// The MIDI note that a text such as "A2" or "Eb-1" names; "C4" is 60.
+std::optional<double> noteNamed(std::string_view text);
+/// Whether the numbers of the field are notes.
+bool isOfNotes(std::string_view field);
 /// The terms of the tags that are keys.
 std::set<std::string> keyTerms();
 /// The file type that a word names.

@@ -242,9 +242,14 @@ class Parser {
         return {ExpressionMatch{field, std::make_shared<RegularExpression>(std::move(*compiled))}};
     }
 
-    /// "120", "118..124", "..90", "140..", ">0.6", "<=4".
+    /// "120", "118..124", "..90", "140..", ">0.6", "<=4"; "A2..C3" of notes.
     Condition number(std::string field, std::size_t start, bool mayBeMissing = false) {
         NumberMatch match{std::move(field), -kInfinity, kInfinity, true, true};
+        const auto bound = [&](const Piece& range, std::size_t from, std::size_t to) {
+            const auto note =
+                isOfNotes(match.field) ? noteNamed(range.text.substr(from, to - from)) : std::nullopt;
+            return note ? *note : parsed(range, from, to);
+        };
         if (mayBeMissing) return {match};
         const bool isAbove = accept(">");
         const bool isBelow = !isAbove && accept("<");
@@ -252,13 +257,13 @@ class Parser {
         const Piece range = text(start, "");
         const std::size_t dots = range.text.find("..");
         if (isAbove || isBelow) {
-            (isAbove ? match.low : match.high) = parsed(range, 0, range.text.size());
+            (isAbove ? match.low : match.high) = bound(range, 0, range.text.size());
             (isAbove ? match.includesLow : match.includesHigh) = isEqual;
         } else if (dots == std::string::npos) {
-            match.low = match.high = parsed(range, 0, range.text.size());
+            match.low = match.high = bound(range, 0, range.text.size());
         } else {
-            if (dots > 0) match.low = parsed(range, 0, dots);
-            if (dots + 2 < range.text.size()) match.high = parsed(range, dots + 2, range.text.size());
+            if (dots > 0) match.low = bound(range, 0, dots);
+            if (dots + 2 < range.text.size()) match.high = bound(range, dots + 2, range.text.size());
             if (range.text.size() == 2)
                 fail(range.start, range.end, "a range needs a number on one side at least");
         }

@@ -334,6 +334,16 @@ TEST_F(Tagging, OfNamesAloneNeedsNoFile) {
     EXPECT_THAT(heldOf(report.resolution), IsSupersetOf({"Bass", "E", "Minor KeyType"}));
 }
 
+TEST_F(Tagging, OfWhatOnlyDescribesAnInstrumentHoldsTheInstrument) {
+    for (const std::string name : {"Dog Bass 2", "Bass Motorcycle", "ThunderBass"}) {
+        const Labels held =
+            heldOf(tagger_.reportOfNames(ItemNames("/none/" + name + ".wav", "/none"), SoundKind::oneShot)
+                       .resolution);
+        EXPECT_THAT(held, testing::Contains("Bass")) << name;
+        EXPECT_THAT(held, testing::Not(testing::Contains("Sound Effects"))) << name;
+    }
+}
+
 TEST_F(Tagging, KnowsWhatGeneralMidiAndItsVariantsCallTheirSounds) {
     const std::pair<const char*, std::string_view> rows[] = {
         {"Piano", "Acoustic Grand Piano, Bright Acoustic Piano, Honky-tonk Piano, HnkyTonk"},

@@ -93,6 +93,8 @@ TEST(Names, AreReadAsPeopleWriteThem) {
         {"METLImpt Kick", {"Kick"}},
         {"metlimpt_Kick", {"Kick"}},
         {"Kick_METLImpt_Snare", {"Kick", "Snare"}},
+        {"dog bark 02", {"Sound Effects"}},
+        {"Rainfall On Roof", {"Nature"}},
     };
     for (const auto& [name, labels] : rows) EXPECT_EQ(labelsOf(readingOf(name)), labels) << name;
 }

@@ -24,6 +24,9 @@ TEST(QueryParser, PointsAtWhatIsWrong) {
         {"kick bpm:140..90", 9, 7, "140 is more than 90"},
         {"bpm:fast", 4, 4, "\"fast\" is no number"},
         {"bpm:118..1x", 9, 2, "\"1x\" is no number"},
+        {"note:H2", 5, 2, "\"H2\" is no number"},
+        {"note:C12", 5, 3, "\"C12\" is no number"},
+        {"bpm:A2", 4, 2, "\"A2\" is no number"},
         {"bpm:1e999", 4, 5, "is no number"},
         {"bpm:nan", 4, 3, "is no number"},
         {"bpm:..", 4, 2, "a number on one side"},
@@ -56,7 +59,7 @@ IndexedItem item() {
                        {"Warm", "Sound Descriptors", {}, 0.6F, Provenance::automatic, "keywords"},
                        {"ASharp", "Loop Specifics", {"Key"}, {}, Provenance::virtualTag, {}},
                        {"Minor KeyType", "Loop Specifics", {"Key Type"}, {}, Provenance::virtualTag, {}}};
-    result.values = {{"Tempo", 120.0}, {"BeatCount", 16.0}, {"Gain", -6.0}};
+    result.values = {{"Tempo", 120.0}, {"BeatCount", 16.0}, {"Gain", -6.0}, {"Note", 59.0}};
     result.packs = {"Dust & Grain"};
     for (int i = 0; i < 40; ++i) result.title += "\xef\xac\x83";  // "ffi" in one character
     result.title += " - Take";
@@ -105,6 +108,9 @@ TEST(QueryParser, UnderstandsWhatPeopleWrite) {
         {"bpm>120", false},
         {"bpm:121..", false},
         {"beats:16 gain:-6 gain<-5", true},
+        {"note:B3 note:cb4 note:59 note:A#3..C4 note>Bb3", true},
+        {"note:B4,Bb3,C-1", false},
+        {"root:C3..", false},
         {"key:Bb key:A# key:A#m key:\"b flat minor\"", true},
         {"key:A#maj", false},
         {"type:Loop type:LOOP", true},

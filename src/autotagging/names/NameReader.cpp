@@ -54,6 +54,8 @@ double NameReader::confidenceOf(NameStrength strength) const {
             return weights_.abbreviation;
         case NameStrength::likeness:
             return weights_.likeness;
+        case NameStrength::figure:
+            return weights_.figure;
         case NameStrength::hint:
             return weights_.hint;
     }

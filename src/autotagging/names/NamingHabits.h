@@ -22,7 +22,7 @@ class TGRTTaxonomy;
 struct NamePiece;
 
 /// How plainly a word says what it says.
-enum class NameStrength : std::uint8_t { word, abbreviation, likeness, hint };
+enum class NameStrength : std::uint8_t { word, abbreviation, likeness, figure, hint };
 
 /// A tag that a word or phrase of a name stands for.
 struct NamedMeaning {

@@ -17,8 +17,11 @@ namespace {
 
 using Dictionary = PropertyList::Dictionary;
 
-constexpr std::array<std::pair<std::string_view, NameStrength>, 3> kStrengths = {
-    {{"words", NameStrength::word}, {"short", NameStrength::abbreviation}, {"hints", NameStrength::hint}}};
+constexpr std::array<std::pair<std::string_view, NameStrength>, 4> kStrengths = {
+    {{"words", NameStrength::word},
+     {"short", NameStrength::abbreviation},
+     {"figures", NameStrength::figure},
+     {"hints", NameStrength::hint}}};
 
 /// A word that may mean more says nothing.
 constexpr std::size_t kMostHints = 8;
