@@ -1,7 +1,7 @@
 #include "CommandLine.h"
 
 #include "output/StandardStreams.h"
-#include "platform/base/Printable.h"
+#include "platform/base/bytes/Printable.h"
 #include "platform/text/Spelling.h"
 
 #include <algorithm>

@@ -1,8 +1,8 @@
 #include "contentdb/index/WorkerMessages.h"
 
 #include "contentdb/store/ItemCodec.h"
-#include "platform/base/ByteOrder.h"
 #include "platform/base/Version.h"
+#include "platform/base/bytes/ByteOrder.h"
 
 #include <fmt/format.h>
 

@@ -1,7 +1,7 @@
 #include "contentdb/terms/Terms.h"
 
 #include "contentdb/terms/Words.h"
-#include "platform/base/ByteOrder.h"
+#include "platform/base/bytes/ByteOrder.h"
 
 #include <algorithm>
 #include <bit>

@@ -7,7 +7,7 @@
 #include "autotagging/services/QVCTAutoTaggingService.h"
 #include "media/loopfile/LCFileData.h"
 #include "metadata/TGRTMetaData.h"
-#include "platform/base/Printable.h"
+#include "platform/base/bytes/Printable.h"
 #include "taxonomy/TaggingTypes.h"
 
 #include <algorithm>

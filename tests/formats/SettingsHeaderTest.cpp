@@ -1,7 +1,7 @@
 #include "FormatsSupport.h"
 #include "formats/settings/CFBinaryPlistFindTrailer.h"
 #include "formats/settings/TGRTSettingsHeaderReader.h"
-#include "platform/files/SwapData.h"
+#include "platform/base/bytes/SwapData.h"
 #include "support/AudioFixtures.h"
 
 #include <algorithm>

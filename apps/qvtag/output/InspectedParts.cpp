@@ -10,7 +10,7 @@
 #include "media/loopfile/LCFileParser.h"
 #include "media/midi/MidiSequence.h"
 #include "output/PropertyListOutput.h"
-#include "platform/base/ByteOrder.h"
+#include "platform/base/bytes/ByteOrder.h"
 #include "platform/data/PropertyListFile.h"
 #include "platform/files/FileAccess.h"
 #include "platform/files/RandomAccessReader.h"

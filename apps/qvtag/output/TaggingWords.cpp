@@ -1,6 +1,6 @@
 #include "output/TaggingWords.h"
 
-#include "platform/base/Printable.h"
+#include "platform/base/bytes/Printable.h"
 #include "taxonomy/TaggingTypes.h"
 
 #include <algorithm>

@@ -1,6 +1,6 @@
 #include "autotagging/names/NamePieces.h"
 
-#include "platform/base/Utf8.h"
+#include "platform/base/bytes/Utf8.h"
 #include "platform/text/Text.h"
 
 #include <unicode/uchar.h>

@@ -5,7 +5,7 @@
 #include "formats/audiofile/TGRTTavioLoopMetaDataReader.h"
 #include "formats/preset/TGRTVorthalLegacyTaggingParser.h"
 #include "media/loopfile/LCFileData.h"
-#include "platform/base/BytesAsText.h"
+#include "platform/base/bytes/BytesAsText.h"
 #include "platform/files/FileAccess.h"
 #include "taxonomy/TaggingTypes.h"
 

@@ -3,7 +3,7 @@
 #include "formats/ItemFile.h"
 #include "formats/preset/PresetRecord.h"
 #include "formats/preset/TGRTVorthalLegacyTaggingParser.h"
-#include "platform/base/BytesAsText.h"
+#include "platform/base/bytes/BytesAsText.h"
 
 #include <array>
 

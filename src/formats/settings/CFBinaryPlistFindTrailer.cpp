@@ -1,6 +1,6 @@
 #include "formats/settings/CFBinaryPlistFindTrailer.h"
 
-#include "platform/base/ByteOrder.h"
+#include "platform/base/bytes/ByteOrder.h"
 
 #include <algorithm>
 #include <array>

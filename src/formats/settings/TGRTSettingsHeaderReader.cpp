@@ -1,8 +1,8 @@
 #include "formats/settings/TGRTSettingsHeaderReader.h"
 
-#include "platform/base/ByteOrder.h"
+#include "platform/base/bytes/ByteOrder.h"
+#include "platform/base/bytes/SwapData.h"
 #include "platform/files/RandomAccessReader.h"
-#include "platform/files/SwapData.h"
 
 #include <algorithm>
 #include <array>

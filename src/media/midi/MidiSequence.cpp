@@ -1,7 +1,7 @@
 #include "media/midi/MidiSequence.h"
 
 #include "media/midi/MidiTrackReader.h"
-#include "platform/base/ByteOrder.h"
+#include "platform/base/bytes/ByteOrder.h"
 #include "platform/files/FileAccess.h"
 #include "platform/text/Text.h"
 

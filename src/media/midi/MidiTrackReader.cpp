@@ -1,6 +1,6 @@
 #include "media/midi/MidiTrackReader.h"
 
-#include "platform/base/ByteOrder.h"
+#include "platform/base/bytes/ByteOrder.h"
 
 #include <utility>
 

@@ -1,6 +1,6 @@
 #include "platform/base/Error.h"
 
-#include "platform/base/Printable.h"
+#include "platform/base/bytes/Printable.h"
 
 #include <utility>
 

@@ -1,6 +1,6 @@
 #include "platform/data/PropertyListEncoding.h"
 
-#include "platform/base/BytesAsText.h"
+#include "platform/base/bytes/BytesAsText.h"
 #include "platform/text/Text.h"
 
 #include <algorithm>

@@ -1,6 +1,6 @@
 #include "platform/data/PropertyListFile.h"
 
-#include "platform/base/ByteOrder.h"
+#include "platform/base/bytes/ByteOrder.h"
 #include "platform/data/OldStylePropertyList.h"
 #include "platform/data/PropertyListBuilder.h"
 #include "platform/data/PropertyListEncoding.h"

@@ -1,6 +1,6 @@
 #include "platform/data/PropertyListGuard.h"
 
-#include "platform/base/ByteOrder.h"
+#include "platform/base/bytes/ByteOrder.h"
 #include "platform/data/PropertyListFile.h"
 #include "platform/text/Text.h"
 

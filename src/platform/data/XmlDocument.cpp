@@ -1,6 +1,6 @@
 #include "platform/data/XmlDocument.h"
 
-#include "platform/base/BytesAsText.h"
+#include "platform/base/bytes/BytesAsText.h"
 #include "platform/data/XmlParsing.h"
 #include "platform/files/Decompression.h"
 #include "platform/files/FileAccess.h"

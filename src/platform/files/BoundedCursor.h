@@ -1,6 +1,6 @@
 #pragma once
 
-#include "platform/base/ByteOrder.h"
+#include "platform/base/bytes/ByteOrder.h"
 #include "platform/files/RandomAccessReader.h"
 
 #include <algorithm>

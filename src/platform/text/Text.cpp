@@ -1,6 +1,6 @@
 #include "platform/text/Text.h"
 
-#include "platform/base/Utf8.h"
+#include "platform/base/bytes/Utf8.h"
 
 #include <algorithm>
 #include <charconv>

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "platform/base/Printable.h"
+#include "platform/base/bytes/Printable.h"
 
 #include <cstddef>
 #include <cstdint>

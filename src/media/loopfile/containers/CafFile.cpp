@@ -1,7 +1,7 @@
 #include "media/loopfile/containers/CafFile.h"
 
 #include "media/loopfile/containers/CafMusic.h"
-#include "platform/base/ByteOrder.h"
+#include "platform/base/bytes/ByteOrder.h"
 
 #include <algorithm>
 

@@ -4,7 +4,7 @@
 #include "media/loopfile/containers/CafFile.h"
 #include "media/loopfile/containers/LoopDataFile.h"
 #include "media/loopfile/containers/WavFile.h"
-#include "platform/base/ByteOrder.h"
+#include "platform/base/bytes/ByteOrder.h"
 #include "platform/text/Text.h"
 
 #include <algorithm>

@@ -1,7 +1,7 @@
 #include "media/loopfile/containers/WavFile.h"
 
 #include "media/loopfile/containers/WavMusic.h"
-#include "platform/base/ByteOrder.h"
+#include "platform/base/bytes/ByteOrder.h"
 
 #include <fmt/format.h>
 

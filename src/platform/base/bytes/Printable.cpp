@@ -1,6 +1,6 @@
-#include "platform/base/Printable.h"
+#include "platform/base/bytes/Printable.h"
 
-#include "platform/base/Utf8.h"
+#include "platform/base/bytes/Utf8.h"
 
 #include <cstdint>
 

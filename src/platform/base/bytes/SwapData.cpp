@@ -1,4 +1,4 @@
-#include "platform/files/SwapData.h"
+#include "platform/base/bytes/SwapData.h"
 
 #include <algorithm>
 
