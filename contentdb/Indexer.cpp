@@ -11,7 +11,7 @@
 #include "contentdb/store/Schema.h"
 #include "contentdb/store/StoreCheck.h"
 #include "platform/files/FileAccess.h"
-#include "platform/files/FileReplacement.h"
+#include "platform/files/replacement/FileReplacement.h"
 #include "platform/processes/ProcessArguments.h"
 #include "platform/text/Text.h"
 #include "platform/text/Url.h"

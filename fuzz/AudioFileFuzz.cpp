@@ -2,7 +2,7 @@
 // choose.
 #include "listening/onsets/OnsetDetector.h"
 #include "media/audio/AudioDecoder.h"
-#include "platform/files/RandomAccessReader.h"
+#include "platform/files/reading/RandomAccessReader.h"
 
 #include <memory>
 #include <span>

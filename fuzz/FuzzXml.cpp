@@ -4,7 +4,7 @@
 #include "autotagging/xml/QVCTXMLDocument.h"
 #include "autotagging/xml/QVCTXMLParser.h"
 #include "platform/base/Log.h"
-#include "platform/files/Decompression.h"
+#include "platform/files/reading/Decompression.h"
 #include "platform/text/Text.h"
 
 using namespace qvct;

@@ -2,7 +2,7 @@
 #include "commands/Commands.h"
 #include "output/StandardStreams.h"
 #include "platform/base/Version.h"
-#include "platform/files/UnfinishedFile.h"
+#include "platform/files/replacement/UnfinishedFile.h"
 #include "platform/processes/HardLimit.h"
 
 #include <algorithm>

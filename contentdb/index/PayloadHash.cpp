@@ -9,7 +9,7 @@
 #include "platform/base/bytes/BytesAsText.h"
 #include "platform/files/FolderListing.h"
 #include "platform/files/Paths.h"
-#include "platform/files/RandomAccessReader.h"
+#include "platform/files/reading/RandomAccessReader.h"
 #include "taxonomy/TaggingTypes.h"
 
 #include <array>

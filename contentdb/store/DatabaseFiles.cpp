@@ -3,7 +3,7 @@
 #include "contentdb/store/Sqlite.h"
 #include "platform/files/EmptyFile.h"
 #include "platform/files/FileAccess.h"
-#include "platform/files/FileReplacement.h"
+#include "platform/files/replacement/FileReplacement.h"
 
 #include <filesystem>
 #include <fstream>

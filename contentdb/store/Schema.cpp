@@ -3,7 +3,7 @@
 #include "contentdb/store/ChecksumVfs.h"
 #include "contentdb/store/DatabaseFiles.h"
 #include "platform/files/FileAccess.h"
-#include "platform/files/FileReplacement.h"
+#include "platform/files/replacement/FileReplacement.h"
 
 #include <array>
 #include <cstdint>

@@ -1,7 +1,7 @@
 #include "formats/ItemFile.h"
 
 #include "media/loopfile/LCFileParser.h"
-#include "platform/files/RandomAccessReader.h"
+#include "platform/files/reading/RandomAccessReader.h"
 
 namespace qvct {
 

@@ -4,7 +4,7 @@
 #include "platform/data/PropertyListFile.h"
 #include "platform/files/EditLock.h"
 #include "platform/files/FileAccess.h"
-#include "platform/files/FileReplacement.h"
+#include "platform/files/replacement/FileReplacement.h"
 #include "taxonomy/TaggingTypes.h"
 
 #include <utility>

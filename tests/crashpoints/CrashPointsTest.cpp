@@ -8,7 +8,7 @@
 #include "media/loopfile/LCFileWriter.h"
 #include "media/loopfile/LCFingerprint.h"
 #include "platform/files/EditLock.h"
-#include "platform/files/UnfinishedFile.h"
+#include "platform/files/replacement/UnfinishedFile.h"
 #include "support/AudioFixtures.h"
 #include "support/RunTool.h"
 

@@ -1,7 +1,7 @@
 #include "listening/onsets/OnsetDetector.h"
 #include "media/audio/AudioDecoder.h"
 #include "platform/files/FileAccess.h"
-#include "platform/files/RandomAccessReader.h"
+#include "platform/files/reading/RandomAccessReader.h"
 #include "support/AudioFixtures.h"
 #include "support/Corpus.h"
 #include "support/TemporaryFolder.h"

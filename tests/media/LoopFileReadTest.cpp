@@ -1,6 +1,6 @@
 #include "media/loopfile/LCFileParser.h"
 #include "platform/data/PropertyListFile.h"
-#include "platform/files/RandomAccessReader.h"
+#include "platform/files/reading/RandomAccessReader.h"
 #include "support/AudioFixtures.h"
 #include "taxonomy/TaggingTypes.h"
 

@@ -1,4 +1,4 @@
-#include "platform/files/Decompression.h"
+#include "platform/files/reading/Decompression.h"
 
 #include <string>
 

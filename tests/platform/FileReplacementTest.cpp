@@ -1,6 +1,6 @@
 #include "platform/files/FileAccess.h"
-#include "platform/files/FileReplacement.h"
-#include "platform/files/UnfinishedFile.h"
+#include "platform/files/replacement/FileReplacement.h"
+#include "platform/files/replacement/UnfinishedFile.h"
 #include "support/AudioFixtures.h"
 #include "support/Corpus.h"
 #include "support/TemporaryFolder.h"

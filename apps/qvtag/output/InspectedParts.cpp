@@ -13,7 +13,7 @@
 #include "platform/base/bytes/ByteOrder.h"
 #include "platform/data/PropertyListFile.h"
 #include "platform/files/FileAccess.h"
-#include "platform/files/RandomAccessReader.h"
+#include "platform/files/reading/RandomAccessReader.h"
 #include "platform/text/Text.h"
 
 #include <array>

@@ -7,8 +7,8 @@
 #include "platform/base/bytes/BytesAsText.h"
 #include "platform/data/Json.h"
 #include "platform/data/XmlParsing.h"
-#include "platform/files/Decompression.h"
 #include "platform/files/FileAccess.h"
+#include "platform/files/reading/Decompression.h"
 
 #include <unordered_map>
 #include <utility>

@@ -2,7 +2,7 @@
 
 #include "platform/base/bytes/ByteOrder.h"
 #include "platform/base/bytes/SwapData.h"
-#include "platform/files/RandomAccessReader.h"
+#include "platform/files/reading/RandomAccessReader.h"
 
 #include <algorithm>
 #include <array>

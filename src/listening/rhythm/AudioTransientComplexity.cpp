@@ -4,7 +4,7 @@
 #include "listening/rhythm/QVCTMidiAnalysis.h"
 #include "media/audio/AudioDecoder.h"
 #include "media/loopfile/LCFileParser.h"
-#include "platform/files/RandomAccessReader.h"
+#include "platform/files/reading/RandomAccessReader.h"
 
 #include <string>
 #include <vector>

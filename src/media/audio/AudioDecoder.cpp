@@ -1,6 +1,6 @@
 #include "media/audio/AudioDecoder.h"
 
-#include "platform/files/RandomAccessReader.h"
+#include "platform/files/reading/RandomAccessReader.h"
 
 #include <algorithm>
 #include <cstdio>

@@ -6,7 +6,7 @@
 #include "platform/data/PropertyListFile.h"
 #include "platform/files/EditLock.h"
 #include "platform/files/EntryStatus.h"
-#include "platform/files/FileReplacement.h"
+#include "platform/files/replacement/FileReplacement.h"
 #include "platform/text/Text.h"
 
 #include <fmt/format.h>

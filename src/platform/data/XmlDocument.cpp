@@ -2,8 +2,8 @@
 
 #include "platform/base/bytes/BytesAsText.h"
 #include "platform/data/XmlParsing.h"
-#include "platform/files/Decompression.h"
 #include "platform/files/FileAccess.h"
+#include "platform/files/reading/Decompression.h"
 
 #include <libxml/tree.h>
 #include <libxml/xpath.h>

@@ -1,8 +1,8 @@
 #include "platform/files/FileAccess.h"
 
 #include "platform/files/FileDescriptor.h"
-#include "platform/files/FileReplacement.h"
-#include "platform/files/RandomAccessReader.h"
+#include "platform/files/reading/RandomAccessReader.h"
+#include "platform/files/replacement/FileReplacement.h"
 #include "platform/text/Text.h"
 #include "platform/text/Url.h"
 

@@ -2,8 +2,8 @@
 
 #include "media/loopfile/LCFileData.h"
 #include "platform/base/Error.h"
-#include "platform/files/BoundedCursor.h"
-#include "platform/files/FileReplacement.h"
+#include "platform/files/reading/BoundedCursor.h"
+#include "platform/files/replacement/FileReplacement.h"
 
 #include <cstdint>
 #include <memory>

@@ -1,4 +1,4 @@
-#include "platform/files/BoundedCursor.h"
+#include "platform/files/reading/BoundedCursor.h"
 
 #include <cstring>
 

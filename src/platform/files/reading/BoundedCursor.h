@@ -1,7 +1,7 @@
 #pragma once
 
 #include "platform/base/bytes/ByteOrder.h"
-#include "platform/files/RandomAccessReader.h"
+#include "platform/files/reading/RandomAccessReader.h"
 
 #include <algorithm>
 #include <array>

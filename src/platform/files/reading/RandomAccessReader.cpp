@@ -1,4 +1,4 @@
-#include "platform/files/RandomAccessReader.h"
+#include "platform/files/reading/RandomAccessReader.h"
 
 #include "platform/files/FileAccess.h"
 

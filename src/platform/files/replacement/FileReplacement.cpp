@@ -1,8 +1,8 @@
-#include "platform/files/FileReplacement.h"
+#include "platform/files/replacement/FileReplacement.h"
 
-#include "platform/files/FileCopy.h"
 #include "platform/files/FileDescriptor.h"
-#include "platform/files/UnfinishedFile.h"
+#include "platform/files/replacement/FileCopy.h"
+#include "platform/files/replacement/UnfinishedFile.h"
 #include "platform/text/Text.h"
 #include "platform/text/Url.h"
 

@@ -1,4 +1,4 @@
-#include "platform/files/UnfinishedFile.h"
+#include "platform/files/replacement/UnfinishedFile.h"
 
 #include <algorithm>
 #include <array>

@@ -2,7 +2,7 @@
 
 #include "platform/base/Error.h"
 #include "platform/files/FileDescriptor.h"
-#include "platform/files/FileReplacement.h"
+#include "platform/files/replacement/FileReplacement.h"
 
 #include <cstdint>
 #include <memory>

@@ -1,4 +1,4 @@
-#include "platform/files/FileCopy.h"
+#include "platform/files/replacement/FileCopy.h"
 
 #include <algorithm>
 #include <cerrno>
