@@ -2,7 +2,7 @@
 
 #include "SoundReading.h"
 #include "platform/data/PropertyListFile.h"
-#include "platform/data/PropertyListPlace.h"
+#include "platform/data/propertylist/PropertyListPlace.h"
 #include "platform/text/Text.h"
 #include "taxonomy/TGRTTaxonomy.h"
 

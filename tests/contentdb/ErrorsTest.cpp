@@ -4,8 +4,8 @@
 #include "media/loopfile/LCFileParser.h"
 #include "media/loopfile/LCFileWriter.h"
 #include "platform/data/PropertyListFile.h"
-#include "platform/data/XmlDocument.h"
-#include "platform/data/XmlParsing.h"
+#include "platform/data/xml/XmlDocument.h"
+#include "platform/data/xml/XmlParsing.h"
 #include "platform/files/FileAccess.h"
 #include "support/AudioFixtures.h"
 

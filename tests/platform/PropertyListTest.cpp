@@ -1,7 +1,7 @@
 #include "platform/data/Json.h"
 #include "platform/data/PropertyList.h"
 #include "platform/data/PropertyListFile.h"
-#include "platform/data/PropertyListPlace.h"
+#include "platform/data/propertylist/PropertyListPlace.h"
 #include "support/AudioFixtures.h"
 #include "support/ProcessorClock.h"
 #include "support/TemporaryFolder.h"

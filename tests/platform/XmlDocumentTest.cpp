@@ -1,4 +1,4 @@
-#include "platform/data/XmlDocument.h"
+#include "platform/data/xml/XmlDocument.h"
 #include "support/TemporaryFolder.h"
 
 #include <gtest/gtest.h>

@@ -1,7 +1,7 @@
 #include "autotagging/evidence/EvidenceWeights.h"
 
 #include "platform/data/PropertyListFile.h"
-#include "platform/data/PropertyListPlace.h"
+#include "platform/data/propertylist/PropertyListPlace.h"
 #include "resources/QVCTCompiledResources.h"
 
 #include <algorithm>

@@ -3,7 +3,7 @@
 #include "autotagging/names/NearWords.h"
 #include "platform/base/Error.h"
 #include "platform/data/PropertyList.h"
-#include "platform/data/PropertyListPlace.h"
+#include "platform/data/propertylist/PropertyListPlace.h"
 #include "resources/ReplacementFile.h"
 
 #include <cstdint>

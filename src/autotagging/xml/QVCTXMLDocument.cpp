@@ -6,7 +6,7 @@
 #include "platform/base/Log.h"
 #include "platform/base/bytes/BytesAsText.h"
 #include "platform/data/Json.h"
-#include "platform/data/XmlParsing.h"
+#include "platform/data/xml/XmlParsing.h"
 #include "platform/files/FileAccess.h"
 #include "platform/files/reading/Decompression.h"
 

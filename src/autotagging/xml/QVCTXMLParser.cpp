@@ -1,6 +1,6 @@
 #include "autotagging/xml/QVCTXMLParser.h"
 
-#include "platform/data/XmlParsing.h"
+#include "platform/data/xml/XmlParsing.h"
 #include "platform/text/Text.h"
 
 #include <algorithm>

@@ -2,7 +2,7 @@
 
 #include "platform/base/Error.h"
 #include "platform/data/PropertyList.h"
-#include "platform/data/XmlLibrary.h"
+#include "platform/data/xml/XmlLibrary.h"
 
 #include <optional>
 #include <string>

@@ -1,6 +1,6 @@
 #include "autotagging/xml/QVSKXMLNode.h"
 
-#include "platform/data/XmlLibrary.h"
+#include "platform/data/xml/XmlLibrary.h"
 
 #include <libxml/tree.h>
 

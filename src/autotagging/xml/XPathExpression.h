@@ -4,7 +4,7 @@
 #include "autotagging/xml/XPathCost.h"
 #include "autotagging/xml/XmlExtent.h"
 #include "platform/base/Error.h"
-#include "platform/data/XmlLibrary.h"
+#include "platform/data/xml/XmlLibrary.h"
 
 #include <memory>
 #include <optional>

@@ -1,6 +1,6 @@
 #include "autotagging/xml/XPathFunctions.h"
 
-#include "platform/data/XmlLibrary.h"
+#include "platform/data/xml/XmlLibrary.h"
 
 #include <cstring>
 #include <memory>

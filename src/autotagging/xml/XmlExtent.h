@@ -1,6 +1,6 @@
 #pragma once
 
-#include "platform/data/XmlLibrary.h"
+#include "platform/data/xml/XmlLibrary.h"
 
 #include <cstddef>
 

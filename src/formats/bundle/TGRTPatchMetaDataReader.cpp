@@ -3,7 +3,7 @@
 #include "formats/QVContentEditorFileUtilities.h"
 #include "formats/bundle/BundleRecord.h"
 #include "platform/base/Log.h"
-#include "platform/data/XmlDocument.h"
+#include "platform/data/xml/XmlDocument.h"
 
 #include <array>
 

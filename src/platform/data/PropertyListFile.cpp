@@ -1,12 +1,12 @@
 #include "platform/data/PropertyListFile.h"
 
 #include "platform/base/bytes/ByteOrder.h"
-#include "platform/data/OldStylePropertyList.h"
-#include "platform/data/PropertyListBuilder.h"
-#include "platform/data/PropertyListEncoding.h"
-#include "platform/data/PropertyListGuard.h"
-#include "platform/data/XmlPropertyListReader.h"
-#include "platform/data/XmlPropertyListWriter.h"
+#include "platform/data/propertylist/OldStylePropertyList.h"
+#include "platform/data/propertylist/PropertyListBuilder.h"
+#include "platform/data/propertylist/PropertyListEncoding.h"
+#include "platform/data/propertylist/PropertyListGuard.h"
+#include "platform/data/propertylist/XmlPropertyListReader.h"
+#include "platform/data/propertylist/XmlPropertyListWriter.h"
 #include "platform/files/FileAccess.h"
 #include "platform/text/Text.h"
 

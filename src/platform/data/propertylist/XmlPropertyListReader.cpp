@@ -1,8 +1,8 @@
-#include "platform/data/XmlPropertyListReader.h"
+#include "platform/data/propertylist/XmlPropertyListReader.h"
 
-#include "platform/data/PropertyListBuilder.h"
 #include "platform/data/PropertyListFile.h"
-#include "platform/data/XmlParsing.h"
+#include "platform/data/propertylist/PropertyListBuilder.h"
+#include "platform/data/xml/XmlParsing.h"
 #include "platform/text/Text.h"
 
 #include <algorithm>

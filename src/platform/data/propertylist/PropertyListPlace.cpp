@@ -1,8 +1,8 @@
-#include "platform/data/PropertyListPlace.h"
+#include "platform/data/propertylist/PropertyListPlace.h"
 
-#include "platform/data/OldStylePropertyList.h"
-#include "platform/data/PropertyListEncoding.h"
-#include "platform/data/XmlPropertyListReader.h"
+#include "platform/data/propertylist/OldStylePropertyList.h"
+#include "platform/data/propertylist/PropertyListEncoding.h"
+#include "platform/data/propertylist/XmlPropertyListReader.h"
 #include "platform/files/FileAccess.h"
 #include "platform/text/Text.h"
 

@@ -1,8 +1,8 @@
 #pragma once
 
 #include "platform/data/PropertyList.h"
-#include "platform/data/PropertyListGuard.h"
-#include "platform/data/PropertyListPlace.h"
+#include "platform/data/propertylist/PropertyListGuard.h"
+#include "platform/data/propertylist/PropertyListPlace.h"
 
 #include <cstddef>
 #include <optional>

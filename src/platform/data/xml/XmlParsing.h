@@ -1,7 +1,7 @@
 #pragma once
 
 #include "platform/base/Error.h"
-#include "platform/data/XmlLibrary.h"
+#include "platform/data/xml/XmlLibrary.h"
 
 #include <cstddef>
 #include <optional>

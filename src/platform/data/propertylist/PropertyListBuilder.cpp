@@ -1,4 +1,4 @@
-#include "platform/data/PropertyListBuilder.h"
+#include "platform/data/propertylist/PropertyListBuilder.h"
 
 #include <algorithm>
 #include <numeric>

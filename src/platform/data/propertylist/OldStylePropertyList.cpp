@@ -1,7 +1,7 @@
-#include "platform/data/OldStylePropertyList.h"
+#include "platform/data/propertylist/OldStylePropertyList.h"
 
-#include "platform/data/PropertyListBuilder.h"
 #include "platform/data/PropertyListFile.h"
+#include "platform/data/propertylist/PropertyListBuilder.h"
 #include "platform/text/Text.h"
 
 #include <algorithm>

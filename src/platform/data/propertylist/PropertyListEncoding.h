@@ -1,6 +1,6 @@
 #pragma once
 
-#include "platform/data/PropertyListGuard.h"
+#include "platform/data/propertylist/PropertyListGuard.h"
 
 #include <cstddef>
 #include <cstdint>

@@ -1,4 +1,4 @@
-#include "platform/data/XmlParsing.h"
+#include "platform/data/xml/XmlParsing.h"
 
 #include "platform/text/Text.h"
 

@@ -1,6 +1,6 @@
-#include "platform/data/XmlPropertyListWriter.h"
+#include "platform/data/propertylist/XmlPropertyListWriter.h"
 
-#include "platform/data/PropertyListBuilder.h"
+#include "platform/data/propertylist/PropertyListBuilder.h"
 
 #include <algorithm>
 #include <chrono>

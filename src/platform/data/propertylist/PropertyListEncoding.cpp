@@ -1,4 +1,4 @@
-#include "platform/data/PropertyListEncoding.h"
+#include "platform/data/propertylist/PropertyListEncoding.h"
 
 #include "platform/base/bytes/BytesAsText.h"
 #include "platform/text/Text.h"

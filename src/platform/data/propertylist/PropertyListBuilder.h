@@ -1,7 +1,7 @@
 #pragma once
 
 #include "platform/data/PropertyList.h"
-#include "platform/data/PropertyListPlace.h"
+#include "platform/data/propertylist/PropertyListPlace.h"
 
 #include <string>
 #include <string_view>

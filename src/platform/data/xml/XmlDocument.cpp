@@ -1,7 +1,7 @@
-#include "platform/data/XmlDocument.h"
+#include "platform/data/xml/XmlDocument.h"
 
 #include "platform/base/bytes/BytesAsText.h"
-#include "platform/data/XmlParsing.h"
+#include "platform/data/xml/XmlParsing.h"
 #include "platform/files/FileAccess.h"
 #include "platform/files/reading/Decompression.h"
 

@@ -1,4 +1,4 @@
-#include "platform/data/XmlLibrary.h"
+#include "platform/data/xml/XmlLibrary.h"
 
 #include <libxml/parser.h>
 #include <libxml/tree.h>

@@ -1,4 +1,4 @@
-#include "platform/data/PropertyListGuard.h"
+#include "platform/data/propertylist/PropertyListGuard.h"
 
 #include "platform/base/bytes/ByteOrder.h"
 #include "platform/data/PropertyListFile.h"
