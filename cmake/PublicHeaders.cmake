@@ -21,13 +21,13 @@ set(QVCT_PUBLIC_HEADERS
   media/loopfile/RecordKeys.h
   resources/EmbeddedFiles.h
   resources/ReplacementFile.h
-  taxonomy/OptionalLabel.h
-  taxonomy/QVTagIdentifierUtility.h
+  taxonomy/labels/OptionalLabel.h
+  taxonomy/labels/QVTagIdentifierUtility.h
   taxonomy/TaggingSetAdditions.h
   taxonomy/TaggingTypes.h
-  taxonomy/TagNormalization.h
+  taxonomy/labels/TagNormalization.h
   taxonomy/TGRTCategory.h
-  taxonomy/TGRTLegacyTaxonomyMapping.h
+  taxonomy/legacy/TGRTLegacyTaxonomyMapping.h
   taxonomy/TGRTLevel.h
   taxonomy/TGRTTag.h
   taxonomy/TGRTTagging.h

@@ -3,7 +3,7 @@
 #include "SimilarTags.h"
 #include "ToolContext.h"
 #include "platform/text/Text.h"
-#include "taxonomy/TagNormalization.h"
+#include "taxonomy/labels/TagNormalization.h"
 
 #include <algorithm>
 #include <charconv>

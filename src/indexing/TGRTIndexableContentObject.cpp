@@ -2,8 +2,8 @@
 
 #include "formats/QVContentEditorFileUtilities.h"
 #include "formats/TGRTMetaDataReaderFactory.h"
-#include "taxonomy/TGRTLegacyTaxonomyMapping.h"
 #include "taxonomy/TaggingSetAdditions.h"
+#include "taxonomy/legacy/TGRTLegacyTaxonomyMapping.h"
 
 #include <array>
 

@@ -6,9 +6,9 @@
 #include "platform/base/Export.h"
 #include "platform/base/Object.h"
 #include "platform/text/Url.h"
-#include "taxonomy/OptionalLabel.h"
 #include "taxonomy/TGRTTaxonomy.h"
 #include "taxonomy/TaggingTypes.h"
+#include "taxonomy/labels/OptionalLabel.h"
 
 #include <map>
 #include <memory>

@@ -1,7 +1,7 @@
 #include "taxonomy/TGRTCategory.h"
 
-#include "taxonomy/LabelIndex.h"
 #include "taxonomy/TGRTTag.h"
+#include "taxonomy/labels/LabelIndex.h"
 
 #include <algorithm>
 #include <utility>

@@ -5,7 +5,7 @@
 #include "platform/base/ObjectSet.h"
 #include "platform/data/PropertyList.h"
 #include "taxonomy/TGRTLevel.h"
-#include "taxonomy/TagNormalization.h"
+#include "taxonomy/labels/TagNormalization.h"
 
 #include <cstdint>
 #include <memory>

@@ -6,10 +6,10 @@
 #include "resources/LegacyMappingTable.h"
 #include "resources/QVCTCompiledResources.h"
 #include "resources/ReplacementFile.h"
-#include "taxonomy/LabelIndex.h"
 #include "taxonomy/TGRTTagging.h"
 #include "taxonomy/TaggingTypes.h"
 #include "taxonomy/TaxonomyLocalization.h"
+#include "taxonomy/labels/LabelIndex.h"
 
 #include <algorithm>
 #include <array>

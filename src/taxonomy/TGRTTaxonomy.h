@@ -6,9 +6,9 @@
 #include "platform/base/ObjectSet.h"
 #include "platform/data/PropertyList.h"
 #include "platform/text/Url.h"
-#include "taxonomy/OptionalLabel.h"
 #include "taxonomy/TGRTCategory.h"
 #include "taxonomy/TGRTTag.h"
+#include "taxonomy/labels/OptionalLabel.h"
 
 #include <cstddef>
 #include <cstdint>

@@ -3,7 +3,7 @@
 #include "platform/data/UserDefaults.h"
 #include "platform/text/Text.h"
 #include "resources/PackDisplayNames.h"
-#include "taxonomy/QVTagIdentifierUtility.h"
+#include "taxonomy/labels/QVTagIdentifierUtility.h"
 
 #include <algorithm>
 #include <array>

@@ -5,8 +5,8 @@
 #include "resources/PackDisplayNames.h"
 #include "support/CapturedLog.h"
 #include "support/TemporaryFolder.h"
-#include "taxonomy/TGRTLegacyTaxonomyMapping.h"
 #include "taxonomy/TGRTTaxonomy.h"
+#include "taxonomy/legacy/TGRTLegacyTaxonomyMapping.h"
 
 #include <functional>
 

@@ -3,8 +3,8 @@
 #include "resources/QVCTCompiledResources.h"
 #include "support/CapturedLog.h"
 #include "support/TemporaryFolder.h"
-#include "taxonomy/LegacyTagLookup.h"
-#include "taxonomy/TGRTLegacyTaxonomyMapping.h"
+#include "taxonomy/legacy/LegacyTagLookup.h"
+#include "taxonomy/legacy/TGRTLegacyTaxonomyMapping.h"
 
 #include <map>
 #include <set>

@@ -1,4 +1,4 @@
-#include "taxonomy/TagNormalization.h"
+#include "taxonomy/labels/TagNormalization.h"
 
 #include <gtest/gtest.h>
 

@@ -2,8 +2,8 @@
 #include "commands/Commands.h"
 #include "output/StandardStreams.h"
 #include "platform/text/Text.h"
-#include "taxonomy/TGRTLegacyTaxonomyMapping.h"
 #include "taxonomy/TGRTTaxonomySearching.h"
+#include "taxonomy/legacy/TGRTLegacyTaxonomyMapping.h"
 
 #include <algorithm>
 #include <memory>

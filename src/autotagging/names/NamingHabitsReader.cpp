@@ -3,7 +3,7 @@
 #include "autotagging/keywords/QVCTKeywordExtractor.h"
 #include "autotagging/names/NamePieces.h"
 #include "taxonomy/TGRTTaxonomy.h"
-#include "taxonomy/TagNormalization.h"
+#include "taxonomy/labels/TagNormalization.h"
 
 #include <algorithm>
 #include <array>

@@ -1,6 +1,6 @@
 #include "formats/audiofile/TGRTTavioLoopMetaDataReader.h"
 
-#include "taxonomy/TGRTLegacyTaxonomyMapping.h"
+#include "taxonomy/legacy/TGRTLegacyTaxonomyMapping.h"
 
 #include <array>
 #include <utility>

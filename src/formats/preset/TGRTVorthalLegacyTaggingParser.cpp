@@ -4,9 +4,9 @@
 #include "platform/base/Log.h"
 #include "platform/files/FileAccess.h"
 #include "platform/text/Text.h"
-#include "taxonomy/LegacyTagLookup.h"
-#include "taxonomy/TGRTLegacyTaxonomyMapping.h"
 #include "taxonomy/TGRTTaxonomy.h"
+#include "taxonomy/legacy/LegacyTagLookup.h"
+#include "taxonomy/legacy/TGRTLegacyTaxonomyMapping.h"
 
 #include <algorithm>
 #include <array>

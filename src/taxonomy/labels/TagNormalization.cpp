@@ -1,4 +1,4 @@
-#include "taxonomy/TagNormalization.h"
+#include "taxonomy/labels/TagNormalization.h"
 
 #include "platform/text/RegularExpression.h"
 #include "platform/text/Text.h"

@@ -1,4 +1,4 @@
-#include "taxonomy/TGRTLegacyTaxonomyMapping.h"
+#include "taxonomy/legacy/TGRTLegacyTaxonomyMapping.h"
 
 #include "platform/base/Log.h"
 #include "platform/files/FileAccess.h"
@@ -6,7 +6,7 @@
 #include "resources/LegacyMappingTable.h"
 #include "resources/QVCTCompiledResources.h"
 #include "resources/ReplacementFile.h"
-#include "taxonomy/LegacyTagLookup.h"
+#include "taxonomy/legacy/LegacyTagLookup.h"
 
 #include <algorithm>
 #include <utility>

@@ -1,4 +1,4 @@
-#include "taxonomy/LegacyTagLookup.h"
+#include "taxonomy/legacy/LegacyTagLookup.h"
 
 namespace qvct {
 

@@ -1,4 +1,4 @@
-#include "taxonomy/QVTagIdentifierUtility.h"
+#include "taxonomy/labels/QVTagIdentifierUtility.h"
 
 #include <fmt/format.h>
 
