@@ -40,11 +40,11 @@ set(QVCT_PUBLIC_HEADERS
   metadata/TGRTDependencyItem.h
   metadata/TGRTKeyValue.h
   metadata/TGRTMetaData.h
-  formats/ContentWalk.h
+  formats/library/ContentWalk.h
   formats/ContentWriters.h
-  formats/FolderRejections.h
+  formats/library/FolderRejections.h
   formats/ItemFile.h
-  formats/LinkRule.h
+  formats/library/LinkRule.h
   formats/QVContentEditorFileUtilities.h
   formats/QVContentTaggingTypes.h
   formats/TGRTBaseMetaDataReader.h
@@ -53,7 +53,7 @@ set(QVCT_PUBLIC_HEADERS
   formats/TGRTMetaDataReader.h
   formats/TGRTMetaDataReaderFactory.h
   formats/TGRTMetaDataWriterFactory.h
-  formats/TGRTPackage.h
+  formats/library/TGRTPackage.h
   autotagging/keywords/QVCTKeywordExtractor.h
   autotagging/xml/QVCTXMLDocument.h
   autotagging/xml/QVSKXMLNode.h

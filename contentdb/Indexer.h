@@ -2,7 +2,7 @@
 
 #include "autotagging/services/TaggingServiceNames.h"
 #include "contentdb/IndexedItem.h"
-#include "formats/ContentWalk.h"
+#include "formats/library/ContentWalk.h"
 #include "platform/base/Error.h"
 #include "platform/base/Export.h"
 

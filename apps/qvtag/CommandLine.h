@@ -1,7 +1,7 @@
 #pragma once
 
 #include "CommandDescription.h"
-#include "formats/LinkRule.h"
+#include "formats/library/LinkRule.h"
 
 #include <functional>
 #include <memory>

@@ -2,7 +2,7 @@
 
 #include "CommandLine.h"
 #include "autotagging/QVTaggingAggregator.h"
-#include "formats/LinkRule.h"
+#include "formats/library/LinkRule.h"
 
 #include <cstdint>
 #include <memory>

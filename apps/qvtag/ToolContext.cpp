@@ -1,7 +1,7 @@
 #include "ToolContext.h"
 
 #include "Resources.h"
-#include "formats/ContentWalk.h"
+#include "formats/library/ContentWalk.h"
 #include "output/StandardStreams.h"
 #include "platform/base/Log.h"
 #include "platform/text/Text.h"

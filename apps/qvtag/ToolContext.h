@@ -1,6 +1,6 @@
 #pragma once
 
-#include "formats/LinkRule.h"
+#include "formats/library/LinkRule.h"
 #include "output/Output.h"
 #include "platform/base/Error.h"
 #include "platform/text/Url.h"

@@ -1,8 +1,8 @@
 #pragma once
 
 #include "contentdb/store/FolderDigest.h"
-#include "formats/ContentFolderWalk.h"
-#include "formats/FolderRejections.h"
+#include "formats/library/ContentFolderWalk.h"
+#include "formats/library/FolderRejections.h"
 
 #include <string>
 #include <string_view>

@@ -3,7 +3,7 @@
 #include "autotagging/evidence/ClaimResolver.h"
 #include "autotagging/evidence/Rejections.h"
 #include "autotagging/names/ItemNames.h"
-#include "formats/FolderRejections.h"
+#include "formats/library/FolderRejections.h"
 #include "platform/base/Export.h"
 #include "platform/base/ObjectSet.h"
 

@@ -1,6 +1,6 @@
 #include "FormatsSupport.h"
-#include "formats/ContentWalk.h"
-#include "formats/FolderRejections.h"
+#include "formats/library/ContentWalk.h"
+#include "formats/library/FolderRejections.h"
 #include "support/CapturedLog.h"
 
 #include <filesystem>

@@ -3,7 +3,7 @@
 #include "commands/Commands.h"
 #include "contentdb/ContentDatabase.h"
 #include "contentdb/ContentDescriber.h"
-#include "formats/ContentFolderWalk.h"
+#include "formats/library/ContentFolderWalk.h"
 #include "output/Progress.h"
 #include "output/StandardStreams.h"
 #include "platform/processes/Interruption.h"

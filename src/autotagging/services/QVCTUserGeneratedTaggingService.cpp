@@ -1,6 +1,6 @@
 #include "autotagging/services/QVCTUserGeneratedTaggingService.h"
 
-#include "formats/TGRTPackage.h"
+#include "formats/library/TGRTPackage.h"
 #include "platform/text/Text.h"
 #include "resources/PackDisplayNames.h"
 

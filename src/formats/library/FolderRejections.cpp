@@ -1,4 +1,4 @@
-#include "formats/FolderRejections.h"
+#include "formats/library/FolderRejections.h"
 
 #include "formats/StoredRecord.h"
 #include "metadata/StoredParts.h"

@@ -1,7 +1,7 @@
 #pragma once
 
-#include "formats/ContentNames.h"
-#include "formats/ContentWalk.h"
+#include "formats/library/ContentNames.h"
+#include "formats/library/ContentWalk.h"
 #include "platform/files/FolderListing.h"
 
 #include <functional>

@@ -1,6 +1,6 @@
-#include "formats/ContentWalk.h"
+#include "formats/library/ContentWalk.h"
 
-#include "formats/ContentFolderWalk.h"
+#include "formats/library/ContentFolderWalk.h"
 #include "platform/files/FileAccess.h"
 
 namespace qvct {

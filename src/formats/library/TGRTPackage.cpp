@@ -1,4 +1,4 @@
-#include "formats/TGRTPackage.h"
+#include "formats/library/TGRTPackage.h"
 
 #include "formats/TGRTFileNode.h"
 #include "resources/PackDisplayNames.h"

@@ -1,4 +1,4 @@
-#include "formats/LinkRule.h"
+#include "formats/library/LinkRule.h"
 
 #include <filesystem>
 #include <system_error>

@@ -1,4 +1,4 @@
-#include "formats/ContentNames.h"
+#include "formats/library/ContentNames.h"
 
 #include "formats/QVContentTaggingTypes.h"
 #include "formats/audiofile/TGRTAudioFileTypeValidator.h"

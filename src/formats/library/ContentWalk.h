@@ -1,6 +1,6 @@
 #pragma once
 
-#include "formats/LinkRule.h"
+#include "formats/library/LinkRule.h"
 #include "platform/base/Error.h"
 #include "platform/base/Export.h"
 #include "platform/text/Url.h"

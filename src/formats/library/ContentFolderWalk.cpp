@@ -1,4 +1,4 @@
-#include "formats/ContentFolderWalk.h"
+#include "formats/library/ContentFolderWalk.h"
 
 #include "platform/files/Paths.h"
 
