@@ -3,9 +3,9 @@
 #include "autotagging/names/Thesaurus.h"
 #include "contentdb/query/Search.h"
 #include "contentdb/query/SimilarItems.h"
-#include "contentdb/store/Reading.h"
-#include "contentdb/store/RunLock.h"
-#include "contentdb/store/StoreCheck.h"
+#include "contentdb/store/sqlite/Reading.h"
+#include "contentdb/store/sqlite/RunLock.h"
+#include "contentdb/store/upkeep/StoreCheck.h"
 #include "contentdb/terms/Terms.h"
 #include "taxonomy/TGRTTaxonomy.h"
 

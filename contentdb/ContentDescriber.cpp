@@ -6,7 +6,7 @@
 #include "autotagging/ResourceFiles.h"
 #include "contentdb/index/PayloadHash.h"
 #include "contentdb/store/Digest.h"
-#include "contentdb/store/ExplanationCodec.h"
+#include "contentdb/store/codec/ExplanationCodec.h"
 #include "formats/QVContentTaggingTypes.h"
 #include "indexing/TGRTIndexableContentObject.h"
 #include "media/loopfile/LCFileData.h"

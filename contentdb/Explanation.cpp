@@ -1,7 +1,7 @@
 #include "contentdb/Explanation.h"
 
-#include "contentdb/store/ExplanationCodec.h"
-#include "contentdb/store/ServiceNumbers.h"
+#include "contentdb/store/codec/ExplanationCodec.h"
+#include "contentdb/store/codec/ServiceNumbers.h"
 
 #include <algorithm>
 

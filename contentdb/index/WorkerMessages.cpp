@@ -1,6 +1,6 @@
 #include "contentdb/index/WorkerMessages.h"
 
-#include "contentdb/store/ItemCodec.h"
+#include "contentdb/store/codec/ItemCodec.h"
 #include "platform/base/Version.h"
 #include "platform/base/bytes/ByteOrder.h"
 

@@ -1,7 +1,7 @@
 #include "contentdb/index/WorkerSettings.h"
 
 #include "autotagging/ResourceFiles.h"
-#include "contentdb/store/ItemCodec.h"
+#include "contentdb/store/codec/ItemCodec.h"
 #include "platform/files/ResourceBundle.h"
 
 #include <optional>

@@ -1,7 +1,7 @@
 #include "contentdb/store/ContentStore.h"
 
-#include "contentdb/store/ItemCodec.h"
-#include "contentdb/store/StampColumns.h"
+#include "contentdb/store/codec/ItemCodec.h"
+#include "contentdb/store/codec/StampColumns.h"
 #include "platform/files/Paths.h"
 #include "platform/text/Text.h"
 

@@ -4,8 +4,8 @@
 #include "contentdb/SearchResults.h"
 #include "contentdb/store/IdSet.h"
 #include "contentdb/store/Part.h"
-#include "contentdb/store/Schema.h"
-#include "contentdb/store/Sqlite.h"
+#include "contentdb/store/sqlite/Schema.h"
+#include "contentdb/store/sqlite/Sqlite.h"
 
 #include <cstdint>
 #include <functional>

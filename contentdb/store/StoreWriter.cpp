@@ -1,7 +1,7 @@
 #include "contentdb/store/StoreWriter.h"
 
-#include "contentdb/store/ItemCodec.h"
-#include "contentdb/store/StampColumns.h"
+#include "contentdb/store/codec/ItemCodec.h"
+#include "contentdb/store/codec/StampColumns.h"
 #include "contentdb/terms/Terms.h"
 #include "contentdb/terms/Words.h"
 #include "formats/QVContentTaggingTypes.h"

@@ -1,9 +1,9 @@
 #include "Library.h"
 #include "autotagging/ItemTagger.h"
 #include "contentdb/Explanation.h"
-#include "contentdb/store/ExplanationCodec.h"
-#include "contentdb/store/ItemCodec.h"
-#include "contentdb/store/Salvage.h"
+#include "contentdb/store/codec/ExplanationCodec.h"
+#include "contentdb/store/codec/ItemCodec.h"
+#include "contentdb/store/upkeep/Salvage.h"
 
 #include <fmt/format.h>
 #include <gmock/gmock.h>

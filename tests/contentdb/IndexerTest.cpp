@@ -3,7 +3,7 @@
 #include "autotagging/ResourceFiles.h"
 #include "contentdb/ContentDescriber.h"
 #include "contentdb/index/WorkerMessages.h"
-#include "contentdb/store/RunLock.h"
+#include "contentdb/store/sqlite/RunLock.h"
 #include "platform/base/Version.h"
 #include "platform/files/ResourceBundle.h"
 #include "support/CapturedLog.h"

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "contentdb/store/Sqlite.h"
+#include "contentdb/store/sqlite/Sqlite.h"
 
 #include <memory>
 #include <optional>

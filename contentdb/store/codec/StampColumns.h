@@ -1,7 +1,7 @@
 #pragma once
 
 #include "contentdb/IndexedItem.h"
-#include "contentdb/store/Sqlite.h"
+#include "contentdb/store/sqlite/Sqlite.h"
 
 namespace qvct::contentdb {
 

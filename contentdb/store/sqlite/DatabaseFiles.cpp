@@ -1,6 +1,6 @@
-#include "contentdb/store/DatabaseFiles.h"
+#include "contentdb/store/sqlite/DatabaseFiles.h"
 
-#include "contentdb/store/Sqlite.h"
+#include "contentdb/store/sqlite/Sqlite.h"
 #include "platform/files/EmptyFile.h"
 #include "platform/files/FileAccess.h"
 #include "platform/files/replacement/FileReplacement.h"

@@ -1,8 +1,8 @@
-#include "contentdb/store/Reading.h"
+#include "contentdb/store/sqlite/Reading.h"
 
-#include "contentdb/store/DatabaseFiles.h"
-#include "contentdb/store/RunLock.h"
-#include "contentdb/store/Schema.h"
+#include "contentdb/store/sqlite/DatabaseFiles.h"
+#include "contentdb/store/sqlite/RunLock.h"
+#include "contentdb/store/sqlite/Schema.h"
 #include "platform/files/FileAccess.h"
 
 #include <chrono>

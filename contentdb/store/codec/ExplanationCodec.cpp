@@ -1,8 +1,8 @@
-#include "contentdb/store/ExplanationCodec.h"
+#include "contentdb/store/codec/ExplanationCodec.h"
 
 #include "autotagging/names/ItemNames.h"
-#include "contentdb/store/ItemCodec.h"
-#include "contentdb/store/ServiceNumbers.h"
+#include "contentdb/store/codec/ItemCodec.h"
+#include "contentdb/store/codec/ServiceNumbers.h"
 
 #include <algorithm>
 #include <cmath>

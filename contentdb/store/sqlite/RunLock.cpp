@@ -1,4 +1,4 @@
-#include "contentdb/store/RunLock.h"
+#include "contentdb/store/sqlite/RunLock.h"
 
 #include <fmt/format.h>
 

@@ -1,7 +1,7 @@
-#include "contentdb/store/Schema.h"
+#include "contentdb/store/sqlite/Schema.h"
 
-#include "contentdb/store/ChecksumVfs.h"
-#include "contentdb/store/DatabaseFiles.h"
+#include "contentdb/store/sqlite/ChecksumVfs.h"
+#include "contentdb/store/sqlite/DatabaseFiles.h"
 #include "platform/files/FileAccess.h"
 #include "platform/files/replacement/FileReplacement.h"
 

@@ -1,10 +1,10 @@
-#include "contentdb/store/Salvage.h"
+#include "contentdb/store/upkeep/Salvage.h"
 
 #include "contentdb/store/Batches.h"
-#include "contentdb/store/ChecksumVfs.h"
-#include "contentdb/store/DatabaseFiles.h"
-#include "contentdb/store/Schema.h"
 #include "contentdb/store/StoreWriter.h"
+#include "contentdb/store/sqlite/ChecksumVfs.h"
+#include "contentdb/store/sqlite/DatabaseFiles.h"
+#include "contentdb/store/sqlite/Schema.h"
 #include "contentdb/terms/Terms.h"
 
 #include <algorithm>

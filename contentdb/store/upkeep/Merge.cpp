@@ -1,9 +1,9 @@
-#include "contentdb/store/Merge.h"
+#include "contentdb/store/upkeep/Merge.h"
 
 #include "contentdb/store/Batches.h"
-#include "contentdb/store/Reading.h"
-#include "contentdb/store/Schema.h"
 #include "contentdb/store/StoreWriter.h"
+#include "contentdb/store/sqlite/Reading.h"
+#include "contentdb/store/sqlite/Schema.h"
 #include "contentdb/terms/Terms.h"
 
 #include <algorithm>

@@ -1,8 +1,8 @@
-#include "contentdb/store/StoreCheck.h"
+#include "contentdb/store/upkeep/StoreCheck.h"
 
 #include "contentdb/store/FolderDigest.h"
 #include "contentdb/store/Part.h"
-#include "contentdb/store/StampColumns.h"
+#include "contentdb/store/codec/StampColumns.h"
 #include "contentdb/terms/Terms.h"
 #include "platform/text/Text.h"
 

@@ -1,4 +1,4 @@
-#include "contentdb/store/ChecksumVfs.h"
+#include "contentdb/store/sqlite/ChecksumVfs.h"
 
 #include <array>
 #include <cstdint>

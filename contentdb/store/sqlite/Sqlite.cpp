@@ -1,6 +1,6 @@
-#include "contentdb/store/Sqlite.h"
+#include "contentdb/store/sqlite/Sqlite.h"
 
-#include "contentdb/store/ChecksumVfs.h"
+#include "contentdb/store/sqlite/ChecksumVfs.h"
 
 #include <array>
 #include <filesystem>
