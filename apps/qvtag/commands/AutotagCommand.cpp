@@ -1,5 +1,4 @@
 #include "CommandLine.h"
-#include "RhythmMeasurement.h"
 #include "Services.h"
 #include "TaggerOptions.h"
 #include "autotagging/ContentItem.h"
@@ -10,6 +9,7 @@
 #include "formats/QVContentTaggingTypes.h"
 #include "media/loopfile/LCFileData.h"
 #include "metadata/TGRTMetaData.h"
+#include "operations/RhythmMeasurement.h"
 #include "output/ItemTable.h"
 #include "output/StandardStreams.h"
 #include "output/TaggingWords.h"

@@ -1,6 +1,6 @@
 #include "CommandLine.h"
-#include "RhythmMeasurement.h"
 #include "commands/Commands.h"
+#include "operations/RhythmMeasurement.h"
 #include "output/StandardStreams.h"
 #include "platform/files/FileAccess.h"
 #include "platform/text/Text.h"

@@ -1,6 +1,6 @@
 #include "CommandLine.h"
-#include "SimilarTags.h"
 #include "commands/Commands.h"
+#include "operations/SimilarTags.h"
 #include "output/StandardStreams.h"
 #include "platform/data/PropertyListFile.h"
 #include "platform/text/Text.h"

@@ -1,7 +1,7 @@
-#include "TaggingEdit.h"
+#include "operations/TaggingEdit.h"
 
-#include "SimilarTags.h"
 #include "ToolContext.h"
+#include "operations/SimilarTags.h"
 #include "platform/text/Text.h"
 #include "taxonomy/labels/TagNormalization.h"
 

@@ -1,4 +1,4 @@
-#include "RhythmMeasurement.h"
+#include "operations/RhythmMeasurement.h"
 
 #include "listening/onsets/OnsetDetector.h"
 #include "listening/rhythm/LoopRhythm.h"

@@ -1,4 +1,4 @@
-#include "SimilarTags.h"
+#include "operations/SimilarTags.h"
 
 #include "platform/text/Spelling.h"
 #include "platform/text/Text.h"

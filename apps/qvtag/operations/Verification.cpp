@@ -1,4 +1,4 @@
-#include "Verification.h"
+#include "operations/Verification.h"
 
 #include "formats/QVContentTaggingTypes.h"
 #include "formats/TGRTFileNode.h"

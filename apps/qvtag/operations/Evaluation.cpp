@@ -1,4 +1,4 @@
-#include "Evaluation.h"
+#include "operations/Evaluation.h"
 
 #include "autotagging/evidence/ClaimResolver.h"
 #include "platform/files/FileAccess.h"

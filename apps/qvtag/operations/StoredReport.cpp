@@ -1,4 +1,4 @@
-#include "StoredReport.h"
+#include "operations/StoredReport.h"
 
 #include "contentdb/Explanation.h"
 
