@@ -1,8 +1,8 @@
 #include "demo/Library.h"
 
-#include "demo/AudioFiles.h"
 #include "demo/Patches.h"
-#include "demo/Settings.h"
+#include "demo/files/AudioFiles.h"
+#include "demo/files/Settings.h"
 
 #include <filesystem>
 

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "demo/Recipes.h"
+#include "demo/synthesis/Recipes.h"
 
 #include <string>
 #include <string_view>

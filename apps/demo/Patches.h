@@ -1,6 +1,6 @@
 #pragma once
 
-#include "demo/PatchDescription.h"
+#include "demo/files/PatchDescription.h"
 
 namespace qvct::demo {
 

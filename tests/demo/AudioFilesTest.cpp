@@ -1,5 +1,5 @@
-#include "demo/AudioFiles.h"
 #include "demo/Library.h"
+#include "demo/files/AudioFiles.h"
 #include "support/TemporaryFolder.h"
 
 #include <cmath>

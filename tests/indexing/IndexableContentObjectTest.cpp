@@ -1,4 +1,4 @@
-#include "demo/AudioFiles.h"
+#include "demo/files/AudioFiles.h"
 #include "formats/FormatsSupport.h"
 #include "formats/TGRTMetaDataReader.h"
 #include "indexing/TGRTIndexableContentObject.h"

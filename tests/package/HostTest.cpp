@@ -1,7 +1,7 @@
 // What hosts do that they should not, through the shared libraries and the headers as they are installed.
 
-#include "demo/AudioFiles.h"
 #include "demo/Library.h"
+#include "demo/files/AudioFiles.h"
 #include "support/Places.h"
 #include "support/TemporaryFolder.h"
 

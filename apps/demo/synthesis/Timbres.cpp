@@ -1,4 +1,4 @@
-#include "demo/Timbres.h"
+#include "demo/synthesis/Timbres.h"
 
 #include <algorithm>
 #include <cmath>

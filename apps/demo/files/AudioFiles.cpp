@@ -1,4 +1,4 @@
-#include "demo/AudioFiles.h"
+#include "demo/files/AudioFiles.h"
 
 #include <cerrno>
 #include <filesystem>

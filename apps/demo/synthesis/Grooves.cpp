@@ -1,4 +1,4 @@
-#include "demo/Grooves.h"
+#include "demo/synthesis/Grooves.h"
 
 #include <algorithm>
 #include <stdexcept>

@@ -1,8 +1,8 @@
 #pragma once
 
-#include "demo/Drums.h"
 #include "demo/Sound.h"
-#include "demo/Timbres.h"
+#include "demo/synthesis/Drums.h"
+#include "demo/synthesis/Timbres.h"
 
 #include <string_view>
 #include <variant>

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "demo/ByteWriter.h"
+#include "demo/files/ByteWriter.h"
 
 #include <string>
 #include <string_view>

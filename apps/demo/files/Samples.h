@@ -1,7 +1,7 @@
 #pragma once
 
-#include "demo/ByteWriter.h"
 #include "demo/Sound.h"
+#include "demo/files/ByteWriter.h"
 
 #include <algorithm>
 #include <cmath>

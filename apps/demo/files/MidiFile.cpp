@@ -1,6 +1,6 @@
-#include "demo/MidiFile.h"
+#include "demo/files/MidiFile.h"
 
-#include "demo/ByteWriter.h"
+#include "demo/files/ByteWriter.h"
 
 #include <algorithm>
 #include <bit>

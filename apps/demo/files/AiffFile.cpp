@@ -1,7 +1,7 @@
-#include "demo/AudioFiles.h"
-#include "demo/ByteWriter.h"
-#include "demo/MidiFile.h"
-#include "demo/Samples.h"
+#include "demo/files/AudioFiles.h"
+#include "demo/files/ByteWriter.h"
+#include "demo/files/MidiFile.h"
+#include "demo/files/Samples.h"
 
 namespace qvct::demo {
 namespace {

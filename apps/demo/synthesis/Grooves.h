@@ -1,6 +1,6 @@
 #pragma once
 
-#include "demo/Drums.h"
+#include "demo/synthesis/Drums.h"
 
 #include <string_view>
 #include <vector>

@@ -1,4 +1,4 @@
-#include "demo/Synthesis.h"
+#include "demo/synthesis/Synthesis.h"
 
 #include <algorithm>
 #include <cmath>

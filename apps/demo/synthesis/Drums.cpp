@@ -1,4 +1,4 @@
-#include "demo/Drums.h"
+#include "demo/synthesis/Drums.h"
 
 #include <cmath>
 #include <map>

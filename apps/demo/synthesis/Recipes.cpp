@@ -1,6 +1,6 @@
-#include "demo/Recipes.h"
+#include "demo/synthesis/Recipes.h"
 
-#include "demo/Grooves.h"
+#include "demo/synthesis/Grooves.h"
 
 #include <algorithm>
 #include <cmath>

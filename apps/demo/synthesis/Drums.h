@@ -1,6 +1,6 @@
 #pragma once
 
-#include "demo/Synthesis.h"
+#include "demo/synthesis/Synthesis.h"
 
 namespace qvct::demo {
 

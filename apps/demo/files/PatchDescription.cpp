@@ -1,6 +1,6 @@
-#include "demo/PatchDescription.h"
+#include "demo/files/PatchDescription.h"
 
-#include "demo/AudioFiles.h"
+#include "demo/files/AudioFiles.h"
 
 #include <stdexcept>
 

@@ -1,4 +1,4 @@
-#include "demo/Settings.h"
+#include "demo/files/Settings.h"
 
 #include <fmt/format.h>
 
