@@ -21,30 +21,27 @@ set(QVCT_PUBLIC_HEADERS
   media/loopfile/RecordKeys.h
   resources/EmbeddedFiles.h
   resources/ReplacementFile.h
-  taxonomy/labels/OptionalLabel.h
-  taxonomy/labels/QVTagIdentifierUtility.h
   taxonomy/TaggingSetAdditions.h
   taxonomy/TaggingTypes.h
-  taxonomy/labels/TagNormalization.h
   taxonomy/TGRTCategory.h
-  taxonomy/legacy/TGRTLegacyTaxonomyMapping.h
   taxonomy/TGRTLevel.h
   taxonomy/TGRTTag.h
   taxonomy/TGRTTagging.h
   taxonomy/TGRTTaggingCollection.h
   taxonomy/TGRTTaxonomy.h
   taxonomy/TGRTTaxonomySearching.h
+  taxonomy/labels/OptionalLabel.h
+  taxonomy/labels/QVTagIdentifierUtility.h
+  taxonomy/labels/TagNormalization.h
+  taxonomy/legacy/TGRTLegacyTaxonomyMapping.h
   metadata/QVCTUUIDGenerator.h
   metadata/TGRTApplicationInfo.h
   metadata/TGRTContentInfo.h
   metadata/TGRTDependencyItem.h
   metadata/TGRTKeyValue.h
   metadata/TGRTMetaData.h
-  formats/library/ContentWalk.h
   formats/ContentWriters.h
-  formats/library/FolderRejections.h
   formats/ItemFile.h
-  formats/library/LinkRule.h
   formats/QVContentEditorFileUtilities.h
   formats/QVContentTaggingTypes.h
   formats/TGRTBaseMetaDataReader.h
@@ -53,6 +50,9 @@ set(QVCT_PUBLIC_HEADERS
   formats/TGRTMetaDataReader.h
   formats/TGRTMetaDataReaderFactory.h
   formats/TGRTMetaDataWriterFactory.h
+  formats/library/ContentWalk.h
+  formats/library/FolderRejections.h
+  formats/library/LinkRule.h
   formats/library/TGRTPackage.h
   autotagging/keywords/QVCTKeywordExtractor.h
   autotagging/xml/QVCTXMLDocument.h
