@@ -1,9 +1,8 @@
 #include "autotagging/scripts/ScriptContext.h"
 
-#include "autotagging/scripts/RegularExpressionGuard.h"
+#include "autotagging/scripts/ScriptFunctions.h"
 #include "autotagging/scripts/ScriptGuard.h"
 #include "autotagging/scripts/ScriptValues.h"
-#include "autotagging/xml/QVCTXMLDocument.h"
 #include "autotagging/xml/XPathDeadline.h"
 #include "platform/base/Log.h"
 #include "platform/processes/HardLimit.h"
@@ -21,7 +20,6 @@ using Clock = std::chrono::steady_clock;
 
 /// Seconds of work between two looks at the limits.
 constexpr double kSlice = 0.01;
-constexpr std::size_t kLongestMessage = 4096;
 /// How far a script may exceed its limits before the process is ended, where that is allowed.
 constexpr std::chrono::milliseconds kHardTime{1000};
 constexpr std::size_t kHardMemory = std::size_t{64} << 20;
@@ -48,30 +46,6 @@ std::shared_ptr<ContextGroup> sharedGroup() {
     std::shared_ptr<ContextGroup>& group = groupOfThisThread();
     if (!group) group = std::make_shared<ContextGroup>();
     return group;
-}
-
-std::u16string_view viewOf(JSStringRef string) {
-    return {reinterpret_cast<const char16_t*>(engine().JSStringGetCharactersPtr(string)),
-            engine().JSStringGetLength(string)};
-}
-
-std::string argument(JSContextRef context, std::size_t count, const JSValueRef values[], std::size_t index,
-                     JSValueRef* exception) {
-    return textOf(context, index < count ? values[index] : engine().JSValueMakeUndefined(context), exception);
-}
-
-JSValueRef valueOf(JSContextRef context, const std::optional<std::string>& text) {
-    return text ? engine().JSValueMakeString(context, scriptString(*text).get())
-                : engine().JSValueMakeNull(context);
-}
-
-void setProperty(JSContextRef context, JSObjectRef object, std::string_view name, JSValueRef value) {
-    engine().JSObjectSetProperty(context, object, scriptString(name).get(), value, kJSPropertyAttributeNone,
-                                 nullptr);
-}
-
-JSValueRef property(JSContextRef context, JSObjectRef object, std::string_view name, JSValueRef* exception) {
-    return engine().JSObjectGetProperty(context, object, scriptString(name).get(), exception);
 }
 
 /// Replaces the first letter of each occurrence of a word by an escape: in texts, expressions and names that
@@ -119,17 +93,14 @@ struct ScriptContext::Implementation {
     enum class Stop { none, time, memory, unguarded };
 
     ScriptLimits limits;
-    Clock::time_point deadline = Clock::now() + limits.time;
+    ScriptHost host{Clock::now() + limits.time};
     Stop stop = Stop::none;
-    int messages = 0;
-    const QVCTXMLDocument* document = nullptr;
     std::shared_ptr<ContextGroup> group = sharedGroup();
     JSGlobalContextRef context = engine().JSGlobalContextCreateInGroup(group->reference(), nullptr);
     bool isGuarded = false;
     std::optional<HardLimit> hardLimit;  ///< For foreign scripts, until the context has gone.
 
     explicit Implementation(const ScriptLimits& chosen) : limits(chosen) {
-        outer = std::exchange(current, this);
         engine().JSContextGroupSetExecutionTimeLimit(group->reference(), kSlice, shouldTerminate, this);
     }
     Implementation(const Implementation&) = delete;
@@ -137,16 +108,11 @@ struct ScriptContext::Implementation {
 
     ~Implementation() {
         engine().JSContextGroupClearExecutionTimeLimit(group->reference());
-        current = outer;
         engine().JSGlobalContextRelease(context);
         // A virtual machine that was stopped may hold much memory, so the thread's next context gets a new
         // one.
         if (stop != Stop::none && groupOfThisThread() == group) groupOfThisThread().reset();
     }
-
-    /// The context whose script calls back. Kept here and not in the global object, since the engine looks up
-    /// the variables of a global object with private data slowly.
-    static Implementation& running() { return *current; }
 
     JSObjectRef global() const { return engine().JSContextGetGlobalObject(context); }
 
@@ -157,7 +123,7 @@ struct ScriptContext::Implementation {
     }
 
     static void logProblem(std::string_view text) {
-        log(fmt::format("JavaScript Exception: {}", text.substr(0, kLongestMessage)));
+        log(fmt::format("JavaScript Exception: {}", text.substr(0, kLongestScriptMessage)));
     }
 
     void logStop() {
@@ -173,10 +139,10 @@ struct ScriptContext::Implementation {
     template <typename Work>
     void run(Work work) {
         if (stop != Stop::none) return;
-        if (Clock::now() >= deadline) {
+        if (Clock::now() >= host.deadline) {
             stop = Stop::time;
         } else {
-            const XPathDeadline ofExpressions(deadline);
+            const XPathDeadline ofExpressions(host.deadline);
             work();
         }
         if (stop != Stop::none) logStop();
@@ -186,7 +152,7 @@ struct ScriptContext::Implementation {
     /// says stop: calls into the machine from our own functions may swallow the stop.
     static bool shouldTerminate(JSContextRef context, void* self) {
         auto& implementation = *static_cast<Implementation*>(self);
-        if (Clock::now() >= implementation.deadline) {
+        if (Clock::now() >= implementation.host.deadline) {
             implementation.stop = Stop::time;
         } else if (memoryInUse(context) > static_cast<double>(implementation.limits.memory)) {
             implementation.stop = Stop::memory;
@@ -198,57 +164,14 @@ struct ScriptContext::Implementation {
 
     static double memoryInUse(JSContextRef context) {
         const JSObjectRef statistics = engine().JSGetMemoryUsageStatistics(context);
-        return engine().JSValueToNumber(context, property(context, statistics, "heapCapacity", nullptr),
+        return engine().JSValueToNumber(context, propertyOf(context, statistics, "heapCapacity", nullptr),
                                         nullptr);
     }
 
-    void defineLog();
     void guard();
 
-    static JSClassRef documentClass();
-    static JSValueRef logMessage(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
-                                 JSValueRef*);
-    static JSValueRef checkExpression(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
-                                      JSValueRef*);
-    static JSValueRef isMatchingXPath(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
-                                      JSValueRef*);
-    static JSValueRef jsonStringForXPath(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
-                                         JSValueRef*);
-    static JSValueRef jsonString(JSContextRef, JSObjectRef, JSObjectRef, size_t, const JSValueRef[],
-                                 JSValueRef*);
-
     bool isStopLogged = false;
-    Implementation* outer = nullptr;
-    static thread_local Implementation* current;
 };
-
-thread_local ScriptContext::Implementation* ScriptContext::Implementation::current = nullptr;
-
-JSClassRef ScriptContext::Implementation::documentClass() {
-    static const JSClassRef made = [] {
-        constexpr JSPropertyAttributes fixed = kJSPropertyAttributeReadOnly | kJSPropertyAttributeDontDelete;
-        static const JSStaticFunction functions[] = {{"isMatchingXPath", isMatchingXPath, fixed},
-                                                     {"JSONStringForXPath", jsonStringForXPath, fixed},
-                                                     {"JSONString", jsonString, fixed},
-                                                     {nullptr, nullptr, 0}};
-        JSClassDefinition definition{};
-        definition.className = "QVCTXMLDocument";
-        definition.staticFunctions = functions;
-        return engine().JSClassCreate(&definition);
-    }();
-    return made;
-}
-
-/// `console` is an object of our own, since making the engine's takes longer than most scripts run.
-void ScriptContext::Implementation::defineLog() {
-    const JSObjectRef logFunction = engine().JSObjectMakeFunctionWithCallback(context, nullptr, logMessage);
-    const JSObjectRef console = engine().JSObjectMake(context, nullptr, nullptr);
-    for (const char* name : {"log", "info", "warn", "error", "debug"}) {
-        setProperty(context, console, name, logFunction);
-    }
-    setProperty(context, global(), "console", console);
-    setProperty(context, global(), "__log", logFunction);
-}
 
 /// Puts what foreign scripts can reach under the guard. The library's own scripts run without it.
 void ScriptContext::Implementation::guard() {
@@ -259,7 +182,7 @@ void ScriptContext::Implementation::guard() {
     engine().JSGlobalContextSetEvalEnabled(context, false, scriptString("not available to rules").get());
     const JSValueRef function =
         engine().JSEvaluateScript(context, program.get(), nullptr, nullptr, 1, nullptr);
-    const JSValueRef check = engine().JSObjectMakeFunctionWithCallback(context, nullptr, checkExpression);
+    const JSValueRef check = expressionCheck(context);
     JSValueRef exception = nullptr;
     const JSObjectRef callee =
         function != nullptr ? engine().JSValueToObject(context, function, nullptr) : nullptr;
@@ -269,60 +192,6 @@ void ScriptContext::Implementation::guard() {
     stop = Stop::unguarded;
 }
 
-JSValueRef ScriptContext::Implementation::logMessage(JSContextRef context, JSObjectRef /*function*/,
-                                                     JSObjectRef /*self*/, size_t count,
-                                                     const JSValueRef values[], JSValueRef* exception) {
-    const std::string message = argument(context, count, values, 0, exception);
-    const int number = ++running().messages;
-    if (number <= kMostScriptMessages) {
-        log(fmt::format("JavaScript: {}", std::string_view(message).substr(0, kLongestMessage)));
-    } else if (number == kMostScriptMessages + 1) {
-        log("JavaScript: (further messages of this script are dropped)");
-    }
-    return engine().JSValueMakeUndefined(context);
-}
-
-JSValueRef ScriptContext::Implementation::checkExpression(JSContextRef context, JSObjectRef /*function*/,
-                                                          JSObjectRef /*self*/, size_t count,
-                                                          const JSValueRef values[], JSValueRef* exception) {
-    if (count < 4) return engine().JSValueMakeUndefined(context);
-    const ScriptString pattern(engine().JSValueToStringCopy(context, values[0], exception));
-    const ScriptString flags(engine().JSValueToStringCopy(context, values[1], exception));
-    const ScriptString text(engine().JSValueToStringCopy(context, values[2], exception));
-    const double last = engine().JSValueToNumber(context, values[3], exception);
-    if (!pattern || !flags || !text) return engine().JSValueMakeUndefined(context);
-    const std::size_t start = last > 0 && last < 1e9 ? static_cast<std::size_t>(last) : 0;
-    if (!isRegularExpressionBounded(viewOf(pattern.get()), viewOf(flags.get()), viewOf(text.get()), start,
-                                    running().deadline)) {
-        const std::string reason =
-            fmt::format("regular expression takes too long: /{}/", textOf(pattern.get()));
-        *exception = engine().JSValueMakeString(context, scriptString(reason).get());
-    }
-    return engine().JSValueMakeUndefined(context);
-}
-
-JSValueRef ScriptContext::Implementation::isMatchingXPath(JSContextRef context, JSObjectRef /*function*/,
-                                                          JSObjectRef /*self*/, size_t count,
-                                                          const JSValueRef values[], JSValueRef* exception) {
-    const std::string expression = argument(context, count, values, 0, exception);
-    return engine().JSValueMakeBoolean(context, running().document->isMatchingXPath(expression));
-}
-
-JSValueRef ScriptContext::Implementation::jsonStringForXPath(JSContextRef context, JSObjectRef /*function*/,
-                                                             JSObjectRef /*self*/, size_t count,
-                                                             const JSValueRef values[],
-                                                             JSValueRef* exception) {
-    const std::string expression = argument(context, count, values, 0, exception);
-    return valueOf(context, running().document->JSONStringForXPath(expression));
-}
-
-JSValueRef ScriptContext::Implementation::jsonString(JSContextRef context, JSObjectRef /*function*/,
-                                                     JSObjectRef /*self*/, size_t /*count*/,
-                                                     const JSValueRef /*values*/[],
-                                                     JSValueRef* /*exception*/) {
-    return valueOf(context, running().document->JSONString());
-}
-
 ScriptContext::ScriptContext(std::unique_ptr<Implementation> implementation)
     : implementation_(std::move(implementation)) {}
 ScriptContext::~ScriptContext() = default;
@@ -330,15 +199,14 @@ ScriptContext::~ScriptContext() = default;
 std::shared_ptr<ScriptContext> ScriptContext::make(const ScriptLimits& limits, Error* error) {
     if (!ScriptEngine::load(error)) return nullptr;
     auto implementation = std::make_unique<Implementation>(limits);
-    implementation->defineLog();
+    defineLog(implementation->context);
     return std::shared_ptr<ScriptContext>(new ScriptContext(std::move(implementation)));
 }
 
 void ScriptContext::exposeDocument(const QVCTXMLDocument& document) {
     Implementation& self = *implementation_;
-    self.document = &document;
-    setProperty(self.context, self.global(), "document",
-                engine().JSObjectMake(self.context, Implementation::documentClass(), nullptr));
+    self.host.document = &document;
+    setProperty(self.context, self.global(), "document", documentObject(self.context));
 }
 
 void ScriptContext::evaluate(std::string_view script) {
@@ -358,7 +226,7 @@ std::optional<PropertyList::Array> ScriptContext::callForArray(std::string_view 
     std::optional<PropertyList::Array> result;
     self.run([&] {
         JSValueRef exception = nullptr;
-        const JSValueRef callee = property(self.context, self.global(), function, &exception);
+        const JSValueRef callee = propertyOf(self.context, self.global(), function, &exception);
         if (exception == nullptr &&
             (!engine().JSValueIsObject(self.context, callee) ||
              !engine().JSObjectIsFunction(self.context, const_cast<JSObjectRef>(callee)))) {
@@ -391,7 +259,7 @@ bool ScriptContext::checkSyntax(std::string_view script, Error* error) {
         return true;
     const double line = engine().JSValueToNumber(
         reference,
-        property(reference, engine().JSValueToObject(reference, exception, nullptr), "line", nullptr),
+        propertyOf(reference, engine().JSValueToObject(reference, exception, nullptr), "line", nullptr),
         nullptr);
     ErrorPlace place{.part = "script"};
     if (line >= 1) place.line = static_cast<std::uint64_t>(line);

@@ -27,6 +27,8 @@ inline constexpr int kDeepestScriptValue = 16;
 inline constexpr std::size_t kMostScriptText = std::size_t{1} << 20;
 /// Most lines that one evaluation writes to the log; those behind are dropped.
 inline constexpr int kMostScriptMessages = 100;
+/// Most bytes of a line about a script; the rest is cut off.
+inline constexpr std::size_t kLongestScriptMessage = 4096;
 
 /// A fresh global object in which one rule's script runs, with its limits.
 ///

@@ -173,6 +173,16 @@ std::string textOf(JSContextRef context, JSValueRef value, JSValueRef* exception
     return string ? textOf(string.get()) : std::string{};
 }
 
+void setProperty(JSContextRef context, JSObjectRef object, std::string_view name, JSValueRef value) {
+    engine().JSObjectSetProperty(context, object, scriptString(name).get(), value, kJSPropertyAttributeNone,
+                                 nullptr);
+}
+
+JSValueRef propertyOf(JSContextRef context, JSObjectRef object, std::string_view name,
+                      JSValueRef* exception) {
+    return engine().JSObjectGetProperty(context, object, scriptString(name).get(), exception);
+}
+
 std::optional<PropertyList::Array> arrayOf(JSContextRef context, JSValueRef value, std::string& problem) {
     if (!engine().JSValueIsArray(context, value)) {
         problem = fmt::format("TypeError: not an array of tags but {}",

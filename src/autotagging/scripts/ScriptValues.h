@@ -24,6 +24,9 @@ std::string textOf(JSStringRef string);
 /// The value as a script's `String(value)` gives it; empty and `exception` set where that fails.
 std::string textOf(JSContextRef context, JSValueRef value, JSValueRef* exception);
 
+void setProperty(JSContextRef context, JSObjectRef object, std::string_view name, JSValueRef value);
+JSValueRef propertyOf(JSContextRef context, JSObjectRef object, std::string_view name, JSValueRef* exception);
+
 /// Converts an array that a script returned. Nothing when the value is no array or too large, or when a
 /// getter throws; `problem` is then the reason, unless the script is being stopped.
 std::optional<PropertyList::Array> arrayOf(JSContextRef context, JSValueRef value, std::string& problem);
