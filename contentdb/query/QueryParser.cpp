@@ -27,10 +27,6 @@ struct Piece {
 
 constexpr double kInfinity = std::numeric_limits<double>::infinity();
 
-bool isBlank(char c) {
-    return c == ' ' || c == '\t' || c == '\n' || c == '\r';
-}
-
 class Parser {
   public:
     Parser(std::string_view text, const Vocabulary& vocabulary) : text_(text), vocabulary_(vocabulary) {}
@@ -57,10 +53,12 @@ class Parser {
         throw QueryFault{{std::move(message), start, end - start}};
     }
 
-    bool isAtEndOfTerm() const { return at_ >= text_.size() || isBlank(text_[at_]) || text_[at_] == ','; }
+    bool isAtEndOfTerm() const {
+        return at_ >= text_.size() || isAsciiBlank(text_[at_]) || text_[at_] == ',';
+    }
 
     void skipBlanks() {
-        while (at_ < text_.size() && isBlank(text_[at_])) ++at_;
+        while (at_ < text_.size() && isAsciiBlank(text_[at_])) ++at_;
     }
 
     bool accept(std::string_view token) {
@@ -91,8 +89,8 @@ class Parser {
 
     void term(AllOf& terms) {
         const std::size_t start = at_;
-        const bool isNegated =
-            text_[at_] == '-' && at_ + 1 < text_.size() && !isBlank(text_[at_ + 1]) && text_[at_ + 1] != ',';
+        const bool isNegated = text_[at_] == '-' && at_ + 1 < text_.size() && !isAsciiBlank(text_[at_ + 1]) &&
+                               text_[at_ + 1] != ',';
         if (isNegated) ++at_;
         if (const auto key = sortKey()) {
             if (isNegated) fail(start, at_, "an order cannot be negated");
@@ -103,7 +101,7 @@ class Parser {
         AnyOf any{{factor(field)}};
         // "kick,snare", "genre:House,Techno": a comma that no blank follows adds an alternative word or
         // value.
-        while (at_ + 1 < text_.size() && text_[at_] == ',' && !isBlank(text_[at_ + 1]) &&
+        while (at_ + 1 < text_.size() && text_[at_] == ',' && !isAsciiBlank(text_[at_ + 1]) &&
                text_[at_ + 1] != ',') {
             ++at_;
             any.parts.push_back(factor(field));
@@ -231,7 +229,7 @@ class Parser {
         if (at_ < text_.size() && text_[at_] == '"') {
             pattern = piece("");
         } else {
-            while (at_ < text_.size() && !isBlank(text_[at_])) pattern.text += text_[at_++];
+            while (at_ < text_.size() && !isAsciiBlank(text_[at_])) pattern.text += text_[at_++];
             pattern.end = at_;
         }
         if (pattern.text.empty()) fail(pattern.start, at_, "an expression is missing here");

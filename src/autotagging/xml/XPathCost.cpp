@@ -1,5 +1,7 @@
 #include "autotagging/xml/XPathCost.h"
 
+#include "platform/text/Text.h"
+
 #include <algorithm>
 #include <array>
 #include <string_view>
@@ -7,10 +9,6 @@
 
 namespace qvct {
 namespace {
-
-bool isBlank(char c) {
-    return c == ' ' || c == '\t' || c == '\r' || c == '\n';
-}
 
 bool isNameCharacter(char c) {
     return (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9') || c == '_' ||
@@ -31,7 +29,7 @@ std::vector<std::string_view> tokensOf(std::string_view text) {
         } else if (isNameCharacter(text[at]) && text[at] != '.' && text[at] != '-') {
             while (at + length < text.size() && isNameCharacter(text[at + length])) ++length;
         }
-        if (!isBlank(text[at])) tokens.push_back(text.substr(at, length));
+        if (!isAsciiBlank(text[at])) tokens.push_back(text.substr(at, length));
         at += length;
     }
     return tokens;

@@ -60,13 +60,9 @@ std::size_t endOf(std::string_view text, std::size_t at, bool (*isPart)(char)) {
     return at;
 }
 
-bool isBlank(char c) {
-    return c == ' ' || c == '\t' || c == '\r' || c == '\n';
-}
-
 /// Why the name, which `rest` follows, is not defined; empty when it may be.
 std::string problemOf(std::string_view name, std::string_view rest) {
-    const std::string_view next = rest.substr(endOf(rest, 0, isBlank));
+    const std::string_view next = rest.substr(endOf(rest, 0, isAsciiBlank));
     if (rest.starts_with(':') && !rest.starts_with("::") && name != "xml")
         return fmt::format("undefined prefix \"{}\"", printable(name));
     const bool isCalled = next.starts_with('(');

@@ -44,6 +44,10 @@ bool isWordBoundary(std::string_view text, std::size_t offset);
 constexpr bool isAsciiWordCharacter(char c) {
     return (c >= '0' && c <= '9') || (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z') || c == '_';
 }
+/// A space, a tab or the end of a line: what separates words in XML, XPath and queries.
+constexpr bool isAsciiBlank(char c) {
+    return c == ' ' || c == '\t' || c == '\n' || c == '\r';
+}
 
 /// Without the blanks (and, if asked for, line breaks) at both ends.
 std::string_view trimBlanks(std::string_view text);

@@ -2,16 +2,13 @@
 
 #include "platform/data/PropertyListFile.h"
 #include "platform/data/propertylist/PropertyListBuilder.h"
+#include "platform/data/propertylist/XmlPropertyListValues.h"
 #include "platform/data/xml/XmlParsing.h"
 #include "platform/text/Text.h"
 
 #include <algorithm>
 #include <array>
-#include <charconv>
-#include <chrono>
-#include <clocale>
 #include <cstdint>
-#include <cstdlib>
 #include <iterator>
 #include <memory>
 #include <optional>
@@ -52,98 +49,6 @@ bool holdsCharacters(Element element) {
            element == Element::real || element == Element::date || element == Element::data;
 }
 
-bool isSpace(char c) {
-    return c == ' ' || c == '\t' || c == '\n' || c == '\r';
-}
-
-/// What a digit of base 64 stands for; 64 for what is none.
-constexpr std::array<std::uint8_t, 256> kBase64 = [] {
-    std::array<std::uint8_t, 256> values{};
-    values.fill(64);
-    std::uint8_t value = 0;
-    for (const char c : std::string_view("ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789+/"))
-        values[static_cast<unsigned char>(c)] = value++;
-    return values;
-}();
-
-std::uint8_t base64(char c) {
-    return kBase64[static_cast<unsigned char>(c)];
-}
-
-bool isBase64(char c) {
-    return base64(c) < 64 || c == '=' || isSpace(c);
-}
-
-/// The bytes that the digits spell. Padding may be missing, but not be wrong.
-std::optional<PropertyList> dataOf(std::string_view digits) {
-    const std::size_t count = digits.find_last_not_of('=') + 1;
-    const std::size_t padding = digits.size() - count;
-    const std::size_t lastGroup = count % 4;
-    const bool isPadded = padding == 0 || (lastGroup > 1 && padding == 4 - lastGroup);
-    digits = digits.substr(0, count);
-    if (lastGroup == 1 || !isPadded || digits.find('=') != std::string_view::npos) return std::nullopt;
-    PropertyList::Data bytes;
-    bytes.reserve(count / 4 * 3 + 2);
-    unsigned bits = 0;
-    for (std::size_t i = 0; i < count; ++i) {
-        bits = bits << 6U | base64(digits[i]);
-        if (i % 4 > 0) bytes.push_back(static_cast<std::uint8_t>(bits >> (6 - 2 * (i % 4))));
-    }
-    return bytes;
-}
-
-/// Takes a number from the front of the text. Whether there is one.
-template <typename Number, typename... Options>
-bool takeNumber(std::string_view& text, Number& number, Options... options) {
-    const auto [end, status] = std::from_chars(text.data(), text.data() + text.size(), number, options...);
-    text.remove_prefix(static_cast<std::size_t>(end - text.data()));
-    return status == std::errc{};
-}
-
-/// A whole number, decimal or hexadecimal, that 64 bits hold.
-std::optional<PropertyList> integerOf(std::string_view text) {
-    const bool isNegative = text.starts_with('-');
-    if (isNegative || text.starts_with('+')) text.remove_prefix(1);
-    const bool isHexadecimal = text.starts_with("0x") || text.starts_with("0X");
-    if (isHexadecimal) text.remove_prefix(2);
-    std::uint64_t magnitude = 0;
-    if (!takeNumber(text, magnitude, isHexadecimal ? 16 : 10) || !text.empty()) return std::nullopt;
-    if (!isNegative) return magnitude;
-    if (magnitude > 1ULL << 63U) return std::nullopt;
-    return static_cast<std::int64_t>(0 - magnitude);
-}
-
-/// A number, "inf" or "nan"; one out of range is as near as there is, infinity or 0.
-std::optional<PropertyList> realOf(std::string_view text) {
-    const bool hasPlus = text.starts_with('+');
-    if (hasPlus) text.remove_prefix(1);
-    double number = 0;
-    const auto [end, status] = std::from_chars(text.data(), text.data() + text.size(), number);
-    const bool isNumber = status != std::errc::invalid_argument && end == text.data() + text.size();
-    if (!isNumber || (hasPlus && text.starts_with('-'))) return std::nullopt;
-    static const locale_t plain = newlocale(LC_ALL_MASK, "C", nullptr);
-    return status == std::errc{} ? number : strtod_l(std::string(text).c_str(), nullptr, plain);
-}
-
-/// A date and time such as "2001-12-31T23:59:59Z", in the range that is written, too.
-std::optional<PropertyList> dateOf(std::string_view text) {
-    std::array<unsigned, 6> fields{};
-    constexpr std::string_view separators = "--T::Z";
-    for (std::size_t i = 0; i < fields.size(); ++i) {
-        if (!takeNumber(text, fields[i]) || !text.starts_with(separators[i])) return std::nullopt;
-        text.remove_prefix(1);
-    }
-    using namespace std::chrono;
-    const auto [y, m, d, hour, minute, second] = fields;
-    if (!text.empty() || y > 9999 || m > 12 || d > 31 || hour > 23 || minute > 59 || second > 60)
-        return std::nullopt;
-    const year_month_day day(year(static_cast<int>(y)), month(m), std::chrono::day(d));
-    const duration<double> sinceReference =
-        sys_days(day) - sys_days(year(2001) / January / 1) + hours(hour) + minutes(minute) + seconds(second);
-    if (!day.ok() || !isPropertyListDate(sinceReference.count())) return std::nullopt;
-    return PropertyList::Date{sinceReference.count()};
-}
-
 /// Builds the value from the events of the XML parser, and keeps the first fault: the first thing that may
 /// not be in a property list. `where()` answers the offset of an event's first byte.
 class Reader {
@@ -176,13 +81,13 @@ class Reader {
         const bool isFree = holdsCharacters(element) && !isData;
         const auto fault =
             isFree ? characters.end()
-                   : std::find_if_not(characters.begin(), characters.end(), isData ? isBase64 : isSpace);
+                   : std::find_if_not(characters.begin(), characters.end(), isData ? isBase64 : isAsciiBlank);
         if (fault != characters.end()) {
             refuse(isData ? "data that is not base 64" : "text between elements",
                    where() + static_cast<std::size_t>(fault - characters.begin()));
         } else if (isData) {
             std::remove_copy_if(characters.begin(), characters.end(), std::back_inserter(characters_),
-                                isSpace);
+                                isAsciiBlank);
         } else if (isFree) {
             characters_ += characters;
         }
@@ -254,13 +159,14 @@ class Reader {
         const std::string_view scalar = trimBlanksAndLineBreaks(characters_);
         switch (closed.element) {
             case Element::integer:
-                return addIf(integerOf(scalar), "not a whole number of 64 bits", closed.offset);
+                return addIf(integerInXml(scalar), "not a whole number of 64 bits", closed.offset);
             case Element::real:
-                return addIf(realOf(scalar), "not a number", closed.offset);
+                return addIf(realInXml(scalar), "not a number", closed.offset);
             case Element::date:
-                return addIf(dateOf(scalar), "not a date and time of the years 1 to 9999", closed.offset);
+                return addIf(dateInXml(scalar), "not a date and time of the years 1 to 9999", closed.offset);
             case Element::data:
-                return addIf(dataOf(characters_), "data that is not whole groups of base 64", closed.offset);
+                return addIf(dataInXml(characters_), "data that is not whole groups of base 64",
+                             closed.offset);
             case Element::text:
                 return builder_.add(std::exchange(characters_, {}));
             default:

@@ -57,10 +57,6 @@ std::string narrowed(std::string_view text, Characters characters) {
     return narrow;
 }
 
-bool isBlank(char c) {
-    return c == ' ' || c == '\t' || c == '\r' || c == '\n';
-}
-
 /// The XML declaration behind a byte order mark, up to its end or the most that is looked at.
 std::string_view declarationOf(std::string_view text) {
     constexpr std::size_t longest = 1024, longestMark = 3;
@@ -104,7 +100,7 @@ bool hasKnownMarkup(std::string_view narrow, bool isWide, Error* error) {
 /// none.
 std::size_t valueBehind(std::string_view text, std::size_t equals) {
     std::size_t at = equals + 1;
-    while (at < text.size() && isBlank(text[at])) ++at;
+    while (at < text.size() && isAsciiBlank(text[at])) ++at;
     return at < text.size() && (text[at] == '"' || text[at] == '\'') ? at : text.size();
 }
 
