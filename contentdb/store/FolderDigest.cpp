@@ -1,6 +1,7 @@
 #include "contentdb/store/FolderDigest.h"
 
 #include "contentdb/store/Digest.h"
+#include "contentdb/store/StampNumbers.h"
 
 namespace qvct::contentdb {
 
@@ -8,10 +9,7 @@ std::uint64_t digestOf(const std::vector<ListedItem>& items) {
     Digest digest;
     for (const ListedItem& item : items) {
         digest.add(item.name);
-        digest.add(item.stamp.size);
-        digest.add(static_cast<std::uint64_t>(item.stamp.modified));
-        digest.add(static_cast<std::uint64_t>(item.stamp.changed));
-        digest.add(item.stamp.inode);
+        for (const std::uint64_t number : numbersOf(item.stamp)) digest.add(number);
     }
     return digest.value() == 0 ? 1 : digest.value();
 }

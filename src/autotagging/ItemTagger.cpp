@@ -95,9 +95,8 @@ class KeywordJudge {
 };
 
 std::optional<int> beatsOf(const NameReading& reading) {
-    constexpr int usualBeatsOfBar = 4;
     if (reading.beats || !reading.bars) return reading.beats;
-    return *reading.bars * usualBeatsOfBar;
+    return *reading.bars * kUsualBeatsOfBar;
 }
 
 /// A number of a name that agrees with the length of the sound is its tempo, and the sound a loop.

@@ -1,5 +1,6 @@
 #include "contentdb/store/codec/ItemCodec.h"
 
+#include "contentdb/store/StampNumbers.h"
 #include "contentdb/store/codec/ExplanationCodec.h"
 #include "contentdb/store/codec/ServiceNumbers.h"
 
@@ -103,10 +104,7 @@ void ByteWriter::text(std::string_view value) {
 }
 
 void ByteWriter::stamp(const ItemStamp& value) {
-    number(value.size);
-    number(static_cast<std::uint64_t>(value.modified));
-    number(static_cast<std::uint64_t>(value.changed));
-    number(value.inode);
+    for (const std::uint64_t part : numbersOf(value)) number(part);
 }
 
 std::string_view ByteReader::take(std::size_t size) {
@@ -145,12 +143,9 @@ std::string_view ByteReader::text() {
 }
 
 ItemStamp ByteReader::stamp() {
-    ItemStamp value;
-    value.size = number();
-    value.modified = static_cast<std::int64_t>(number());
-    value.changed = static_cast<std::int64_t>(number());
-    value.inode = number();
-    return value;
+    StampNumbers parts{};
+    for (std::uint64_t& part : parts) part = number();
+    return stampOf(parts);
 }
 
 std::size_t ByteReader::count() {

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "contentdb/IndexedItem.h"
+#include "contentdb/store/StampNumbers.h"
 #include "contentdb/store/sqlite/Sqlite.h"
 
 namespace qvct::contentdb {
@@ -9,13 +9,13 @@ namespace qvct::contentdb {
 inline constexpr const char* kStampColumns = "size, modified, changed, inode";
 
 inline ItemStamp stampIn(const Statement& row, int firstColumn) {
-    return {row.unsignedInteger(firstColumn), row.integer(firstColumn + 1), row.integer(firstColumn + 2),
-            row.unsignedInteger(firstColumn + 3)};
+    StampNumbers numbers{};
+    for (std::uint64_t& number : numbers) number = row.unsignedInteger(firstColumn++);
+    return stampOf(numbers);
 }
 
 inline void bindStamp(Statement& statement, int firstIndex, const ItemStamp& stamp) {
-    statement.bind(firstIndex, stamp.size).bind(firstIndex + 1, stamp.modified);
-    statement.bind(firstIndex + 2, stamp.changed).bind(firstIndex + 3, stamp.inode);
+    for (const std::uint64_t number : numbersOf(stamp)) statement.bind(firstIndex++, number);
 }
 
 }  // namespace qvct::contentdb

@@ -17,6 +17,9 @@
 
 namespace qvct {
 
+/// What a bar holds where nothing says otherwise.
+inline constexpr int kUsualBeatsOfBar = 4;
+
 /// What the name of an item and those of its folders say.
 struct NameReading {
     /// A phrase whose words do not mean what they say elsewhere.

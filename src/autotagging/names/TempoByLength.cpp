@@ -11,8 +11,8 @@ namespace {
 
 std::vector<int> likelyBeats(const NameReading& reading) {
     if (reading.beats) return {*reading.beats};
-    constexpr int usualBeatsOfBar = 4, beatsOfWaltz = 3;
-    if (reading.bars) return {*reading.bars * usualBeatsOfBar, *reading.bars * beatsOfWaltz};
+    constexpr int beatsOfWaltz = 3;
+    if (reading.bars) return {*reading.bars * kUsualBeatsOfBar, *reading.bars * beatsOfWaltz};
     return {8, 16, 32, 64};
 }
 
