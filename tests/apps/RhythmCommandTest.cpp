@@ -4,7 +4,6 @@
 #include "media/loopfile/LCFileParser.h"
 #include "media/loopfile/LCFileWriter.h"
 #include "support/AudioFixtures.h"
-#include "support/Corpus.h"
 #include "support/RunTool.h"
 
 #include <cmath>
@@ -381,24 +380,6 @@ TEST(RhythmCommand, TellsWhatIsDamagedInAMidiFile) {
     const ToolResult nothing = rhythm({folder.write("none.mid", emptyMidi().substr(0, 24))});
     EXPECT_EQ(nothing.status, 1);
     EXPECT_THAT(nothing.errors, HasSubstr("none.mid: nothing sounds in it: byte "));
-}
-
-TEST(RhythmCommand, EveryMidiFileOfTheCorpusGivesWhatCanBeReadOrAReason) {
-    QVCT_SKIP_WITHOUT(corpus("midi/test-files"));
-    const std::vector<std::string> files = filesBelow(corpus("midi/test-files"));
-    std::size_t measured = 0;
-    for (const std::string& file : files) {
-        const ToolResult result = rhythm({file});
-        ASSERT_THAT(result.status, testing::AnyOf(0, 1)) << file << result.errors;
-        if (result.status == 1) {
-            EXPECT_THAT(result.errors, HasSubstr(std::filesystem::path(file).filename().string()));
-            EXPECT_EQ(result.json(), json::array());
-            continue;
-        }
-        ++measured;
-        expectSound(result.json()[0], file);
-    }
-    EXPECT_GT(measured, files.size() / 3);
 }
 
 TEST(Autotag, GradesTheRhythmOfEveryLoopOnRequest) {

@@ -345,60 +345,46 @@ TEST_F(Tagging, OfWhatOnlyDescribesAnInstrumentHoldsTheInstrument) {
 }
 
 TEST_F(Tagging, KnowsWhatGeneralMidiAndItsVariantsCallTheirSounds) {
-    const std::pair<const char*, std::string_view> rows[] = {
+    constexpr std::string_view kTheSame = "=";
+    const std::pair<std::string_view, std::string_view> rows[] = {
+        {kTheSame,
+         "Harpsichord, Celesta, Vibraphone, Marimba, Xylophone, Tubular Bells, Harmonica, "
+         "Acoustic Bass, Violin, Viola, Cello, Timpani, Trombone, Tuba, Oboe, Bassoon, Clarinet, "
+         "Recorder, Pan Flute, Ocarina, Sitar, Banjo, Shamisen, Koto, Kalimba, Fiddle, Tambourine, "
+         "Cowbell, Cabasa, Maracas, Castanets"},
         {"Piano", "Acoustic Grand Piano, Bright Acoustic Piano, Honky-tonk Piano, HnkyTonk"},
         {"Electric Piano", "Electric Grand Piano, Electric Piano 1, Electric Piano 2, E.Grand"},
-        {"Harpsichord", "Harpsichord"},
         {"Clavinet", "Clavi"},
-        {"Celesta", "Celesta"},
         {"Glockenspiel", "Glockenspiel, Music Box"},
-        {"Vibraphone", "Vibraphone"},
-        {"Marimba", "Marimba"},
-        {"Xylophone", "Xylophone"},
-        {"Tubular Bells", "Tubular Bells"},
         {"Dulcimer", "Dulcimer, Santur"},
         {"Organ", "Drawbar Organ, Percussive Organ, Rock Organ, Church Organ, Reed Organ"},
         {"Accordion", "Accordion, Tango Accordion"},
-        {"Harmonica", "Harmonica"},
         {"Classical Guitar", "Acoustic Guitar (nylon), Nylon-str.Gt, NylonGtr"},
         {"Acoustic Guitar", "Acoustic Guitar (steel), Steel-str.Gt"},
         {"Electric Guitar",
          "Electric Guitar (jazz), Electric Guitar (clean), Electric Guitar (muted), Overdriven Guitar, "
          "Distortion Guitar, Jazz Gt., DistortionGt, Dist.Gtr, CleanGtr, Guitar harmonics"},
         {"Guitar", "Guitar Fret Noise, Gt.FretNoise"},
-        {"Acoustic Bass", "Acoustic Bass"},
         {"Electric Bass",
          "Electric Bass (finger), Electric Bass (pick), Fretless Bass, Slap Bass 1, Slap Bass 2, Fingered "
          "Bs., FngrBass, SlapBas1"},
         {"Synth Bass", "Synth Bass 1, Synth Bass 2"},
-        {"Violin", "Violin"},
-        {"Viola", "Viola"},
-        {"Cello", "Cello"},
         {"Double Bass", "Contrabass"},
         {"String Ensemble", "Tremolo Strings, Pizzicato Strings, String Ensemble 1, String Ensemble 2"},
         {"Harp", "Orchestral Harp"},
-        {"Timpani", "Timpani"},
         {"Synth Strings", "SynthStrings 1, SynthStrings 2, SynStr1"},
         {"Choir", "Choir Aahs, Voice Oohs"},
         {"Synth Voice", "Synth Voice, SynVox"},
         {"Stab", "Orchestra Hit"},
         {"Trumpet", "Trumpet, Muted Trumpet"},
-        {"Trombone", "Trombone"},
-        {"Tuba", "Tuba"},
         {"Horn", "French Horn"},
         {"Brass Section", "Brass Section, BrasSect"},
         {"Synth Brass", "SynthBrass 1, SynthBrass 2, SynBras1"},
         {"Saxophone", "Soprano Sax, Alto Sax, Tenor Sax, Baritone Sax"},
-        {"Oboe", "Oboe"},
         {"English Horn", "English Horn, Eng.Horn"},
-        {"Bassoon", "Bassoon"},
-        {"Clarinet", "Clarinet"},
         {"Flute", "Piccolo, Flute, Blown Bottle"},
-        {"Recorder", "Recorder"},
-        {"Pan Flute", "Pan Flute"},
         {"Shakuhachi", "Shakuhachi, Shakhchi"},
         {"", "Whistle"},
-        {"Ocarina", "Ocarina"},
         {"Lead",
          "Lead 1 (square), Lead 2 (sawtooth), Lead 3 (calliope), Lead 4 (chiff), Lead 5 (charang), Lead 6 "
          "(voice), Lead 7 (fifths), Lead 8 (bass + lead)"},
@@ -408,13 +394,7 @@ TEST_F(Tagging, KnowsWhatGeneralMidiAndItsVariantsCallTheirSounds) {
         {"Sound Effects",
          "FX 1 (rain), FX 2 (soundtrack), FX 3 (crystal), FX 4 (atmosphere), FX 5 (brightness), FX 6 "
          "(goblins), FX 7 (echoes), FX 8 (sci-fi), Telephone Ring, Helicopter, Applause, Gunshot"},
-        {"Sitar", "Sitar"},
-        {"Banjo", "Banjo"},
-        {"Shamisen", "Shamisen"},
-        {"Koto", "Koto"},
-        {"Kalimba", "Kalimba"},
         {"Bagpipes", "Bag pipe"},
-        {"Fiddle", "Fiddle"},
         {"Woodwinds", "Shanai"},
         {"Bells", "Tinkle Bell"},
         {"Agogo", "Agogo, High Agogo, Low Agogo"},
@@ -433,14 +413,10 @@ TEST_F(Tagging, KnowsWhatGeneralMidiAndItsVariantsCallTheirSounds) {
         {"Hi-Hat", "Closed Hi Hat, Pedal Hi-Hat, Open Hi-Hat, TR-808 CHH"},
         {"Crash", "Crash Cymbal 1, Crash Cymbal 2"},
         {"Ride", "Ride Cymbal 1, Ride Bell, Ride Cymbal 2"},
-        {"Tambourine", "Tambourine"},
-        {"Cowbell", "Cowbell"},
         {"Percussion", "Vibraslap, Short Whistle, Long Whistle, Samba Whistle H, Metronome Bell"},
         {"Bongo", "Hi Bongo, Low Bongo"},
         {"Conga", "Mute Hi Conga, Open Hi Conga, Low Conga, Conga H Mute"},
         {"Timbales", "High Timbale, Low Timbale"},
-        {"Cabasa", "Cabasa"},
-        {"Maracas", "Maracas"},
         {"Guiro", "Short Guiro, Long Guiro"},
         {"Clave", "Claves"},
         {"Cuica", "Mute Cuica, Open Cuica"},
@@ -449,7 +425,6 @@ TEST_F(Tagging, KnowsWhatGeneralMidiAndItsVariantsCallTheirSounds) {
         {"Sleigh Bells", "Jingle Bell"},
         {"Surdo", "Mute Surdo"},
         {"Wind Chimes", "Bell Tree"},
-        {"Castanets", "Castanets"},
     };
     for (const auto& [label, names] : rows) {
         for (const std::string& name : split(names, ", ")) {
@@ -459,7 +434,7 @@ TEST_F(Tagging, KnowsWhatGeneralMidiAndItsVariantsCallTheirSounds) {
             for (const HeldTag& held : report.resolution.held)
                 if (held.tag->categoryIdentifier() == QVCategorySourceIdentifier && !held.claims.empty())
                     instruments += held.tag->label();
-            EXPECT_EQ(instruments, label) << name;
+            EXPECT_EQ(instruments, label == kTheSame ? name : label) << name;
         }
     }
 }

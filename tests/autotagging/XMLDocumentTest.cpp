@@ -4,6 +4,7 @@
 #include "autotagging/xml/XPathExpression.h"
 #include "platform/data/Json.h"
 #include "support/CapturedLog.h"
+#include "support/Compressed.h"
 #include "support/ProcessorClock.h"
 #include "support/TemporaryFolder.h"
 #include "support/Texts.h"
@@ -11,11 +12,11 @@
 #include <chrono>
 
 #include <gmock/gmock.h>
-#include <zlib.h>
 
 namespace qvct {
 namespace {
 
+using test::gzipped;
 using test::repeated;
 using testing::ElementsAre;
 using testing::HasSubstr;
@@ -28,20 +29,6 @@ std::shared_ptr<QVCTXMLDocument> document(std::string_view text) {
 std::string compactJson(std::string_view xml) {
     const auto dictionary = QVCTXMLParser::dictionaryForXMLData(xml);
     return dictionary ? jsonText(PropertyList(*dictionary), JsonStyle::compact) : "nil";
-}
-
-std::string gzipped(std::string_view text) {
-    z_stream stream{};
-    deflateInit2(&stream, 6, Z_DEFLATED, 31, 8, Z_DEFAULT_STRATEGY);
-    std::string out(text.size() + 100, '\0');
-    stream.next_in = reinterpret_cast<Bytef*>(const_cast<char*>(text.data()));
-    stream.avail_in = static_cast<uInt>(text.size());
-    stream.next_out = reinterpret_cast<Bytef*>(out.data());
-    stream.avail_out = static_cast<uInt>(out.size());
-    deflate(&stream, Z_FINISH);
-    out.resize(stream.total_out);
-    deflateEnd(&stream);
-    return out;
 }
 
 TEST(XmlToDictionaries, KeepsItsShapeAndQuirks) {

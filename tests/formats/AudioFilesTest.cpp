@@ -1,5 +1,4 @@
 #include "FormatsSupport.h"
-#include "formats/TGRTMetaDataReaderFactory.h"
 #include "formats/audiofile/TGRTAudioFileTypeValidator.h"
 #include "media/loopfile/LCFileParser.h"
 #include "media/loopfile/LCFileWriter.h"
@@ -16,6 +15,7 @@ namespace {
 
 using test::Caf;
 using test::Dictionary;
+using test::read;
 using test::TemporaryFolder;
 using test::textsOf;
 using test::urlOf;
@@ -41,11 +41,6 @@ std::string writeOldLoop(const TemporaryFolder& folder) {
     data->setDisplayName("Old");
     EXPECT_TRUE(LCFileWriter::fileWriterForURL(urlOf(path))->writeFileData(data));
     return path;
-}
-
-std::shared_ptr<TGRTMetaData> read(const std::string& path, std::uint64_t options = 0) {
-    return TGRTMetaDataReaderFactory::metaDataReaderForURL(urlOf(path))
-        ->readMetaDataFromURL(urlOf(path), options);
 }
 
 std::map<std::string, double> valuesOf(const TGRTMetaData& record) {

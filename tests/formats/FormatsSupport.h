@@ -1,5 +1,6 @@
 #pragma once
 
+#include "formats/TGRTMetaDataReaderFactory.h"
 #include "platform/base/ObjectSet.h"
 #include "platform/data/PropertyListFile.h"
 #include "platform/text/Url.h"
@@ -8,6 +9,8 @@
 #include "taxonomy/TGRTTaxonomy.h"
 #include "taxonomy/TaggingTypes.h"
 
+#include <cstdint>
+#include <memory>
 #include <optional>
 #include <set>
 #include <string>
@@ -20,6 +23,13 @@ using Dictionary = PropertyList::Dictionary;
 
 inline URL urlOf(const std::string& path) {
     return URL::fileURLWithPath(path);
+}
+
+/// The item's record, as the reader of its extension reads it.
+inline std::shared_ptr<TGRTMetaData> read(const std::string& path, std::uint64_t options = 0,
+                                          Error* error = nullptr) {
+    return TGRTMetaDataReaderFactory::metaDataReaderForURL(urlOf(path))
+        ->readMetaDataFromURL(urlOf(path), options, error);
 }
 
 /// Taggings of tags of the default taxonomy, or of new ones.

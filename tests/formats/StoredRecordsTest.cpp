@@ -2,7 +2,6 @@
 
 #include "FormatsSupport.h"
 #include "formats/TGRTFileNode.h"
-#include "formats/TGRTMetaDataReaderFactory.h"
 #include "formats/bundle/TGRTBundleTypeValidators.h"
 #include "formats/settings/TGRTBinaryFileMetaDataReader.h"
 #include "formats/settings/TGRTCstSxvPstTypeValidator.h"
@@ -18,6 +17,7 @@ namespace qvct {
 namespace {
 
 using test::Dictionary;
+using test::read;
 using test::TemporaryFolder;
 using test::textsOf;
 using test::urlOf;
@@ -25,12 +25,6 @@ using testing::ElementsAre;
 using testing::HasSubstr;
 
 const Dictionary kHouse = test::taggingDictionary("Genres", "House");
-
-std::shared_ptr<TGRTMetaData> read(const std::string& path, std::uint64_t options = 0,
-                                   Error* error = nullptr) {
-    return TGRTMetaDataReaderFactory::metaDataReaderForURL(urlOf(path))
-        ->readMetaDataFromURL(urlOf(path), options, error);
-}
 
 PropertyList::Dictionary stored(const std::string& path) {
     Error error;

@@ -1,9 +1,10 @@
+#include "platform/base/bytes/BytesAsText.h"
 #include "platform/files/reading/Decompression.h"
+#include "support/Compressed.h"
 
 #include <string>
 
 #include <gtest/gtest.h>
-#include <zlib.h>
 #include <zstd.h>
 
 namespace qvct {
@@ -15,26 +16,12 @@ Bytes bytesOf(std::string_view text) {
     return {text.begin(), text.end()};
 }
 
-Bytes deflated(const Bytes& plain, int windowBits) {
-    z_stream stream{};
-    deflateInit2(&stream, 9, Z_DEFLATED, windowBits, 8, Z_DEFAULT_STRATEGY);
-    Bytes out(deflateBound(&stream, plain.size()) + 32);
-    stream.next_in = const_cast<Bytef*>(plain.data());
-    stream.avail_in = static_cast<uInt>(plain.size());
-    stream.next_out = out.data();
-    stream.avail_out = static_cast<uInt>(out.size());
-    deflate(&stream, Z_FINISH);
-    out.resize(stream.total_out);
-    deflateEnd(&stream);
-    return out;
-}
-
 Bytes gzip(const Bytes& plain) {
-    return deflated(plain, 15 + 16);
+    return bytesOf(test::gzipped(textOf(plain)));
 }
 
 Bytes zlibStream(const Bytes& plain) {
-    return deflated(plain, 15);
+    return bytesOf(test::deflated(textOf(plain), 15));
 }
 
 Bytes zstandard(const Bytes& plain) {

@@ -1,5 +1,4 @@
 #include "../FormatsSupport.h"
-#include "formats/TGRTMetaDataReaderFactory.h"
 #include "formats/preset/PresetText.h"
 #include "formats/preset/TGRTVorthalPresetMetaDataWriter.h"
 #include "platform/files/FileAccess.h"
@@ -10,6 +9,7 @@
 namespace qvct {
 namespace {
 
+using test::read;
 using test::TemporaryFolder;
 using test::textsOf;
 using test::urlOf;
@@ -25,12 +25,6 @@ constexpr std::string_view kPreset =
     "<applicationinfo>\nAppIdentifier = org.a\nMinimumVersion = 1.0\nAppIdentifier = org.b\nLegacy = true\n"
     "</applicationinfo>\n"
     "<assetdependencies>\nPath = /b\nPath = /a\n</assetdependencies>\nCutoff 0.5";
-
-std::shared_ptr<TGRTMetaData> read(const std::string& path, std::uint64_t options = 0,
-                                   Error* error = nullptr) {
-    return TGRTMetaDataReaderFactory::metaDataReaderForURL(urlOf(path))
-        ->readMetaDataFromURL(urlOf(path), options, error);
-}
 
 TEST(Presets, ReadEverySection) {
     const TemporaryFolder folder;
