@@ -56,9 +56,9 @@ std::optional<Vocabulary> ContentDatabase::vocabulary(Error* error) {
             if (std::find(known.begin(), known.end(), category->identifier()) == known.end())
                 vocabulary.categories.push_back(category->identifier());
         }
-        vocabulary.labelsMeant = [thesaurus = std::shared_ptr<Thesaurus>()](std::string_view word) mutable {
+        vocabulary.tagMeant = [thesaurus = std::shared_ptr<Thesaurus>()](std::string_view word) mutable {
             if (!thesaurus) thesaurus = std::make_shared<Thesaurus>();
-            return thesaurus->labelsMeant(word);
+            return thesaurus->tagMeant(word);
         };
         return vocabulary;
     });

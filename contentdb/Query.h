@@ -1,5 +1,6 @@
 #pragma once
 
+#include "autotagging/names/Thesaurus.h"
 #include "contentdb/IndexedItem.h"
 #include "platform/base/Export.h"
 #include "platform/text/RegularExpression.h"
@@ -107,8 +108,8 @@ struct Vocabulary {
     std::vector<std::string> categories;
     /// Keys of numbers: "BeatCount".
     std::vector<std::string> numbers;
-    /// The labels of tags that people mean by a word: Kick by "bd". None where it is empty.
-    std::function<std::vector<std::string>(std::string_view word)> labelsMeant = {};
+    /// The tag that people mean by a word: Kick by "bd". None where it is empty.
+    std::function<std::optional<MeantTag>(std::string_view word)> tagMeant = {};
 };
 
 /// What is wrong with a query, and where.

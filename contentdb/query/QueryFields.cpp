@@ -68,10 +68,6 @@ std::vector<std::string> categoriesNamed(const std::string& bare, const Vocabula
     return result;
 }
 
-constexpr std::array<std::string_view, 12> kKeyTags = {
-    QVTagCKey,      QVTagCSharpKey, QVTagDKey,      QVTagDSharpKey, QVTagEKey,      QVTagFKey,
-    QVTagFSharpKey, QVTagGKey,      QVTagGSharpKey, QVTagAKey,      QVTagASharpKey, QVTagBKey};
-
 /// A note of any octave, and what stands behind it.
 struct Pitch {
     int step;  // semitones above C: -1 to 12
@@ -123,7 +119,7 @@ std::vector<std::string> keyLabels(std::string_view text) {
     const auto pitch = pitchAtBeginning(text);
     if (!pitch) return {};
     std::vector<std::string> labels = {
-        std::string(kKeyTags[static_cast<std::size_t>(pitch->step + 12) % kKeyTags.size()])};
+        std::string(QVTagsOfKeys[static_cast<std::size_t>(pitch->step + 12) % QVTagsOfKeys.size()])};
     const std::string rest = bareName(pitch->rest);
     if (rest == "m" || rest == "min" || rest == "minor") {
         labels.emplace_back(QVTagMinorKeyType);
@@ -151,7 +147,7 @@ bool isOfNotes(std::string_view field) {
 
 std::set<std::string> keyTerms() {
     std::set<std::string> terms;
-    for (const std::string_view label : kKeyTags)
+    for (const std::string_view label : QVTagsOfKeys)
         terms.insert(tagTerm(label, QVCategoryLoopSpecificsIdentifier));
     return terms;
 }
@@ -198,7 +194,7 @@ std::vector<std::string> textsInField(const IndexedItem& item, const Field& fiel
             for (const IndexedTagging& tagging : item.taggings) {
                 const bool isKey =
                     tagging.category == QVCategoryLoopSpecificsIdentifier &&
-                    std::find(kKeyTags.begin(), kKeyTags.end(), tagging.label) != kKeyTags.end();
+                    std::find(QVTagsOfKeys.begin(), QVTagsOfKeys.end(), tagging.label) != QVTagsOfKeys.end();
                 if (isKey) texts.push_back(tagging.label);
             }
             return texts;

@@ -169,10 +169,15 @@ class Parser {
     }
 
     void addMeant(const std::string& text, const std::string& category, AnyOf& any) const {
-        if (!vocabulary_.labelsMeant) return;
-        for (const std::string& label : vocabulary_.labelsMeant(text)) {
-            if (folded(label) != folded(text)) any.parts.push_back({TagMatch{folded(label), category}});
-        }
+        const auto meant = vocabulary_.tagMeant ? vocabulary_.tagMeant(text) : std::nullopt;
+        if (!meant || folded(meant->label) == folded(text)) return;
+        Condition tag{TagMatch{folded(meant->label), category}};
+        if (!meant->level) return any.parts.push_back(std::move(tag));
+        // On the side of the pole that the word names.
+        constexpr double kMiddle = 0.5;
+        NumberMatch side{levelField(meant->label), -kInfinity, kInfinity, true, true};
+        (*meant->level < kMiddle ? side.high : side.low) = kMiddle;
+        any.parts.push_back({AllOf{{std::move(tag), Condition{std::move(side)}}}});
     }
 
     static Condition oneOf(AnyOf any) {

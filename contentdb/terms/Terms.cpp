@@ -51,6 +51,16 @@ void addWords(const IndexedItem& item, std::vector<std::string>& terms) {
     }
 }
 
+/// Of a tag with two poles, "Bright / Dark", the one that its level is nearer to.
+std::string_view saidBy(const IndexedTagging& tagging) {
+    constexpr std::string_view kSlash = " / ";
+    constexpr float kMiddle = 0.5F;
+    const std::string_view label = tagging.label;
+    const std::size_t slash = label.find(kSlash);
+    if (slash == std::string_view::npos || !tagging.level) return label;
+    return *tagging.level < kMiddle ? label.substr(0, slash) : label.substr(slash + kSlash.size());
+}
+
 }  // namespace
 
 std::string term(TermKind kind, std::string_view value) {
@@ -104,7 +114,7 @@ std::string levelField(std::string_view label) {
 std::vector<std::string_view> textsOf(const IndexedItem& item) {
     std::vector<std::string_view> texts = {item.name, item.title, item.path};
     for (const IndexedTagging& tagging : item.taggings) {
-        texts.emplace_back(tagging.label);
+        texts.push_back(saidBy(tagging));
         for (const std::string& ancestor : tagging.ancestors) texts.emplace_back(ancestor);
     }
     return texts;

@@ -93,6 +93,7 @@ TEST(Names, AreReadAsPeopleWriteThem) {
         {"METLImpt Kick", {"Kick"}},
         {"metlimpt_Kick", {"Kick"}},
         {"Kick_METLImpt_Snare", {"Kick", "Snare"}},
+        {"80s Pad", {"80s", "Pad"}},
         {"dog bark 02", {"Sound Effects"}},
         {"Rainfall On Roof", {"Nature"}},
     };

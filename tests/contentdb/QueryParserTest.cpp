@@ -57,6 +57,7 @@ IndexedItem item() {
     result.fileType = 2;
     result.taggings = {{"Deep House", "Genres", {"House", "Electronic"}, {}, Provenance::stored, {}},
                        {"Warm", "Sound Descriptors", {}, 0.6F, Provenance::automatic, "keywords"},
+                       {"Soft / Hard", "Sound Descriptors", {}, 0.1F, Provenance::automatic, "sound"},
                        {"ASharp", "Loop Specifics", {"Key"}, {}, Provenance::virtualTag, {}},
                        {"Minor KeyType", "Loop Specifics", {"Key Type"}, {}, Provenance::virtualTag, {}}};
     result.values = {{"Tempo", 120.0}, {"BeatCount", 16.0}, {"Gain", -6.0}, {"Note", 59.0}};
@@ -90,6 +91,9 @@ TEST(QueryParser, UnderstandsWhatPeopleWrite) {
         {"-\"deep techno\"", true},
         {"kick,", false},
         {"ffiffi take", true},
+        {"soft", true},
+        {"hard", false},
+        {"tag:\"Soft / Hard\"", true},
         {"tag:house", true},
         {"tag:Hous", false},
         {"genre:electronic", true},

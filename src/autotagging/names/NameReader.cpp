@@ -11,10 +11,6 @@ namespace {
 
 constexpr std::string_view kService = "names";
 
-constexpr std::array<std::string_view, 12> kKeyLabels = {
-    QVTagCKey,      QVTagCSharpKey, QVTagDKey,      QVTagDSharpKey, QVTagEKey,      QVTagFKey,
-    QVTagFSharpKey, QVTagGKey,      QVTagGSharpKey, QVTagAKey,      QVTagASharpKey, QVTagBKey};
-
 /// Adds to a reading what one name says.
 class Claims {
   public:
@@ -32,7 +28,7 @@ class Claims {
     }
 
     void add(const NamedKey& key, double confidence) {
-        add(kKeyLabels[static_cast<std::size_t>(key.tonic)], key.offset, key.end, confidence);
+        add(QVTagsOfKeys[static_cast<std::size_t>(key.tonic)], key.offset, key.end, confidence);
         if (key.mode == NamedKey::Mode::unsaid) return;
         const bool isMajor = key.mode == NamedKey::Mode::major;
         add(isMajor ? QVTagMajorKeyType : QVTagMinorKeyType, key.offset, key.end, confidence);

@@ -155,7 +155,7 @@ void NameScan::addWordsIn(const Word& phrase, std::span<const NamePiece> pieces)
     if (category == QVCategoryGenresIdentifier) return;
     for (std::size_t i = 0; i < pieces.size(); ++i) {
         const Word word = habits_.wordAt(pieces.subspan(i, 1), buffer_);
-        if (word.meaning == Word::kNoMeaning) continue;
+        if (word.meaning == Word::kNoMeaning || pieces[i].text.size() == 1) continue;
         const std::string& its = habits_.meaning(word.meaning).category;
         if (its != category && its != QVCategoryGenresIdentifier)
             meant_.push_back({word, pieces[i].offset, pieces[i].end()});

@@ -128,16 +128,16 @@ NamingHabits::Word NamingHabits::nearWord(const NamePiece& piece) const {
     return word;
 }
 
-std::vector<std::string> NamingHabits::labelsMeant(std::string_view text) const {
+const NamedMeaning* NamingHabits::meaningOf(std::string_view text) const {
     NamePieces reader;
     std::string buffer;
     const auto pieces = reader.read(text);
-    if (pieces.empty()) return {};
+    if (pieces.empty()) return nullptr;
     Word word = wordAt(pieces, buffer);
     if (word.pieces == 0 && pieces.size() == 1) word = packedWords(pieces.front().folded).first;
     const bool isMeant = word.pieces == pieces.size() && word.meaning != Word::kNoMeaning &&
                          word.strength != NameStrength::hint;
-    return isMeant ? std::vector{meanings_[word.meaning].label} : std::vector<std::string>();
+    return isMeant ? &meanings_[word.meaning] : nullptr;
 }
 
 std::shared_ptr<const NamingHabits> NamingHabits::initWithDictionaries(

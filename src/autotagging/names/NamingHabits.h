@@ -117,8 +117,9 @@ class NamingHabits {
     /// misspelled ("harmnica"), or the one that it ends with ("hoarseorgan"). Without pieces when none.
     Word nearWord(const NamePiece& piece) const;
 
-    /// The labels that a whole text says plainly or by an abbreviation: Kick for "bd" and "bass drum".
-    std::vector<std::string> labelsMeant(std::string_view text) const;
+    /// What a whole text says plainly or by an abbreviation: Kick for "bd" and "bass drum". Null when it says
+    /// nothing.
+    const NamedMeaning* meaningOf(std::string_view text) const;
 
   private:
     struct Hash {

@@ -8,8 +8,10 @@ Thesaurus::Thesaurus() : habits_(NamingHabits::defaultHabits()) {}
 
 Thesaurus::~Thesaurus() = default;
 
-std::vector<std::string> Thesaurus::labelsMeant(std::string_view text) const {
-    return habits_->labelsMeant(text);
+std::optional<MeantTag> Thesaurus::tagMeant(std::string_view text) const {
+    const NamedMeaning* meaning = habits_->meaningOf(text);
+    if (meaning == nullptr) return std::nullopt;
+    return MeantTag{meaning->label, meaning->level};
 }
 
 }  // namespace qvct

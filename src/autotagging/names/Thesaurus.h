@@ -3,13 +3,19 @@
 #include "platform/base/Export.h"
 
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
-#include <vector>
 
 namespace qvct {
 
 class NamingHabits;
+
+/// A tag that a word stands for, with the level that it speaks of: 1 of Bright / Dark for "dark".
+struct MeantTag {
+    std::string label;
+    std::optional<double> level;
+};
 
 /// What people mean by a word, from the habits by which names are read.
 ///
@@ -23,8 +29,8 @@ class QVCT_API Thesaurus {
     Thesaurus(const Thesaurus&) = delete;
     Thesaurus& operator=(const Thesaurus&) = delete;
 
-    /// The labels that a word or phrase says plainly or by an abbreviation: Kick for "bd" and "bass drum".
-    std::vector<std::string> labelsMeant(std::string_view text) const;
+    /// The tag that a word or phrase says plainly or by an abbreviation: Kick for "bd" and "bass drum".
+    std::optional<MeantTag> tagMeant(std::string_view text) const;
 
   private:
     std::shared_ptr<const NamingHabits> habits_;
