@@ -1,36 +1,124 @@
 #include "GrooveRenderer.h"
 
-#include "media/audio/AudioDecoder.h"
+#include "Effects.h"
+#include "SynthSounds.h"
 
 #include <algorithm>
 #include <cmath>
-#include <filesystem>
-#include <numbers>
 #include <random>
 
 namespace qvct::bench {
 namespace {
 
 constexpr double kOneOnset = 0.030;  // seconds
-constexpr double kLead = 0.25;       // silence before the first note
-constexpr double kTau = 2 * std::numbers::pi;
 
-// The file at kRate, mono, by linear interpolation; a kit's sounds need no better.
-std::vector<float> loadSound(const std::string& path) {
-    const auto decoder = AudioDecoder::open(path);
-    if (!decoder) return {};
-    const auto channels = static_cast<std::size_t>(decoder->channels());
-    std::vector<float> frames(static_cast<std::size_t>(decoder->frames()) * channels);
-    frames.resize(decoder->read(frames) * channels);
-    const double step = double(decoder->sampleRate()) / kRate;
-    std::vector<float> sound;
-    for (double at = 0; (static_cast<std::size_t>(at) + 2) * channels <= frames.size(); at += step) {
-        const auto i = static_cast<std::size_t>(at);
-        const auto part = static_cast<float>(at - double(i));
-        sound.push_back(frames[i * channels] * (1 - part) + frames[(i + 1) * channels] * part);
+constexpr double kForever = 1e9;
+
+/// Mixes a sound so that its attack comes at a time, `speed` times as fast, faded out from `end` on.
+void mix(std::vector<float>& samples, const Sound& sound, double time, float gain, double speed = 1,
+         double end = kForever) {
+    constexpr double kFade = 0.015;
+    const auto start = std::lround(time * kRate - double(sound.attack) / speed);
+    for (std::size_t i = 0;; ++i) {
+        const double at = double(i) * speed;
+        const auto from = static_cast<std::size_t>(at);
+        const long to = start + static_cast<long>(i);
+        if (from + 1 >= sound.samples.size() || to >= static_cast<long>(samples.size())) return;
+        if (to < 0) continue;
+        const auto part = static_cast<float>(at - double(from));
+        const float sample = sound.samples[from] * (1 - part) + sound.samples[from + 1] * part;
+        const double left = 1 - (double(to) / kRate - end) / kFade;
+        if (left <= 0) return;
+        samples[static_cast<std::size_t>(to)] += gain * sample * static_cast<float>(std::min(left, 1.0));
     }
-    return sound;
 }
+
+struct TimedNote {
+    double time;
+    int pitch, velocity;
+};
+
+std::vector<TimedNote> playedNotes(const MidiSequence& groove, const Setting& setting, double seconds) {
+    std::vector<TimedNote> notes;
+    for (const MidiNote& note : groove.tracks().at(0).notes) {
+        const double time = kLead + beatsToSeconds(groove, note.start) / setting.tempoFactor;
+        if (time <= seconds) notes.push_back({time, note.pitch, note.velocity});
+    }
+    std::stable_sort(notes.begin(), notes.end(),
+                     [](const TimedNote& a, const TimedNote& b) { return a.time < b.time; });
+    return notes;
+}
+
+bool isHat(int pitch) {
+    return pitch == 22 || pitch == 26 || pitch == 42 || pitch == 44 || pitch == 46;
+}
+
+// A crash with each fourth kick, and softer strokes on a ride for those on the hi-hat.
+std::vector<TimedNote> washed(const std::vector<TimedNote>& notes) {
+    constexpr int kKick = 36, kCrash = 49, kRide = 51;
+    std::vector<TimedNote> result;
+    int kicks = 0;
+    for (TimedNote note : notes) {
+        if (isHat(note.pitch)) note.pitch = kRide;
+        result.push_back(note);
+        if (note.pitch == kKick && kicks++ % 4 == 0) result.push_back({note.time, kCrash, note.velocity});
+    }
+    return result;
+}
+
+void playDrums(const std::vector<TimedNote>& notes, const Kit& kit, std::vector<float>& samples) {
+    for (std::size_t i = 0; i < notes.size(); ++i) {
+        const TimedNote& note = notes[i];
+        const Stroke stroke = kit.strokeFor(note.pitch, note.velocity, i);
+        if (!stroke.sound) continue;
+        const auto next = std::find_if(
+            notes.begin() + static_cast<std::ptrdiff_t>(i) + 1, notes.end(), [&](const TimedNote& later) {
+                return later.time > note.time && kit.chokes(later.pitch, note.pitch);
+            });
+        mix(samples, *stroke.sound, note.time, stroke.gain, 1, next == notes.end() ? kForever : next->time);
+    }
+}
+
+std::vector<TimedNote> melodyOf(const std::vector<TimedNote>& notes) {
+    constexpr int kSoftest = 50;
+    constexpr double kShortest = 0.1;
+    std::vector<TimedNote> melody;
+    for (const TimedNote& note : notes) {
+        if (note.velocity < kSoftest) continue;
+        if (melody.empty() || note.time - melody.back().time > kShortest) melody.push_back(note);
+    }
+    return melody;
+}
+
+void playMelody(const std::vector<TimedNote>& notes, const std::vector<Sound>& sounds,
+                std::vector<float>& samples) {
+    std::mt19937 random(static_cast<unsigned>(notes.size()));
+    std::uniform_real_distribution<double> cents(-50, 50);
+    for (std::size_t i = 0; i < notes.size(); ++i) {
+        const Sound& sound = sounds[random() % sounds.size()];
+        const double end = i + 1 < notes.size() ? notes[i + 1].time : kForever;
+        const auto gain = static_cast<float>(0.5 * std::pow(notes[i].velocity / 127.0, 1.5));
+        mix(samples, sound, notes[i].time, gain, std::exp2(cents(random) / 1200), end);
+    }
+}
+
+std::vector<double> mergedOnsets(const std::vector<TimedNote>& notes) {
+    std::vector<double> onsets;
+    for (const TimedNote& note : notes) {
+        if (onsets.empty() || note.time - onsets.back() > kOneOnset) onsets.push_back(note.time);
+    }
+    return onsets;
+}
+
+void change(std::vector<float>& samples, const Setting& setting) {
+    if (setting.roomSeconds > 0) addRoom(samples, setting.roomSeconds);
+    if (setting.bassAndPad) addPad(samples);
+    if (setting.whiteDb < 0) addWhiteNoise(samples, setting.whiteDb);
+    if (setting.pinkDb < 0) addPinkNoise(samples, setting.pinkDb);
+    if (setting.lowPassHertz > 0) lowPass(samples, setting.lowPassHertz);
+}
+
+}  // namespace
 
 double beatsToSeconds(const MidiSequence& groove, double beat) {
     double seconds = 0, from = 0, bpm = 120;
@@ -43,154 +131,26 @@ double beatsToSeconds(const MidiSequence& groove, double beat) {
     return seconds + (beat - from) * 60 / bpm;
 }
 
-void mix(std::vector<float>& samples, const std::vector<float>& sound, double time, float gain) {
-    const auto start = static_cast<std::size_t>(std::lround(time * kRate));
-    for (std::size_t i = 0; i < sound.size() && start + i < samples.size(); ++i) {
-        samples[start + i] += gain * sound[i];
-    }
-}
-
-std::vector<float> bassNote(double hertz) {
-    std::vector<float> note(static_cast<std::size_t>(0.4 * kRate));
-    for (std::size_t i = 0; i < note.size(); ++i) {
-        const double t = double(i) / kRate;
-        const double envelope = std::min(1.0, t / 0.004) * std::exp(-4 * t) * std::min(1.0, (0.4 - t) / 0.05);
-        note[i] = static_cast<float>(envelope *
-                                     (std::sin(kTau * hertz * t) + 0.3 * std::sin(kTau * 2 * hertz * t)));
-    }
-    return note;
-}
-
-// Chords that swell in and out over two seconds, with a little vibrato: nothing in them is an onset.
-void addPad(std::vector<float>& samples) {
-    constexpr double kChord[] = {220, 277.2, 329.6, 440};
-    for (std::size_t i = 0; i < samples.size(); ++i) {
-        const double t = double(i) / kRate;
-        double sum = 0;
-        for (const double hertz : kChord) {
-            for (int partial = 1; partial <= 5; ++partial) {
-                sum +=
-                    std::sin(kTau * hertz * partial * t + 0.5 * partial * std::sin(kTau * 5 * t)) / partial;
-            }
-        }
-        samples[i] += static_cast<float>(0.01 * (1 - std::cos(kTau * t / 2)) * sum);
-    }
-}
-
-void addNoise(std::vector<float>& samples, double decibels) {
-    std::mt19937 random(1);
-    std::normal_distribution<float> noise(0, static_cast<float>(std::pow(10, decibels / 20)));
-    for (float& sample : samples) sample += noise(random);
-}
-
-// A diffuse tail of sparse random pulses ("velvet noise") that begins 5 ms after the sound.
-void addRoom(std::vector<float>& samples, double seconds) {
-    std::mt19937 random(2);
-    std::vector<float> wet(samples.size());
-    constexpr std::size_t kSpacing = kRate / 1000;
-    for (std::size_t slot = kRate / 200; slot < static_cast<std::size_t>(seconds * kRate); slot += kSpacing) {
-        const std::size_t delay = slot + random() % kSpacing;
-        const double gain = 0.05 * std::pow(10, -3 * double(delay) / kRate / seconds);
-        const auto signedGain = static_cast<float>(random() % 2 ? gain : -gain);
-        for (std::size_t i = delay; i < samples.size(); ++i) wet[i] += signedGain * samples[i - delay];
-    }
-    for (std::size_t i = 0; i < samples.size(); ++i) samples[i] += wet[i];
-}
-
-std::vector<double> mergedOnsets(std::vector<double> times) {
-    std::sort(times.begin(), times.end());
-    std::vector<double> onsets;
-    for (const double time : times) {
-        if (onsets.empty() || time - onsets.back() > kOneOnset) onsets.push_back(time);
-    }
-    return onsets;
-}
-
-}  // namespace
-
-std::optional<Kit> Kit::load(const std::string& folder) {
-    // The first part of a file name that is found plays the sound; machines without it borrow the next best.
-    static constexpr const char* kNames[kSoundCount][4] = {
-        {"kick-accent", "kick.", "kick", ""},      {"snare-accent", "snare-m", "snare.", "snare"},
-        {"rim", "stick-m", "clave", ""},           {"hihat-closed.", "hihat-closed", "hihat.", ""},
-        {"hihat-open", "hihat-metal", "", ""},     {"tom-l.", "conga-l", "tom.", ""},
-        {"tom-h.", "bongo-h", "tom.", ""},         {"crash", "cymball-long", "cymbal", ""},
-        {"ride", "cymball-short", "tamb-long", ""}};
-    std::vector<std::string> files;
-    for (const auto& entry : std::filesystem::directory_iterator(folder))
-        files.push_back(entry.path().string());
-    std::sort(files.begin(), files.end());
-    Kit kit;
-    for (std::size_t sound = 0; sound < kSoundCount; ++sound) {
-        for (const char* name : kNames[sound]) {
-            const auto file = std::find_if(files.begin(), files.end(), [&](const std::string& path) {
-                return *name && path.find(name, folder.size()) != std::string::npos;
-            });
-            if (file == files.end() || !kit.sounds_[sound].empty()) continue;
-            kit.sounds_[sound] = loadSound(*file);
-        }
-    }
-    if (kit.sounds_[kKick].empty() || kit.sounds_[kSnare].empty() || kit.sounds_[kClosedHat].empty())
-        return {};
-    return kit;
-}
-
-const std::vector<float>& Kit::soundFor(int pitch) const {
-    switch (pitch) {
-        case 35:
-        case 36:
-            return sounds_[kKick];
-        case 37:
-            return sounds_[kRim];
-        case 22:
-        case 42:
-        case 44:
-            return sounds_[kClosedHat];
-        case 26:
-        case 46:
-            return sounds_[kOpenHat];
-        case 41:
-        case 43:
-        case 45:
-        case 58:
-            return sounds_[kLowTom];
-        case 47:
-        case 48:
-        case 50:
-            return sounds_[kHighTom];
-        case 49:
-        case 52:
-        case 55:
-        case 57:
-            return sounds_[kCrash];
-        case 51:
-        case 53:
-        case 59:
-            return sounds_[kRide];
-        default:
-            return sounds_[kSnare];
-    }
-}
-
-Rendering render(const MidiSequence& groove, const Kit& kit, const Setting& setting, double seconds) {
+Rendering render(const MidiSequence& groove, const Band& band, const Setting& setting, double seconds) {
     Rendering rendering;
     rendering.samples.assign(static_cast<std::size_t>((seconds + 1) * kRate), 0);
-    const std::vector<float> bass = bassNote(55);
-    std::vector<double> times;
-    for (const MidiNote& note : groove.tracks().at(0).notes) {
-        const double time = kLead + beatsToSeconds(groove, note.start) / setting.tempoFactor;
-        if (time > seconds) continue;
-        const auto gain = static_cast<float>(std::pow(note.velocity / 127.0, 1.5));
-        mix(rendering.samples, kit.soundFor(note.pitch), time, 0.5F * gain);
-        if (setting.bassAndPad && note.pitch == 36) mix(rendering.samples, bass, time, 0.2F);
-        times.push_back(time);
+    std::vector<TimedNote> notes = playedNotes(groove, setting, seconds);
+    if (setting.player == Setting::kMelody) {
+        notes = melodyOf(notes);
+        playMelody(notes, *band.notes, rendering.samples);
+    } else {
+        playDrums(setting.wash ? washed(notes) : notes, *band.kit, rendering.samples);
     }
-    rendering.onsets = mergedOnsets(times);
-    const double end = rendering.onsets.empty() ? 0 : rendering.onsets.back() + 1;
+    if (setting.bassAndPad) {
+        const Sound bass = bassNote(55);
+        for (const TimedNote& note : notes)
+            if (note.pitch == 36) mix(rendering.samples, bass, note.time, 0.2F);
+    }
+    rendering.onsets = mergedOnsets(notes);
+    const double tail = setting.cutSeconds > 0 ? setting.cutSeconds : 1;
+    const double end = rendering.onsets.empty() ? 0 : rendering.onsets.back() + tail;
     rendering.samples.resize(std::min(rendering.samples.size(), static_cast<std::size_t>(end * kRate)));
-    if (setting.roomSeconds > 0) addRoom(rendering.samples, setting.roomSeconds);
-    if (setting.bassAndPad) addPad(rendering.samples);
-    if (setting.noiseDb < 0) addNoise(rendering.samples, setting.noiseDb);
+    change(rendering.samples, setting);
     return rendering;
 }
 

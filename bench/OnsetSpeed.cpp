@@ -15,11 +15,11 @@ namespace qvct::bench {
 namespace {
 
 std::vector<float> stereoGrooves(const DrumCorpus& corpus, double minutes) {
-    const Setting plain{"dry", 1, 0, 0, false, 0};
+    const Setting plain{.name = "dry"};
     const auto samples = static_cast<std::size_t>(minutes * 60 * kRate) * 2;
     std::vector<float> stereo;
     for (std::size_t i = 0; stereo.size() < samples; i = (i + 1) % corpus.grooves.size()) {
-        for (const float sample : render(corpus.grooves[i], corpus.kitFor(i, plain), plain, 60).samples) {
+        for (const float sample : corpus.render(i, plain, 60).samples) {
             stereo.push_back(sample);
             stereo.push_back(0.8F * sample);
         }

@@ -242,6 +242,8 @@ TEST(RhythmCommand, ReadsTheNotesInALoopAndListensToOthers) {
     EXPECT_EQ(sound["tempo"], 174.0);
     EXPECT_GE(sound["onsets"].size(), 8U);
     expectSound(sound, "wav");
+    EXPECT_EQ(notes["accentedComplexity"], json());
+    EXPECT_NE(sound["accentedComplexity"], sound["complexity"]) << "its strokes are not equally loud";
     for (const json& onset : sound["onsets"]) {
         const double sixteenths = onset.get<double>() * 4;
         EXPECT_NEAR(sixteenths, std::round(sixteenths), 0.15) << "breaks are played on sixteenths";
@@ -255,6 +257,7 @@ TEST(RhythmCommand, AsksForTheLengthThatASoundDoesNotTell) {
     EXPECT_EQ(unknown.status, 1);
     EXPECT_THAT(unknown.errors, HasSubstr("c.wav: its length in beats is unknown; say --beats or --tempo"));
     const json told = rhythm({file, "--beats", "4"}).json()[0];
+    EXPECT_EQ(told["accentedComplexity"], told["complexity"]) << "clicks are equally loud";
     EXPECT_EQ(told["tempo"], 120.0) << "four beats in two seconds";
     ASSERT_EQ(told["onsets"].size(), 3U);
     for (std::size_t i = 0; i < 3; ++i) EXPECT_NEAR(told["onsets"][i], 0.5 + static_cast<double>(i), 0.01);

@@ -90,10 +90,86 @@ TEST(OnsetDetector, TheEndOfASoundIsNoOnset) {
     EXPECT_NEAR(double(onsets[0]), 5000, 200);
 }
 
+std::vector<float> sine(double hertz, double phase, std::size_t frames) {
+    std::vector<float> samples(frames);
+    for (std::size_t i = 0; i < frames; ++i) {
+        const double turn = 2 * std::numbers::pi * hertz / 44100;
+        samples[i] = static_cast<float>(0.5 * std::sin(turn * double(i) + phase));
+    }
+    return samples;
+}
+
+TEST(OnsetDetector, AnEndWithinASoundIsNoOnset) {
+    for (int i = 0; i < 16; ++i) {
+        const Onsets onsets = onsetsOf(sine(60 * std::pow(1.4, i), 0.4 * i, 22050), 44100);
+        EXPECT_TRUE(onsets.empty() || onsets.back() < 4410) << i << ": " << onsets.back();
+    }
+    // A stroke shortly before the end is one nevertheless, also over the tail of another.
+    EXPECT_EQ(onsetsOf(bursts({0.1, 0.34, 0.39}, 0.4, 44100), 44100).size(), 3U);
+    EXPECT_EQ(onsetsOf(bursts({0}, 0.02, 44100), 44100).size(), 1U);
+}
+
+// White, or with the same energy in each octave.
+std::vector<float> noise(bool pink, unsigned seed, std::size_t frames) {
+    std::minstd_rand random(seed);
+    std::uniform_real_distribution<float> white(-0.5F, 0.5F);
+    std::vector<float> samples(frames);
+    float octaves[10] = {};
+    for (std::size_t i = 0; i < frames; ++i) {
+        float sum = 0;
+        for (int octave = 0; octave < 10; ++octave) {  // low-passes from 20 Hz to 10 kHz, equally loud
+            const float turn = 0.00285F * static_cast<float>(1 << octave);
+            const float share = turn / (1 + turn);
+            octaves[octave] += share * (white(random) / std::sqrt(share) - octaves[octave]);
+            sum += octaves[octave];
+        }
+        samples[i] = pink ? 0.3F * sum : white(random);
+    }
+    return samples;
+}
+
+TEST(OnsetDetector, NothingBeginsWithinNoise) {
+    for (const bool pink : {false, true}) {
+        for (unsigned seed = 1; seed <= 3; ++seed) {
+            const Onsets onsets = onsetsOf(noise(pink, seed, 30 * 44100), 44100);
+            EXPECT_TRUE(onsets.empty() || onsets.back() < 4410)
+                << pink << ", " << seed << ": " << onsets.back();
+        }
+    }
+}
+
+// Strokes of sharp hiss, softer than the crash that decays below them.
+TEST(OnsetDetector, SoftRideStrokesAreHeardOverACrash) {
+    std::vector<float> samples = noise(true, 1, 2 * 44100);
+    for (std::size_t i = 0; i < samples.size(); ++i)
+        samples[i] *= static_cast<float>(std::exp(-3 * double(i) / 44100));
+    const std::vector<double> times = {0.4, 0.6, 0.7, 1, 1.2, 1.5};
+    std::vector<float> ride = bursts(times, 2, 44100);
+    for (std::size_t i = ride.size() - 1; i > 1; --i)
+        samples[i] += 0.1F * (ride[i] - 2 * ride[i - 1] + ride[i - 2]);
+    const Onsets onsets = onsetsOf(samples, 44100);
+    ASSERT_EQ(onsets.size(), times.size() + 1);
+    for (std::size_t i = 0; i < times.size(); ++i)
+        EXPECT_NEAR(double(onsets[i + 1]) / 44100, times[i], 0.005);
+}
+
+TEST(OnsetDetector, LoudnessGrowsWithTheAmplitude) {
+    auto samples = bursts({0.2, 0.6, 1}, 1.4, 44100);
+    for (std::size_t i = 22050; i < samples.size(); ++i) samples[i] *= i < 39690 ? 0.5F : 0.25F;
+    OnsetDetector detector(44100, 1);
+    detector.process(samples);
+    const std::vector<Onset> onsets = detector.finishWithLoudness();
+    EXPECT_EQ(framesOf(onsets), onsetsOf(samples, 44100));
+    ASSERT_EQ(onsets.size(), 3U);
+    EXPECT_NEAR(onsets[1].loudness / onsets[0].loudness, std::pow(0.5, 0.3), 0.05);
+    EXPECT_NEAR(onsets[2].loudness / onsets[0].loudness, std::pow(0.25, 0.3), 0.05);
+}
+
 TEST(OnsetDetector, AFlamIsOneOnsetAtItsFirstStroke) {
     const Onsets onsets = onsetsOf(bursts({0.5, 0.52}, 1, 44100), 44100);
     ASSERT_EQ(onsets.size(), 1U);
     EXPECT_NEAR(double(onsets[0]) / 44100, 0.5, 0.005);
+    EXPECT_EQ(onsetsOf(bursts({0.5, 0.55}, 1, 44100), 44100).size(), 2U);
 }
 
 TEST(OnsetDetector, SurvivesSamplesThatAreNoNumbersAndOddRates) {

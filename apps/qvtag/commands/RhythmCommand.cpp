@@ -2,14 +2,13 @@
 #include "commands/Commands.h"
 #include "operations/RhythmMeasurement.h"
 #include "output/StandardStreams.h"
+#include "output/pictures/PlotFile.h"
 #include "platform/files/FileAccess.h"
 #include "platform/text/Text.h"
 
 #include <bit>
 #include <charconv>
 #include <cmath>
-#include <filesystem>
-#include <fstream>
 #include <memory>
 
 #include <fmt/format.h>
@@ -55,6 +54,7 @@ Json jsonOf(const std::string& path, const RhythmResult& result) {
     json["beatCount"] = result.beatCount;
     json["tempo"] = rounded(result.tempo);
     json["signature"] = fmt::format("{}/{}", result.signatureTop, result.signatureBottom);
+    json["accentedComplexity"] = result.accentedComplexity ? Json(*result.accentedComplexity) : Json();
     json["reasonForZero"] = result.reasonForZero.empty() ? Json() : Json(result.reasonForZero);
     json["allTracks"] = Json();
     if (const auto& all = result.allTracks)
@@ -77,33 +77,11 @@ void printRow(const std::string& path, const RhythmResult& result) {
           bar(result.complexity), static_cast<double>(result.complexity) * 100, result.onsets.size(),
           result.beatCount, result.signatureTop, result.signatureBottom, rounded(result.tempo));
     if (!result.reasonForZero.empty()) print("  complexity 0%: {}\n", result.reasonForZero);
+    if (const auto accented = result.accentedComplexity)
+        print("  complexity with its accents {:.0f}%\n", double{*accented} * 100);
     if (const auto& all = result.allTracks)
         print("  first of {} tracks; all together: density {:.0f}%, complexity {:.0f}%\n", all->count,
               double{all->density} * 100, double{all->complexity} * 100);
-}
-
-bool beginsLikeSvg(const std::string& path) {
-    if (!isRegularFile(path)) return false;
-    std::string start(5, '\0');
-    std::ifstream(path, std::ios::binary).read(start.data(), static_cast<std::streamsize>(start.size()));
-    return start.starts_with("<svg") || start == "<?xml";
-}
-
-/// Why a picture must not be put there, since something else would be lost; not set when it may.
-Error problemOfPlot(const std::string& target, const std::vector<std::string>& inputs) {
-    namespace fs = std::filesystem;
-    std::error_code ignored;
-    if (!fs::exists(target, ignored)) return {};
-    for (const std::string& input : inputs) {
-        if (fs::equivalent(target, input, ignored))
-            return errorOf(kErrorInvalidArgument,
-                           "is one of the files to be measured; the picture would overwrite it", {target});
-    }
-    const bool isSvg =
-        URL::fileURLWithPath(target).lowercasePathExtension() == "svg" && beginsLikeSvg(target);
-    return isSvg ? Error{}
-                 : errorOf(kErrorInvalidArgument, "exists and is not an SVG file; it is not overwritten",
-                           {target});
 }
 
 void writePlot(const Options& options, const RhythmResult& result, ToolContext& context) {

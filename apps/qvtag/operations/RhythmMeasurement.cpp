@@ -186,9 +186,12 @@ std::optional<RhythmResult> measureAudio(ItemFile& file, Metre metre, const Rhyt
         return std::nullopt;
     }
     if (metre.tempo == 0) metre.tempo = metre.beats / minutes / metre.beatsPerQuarter();
-    auto result =
-        measured(url, notesOfOnsets(OnsetDetector::detect(*decoder), frames, metre.beats), 1, metre, error);
-    if (result) result->plot.waveform = waveformOf(file);
+    const auto onsets = OnsetDetector::detectWithLoudness(*decoder);
+    auto result = measured(url, notesOfOnsets(framesOf(onsets), frames, metre.beats), 1, metre, error);
+    if (!result) return result;
+    const auto accented = accentedNotesOfOnsets(onsets, frames, metre.beats);
+    result->accentedComplexity = analysisOf(accented, metre.ofLoop())->computeRhythmicComplexity();
+    result->plot.waveform = waveformOf(file);
     return result;
 }
 

@@ -2,7 +2,7 @@
 
 #include "formats/ItemFile.h"
 #include "listening/rhythm/QVCTMidiAnalysis.h"
-#include "output/RhythmPlot.h"
+#include "output/pictures/RhythmPlot.h"
 #include "platform/base/Error.h"
 
 #include <cstdint>
@@ -27,6 +27,8 @@ struct RhythmResult {
     // What the tagging service gives a loop of these notes, tempo, length and signature.
     float density = 0;
     float complexity = 0;
+    /// The complexity of a sound whose onsets are as loud as they are heard; nothing for MIDI.
+    std::optional<float> accentedComplexity;
     std::string reasonForZero;   ///< Why the complexity is 0; empty where it is not.
     std::vector<double> onsets;  ///< Beats.
     std::int32_t beatCount = 0;

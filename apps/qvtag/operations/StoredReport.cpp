@@ -1,8 +1,10 @@
 #include "operations/StoredReport.h"
 
 #include "contentdb/Explanation.h"
+#include "platform/text/Decimal.h"
 
 #include <memory>
+#include <optional>
 #include <utility>
 
 namespace qvct::tool {
@@ -14,8 +16,15 @@ std::shared_ptr<TGRTTag> tagOf(const IndexedTagging& tagging, TGRTTaxonomy& taxo
     return taxonomy.findOrCreateTagWithLabel(tagging.label, tagging.category);
 }
 
+/// As it was before it was stored in single precision.
+std::optional<double> levelOf(const IndexedTagging& tagging) {
+    if (!tagging.level) return std::nullopt;
+    return decimalOf(double{*tagging.level});
+}
+
 std::shared_ptr<TGRTTagging> taggingOf(const IndexedTagging& its, TGRTTaxonomy& taxonomy) {
-    const auto level = its.level ? TGRTLevel::levelWithWeight(*its.level) : nullptr;
+    const auto weight = levelOf(its);
+    const auto level = weight ? TGRTLevel::levelWithWeight(*weight) : nullptr;
     auto tagging = TGRTTagging::initWithTag(tagOf(its, taxonomy), level);
     if (tagging) tagging->setIsAutoTagging(its.isAuto);
     return tagging;
@@ -38,7 +47,7 @@ ExplainedItem storedReport(const IndexedItem& item, TGRTTaxonomy& taxonomy) {
     for (Explanation::Held& held : explanation.held) {
         const IndexedTagging& its = item.taggings[held.tagging];
         explained.report.resolution.held.push_back(
-            {tagOf(its, taxonomy), its.level, held.confidence, std::move(held.claims)});
+            {tagOf(its, taxonomy), levelOf(its), held.confidence, std::move(held.claims)});
     }
     return explained;
 }

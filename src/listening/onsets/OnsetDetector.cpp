@@ -20,6 +20,10 @@ constexpr std::size_t kSide = 3;      // sums before and after a rise
 constexpr double kGround = 0.02;      // differences below this share of the mean energy do not count
 constexpr double kBeside = 0.010;     // seconds before and after an onset that are compared
 constexpr double kLoss = 0.78;        // share of the energy that remains, at least, at an onset
+constexpr double kGain = 2;           // factor by which it grows, at least, in a window that the end cuts
+constexpr double kFirst = 0.015;      // seconds of which the loudness is measured
+constexpr double kLoudness = 0.3;     // power of the amplitude with which it grows
+constexpr double kFlam = 0.025;       // seconds within which strokes are one
 constexpr double kSilence = 0.001;    // less than this share of the energy to come is silence
 constexpr std::size_t kBlock = 4096;  // frames
 
@@ -36,8 +40,10 @@ class OnsetDetector::Analyser {
           step_(std::max<std::size_t>(1, static_cast<std::size_t>(rate_ * kStep))),
           reach_(static_cast<std::size_t>(rate_ * kReach) / step_),
           beside_(static_cast<std::size_t>(rate_ * kBeside)),
+          flam_(static_cast<std::int64_t>(sampleRate * kFlam)),
+          first_(std::max<std::size_t>(1, static_cast<std::size_t>(rate_ * kFirst))),
           kept_((picker_.delay() + 2 * SpectralFlux::kTogether) * flux_.hop() + flux_.windowSize() +
-                2 * (reach_ + kSide + 1) * step_ + 2 * beside_),
+                2 * (reach_ + kSide + 1) * step_ + beside_ + first_),
           nextFrame_(kept_ + flux_.hop()),
           origin_(-static_cast<std::int64_t>(kept_)) {}
 
@@ -52,9 +58,10 @@ class OnsetDetector::Analyser {
         }
     }
 
-    std::vector<std::int64_t> finish() {
-        // The last sample is repeated until the last frame is judged, so that the end itself is no onset.
-        mixed_.assign(kept_, samples_.empty() ? 0 : samples_.back());
+    std::vector<Onset> finish() {
+        // The signal goes on backwards until its last frame is judged, so that an end within a sound is no
+        // onset.
+        mixed_.assign(samples_.rbegin(), samples_.rend());
         append();
         return std::move(onsets_);
     }
@@ -78,13 +85,15 @@ class OnsetDetector::Analyser {
     }
 
     void add(std::int64_t frame) {
-        const std::int64_t middle = (frame + 1) * static_cast<std::int64_t>(flux_.hop()) -
-                                    static_cast<std::int64_t>(flux_.windowSize() / 2);
+        const auto half = static_cast<std::int64_t>(flux_.windowSize() / 2);
+        const std::int64_t middle = (frame + 1) * static_cast<std::int64_t>(flux_.hop()) - half;
         const std::int64_t attack = attackNear(pastSilence(middle));
-        if (!bringsEnergy(attack)) return;
-        const std::int64_t onset =
-            std::max<std::int64_t>(0, attack * static_cast<std::int64_t>(mixer_.factor()));
-        if (onset < length_ && (onsets_.empty() || onset > onsets_.back())) onsets_.push_back(onset);
+        const auto factor = static_cast<std::int64_t>(mixer_.factor());
+        const bool cut = (middle + half) * factor > length_;
+        if (middle * factor >= length_ || !bringsEnergy(attack, cut)) return;
+        const std::int64_t onset = std::max<std::int64_t>(0, attack * factor);
+        const std::int64_t apart = onsets_.empty() ? onset + 1 + flam_ : onset - onsets_.back().frame;
+        if (onset < length_ && apart > flam_) onsets_.push_back({onset, loudnessAt(attack)});
     }
 
     struct Energy {
@@ -103,12 +112,23 @@ class OnsetDetector::Analyser {
     }
 
     /// Whether the signal or its slope, which weighs high tones more, keeps its energy: a sound that is cut
-    /// off scatters over the spectrum like an onset, but leaves less than was there.
-    bool bringsEnergy(std::int64_t attack) const {
+    /// off scatters over the spectrum like an onset, but leaves less than was there. In a window that the end
+    /// of the signal cuts both have to grow.
+    bool bringsEnergy(std::int64_t attack, bool cut) const {
         const auto at = static_cast<std::size_t>(attack - origin_);
         const Energy before = energyOf(at - beside_, at);
         const Energy after = energyOf(at, at + beside_);
+        if (cut) return after.signal >= kGain * before.signal && after.slope >= kGain * before.slope;
         return after.signal >= kLoss * before.signal || after.slope >= kLoss * before.slope;
+    }
+
+    /// Signal and slope count alike, as a hi-hat has little energy beside a kick that sounds as loud; the
+    /// power was found by comparing with the velocities that drummers played.
+    float loudnessAt(std::int64_t attack) const {
+        const auto at = static_cast<std::size_t>(attack - origin_);
+        const Energy energy = energyOf(at, at + first_);
+        const double power = std::sqrt(energy.signal * energy.slope) / static_cast<double>(first_);
+        return static_cast<float>(std::pow(power, kLoudness / 2));
     }
 
     /// A sound out of silence shows in the spectrum as soon as the window touches it, when its attack may be
@@ -155,14 +175,23 @@ class OnsetDetector::Analyser {
     OnsetPicker picker_;
     std::size_t step_, reach_;  // samples of one sum; sums by which an onset may be moved
     std::size_t beside_;        // samples on each side that are compared
+    std::int64_t flam_;         // frames that onsets are apart, at least
+    std::size_t first_;         // samples of which the loudness is measured
     std::size_t kept_;          // samples that stay for the next window and for moving peaks
     std::size_t nextFrame_;     // end of the next window in samples_
     std::int64_t origin_;       // position of samples_[0] in the mixed signal
     std::int64_t length_ = 0;   // frames
     std::vector<float> samples_, mixed_;
     std::vector<double> energies_;
-    std::vector<std::int64_t> onsets_;
+    std::vector<Onset> onsets_;
 };
+
+std::vector<std::int64_t> framesOf(const std::vector<Onset>& onsets) {
+    std::vector<std::int64_t> frames;
+    frames.reserve(onsets.size());
+    for (const Onset& onset : onsets) frames.push_back(onset.frame);
+    return frames;
+}
 
 OnsetDetector::OnsetDetector(double sampleRate, int channels)
     : analyser_(std::make_unique<Analyser>(sampleRate, channels)) {}
@@ -174,17 +203,25 @@ void OnsetDetector::process(std::span<const float> samples) {
 }
 
 std::vector<std::int64_t> OnsetDetector::finish() {
+    return framesOf(finishWithLoudness());
+}
+
+std::vector<Onset> OnsetDetector::finishWithLoudness() {
     return analyser_->finish();
 }
 
 std::vector<std::int64_t> OnsetDetector::detect(AudioDecoder& decoder) {
+    return framesOf(detectWithLoudness(decoder));
+}
+
+std::vector<Onset> OnsetDetector::detectWithLoudness(AudioDecoder& decoder) {
     const auto channels = static_cast<std::size_t>(decoder.channels());
     OnsetDetector detector(decoder.sampleRate(), decoder.channels());
     std::vector<float> block(kBlock * channels);
     while (const std::size_t frames = decoder.read(block)) {
         detector.process(std::span(block).first(frames * channels));
     }
-    return detector.finish();
+    return detector.finishWithLoudness();
 }
 
 }  // namespace qvct

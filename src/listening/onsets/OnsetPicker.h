@@ -10,7 +10,8 @@ namespace qvct {
 /// Picks the peaks of a novelty curve as it comes, with a delay of a few frames.
 ///
 /// A peak is the largest value of its nearest neighbours and exceeds, by a fixed amount and a factor, the
-/// median of the curve around it, so that steady noise raises the bar. Of peaks within 30 ms the first
+/// median of the curve around it and, by more, the median of the last 2 s, so that steady noise raises the
+/// bar. Of peaks within 30 ms the first
 /// counts: a flam begins with its first stroke.
 class OnsetPicker {
   public:
@@ -25,10 +26,11 @@ class OnsetPicker {
   private:
     float at(std::int64_t frame) const { return values_[static_cast<std::size_t>(frame) % values_.size()]; }
     bool isLargest(std::int64_t frame) const;
-    float medianAround(std::int64_t frame);
+    float medianSince(std::int64_t frame, std::size_t before);
 
     std::size_t before_, after_;              // frames within which a peak is the largest
-    std::size_t medianBefore_, medianAfter_;  // frames of the median
+    std::size_t medianBefore_, medianAfter_;  // frames of the short median
+    std::size_t longMedian_;                  // frames of the long one before the peak
     std::int64_t distance_;                   // frames that peaks keep from each other
     std::vector<float> values_;               // a ring of the last ones
     std::vector<float> sorted_;

@@ -18,9 +18,14 @@ constexpr std::size_t kSmallestWindow = 64;
 constexpr double kLowestHertz = 40;
 constexpr double kHighestHertz = 16000;
 constexpr double kBandsPerOctave = 8;
-constexpr float kCompression = 1000;  // The scale is logarithmic from 60 dB below the loudest band on.
+constexpr float kCompression = 300;   // The scale is logarithmic from 50 dB below the reference on.
 constexpr float kQuietest = 0.001F;   // Signals below do not get louder.
 constexpr double kForgetting = 0.1;   // share of the loudest level forgotten in a second
+constexpr double kPeakSeconds = 0.5;  // time in which the peak of a band falls to 1/e
+constexpr float kLowestPeak = 0.1F;   // of the loudest level
+constexpr float kFall = 0.25F;        // octaves of magnitude by which a held level falls in a frame
+constexpr double kHigh = 7000;        // Hz from which on rises count for themselves, too
+constexpr float kHighShare = 0.6F;    // their weight
 
 // An even product of small primes, which transforms quickly.
 std::size_t windowSizeFor(double sampleRate) {
@@ -35,8 +40,7 @@ std::size_t windowSizeFor(double sampleRate) {
     }
 }
 
-// Compares each frame with the one two before it: the last two of the former four frames, then the first two
-// of these.
+// The frames two before these four: the last two of the former four, then the first two of these.
 Lanes twoBefore(Lanes former, Lanes these) {
     return Lanes(__builtin_shufflevector(former.v, these.v, 2, 3, 4, 5));
 }
@@ -51,7 +55,8 @@ struct SpectralFlux::Transform {
     std::vector<Lanes> input;
     std::vector<std::complex<Lanes>> bins;
     std::vector<Lanes> magnitudes;
-    std::vector<Lanes> levels, formerLevels;  // by band: of these four frames and of the four before
+    // By band: of these four frames and of the four before, and what these are compared with.
+    std::vector<Lanes> levels, formerLevels, heldLevels;
 };
 
 SpectralFlux::SpectralFlux(double sampleRate)
@@ -64,6 +69,8 @@ SpectralFlux::SpectralFlux(double sampleRate)
     makeBands(sampleRate);
     transform_->levels.resize(bands_.size());
     transform_->formerLevels.resize(bands_.size());
+    transform_->heldLevels.resize(bands_.size());
+    peaks_.resize(bands_.size());
 }
 
 SpectralFlux::~SpectralFlux() = default;
@@ -90,6 +97,7 @@ void SpectralFlux::makeBands(double sampleRate) {
     }
     for (std::size_t i = 1; i + 1 < centers.size(); ++i) {
         const std::size_t low = centers[i - 1], center = centers[i], high = centers[i + 1];
+        if (static_cast<double>(center) * binWidth < kHigh) firstHigh_ = i;
         bands_.push_back({low + 1, weights_.size(), high - low - 1});
         for (std::size_t bin = low + 1; bin < high; ++bin) {
             weights_.push_back(bin <= center
@@ -100,7 +108,7 @@ void SpectralFlux::makeBands(double sampleRate) {
 }
 
 void SpectralFlux::transform(const float* samples) {
-    auto& [plan, input, bins, magnitudes, levels, formerLevels] = *transform_;
+    auto& [plan, input, bins, magnitudes, levels, formerLevels, heldLevels] = *transform_;
     for (std::size_t i = 0; i < window_.size(); ++i) {
         const float* sample = samples + i;
         const Lanes::Vector four = {sample[0], sample[hop_], sample[2 * hop_], sample[3 * hop_]};
@@ -124,13 +132,34 @@ void SpectralFlux::measureBands() {
         levels[b] = level;
         loudest = larger(loudest, level);
     }
-    Lanes scale;
     const auto kept = static_cast<float>(1 - std::min(1.0, kForgetting / framesPerSecond_));
-    for (int frame = 0; frame < 4; ++frame) {
-        loudest_ = std::max(loudest.v[frame], loudest_ * kept);
-        scale.v[frame] = kCompression / loudest_;
+    for (int frame = 0; frame < 4; ++frame)
+        loudest.v[frame] = loudest_ = std::max(loudest.v[frame], loudest_ * kept);
+    scaleBands(loudest);
+}
+
+// Half way from the loudest level of the whole to the peak of each band, as ears adapt to what goes on.
+void SpectralFlux::scaleBands(Lanes loudest) {
+    const auto kept = static_cast<float>(std::exp(-1 / (kPeakSeconds * framesPerSecond_)));
+    for (std::size_t b = 0; b < bands_.size(); ++b) {
+        Lanes& level = transform_->levels[b];
+        Lanes peak;
+        for (int frame = 0; frame < 4; ++frame) {
+            peaks_[b] = std::max({level.v[frame], peaks_[b] * kept, kLowestPeak * loudest.v[frame]});
+            peak.v[frame] = peaks_[b];
+        }
+        level = roughLog2(Lanes(1) + kCompression * level / squareRoot(peak * loudest));
     }
-    for (Lanes& level : levels) level = roughLog2(Lanes(1) + scale * level);
+}
+
+// What a band is compared with: its level two frames before, or what is left of higher ones before that.
+void SpectralFlux::holdLevels() {
+    for (std::size_t b = 0; b < bands_.size(); ++b) {
+        Lanes& held = transform_->heldLevels[b];
+        const Lanes past = twoBefore(transform_->formerLevels[b], transform_->levels[b]);
+        float last = held.v[3];
+        for (int frame = 0; frame < 4; ++frame) held.v[frame] = last = std::max(past.v[frame], last - kFall);
+    }
 }
 
 std::array<float, SpectralFlux::kTogether> SpectralFlux::next(const float* samples) {
@@ -141,21 +170,22 @@ std::array<float, SpectralFlux::kTogether> SpectralFlux::next(const float* sampl
     transform(samples);
     measureBands();
 
+    holdLevels();
+
     const std::vector<Lanes>& now = transform_->levels;
-    const std::vector<Lanes>& former = transform_->formerLevels;
-    const auto past = [&](std::size_t band) { return twoBefore(former[band], now[band]); };
-    Lanes rise(0);
-    Lanes below = past(0);
-    Lanes here = below;
+    const std::vector<Lanes>& held = transform_->heldLevels;
+    Lanes all(0), high(0);
+    Lanes below = held[0];
     for (std::size_t b = 0; b < count; ++b) {
-        const Lanes above = b + 1 < count ? past(b + 1) : here;
-        rise += larger(Lanes(0), now[b] - larger(here, larger(below, above)));
-        below = here;
-        here = above;
+        const Lanes above = held[std::min(b + 1, count - 1)];
+        const Lanes rise = larger(Lanes(0), now[b] - larger(held[b], larger(below, above)));
+        all += rise;
+        if (b >= firstHigh_) high += rise;
+        below = held[b];
     }
-    for (std::size_t frame = 0; frame < kTogether; ++frame) {
-        rises[frame] = rise.v[frame] / static_cast<float>(count);
-    }
+    const auto highCount = static_cast<float>(std::max<std::size_t>(1, count - firstHigh_));
+    const Lanes rise = larger(all / static_cast<float>(count), high * (kHighShare / highCount));
+    for (std::size_t frame = 0; frame < kTogether; ++frame) rises[frame] = rise.v[frame];
     return rises;
 }
 

@@ -1,8 +1,12 @@
 #include "listening/rhythm/LoopRhythm.h"
 
+#include "listening/onsets/OnsetDetector.h"
 #include "listening/rhythm/QVCTMidiAnalysis.h"
 #include "media/loopfile/LCFileData.h"
 #include "media/midi/MidiSequence.h"
+
+#include <algorithm>
+#include <cmath>
 
 namespace qvct {
 
@@ -30,6 +34,18 @@ std::vector<Note> notesOfOnsets(std::span<const std::int64_t> onsets, std::int64
     for (const std::int64_t onset : onsets) {
         const double beat = static_cast<double>(static_cast<float>(onset) * beatsPerFrame);
         notes.push_back({beat, beat, pitch, velocity});
+    }
+    return notes;
+}
+
+std::vector<Note> accentedNotesOfOnsets(const std::vector<Onset>& onsets, std::int64_t frames,
+                                        std::int32_t beatCount) {
+    float loudest = 0;
+    for (const Onset& onset : onsets) loudest = std::max(loudest, onset.loudness);
+    std::vector<Note> notes = notesOfOnsets(framesOf(onsets), frames, beatCount);
+    for (std::size_t i = 0; i < notes.size() && loudest > 0; ++i) {
+        const auto velocity = static_cast<std::int32_t>(std::lround(127 * onsets[i].loudness / loudest));
+        notes[i].velocity = std::max(1, velocity);
     }
     return notes;
 }

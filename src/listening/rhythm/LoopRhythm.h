@@ -11,6 +11,7 @@ namespace qvct {
 
 class LCFileData;
 class MidiSequence;
+struct Onset;
 class QVCTMidiAnalysis;
 
 /// Tempo, length and signature of a loop.
@@ -38,6 +39,11 @@ std::vector<Note> notesOfFirstTrack(const MidiSequence& sequence);
 /// frames. Their times count in beats of the loop.
 std::vector<Note> notesOfOnsets(std::span<const std::int64_t> onsets, std::int64_t frames,
                                 std::int32_t beatCount);
+
+/// The same onsets as notes of unequal loudness: the loudest has the velocity 127, one that is half as loud
+/// 64, and none less than 1.
+std::vector<Note> accentedNotesOfOnsets(const std::vector<Onset>& onsets, std::int64_t frames,
+                                        std::int32_t beatCount);
 
 /// The analysis of a loop of these notes. The tagging service and everything else that grades a rhythm use
 /// it.

@@ -8,7 +8,7 @@
 namespace qvct {
 namespace {
 
-constexpr double kRate = 22050;
+constexpr double kRate = 44100;
 
 }  // namespace
 
@@ -30,19 +30,17 @@ void DownMixer::mix(std::span<const float> frames, std::vector<float>& mixed) {
     const std::size_t width = gains_.size();
     const float* frame = frames.data();
     std::size_t left = frames.size() / width;
-    if (factor_ == 2 && width == 2 && runLength_ == 0) {  // CD audio, which most loops are
+    if (factor_ == 1 && width == 2) {  // CD audio, which most loops are
         const float a = gains_[0];
         const float b = gains_[1];
         const std::size_t from = mixed.size();
-        mixed.resize(from + left / 2);
+        mixed.resize(from + left);
         float* out = mixed.data() + from;
-        for (std::size_t i = 0; i < left / 2; ++i) {
-            const float* f = frame + 4 * i;
-            out[i] = boundedSample((f[0] * a + f[1] * b) +
-                                   (f[2] * a + f[3] * b));  // in the order of the general case
+        for (std::size_t i = 0; i < left; ++i) {
+            out[i] =
+                boundedSample(frame[2 * i] * a + frame[2 * i + 1] * b);  // in the order of the general case
         }
-        frame += left / 2 * 4;
-        left %= 2;
+        return;
     }
     for (; left > 0; --left, frame += width) {
         run_ += mixedFrame(frame);
