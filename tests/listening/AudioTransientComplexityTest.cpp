@@ -1,3 +1,4 @@
+#include "listening/onsets/OnsetDetector.h"
 #include "listening/rhythm/AudioTransientComplexity.h"
 #include "listening/rhythm/QVCTMidiAnalysis.h"
 #include "media/loopfile/LCFileData.h"
@@ -31,6 +32,20 @@ TEST(AudioTransientComplexity, MeasuresOnsetsAsNotesOfEqualLoudness) {
     EXPECT_EQ(audio.getComplexity(), midi->computeRhythmicComplexity());
     EXPECT_EQ(audio.getDensity(), midi->computeRhythmicDensity());
     EXPECT_GT(audio.getDensity(), 0);
+}
+
+TEST(AudioTransientComplexity, AccentedNotesAreAsLoudAsTheirOnsets) {
+    const std::vector<Onset> onsets = {{0, 0.1F}, {125, 0.2F}, {500, 0}, {875, 0.15F}};
+    const auto equal = notesOfOnsets(framesOf(onsets), 1001, 4);
+    const auto accented = accentedNotesOfOnsets(onsets, 1001, 4);
+    const std::int32_t velocities[] = {64, 127, 1, 95};
+    ASSERT_EQ(accented.size(), 4U);
+    for (std::size_t i = 0; i < 4; ++i) {
+        EXPECT_EQ(accented[i].startTime, equal[i].startTime);
+        EXPECT_EQ(accented[i].velocity, velocities[i]);
+    }
+    EXPECT_TRUE(accentedNotesOfOnsets(onsets, 3, 4).empty()) << "no frames in a beat";
+    EXPECT_EQ(accentedNotesOfOnsets({{0, 0}}, 1001, 4).at(0).velocity, 127) << "the loudest of all";
 }
 
 TEST(AudioTransientComplexity, KeepsTheFirstSuccess) {
