@@ -16,6 +16,8 @@ QVCT_API extern const unsigned char EvidenceWeights_plist[];
 QVCT_API extern const std::uint32_t EvidenceWeights_plist_len;
 QVCT_API extern const unsigned char ExtractSoftwareInstrumentsRule_js[];
 QVCT_API extern const std::uint32_t ExtractSoftwareInstrumentsRule_js_len;
+QVCT_API extern const unsigned char InstrumentModel_bin[];
+QVCT_API extern const std::uint32_t InstrumentModel_bin_len;
 QVCT_API extern const unsigned char LegacyLoopTaxonomy_plist[];
 QVCT_API extern const std::uint32_t LegacyLoopTaxonomy_plist_len;
 QVCT_API extern const unsigned char LegacyLoopTaxonomyMapping_csv[];

@@ -1,0 +1,99 @@
+#include "platform/files/ResourceBundle.h"
+#include "resources/DefaultInstrumentModel.h"
+#include "resources/EmbeddedFiles.h"
+#include "support/CapturedLog.h"
+#include "support/TemporaryFolder.h"
+#include "taxonomy/TGRTTaxonomy.h"
+
+#include <array>
+#include <cmath>
+#include <functional>
+#include <numbers>
+#include <random>
+
+#include <gmock/gmock.h>
+
+namespace qvct {
+namespace {
+
+constexpr double kRate = 44100;
+
+using Wave = std::function<double(double seconds, double noise)>;
+
+std::optional<InstrumentJudgement> judged(const Wave& wave, double seconds) {
+    std::mt19937 random(11);
+    std::normal_distribution<double> noise(0, 0.3);
+    std::vector<float> samples(static_cast<std::size_t>(seconds * kRate));
+    for (std::size_t i = 0; i < samples.size(); ++i)
+        samples[i] = static_cast<float>(0.5 * wave(static_cast<double>(i) / kRate, noise(random)));
+    return defaultInstrumentModel()->judge(SoundFeatures(kRate).of(samples));
+}
+
+double sine(double turns) {
+    return std::sin(2 * std::numbers::pi * turns);
+}
+
+TEST(DefaultInstrumentModel, KnowsPlainDrums) {
+    std::array<double, 2> before{};
+    const auto high =
+        [&before](double noise) {  // what a line through the two samples before does not foretell
+            const double bend = noise - 2 * before[0] + before[1];
+            before = {noise, before[0]};
+            return bend;
+        };
+    const struct {
+        const char* label;
+        const char* detail;
+        double seconds;
+        Wave wave;
+    } rows[] = {
+        {"Kick", "", 0.5,
+         [](double t, double) { return sine(50 * t + 4 * (1 - std::exp(-t * 40))) * std::exp(-t * 9); }},
+        {"Snare", "", 0.4,
+         [](double t, double noise) {
+             return 0.5 * sine(190 * t) * std::exp(-t * 25) + noise * std::exp(-t * 18);
+         }},
+        {"Hi-Hat", "closed", 0.15, [&](double t, double noise) { return high(noise) * std::exp(-t * 60); }},
+    };
+    for (const auto& [label, detail, seconds, wave] : rows) {
+        const auto found = judged(wave, seconds);
+        ASSERT_TRUE(found) << label;
+        EXPECT_EQ(found->label, label);
+        EXPECT_EQ(found->detail, detail) << label;
+        EXPECT_GT(found->confidence, 0.5) << label;
+    }
+}
+
+TEST(DefaultInstrumentModel, SaysNothingOfSilence) {
+    EXPECT_FALSE(judged([](double, double) { return 0; }, 1));
+}
+
+TEST(DefaultInstrumentModel, SaysLabelsOfTheTaxonomy) {
+    const auto model = defaultInstrumentModel();
+    const auto taxonomy = TGRTTaxonomy::testingTaxonomy();
+    for (std::size_t i = 0; i < model->classes(); ++i)
+        EXPECT_NE(taxonomy->findTagForLabel(model->label(i)), nullptr) << model->label(i);
+}
+
+TEST(DefaultInstrumentModel, IsReplacedByAFileUnlessThatIsBroken) {
+    const test::TemporaryFolder folder;
+    ResourceBundle::setDirectory(folder.path());
+    std::string bytes(reinterpret_cast<const char*>(InstrumentModel_bin), InstrumentModel_bin_len);
+    bytes.replace(bytes.find("Kick"), 4, "Bump");
+    bytes.replace(bytes.find("Kick"), 4, "Bump");
+    folder.write("InstrumentModel.bin", bytes);
+    EXPECT_EQ(defaultInstrumentModel()->label(0), "Bump");
+
+    const test::CapturedLog log;
+    bytes.pop_back();
+    folder.write("InstrumentModel.bin", bytes);
+    EXPECT_EQ(defaultInstrumentModel()->label(0), "Kick");
+    ResourceBundle::setDirectory("");
+    EXPECT_THAT(log.messages(),
+                testing::ElementsAre(testing::AllOf(testing::HasSubstr("InstrumentModel.bin"),
+                                                    testing::HasSubstr("is cut off"),
+                                                    testing::HasSubstr("(using the built-in one)"))));
+}
+
+}  // namespace
+}  // namespace qvct

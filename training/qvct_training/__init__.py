@@ -1,0 +1,1 @@
+"""Trains the model that tells instruments by their sound."""

@@ -1,0 +1,88 @@
+"""What happens to a sound between its making and a library: tuned, filtered, sampled coarsely, cut, overdriven."""
+
+import numpy as np
+from scipy import signal
+
+from .dsp import RATE, Random, Sound, chance, decay, high_pass, log_uniform, low_pass, noise, times
+
+
+def resampled(sound: Sound, factor: float) -> Sound:
+    """Played `factor` times as fast, by straight lines between samples."""
+    count = max(32, int(len(sound) / factor))
+    return np.asarray(np.interp(np.arange(count) * factor, np.arange(len(sound)), sound))
+
+
+def coarse(random: Random, sound: Sound) -> Sound:
+    """As a sampler of few bits and a low rate keeps it: linear or companded, its steps held or smoothed."""
+    step = log_uniform(random, 1.0, 3.5)
+    held = chance(random, 0.4)
+    out = low_pass(sound, 0.45 * RATE / step, 6) if chance(random, 0.8) and step > 1.05 else sound
+    kept = resampled(out, step)
+    kept = kept / (np.max(np.abs(kept)) + 1e-9)
+    if chance(random, 0.8):
+        steps = 2 ** (random.choice([6, 7, 8, 8, 10, 12]) - 1)
+        if chance(random, 0.4):
+            mu = 255.0
+            folded = np.sign(kept) * np.log1p(mu * np.abs(kept)) / np.log1p(mu)
+            folded = np.round(folded * steps) / steps
+            kept = np.sign(folded) * np.expm1(np.abs(folded) * np.log1p(mu)) / mu
+        else:
+            kept = np.round(kept * steps) / steps
+    at = np.arange(int(len(kept) * step)) / step
+    out = kept[np.minimum(at.astype(int), len(kept) - 1)] if held else np.interp(at, np.arange(len(kept)), kept)
+    return low_pass(out, log_uniform(random, 6000, 20000), 4) if chance(random, 0.5) else out
+
+
+def room(random: Random, sound: Sound) -> Sound:
+    """Early reflections and a tail."""
+    t = times(log_uniform(random, 0.05, 1.2))
+    tail = noise(random, len(t)) * decay(t, t[-1]) * (t > random.uniform(0.001, 0.03))
+    tail = low_pass(tail, log_uniform(random, 1500, 12000), 1)
+    wet = signal.fftconvolve(np.concatenate([sound, np.zeros(len(t) // 2)]), tail / (np.sqrt(np.sum(tail**2)) + 1e-9))
+    wet = wet[: len(sound) + len(t) // 2]
+    dry = np.concatenate([sound, np.zeros(len(wet) - len(sound))])
+    return np.asarray(dry + log_uniform(random, 0.03, 0.5) * wet)
+
+
+def tilted(random: Random, sound: Sound) -> Sound:
+    """A broad emphasis somewhere, or the ends of the spectrum taken off."""
+    if chance(random, 0.5):
+        f = log_uniform(random, 100, 9000)
+        b, a = signal.iirpeak(f, random.uniform(0.5, 2), fs=RATE)
+        sound = sound + random.uniform(-0.7, 2) * np.asarray(signal.lfilter(b, a, sound))
+    if chance(random, 0.25):
+        sound = low_pass(sound, log_uniform(random, 3500, 18000), int(random.integers(1, 3)))
+    if chance(random, 0.25):
+        sound = high_pass(sound, log_uniform(random, 20, 150), 1)
+    return sound
+
+
+def cut(random: Random, sound: Sound) -> Sound:
+    """Ends early: gated, faded or simply cut."""
+    end = int(len(sound) * random.uniform(0.35, 0.95))
+    out = sound[: max(end, 1200)].copy()
+    fade = int(min(len(out), log_uniform(random, 0.0005, 0.1) * RATE))
+    out[len(out) - fade :] *= np.linspace(1, 0, fade)
+    return out
+
+
+def augmented(random: Random, sound: Sound, most_octaves: float, strength: float = 1.0) -> Sound:
+    """The sound as it might be met, tuned by at most that many octaves; each step by chance."""
+    out = np.asarray(sound, dtype=np.float64)
+    if chance(random, 0.85):
+        out = resampled(out, 2 ** random.uniform(-most_octaves, most_octaves))
+    if chance(random, 0.4 * strength):
+        out = out * decay(np.arange(len(out)) / RATE, log_uniform(random, 0.3, 3))
+    if chance(random, 0.55 * strength):
+        out = tilted(random, out)
+    if chance(random, 0.25 * strength):
+        out = np.tanh(log_uniform(random, 0.7, 8) * out / (np.max(np.abs(out)) + 1e-9))
+    if chance(random, 0.35 * strength):
+        out = coarse(random, out)
+    if chance(random, 0.25 * strength):
+        out = room(random, out)
+    if chance(random, 0.25 * strength):
+        out = cut(random, out)
+    if chance(random, 0.3 * strength):
+        out = out + log_uniform(random, 1e-5, 5e-3) * np.max(np.abs(out)) * noise(random, len(out))
+    return out
