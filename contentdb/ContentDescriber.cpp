@@ -9,6 +9,7 @@
 #include "contentdb/store/codec/ExplanationCodec.h"
 #include "formats/QVContentTaggingTypes.h"
 #include "indexing/TGRTIndexableContentObject.h"
+#include "listening/HeardSound.h"
 #include "media/loopfile/LCFileData.h"
 #include "platform/base/Version.h"
 #include "platform/base/bytes/BytesAsText.h"
@@ -95,6 +96,25 @@ void addValues(IndexedItem& item, const ObjectSet<TGRTKeyValue>& values) {
     }
 }
 
+/// What the place of a sound between two poles is called as a number.
+struct TraitField {
+    std::string_view scale, key;
+    bool isOfFirstPole = false;  ///< More of it is nearer to the first pole.
+};
+
+constexpr std::array kTraitFields = std::to_array<TraitField>({{"Bright / Dark", "Brightness", true},
+                                                               {"Cold / Warm", "Warmth"},
+                                                               {"Soft / Hard", "Hardness"},
+                                                               {"Smooth / Rough", "Roughness"},
+                                                               {"Tonal / Non-Tonal", "Noisiness"},
+                                                               {"Low / High", "Height"},
+                                                               {"Narrow / Wide", "Width"},
+                                                               {"Simple / Complex", "Complexity"}});
+
+double roundedTo(double value, double steps) {
+    return std::round(value * steps) / steps;
+}
+
 }  // namespace
 
 struct ContentDescriber::Implementation {
@@ -122,6 +142,7 @@ struct ContentDescriber::Implementation {
         R"((?<![\d.,])(\d{2,3}(?:[.,]\d+)?)[\s_-]?bpm(?![\p{L}\d]))", RegularExpression::Case::insensitive);
     std::optional<double> namedTempo;  // of the item at hand, as its names state it
     std::optional<int> namedBeats;
+    std::shared_ptr<const HeardSound> heard;
 
     void addAllTaggings(IndexedItem& item, const std::shared_ptr<ContentItem>& content,
                         const TGRTMetaData* record, const Taggings& withVirtual) {
@@ -183,6 +204,30 @@ struct ContentDescriber::Implementation {
         item.explanation = encodedExplanation(explanation, item.path);
     }
 
+    void addHeardTempo(IndexedItem& item) const {
+        constexpr double kLikely = 0.5;
+        if (heard && !heard->tempos.empty() && heard->tempos.front().confidence >= kLikely)
+            addNumber(item, "Tempo", roundedTo(heard->tempos.front().bpm, 100));
+    }
+
+    /// In few steps, so that few groups of numbers have them all.
+    void addHeard(IndexedItem& item) const {
+        if (!heard) return;
+        for (const auto& trait : heard->traits) {
+            const auto field = std::find_if(kTraitFields.begin(), kTraitFields.end(),
+                                            [&](const auto& its) { return its.scale == trait.scale; });
+            if (field == kTraitFields.end()) continue;
+            const double level = field->isOfFirstPole ? 1 - trait.level : trait.level;
+            addNumber(item, field->key, roundedTo(level, 100));
+        }
+        if (heard->loudness) addNumber(item, "Loudness", roundedTo(*heard->loudness, 10));
+        if (heard->truePeak) addNumber(item, "TruePeak", roundedTo(*heard->truePeak, 10));
+        constexpr double kLikely = 0.5;
+        if (!heard->note || heard->note->confidence < kLikely) return;
+        addNumber(item, "Note", heard->note->number);
+        addNumber(item, "Cents", roundedTo(heard->note->cents, 1));
+    }
+
     void addTempoAndBeats(IndexedItem& item, const LCFileData* file, const std::string& fileName) {
         if (file != nullptr) {
             addNumber(item, QVContentKeyBeatCount, file->beatCount());
@@ -191,6 +236,8 @@ struct ContentDescriber::Implementation {
         if (namedBeats) addNumber(item, QVContentKeyBeatCount, *namedBeats);
         if (hasValue(item, "Tempo")) return;
         if (namedTempo) return addNumber(item, "Tempo", *namedTempo);
+        addHeardTempo(item);
+        if (hasValue(item, "Tempo")) return;
         const std::u16string text = utf16FromUtf8(fileName);
         const auto match = tempoInName.firstMatch(text);
         if (match.size() < 2) return;
@@ -206,7 +253,7 @@ ContentDescriber::~ContentDescriber() = default;
 
 std::uint64_t ContentDescriber::digest(std::uint64_t services) {
     // Raised when a change makes items be described differently although the version stays the same.
-    constexpr std::uint64_t edition = 6;
+    constexpr std::uint64_t edition = 7;
     Digest digest;
     digest.add(services);
     digest.add(version());
@@ -248,8 +295,10 @@ std::optional<IndexedItem> ContentDescriber::describe(const std::string& path, E
     its.namedTempo.reset();
     its.namedBeats.reset();
     its.addAllTaggings(item, content, record.get(), object->taggingDatas());
+    its.heard = content->file().heardSound();
     addValues(item, object->valueDatas());
     its.addTempoAndBeats(item, content->fileData().get(), url.lastPathComponent());
+    its.addHeard(item);
     item.payloadHash = payloadHash(*content);
     return item;
 }

@@ -5,6 +5,7 @@
 #include "autotagging/names/NameReader.h"
 #include "autotagging/names/TempoByLength.h"
 #include "autotagging/services/QVCTAutoTaggingService.h"
+#include "listening/HeardSound.h"
 #include "media/loopfile/LCFileData.h"
 #include "metadata/TGRTMetaData.h"
 #include "platform/base/bytes/Printable.h"
@@ -20,6 +21,7 @@ namespace {
 
 constexpr std::string_view kKeywords = "keywords";
 constexpr std::string_view kContentType = "content-type";
+constexpr std::string_view kSound = "sound";
 constexpr std::string_view kOneShot = "One Shot";
 
 /// Judges what keywords claim by what the names mean: a keyword sees a word, and no more.
@@ -111,20 +113,41 @@ void addTempoByLength(NameReading& reading, ContentItem& item, ItemReport& repor
     if (reading.kind == SoundKind::unsaid) reading.kind = SoundKind::loop;
 }
 
-/// What is short is a single sound, unless its name says that it is to be repeated.
-void judgeOneShot(std::vector<TagClaim>& claims, SoundKind named) {
-    if (named != SoundKind::loop) return;
+/// What is short is a single sound, unless it is to be repeated by its name, or if that is silent by its
+/// sound.
+void judgeOneShot(std::vector<TagClaim>& claims, SoundKind named, SoundKind heard) {
+    if ((named == SoundKind::unsaid ? heard : named) != SoundKind::loop) return;
     for (TagClaim& claim : claims)
         if (claim.label == kOneShot && claim.service == kContentType)
+            claim.doubt =
+                named == SoundKind::loop ? "its name says that it is a loop" : "it sounds like a loop";
+}
+
+/// In a loop several things may play; what it sounds like as a whole is no instrument.
+void judgeHeardInstrument(std::vector<TagClaim>& claims, SoundKind kind, const TGRTTaxonomy& taxonomy) {
+    if (kind != SoundKind::loop) return;
+    for (TagClaim& claim : claims) {
+        const auto tag = claim.service == kSound ? taxonomy.findTagForLabel(claim.label) : nullptr;
+        if (tag && tag->categoryIdentifier() == QVCategorySourceIdentifier)
             claim.doubt = "its name says that it is a loop";
+    }
+}
+
+/// By the sound alone only what it says clearly.
+SoundKind kindOf(const HeardSound* sound) {
+    constexpr double kClear = 0.9;
+    if (sound == nullptr || !sound->loopConfidence) return SoundKind::unsaid;
+    if (*sound->loopConfidence >= kClear) return SoundKind::loop;
+    return *sound->loopConfidence <= 1 - kClear ? SoundKind::oneShot : SoundKind::unsaid;
 }
 
 std::string_view nameOf(std::string_view folder) {
     return folder.substr(folder.rfind('/') + 1);
 }
 
-SoundKind kindOf(const NameReading& reading, const std::vector<TagClaim>& claims) {
+SoundKind kindOf(const NameReading& reading, SoundKind heard, const std::vector<TagClaim>& claims) {
     if (reading.kind != SoundKind::unsaid) return reading.kind;
+    if (heard != SoundKind::unsaid) return heard;
     const bool isOneShot = std::any_of(claims.begin(), claims.end(), [](const TagClaim& claim) {
         return claim.label == kOneShot && claim.service == kContentType && claim.doubt.empty();
     });
@@ -192,6 +215,8 @@ ItemReport ItemTagger::report(const std::shared_ptr<ContentItem>& item, const It
     ItemReport report;
     std::vector<TagClaim> claims =
         aggregator_->claimsOfItem(item, names.all(), options & ~QVCTAutoTaggingOptionNames);
+    report.sound = item->file().heardSound();
+    const SoundKind heard = kindOf(report.sound.get());
     NameReading reading;
     if ((options & QVCTAutoTaggingOptionNames) != 0) {
         reading = reader().read(names.all());
@@ -201,12 +226,13 @@ ItemReport ItemTagger::report(const std::shared_ptr<ContentItem>& item, const It
         report.tempo = reading.tempo;
         report.beats = beatsOf(reading);
         addTempoByLength(reading, *item, report);
-        judgeOneShot(claims, reading.kind);
         claims.insert(claims.end(), reading.claims.begin(), reading.claims.end());
     }
+    judgeOneShot(claims, reading.kind, heard);
+    report.kind = kindOf(reading, heard, claims);
+    judgeHeardInstrument(claims, report.kind, *taxonomy_);
     report.rejections = rejectionsOf(*item, names);
     reject(claims, report.rejections);
-    report.kind = kindOf(reading, claims);
     report.resolution = resolver_.resolve(std::move(claims), report.kind);
     return report;
 }

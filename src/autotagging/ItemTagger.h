@@ -14,6 +14,7 @@
 namespace qvct {
 
 class ContentItem;
+struct HeardSound;
 class NameReader;
 class QVTaggingAggregator;
 class TGRTTagging;
@@ -28,6 +29,7 @@ struct QVCT_API ItemReport {
     /// The tempo is a bare number in its name, which holds since the sound is `beats` long at it.
     bool isTempoFromLength = false;
     SoundKind kind = SoundKind::unsaid;
+    std::shared_ptr<const HeardSound> sound;  ///< Null if nobody listened, or nothing could be decoded.
     /// What a person rejected for the item; `resolution` is without it. A host holds its own tags against it.
     Rejections rejections;
 

@@ -6,6 +6,7 @@
 #include "autotagging/services/QVCTNamesTaggingService.h"
 #include "autotagging/services/QVCTRhythmicTaggingService.h"
 #include "autotagging/services/QVCTSoftwareInstrumentTaggingService.h"
+#include "autotagging/services/QVCTSoundTaggingService.h"
 #include "autotagging/services/QVCTTranslateTagsTaggingService.h"
 #include "autotagging/services/QVCTUserGeneratedTaggingService.h"
 #include "autotagging/services/QVCTXMLRulesTaggingService.h"
@@ -81,7 +82,8 @@ QVTaggingAggregator::Services QVTaggingAggregator::defaultTaggingServicesWithRul
             QVCTSoftwareInstrumentTaggingService::init(),
             std::make_shared<QVCTUserGeneratedTaggingService>(),
             std::make_shared<QVCTTranslateTagsTaggingService>(),
-            std::make_shared<QVCTNamesTaggingService>()};
+            std::make_shared<QVCTNamesTaggingService>(),
+            std::make_shared<QVCTSoundTaggingService>()};
 }
 
 QVTaggingAggregator::QVTaggingAggregator(Services services) : taggingServices_(std::move(services)) {

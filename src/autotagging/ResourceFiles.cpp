@@ -2,6 +2,7 @@
 
 #include "autotagging/evidence/EvidenceWeights.h"
 #include "autotagging/names/NamingHabits.h"
+#include "resources/DefaultInstrumentModel.h"
 
 namespace qvct {
 
@@ -16,6 +17,7 @@ std::span<const ResourceFile> resourceFiles() {
                                          {"PackDisplayNames", "csv"},
                                          EvidenceWeights::file(),
                                          NamingHabits::file(),
+                                         instrumentModelFile(),
                                          {"QVSearchKit", "js"},
                                          {"ExtractSoftwareInstrumentsRule", "js"}};
     return files;

@@ -1,5 +1,7 @@
 #include "formats/ItemFile.h"
 
+#include "listening/Listener.h"
+#include "media/audio/AudioDecoder.h"
 #include "media/loopfile/LCFileParser.h"
 #include "platform/files/reading/RandomAccessReader.h"
 
@@ -25,6 +27,16 @@ std::shared_ptr<LCFileData> ItemFile::audio(Error* error) {
                 LCFileParser::fileParserForReader(file, url_.path())->enhancedFileData(&audio_->error);
     }
     return audio_->answer(error);
+}
+
+std::shared_ptr<const HeardSound> ItemFile::sound(Listener& listener, Error* error) {
+    if (!sound_) {
+        sound_.emplace();
+        const auto file = reader(&sound_->error);
+        const auto decoder = file ? AudioDecoder::open(file, url_.path(), &sound_->error) : nullptr;
+        if (decoder) sound_->value = std::make_shared<const HeardSound>(listener.listen(*decoder));
+    }
+    return sound_->answer(error);
 }
 
 std::optional<std::vector<std::uint8_t>> ItemFile::bytes(std::uint64_t limit, Error* error) {

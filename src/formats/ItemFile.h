@@ -12,7 +12,9 @@
 
 namespace qvct {
 
+struct HeardSound;
 class LCFileData;
+class Listener;
 class RandomAccessReader;
 
 /// The file at an item's URL: opened once, on first use, and parsed once.
@@ -32,6 +34,11 @@ class QVCT_API ItemFile {
     /// What an audio file says, with what can be derived from it (`LCFileParser::enhancedFileData`). Null,
     /// and an error, for what is not audio.
     std::shared_ptr<LCFileData> audio(Error* error = nullptr);
+    /// What can be heard in it, listened to once, with that listener. Null, and an error, for what cannot be
+    /// decoded.
+    std::shared_ptr<const HeardSound> sound(Listener& listener, Error* error = nullptr);
+    /// What was heard in it; null if nobody listened.
+    std::shared_ptr<const HeardSound> heardSound() const { return sound_ ? sound_->value : nullptr; }
     /// All bytes. They are not kept.
     std::optional<std::vector<std::uint8_t>> bytes(std::uint64_t limit, Error* error = nullptr);
 
@@ -51,6 +58,7 @@ class QVCT_API ItemFile {
     URL url_;
     std::optional<Attempt<const RandomAccessReader>> reader_;
     std::optional<Attempt<LCFileData>> audio_;
+    std::optional<Attempt<const HeardSound>> sound_;
 };
 
 }  // namespace qvct

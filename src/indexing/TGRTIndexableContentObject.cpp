@@ -227,11 +227,9 @@ std::string_view TGRTIndexableContentObject::keyTypeTagForKeyType(std::int64_t k
 
 OptionalLabel TGRTIndexableContentObject::keyTagForMidiRootNote(std::int64_t note) {
     constexpr std::int64_t firstNote = 48;
-    constexpr std::array<std::string_view, 12> keys = {
-        QVTagCKey,      QVTagCSharpKey, QVTagDKey,      QVTagDSharpKey, QVTagEKey,      QVTagFKey,
-        QVTagFSharpKey, QVTagGKey,      QVTagGSharpKey, QVTagAKey,      QVTagASharpKey, QVTagBKey};
-    if (note < firstNote || note >= firstNote + static_cast<std::int64_t>(keys.size())) return std::nullopt;
-    return keys[static_cast<std::size_t>(note - firstNote)];
+    if (note < firstNote || note >= firstNote + static_cast<std::int64_t>(QVTagsOfKeys.size()))
+        return std::nullopt;
+    return QVTagsOfKeys[static_cast<std::size_t>(note - firstNote)];
 }
 
 std::string TGRTIndexableContentObject::description() const {

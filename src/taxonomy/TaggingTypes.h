@@ -2,6 +2,7 @@
 
 #include "media/loopfile/RecordKeys.h"
 
+#include <array>
 #include <cstdint>
 #include <string_view>
 
@@ -77,6 +78,10 @@ inline constexpr std::string_view QVTagAKey = "A";
 inline constexpr std::string_view QVTagASharpKey = "ASharp";
 inline constexpr std::string_view QVTagBKey = "B";
 /// @}
+/// All keys from C upwards, by semitones.
+inline constexpr std::array<std::string_view, 12> QVTagsOfKeys = {
+    QVTagCKey,      QVTagCSharpKey, QVTagDKey,      QVTagDSharpKey, QVTagEKey,      QVTagFKey,
+    QVTagFSharpKey, QVTagGKey,      QVTagGSharpKey, QVTagAKey,      QVTagASharpKey, QVTagBKey};
 
 /// @{
 /// One of the four levels of a person's rating, a weight in [0, 1].

@@ -17,6 +17,11 @@ std::string sound() {
     return wav.file(wav.format() + wav.data());
 }
 
+std::string silence() {
+    const Wav wav;
+    return wav.file(wav.format() + wav.chunk("data", std::string(4000, '\0')));
+}
+
 const json* find(const json& list, const std::string& label) {
     for (const json& entry : list)
         if (entry["label"] == label) return &entry;
@@ -180,7 +185,7 @@ TEST(Explain, LeavesToStrictTaggingWhatTheServicesSay) {
 TEST(Autotag, ShowsWhatTellsMostFirst) {
     const TemporaryFolder folder;
     folder.write("Dark House Kick.wav", sound());
-    EXPECT_THAT(runTool({"autotag", folder.path()}).output, HasSubstr("  Kick  House  Bright / Dark 100%\n"));
+    EXPECT_THAT(runTool({"autotag", folder.path()}).output, HasSubstr("  Kick  House  Bright / Dark 100%"));
     EXPECT_THAT(runTool({"autotag", "--all", folder.path()}).output, HasSubstr("Drums  Kick"));
     EXPECT_THAT(runTool({"autotag", "--all", folder.path()}).output, HasSubstr("User generated"));
 }
@@ -188,7 +193,7 @@ TEST(Autotag, ShowsWhatTellsMostFirst) {
 TEST(Evaluate, CountsWhatIsRightAndListsWhatItLeavesOut) {
     const TemporaryFolder folder;
     for (const char* name : {"BD 1.wav", "BD 2.wav", "Snare 1.wav", "Zzz.wav", "Cowbell.wav", "Drum 1.wav"})
-        folder.write(std::string("sounds/") + name, sound());
+        folder.write(std::string("sounds/") + name, silence());
     const std::string truth = folder.write("truth.tsv",
                                            "path\tlabel\r\nBD 1.wav\tKick\r\nBD 2.wav\tTom|Kick\r\n"
                                            "Snare 1.wav\tClaps\r\nZzz.wav\tKick\r\nCowbell.wav\t-\r\n"

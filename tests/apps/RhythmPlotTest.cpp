@@ -1,4 +1,4 @@
-#include "output/RhythmPlot.h"
+#include "output/pictures/RhythmPlot.h"
 
 #include <cmath>
 #include <limits>
@@ -58,7 +58,8 @@ TEST(RhythmPlot, MarksTheCellThatAnOnsetCountsFor) {
 TEST(RhythmPlot, DrawsAWaveformOrElseAPianoRoll) {
     RhythmPlot plot = fourBeats();
     plot.notes = {{0, 0.5, 36, 127}, {1, 0.5, 38, 64}, {9, 10, 40, 1}};
-    EXPECT_EQ(count(plot.svg(), "fill-opacity"), 2U);
+    EXPECT_EQ(count(plot.svg(), "fill=\"#4a7ab5\""), 2U);
+    EXPECT_EQ(count(plot.svg(), "fill-opacity=\"0.63\""), 1U);
     plot.waveform.assign(5000, {-0.5F, 0.5F});
     const std::string svg = plot.svg();
     EXPECT_EQ(count(svg, "fill-opacity"), 0U);

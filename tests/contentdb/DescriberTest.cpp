@@ -7,8 +7,10 @@
 #include "support/RunTool.h"
 #include "support/TemporaryFolder.h"
 
+#include <cmath>
 #include <filesystem>
 #include <map>
+#include <numbers>
 #include <set>
 
 #include <gmock/gmock.h>
@@ -169,12 +171,40 @@ TEST_F(Describing, GivesValuesThatAreKnown) {
                  {"empty.wav", wav.file(wav.format() + wav.data(0)), {}}};
     for (const auto& [name, bytes, expected] : cases) {
         std::map<std::string, double> values;
-        for (const IndexedValue& value : describe(folder_.write(name, bytes)).values)
+        constexpr std::uint64_t kAllButSound = optionsForAllTaggingServices() & ~QVCTAutoTaggingOptionSound;
+        for (const IndexedValue& value : describe(folder_.write(name, bytes), kAllButSound).values)
             values[value.key] = std::get<double>(value.value);
         EXPECT_EQ(values.erase("LengthInSeconds"), name == "empty.wav" ? 0U : 1U) << name;
         values.erase("TavioLoopType");
         values.erase("KeyType");
         EXPECT_EQ(values, expected) << name;
+    }
+}
+
+TEST_F(Describing, KeepsWhatIsHeard) {
+    constexpr double kRate = 44100;
+    const Wav wav;
+    std::string bytes;
+    for (int i = 0; i < 22050; ++i) {
+        const double decay = std::exp(-4 * i / kRate);
+        double sample = 0;
+        for (int partial = 1; partial <= 8; ++partial)
+            sample += std::sin(2 * std::numbers::pi * 110 * partial * i / kRate) / partial;
+        bytes += wav.number(static_cast<std::uint64_t>(std::lround(12000 * decay * sample)), 2);
+    }
+    const std::string path =
+        folder_.write("untitled 7.wav", wav.file(wav.format(1) + wav.chunk("data", bytes)));
+    std::map<std::string, double> values;
+    for (const IndexedValue& value : describe(path).values)
+        if (const auto* number = std::get_if<double>(&value.value)) values[value.key] = *number;
+    EXPECT_EQ(values["Note"], 45);
+    EXPECT_NEAR(values["Cents"], 0, 3);
+    EXPECT_LT(values["Noisiness"], 0.5);
+    EXPECT_NEAR(values["TruePeak"], 20 * std::log10(12000 * 1.85 / 32768), 1.5);
+    for (const char* key :
+         {"Brightness", "Warmth", "Hardness", "Roughness", "Height", "Width", "Complexity"}) {
+        ASSERT_TRUE(values.contains(key)) << key;
+        EXPECT_TRUE(values[key] >= 0 && values[key] <= 1) << key;
     }
 }
 

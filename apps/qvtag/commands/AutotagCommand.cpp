@@ -88,6 +88,9 @@ void addAnyRhythm(ContentItem& item, const TGRTTaxonomy& taxonomy, const Rejecti
 void run(const Options& options, ToolContext& context) {
     const auto bits = optionsForServices(options.tagger.services, context);
     const bool isStrict = options.isStrict || (bits & QVCTAutoTaggingOptionNames) == 0;
+    // What is weighed elsewhere; a list of services may ask for what the sound says by itself.
+    const std::uint64_t notExact =
+        QVCTAutoTaggingOptionNames | (options.isStrict ? QVCTAutoTaggingOptionSound : std::uint64_t{0});
     const auto aggregator = options.tagger.aggregator(context);
     const auto taxonomy = TGRTTaxonomy::defaultTaxonomy();
     std::vector<ItemRow> rows;
@@ -99,9 +102,8 @@ void run(const Options& options, ToolContext& context) {
             const auto item = std::make_shared<ContentItem>(url, ContentItem::Reading{bits, nullptr});
             const ItemReport report =
                 isStrict ? ItemReport() : tagger.report(item, ItemNames(url.path(), root), bits);
-            auto found = isStrict
-                             ? aggregator->taggingsOfItem(item, *taxonomy, bits & ~QVCTAutoTaggingOptionNames)
-                             : report.taggings();
+            auto found =
+                isStrict ? aggregator->taggingsOfItem(item, *taxonomy, bits & ~notExact) : report.taggings();
             if (options.measuresAnyRhythm) addAnyRhythm(*item, *taxonomy, report.rejections, found);
             const Taggings taggings = sortedTaggings(found);
             totals.add(taggings);

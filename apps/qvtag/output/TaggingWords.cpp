@@ -36,7 +36,8 @@ int rankOfTag(std::string_view category, std::string_view label) {
     constexpr std::array<std::string_view, 4> bookkeeping = {QVCategoryContentTypeIdentifier, "System",
                                                              "Maintenance", QVCategorySoundpackIdentifier};
     const bool isKept = std::find(bookkeeping.begin(), bookkeeping.end(), category) != bookkeeping.end();
-    if (isKept || label == QVTagAnyKeyType) return kBookkeeping;
+    const bool isOfChannels = label == "Mono" || label == "Stereo";  // every sound is one of these
+    if (isKept || isOfChannels || label == QVTagAnyKeyType) return kBookkeeping;
     const auto* const place = std::find(kOrder.begin(), kOrder.end(), category);
     return static_cast<int>(place - kOrder.begin());
 }

@@ -109,10 +109,24 @@ class Decision {
         return {claim.service == "keywords" ? std::string_view("names") : claim.service, claim.distance};
     }
 
+    /// Of two poles only the one that is surest; its claim comes first.
+    static void doubtOpposites(std::vector<TagClaim>& claims) {
+        constexpr double kMiddle = 0.5;
+        for (TagClaim& claim : claims) {
+            if (!claim.level || !claims.front().level || !claim.doubt.empty()) continue;
+            if ((*claim.level - kMiddle) * (*claims.front().level - kMiddle) >= 0) continue;
+            claim.doubt = "the opposite is likelier";
+            claim.confidence = 0;
+        }
+    }
+
     void weigh(Candidate& candidate) const {
+        for (TagClaim& claim : candidate.claims) claim.confidence = claim.doubt.empty() ? weightOf(claim) : 0;
+        std::stable_sort(candidate.claims.begin(), candidate.claims.end(),
+                         [](const TagClaim& a, const TagClaim& b) { return a.confidence > b.confidence; });
+        doubtOpposites(candidate.claims);
         std::vector<std::pair<Source, double>> sources;
-        for (TagClaim& claim : candidate.claims) {
-            claim.confidence = claim.doubt.empty() ? weightOf(claim) : 0;
+        for (const TagClaim& claim : candidate.claims) {
             const auto source = std::find_if(sources.begin(), sources.end(), [&](const auto& known) {
                 return known.first == sourceOf(claim);
             });
@@ -123,8 +137,6 @@ class Decision {
             }
         }
         for (const auto& [_, weight] : sources) candidate.confidence = together(candidate.confidence, weight);
-        std::stable_sort(candidate.claims.begin(), candidate.claims.end(),
-                         [](const TagClaim& a, const TagClaim& b) { return a.confidence > b.confidence; });
         candidate.distance = candidate.claims.front().distance;
         if (candidate.tag == nullptr) {
             candidate.reason = "the taxonomy has no such tag";

@@ -28,7 +28,8 @@ enum QVCTAutoTaggingOptions : std::uint64_t {
     QVCTAutoTaggingOptionSoftwareInstruments = 0x080,
     QVCTAutoTaggingOptionUserGenerated = 0x100,
     QVCTAutoTaggingOptionTranslateTags = 0x200,
-    QVCTAutoTaggingOptionNames = 0x400
+    QVCTAutoTaggingOptionNames = 0x400,
+    QVCTAutoTaggingOptionSound = 0x800
 };
 
 /// What the services are given of an item whose tags are to be explained.

@@ -15,7 +15,7 @@ struct TaggingServiceName {
 };
 
 /// Databases number them: further ones come last.
-inline constexpr std::array<TaggingServiceName, 8> kTaggingServiceNames = {
+inline constexpr std::array<TaggingServiceName, 9> kTaggingServiceNames = {
     {{"keywords", QVCTAutoTaggingOptionFilenameKeywords},
      {"rules", QVCTAutoTaggingOptionXMLRules},
      {"rhythm", QVCTAutoTaggingOptionRhythm},
@@ -23,7 +23,8 @@ inline constexpr std::array<TaggingServiceName, 8> kTaggingServiceNames = {
      {"instruments", QVCTAutoTaggingOptionSoftwareInstruments},
      {"user", QVCTAutoTaggingOptionUserGenerated},
      {"translate", QVCTAutoTaggingOptionTranslateTags},
-     {"names", QVCTAutoTaggingOptionNames}}};
+     {"names", QVCTAutoTaggingOptionNames},
+     {"sound", QVCTAutoTaggingOptionSound}}};
 
 /// The options that run every service.
 constexpr std::uint64_t optionsForAllTaggingServices() {

@@ -1,0 +1,178 @@
+#include "listening/Listener.h"
+
+#include "listening/character/Loudness.h"
+#include "listening/character/SoundCharacter.h"
+#include "listening/character/TruePeak.h"
+#include "listening/instrument/InstrumentModel.h"
+#include "listening/instrument/LoopMeasures.h"
+#include "listening/instrument/SoundFeatures.h"
+#include "listening/onsets/OnsetDetector.h"
+#include "listening/pitch/LoopKey.h"
+#include "listening/pitch/NotePitch.h"
+#include "listening/sound/SoundExcerpt.h"
+#include "listening/tempo/LoopTempo.h"
+#include "media/audio/AudioDecoder.h"
+
+#include <algorithm>
+#include <cmath>
+#include <optional>
+#include <utility>
+#include <vector>
+
+namespace qvct {
+namespace {
+
+constexpr std::size_t kBlock = 8192;
+/// Shorter sounds have one beginning.
+constexpr double kShortestLoop = 0.75;
+constexpr double kEven = 0.5;
+
+}  // namespace
+
+struct Listener::Analysers {
+    std::shared_ptr<const InstrumentModel> model;
+    CharacterMeter character;
+    NotePitchDetector note;
+    LoopKeyDetector key;
+    std::optional<SoundFeatures> features;  // of the last rate
+    double featuresRate = 0;
+
+    // Of the sound at hand.
+    std::optional<SoundExcerpt> excerpt;
+    std::optional<OnsetDetector> onsets;
+    double rate = 1;
+
+    void begin(double sampleRate, int channels, std::int64_t frames) {
+        rate = sampleRate;
+        excerpt.emplace(sampleRate, channels, kMostSeconds);
+        onsets.reset();
+        if (static_cast<double>(frames) >= kShortestLoop * sampleRate) onsets.emplace(sampleRate, channels);
+    }
+    bool process(std::span<const float> frames) {
+        if (onsets) onsets->process(frames);
+        return excerpt->process(frames);
+    }
+
+    void addCharacter(HeardSound& sound);
+    void addKind(HeardSound& sound) const;
+    void addInstrument(HeardSound& sound);
+    void addNote(HeardSound& sound);
+    void addKey(HeardSound& sound);
+    void addTempo(HeardSound& sound);
+};
+
+void Listener::Analysers::addCharacter(HeardSound& sound) {
+    // Of one channel both are the same samples.
+    const auto right = sound.isStereo ? excerpt->right() : std::span<const float>();
+    sound.loudness = integratedLoudness(excerpt->left(), right, excerpt->sampleRate());
+    sound.truePeak = truePeak(excerpt->left(), right);
+    const auto its =
+        character.measure(excerpt->left(), excerpt->right(), excerpt->mono(), excerpt->sampleRate());
+    if (!its) return;
+    for (std::size_t i = 0; i < kCharacterScales; ++i) {
+        const CharacterScale scale = characterScale(i);
+        sound.traits.push_back({nameOf(scale), (*its)[scale].level, measureOf(scale), (*its)[scale].measure});
+    }
+}
+
+void Listener::Analysers::addKind(HeardSound& sound) const {
+    if (sound.seconds < kShortestLoop) {
+        sound.loopConfidence = 0;
+        return;
+    }
+    std::vector<std::int64_t> positions;
+    for (const std::int64_t onset : sound.onsets) {
+        const double frames = static_cast<double>(onset - excerpt->begin()) * excerpt->sampleRate() / rate;
+        positions.push_back(std::max<std::int64_t>(0, static_cast<std::int64_t>(frames)));
+    }
+    sound.loopConfidence = LoopMeasures::of(excerpt->mono(), excerpt->sampleRate(), positions).likelihood();
+}
+
+void Listener::Analysers::addInstrument(HeardSound& sound) {
+    if (!model || excerpt->sampleRate() < SoundFeatures::kLowestRate) return;
+    if (!features || featuresRate != excerpt->sampleRate()) {
+        featuresRate = excerpt->sampleRate();
+        features.emplace(featuresRate);
+    }
+    const auto judgement = model->judge(features->of(excerpt->mono()));
+    if (!judgement) return;
+    sound.instruments.push_back({std::string(judgement->label), judgement->confidence});
+    if (judgement->familyLabel != judgement->label)
+        sound.instruments.push_back({std::string(judgement->familyLabel), judgement->familyConfidence});
+}
+
+void Listener::Analysers::addNote(HeardSound& sound) {
+    if (const auto pitch = note.pitchOf(excerpt->mono(), excerpt->sampleRate()))
+        sound.note = {pitch->note, pitch->cents, pitch->confidence};
+}
+
+void Listener::Analysers::addKey(HeardSound& sound) {
+    if (const auto its = key.keyOf(excerpt->mono(), excerpt->sampleRate()))
+        sound.key = {its->tonic, its->mode == LoopKey::Mode::kMinor, its->confidence};
+}
+
+/// Of a loop that was heard to its end: its length tells most.
+void Listener::Analysers::addTempo(HeardSound& sound) {
+    if (sound.isCut) return;
+    const auto frames = static_cast<std::int64_t>(sound.seconds * rate);
+    std::vector<std::int64_t> positions;
+    for (const std::int64_t onset : sound.onsets)
+        if (onset >= excerpt->begin()) positions.push_back(onset - excerpt->begin());
+    for (const auto& tempo : LoopTempo::of(positions, frames, rate).candidates)
+        sound.tempos.push_back({tempo.bpm, tempo.beats, tempo.confidence});
+}
+
+Listener::Listener(std::shared_ptr<const InstrumentModel> model) : its_(std::make_unique<Analysers>()) {
+    its_->model = std::move(model);
+}
+
+Listener::~Listener() = default;
+
+const SoundExcerpt& Listener::excerpt() const {
+    return *its_->excerpt;
+}
+
+HeardSound Listener::listen(AudioDecoder& decoder) {
+    const int channels = decoder.channels();
+    its_->begin(decoder.sampleRate(), channels, decoder.frames());
+    const auto width = static_cast<std::size_t>(channels);
+    std::vector<float> block(std::max(kBlock / width, std::size_t{1}) * width);
+    std::size_t frames = 0;
+    do {
+        frames = decoder.read(block);
+    } while (frames > 0 && its_->process(std::span(block).first(frames * width)));
+    return judge();
+}
+
+HeardSound Listener::listen(std::span<const float> samples, double sampleRate, int channels) {
+    const auto width = static_cast<std::size_t>(channels);
+    const std::size_t frames = samples.size() / width;
+    its_->begin(sampleRate, channels, static_cast<std::int64_t>(frames));
+    its_->process(samples.first(frames * width));
+    return judge();
+}
+
+HeardSound Listener::judge() {
+    SoundExcerpt& excerpt = *its_->excerpt;
+    excerpt.finish();
+    HeardSound sound;
+    sound.seconds = excerpt.seconds();
+    sound.isCut = excerpt.isCut();
+    sound.isStereo = excerpt.isStereo();
+    sound.sampleRate = its_->rate;
+    if (its_->onsets) sound.onsets = its_->onsets->finish();
+    if (excerpt.mono().empty()) return sound;
+    its_->addCharacter(sound);
+    its_->addKind(sound);
+    if (sound.loopConfidence.value_or(0) <= kEven) {
+        its_->addInstrument(sound);
+        its_->addNote(sound);
+    }
+    if (sound.loopConfidence.value_or(1) >= kEven) {
+        its_->addKey(sound);
+        its_->addTempo(sound);
+    }
+    return sound;
+}
+
+}  // namespace qvct
