@@ -65,6 +65,8 @@ TEST(SoundClaims, TellTheKeyAndThePolesThatASoundIsNearTo) {
     EXPECT_THAT(heldOf(claimsOfSound(sound), SoundKind::loop),
                 ElementsAre("Low / High 1.0", "Mono", "ASharp", "Minor KeyType", "Bright / Dark 0.1",
                             "Soft / Hard 0.9"));
+    sound.traits.push_back({"Tonal / Non-Tonal", 0.14, "flatness, dB", -30});
+    EXPECT_EQ(heldOf(claimsOfSound(sound), SoundKind::loop).size(), 6U) << "of four poles the nearest three";
     sound.key->isMinor = false;
     sound.key->tonic = 0;
     sound.traits.clear();

@@ -31,6 +31,11 @@ std::string percent(double confidence) {
     return fmt::format("{:.0f} %", confidence * 100);
 }
 
+/// What is shown as 0.0 has no sign.
+double withoutMinusZero(double decibels) {
+    return std::abs(decibels) < 0.05 ? 0 : decibels;
+}
+
 /// Whether it is a loop, if that is said at all.
 std::optional<bool> isLoop(const HeardSound& sound) {
     constexpr double kEven = 0.5;
@@ -58,7 +63,7 @@ std::string factsOf(const HeardSound& sound) {
     facts.push_back(fmt::format("{}{:.3g} s", sound.isCut ? "the first " : "", sound.seconds));
     facts.emplace_back(sound.isStereo ? "stereo" : "mono");
     if (sound.loudness) facts.push_back(fmt::format("{:.1f} LUFS", *sound.loudness));
-    if (sound.truePeak) facts.push_back(fmt::format("peak {:.1f} dB", *sound.truePeak));
+    if (sound.truePeak) facts.push_back(fmt::format("peak {:.1f} dB", withoutMinusZero(*sound.truePeak)));
     return join(facts, "  ");
 }
 

@@ -5,6 +5,7 @@
 
 #include <algorithm>
 #include <cmath>
+#include <iterator>
 #include <string>
 #include <utility>
 
@@ -20,6 +21,8 @@ constexpr double kSteps = 100;
 
 /// Of all sounds this share lies beyond at each end.
 constexpr double kPole = 0.15;
+/// What is bright is mostly cold and high as well: a few say enough.
+constexpr std::size_t kMostPoles = 3;
 constexpr std::string_view kWidth = "Narrow / Wide";
 
 TagClaim claimOf(std::string label, double confidence, std::string what) {
@@ -56,13 +59,17 @@ void addChannels(const HeardSound& sound, std::vector<TagClaim>& claims) {
 
 /// The nearer to the pole, the surer. That one channel is narrow need not be said.
 void addTraits(const HeardSound& sound, std::vector<TagClaim>& claims) {
+    std::vector<TagClaim> poles;
     for (const auto& [scale, level, measure, value] : sound.traits) {
         const double fromPole = std::min(level, 1 - level);
         if (fromPole >= kPole || (scale == kWidth && !sound.isStereo)) continue;
-        TagClaim claim = claimOf(std::string(scale), 1 - fromPole, fmt::format("{} {:.3g}", measure, value));
-        claim.level = std::round(level * kSteps) / kSteps;
-        claims.push_back(std::move(claim));
+        poles.push_back(claimOf(std::string(scale), 1 - fromPole, fmt::format("{} {:.3g}", measure, value)));
+        poles.back().level = std::round(level * kSteps) / kSteps;
     }
+    std::stable_sort(poles.begin(), poles.end(),
+                     [](const TagClaim& a, const TagClaim& b) { return a.confidence > b.confidence; });
+    poles.resize(std::min(poles.size(), kMostPoles));
+    std::move(poles.begin(), poles.end(), std::back_inserter(claims));
 }
 
 }  // namespace
