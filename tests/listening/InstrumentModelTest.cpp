@@ -94,7 +94,8 @@ TEST(InstrumentModel, MultipliesRectifiesAndCompares) {
 }
 
 TEST(InstrumentModel, SaysTheLikeliestFamilyAndItsLikeliestLabel) {
-    const auto judged = modelOf({})->judge(features(0));
+    const auto plain = modelOf({});  // which owns the labels
+    const auto judged = plain->judge(features(0));
     ASSERT_TRUE(judged);
     EXPECT_EQ(judged->label, "Kick");
     EXPECT_EQ(judged->familyLabel, "Kick");

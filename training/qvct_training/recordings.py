@@ -17,6 +17,9 @@ MOST_SECONDS = 2.2
 # Tried in this order on a file's name, in small letters; None is a sound that no class stands for.
 _NAMES: list[tuple[str, str | None]] = [
     (r"loop|brk|break|roll|flam|fx|vinyl|scratch|stomp|heel|hit$", None),
+    (r"conga", "conga"),
+    (r"bongo", "bongo"),
+    (r"\btom-", "tom"),  # "tom-hh" is a high one
     (r"hi?_?-?h?at.*pedal|pedal.*h(h|at)|hh_?ped|hhp", "closed hat"),
     (r"(hh?|hi-?_?h?at|hat).*(open|opn)|open.*(hh|hat)|hho|hat_?o\b|_oh\b|^oh\d|ophat", "open hat"),
     (r"hi-?_?h?at|hihat|\bhh|hat\b|hat[_\d]|hhc|chat|^ch\d|_ch\b|closedhat", "closed hat"),
@@ -26,8 +29,6 @@ _NAMES: list[tuple[str, str | None]] = [
     (r"cow_?b|agogo.?cow", "cowbell"),
     (r"tamb", "tambourine"),
     (r"shak|cabas|marac|caxixi|egg", "shaker"),
-    (r"conga", "conga"),
-    (r"bongo", "bongo"),
     (r"clave", "clave"),
     (r"wood|block", "woodblock"),
     (r"crash", "crash"),

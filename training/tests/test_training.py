@@ -49,7 +49,7 @@ def test_augmentation_keeps_a_sound_finite() -> None:
     ("stem", "name"),
     [
         ("tr505-hihat-closed", "closed hat"), ("hihat-open", "open hat"), ("OHH_1", None), ("tamb-short", "tambourine"),
-        ("conga-hh", "conga"), ("stick-m", "rim"), ("Kick 01", "kick"), ("cowb-l", "cowbell"), ("cymball-long", "cymbal"),
+        ("conga-hh", "conga"), ("tom-hh", "tom"), ("stick-m", "rim"), ("Kick 01", "kick"), ("cowb-l", "cowbell"), ("cymball-long", "cymbal"),
         ("loop_amen", None), ("bd_808", "kick"), ("Ride Bell", "ride"), ("cabasa", "shaker"), ("melody", None),
     ],
 )  # fmt: skip
