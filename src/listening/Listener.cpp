@@ -41,9 +41,11 @@ struct Listener::Analysers {
     std::optional<SoundExcerpt> excerpt;
     std::optional<OnsetDetector> onsets;
     double rate = 1;
+    bool hasOneChannel = true;
 
     void begin(double sampleRate, int channels, std::int64_t frames) {
         rate = sampleRate;
+        hasOneChannel = channels == 1;
         excerpt.emplace(sampleRate, channels, kMostSeconds);
         onsets.reset();
         if (static_cast<double>(frames) >= kShortestLoop * sampleRate) onsets.emplace(sampleRate, channels);
@@ -62,8 +64,8 @@ struct Listener::Analysers {
 };
 
 void Listener::Analysers::addCharacter(HeardSound& sound) {
-    // Of one channel both are the same samples.
-    const auto right = sound.isStereo ? excerpt->right() : std::span<const float>();
+    // Two channels that are the same are louder than one.
+    const auto right = hasOneChannel ? std::span<const float>() : excerpt->right();
     sound.loudness = integratedLoudness(excerpt->left(), right, excerpt->sampleRate());
     sound.truePeak = truePeak(excerpt->left(), right);
     const auto its =
