@@ -60,7 +60,9 @@ SoundExcerpt::Frame SoundExcerpt::frameAt(const float* samples) const {
     if (channels_ == 1) return {boundedSample(samples[0]), boundedSample(samples[0])};
     std::array<float, 2> sums{};
     for (std::size_t c = 0; c < channels_; ++c) sums[c % 2] += boundedSample(samples[c]);
-    return {sums[0] / static_cast<float>((channels_ + 1) / 2), sums[1] / static_cast<float>(channels_ / 2)};
+    const std::size_t ofRight = channels_ / 2;
+    const std::size_t ofLeft = channels_ - ofRight;
+    return {sums[0] / static_cast<float>(ofLeft), sums[1] / static_cast<float>(ofRight)};
 }
 
 std::size_t SoundExcerpt::silentFrames(std::span<const float> frames) const {
