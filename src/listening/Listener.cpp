@@ -165,6 +165,7 @@ HeardSound Listener::judge() {
     if (its_->onsets) sound.onsets = its_->onsets->finish();
     if (excerpt.mono().empty()) return sound;
     its_->addCharacter(sound);
+    if (sound.traits.empty()) return sound;  // too little to hear anything in, or a constant
     its_->addKind(sound);
     if (sound.loopConfidence.value_or(0) <= kEven) {
         its_->addInstrument(sound);

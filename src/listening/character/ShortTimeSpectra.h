@@ -1,10 +1,10 @@
 #pragma once
 
+#include "listening/sound/FourTransforms.h"
 #include "platform/base/Lanes.h"
 
 #include <complex>
 #include <cstddef>
-#include <memory>
 #include <span>
 #include <vector>
 
@@ -22,7 +22,6 @@ class ShortTimeSpectra {
   public:
     /// REQUIRES: 1 <= sampleRate <= 64,000.
     explicit ShortTimeSpectra(double sampleRate);
-    ~ShortTimeSpectra();
 
     /// Windows that are looked at in one sound, at most.
     static constexpr std::size_t kMostWindows = 64;
@@ -39,13 +38,11 @@ class ShortTimeSpectra {
     std::span<const std::complex<Lanes>> at(std::span<const float> samples, float mean, std::size_t first);
 
   private:
-    struct Transform;
-
     void load(std::span<const float> samples, float mean, std::size_t lane, std::size_t window);
 
     double binHertz_;
+    FourTransforms transforms_;
     std::vector<float> window_;
-    std::unique_ptr<Transform> transform_;
 };
 
 }  // namespace qvct

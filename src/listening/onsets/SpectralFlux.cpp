@@ -1,13 +1,11 @@
 #include "listening/onsets/SpectralFlux.h"
 
+#include "listening/sound/FourTransforms.h"
 #include "platform/base/Lanes.h"
 
 #include <algorithm>
 #include <cmath>
 #include <complex>
-#include <numbers>
-
-#include <kissfft.hh>
 
 namespace qvct {
 namespace {
@@ -27,19 +25,6 @@ constexpr float kFall = 0.25F;        // octaves of magnitude by which a held le
 constexpr double kHigh = 7000;        // Hz from which on rises count for themselves, too
 constexpr float kHighShare = 0.6F;    // their weight
 
-// An even product of small primes, which transforms quickly.
-std::size_t windowSizeFor(double sampleRate) {
-    auto half =
-        std::max(kSmallestWindow, static_cast<std::size_t>(std::lround(sampleRate * kWindowSeconds))) / 2;
-    for (;; ++half) {
-        std::size_t rest = half;
-        for (const std::size_t prime : {2U, 3U, 5U}) {
-            while (rest % prime == 0) rest /= prime;
-        }
-        if (rest == 1) return 2 * half;
-    }
-}
-
 // The frames two before these four: the last two of the former four, then the first two of these.
 Lanes twoBefore(Lanes former, Lanes these) {
     return Lanes(__builtin_shufflevector(former.v, these.v, 2, 3, 4, 5));
@@ -48,12 +33,9 @@ Lanes twoBefore(Lanes former, Lanes these) {
 }  // namespace
 
 struct SpectralFlux::Transform {
-    explicit Transform(std::size_t size)
-        : plan(size / 2, false), input(size), bins(size / 2), magnitudes(size / 2) {}
+    explicit Transform(std::size_t size) : four(size), magnitudes(size / 2) {}
 
-    kissfft<Lanes> plan;
-    std::vector<Lanes> input;
-    std::vector<std::complex<Lanes>> bins;
+    FourTransforms four;
     std::vector<Lanes> magnitudes;
     // By band: of these four frames and of the four before, and what these are compared with.
     std::vector<Lanes> levels, formerLevels, heldLevels;
@@ -62,10 +44,9 @@ struct SpectralFlux::Transform {
 SpectralFlux::SpectralFlux(double sampleRate)
     : hop_(std::max<std::size_t>(1, static_cast<std::size_t>(std::lround(sampleRate / kFramesPerSecond)))),
       framesPerSecond_(sampleRate / static_cast<double>(hop_)),
-      window_(windowSizeFor(sampleRate)),
+      window_(FourTransforms::window(FourTransforms::sizeFor(kWindowSeconds, sampleRate, kSmallestWindow))),
       loudest_(kQuietest),
       transform_(std::make_unique<Transform>(window_.size())) {
-    makeWindow();
     makeBands(sampleRate);
     transform_->levels.resize(bands_.size());
     transform_->formerLevels.resize(bands_.size());
@@ -74,15 +55,6 @@ SpectralFlux::SpectralFlux(double sampleRate)
 }
 
 SpectralFlux::~SpectralFlux() = default;
-
-// A Hann window, scaled so that a sine has its amplitude as magnitude.
-void SpectralFlux::makeWindow() {
-    const auto size = static_cast<double>(window_.size());
-    for (std::size_t i = 0; i < window_.size(); ++i) {
-        const double phase = 2 * std::numbers::pi * (static_cast<double>(i) + 0.5) / size;
-        window_[i] = static_cast<float>((1 - std::cos(phase)) * 2 / size);
-    }
-}
 
 // Triangles from one centre to the next; where bins are wider than a band, one band a bin.
 void SpectralFlux::makeBands(double sampleRate) {
@@ -108,15 +80,16 @@ void SpectralFlux::makeBands(double sampleRate) {
 }
 
 void SpectralFlux::transform(const float* samples) {
-    auto& [plan, input, bins, magnitudes, levels, formerLevels, heldLevels] = *transform_;
+    const std::span<Lanes> input = transform_->four.input();
     for (std::size_t i = 0; i < window_.size(); ++i) {
         const float* sample = samples + i;
         const Lanes::Vector four = {sample[0], sample[hop_], sample[2 * hop_], sample[3 * hop_]};
         input[i] = Lanes(four) * window_[i];
     }
-    plan.transform_real(input.data(), bins.data());
+    const std::span<const std::complex<Lanes>> bins = transform_->four.transform();
     for (std::size_t i = 0; i < bins.size(); ++i) {
-        magnitudes[i] = squareRoot(bins[i].real() * bins[i].real() + bins[i].imag() * bins[i].imag());
+        transform_->magnitudes[i] =
+            squareRoot(bins[i].real() * bins[i].real() + bins[i].imag() * bins[i].imag());
     }
 }
 

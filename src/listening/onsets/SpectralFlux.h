@@ -45,7 +45,6 @@ class SpectralFlux {
         std::size_t firstBin, firstWeight, count;
     };
 
-    void makeWindow();
     void makeBands(double sampleRate);
     void transform(const float* samples);
     void measureBands();

@@ -1,10 +1,10 @@
 #pragma once
 
+#include "listening/sound/FourTransforms.h"
 #include "platform/base/Lanes.h"
 
 #include <array>
 #include <cstddef>
-#include <memory>
 #include <span>
 #include <vector>
 
@@ -17,7 +17,6 @@ class FourSpectra {
   public:
     /// REQUIRES: size is even.
     explicit FourSpectra(std::size_t size);
-    ~FourSpectra();
 
     /// The next even product of small primes from `seconds` of samples on, which transforms quickly.
     static std::size_t sizeFor(double seconds, double sampleRate);
@@ -34,10 +33,9 @@ class FourSpectra {
     std::span<const Lanes> powers(const std::array<const float*, 4>& frames, std::size_t length);
 
   private:
-    struct Transform;
-
+    FourTransforms transforms_;
     std::vector<float> window_;
-    std::unique_ptr<Transform> transform_;
+    std::vector<Lanes> powers_;
 };
 
 }  // namespace qvct
