@@ -57,6 +57,7 @@ set(QVCT_PUBLIC_HEADERS
   autotagging/keywords/QVCTKeywordExtractor.h
   autotagging/xml/QVCTXMLDocument.h
   autotagging/xml/QVSKXMLNode.h
+  autotagging/Contradictions.h
   autotagging/ItemTagger.h
   autotagging/ResourceFiles.h
   autotagging/evidence/ClaimResolver.h

@@ -39,6 +39,7 @@ void addCommands(Command tool, ToolContext& context) {
     addIndexCommand(tool, context);
     addInspectCommand(tool, context);
     addKeywordsCommand(tool, context);
+    addLintCommand(tool, context);
     addListenCommand(tool, context);
     addObjectCommand(tool, context);
     addReadCommand(tool, context);

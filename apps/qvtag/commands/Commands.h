@@ -18,6 +18,7 @@ void addInspectCommand(Command& tool, ToolContext& context);
 void addDatabaseCommand(Command& tool, ToolContext& context);
 void addIndexCommand(Command& tool, ToolContext& context);
 void addKeywordsCommand(Command& tool, ToolContext& context);
+void addLintCommand(Command& tool, ToolContext& context);
 void addListenCommand(Command& tool, ToolContext& context);
 void addObjectCommand(Command& tool, ToolContext& context);
 void addRhythmCommand(Command& tool, ToolContext& context);

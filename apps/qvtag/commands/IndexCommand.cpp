@@ -1,5 +1,6 @@
 #include "CommandLine.h"
 #include "Services.h"
+#include "autotagging/services/QVCTAutoTaggingService.h"
 #include "commands/Commands.h"
 #include "contentdb/ContentDatabase.h"
 #include "contentdb/ContentDescriber.h"
@@ -20,6 +21,7 @@ using contentdb::IndexProgress;
 struct Options {
     IndexOptions index;
     std::vector<std::string> services;
+    bool listens = true;
     unsigned secondsPerItem = 30;
 };
 
@@ -58,7 +60,8 @@ std::uint64_t countItems(const std::string& folder, LinksOutside links) {
 }
 
 void run(Options& options, ToolContext& context) {
-    const auto services = optionsForServices(options.services, context);
+    auto services = optionsForServices(options.services, context);
+    if (!options.listens) services &= ~std::uint64_t{QVCTAutoTaggingOptionSound};
     // Indexing with fewer services would mark the items as done. That a resource is broken does no harm: the
     // built-in one is used, and items are read again when it is whole.
     if (context.isUsageWrong()) return;
@@ -116,6 +119,12 @@ void addIndexCommand(Command& tool, ToolContext& context) {
                     "Read the database whole first; what is damaged is built anew. Without, only its pages "
                     "are held against their checksums");
     addServicesOption(command, options->services);
+    const Option listen = command.addFlag("--listen", options->listens, "Listen to sounds; the default");
+    command
+        .addFlag(
+            "--no-listen", [options] { options->listens = false; },
+            "Do not listen to sounds: what has no telling name stays unknown, but a run is faster")
+        .excludes(listen);
     Option part = command.addOption("--part", index.part, "Index only part I of the items")
                       .valueName("I")
                       .between(1, 1000000);
