@@ -5,6 +5,11 @@ target_compile_options(qvct_build_flags INTERFACE -Wall -Wextra -Wpedantic -Wcon
 if(QVCT_WARNINGS_AS_ERRORS)
   target_compile_options(qvct_build_flags INTERFACE -Werror)
 endif()
+# What is shipped carries only the functions that something calls: the tool and the shared libraries each link a part of
+# the same objects.
+set(shipped "$<CONFIG:Release,RelWithDebInfo,MinSizeRel>")
+target_compile_options(qvct_build_flags INTERFACE "$<${shipped}:-ffunction-sections;-fdata-sections>")
+target_link_options(qvct_build_flags INTERFACE "$<${shipped}:-Wl,--gc-sections>")
 if(QVCT_SANITIZERS)
   set(sanitize "-fsanitize=${QVCT_SANITIZERS}")
   target_compile_options(qvct_build_flags INTERFACE
