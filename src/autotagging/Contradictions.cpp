@@ -3,8 +3,10 @@
 #include "autotagging/ContentItem.h"
 #include "autotagging/ItemTagger.h"
 #include "listening/HeardSound.h"
+#include "listening/instrument/InstrumentModel.h"
 #include "media/loopfile/LCFileData.h"
 #include "metadata/TGRTMetaData.h"
+#include "resources/DefaultInstrumentModel.h"
 #include "taxonomy/TGRTTagging.h"
 #include "taxonomy/TaggingTypes.h"
 
@@ -210,6 +212,18 @@ class Search {
         return false;
     }
 
+    /// The nearest tag that can be heard: a cabasa is heard as percussion.
+    static std::shared_ptr<TGRTTag> heardAs(std::shared_ptr<TGRTTag> tag) {
+        const auto model = defaultInstrumentModel();
+        const auto isKnown = [&model](const std::string& label) {
+            for (std::size_t i = 0; i < model->classes(); ++i)
+                if (model->label(i) == label) return true;
+            return false;
+        };
+        while (!isKnown(tag->label()) && tag->parent()) tag = tag->parent();
+        return tag;
+    }
+
     struct Instrument {
         std::shared_ptr<TGRTTag> tag;
         Statement statement;
@@ -246,7 +260,8 @@ class Search {
         const Instrument* contradicted = nullptr;
         for (const Instrument& instrument : stated) {
             if (isAboveAnother(instrument, stated)) continue;
-            if (isOrIsAbove(*instrument.tag, *heard) || isOrIsAbove(*heard, *instrument.tag)) return;
+            const auto tag = heardAs(instrument.tag);
+            if (isOrIsAbove(*tag, *heard) || isOrIsAbove(*heard, *tag)) return;
             if (contradicted == nullptr) contradicted = &instrument;
         }
         if (contradicted != nullptr)

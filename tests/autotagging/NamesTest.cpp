@@ -187,6 +187,8 @@ TEST(Names, TellKeyTempoAndKindWhereTheyStand) {
         {"Vol 2 Beats", "", ""},
         {"SP12 Beats", "", ""},
         {"Bar 3 A", "", ""},
+        {"bloop", "", ""},
+        {"hatloop", "", "", 0, SoundKind::loop},
     };
     for (const auto& row : rows) {
         const NameReading reading = readingOf(row.name);

@@ -110,6 +110,7 @@ void NameScan::noteKindInside(const NamePiece& piece) {
     constexpr std::size_t shortest = 4, longest = 12;
     const std::size_t size = piece.folded.size();
     for (std::size_t at = size - std::min(size, longest); at + shortest <= size; ++at) {
+        if (at == 1) continue;  // "bloop"
         const NameRole role = habits_.roleOf(piece.folded.substr(at));
         if (role == NameRole::loop || (at == 0 && role == NameRole::oneShot)) noteKind(role);
     }
