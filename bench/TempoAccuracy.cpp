@@ -37,6 +37,33 @@ struct Score {
     }
 };
 
+// What confidences are worth: of the tempos that are said with about the same, how many are right.
+class Reliability {
+  public:
+    void add(const LoopTempo& found, double bpm) {
+        if (found.candidates.empty()) return;
+        const auto& [its, beats, isWhole, confidence] = found.candidates[0];
+        Bin& bin = bins_[std::min(std::size(bins_) - 1, static_cast<std::size_t>(confidence * 5))];
+        ++bin.count;
+        bin.said += confidence;
+        bin.right += std::abs(its / bpm - 1) <= 0.01;
+    }
+    void print() const {
+        for (const Bin& bin : bins_) {
+            if (bin.count == 0) continue;
+            printRow(fmt::format("  {} beats: confidence, right", bin.count),
+                     fmt::format("{:.2f}, {:.2f}", bin.said / bin.count, double(bin.right) / bin.count), "");
+        }
+    }
+
+  private:
+    struct Bin {
+        int count = 0, right = 0;
+        double said = 0;
+    };
+    Bin bins_[5];
+};
+
 void print(const std::string& name, const Score& score, const char* target) {
     const auto share = [&](int part) { return score.loops > 0 ? double(part) / score.loops : 0; };
     printRow(fmt::format("{}: tempo, any level, among three", name),
@@ -66,17 +93,21 @@ std::string kindOf(const std::string& name, int bars) {
 void measure(const DrumCorpus& corpus, std::size_t part) {
     const std::vector<std::string> names = grooveNames();
     std::map<bool, Score> beats;
+    Reliability reliability;
     std::map<std::pair<bool, std::string>, Score> kinds;
     std::vector<double> times;
     const auto measureLoop = [&](const GrooveLoop& loop, const std::string& name, bool hasTail) {
         OnsetDetector detector(kRate, 1);
         detector.process(loop.samples);
-        const std::vector<std::int64_t> onsets = detector.finish();
+        const std::vector<Onset> onsets = detector.finishWithLoudness();
         const auto frames = static_cast<std::int64_t>(loop.samples.size());
         LoopTempo tempo;
         times.push_back(medianSeconds([&] { tempo = LoopTempo::of(onsets, frames, kRate); }, 3, clockTime));
         const std::string kind = kindOf(name, loop.bars);
-        if (kind != "fills") beats[hasTail].add(tempo, loop.bpm, !hasTail);
+        if (kind != "fills") {
+            beats[hasTail].add(tempo, loop.bpm, !hasTail);
+            reliability.add(tempo, loop.bpm);
+        }
         kinds[{hasTail, kind}].add(tempo, loop.bpm, !hasTail);
     };
     for (std::size_t i = part; i < std::min(names.size(), corpus.grooves.size()); i += 2) {
@@ -93,6 +124,7 @@ void measure(const DrumCorpus& corpus, std::size_t part) {
         for (const auto& [key, score] : kinds)
             if (key.first == hasTail) print("  " + key.second + " " + tail, score, "");
     }
+    reliability.print();
     printRow("time of a loop, its onsets known", fmt::format("{:.0f} µs", medianOf(times) * 1e6), "");
 }
 

@@ -3,8 +3,8 @@
 // Reads sounds from standard input, each as its rate in Hz and its length (two 32-bit numbers) and mono
 // samples (32-bit floats). Writes the version of the features and how many there are (two 32-bit numbers),
 // then those of each sound (32-bit floats), all 0 for silence. Everything is in the machine's own byte order.
-// With
-// "--loops" the features are what tells loops from one-shots.
+// With "--loops" the features are what tells loops from one-shots; "--tempos" is told of in Tempos.h.
+#include "Tempos.h"
 #include "listening/instrument/LoopMeasures.h"
 #include "listening/instrument/SoundFeatures.h"
 #include "listening/onsets/OnsetDetector.h"
@@ -50,7 +50,9 @@ std::vector<float> loopFeatures(const std::vector<float>& samples, std::uint32_t
 }  // namespace
 
 int main(int count, char** arguments) {
-    const bool loops = count > 1 && std::string_view(arguments[1]) == "--loops";
+    const std::string_view option = count > 1 ? arguments[1] : "";
+    if (option == "--tempos") return qvct::writeTempoFeatures() ? 0 : complain("a loop that is cut off");
+    const bool loops = option == "--loops";
     const std::size_t features = loops ? LoopMeasures::kCount : SoundFeatures::count();
     const std::uint32_t head[] = {SoundFeatures::kVersion, static_cast<std::uint32_t>(features)};
     std::fwrite(head, sizeof(head), 1, stdout);

@@ -39,7 +39,8 @@ struct Listener::Analysers {
 
     // Of the sound at hand.
     std::optional<SoundExcerpt> excerpt;
-    std::optional<OnsetDetector> onsets;
+    std::optional<OnsetDetector> detector;
+    std::vector<Onset> onsets;
     double rate = 1;
     bool hasOneChannel = true;
 
@@ -47,11 +48,11 @@ struct Listener::Analysers {
         rate = sampleRate;
         hasOneChannel = channels == 1;
         excerpt.emplace(sampleRate, channels, kMostSeconds);
-        onsets.reset();
-        if (static_cast<double>(frames) >= kShortestLoop * sampleRate) onsets.emplace(sampleRate, channels);
+        detector.reset();
+        if (static_cast<double>(frames) >= kShortestLoop * sampleRate) detector.emplace(sampleRate, channels);
     }
     bool process(std::span<const float> frames) {
-        if (onsets) onsets->process(frames);
+        if (detector) detector->process(frames);
         return excerpt->process(frames);
     }
 
@@ -113,14 +114,17 @@ void Listener::Analysers::addKey(HeardSound& sound) {
         sound.key = {its->tonic, its->mode == LoopKey::Mode::kMinor, its->confidence};
 }
 
-/// Of a loop that was heard to its end: its length tells most.
+/// Of a loop that was heard to its end: its length tells most. A little silence at its beginning is part of
+/// it, more is not.
 void Listener::Analysers::addTempo(HeardSound& sound) {
+    constexpr double kMostSilence = 0.05;
     if (sound.isCut) return;
-    const auto frames = static_cast<std::int64_t>(sound.seconds * rate);
-    std::vector<std::int64_t> positions;
-    for (const std::int64_t onset : sound.onsets)
-        if (onset >= excerpt->begin()) positions.push_back(onset - excerpt->begin());
-    for (const auto& tempo : LoopTempo::of(positions, frames, rate).candidates)
+    const bool isLate = static_cast<double>(excerpt->begin()) > kMostSilence * rate;
+    const std::int64_t begin = isLate ? excerpt->begin() : 0;
+    const std::int64_t frames = excerpt->begin() - begin + std::llround(sound.seconds * rate);
+    std::vector<Onset> its = onsets;
+    for (Onset& onset : its) onset.frame -= begin;
+    for (const auto& tempo : LoopTempo::of(its, frames, rate).candidates)
         sound.tempos.push_back({tempo.bpm, tempo.beats, tempo.confidence});
 }
 
@@ -162,7 +166,8 @@ HeardSound Listener::judge() {
     sound.isCut = excerpt.isCut();
     sound.isStereo = excerpt.isStereo();
     sound.sampleRate = its_->rate;
-    if (its_->onsets) sound.onsets = its_->onsets->finish();
+    its_->onsets = its_->detector ? its_->detector->finishWithLoudness() : std::vector<Onset>();
+    sound.onsets = framesOf(its_->onsets);
     if (excerpt.mono().empty()) return sound;
     its_->addCharacter(sound);
     if (sound.traits.empty()) return sound;  // too little to hear anything in, or a constant

@@ -55,6 +55,20 @@ TEST(Listener, TellsALoopFromASingleSound) {
     EXPECT_TRUE(loop.instruments.empty());
 }
 
+TEST(Listener, SilenceBeforeALoopIsNoPartOfItUnlessItIsShort) {
+    const Samples loop = tones(220, 8 * 60 / 118.0, 60 / 118.0);
+    for (const double silence : {0.01, 0.7}) {
+        Samples samples(static_cast<std::size_t>(silence * kRate));
+        const bool isShort = silence < 0.05;
+        samples.insert(samples.end(), loop.begin(),
+                       loop.end() - (isShort ? std::lround(silence * kRate) : 0));
+        const HeardSound heard = listener().listen(samples, kRate, 1);
+        ASSERT_FALSE(heard.tempos.empty()) << silence;
+        EXPECT_NEAR(heard.tempos.front().bpm, 118, 0.01) << silence;
+        EXPECT_NEAR(heard.tempos.front().beats, 8, 1e-3) << silence;
+    }
+}
+
 TEST(Listener, CountsBothChannelsOfWhatIsTwiceTheSame) {
     const Samples mono = tones(220, 1, 10);
     const HeardSound one = listener().listen(mono, kRate, 1);

@@ -1,72 +1,72 @@
 #include "listening/tempo/LoopTempo.h"
 
 #include "listening/tempo/BeatGrid.h"
-#include "listening/tempo/OnsetSpectrum.h"
 
 #include <algorithm>
 #include <array>
 #include <cmath>
+#include <limits>
 #include <numeric>
 
 namespace qvct {
 namespace {
 
 constexpr std::size_t kMost = 5;
-constexpr std::size_t kMostOnsets = 512;
 constexpr double kSame = 0.01;  // share of a tempo by which others differ at least
 
-// Fitted by logistic regression: docs/analysis.md says on what. In the order of BeatGrid::Feature.
-constexpr std::array<double, BeatGrid::kFeatures> kWeights = {4.14, 3.37, 7.28, 1.31,  -3.04,
-                                                              0.99, 0.68, 1.82, -2.22, -2.27};
+// Fitted: docs/analysis.md says how. In the order of BeatGrid::Feature.
+constexpr std::array<double, BeatGrid::kFeatures> kWeights = {
+    1.88, 3.11,  -0.77, 8.27, 2.23, -0.49, -2.47, 5.05, 5.69, 2.20,  -0.26, -6.93,
+    2.00, -0.57, -0.23, 0.38, 2.04, 5.66,  -0.64, 1.16, 0.79, -1.40, -1.72};
 
-// Unites a tempo with a likelier one that is the same.
-void add(std::vector<TempoCandidate>& found, const TempoCandidate& candidate) {
-    const auto same = std::find_if(found.begin(), found.end(), [&](const TempoCandidate& other) {
-        return std::abs(other.bpm / candidate.bpm - 1) <= kSame;
-    });
-    if (same != found.end()) {
-        same->confidence += candidate.confidence;
-    } else {
-        found.push_back(candidate);
-    }
-}
-
-std::vector<double> timesOf(std::span<const std::int64_t> onsets, std::int64_t frames, double sampleRate) {
-    const double most = std::min(static_cast<double>(frames), OnsetSpectrum::kMostSeconds * sampleRate);
-    std::vector<double> times;
-    for (const std::int64_t onset : onsets) {
-        if (onset < 0 || static_cast<double>(onset) >= most || times.size() == kMostOnsets) continue;
-        times.push_back(static_cast<double>(onset) / sampleRate);
-    }
-    return times;
-}
-
-}  // namespace
-
-LoopTempo LoopTempo::of(std::span<const std::int64_t> onsets, std::int64_t frames, double sampleRate) {
-    const double seconds = static_cast<double>(frames) / sampleRate;
+// Their probabilities, in the order of the tempos.
+std::vector<TempoCandidate> weighed(const std::vector<BeatGrid>& grids) {
     std::vector<TempoCandidate> all;
-    for (const BeatGrid& grid : BeatGrid::candidates(timesOf(onsets, frames, sampleRate), seconds)) {
+    double best = -std::numeric_limits<double>::infinity();
+    for (const BeatGrid& grid : grids) {
         const double score = std::inner_product(kWeights.begin(), kWeights.end(), grid.features.begin(), 0.0);
-        all.push_back({grid.bpm, grid.beats, grid.features[BeatGrid::kWhole] > 0, score});
+        all.push_back({grid.bpm, grid.beats, grid.isWhole(), score});
+        best = std::max(best, score);
     }
-    const auto isLikelier = [](const TempoCandidate& a, const TempoCandidate& b) {
-        return a.confidence > b.confidence;
-    };
-    std::sort(all.begin(), all.end(), isLikelier);
-    const double best = all.empty() ? 0 : all.front().confidence;
     double sum = 0;
     for (TempoCandidate& candidate : all) {
         candidate.confidence = std::exp(candidate.confidence - best);
         sum += candidate.confidence;
     }
-    LoopTempo tempo;
-    for (TempoCandidate& candidate : all) {
-        candidate.confidence /= sum;
-        add(tempo.candidates, candidate);
+    for (TempoCandidate& candidate : all) candidate.confidence /= sum;
+    std::sort(all.begin(), all.end(),
+              [](const TempoCandidate& a, const TempoCandidate& b) { return a.bpm < b.bpm; });
+    return all;
+}
+
+// The tempo that most of the probability lies near, of those the one that is itself likeliest; its confidence
+// is that of all near it. Takes out also what is a little further off: the rest of the same peak.
+TempoCandidate takeBest(std::vector<TempoCandidate>& all) {
+    std::size_t from = 0, to = 0, best = 0;
+    double near = 0, most = -1, confidence = 0;
+    for (std::size_t i = 0; i < all.size(); ++i) {
+        for (; to < all.size() && all[to].bpm <= all[i].bpm * (1 + kSame); ++to) near += all[to].confidence;
+        for (; all[from].bpm < all[i].bpm * (1 - kSame); ++from) near -= all[from].confidence;
+        if (near + all[i].confidence <= most) continue;
+        most = near + all[i].confidence, best = i, confidence = near;
     }
-    std::stable_sort(tempo.candidates.begin(), tempo.candidates.end(), isLikelier);
-    if (tempo.candidates.size() > kMost) tempo.candidates.resize(kMost);
+    TempoCandidate candidate = all[best];
+    candidate.confidence = std::clamp(confidence, 0.0, 1.0);
+    std::erase_if(all, [&](const TempoCandidate& other) {
+        return std::abs(other.bpm / candidate.bpm - 1) <= 2 * kSame;
+    });
+    return candidate;
+}
+
+}  // namespace
+
+LoopTempo LoopTempo::of(std::span<const Onset> onsets, std::int64_t frames, double sampleRate) {
+    std::vector<TempoCandidate> all = weighed(BeatGrid::candidates(onsets, frames, sampleRate));
+    LoopTempo tempo;
+    while (!all.empty() && tempo.candidates.size() < kMost) tempo.candidates.push_back(takeBest(all));
+    std::stable_sort(
+        tempo.candidates.begin(), tempo.candidates.end(),
+        [](const TempoCandidate& a, const TempoCandidate& b) { return a.confidence > b.confidence; });
     return tempo;
 }
 
