@@ -49,7 +49,7 @@ bool isLetter(const NamePiece& piece) {
 
 NameScan::NameScan(const NamingHabits& habits, std::string_view name, Pieces pieces, Owner owner,
                    std::string& buffer)
-    : habits_(habits), name_(name), pieces_(pieces), buffer_(buffer) {
+    : habits_(habits), name_(name), pieces_(pieces), owner_(owner), buffer_(buffer) {
     for (std::size_t at = owner == Owner::item ? readPrefix() : 0; at < pieces_.size();) at += readAt(at);
 }
 
@@ -71,8 +71,11 @@ std::size_t NameScan::readPrefix() {
 std::size_t NameScan::readAt(std::size_t at) {
     const Pieces rest = pieces_.subspan(at);
     const Word word = habits_.wordAt(rest, buffer_);
-    const auto key = word.pieces == 0 || isMinorKey(rest.front()) ? namedKeyAt(rest, habits_) : std::nullopt;
-    if (key) return readKey(at, *key);
+    // "H-Moll", where a lone "H" is a hi-hat.
+    const bool isLetterWord = word.pieces == 1 && isLetter(rest.front());
+    const auto key = word.pieces == 0 || isLetterWord || isMinorKey(rest.front()) ? namedKeyAt(rest, habits_)
+                                                                                  : std::nullopt;
+    if (key && (!isLetterWord || key->isSpelledOut)) return readKey(at, *key);
     if (word.pieces > 0) return readWord(at, word);
     const std::size_t read = rest.front().isNumber() ? readNumber(at) : readPacked(at);
     before_ = NameRole::none;
@@ -167,9 +170,10 @@ std::size_t NameScan::readKey(std::size_t at, const NamedKey& key) {
     hasNote_ = hasNote_ || key.hasOctave;
     // "Pad D", "Drone in D"
     const std::size_t front = at > 1 && pieces_[at - 1].folded == "in" ? at - 1 : at;
-    const bool isBehindPitched = front > 0 && !meant_.empty() &&
-                                 meant_.back().end == pieces_[front - 1].end() &&
-                                 habits_.meaning(meant_.back().word.meaning).isPitched;
+    const bool isBehindPitched =
+        front > 0 && std::any_of(meant_.begin(), meant_.end(), [&](const Meant& meant) {
+            return meant.end == pieces_[front - 1].end() && habits_.meaning(meant.word.meaning).isPitched;
+        });
     if (!key.hasOctave)
         keys_.push_back({key, at, before_ == NameRole::key, isBehindPitched, isVariantAt(at, key)});
     before_ = NameRole::none;
@@ -222,9 +226,13 @@ std::size_t NameScan::readPacked(std::size_t at) {
 }
 
 std::optional<double> NameScan::tempo(SoundKind kind) const {
-    const auto said =
-        std::find_if(tempos_.begin(), tempos_.end(), [](const Tempo& tempo) { return tempo.isSaid; });
-    if (said != tempos_.end()) return said->number;
+    std::optional<double> said;
+    for (const Tempo& tempo : tempos_) {
+        if (!tempo.isSaid) continue;
+        if (said && *said != tempo.number) return std::nullopt;
+        said = tempo.number;
+    }
+    if (said) return said;
     const bool hasSureKey = std::any_of(
         keys_.begin(), keys_.end(), [](const Key& key) { return key.key.mode != NamedKey::Mode::unsaid; });
     // "Jungle/160/think loop.wav"
@@ -250,11 +258,29 @@ std::vector<double> NameScan::possibleTempos() const {
 std::optional<NamedKey> NameScan::key() const {
     std::optional<NamedKey> chosen;
     for (const Key& key : keys_) {
-        if (!canStand(key)) continue;
+        if (!canStand(key) || isInProgression(key)) continue;
         if (chosen && (chosen->tonic != key.key.tonic || chosen->mode != key.key.mode)) return std::nullopt;
         chosen = key.key;
     }
     return chosen;
+}
+
+/// "Am F C G" are chords that follow each other.
+bool NameScan::isInProgression(const Key& key) const {
+    constexpr int fewest = 3;
+    int count = 0;
+    std::size_t end = 0;
+    bool isAmong = false;
+    for (const Key& other : keys_) {
+        if (other.piece != end) {
+            if (isAmong) break;
+            count = 0;
+        }
+        ++count;
+        end = other.piece + other.key.pieces;
+        isAmong = isAmong || other.piece == key.piece;
+    }
+    return isAmong && count >= fewest;
 }
 
 /// A key stands where music is meant: beside a tempo, in what is called a loop, behind an instrument, alone
@@ -275,13 +301,14 @@ bool NameScan::canStand(const Key& key) const {
                             (key.piece == 0 && saysPitched());
     if (key.key.isCamelot) return !tempos_.empty() || first.isInBrackets;
     const bool isSyllable = habits_.noteOf(first.folded).has_value();
-    if (key.key.isSpelledOut) return isCapital || isOfMusic || isSyllable;
+    if (key.key.isSpelledOut) return isCapital || isOfMusic || isSyllable || isSetApart;
+    const bool isFolder = owner_ == Owner::folder && key.piece == 0 && isLast;
     if (key.key.mode != NamedKey::Mode::unsaid)
-        return isOfMusic || (isCapital && (isSetApart || key.isBehindPitched));
+        return isOfMusic || (isCapital && (isSetApart || key.isBehindPitched || isFolder));
     const bool hasSign = key.key.pieces > 1 && !pieces_[key.piece + 1].isWord();
     if (key.key.hasAccidental)
         return isOfMusic || (isCapital && (isSetApart || hasSign || key.isBehindPitched));
-    return isCapital && key.piece > 0 && canLetterStand(key);
+    return (isCapital || isBesideTempo(key)) && key.piece > 0 && canLetterStand(key);
 }
 
 /// Music that is played, which has a tempo as a loop has: "Melody 120".
@@ -323,6 +350,17 @@ bool NameScan::numbers(const Key& key) const {
     if (isLoneLetter(before) || (next != nullptr && isLoneLetter(*next))) return true;
     if (before.isNumber() && !isTempo(before)) return true;
     return next != nullptr && next->isNumber() && next->isJoined && !isTempo(*next);
+}
+
+/// "bass_loop_120_g", but not "how_to_be_a_120".
+bool NameScan::isBesideTempo(const Key& key) const {
+    const auto bpm = tempo();
+    if (!isLoop() || !bpm || pieces_[key.piece].folded == "a") return false;
+    const auto isTempo = [&](std::size_t at) {
+        const auto number = at < pieces_.size() ? numberAt(pieces_.subspan(at, 1), name_) : std::nullopt;
+        return number && *number == std::floor(*bpm);
+    };
+    return (key.piece > 0 && isTempo(key.piece - 1)) || isTempo(key.piece + key.key.pieces);
 }
 
 /// "Loop_A" and "Plan B" are variants of something; drums have no key.

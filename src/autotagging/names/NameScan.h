@@ -84,9 +84,11 @@ class NameScan {
     std::size_t readNumber(std::size_t at);
     std::size_t readPacked(std::size_t at);
     bool isLoop() const { return saysLoop_ || bars_ || beats_; }
+    bool isInProgression(const Key& key) const;
     bool canStand(const Key& key) const;
     bool saysPassage() const;
     bool saysPitched() const;
+    bool isBesideTempo(const Key& key) const;
     bool canLetterStand(const Key& key) const;
     bool beginsWord(const Key& key) const;
     bool numbers(const Key& key) const;
@@ -94,6 +96,7 @@ class NameScan {
     const NamingHabits& habits_;
     std::string_view name_;
     std::span<const NamePiece> pieces_;
+    Owner owner_;
     std::string& buffer_;
     std::vector<Meant> meant_;
     std::vector<std::pair<std::uint32_t, std::uint32_t>> silences_;
