@@ -219,7 +219,7 @@ ItemReport ItemTagger::report(const std::shared_ptr<ContentItem>& item, const It
     const SoundKind heard = kindOf(report.sound.get());
     NameReading reading;
     if ((options & QVCTAutoTaggingOptionNames) != 0) {
-        reading = reader().read(names.all());
+        reading = reader().read(names.all(), names.extension());
         const KeywordJudge judge(reading, *taxonomy_);
         for (TagClaim& claim : claims)
             if (claim.service == kKeywords) judge.judge(claim);
@@ -238,7 +238,7 @@ ItemReport ItemTagger::report(const std::shared_ptr<ContentItem>& item, const It
 }
 
 ItemReport ItemTagger::reportOfNames(const ItemNames& names, SoundKind otherwise) {
-    NameReading reading = reader().read(names.all());
+    NameReading reading = reader().read(names.all(), names.extension());
     ItemReport report;
     report.tempo = reading.tempo;
     report.beats = beatsOf(reading);

@@ -400,7 +400,7 @@ TEST_F(Tagging, KnowsWhatGeneralMidiAndItsVariantsCallTheirSounds) {
         {"English Horn", "English Horn, Eng.Horn"},
         {"Flute", "Piccolo, Flute, Blown Bottle"},
         {"Shakuhachi", "Shakuhachi, Shakhchi"},
-        {"", "Whistle"},
+        {"Tin Whistle", "Whistle"},
         {"Lead",
          "Lead 1 (square), Lead 2 (sawtooth), Lead 3 (calliope), Lead 4 (chiff), Lead 5 (charang), Lead 6 "
          "(voice), Lead 7 (fifths), Lead 8 (bass + lead)"},

@@ -96,6 +96,8 @@ TEST(Names, AreReadAsPeopleWriteThem) {
         {"80s Pad", {"80s", "Pad"}},
         {"dog bark 02", {"Sound Effects"}},
         {"Rainfall On Roof", {"Nature"}},
+        {"shotgunreload", {"Sound Effects"}},
+        {"Chip Osc", {"Synth"}},
     };
     for (const auto& [name, labels] : rows) EXPECT_EQ(labelsOf(readingOf(name)), labels) << name;
 }
@@ -114,12 +116,23 @@ TEST(Names, BeginWithTheCodeOfAnyCategory) {
 }
 
 TEST(Names, DoNotSayWhatTheyOnlySeemToSay) {
-    for (const char* name :
-         {"",         "808",        "v127 rr2", "Hard Drive", "Section B", "Plan B",
-          "3 AM",     "Vol 2",      "C",        "A Day",      "Take C",    "TR808",
-          "abcdefgh", "Kit",        "()[]--__", "9A",         "Sat",       "Bdelay",
-          "Charm",    "Miami Vice", "Monkeys",  "Strong",     "Symbol",    "Override",
-          "Clip 3",   "Sounds",     "Club",     "Rinse",      "Recorded",  "TM Wandering Star"}) {
+    for (const char* name : {"",          "808",
+                             "v127 rr2",  "Hard Drive",
+                             "Section B", "Plan B",
+                             "3 AM",      "Vol 2",
+                             "C",         "A Day",
+                             "Take C",    "TR808",
+                             "abcdefgh",  "Kit",
+                             "()[]--__",  "9A",
+                             "Sat",       "Bdelay",
+                             "Charm",     "Miami Vice",
+                             "Monkeys",   "Strong",
+                             "Symbol",    "Override",
+                             "Clip 3",    "Sounds",
+                             "Club",      "Rinse",
+                             "Recorded",  "TM Wandering Star",
+                             "Electron",  "Music",
+                             "Osc Osc",   "What Our Toaster Never Toasted"}) {
         const NameReading reading = readingOf(name);
         EXPECT_THAT(labelsOf(reading), IsEmpty()) << name;
         EXPECT_FALSE(reading.tempo) << name;
@@ -189,6 +202,15 @@ TEST(Names, TellKeyTempoAndKindWhereTheyStand) {
         {"Bar 3 A", "", ""},
         {"bloop", "", ""},
         {"hatloop", "", "", 0, SoundKind::loop},
+        {"Strings H-Moll", "B", "Minor"},
+        {"Strings_dmin", "D", "Minor"},
+        {"Chord Stab Ebm9", "DSharp", "Minor"},
+        {"loop_synth_g_97", "G", "", 97, SoundKind::loop},
+        {"loop_synth_a_97", "", "", 97, SoundKind::loop},
+        {"loop_synth_97_x_g", "", "", 97, SoundKind::loop},
+        {"Chords Am F C G 90", "", "", 90},
+        {"Chords Am 90", "A", "Minor", 90},
+        {"Loop 70bpm 140bpm", "", "", 0, SoundKind::loop},
     };
     for (const auto& row : rows) {
         const NameReading reading = readingOf(row.name);
@@ -205,6 +227,24 @@ TEST(Names, TellKeyTempoAndKindWhereTheyStand) {
         EXPECT_EQ(reading.bars.value_or(0), row.bars) << row.name;
         EXPECT_EQ(reading.beats.value_or(0), row.beats) << row.name;
     }
+}
+
+TEST(Names, OfPresetsAreOftenFiguresOfSpeech) {
+    NameReader reader;
+    const std::string_view chainsaw[] = {"Chainsaw"}, osc[] = {"Chip Osc"};
+    EXPECT_THAT(labelsOf(reader.read(chainsaw, "wav")), ElementsAre("Sound Effects"));
+    EXPECT_THAT(labelsOf(reader.read(chainsaw, ItemNames("/a/Chainsaw.fxp").extension())), IsEmpty());
+    EXPECT_THAT(labelsOf(reader.read(osc, "fxp")), ElementsAre("Synth"));
+}
+
+TEST(Names, OfFoldersThatAreAKeyTellIt) {
+    const auto keyIn = [](std::string_view folder) {
+        const std::string_view names[] = {"Top 3", folder};
+        return labelsOf(NameReader().read(names));
+    };
+    EXPECT_THAT(keyIn("Am"), ElementsAre("A", "Minor KeyType"));
+    EXPECT_THAT(keyIn("A"), IsEmpty());
+    EXPECT_THAT(keyIn("am"), IsEmpty());
 }
 
 TEST(Names, SayWhereTheirWordsStand) {

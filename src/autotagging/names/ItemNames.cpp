@@ -23,7 +23,10 @@ ItemNames::ItemNames(std::string path, std::string_view root) : path_(std::move(
         const std::size_t slash = rest.rfind('/');
         std::string_view name = rest.substr(slash == std::string_view::npos ? 0 : slash + 1);
         const std::size_t dot = names_.empty() ? name.rfind('.') : std::string_view::npos;
-        if (dot != std::string_view::npos && dot > 0) name = name.substr(0, dot);
+        if (dot != std::string_view::npos && dot > 0) {
+            extension_ = name.substr(dot + 1);
+            name = name.substr(0, dot);
+        }
         names_.push_back(name);
         if (slash == std::string_view::npos || (isBelowRoot && rest.size() <= root.size())) break;
         rest = rest.substr(0, slash);

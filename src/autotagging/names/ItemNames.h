@@ -20,12 +20,15 @@ class QVCT_API ItemNames {
 
     /// As long as this object lives.
     std::span<const std::string_view> all() const { return names_; }
+    /// That of its own name, without the dot; empty when it has none. As long as this object lives.
+    std::string_view extension() const { return extension_; }
     /// The paths of the folders whose names are among them, in the same order; as long as this object lives.
     std::vector<std::string_view> folders() const;
 
   private:
     std::string path_;
     std::vector<std::string_view> names_;
+    std::string_view extension_;
 };
 
 }  // namespace qvct

@@ -58,9 +58,10 @@ double NameReader::confidenceOf(NameStrength strength) const {
     return 0;
 }
 
-NameReading NameReader::read(std::span<const std::string_view> names) {
+NameReading NameReader::read(std::span<const std::string_view> names, std::string_view extension) {
     NameReading reading;
     combinable_.clear();
+    isOfPreset_ = habits_->isOfPreset(extension);
     bool hasKey = false;
     for (std::size_t i = 0; i < names.size(); ++i) {
         const std::string_view name = names[i];
@@ -105,9 +106,36 @@ double NameReader::confidenceOf(const NameScan::Meant& meant, const NameScan& sc
     const bool isForeigner =
         isInstrument && ((isOfFolder && scan.isOfPack()) || isForeign(meaning, scan.prefix()));
     const bool isHint = isForeigner || (isOfFolder && isOfTitle(meaning, scan)) || areInitials(meant, scan);
-    const double confidence = confidenceOf(isHint ? NameStrength::hint : meant.word.strength);
-    const bool isFigure = meaning.isFigurative && !meant.isOfPrefix;
-    return isFigure ? std::min(confidence, weights_.figure) : confidence;
+    const double hint = confidenceOf(NameStrength::hint);
+    if (isHint) return hint;
+    const NameStrength strength = strengthOf(meant, scan);
+    if (strength != NameStrength::hint) return confidenceOf(strength);
+    // A preset plays notes, and an "Ice Rocket" nevertheless.
+    constexpr double unlikely = 0.8;
+    if (isOfPreset_ && !meaning.isPitched) return hint * unlikely;
+    return isSecondHint(meant, scan) ? 1 - (1 - hint) * (1 - hint) : hint;
+}
+
+/// A dog is what was recorded, but a way to call a preset, and part of a title in
+/// "what_my_dog_had_for_dinner".
+NameStrength NameReader::strengthOf(const NameScan::Meant& meant, const NameScan& scan) const {
+    const NameStrength strength = meant.word.strength;
+    if (strength == NameStrength::figure)
+        return isOfPreset_ || scan.unknownWords() > 1 ? NameStrength::hint : strength;
+    const bool isFigurative = habits_->meaning(meant.word.meaning).isFigurative && !meant.isOfPrefix;
+    return isFigurative && strength != NameStrength::hint ? NameStrength::figure : strength;
+}
+
+/// Two words of a name that hint at the same thing agree: "Detuned Pulse" is a synthesizer.
+bool NameReader::isSecondHint(const NameScan::Meant& meant, const NameScan& scan) const {
+    const auto wordOf = [&scan](const NameScan::Meant& its) {
+        return scan.name().substr(its.offset, its.end - its.offset);
+    };
+    const std::string& label = habits_->meaning(meant.word.meaning).label;
+    return std::any_of(scan.meant().begin(), scan.meant().end(), [&](const NameScan::Meant& other) {
+        return strengthOf(other, scan) == NameStrength::hint && wordOf(other) != wordOf(meant) &&
+               habits_->meaning(other.word.meaning).label == label;
+    });
 }
 
 /// A folder whose name has words that mean nothing has a title: "The Mysterious Bank" is not mysterious.

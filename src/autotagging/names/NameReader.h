@@ -52,7 +52,8 @@ class NameReader {
 
     /// The item's own name comes first, without its extension, then its folder's, and so on up to the
     /// outermost that counts.
-    NameReading read(std::span<const std::string_view> names);
+    /// `extension`: its own, which tells a preset from a sound.
+    NameReading read(std::span<const std::string_view> names, std::string_view extension = {});
 
   private:
     /// A claim that may be one for something finer.
@@ -62,7 +63,9 @@ class NameReader {
     };
 
     double confidenceOf(NameStrength strength) const;
+    NameStrength strengthOf(const NameScan::Meant& meant, const NameScan& scan) const;
     double confidenceOf(const NameScan::Meant& meant, const NameScan& scan, NameScan::Owner owner) const;
+    bool isSecondHint(const NameScan::Meant& meant, const NameScan& scan) const;
     static bool isOfTitle(const NamedMeaning& meaning, const NameScan& scan);
     bool areInitials(const NameScan::Meant& meant, const NameScan& scan) const;
     bool isForeign(const NamedMeaning& meaning, std::span<const NamingHabits::Word> prefix) const;
@@ -75,6 +78,7 @@ class NameReader {
     NamePieces pieces_;
     std::vector<Combinable> combinable_;
     std::string buffer_;
+    bool isOfPreset_ = false;
 };
 
 }  // namespace qvct

@@ -97,7 +97,8 @@ std::pair<NamingHabits::Word, NamingHabits::Word> NamingHabits::packedWords(std:
     constexpr std::size_t shortest = 3, longest = 24;
     const auto plain = [this](std::string_view text) -> const Word* {
         const Word* word = findWord(text);
-        const bool isPlain = word != nullptr && word->pieces == 1 && word->strength == NameStrength::word;
+        const bool isPlain = word != nullptr && word->pieces == 1 &&
+                             (word->strength == NameStrength::word || word->strength == NameStrength::figure);
         return isPlain ? word : nullptr;
     };
     if (folded.size() < 2 * shortest || folded.size() > longest) return {};

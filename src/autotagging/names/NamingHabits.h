@@ -10,6 +10,7 @@
 #include <map>
 #include <memory>
 #include <optional>
+#include <set>
 #include <span>
 #include <string>
 #include <string_view>
@@ -103,6 +104,8 @@ class NamingHabits {
     const Word& other(std::uint32_t index) const { return others_[index]; }
     /// What a prefix stands for, the likeliest first; see NamePrefix. Empty when it stands for nothing.
     std::span<const Word> wordsOfPrefix(std::string_view code) const;
+    /// Whether files with that extension hold what a synthesizer plays; in small letters.
+    bool isOfPreset(std::string_view extension) const { return presets_.contains(extension); }
     /// Of a folded word.
     NameRole roleOf(std::string_view folded) const;
     /// The semitones above C of a note that is called by a syllable: "re".
@@ -145,6 +148,7 @@ class NamingHabits {
     std::map<std::string, int, std::less<>> notes_;
     Entries entries_;
     Prefixes prefixes_;
+    std::set<std::string, std::less<>> presets_;
     NearWords near_;
 
     friend class NamingHabitsReader;

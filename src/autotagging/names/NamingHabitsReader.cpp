@@ -64,6 +64,7 @@ class NamingHabitsReader {
         addNames(dictionary.array("Figurative"), figurative_);
         addNames(dictionary.array("Transposing"), transposing_);
         addNames(dictionary.array("Categories"), categories_);
+        addNames(dictionary.array("Presets"), habits_->presets_);
         return areParts(dictionary, error) && addFolders(dictionary, error) &&
                addCombinations(dictionary, error) && addNotes(dictionary, error) &&
                addRoles(dictionary, error) && addMeanings(dictionary, error) &&
@@ -102,7 +103,8 @@ class NamingHabitsReader {
     using Word = NamingHabits::Word;
     using Names = std::set<std::string>;
 
-    static void addNames(const PropertyList::Array* list, Names& names) {
+    template <typename Set>
+    static void addNames(const PropertyList::Array* list, Set& names) {
         if (list == nullptr) return;
         for (const PropertyList& name : *list)
             if (name.string() != nullptr) names.insert(*name.string());
@@ -139,7 +141,7 @@ class NamingHabitsReader {
             if (dictionary.value(part) != nullptr && dictionary.dictionary(part) == nullptr)
                 return refuse(error, "is no dictionary", {part});
         }
-        for (const char* part : {"Pitched", "Figurative", "Transposing", "Categories"}) {
+        for (const char* part : {"Pitched", "Figurative", "Transposing", "Categories", "Presets"}) {
             const PropertyList* list = dictionary.value(part);
             if (list != nullptr && !isListOfTexts(*list)) return refuse(error, "is no list of texts", {part});
         }

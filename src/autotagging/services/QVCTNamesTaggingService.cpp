@@ -16,7 +16,7 @@ TagDictionarySet QVCTNamesTaggingService::tagsWithContentsOfURL(
     TagDictionarySet tags;
     if ((options & QVCTAutoTaggingOptionNames) == 0) return tags;
     const ItemNames names(url.path());
-    for (const TagClaim& claim : reader().read(names.all()).claims)
+    for (const TagClaim& claim : reader().read(names.all(), names.extension()).claims)
         tags.insert(tagDictionary(claim.label, claim.level));
     return tags;
 }
