@@ -211,6 +211,13 @@ TEST(Names, TellKeyTempoAndKindWhereTheyStand) {
         {"Chords Am F C G 90", "", "", 90},
         {"Chords Am 90", "A", "Minor", 90},
         {"Loop 70bpm 140bpm", "", "", 0, SoundKind::loop},
+        {"Lead_140_A#", "ASharp", "", 140},
+        {"Lead_140_A#2", "", ""},
+        {"128Gm_Lead", "G", "Minor", 128},
+        {"Lead 128x Gm 90bpm", "G", "Minor", 90},
+        {"Bass Am120bpm", "A", "Minor", 120},
+        {"Rhodes Cm7b5 90bpm", "C", "Minor", 90},
+        {"Strings in the key of D", "D", ""},
     };
     for (const auto& row : rows) {
         const NameReading reading = readingOf(row.name);

@@ -167,7 +167,8 @@ void NameScan::addWordsIn(const Word& phrase, std::span<const NamePiece> pieces)
 }
 
 std::size_t NameScan::readKey(std::size_t at, const NamedKey& key) {
-    hasNote_ = hasNote_ || key.hasOctave;
+    // The fifth in "Cm7b5" is no note.
+    hasNote_ = hasNote_ || (key.hasOctave && !pieces_[at].isJoined);
     // "Pad D", "Drone in D"
     const std::size_t front = at > 1 && pieces_[at - 1].folded == "in" ? at - 1 : at;
     const bool isBehindPitched =
@@ -195,6 +196,12 @@ bool NameScan::isVariantAt(std::size_t at, const NamedKey& key) const {
            meant_.back().end == pieces_[at - 2].end() && isTransposing(meant_.back().word);
 }
 
+/// "Am", but not the letter that belongs to a number.
+bool NameScan::beginsWithMode(Pieces pieces) const {
+    const auto key = pieces.front().isWord() ? namedKeyAt(pieces, habits_) : std::nullopt;
+    return key && key->mode != NamedKey::Mode::unsaid;
+}
+
 std::size_t NameScan::readNumber(std::size_t at) {
     const auto number = numberAt(pieces_.subspan(at), name_);
     const bool isWhole = !number || *number == static_cast<int>(*number);
@@ -203,10 +210,12 @@ std::size_t NameScan::readNumber(std::size_t at) {
     if (before_ != NameRole::pack) behindNumber_ = at + read;
     if (!number || *number < kSlowest || *number > kFastest) return read;
     const bool isSaid = before_ == NameRole::tempo;
-    // "TR808", "v124": part of a word.
+    // "TR808", "v124": part of a word, but not of one in "Am120bpm" and "120Am".
+    const Pieces rest = pieces_.subspan(at + read);
+    const bool isBeforeTempo = !rest.empty() && habits_.roleOf(rest.front().folded) == NameRole::tempo;
     const bool isPartOfWord =
-        pieces_[at].isJoined || (at + read < pieces_.size() && pieces_[at + read].isJoined &&
-                                 habits_.roleOf(pieces_[at + read].folded) != NameRole::tempo);
+        (pieces_[at].isJoined && !isBeforeTempo) ||
+        (!rest.empty() && rest.front().isJoined && !isBeforeTempo && !beginsWithMode(rest));
     if (isSaid || !isPartOfWord) tempos_.push_back({*number, isSaid, at + read});
     return read;
 }
@@ -233,8 +242,11 @@ std::optional<double> NameScan::tempo(SoundKind kind) const {
         said = tempo.number;
     }
     if (said) return said;
-    const bool hasSureKey = std::any_of(
-        keys_.begin(), keys_.end(), [](const Key& key) { return key.key.mode != NamedKey::Mode::unsaid; });
+    const auto isSure = [this](const Key& key) {
+        const std::size_t end = key.piece + key.key.pieces;
+        return key.key.mode != NamedKey::Mode::unsaid || pieces_[end - 1].kind == NamePiece::Kind::sharp;
+    };
+    const bool hasSureKey = std::any_of(keys_.begin(), keys_.end(), isSure);
     // "Jungle/160/think loop.wav"
     const bool isAllOfLoop = kind == SoundKind::loop && pieces_.size() == 1;
     if ((!isLoop() && !hasSureKey && !isAllOfLoop && !saysPassage()) || saysOneShot_) return std::nullopt;

@@ -81,6 +81,7 @@ class NameScan {
     bool isOfMaker(std::uint32_t offset) const;
     std::size_t readKey(std::size_t at, const NamedKey& key);
     bool isVariantAt(std::size_t at, const NamedKey& key) const;
+    bool beginsWithMode(std::span<const NamePiece> pieces) const;
     std::size_t readNumber(std::size_t at);
     std::size_t readPacked(std::size_t at);
     bool isLoop() const { return saysLoop_ || bars_ || beats_; }
