@@ -3,6 +3,8 @@
 #include "platform/base/bytes/Utf8.h"
 #include "platform/text/Text.h"
 
+#include <charconv>
+
 #include <unicode/uchar.h>
 
 namespace qvct {
@@ -114,6 +116,18 @@ std::span<const NamePiece> NamePieces::read(std::string_view name) {
     }
     fold();
     return pieces_;
+}
+
+std::optional<double> numberAt(std::span<const NamePiece> pieces, std::string_view name) {
+    int whole = 0;
+    const NamePiece& first = pieces.front();
+    const char* end = first.text.data() + first.text.size();
+    if (first.text.size() > 3 || std::from_chars(first.text.data(), end, whole).ptr != end)
+        return std::nullopt;
+    const bool hasTenths = pieces.size() > 1 && pieces[1].isNumber() && pieces[1].offset == first.end() + 1 &&
+                           (name[first.end()] == '.' || name[first.end()] == ',') &&
+                           pieces[1].text.size() == 1;
+    return whole + (hasTenths ? (pieces[1].text.front() - '0') / 10.0 : 0.0);
 }
 
 }  // namespace qvct

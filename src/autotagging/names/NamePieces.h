@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstdint>
+#include <optional>
 #include <span>
 #include <string>
 #include <string_view>
@@ -20,6 +21,7 @@ struct NamePiece {
     bool isInBrackets = false;
 
     bool isWord() const { return kind == Kind::word; }
+    bool isLetter() const { return isWord() && text.size() == 1; }
     bool isNumber() const { return kind == Kind::number; }
     std::uint32_t end() const { return offset + static_cast<std::uint32_t>(text.size()); }
 };
@@ -71,5 +73,9 @@ class NamePieces {
     std::string folded_;
     std::vector<std::size_t> ends_;  // of the pieces in it
 };
+
+/// The number that pieces begin with: up to three digits, and with the piece behind them "87.5". `name` is
+/// what they were read from. REQUIRES: a piece.
+std::optional<double> numberAt(std::span<const NamePiece> pieces, std::string_view name);
 
 }  // namespace qvct

@@ -5,8 +5,6 @@
 
 #include <algorithm>
 #include <bit>
-#include <charconv>
-#include <cmath>
 
 namespace qvct {
 namespace {
@@ -23,26 +21,9 @@ bool canStandAlone(double tempo) {
     return tempo >= slowest && tempo <= fastest;
 }
 
-/// Up to three digits, and with the piece behind them "87.5".
-std::optional<double> numberAt(Pieces pieces, std::string_view name) {
-    int whole = 0;
-    const NamePiece& first = pieces.front();
-    const char* end = first.text.data() + first.text.size();
-    if (first.text.size() > 3 || std::from_chars(first.text.data(), end, whole).ptr != end)
-        return std::nullopt;
-    const bool hasTenths = pieces.size() > 1 && pieces[1].isNumber() && pieces[1].offset == first.end() + 1 &&
-                           (name[first.end()] == '.' || name[first.end()] == ',') &&
-                           pieces[1].text.size() == 1;
-    return whole + (hasTenths ? (pieces[1].text.front() - '0') / 10.0 : 0.0);
-}
-
 /// "Fm" is a key where "FM" and "fm" are a way to make sounds.
 bool isMinorKey(const NamePiece& piece) {
     return piece.text.size() == 2 && piece.text[0] >= 'A' && piece.text[0] <= 'G' && piece.text[1] == 'm';
-}
-
-bool isLetter(const NamePiece& piece) {
-    return piece.isWord() && piece.text.size() == 1;
 }
 
 }  // namespace
@@ -72,7 +53,7 @@ std::size_t NameScan::readAt(std::size_t at) {
     const Pieces rest = pieces_.subspan(at);
     const Word word = habits_.wordAt(rest, buffer_);
     // "H-Moll", where a lone "H" is a hi-hat.
-    const bool isLetterWord = word.pieces == 1 && isLetter(rest.front());
+    const bool isLetterWord = word.pieces == 1 && rest.front().isLetter();
     const auto key = word.pieces == 0 || isLetterWord || isMinorKey(rest.front()) ? namedKeyAt(rest, habits_)
                                                                                   : std::nullopt;
     if (key && (!isLetterWord || key->isSpelledOut)) return readKey(at, *key);
@@ -105,7 +86,7 @@ std::size_t NameScan::readWord(std::size_t at, const Word& word) {
     // "Vol 2", "Take C", "Bar 3": what is counted is neither a tempo nor a note.
     const bool isCounted = (word.role == NameRole::count || isLayer || (isUnit && !isOfNumber)) &&
                            behind < pieces_.size() &&
-                           (pieces_[behind].isNumber() || isLetter(pieces_[behind]));
+                           (pieces_[behind].isNumber() || pieces_[behind].isLetter());
     return word.pieces + (isCounted ? 1U : 0U);
 }
 
@@ -242,7 +223,7 @@ std::optional<double> NameScan::tempo(SoundKind kind) const {
         said = tempo.number;
     }
     if (said) return said;
-    const auto isSure = [this](const Key& key) {
+    const auto isSure = [this](const ScannedKey& key) {
         const std::size_t end = key.piece + key.key.pieces;
         return key.key.mode != NamedKey::Mode::unsaid || pieces_[end - 1].kind == NamePiece::Kind::sharp;
     };
@@ -268,59 +249,16 @@ std::vector<double> NameScan::possibleTempos() const {
 }
 
 std::optional<NamedKey> NameScan::key() const {
-    std::optional<NamedKey> chosen;
-    for (const Key& key : keys_) {
-        if (!canStand(key) || isInProgression(key)) continue;
-        if (chosen && (chosen->tonic != key.key.tonic || chosen->mode != key.key.mode)) return std::nullopt;
-        chosen = key.key;
-    }
-    return chosen;
-}
-
-/// "Am F C G" are chords that follow each other.
-bool NameScan::isInProgression(const Key& key) const {
-    constexpr int fewest = 3;
-    int count = 0;
-    std::size_t end = 0;
-    bool isAmong = false;
-    for (const Key& other : keys_) {
-        if (other.piece != end) {
-            if (isAmong) break;
-            count = 0;
-        }
-        ++count;
-        end = other.piece + other.key.pieces;
-        isAmong = isAmong || other.piece == key.piece;
-    }
-    return isAmong && count >= fewest;
-}
-
-/// A key stands where music is meant: beside a tempo, in what is called a loop, behind an instrument, alone
-/// in brackets or at the end; one layer of an instrument plays a note. "A Day", "Take C", "3 AM" and "Plan B"
-/// are none.
-bool NameScan::canStand(const Key& key) const {
-    if (hasNote_ || key.isVariant) return false;
-    if (key.isAnnounced) return true;
-    const bool isOfMusic = isLoop() || tempo().has_value();
-    if (isLayer_ && !isOfMusic) return false;
-    const NamePiece& first = pieces_[key.piece];
-    const std::size_t behind = key.piece + key.key.pieces;
-    const bool isCapital = first.text.front() >= 'A' && first.text.front() <= 'G';
-    const bool isLast = behind == pieces_.size();
-    const bool isBehindBlank = key.piece > 0 && name_[first.offset - 1] == ' ';
-    const bool isSetApart = first.isInBrackets ||
-                            (isLast && key.piece > 0 && (!isBehindBlank || !meant_.empty())) ||
-                            (key.piece == 0 && saysPitched());
-    if (key.key.isCamelot) return !tempos_.empty() || first.isInBrackets;
-    const bool isSyllable = habits_.noteOf(first.folded).has_value();
-    if (key.key.isSpelledOut) return isCapital || isOfMusic || isSyllable || isSetApart;
-    const bool isFolder = owner_ == Owner::folder && key.piece == 0 && isLast;
-    if (key.key.mode != NamedKey::Mode::unsaid)
-        return isOfMusic || (isCapital && (isSetApart || key.isBehindPitched || isFolder));
-    const bool hasSign = key.key.pieces > 1 && !pieces_[key.piece + 1].isWord();
-    if (key.key.hasAccidental)
-        return isOfMusic || (isCapital && (isSetApart || hasSign || key.isBehindPitched));
-    return (isCapital || isBesideTempo(key)) && key.piece > 0 && canLetterStand(key);
+    KeyContext context{habits_, name_, pieces_};
+    context.tempo = tempo();
+    context.isFolder = owner_ == Owner::folder;
+    context.isLoop = isLoop();
+    context.isLayer = isLayer_;
+    context.hasNote = hasNote_;
+    context.hasMeaning = !meant_.empty();
+    context.hasPitched = saysPitched();
+    context.hasNumber = !tempos_.empty();
+    return chosenKey(keys_, context);
 }
 
 /// Music that is played, which has a tempo as a loop has: "Melody 120".
@@ -334,58 +272,6 @@ bool NameScan::saysPassage() const {
 bool NameScan::saysPitched() const {
     return std::any_of(meant_.begin(), meant_.end(),
                        [&](const Meant& meant) { return habits_.meaning(meant.word.meaning).isPitched; });
-}
-
-/// "G-House", and the article in "Like A Synth".
-bool NameScan::beginsWord(const Key& key) const {
-    const std::size_t behind = key.piece + key.key.pieces;
-    if (behind >= pieces_.size() || !pieces_[behind].isWord()) return false;
-    const NamePiece& letter = pieces_[key.piece];
-    if (letter.end() + 1 != pieces_[behind].offset) return false;
-    const char mark = name_[letter.end()];
-    const char markBefore = letter.offset > 0 ? name_[letter.offset - 1] : '\0';
-    return (mark == '-' && markBefore != '-') || (mark == ' ' && markBefore == ' ' && letter.text == "A");
-}
-
-/// "Loop 01 A", "D50", "A_B": which of several, or a part of a number.
-bool NameScan::numbers(const Key& key) const {
-    const NamePiece& before = pieces_[key.piece - 1];
-    const std::size_t behind = key.piece + key.key.pieces;
-    const NamePiece* next = behind < pieces_.size() ? &pieces_[behind] : nullptr;
-    const auto isLoneLetter = [](const NamePiece& piece) {
-        return isLetter(piece) && piece.folded >= "a" && piece.folded <= "g";
-    };
-    const auto isTempo = [&](const NamePiece& piece) {
-        const auto number = numberAt({&piece, 1}, name_);
-        return number && tempo() && *number == std::floor(*tempo());
-    };
-    if (isLoneLetter(before) || (next != nullptr && isLoneLetter(*next))) return true;
-    if (before.isNumber() && !isTempo(before)) return true;
-    return next != nullptr && next->isNumber() && next->isJoined && !isTempo(*next);
-}
-
-/// "bass_loop_120_g", but not "how_to_be_a_120".
-bool NameScan::isBesideTempo(const Key& key) const {
-    const auto bpm = tempo();
-    if (!isLoop() || !bpm || pieces_[key.piece].folded == "a") return false;
-    const auto isTempo = [&](std::size_t at) {
-        const auto number = at < pieces_.size() ? numberAt(pieces_.subspan(at, 1), name_) : std::nullopt;
-        return number && *number == std::floor(*bpm);
-    };
-    return (key.piece > 0 && isTempo(key.piece - 1)) || isTempo(key.piece + key.key.pieces);
-}
-
-/// "Loop_A" and "Plan B" are variants of something; drums have no key.
-bool NameScan::canLetterStand(const Key& key) const {
-    const NamePiece& before = pieces_[key.piece - 1];
-    if (habits_.roleOf(before.folded) == NameRole::loop || beginsWord(key) || numbers(key)) return false;
-    const bool isOfPitched = saysPitched();
-    const bool isLast = key.piece + key.key.pieces == pieces_.size();
-    if (isOfPitched && (isLoop() || tempo() || (key.isBehindPitched && isLast))) return true;
-    if (!meant_.empty() && !isOfPitched) return false;
-    if (tempo()) return true;
-    const bool isSpaced = before.end() + 1 == pieces_[key.piece].offset && name_[before.end()] == ' ';
-    return isLast && isOfPitched && !isSpaced;
 }
 
 }  // namespace qvct

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "autotagging/evidence/SoundKind.h"
+#include "autotagging/names/KeyChoice.h"
 #include "autotagging/names/NamePieces.h"
 #include "autotagging/names/NamedKey.h"
 #include "autotagging/names/NamingHabits.h"
@@ -62,14 +63,6 @@ class NameScan {
     std::optional<NamedKey> key() const;
 
   private:
-    struct Key {
-        NamedKey key;
-        std::size_t piece;
-        bool isAnnounced;  // by "key"
-        bool isBehindPitched;
-        bool isVariant;  // "Take C", "E string", "Clarinet in B"
-    };
-
     std::size_t readPrefix();
     std::size_t readAt(std::size_t at);
     std::size_t readWord(std::size_t at, const NamingHabits::Word& word);
@@ -85,14 +78,8 @@ class NameScan {
     std::size_t readNumber(std::size_t at);
     std::size_t readPacked(std::size_t at);
     bool isLoop() const { return saysLoop_ || bars_ || beats_; }
-    bool isInProgression(const Key& key) const;
-    bool canStand(const Key& key) const;
     bool saysPassage() const;
     bool saysPitched() const;
-    bool isBesideTempo(const Key& key) const;
-    bool canLetterStand(const Key& key) const;
-    bool beginsWord(const Key& key) const;
-    bool numbers(const Key& key) const;
 
     const NamingHabits& habits_;
     std::string_view name_;
@@ -101,7 +88,7 @@ class NameScan {
     std::string& buffer_;
     std::vector<Meant> meant_;
     std::vector<std::pair<std::uint32_t, std::uint32_t>> silences_;
-    std::vector<Key> keys_;
+    std::vector<ScannedKey> keys_;
     std::vector<Tempo> tempos_;
     std::span<const NamingHabits::Word> prefix_;
     std::pair<std::uint32_t, std::uint32_t> makers_ = {0, 0};  // who they are is no sound
