@@ -14,7 +14,7 @@ struct SoundFingerprint {
     static constexpr double kFrameSeconds = 0.0005;
 
     struct Landmark {
-        std::uint32_t hash = 0;   ///< Mostly the same in a copy: sounds that have one in common may be copies.
+        std::uint32_t hash = 0;  ///< Mostly the same in a copy: sounds that have one in common may be copies.
         std::uint16_t frame = 0;  ///< Half milliseconds since the sound began.
 
         bool operator==(const Landmark&) const = default;
@@ -25,8 +25,11 @@ struct SoundFingerprint {
     bool operator==(const SoundFingerprint&) const = default;
 };
 
+/// From so much on, two sounds are copies of one recording.
+inline constexpr double kSharedByCopies = 0.3;
+
 /// What is in both of two sounds at the same distances in time, as a share of the shorter one's landmarks: 0
-/// to 1. Hashes that differ in a few bits count as the same.
+/// to 1. Hashes that differ in one or two bits count in part.
 ///
 /// @cost  About 2 us.
 double sharedPart(const SoundFingerprint& one, const SoundFingerprint& other);
