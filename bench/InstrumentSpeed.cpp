@@ -3,7 +3,7 @@
 // [sounds]
 #include "Measure.h"
 #include "listening/instrument/SoundFeatures.h"
-#include "resources/DefaultInstrumentModel.h"
+#include "resources/DefaultListeningModels.h"
 
 #include <cmath>
 #include <cstdlib>

@@ -2,7 +2,7 @@
 // confidences are shares. The rest of the input is tried as a model's file.
 #include "ExactInput.h"
 #include "listening/instrument/SoundFeatures.h"
-#include "resources/DefaultInstrumentModel.h"
+#include "resources/DefaultListeningModels.h"
 
 #include <algorithm>
 #include <cmath>

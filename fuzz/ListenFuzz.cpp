@@ -1,7 +1,7 @@
 // Any bytes as samples, at any rate and channel count: what is heard is finite and within its bounds.
 #include "ExactInput.h"
 #include "listening/Listener.h"
-#include "resources/DefaultInstrumentModel.h"
+#include "resources/DefaultListeningModels.h"
 
 #include <cmath>
 #include <cstring>
@@ -54,7 +54,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
     std::vector<float> samples;
     for (std::size_t i = 0; i < repeats; ++i) samples.insert(samples.end(), part.begin(), part.end());
 
-    static qvct::Listener listener(qvct::defaultInstrumentModel());
+    static qvct::Listener listener(qvct::defaultListeningModels());
     check(listener.listen(samples, rate, channels), samples.size() / static_cast<std::size_t>(channels));
     return 0;
 }

@@ -2,7 +2,7 @@
 
 #include "autotagging/evidence/EvidenceWeights.h"
 #include "autotagging/names/NamingHabits.h"
-#include "resources/DefaultInstrumentModel.h"
+#include "resources/DefaultListeningModels.h"
 
 namespace qvct {
 
@@ -18,6 +18,7 @@ std::span<const ResourceFile> resourceFiles() {
                                          EvidenceWeights::file(),
                                          NamingHabits::file(),
                                          instrumentModelFile(),
+                                         likenessModelFile(),
                                          {"QVSearchKit", "js"},
                                          {"ExtractSoftwareInstrumentsRule", "js"}};
     return files;

@@ -1,5 +1,8 @@
 #pragma once
 
+#include "listening/likeness/SoundFingerprint.h"
+#include "listening/likeness/SoundLikeness.h"
+
 #include <cstdint>
 #include <optional>
 #include <string>
@@ -56,7 +59,9 @@ struct HeardSound {
     std::vector<Instrument> instruments;  ///< Of a single sound, the likeliest first.
     std::optional<Note> note;
     std::optional<Key> key;
-    std::vector<Tempo> tempos;  ///< Of a loop, the likeliest first.
+    std::vector<Tempo> tempos;              ///< Of a loop, the likeliest first.
+    std::optional<SoundLikeness> likeness;  ///< Where it lies among all sounds, by its first two seconds.
+    SoundFingerprint fingerprint;           ///< What copies of it have in common.
 };
 
 }  // namespace qvct

@@ -6,6 +6,8 @@
 #include "listening/instrument/InstrumentModel.h"
 #include "listening/instrument/LoopMeasures.h"
 #include "listening/instrument/SoundFeatures.h"
+#include "listening/likeness/Fingerprinter.h"
+#include "listening/likeness/LikenessModel.h"
 #include "listening/onsets/OnsetDetector.h"
 #include "listening/pitch/LoopKey.h"
 #include "listening/pitch/NotePitch.h"
@@ -27,15 +29,20 @@ constexpr std::size_t kBlock = 8192;
 constexpr double kShortestLoop = 0.75;
 constexpr double kEven = 0.5;
 
+bool isLoop(const HeardSound& sound) {
+    return sound.loopConfidence.value_or(0) > kEven;
+}
+
 }  // namespace
 
 struct Listener::Analysers {
-    std::shared_ptr<const InstrumentModel> model;
+    ListeningModels models;
     CharacterMeter character;
     NotePitchDetector note;
     LoopKeyDetector key;
-    std::optional<SoundFeatures> features;  // of the last rate
-    double featuresRate = 0;
+    double lastRate = 0;  // which those two are for
+    std::optional<SoundFeatures> features;
+    std::optional<Fingerprinter> fingerprinter;
 
     // Of the sound at hand.
     std::optional<SoundExcerpt> excerpt;
@@ -58,6 +65,7 @@ struct Listener::Analysers {
 
     void addCharacter(HeardSound& sound);
     void addKind(HeardSound& sound) const;
+    void prepareFor(double excerptRate);
     void addInstrument(HeardSound& sound);
     void addNote(HeardSound& sound);
     void addKey(HeardSound& sound);
@@ -91,13 +99,21 @@ void Listener::Analysers::addKind(HeardSound& sound) const {
     sound.loopConfidence = LoopMeasures::of(excerpt->mono(), excerpt->sampleRate(), positions).likelihood();
 }
 
+void Listener::Analysers::prepareFor(double excerptRate) {
+    if (lastRate == excerptRate) return;
+    lastRate = excerptRate;
+    fingerprinter.emplace(excerptRate);
+    features.reset();
+    if (excerptRate >= SoundFeatures::kLowestRate) features.emplace(excerptRate);
+}
+
+/// What its first seconds are like; of a single sound, what plays.
 void Listener::Analysers::addInstrument(HeardSound& sound) {
-    if (!model || excerpt->sampleRate() < SoundFeatures::kLowestRate) return;
-    if (!features || featuresRate != excerpt->sampleRate()) {
-        featuresRate = excerpt->sampleRate();
-        features.emplace(featuresRate);
-    }
-    const auto judgement = model->judge(features->of(excerpt->mono()));
+    if (!features || (!models.instrument && !models.likeness)) return;
+    const auto values = features->of(excerpt->mono());
+    if (models.likeness) sound.likeness = models.likeness->of(values);
+    if (!models.instrument || isLoop(sound)) return;
+    const auto judgement = models.instrument->judge(values);
     if (!judgement) return;
     sound.instruments.push_back({std::string(judgement->label), judgement->confidence});
     if (judgement->familyLabel != judgement->label)
@@ -128,8 +144,8 @@ void Listener::Analysers::addTempo(HeardSound& sound) {
         sound.tempos.push_back({tempo.bpm, tempo.beats, tempo.confidence});
 }
 
-Listener::Listener(std::shared_ptr<const InstrumentModel> model) : its_(std::make_unique<Analysers>()) {
-    its_->model = std::move(model);
+Listener::Listener(ListeningModels models) : its_(std::make_unique<Analysers>()) {
+    its_->models = std::move(models);
 }
 
 Listener::~Listener() = default;
@@ -172,10 +188,10 @@ HeardSound Listener::judge() {
     its_->addCharacter(sound);
     if (sound.traits.empty()) return sound;  // too little to hear anything in, or a constant
     its_->addKind(sound);
-    if (sound.loopConfidence.value_or(0) <= kEven) {
-        its_->addInstrument(sound);
-        its_->addNote(sound);
-    }
+    its_->prepareFor(excerpt.sampleRate());
+    sound.fingerprint = its_->fingerprinter->of(excerpt.mono());
+    its_->addInstrument(sound);
+    if (!isLoop(sound)) its_->addNote(sound);
     if (sound.loopConfidence.value_or(1) >= kEven) {
         its_->addKey(sound);
         its_->addTempo(sound);

@@ -10,9 +10,17 @@ namespace qvct {
 
 class AudioDecoder;
 class InstrumentModel;
+class LikenessModel;
 class SoundExcerpt;
 
-/// Listens to sounds, one after the other: what plays, how it sounds, which note, key and tempo it has.
+/// What a listener judges by. Without a model it says nothing of what that tells.
+struct ListeningModels {
+    std::shared_ptr<const InstrumentModel> instrument;
+    std::shared_ptr<const LikenessModel> likeness;
+};
+
+/// Listens to sounds, one after the other: what plays, how it sounds, which note, key and tempo it has, and
+/// what it is like.
 ///
 /// Of a long sound the first 30 s count, and no more is decoded. Keeps the tables of the last sample rate;
 /// one listener serves one thread.
@@ -21,8 +29,7 @@ class Listener {
   public:
     static constexpr double kMostSeconds = 30;
 
-    /// Without a model no instrument is told.
-    explicit Listener(std::shared_ptr<const InstrumentModel> model);
+    explicit Listener(ListeningModels models);
     ~Listener();
 
     /// What can be heard in the rest of a file.

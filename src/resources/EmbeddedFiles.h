@@ -26,6 +26,8 @@ QVCT_API extern const unsigned char LegacyVorthalTaxonomy_plist[];
 QVCT_API extern const std::uint32_t LegacyVorthalTaxonomy_plist_len;
 QVCT_API extern const unsigned char LegacyVorthalTaxonomyMapping_csv[];
 QVCT_API extern const std::uint32_t LegacyVorthalTaxonomyMapping_csv_len;
+QVCT_API extern const unsigned char LikenessModel_bin[];
+QVCT_API extern const std::uint32_t LikenessModel_bin_len;
 QVCT_API extern const unsigned char NamingHabits_plist[];
 QVCT_API extern const std::uint32_t NamingHabits_plist_len;
 QVCT_API extern const unsigned char PackDisplayNames_csv[];

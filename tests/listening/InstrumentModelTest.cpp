@@ -1,4 +1,5 @@
 #include "listening/instrument/InstrumentModel.h"
+#include "listening/instrument/SoundFeatures.h"
 
 #include <bit>
 #include <cmath>

@@ -1,6 +1,6 @@
 #include "listening/Listener.h"
 #include "listening/sound/SoundExcerpt.h"
-#include "resources/DefaultInstrumentModel.h"
+#include "resources/DefaultListeningModels.h"
 
 #include <algorithm>
 #include <cmath>
@@ -34,7 +34,7 @@ Samples interleaved(const Samples& mono, std::size_t channels) {
 }
 
 Listener& listener() {
-    static Listener its(defaultInstrumentModel());
+    static Listener its(defaultListeningModels());
     return its;
 }
 
@@ -87,6 +87,24 @@ TEST(Listener, TellsTheSameAtEveryRateThatHoldsTheSound) {
     EXPECT_EQ(heard.note->number, 57);
 }
 
+TEST(Listener, TellsWhatASoundIsLike) {
+    const HeardSound one = listener().listen(tones(220, 1, 10), kRate, 1);
+    const HeardSound loop = listener().listen(tones(220, 8, 0.5), kRate, 1);
+    const HeardSound other = listener().listen(tones(900, 0.3, 10), kRate, 1);
+    ASSERT_TRUE(one.likeness && loop.likeness && other.likeness);
+    EXPECT_LT(squaredDistance(*one.likeness,
+                              *listener().listen(interleaved(tones(220, 0.9, 10), 2), kRate, 2).likeness),
+              squaredDistance(*one.likeness, *other.likeness));
+    EXPECT_EQ(sharedPart(one.fingerprint, listener().listen(tones(220, 1, 10), kRate, 1).fingerprint), 1);
+    EXPECT_FALSE(loop.fingerprint.landmarks.empty());
+
+    Listener withoutModels({});
+    const HeardSound heard = withoutModels.listen(tones(220, 1, 10), kRate, 1);
+    EXPECT_FALSE(heard.likeness);
+    EXPECT_TRUE(heard.instruments.empty());
+    EXPECT_EQ(heard.fingerprint, one.fingerprint);
+}
+
 TEST(Listener, ListensToTheBeginningOfALongSound) {
     Samples samples = tones(220, 1, 10);
     samples.resize(static_cast<std::size_t>(40 * kRate), 0.25F);
@@ -112,7 +130,8 @@ TEST(Listener, HasNothingToSayOfWhatIsNoSound) {
             for (const int channels : {1, 2, 32}) {
                 const HeardSound heard = listener().listen(samples, rate, channels);
                 EXPECT_TRUE(heard.traits.empty()) << what << ' ' << rate << ' ' << channels;
-                EXPECT_FALSE(heard.note || heard.key || heard.loopConfidence || !heard.instruments.empty())
+                EXPECT_FALSE(heard.note || heard.key || heard.loopConfidence || !heard.instruments.empty() ||
+                             heard.likeness || !heard.fingerprint.landmarks.empty())
                     << what << ' ' << rate << ' ' << channels;
                 EXPECT_TRUE(std::isfinite(heard.loudness.value_or(0)) &&
                             std::isfinite(heard.truePeak.value_or(0)))

@@ -11,10 +11,10 @@ from dataclasses import dataclass, field
 from functools import partial
 from pathlib import Path
 
-from . import dataset, recordings
+from . import dataset, likeness, recordings
 from .classes import FAMILIES
 from .judging import Answers, calibrated, calibration, likelihoods, reliability
-from .model_file import model_bytes, rounded
+from .model_file import likeness_bytes, model_bytes, rounded
 from .network import Settings
 from .training import left_out, trained
 
@@ -24,12 +24,13 @@ GENERAL_KITS = [0, 8, 16, 24, 25, 32, 40, 48]
 
 @dataclass
 class Options:
-    """Where everything is; sources that are not given are left out."""
+    """Where everything is; sources and models that are not given are left out."""
 
     features: Path
     tables: Path
-    model: Path
     figures: Path
+    model: Path | None = None
+    likeness: Path | None = None
     recordings: Path | None = None
     machines: Path | None = None
     live_coding: Path | None = None
@@ -46,11 +47,12 @@ def options() -> Options:
     for name, text in [
         ("features", "the program qvct-features"),
         ("tables", "folder where measured features are kept"),
-        ("model", "the model to write"),
-        ("figures", "JSON file of its figures"),
+        ("figures", "JSON file of the models' figures"),
     ]:
         parser.add_argument(f"--{name}", type=Path, required=True, help=text)
     for name, text in [
+        ("model", "the model of instruments to write"),
+        ("likeness", "the model of likeness to write"),
         ("recordings", "folder of labelled recordings (labels.tsv)"),
         ("machines", "folder of drum machines' sounds"),
         ("live-coding", "samples of Debian's sonic-pi-samples"),
@@ -125,26 +127,44 @@ def by_family(answers: Answers) -> dict[str, tuple[int, float]]:
     return {name: (len(part.said), round(part.share_right(), 3)) for name, part in parts if len(part.said)}
 
 
-def main() -> None:
-    """Measures, trains, calibrates, writes the model and its figures."""
-    given = options()
-    sources = {name: table_of(given, name, recipes) for name, recipes in training_recipes(given).items()}
-    table = dataset.joined(list(sources.values()))
+Figures = dict[str, object]
+
+
+def make_instruments(path: Path, processes: int, table: dataset.Table, unmet: dict[str, dataset.Table]) -> Figures:
+    """Trains, calibrates and writes the model that tells instruments."""
     settings = Settings()
-    unmet = left_out(table, settings, given.processes)
-    pooled = dataset_answers(unmet)
-    points = calibration(pooled)
+    answers_left_out = left_out(table, settings, processes)
+    points = calibration(dataset_answers(answers_left_out))
     networks = [rounded(network) for network in trained(table, settings, SEEDS)]
-    given.model.write_bytes(model_bytes(table.version, networks, points))
-    figures: dict[str, object] = {
-        "sounds": {name: len(part.classes) for name, part in sources.items()},
-        "left out": {name: figures_of(answers) for name, answers in unmet.items()},
-    }
-    for name, recipes in test_recipes(given).items():
-        part = table_of(given, name, recipes)
+    path.write_bytes(model_bytes(table.version, networks, points))
+    figures: Figures = {"left out": {name: figures_of(answers) for name, answers in answers_left_out.items()}}
+    for name, part in unmet.items():
         answers = Answers.of(likelihoods(networks, part.features), part.classes)
         answers.sure = calibrated(answers.sure, points)
         figures[name] = figures_of(answers) | {"reliability": reliability(answers), "families": by_family(answers)}
+    return figures
+
+
+def make_likeness(path: Path, processes: int, table: dataset.Table, unmet: dict[str, dataset.Table]) -> Figures:
+    """Fits and writes the model that tells where a sound lies among others."""
+    its = likeness.fitted(table)
+    middles = likeness.centres(its.places(table.features))
+    path.write_bytes(likeness_bytes(table.version, its.direction, likeness.DIRECTION, its.differences, middles))
+    figures: Figures = {"left out": likeness.left_out(table, processes)}
+    return figures | likeness.test_figures(its, table, unmet) if unmet else figures
+
+
+def main() -> None:
+    """Measures what was not measured before, and makes the models and their figures."""
+    given = options()
+    sources = {name: table_of(given, name, recipes) for name, recipes in training_recipes(given).items()}
+    unmet = {name: table_of(given, name, recipes) for name, recipes in test_recipes(given).items()}
+    table = dataset.joined(list(sources.values()))
+    figures: Figures = {"sounds": {name: len(part.classes) for name, part in sources.items()}}
+    if given.model:
+        figures["instruments"] = make_instruments(given.model, given.processes, table, unmet)
+    if given.likeness:
+        figures["likeness"] = make_likeness(given.likeness, given.processes, table, unmet)
     given.figures.write_text(json.dumps(figures, indent=1) + "\n")
 
 

@@ -1,9 +1,10 @@
-"""Writes the model as docs/formats/instrument-model.md says."""
+"""Writes the models as docs/formats/instrument-model.md and likeness-model.md say."""
 
 import struct
 from collections.abc import Sequence
 
 import numpy as np
+import numpy.typing as npt
 
 from .classes import CLASSES, FAMILIES, FAMILY_OF_CLASS
 from .network import Array, Network
@@ -32,9 +33,18 @@ def rounded(network: Network) -> Network:
     return Network(network.mean, network.scale, weights, network.biases)
 
 
+def _head(magic: bytes, version: int, network: Network) -> bytes:
+    return magic + struct.pack("<III", FORMAT, version, len(network.mean))
+
+
+def _layer(weights: Array, biases: Array) -> bytes:
+    scales, whole = quantised(weights)
+    return struct.pack("<I", len(biases)) + _reals(scales) + _reals(biases) + whole.tobytes()
+
+
 def model_bytes(version: int, networks: Sequence[Network], calibration: Sequence[tuple[float, float]]) -> bytes:
     """The file; the networks share the mean and scale of the first."""
-    out = b"QVIM" + struct.pack("<III", FORMAT, version, len(networks[0].mean))
+    out = _head(b"QVIM", version, networks[0])
     out += struct.pack("<I", len(FAMILIES)) + b"".join(_text(family.label) for family in FAMILIES)
     out += struct.pack("<I", len(CLASSES))
     for each, family in zip(CLASSES, FAMILY_OF_CLASS, strict=True):
@@ -45,7 +55,15 @@ def model_bytes(version: int, networks: Sequence[Network], calibration: Sequence
     out += struct.pack("<I", len(networks))
     for network in networks:
         out += struct.pack("<I", len(network.weights))
-        for weights, biases in zip(network.weights, network.biases, strict=True):
-            scales, whole = quantised(weights)
-            out += struct.pack("<I", len(biases)) + _reals(scales) + _reals(biases) + whole.tobytes()
+        out += b"".join(map(_layer, network.weights, network.biases))
     return out
+
+
+def likeness_bytes(
+    version: int, direction: Network, reach: float, differences: Network, centres: npt.NDArray[np.int8]
+) -> bytes:
+    """The file; the last layer's weights and biases are as they make coordinates."""
+    out = _head(b"QVLM", version, direction) + _reals(direction.mean) + _reals(direction.scale)
+    out += b"".join(map(_layer, direction.weights, direction.biases)) + struct.pack("<f", reach)
+    out += _layer(differences.weights[0], differences.biases[0])
+    return out + struct.pack("<I", len(centres)) + centres.tobytes()

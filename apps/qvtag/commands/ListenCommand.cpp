@@ -8,7 +8,7 @@
 #include "output/pictures/PlotFile.h"
 #include "output/pictures/SoundPlot.h"
 #include "platform/files/FileAccess.h"
-#include "resources/DefaultInstrumentModel.h"
+#include "resources/DefaultListeningModels.h"
 
 #include <memory>
 
@@ -26,7 +26,7 @@ void run(const Options& options, ToolContext& context) {
         return context.usageFailed("--plot draws one file; name only one");
     const Error problem = problemOfPlot(options.plotFile, options.paths);
     if (problem.isSet()) return context.usageFailed(problem.message());
-    Listener listener(defaultInstrumentModel());
+    Listener listener(defaultListeningModels());
     JsonItems json(context.format);
     context.forEachContentItemBelow(
         options.paths, options.links, [&](const URL& url, const std::string& root) {

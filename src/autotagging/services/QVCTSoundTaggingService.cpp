@@ -3,7 +3,7 @@
 #include "autotagging/evidence/SoundClaims.h"
 #include "formats/ItemFile.h"
 #include "listening/Listener.h"
-#include "resources/DefaultInstrumentModel.h"
+#include "resources/DefaultListeningModels.h"
 
 namespace qvct {
 namespace {
@@ -20,7 +20,7 @@ std::vector<TagClaim> QVCTSoundTaggingService::claimsOfFile(ItemFile& file,
                                                             const std::shared_ptr<LCFileData>& fileData,
                                                             std::uint64_t options) {
     if ((options & QVCTAutoTaggingOptionSound) == 0 || !fileData) return {};
-    if (!listener_) listener_ = std::make_unique<Listener>(defaultInstrumentModel());
+    if (!listener_) listener_ = std::make_unique<Listener>(defaultListeningModels());
     const auto sound = file.sound(*listener_);
     return sound ? claimsOfSound(*sound) : std::vector<TagClaim>();
 }

@@ -6,8 +6,6 @@
 namespace qvct {
 namespace {
 
-constexpr float kStray = 4;  // standard deviations that an input may be off
-
 void makeLikelihoods(std::vector<float>& logits) {
     const float highest = *std::max_element(logits.begin(), logits.end());
     float sum = 0;
@@ -18,27 +16,16 @@ void makeLikelihoods(std::vector<float>& logits) {
 }  // namespace
 
 std::vector<float> InstrumentModel::answerOf(const Network& network, std::vector<float> values) const {
-    std::vector<float> next;
-    for (const Layer& layer : network) {
-        next = layer.biases;
-        for (std::size_t i = 0; i < layer.inputs; ++i) {
-            const float value = values[i];
-            if (value == 0) continue;  // as half of the rectified ones are
-            const float* weights = &layer.weights[i * layer.outputs];
-            for (std::size_t o = 0; o < layer.outputs; ++o) next[o] += value * weights[o];
-        }
-        if (&layer != &network.back())
-            for (float& value : next) value = std::max(value, 0.0F);
-        values.swap(next);
+    for (const NetworkLayer& layer : network) {
+        values = layer.of(values);
+        if (&layer != &network.back()) rectify(values);
     }
     makeLikelihoods(values);
     return values;
 }
 
 std::vector<float> InstrumentModel::probabilities(std::span<const float> features) const {
-    std::vector<float> inputs(means_.size());
-    for (std::size_t i = 0; i < inputs.size(); ++i)
-        inputs[i] = std::clamp((features[i] - means_[i]) * scales_[i], -kStray, kStray);
+    const auto inputs = standardisation_.of(features);
     std::vector<float> sum(classes_.size(), 0);
     for (const Network& network : networks_) {
         const auto answer = answerOf(network, inputs);
@@ -60,7 +47,7 @@ double InstrumentModel::calibrated(float likelihood) const {
 }
 
 std::optional<InstrumentJudgement> InstrumentModel::judge(std::span<const float> features) const {
-    if (features.size() != means_.size()) return std::nullopt;
+    if (features.size() != standardisation_.means.size()) return std::nullopt;
     const auto likelihoods = probabilities(features);
     std::vector<float> families(families_.size(), 0);
     for (std::size_t c = 0; c < classes_.size(); ++c) families[classes_[c].family] += likelihoods[c];

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "listening/instrument/SoundFeatures.h"
+#include "listening/instrument/NetworkLayer.h"
 #include "platform/base/Error.h"
 
 #include <cstddef>
@@ -43,7 +43,6 @@ class InstrumentModel {
     std::string_view label(std::size_t index) const { return classes_[index].label; }
 
   private:
-    class Reader;
     struct Family {
         std::string label;
     };
@@ -51,22 +50,17 @@ class InstrumentModel {
         std::string label, detail;
         std::size_t family;
     };
-    struct Layer {
-        std::size_t inputs, outputs;
-        std::vector<float> weights;  // by input, then output
-        std::vector<float> biases;
-    };
     struct Point {
         float raw, calibrated;
     };
-    using Network = std::vector<Layer>;
+    using Network = std::vector<NetworkLayer>;
 
     std::vector<float> answerOf(const Network& network, std::vector<float> values) const;
     double calibrated(float likelihood) const;
 
     std::vector<Family> families_;
     std::vector<Class> classes_;
-    std::vector<float> means_, scales_;
+    Standardisation standardisation_;
     std::vector<Network> networks_;
     std::vector<Point> calibration_;
 };

@@ -1,15 +1,18 @@
+#include "listening/instrument/SoundFeatures.h"
 #include "platform/files/ResourceBundle.h"
-#include "resources/DefaultInstrumentModel.h"
+#include "resources/DefaultListeningModels.h"
 #include "resources/EmbeddedFiles.h"
 #include "support/CapturedLog.h"
 #include "support/TemporaryFolder.h"
 #include "taxonomy/TGRTTaxonomy.h"
 
+#include <algorithm>
 #include <array>
 #include <cmath>
 #include <functional>
 #include <numbers>
 #include <random>
+#include <tuple>
 
 #include <gmock/gmock.h>
 
@@ -75,7 +78,42 @@ TEST(DefaultInstrumentModel, SaysLabelsOfTheTaxonomy) {
         EXPECT_NE(taxonomy->findTagForLabel(model->label(i)), nullptr) << model->label(i);
 }
 
-TEST(DefaultInstrumentModel, IsReplacedByAFileUnlessThatIsBroken) {
+TEST(DefaultListeningModels, PlaceTheSameSoundTogetherHoweverItIsRecorded) {
+    const auto model = defaultLikenessModel();
+    const auto placed = [&](double hertz, double decay, double noisiness, double gain, double rate,
+                            double silence) {
+        std::mt19937 random(11);
+        std::normal_distribution<double> noise(0, 0.3);
+        std::vector<float> samples(static_cast<std::size_t>(0.5 * rate));
+        for (std::size_t i = 0; i < samples.size(); ++i) {
+            const double time = static_cast<double>(i) / rate - silence;
+            if (time > 0)
+                samples[i] = static_cast<float>(gain * std::exp(-decay * time) *
+                                                (sine(hertz * time) + noisiness * noise(random)));
+        }
+        return *model->of(SoundFeatures(rate).of(samples));
+    };
+    const std::tuple<double, double, double> sounds[] = {
+        {50, 9, 0}, {190, 18, 1}, {440, 4, 0}, {2000, 40, 0.2}, {110, 2, 0.1}};
+    for (std::size_t i = 0; i < std::size(sounds); ++i) {
+        const auto [hertz, decay, noisiness] = sounds[i];
+        const SoundLikeness copies[] = {placed(hertz, decay, noisiness, 0.1, kRate, 0),
+                                        placed(hertz, decay, noisiness, 0.8, 48000, 0),
+                                        placed(hertz, decay, noisiness, 0.8, kRate, 0.1)};
+        for (const SoundLikeness& copy : copies) {
+            std::vector<int> distances;
+            for (const auto& [otherHertz, otherDecay, otherNoisiness] : sounds)
+                distances.push_back(
+                    squaredDistance(copy, placed(otherHertz, otherDecay, otherNoisiness, 0.8, kRate, 0)));
+            const auto nearest = std::min_element(distances.begin(), distances.end());
+            EXPECT_EQ(static_cast<std::size_t>(nearest - distances.begin()), i);
+        }
+    }
+    EXPECT_FALSE(model->of(SoundFeatures(kRate).of(std::vector<float>(10000))));
+    EXPECT_EQ(model->cells(), 1024U);
+}
+
+TEST(DefaultListeningModels, AreReplacedByAFileUnlessThatIsBroken) {
     const test::TemporaryFolder folder;
     ResourceBundle::setDirectory(folder.path());
     std::string bytes(reinterpret_cast<const char*>(InstrumentModel_bin), InstrumentModel_bin_len);
