@@ -107,12 +107,12 @@ void Listener::Analysers::prepareFor(double excerptRate) {
     if (excerptRate >= SoundFeatures::kLowestRate) features.emplace(excerptRate);
 }
 
-/// What its first seconds are like; of a single sound, what plays.
+/// What plays, and what it is like; to listen for that costs too much in loops, where it says less.
 void Listener::Analysers::addInstrument(HeardSound& sound) {
     if (!features || (!models.instrument && !models.likeness)) return;
     const auto values = features->of(excerpt->mono());
     if (models.likeness) sound.likeness = models.likeness->of(values);
-    if (!models.instrument || isLoop(sound)) return;
+    if (!models.instrument) return;
     const auto judgement = models.instrument->judge(values);
     if (!judgement) return;
     sound.instruments.push_back({std::string(judgement->label), judgement->confidence});
@@ -190,8 +190,10 @@ HeardSound Listener::judge() {
     its_->addKind(sound);
     its_->prepareFor(excerpt.sampleRate());
     sound.fingerprint = its_->fingerprinter->of(excerpt.mono());
-    its_->addInstrument(sound);
-    if (!isLoop(sound)) its_->addNote(sound);
+    if (!isLoop(sound)) {
+        its_->addInstrument(sound);
+        its_->addNote(sound);
+    }
     if (sound.loopConfidence.value_or(1) >= kEven) {
         its_->addKey(sound);
         its_->addTempo(sound);

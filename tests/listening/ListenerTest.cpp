@@ -91,11 +91,12 @@ TEST(Listener, TellsWhatASoundIsLike) {
     const HeardSound one = listener().listen(tones(220, 1, 10), kRate, 1);
     const HeardSound loop = listener().listen(tones(220, 8, 0.5), kRate, 1);
     const HeardSound other = listener().listen(tones(900, 0.3, 10), kRate, 1);
-    ASSERT_TRUE(one.likeness && loop.likeness && other.likeness);
+    ASSERT_TRUE(one.likeness && other.likeness);
+    EXPECT_FALSE(loop.likeness);
     EXPECT_LT(squaredDistance(*one.likeness,
                               *listener().listen(interleaved(tones(220, 0.9, 10), 2), kRate, 2).likeness),
               squaredDistance(*one.likeness, *other.likeness));
-    EXPECT_EQ(sharedPart(one.fingerprint, listener().listen(tones(220, 1, 10), kRate, 1).fingerprint), 1);
+    EXPECT_EQ(one.fingerprint, listener().listen(tones(220, 1, 10), kRate, 1).fingerprint);
     EXPECT_FALSE(loop.fingerprint.landmarks.empty());
 
     Listener withoutModels({});

@@ -143,7 +143,9 @@ def left_out(table: Table, processes: int) -> dict[str, dict[str, float | int]]:
         return dict(pool.map(_fold, tasks))
 
 
-def test_figures(likeness: Likeness, known: Table, unmet: dict[str, Table]) -> dict[str, dict[str, dict[str, float | int]]]:
+def test_figures(
+    likeness: Likeness, known: Table, unmet: dict[str, Table]
+) -> dict[str, dict[str, dict[str, float | int]]]:
     """For each source that was not met: its sounds among all sources not met, and among all that there are."""
     among = Library.of(likeness, joined(list(unmet.values())))
     whole = Library.of(likeness, joined([known, *unmet.values()]))

@@ -15,7 +15,8 @@ from qvct_training.dataset import Table, made, synthesis
 from qvct_training.dsp import RATE
 from qvct_training.fonts import Note, midi_file
 from qvct_training.judging import Answers, by_family, calibrated, calibration, reliability
-from qvct_training.model_file import model_bytes, quantised, rounded
+from qvct_training.likeness import HEARD, SIZE, Library, centres, figures_of, fitted
+from qvct_training.model_file import likeness_bytes, model_bytes, quantised, rounded
 from qvct_training.network import Settings, train
 from qvct_training.recordings import class_by_name
 from qvct_training.training import folds, weights
@@ -141,3 +142,57 @@ def test_the_file_has_what_the_format_says(tmp_path: Path) -> None:
     layers = sum(4 + 8 * b + a * b for a, b in ((6, 8), (8, len(CLASSES))))
     names = sum(1 + len(f.label) for f in FAMILIES) + sum(3 + len(c.label) + len(c.detail) for c in CLASSES)
     assert len(data) == 16 + 4 + 4 + names + 4 + 16 + 2 * 6 * 4 + 4 + 2 * (4 + layers)
+
+
+def _many() -> Table:
+    """Four classes that a direction tells apart, and as much again that differs within them."""
+    random = np.random.default_rng(5)
+    classes = np.arange(800) % 4
+    features = random.standard_normal((800, 12)).astype(np.float32)
+    features[np.arange(800), classes] += 6
+    features[:, 8] *= 3
+    kits = np.array([f"kit {i % 5}" for i in range(800)])
+    return Table(1, features, np.array([0, 4, 7, 20])[classes], np.full(800, "machines"), kits)
+
+
+def test_places_of_one_class_lie_together_and_repeat() -> None:
+    table = _many()
+    settings = Settings(hidden=(16, SIZE - HEARD), epochs=40, batch=32, input_dropout=0, dropout=0)
+    likeness = fitted(table, settings)
+    places = likeness.places(table.features)
+    assert places.shape == (800, SIZE) and places.dtype == np.int8
+    assert np.array_equal(places, fitted(table, settings).places(table.features))
+    assert np.abs(places[:, -HEARD:].astype(int)).mean(axis=0).min() > 10
+    library = Library.of(likeness, table)
+    figures = figures_of(library, library)
+    assert figures["drums"] == 600 and figures["drums alike"] > 0.9 and figures["tones alike"] > 0.9
+
+
+def test_neighbours_are_counted_in_other_kits_and_where_there_are_ten() -> None:
+    places = np.zeros((24, SIZE), np.int8)
+    places[:, 0] = np.arange(24)
+    families = np.array([0] * 12 + [1] * 12)
+    library = Library(places, families, np.array(["a"] * 2 + ["b"] * 20 + ["c"] * 2))
+    shares = library.shares(library, own_kit=False)
+    assert shares[0] == 1 and shares[23] == 1  # ten of its family are in another kit
+    assert np.all(np.isnan(shares[2:22]))  # two of its family are not ten
+    assert library.shares(library, own_kit=True)[11] == pytest.approx(0.5, abs=0.11)
+
+
+def test_cells_have_their_middles_where_sounds_are() -> None:
+    random = np.random.default_rng(2)
+    spots = random.integers(-100, 100, (8, SIZE))
+    places = (np.repeat(spots, 40, axis=0) + random.integers(-3, 4, (320, SIZE))).astype(np.int8)
+    middles = centres(places, 24)
+    apart = np.abs(middles[None, :, :].astype(int) - spots[:, None, :]).max(axis=2).min(axis=1)
+    assert middles.shape == (24, SIZE) and np.count_nonzero(apart <= 4) >= 7
+    assert np.array_equal(middles, centres(places, 24))
+
+
+def test_the_file_of_likeness_has_what_the_format_says() -> None:
+    likeness = fitted(_many(), Settings(hidden=(16, SIZE - HEARD), epochs=1))
+    middles = np.zeros((5, SIZE), np.int8)
+    data = likeness_bytes(7, likeness.direction, 300.0, likeness.differences, middles)
+    assert data[:4] == b"QVLM" and struct.unpack("<III", data[4:16]) == (1, 7, 12)
+    layers = sum(4 + 8 * b + a * b for a, b in ((12, 16), (16, SIZE - HEARD), (12, HEARD)))
+    assert len(data) == 16 + 2 * 12 * 4 + layers + 4 + 4 + 5 * SIZE

@@ -8,7 +8,7 @@
 namespace qvct {
 namespace {
 
-constexpr double kLowRate = 5512;
+constexpr double kLowRate = 5512, kWorthHalving = 20'000;
 constexpr double kSmoothing = 0.0004;  // seconds, standard deviation
 constexpr double kAlone = 0.003;       // seconds to both sides in which a peak is the highest
 constexpr float kQuietest = 0.01F;     // of the highest peak
@@ -24,7 +24,10 @@ constexpr int kFewestBands = 5;
 
 }  // namespace
 
-Fingerprinter::Fingerprinter(double sampleRate) : sampleRate_(sampleRate), decimator_(sampleRate, kLowRate) {
+Fingerprinter::Fingerprinter(double sampleRate)
+    : sampleRate_(sampleRate),
+      halves_(sampleRate >= kWorthHalving),
+      decimator_(halves_ ? sampleRate / 2 : sampleRate, kLowRate) {
     const double rate = decimator_.sampleRate();
     const double width = std::max(kSmoothing * rate, 0.5);
     for (int i = 1; i <= static_cast<int>(std::ceil(3.5 * width)); ++i)
@@ -42,6 +45,14 @@ Fingerprinter::Fingerprinter(double sampleRate) : sampleRate_(sampleRate), decim
             wavelet.imaginary.push_back(static_cast<float>(-level * std::sin(angle)));
         }
     }
+}
+
+void Fingerprinter::measureLowerRate(std::span<const float> samples) {
+    lower_.clear();
+    if (!halves_) return decimator_.append(samples, lower_);
+    half_.resize(samples.size() / 2);
+    for (std::size_t i = 0; i < half_.size(); ++i) half_[i] = samples[2 * i] + samples[2 * i + 1];
+    decimator_.append(half_, lower_);
 }
 
 void Fingerprinter::measureSlope() {
@@ -151,9 +162,8 @@ std::optional<SoundFingerprint::Landmark> Fingerprinter::landmarkAt(const Peak& 
 }
 
 SoundFingerprint Fingerprinter::of(std::span<const float> samples) {
-    lower_.clear();
     const auto most = static_cast<std::size_t>(kMostSeconds * sampleRate_);
-    decimator_.append(samples.first(std::min(samples.size(), most)), lower_);
+    measureLowerRate(samples.first(std::min(samples.size(), most)));
     measureSlope();
     findPeaks();
     keepHighestPeaks();

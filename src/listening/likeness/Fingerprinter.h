@@ -37,6 +37,7 @@ class Fingerprinter {
         double cyclesPerSample;
         std::vector<float> real, imaginary;  // the middle one lies at the peak
     };
+    void measureLowerRate(std::span<const float> samples);
     void measureSlope();
     void findPeaks();
     void keepHighestPeaks();
@@ -45,12 +46,13 @@ class Fingerprinter {
     std::complex<float> phasorAt(double at, const Wavelet& wavelet) const;
 
     double sampleRate_;
+    bool halves_;  // the rate at first, which is cheap
     Decimator decimator_;
     std::vector<float> slopeTaps_;  // of one side
     std::vector<Wavelet> wavelets_;
 
     // Of the sound at hand.
-    std::vector<float> lower_, slope_;
+    std::vector<float> half_, lower_, slope_;
     std::vector<Peak> peaks_, kept_;
 };
 
