@@ -104,6 +104,9 @@ TEST(Listener, TellsWhatASoundIsLike) {
     EXPECT_FALSE(heard.likeness);
     EXPECT_TRUE(heard.instruments.empty());
     EXPECT_EQ(heard.fingerprint, one.fingerprint);
+    // Another rate than the last one's needs other tables.
+    EXPECT_EQ(withoutModels.listen(tones(220, 1, 10), 32000, 1).fingerprint,
+              Listener({}).listen(tones(220, 1, 10), 32000, 1).fingerprint);
 }
 
 TEST(Listener, ListensToTheBeginningOfALongSound) {

@@ -8,19 +8,19 @@
 namespace qvct {
 namespace {
 
-constexpr double kLowRate = 5512, kWorthHalving = 20'000;
-constexpr double kSmoothing = 0.0004;  // seconds, standard deviation
-constexpr double kAlone = 0.003;       // seconds to both sides in which a peak is the highest
-constexpr float kQuietest = 0.01F;     // of the highest peak
-constexpr double kNearby = 0.05;       // seconds
+constexpr double kLowRate = 5512, kWorthHalving = 20'000;  // Hz
+constexpr double kSmoothing = 0.0004;                      // seconds, standard deviation
+constexpr float kQuietest = 0.01F;                         // of the highest peak
+constexpr double kAlone = 0.003;                           // seconds around a peak without a higher one
+// So that of a long sound not only the loudest moment is known, which may be cut off.
+constexpr double kNearby = 0.05;  // seconds around a peak
 constexpr std::size_t kMostNearby = 8;
 
 constexpr std::size_t kBands = 16;
 constexpr double kLowestBand = 110, kBandStep = 1.2;  // Hz, and the ratio of neighbours
 constexpr double kCycles = 0.8;                       // in the standard deviation of a wavelet
 constexpr double kReach = 2.5;                        // standard deviations
-constexpr float kFaint = 3e-2F;                       // of the strongest band: says nothing
-constexpr int kFewestBands = 5;
+constexpr float kFaint = 3e-2F;                       // of the strongest band: noise decides its phase
 
 }  // namespace
 
@@ -34,7 +34,6 @@ Fingerprinter::Fingerprinter(double sampleRate)
         slopeTaps_.push_back(static_cast<float>(i * std::exp(-i * i / (2 * width * width))));
     for (std::size_t b = 0; b < kBands; ++b) {
         const double cycles = kLowestBand * std::pow(kBandStep, static_cast<double>(b)) / rate;
-        if (cycles > 0.4) break;
         Wavelet& wavelet = wavelets_.emplace_back(Wavelet{cycles, {}, {}});
         const double deviation = kCycles / cycles;
         const int reach = static_cast<int>(kReach * deviation);
@@ -61,10 +60,10 @@ void Fingerprinter::measureSlope() {
     lower_.insert(lower_.begin(), side, 0);
     lower_.resize(lower_.size() + side, 0);
     for (std::size_t tap = 1; tap <= side; ++tap) {
+        const float weight = slopeTaps_[tap - 1];
         const float* const before = lower_.data() + side - tap;
         const float* const after = lower_.data() + side + tap;
-        for (std::size_t i = 0; i < slope_.size(); ++i)
-            slope_[i] += slopeTaps_[tap - 1] * (after[i] - before[i]);
+        for (std::size_t i = 0; i < slope_.size(); ++i) slope_[i] += weight * (after[i] - before[i]);
     }
     lower_.erase(lower_.begin(), lower_.begin() + static_cast<std::ptrdiff_t>(side));
     lower_.resize(slope_.size());
@@ -139,7 +138,7 @@ std::complex<float> Fingerprinter::phasorAt(double at, const Wavelet& wavelet) c
            std::polar(1.0F, off);
 }
 
-std::optional<SoundFingerprint::Landmark> Fingerprinter::landmarkAt(const Peak& peak) const {
+SoundFingerprint::Landmark Fingerprinter::landmarkAt(const Peak& peak) const {
     std::array<std::complex<float>, kBands> phasors{};
     float strongest = 0;
     for (std::size_t b = 0; b < wavelets_.size(); ++b) {
@@ -147,21 +146,19 @@ std::optional<SoundFingerprint::Landmark> Fingerprinter::landmarkAt(const Peak& 
         strongest = std::max(strongest, std::abs(phasors[b]));
     }
     SoundFingerprint::Landmark found;
-    int clear = 0;
     for (std::size_t b = 0; b < wavelets_.size(); ++b) {
         const float level = std::abs(phasors[b]);
         if (level <= kFaint * strongest) continue;
-        ++clear;
         const float real = phasors[b].real(), imaginary = phasors[b].imag();
         found.hash |= (real < 0 ? 1U : 0U) << (2 * b) | (imaginary < 0 ? 2U : 0U) << (2 * b);
     }
-    if (clear < kFewestBands) return std::nullopt;
     const double seconds = peak.at / decimator_.sampleRate();
     found.frame = static_cast<std::uint16_t>(std::lround(seconds / SoundFingerprint::kFrameSeconds));
     return found;
 }
 
 SoundFingerprint Fingerprinter::of(std::span<const float> samples) {
+    if (sampleRate_ < kLowestRate) return {};
     const auto most = static_cast<std::size_t>(kMostSeconds * sampleRate_);
     measureLowerRate(samples.first(std::min(samples.size(), most)));
     measureSlope();
@@ -170,7 +167,7 @@ SoundFingerprint Fingerprinter::of(std::span<const float> samples) {
     SoundFingerprint print;
     for (const Peak& peak : peaks_) {
         if (print.landmarks.size() == SoundFingerprint::kMostLandmarks) break;
-        if (const auto found = landmarkAt(peak)) print.landmarks.push_back(*found);
+        print.landmarks.push_back(landmarkAt(peak));
     }
     std::sort(print.landmarks.begin(), print.landmarks.end(),
               [](const auto& one, const auto& other) { return one.frame < other.frame; });

@@ -5,7 +5,6 @@
 
 #include <complex>
 #include <cstddef>
-#include <optional>
 #include <span>
 #include <vector>
 
@@ -20,11 +19,13 @@ class Fingerprinter {
   public:
     /// No more of a sound is looked at.
     static constexpr double kMostSeconds = 15;
+    /// Lower rates do not hold the wavelets.
+    static constexpr double kLowestRate = 4500;
 
     /// REQUIRES: 1 <= sampleRate <= 64 kHz.
     explicit Fingerprinter(double sampleRate);
 
-    /// The fingerprint; empty for silence, for sounds of a few milliseconds and of less than two partials.
+    /// The fingerprint; empty for silence, for sounds of less than a millisecond, and at lower rates.
     /// REQUIRES: samples are finite and within +-16.
     SoundFingerprint of(std::span<const float> samples);
 
@@ -42,7 +43,7 @@ class Fingerprinter {
     void findPeaks();
     void keepHighestPeaks();
     void keepWhereFewerAreHigher(std::size_t most, double seconds);
-    std::optional<SoundFingerprint::Landmark> landmarkAt(const Peak& peak) const;
+    SoundFingerprint::Landmark landmarkAt(const Peak& peak) const;
     std::complex<float> phasorAt(double at, const Wavelet& wavelet) const;
 
     double sampleRate_;

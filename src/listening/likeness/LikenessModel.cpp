@@ -55,11 +55,9 @@ std::optional<SoundLikeness> LikenessModel::of(std::span<const float> features) 
     const auto differences = differences_.of(inputs);
     values.insert(values.end(), differences.begin(), differences.end());
     SoundLikeness likeness;
-    // Sums of a file's numbers may overflow: what is no number lies in the middle.
-    for (std::size_t i = 0; i < values.size(); ++i) {
-        const float value = std::isnan(values[i]) ? 0 : std::clamp(values[i], -kFarthest, kFarthest);
-        likeness.coordinates[i] = static_cast<std::int8_t>(std::lround(value));
-    }
+    for (std::size_t i = 0; i < values.size(); ++i)
+        likeness.coordinates[i] =
+            static_cast<std::int8_t>(std::lround(std::clamp(values[i], -kFarthest, kFarthest)));
     return likeness;
 }
 

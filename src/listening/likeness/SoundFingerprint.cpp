@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <array>
 #include <bit>
+#include <cmath>
 
 namespace qvct {
 namespace {
@@ -10,8 +11,8 @@ namespace {
 // What landmarks prove whose hashes differ in so many bits: those of copies mostly do in none, those of two
 // strokes on one drum mostly in some.
 constexpr std::array kProof{1.0, 0.6, 0.3};
-constexpr int kSlack = 1;       // frames
-constexpr double kFewest = 10;  // so many landmarks prove something
+constexpr int kSlack = 1;      // frames
+constexpr double kFewest = 6;  // so many landmarks prove something
 
 struct Agreement {
     int offset;
@@ -37,8 +38,8 @@ double sharedPart(const SoundFingerprint& one, const SoundFingerprint& other) {
             proof += found[k].proof;
         best = std::max(best, proof);
     }
-    const auto shorter = static_cast<double>(std::min(one.landmarks.size(), other.landmarks.size()));
-    return std::min(1.0, best / std::max(shorter, kFewest));
+    const auto both = static_cast<double>(one.landmarks.size() * other.landmarks.size());
+    return std::min(1.0, best / std::max(std::sqrt(both), kFewest));
 }
 
 }  // namespace qvct

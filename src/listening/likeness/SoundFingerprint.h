@@ -28,8 +28,8 @@ struct SoundFingerprint {
 /// From so much on, two sounds are copies of one recording.
 inline constexpr double kSharedByCopies = 0.3;
 
-/// What is in both of two sounds at the same distances in time, as a share of the shorter one's landmarks: 0
-/// to 1. Hashes that differ in one or two bits count in part.
+/// How many landmarks are in both of two sounds at the same distances in time, as a share of the geometric
+/// mean of their numbers: 0 to 1. Hashes that differ in one or two bits count in part.
 ///
 /// @cost  About 2 us.
 double sharedPart(const SoundFingerprint& one, const SoundFingerprint& other);
