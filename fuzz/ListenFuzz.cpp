@@ -40,6 +40,9 @@ void check(const qvct::HeardSound& sound, std::size_t frames) {
         requireShare(tempo.confidence);
         require(std::isfinite(tempo.bpm) && tempo.bpm > 0 && std::isfinite(tempo.beats));
     }
+    const auto& landmarks = sound.fingerprint.landmarks;
+    require(landmarks.size() <= qvct::SoundFingerprint::kMostLandmarks);
+    for (std::size_t i = 1; i < landmarks.size(); ++i) require(landmarks[i - 1].frame < landmarks[i].frame);
 }
 
 }  // namespace

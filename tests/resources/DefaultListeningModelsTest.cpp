@@ -122,6 +122,13 @@ TEST(DefaultListeningModels, AreReplacedByAFileUnlessThatIsBroken) {
     folder.write("InstrumentModel.bin", bytes);
     EXPECT_EQ(defaultInstrumentModel()->label(0), "Bump");
 
+    std::string likeness(reinterpret_cast<const char*>(LikenessModel_bin), LikenessModel_bin_len);
+    likeness.replace(likeness.size() - SoundLikeness::kSize, SoundLikeness::kSize, SoundLikeness::kSize, 127);
+    folder.write("LikenessModel.bin", likeness);
+    SoundLikeness corner;
+    corner.coordinates.fill(127);
+    EXPECT_EQ(defaultListeningModels().likeness->nearestCell(corner), 1023);
+
     const test::CapturedLog log;
     bytes.pop_back();
     folder.write("InstrumentModel.bin", bytes);
