@@ -91,8 +91,12 @@ void Fingerprinter::keepHighestPeaks() {
                   [&](const Peak& peak) { return peak.height < kQuietest * highest || peak.height <= 0; });
     keepWhereFewerAreHigher(1, kAlone);
     keepWhereFewerAreHigher(kMostNearby, kNearby);
-    std::sort(peaks_.begin(), peaks_.end(),
-              [](const Peak& one, const Peak& other) { return one.height > other.height; });
+    std::sort(peaks_.begin(), peaks_.end(), isHigher);
+}
+
+// Of equally high ones the first counts as higher.
+bool Fingerprinter::isHigher(const Peak& one, const Peak& other) {
+    return one.height > other.height || (one.height == other.height && one.at < other.at);
 }
 
 /// Keeps the peaks that have fewer than `most` higher ones within so many seconds to both sides.
@@ -105,7 +109,7 @@ void Fingerprinter::keepWhereFewerAreHigher(std::size_t most, double seconds) {
         std::size_t higher = 0;
         for (std::size_t k = first; k < peaks_.size() && peaks_[k].at - peak.at <= reach && higher < most;
              ++k)
-            if (peaks_[k].height > peak.height) ++higher;
+            if (isHigher(peaks_[k], peak)) ++higher;
         if (higher < most) kept_.push_back(peak);
     }
     peaks_.swap(kept_);

@@ -38,6 +38,7 @@ class Fingerprinter {
         double cyclesPerSample;
         std::vector<float> real, imaginary;  // the middle one lies at the peak
     };
+    static bool isHigher(const Peak& one, const Peak& other);
     void measureLowerRate(std::span<const float> samples);
     void measureSlope();
     void findPeaks();

@@ -6,7 +6,6 @@
 #include <algorithm>
 #include <cmath>
 #include <numeric>
-#include <utility>
 
 namespace qvct {
 namespace {
@@ -70,13 +69,15 @@ std::uint16_t LikenessModel::nearestCell(const SoundLikeness& place) const {
 }
 
 std::vector<std::uint16_t> LikenessModel::cellsByDistance(const SoundLikeness& place) const {
-    std::vector<std::pair<int, std::uint16_t>> cells;
-    for (const SoundLikeness& centre : centres_)
-        cells.emplace_back(squaredDistance(centre, place), static_cast<std::uint16_t>(cells.size()));
-    std::sort(cells.begin(), cells.end());
-    std::vector<std::uint16_t> sorted;
-    for (const auto& [distance, cell] : cells) sorted.push_back(cell);
-    return sorted;
+    std::vector<int> distances(centres_.size());
+    std::transform(centres_.begin(), centres_.end(), distances.begin(),
+                   [&](const SoundLikeness& centre) { return squaredDistance(centre, place); });
+    std::vector<std::uint16_t> cells(centres_.size());
+    std::iota(cells.begin(), cells.end(), std::uint16_t{0});
+    std::stable_sort(cells.begin(), cells.end(), [&](std::uint16_t one, std::uint16_t other) {
+        return distances[one] < distances[other];
+    });
+    return cells;
 }
 
 }  // namespace qvct
