@@ -34,6 +34,7 @@ class Options:
     recordings: Path | None = None
     machines: Path | None = None
     live_coding: Path | None = None
+    toolkit: Path | None = None
     fluid: Path | None = None
     musescore: Path | None = None
     test: list[str] = field(default_factory=list)
@@ -56,6 +57,7 @@ def options() -> Options:
         ("recordings", "folder of labelled recordings (labels.tsv)"),
         ("machines", "folder of drum machines' sounds"),
         ("live-coding", "samples of Debian's sonic-pi-samples"),
+        ("toolkit", "waves of Debian's stk"),
         ("fluid", "FluidR3_GM.sf2"),
         ("musescore", "MuseScore_General_Full.sf3"),
     ]:
@@ -82,6 +84,7 @@ def training_recipes(given: Options) -> dict[str, Recipes]:
         ("recordings", given.recordings, recordings.labelled, 2),
         ("machines", given.machines, recordings.by_name, 12),
         ("live coding", given.live_coding, recordings.live_coding, 8),
+        ("toolkit", given.toolkit, recordings.toolkit_drums, 12),
     ):
         if folder is not None:
             found[source] = partial(_of_recordings, of, folder, source, copies)
@@ -176,7 +179,7 @@ def dataset_answers(parts: dict[str, Answers]) -> Answers:
     return first
 
 
-DRUM_SOUNDS, TONE_SOUNDS = 300, 150  # of each class
+DRUM_SOUNDS, TONE_SOUNDS = 600, 250  # of each class
 SEEDS = (1, 2)
 
 if __name__ == "__main__":

@@ -1,9 +1,11 @@
 """What happens to a sound between its making and a library: tuned, filtered, sampled coarsely, cut, overdriven."""
 
+from collections.abc import Callable
+
 import numpy as np
 from scipy import signal
 
-from .dsp import RATE, Random, Sound, chance, decay, high_pass, log_uniform, low_pass, noise, times
+from .dsp import RATE, Random, Sound, ambience, chance, decay, high_pass, log_uniform, low_pass, noise
 
 
 def resampled(sound: Sound, factor: float) -> Sound:
@@ -33,15 +35,14 @@ def coarse(random: Random, sound: Sound) -> Sound:
     return low_pass(out, log_uniform(random, 6000, 20000), 4) if chance(random, 0.5) else out
 
 
-def room(random: Random, sound: Sound) -> Sound:
-    """Early reflections and a tail."""
-    t = times(log_uniform(random, 0.05, 1.2))
-    tail = noise(random, len(t)) * decay(t, t[-1]) * (t > random.uniform(0.001, 0.03))
-    tail = low_pass(tail, log_uniform(random, 1500, 12000), 1)
-    wet = signal.fftconvolve(np.concatenate([sound, np.zeros(len(t) // 2)]), tail / (np.sqrt(np.sum(tail**2)) + 1e-9))
-    wet = wet[: len(sound) + len(t) // 2]
-    dry = np.concatenate([sound, np.zeros(len(wet) - len(sound))])
-    return np.asarray(dry + log_uniform(random, 0.03, 0.5) * wet)
+def dying_away(random: Random, sound: Sound) -> Sound:
+    """Under an envelope that falls."""
+    return sound * decay(np.arange(len(sound)) / RATE, log_uniform(random, 0.3, 3))
+
+
+def overdriven(random: Random, sound: Sound) -> Sound:
+    """Through an amplifier at its limit."""
+    return np.asarray(np.tanh(log_uniform(random, 0.7, 8) * sound / (np.max(np.abs(sound)) + 1e-9)))
 
 
 def tilted(random: Random, sound: Sound) -> Sound:
@@ -66,23 +67,41 @@ def cut(random: Random, sound: Sound) -> Sound:
     return out
 
 
+def ended(random: Random, sound: Sound) -> Sound:
+    """As files end: where the sound has died away, or after some silence."""
+    if chance(random, 0.6):
+        heard = np.flatnonzero(np.abs(sound) > log_uniform(random, 3e-4, 1e-2) * np.max(np.abs(sound)))
+        sound = sound[: max(1200, heard[-1] + 1)] if len(heard) else sound
+    if chance(random, 0.3):
+        sound = np.concatenate([sound, np.zeros(int(random.uniform(0, 1.5) * RATE))])
+    return sound
+
+
+def floor(random: Random, sound: Sound) -> Sound:
+    """Hiss, hum and rumble under the sound."""
+    under = noise(random, len(sound)) * log_uniform(random, 1e-5, 5e-3)
+    if chance(random, 0.6):
+        rumble = low_pass(noise(random, len(sound)), log_uniform(random, 30, 400), 1)
+        under += rumble / np.std(rumble) * log_uniform(random, 1e-4, 2e-2)
+    return np.asarray(sound + np.max(np.abs(sound)) * under)
+
+
 def augmented(random: Random, sound: Sound, most_octaves: float, strength: float = 1.0) -> Sound:
     """The sound as it might be met, tuned by at most that many octaves; each step by chance."""
     out = np.asarray(sound, dtype=np.float64)
+    steps: list[tuple[float, Callable[[Random, Sound], Sound]]] = [
+        (0.4, dying_away),
+        (0.55, tilted),
+        (0.25, overdriven),
+        (0.35, coarse),
+        (0.4, ambience),
+        (0.25, cut),
+        (0.85, ended),
+        (0.4, floor),
+    ]
     if chance(random, 0.85):
         out = resampled(out, 2 ** random.uniform(-most_octaves, most_octaves))
-    if chance(random, 0.4 * strength):
-        out = out * decay(np.arange(len(out)) / RATE, log_uniform(random, 0.3, 3))
-    if chance(random, 0.55 * strength):
-        out = tilted(random, out)
-    if chance(random, 0.25 * strength):
-        out = np.tanh(log_uniform(random, 0.7, 8) * out / (np.max(np.abs(out)) + 1e-9))
-    if chance(random, 0.35 * strength):
-        out = coarse(random, out)
-    if chance(random, 0.25 * strength):
-        out = room(random, out)
-    if chance(random, 0.25 * strength):
-        out = cut(random, out)
-    if chance(random, 0.3 * strength):
-        out = out + log_uniform(random, 1e-5, 5e-3) * np.max(np.abs(out)) * noise(random, len(out))
+    for share, step in steps:
+        if chance(random, share * strength):
+            out = step(random, out)
     return out

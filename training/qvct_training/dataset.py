@@ -9,12 +9,14 @@ from pathlib import Path
 import numpy as np
 import numpy.typing as npt
 
-from . import drums, fonts, recordings, tones
+from . import cymbals, drums, effects, fonts, instruments, keyboards, percussion, recordings, synthesizers
 from .augment import augmented
 from .classes import INDEX
 from .dsp import RATE, Random, chance, normalised
 from .features import features_of
 
+DRUMS = drums.VOICES | cymbals.VOICES | percussion.VOICES
+TONES = synthesizers.VOICES | keyboards.VOICES | instruments.VOICES | effects.VOICES
 BATCH = 150  # sounds that one process makes and has measured
 
 
@@ -89,11 +91,11 @@ def _seed(*parts: object) -> int:
 
 def synthesis(drum_count: int, tone_count: int) -> Iterator[Recipe]:
     """Our own voices; most are altered."""
-    for voices, count, octaves in ((drums.VOICES, drum_count, 0.15), (tones.VOICES, tone_count, 0.0)):
+    for voices, count, octaves in ((DRUMS, drum_count, 0.15), (TONES, tone_count, 0.0)):
         for name, voice in voices.items():
             for i in range(count):
                 seed = _seed("synthesis", name, i)
-                yield Recipe(name, "synthesis", "synthesis", seed, voice, octaves, i % 10 < 7)
+                yield Recipe(name, "synthesis", "synthesis", seed, voice, octaves, i % 10 < 8)
 
 
 def of_recordings(found: Iterable[recordings.Recording], source: str, copies: int) -> Iterator[Recipe]:

@@ -115,6 +115,35 @@ def modes(t: Sound, frequencies: npt.ArrayLike, levels: npt.ArrayLike, seconds: 
     return out
 
 
+def struck(random: Random, t: Sound, frequencies: npt.ArrayLike, seconds: float, hardness: float) -> Sound:
+    """A body struck by something that excites little above `hardness`; high modes die away sooner."""
+    f = np.asarray(frequencies, dtype=np.float64)
+    levels = random.uniform(0.15, 1, len(f)) / (1 + (f / hardness) ** 2)
+    falls = seconds * (f / f.min()) ** -random.uniform(0, 1.1) * random.uniform(0.5, 1, len(f))
+    return peaked(modes(t, f, levels, falls, random))
+
+
+def spread(random: Random, low: float, high: float, count: int) -> Sound:
+    """Frequencies evenly spread by octaves."""
+    return np.asarray(np.exp(random.uniform(np.log(low), np.log(high), count)))
+
+
+def ambience(random: Random, sound: Sound) -> Sound:
+    """Early reflections and a tail."""
+    t = times(log_uniform(random, 0.05, 1.8))
+    tail = noise(random, len(t)) * decay(t, t[-1]) * (t > random.uniform(0.001, 0.03))
+    tail = low_pass(tail, log_uniform(random, 1500, 16000), 1)
+    wet = signal.fftconvolve(np.concatenate([sound, np.zeros(len(t) // 2)]), tail / (np.sqrt(np.sum(tail**2)) + 1e-9))
+    wet = wet[: len(sound) + len(t) // 2]
+    dry = np.concatenate([sound, np.zeros(len(wet) - len(sound))])
+    return np.asarray(dry + log_uniform(random, 0.03, 0.7) * wet)
+
+
+def peaked(sound: Sound) -> Sound:
+    """The sound with a peak of 1."""
+    return np.asarray(sound / (np.max(np.abs(sound), initial=0.0) + 1e-9))
+
+
 def normalised(sound: Sound) -> npt.NDArray[np.float32]:
     """The sound with a peak of 0.9."""
     peak = float(np.max(np.abs(sound))) if len(sound) else 0.0

@@ -2,18 +2,22 @@
 
 import subprocess
 import tempfile
-from collections.abc import Iterable
+from collections.abc import Iterable, Iterator
 from dataclasses import dataclass
 from pathlib import Path
 
 import numpy as np
+import numpy.typing as npt
 import soundfile
 
 from . import general_midi
 from .dsp import RATE, Random
 
 SPACING = 2.6  # seconds from one note to the next
+AT_ONCE = 400  # notes in a score, so that its sound fits into memory
 _TICKS = 480  # of a quarter note, at 120 quarter notes a minute
+
+Samples = npt.NDArray[np.float32]
 
 
 @dataclass(frozen=True)
@@ -81,8 +85,13 @@ def tonal_notes(each: int, banks: Iterable[int], random: Random) -> list[Note]:
     return notes
 
 
-def render(font: Path, notes: list[Note]) -> list[np.ndarray]:
+def render(font: Path, notes: list[Note]) -> Iterator[Samples]:
     """Each note with what sounds after it, mono, cut where it has died away."""
+    for start in range(0, len(notes), AT_ONCE):
+        yield from _rendered(font, notes[start : start + AT_ONCE])
+
+
+def _rendered(font: Path, notes: list[Note]) -> list[Samples]:
     with tempfile.TemporaryDirectory() as folder:
         score, wav = Path(folder) / "notes.mid", Path(folder) / "notes.wav"
         score.write_bytes(midi_file(notes))

@@ -11,7 +11,7 @@ import numpy as np
 import numpy.typing as npt
 import soundfile
 
-from . import drums, tones
+from .dataset import DRUMS, TONES
 from .dsp import RATE, Random, Sound, chance, normalised
 from .features import features_of
 
@@ -21,7 +21,7 @@ MOST_SECONDS = 30
 
 def one_shot(random: Random) -> Sound:
     """Any voice, perhaps with silence after it."""
-    voices = list((drums.VOICES | tones.VOICES).values())
+    voices = list((DRUMS | TONES).values())
     sound = voices[int(random.integers(len(voices)))](random)
     silence = int(random.choice([0, 0, 0, 1]) * random.uniform(0, 2) * RATE)
     return np.concatenate([sound, np.zeros(silence)])
@@ -32,7 +32,7 @@ def loop(random: Random) -> Sound:
     step = 60 / random.uniform(70, 175) / 4
     steps = 16 * int(random.choice([1, 2, 2, 4]))
     out = np.zeros(int(steps * step * RATE))
-    kit = list((drums.VOICES if chance(random, 0.6) else tones.VOICES).values())
+    kit = list((DRUMS if chance(random, 0.6) else TONES).values())
     for _ in range(int(random.integers(1, 6))):
         sound = normalised(kit[int(random.integers(len(kit)))](random)) * random.uniform(0.3, 1)
         pattern = random.random(16) < random.uniform(0.1, 0.6)

@@ -15,7 +15,7 @@ class Settings:
     """How a network is trained."""
 
     hidden: tuple[int, ...] = (192, 96)
-    epochs: int = 20
+    epochs: int = 15
     batch: int = 256
     rate: float = 2e-3
     weight_decay: float = 0.02

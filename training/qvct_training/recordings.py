@@ -4,6 +4,7 @@ import re
 from collections.abc import Iterator
 from dataclasses import dataclass
 from pathlib import Path
+from typing import Any
 
 import numpy as np
 import numpy.typing as npt
@@ -41,6 +42,10 @@ _NAMES: list[tuple[str, str | None]] = [
 ]
 
 
+# How the Synthesis ToolKit keeps its waves.
+_RAW: dict[str, Any] = {"samplerate": 22050, "channels": 1, "format": "RAW", "subtype": "PCM_16", "endian": "BIG"}
+
+
 @dataclass(frozen=True)
 class Recording:
     """A file, its class and the kit that is left out with it."""
@@ -58,7 +63,7 @@ def class_by_name(stem: str) -> str | None:
 
 def load(path: Path) -> npt.NDArray[np.float32]:
     """The beginning of a file, mono, at RATE."""
-    with soundfile.SoundFile(path) as file:
+    with soundfile.SoundFile(path, **(_RAW if path.suffix == ".raw" else {})) as file:
         rate = file.samplerate
         sound = file.read(int(MOST_SECONDS * rate), dtype="float64", always_2d=True).mean(axis=1)
     if rate != RATE:
@@ -124,6 +129,26 @@ def live_coding(folder: Path) -> Iterator[Recording]:
         name = class_by_name(path.stem) if known is None else known
         if name:
             yield Recording(path, name, "live coding")
+
+
+_TOOLKIT_DRUMS = {
+    "bassdrum": "kick",
+    "snardrum": "snare",
+    "hihatcym": "closed hat",
+    "ridecymb": "ride",
+    "crashcym": "crash",
+    "cowbell1": "cowbell",
+    "tambourn": "tambourine",
+    "tomhidrm": "tom",
+    "tommiddr": "tom",
+    "tomlowdr": "tom",
+}
+
+
+def toolkit_drums(folder: Path) -> Iterator[Recording]:
+    """The drums among the waves of Debian's package stk."""
+    for stem, name in _TOOLKIT_DRUMS.items():
+        yield Recording(folder / f"{stem}.raw", name, "stk")
 
 
 _LABELS = {

@@ -14,7 +14,7 @@ from .network import Array, Network, Settings, train
 
 # How much a source counts beside its number of sounds: recordings of machines are few and dear, our own pitched
 # instruments are crude.
-STRENGTHS = {"machines": 2.0, "live coding": 1.5}
+STRENGTHS = {"machines": 2.0, "toolkit": 2.0, "live coding": 1.5}
 STRENGTH_OF_OUR_TONES = 0.5
 CROWDING = 0.3  # how much less each sound counts where a source has many of a class
 # Sources made from the same recordings are left out together.

@@ -8,23 +8,23 @@ from pathlib import Path
 import numpy as np
 import pytest
 
-from qvct_training import drums, general_midi, tones
-from qvct_training.augment import augmented
+from qvct_training import drums, general_midi
+from qvct_training.augment import augmented, ended
 from qvct_training.classes import CLASSES, FAMILIES, FAMILY_OF_CLASS, INDEX
-from qvct_training.dataset import Table, made, synthesis
+from qvct_training.dataset import DRUMS, TONES, Table, made, synthesis
 from qvct_training.dsp import RATE
 from qvct_training.fonts import Note, midi_file
 from qvct_training.judging import Answers, by_family, calibrated, calibration, reliability
 from qvct_training.likeness import HEARD, SIZE, Library, centres, figures_of, fitted
 from qvct_training.model_file import likeness_bytes, model_bytes, quantised, rounded
 from qvct_training.network import Settings, train
-from qvct_training.recordings import class_by_name
+from qvct_training.recordings import class_by_name, load, toolkit_drums
 from qvct_training.training import folds, weights
 
 
-@pytest.mark.parametrize("name", [*drums.VOICES, *tones.VOICES])
+@pytest.mark.parametrize("name", [*DRUMS, *TONES])
 def test_voices_sound_and_are_finite(name: str) -> None:
-    voice = (drums.VOICES | tones.VOICES)[name]
+    voice = (DRUMS | TONES)[name]
     assert name in INDEX
     for seed in range(6):
         sound = voice(np.random.default_rng(seed))
@@ -46,6 +46,15 @@ def test_augmentation_keeps_a_sound_finite() -> None:
         assert np.all(np.isfinite(out)) and np.max(np.abs(out)) > 1e-4, seed
 
 
+def test_silence_after_a_sound_goes_or_grows_and_the_sound_stays() -> None:
+    tone = np.sin(np.arange(RATE // 2) / 10) + 2
+    sound = np.concatenate([tone, np.zeros(RATE)])
+    ends = [ended(np.random.default_rng(seed), sound) for seed in range(60)]
+    assert all(np.array_equal(end[: len(tone)], tone) and not np.any(end[len(tone) :]) for end in ends)
+    lengths = [len(end) for end in ends]
+    assert lengths.count(len(tone)) > 15 and max(lengths) > len(sound) + RATE
+
+
 @pytest.mark.parametrize(
     ("stem", "name"),
     [
@@ -56,6 +65,15 @@ def test_augmentation_keeps_a_sound_finite() -> None:
 )  # fmt: skip
 def test_names_tell_classes(stem: str, name: str | None) -> None:
     assert class_by_name(stem) == name
+
+
+def test_waves_of_the_toolkit_are_read_as_they_are_kept(tmp_path: Path) -> None:
+    wave = (20000 * np.sin(2 * np.pi * 441 * np.arange(2205) / 22050)).astype(">i2")
+    first = next(toolkit_drums(tmp_path))
+    first.path.write_bytes(wave.tobytes())
+    sound = load(first.path)
+    assert len(sound) == 4410 and np.max(np.abs(sound)) == pytest.approx(20000 / 32768, rel=0.05)
+    assert np.abs(np.fft.rfft(sound)).argmax() == 44  # 441 Hz at 44.1 kHz
 
 
 def test_programs_and_keys_have_classes_that_there_are() -> None:
