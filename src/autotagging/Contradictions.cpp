@@ -6,7 +6,7 @@
 #include "listening/instrument/InstrumentModel.h"
 #include "media/loopfile/LCFileData.h"
 #include "metadata/TGRTMetaData.h"
-#include "resources/DefaultInstrumentModel.h"
+#include "resources/DefaultListeningModels.h"
 #include "taxonomy/TGRTTagging.h"
 #include "taxonomy/TaggingTypes.h"
 
