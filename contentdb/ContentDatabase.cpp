@@ -1,12 +1,16 @@
 #include "contentdb/ContentDatabase.h"
 
 #include "autotagging/names/Thesaurus.h"
+#include "contentdb/ContentDescriber.h"
+#include "contentdb/query/Duplicates.h"
+#include "contentdb/query/NearestSounds.h"
 #include "contentdb/query/Search.h"
 #include "contentdb/query/SimilarItems.h"
 #include "contentdb/store/sqlite/Reading.h"
 #include "contentdb/store/sqlite/RunLock.h"
 #include "contentdb/store/upkeep/StoreCheck.h"
 #include "contentdb/terms/Terms.h"
+#include "platform/text/Url.h"
 #include "taxonomy/TGRTTaxonomy.h"
 
 #include <algorithm>
@@ -31,6 +35,41 @@ struct ContentDatabase::Implementation {
                 throw;
             }
         });
+    }
+
+    /// The query, with the sound that it names looked up or listened to.
+    std::optional<Query> withSound(const Query& query, Error* error) {
+        if (!query.like || !query.like->likeness.empty()) return query;
+        auto likeness = likenessOf(URL::fileURLWithPath(query.like->file).path(), error);
+        if (!likeness) return std::nullopt;
+        Query result = query;
+        result.like->likeness = std::move(*likeness);
+        return result;
+    }
+
+    /// What is stored of the item at the path, or else heard in the file; nothing and an error when that is
+    /// nothing.
+    std::optional<std::string> likenessOf(const std::string& path, Error* error) {
+        const auto stored = read(error, [&] {
+            const auto id = store.idOfPath(path);
+            const auto item = id ? store.item(*id) : std::nullopt;
+            return item ? item->likeness : std::string();
+        });
+        if (!stored || !stored->empty()) return stored;
+        ContentDescriber listener(QVCTAutoTaggingOptionSound);
+        auto heard = listener.describe(path, error);
+        if (!heard) return std::nullopt;
+        if (!heard->likeness.empty()) return std::move(heard->likeness);
+        fail(error, kErrorInvalidArgument, "there is nothing to hear in it", {path});
+        return std::nullopt;
+    }
+
+    /// Runs `work(query)` for a query of which the sound is known.
+    template <typename Work>
+    auto readFor(const Query& query, Error* error, Work work) -> std::optional<decltype(work(query))> {
+        const auto whole = withSound(query, error);
+        if (!whole) return std::nullopt;
+        return read(error, [&] { return work(*whole); });
     }
 
     std::unique_ptr<Connection> connection;
@@ -66,16 +105,19 @@ std::optional<Vocabulary> ContentDatabase::vocabulary(Error* error) {
 
 std::optional<std::vector<Found>> ContentDatabase::search(const Query& query, std::size_t limit,
                                                           Error* error) {
-    return implementation_->read(error,
-                                 [&] { return contentdb::search(implementation_->store, query, limit); });
+    return implementation_->readFor(query, error, [&](const Query& whole) {
+        return contentdb::search(implementation_->store, whole, limit);
+    });
 }
 
 std::optional<std::int64_t> ContentDatabase::count(const Query& query, Error* error) {
-    return implementation_->read(error, [&] { return countMatches(implementation_->store, query); });
+    return implementation_->readFor(
+        query, error, [&](const Query& whole) { return countMatches(implementation_->store, whole); });
 }
 
 std::optional<std::vector<Facet>> ContentDatabase::facets(const Query& query, Error* error) {
-    return implementation_->read(error, [&] { return contentdb::facets(implementation_->store, query); });
+    return implementation_->readFor(
+        query, error, [&](const Query& whole) { return contentdb::facets(implementation_->store, whole); });
 }
 
 std::optional<std::vector<Similar>> ContentDatabase::similar(std::string_view path, std::size_t limit,
@@ -91,6 +133,28 @@ std::optional<std::vector<Similar>> ContentDatabase::similar(std::string_view pa
         return refuse("no tags, rhythm or tempo by which others could be similar");
     return implementation_->read(error,
                                  [&] { return similarItems(implementation_->store, found->id, limit); });
+}
+
+std::optional<std::vector<Similar>> ContentDatabase::soundingLike(std::string_view path, std::size_t limit,
+                                                                  Error* error) {
+    const auto likeness = implementation_->likenessOf(std::string(path), error);
+    if (!likeness) return std::nullopt;
+    return implementation_->read(error, [&] {
+        ContentStore& store = implementation_->store;
+        return soundsLike(store, *likeness, store.idOfPath(path), limit);
+    });
+}
+
+bool ContentDatabase::forEachDuplicate(const Query& query,
+                                       const std::function<bool(const DuplicateGroup&)>& visit,
+                                       Error* error) {
+    return implementation_
+        ->readFor(query, error,
+                  [&](const Query& whole) {
+                      contentdb::forEachDuplicate(implementation_->store, whole, visit);
+                      return true;
+                  })
+        .has_value();
 }
 
 std::optional<Found> ContentDatabase::item(std::string_view path, Error* error) {

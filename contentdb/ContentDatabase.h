@@ -45,6 +45,17 @@ class QVCT_API ContentDatabase {
     /// path could not be read, or has no tags, rhythm or tempo.
     std::optional<std::vector<Similar>> similar(std::string_view path, std::size_t limit,
                                                 Error* error = nullptr);
+    /// The items that sound most like the one at the path, or like that sound file, best first, itself left
+    /// out. Nothing and an error when there is nothing to hear in it.
+    /// @cost  A few milliseconds, and for a file that is not in the database those of listening to it.
+    std::optional<std::vector<Similar>> soundingLike(std::string_view path, std::size_t limit,
+                                                     Error* error = nullptr);
+    /// Calls `visit` with each group of found items that hold the same sound: exact copies, and the same
+    /// recording at another level, rate or resolution, in another format, or cut. In the order of their
+    /// oldest items, until it answers false.
+    /// @cost  O(items): some minutes for a million, 300 bytes of memory for each and 100 MB.
+    bool forEachDuplicate(const Query& query, const std::function<bool(const DuplicateGroup&)>& visit,
+                          Error* error = nullptr);
     /// The item at the path; nothing and an error when there is none.
     std::optional<Found> item(std::string_view path, Error* error = nullptr);
     /// Where the item was before it was moved.

@@ -7,6 +7,7 @@
 #include "contentdb/index/PayloadHash.h"
 #include "contentdb/store/Digest.h"
 #include "contentdb/store/codec/ExplanationCodec.h"
+#include "contentdb/store/codec/SoundCodec.h"
 #include "formats/QVContentTaggingTypes.h"
 #include "indexing/TGRTIndexableContentObject.h"
 #include "listening/HeardSound.h"
@@ -210,6 +211,21 @@ struct ContentDescriber::Implementation {
             addNumber(item, "Tempo", roundedTo(heard->tempos.front().bpm, 100));
     }
 
+    static void addForm(IndexedItem& item, const LCAudioFacts& facts) {
+        if (facts.sampleRate <= 0) return;
+        addNumber(item, QVContentKeyLengthInSeconds,
+                  static_cast<double>(facts.frameCount) / facts.sampleRate);
+        addNumber(item, kSampleRateKey, facts.sampleRate);
+        if (facts.bitsPerSample > 0) addNumber(item, kBitDepthKey, facts.bitsPerSample);
+        addNumber(item, kChannelCountKey, facts.channelCount);
+    }
+
+    void addSound(IndexedItem& item) const {
+        if (!heard) return;
+        if (heard->likeness) item.likeness = encodedLikeness(*heard->likeness);
+        item.fingerprint = encodedFingerprint(heard->fingerprint);
+    }
+
     /// In few steps, so that few groups of numbers have them all.
     void addHeard(IndexedItem& item) const {
         if (!heard) return;
@@ -253,7 +269,7 @@ ContentDescriber::~ContentDescriber() = default;
 
 std::uint64_t ContentDescriber::digest(std::uint64_t services) {
     // Raised when a change makes items be described differently although the version stays the same.
-    constexpr std::uint64_t edition = 7;
+    constexpr std::uint64_t edition = 8;
     Digest digest;
     digest.add(services);
     digest.add(version());
@@ -298,7 +314,9 @@ std::optional<IndexedItem> ContentDescriber::describe(const std::string& path, E
     its.heard = content->file().heardSound();
     addValues(item, object->valueDatas());
     its.addTempoAndBeats(item, content->fileData().get(), url.lastPathComponent());
+    if (const auto file = content->fileData()) Implementation::addForm(item, file->facts());
     its.addHeard(item);
+    its.addSound(item);
     item.payloadHash = payloadHash(*content);
     return item;
 }

@@ -8,6 +8,7 @@
 #include <memory>
 #include <optional>
 #include <string>
+#include <string_view>
 #include <variant>
 #include <vector>
 
@@ -44,6 +45,14 @@ struct IndexedValue {
 
     bool operator==(const IndexedValue&) const = default;
 };
+
+/// @{
+/// Key of a value that says how a sound is stored: frames a second; bits a sample, where its coding has such
+/// a number; channels.
+inline constexpr std::string_view kSampleRateKey = "SampleRate";
+inline constexpr std::string_view kBitDepthKey = "BitDepth";
+inline constexpr std::string_view kChannelCountKey = "ChannelCount";
+/// @}
 
 /// A file that the item needs.
 struct IndexedDependency {
@@ -87,6 +96,10 @@ struct IndexedItem {
     std::vector<IndexedValue> values;
     std::vector<std::string> packs;
     std::vector<IndexedDependency> dependencies;
+    /// Where its sound lies among all sounds, and what tells copies of it, in forms that are the database's
+    /// own. Empty when nobody listened.
+    std::string likeness;
+    std::string fingerprint;
     /// Why the item could not be read, without its path; then nothing below `stamp` is known, and no search
     /// finds it.
     std::string failure;

@@ -39,7 +39,7 @@ std::optional<Query> parseQuery(std::string_view text, const Vocabulary& vocabul
 }
 
 bool matches(const Query& query, const IndexedItem& item, Error* error) {
-    if (!item.failure.empty()) return false;
+    if (!item.failure.empty() || (query.like && item.likeness.empty())) return false;
     Error fault;
     const bool isMatch = meets(query.condition, item, fault);
     if (!fault.isSet()) return isMatch;

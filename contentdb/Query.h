@@ -95,11 +95,25 @@ struct SortKey {
     bool isDescending = false;
 };
 
+/// At most so many items sound like something: the nearest of those that meet the query's other conditions.
+inline constexpr std::size_t kMostAlike = 100;
+
+/// A sound that the found items are to sound like.
+struct SoundToMeet {
+    /// An item of the database, or any other file, as it was written.
+    std::string file;
+    /// As in `IndexedItem::likeness`. When it is empty, the database looks it up, or listens to the file.
+    std::string likeness = {};
+};
+
 /// A parsed query. Belongs to one thread at a time, because of its regular expressions.
 struct Query {
     Condition condition;
     /// Empty for the order in which items came into the database.
     std::vector<SortKey> order;
+    /// Then only the `kMostAlike` nearest items are found, nearest first where `order` does not say
+    /// otherwise.
+    std::optional<SoundToMeet> like = {};
 };
 
 /// The names that are fields besides the built-in ones.
@@ -124,8 +138,9 @@ struct QueryError {
 QVCT_API std::optional<Query> parseQuery(std::string_view text, const Vocabulary& vocabulary,
                                          QueryError* error);
 
-/// Evaluates a query in memory: whether it finds the item. Failed items are never found. False, and an error,
-/// when a regular expression of the query takes too long on the item.
+/// Evaluates a query in memory: whether it finds the item, of which only a database knows whether it is among
+/// those that sound most alike: here it needs to have been heard. Failed items are never found. False, and an
+/// error, when a regular expression of the query takes too long on the item.
 QVCT_API bool matches(const Query& query, const IndexedItem& item, Error* error = nullptr);
 
 /// Whether `a` comes before `b` in the query's order; items without the field last. Neither of two equal

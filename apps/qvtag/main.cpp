@@ -33,6 +33,7 @@ void addSharedOptions(Command tool, ToolContext& context) {
 void addCommands(Command tool, ToolContext& context) {
     addAutotagCommand(tool, context);
     addDatabaseCommand(tool, context);
+    addDuplicatesCommand(tool, context);
     addEvaluateCommand(tool, context);
     addExplainCommand(tool, context);
     addGenerateCommand(tool);

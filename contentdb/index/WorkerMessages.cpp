@@ -11,7 +11,7 @@ namespace {
 
 constexpr std::size_t kLengthBytes = 4;
 /// Raised when a change makes workers and those who start them misunderstand each other.
-constexpr unsigned kProtocol = 1;
+constexpr unsigned kProtocol = 2;
 
 }  // namespace
 

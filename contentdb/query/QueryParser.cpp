@@ -92,6 +92,10 @@ class Parser {
         const bool isNegated = text_[at_] == '-' && at_ + 1 < text_.size() && !isAsciiBlank(text_[at_ + 1]) &&
                                text_[at_ + 1] != ',';
         if (isNegated) ++at_;
+        if (acceptLike()) {
+            if (isNegated) fail(start, at_, "likeness cannot be negated");
+            return;
+        }
         if (const auto key = sortKey()) {
             if (isNegated) fail(start, at_, "an order cannot be negated");
             query_.order.push_back(*key);
@@ -109,6 +113,23 @@ class Parser {
         Condition condition = oneOf(std::move(any));
         if (isNegated) condition = {NoneOf{{std::move(condition)}}};
         terms.parts.push_back(std::move(condition));
+    }
+
+    /// "like:kick.wav"; as a sorting it is for the whole query.
+    bool acceptLike() {
+        const std::size_t start = at_;
+        const Piece word = piece(":<>=");
+        if (word.isQuoted || bareName(word.text) != "like" || !isAtOperator()) {
+            at_ = start;
+            return false;
+        }
+        if (!accept(":") || isAtOperator())
+            fail(start, at_ + 1, "\"like\" takes the path of a sound: like:kick.wav");
+        const Piece file = text(start, "");
+        const bool isAnother = at_ + 1 < text_.size() && text_[at_] == ',' && !isAsciiBlank(text_[at_ + 1]);
+        if (query_.like || isAnother) fail(start, at_, "one query can be like one sound only");
+        query_.like = SoundToMeet{file.text};
+        return true;
     }
 
     /// "bpm+" or "name-", standing alone.

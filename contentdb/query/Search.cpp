@@ -1,86 +1,64 @@
 #include "contentdb/query/Search.h"
 
-#include "contentdb/query/QueryPlan.h"
-#include "contentdb/terms/Terms.h"
+#include "contentdb/query/Evaluation.h"
+#include "contentdb/query/NearestSounds.h"
 
 #include <algorithm>
+#include <map>
 #include <optional>
 
 namespace qvct::contentdb {
 namespace {
 
-/// Walks the chunks of the database with the items that match in each.
-class Evaluation {
-  public:
-    Evaluation(ContentStore& store, const Query& query)
-        : store_(store),
-          query_(query),
-          plan_(store, query.condition),
-          everything_(store.term(term(TermKind::everything))) {}
+constexpr std::uint16_t lowerBits(ItemId id) {
+    return static_cast<std::uint16_t>(id & (kChunkSize - 1));
+}
 
-    /// Calls `visit(chunk, bounds)` until it answers false.
-    template <typename Visit>
-    void forEachChunk(Visit visit) {
-        if (!everything_) return;
-        const std::int64_t last = store_.lastId() >> kChunkBits;
-        for (std::int64_t chunk = 0; chunk <= last; ++chunk) {
-            IdSet all;
-            store_.addPosting(*everything_, chunk, all);
-            if (!visit(chunk, plan_.evaluate(chunk, all))) return;
-        }
-    }
+/// The items that meet the conditions and sound most like what the query names, nearest first.
+std::vector<NearSound> alike(ContentStore& store, const Query& query, std::size_t limit) {
+    const auto likeness = decodedLikeness(query.like->likeness);
+    if (!likeness) return {};
+    Evaluation evaluation(store, query);
+    std::vector<IdSet> sure;
+    SoundFilter filter;
+    evaluation.forEachChunk([&](std::int64_t /*chunk*/, const Bounds& bounds) {
+        sure.push_back(bounds.sure);
+        filter.possible.push_back(bounds.possible);
+        return true;
+    });
+    if (sure.empty()) return {};
+    filter.counts = [&](ItemId id) {
+        return sure[static_cast<std::size_t>(id >> kChunkBits)].contains(lowerBits(id)) ||
+               evaluation.isMatch(id);
+    };
+    LikenessCells cells(store.connection());
+    return nearestSounds(cells, likeness->place, limit, filter);
+}
 
-    /// Calls `visit(found)` for every match, in the order of the database, until it answers false.
-    template <typename Visit>
-    void forEachMatch(Visit visit) {
-        forEachChunk([&](std::int64_t chunk, const Bounds& bounds) {
-            bool goesOn = true;
-            bounds.possible.forEach([&](std::uint16_t id) {
-                auto found = read(chunk << kChunkBits | id);
-                const bool isFound = found && (bounds.sure.contains(id) || isMatch(found->item));
-                if (isFound) goesOn = visit(std::move(*found));
-                return goesOn;
-            });
-            return goesOn;
-        });
-    }
-
-    /// The items of the chunk that match, decided one by one where the index cannot tell.
-    IdSet decided(std::int64_t chunk, const Bounds& bounds) {
-        IdSet open = bounds.possible;
-        open -= bounds.sure;
-        IdSet result = bounds.sure;
-        open.forEach([&](std::uint16_t id) {
-            const auto item = store_.item(chunk << kChunkBits | id);
-            if (item && isMatch(*item)) result.insert(id);
-            return true;
-        });
-        return result;
-    }
-
-  private:
-    bool isMatch(const IndexedItem& item) const {
-        Error error;
-        const bool result = matches(query_, item, &error);
-        if (error.isSet()) throw DatabaseFailure(std::move(error));
-        return result;
-    }
-
-    std::optional<Found> read(ItemId id) {
-        auto item = store_.item(id);
-        if (!item) return std::nullopt;
-        return Found{id, std::move(*item)};
-    }
-
-    ContentStore& store_;
-    const Query& query_;
-    QueryPlan plan_;
-    std::optional<TermId> everything_;
-};
+std::vector<Found> searchAlike(ContentStore& store, const Query& query, std::size_t limit) {
+    const bool isOrdered = !query.order.empty();
+    std::vector<Found> result;
+    for (const NearSound& near : alike(store, query, isOrdered ? kMostAlike : std::min(limit, kMostAlike)))
+        if (auto item = store.item(near.id)) result.push_back({near.id, std::move(*item)});
+    std::stable_sort(result.begin(), result.end(),
+                     [&query](const Found& a, const Found& b) { return comesBefore(query, a.item, b.item); });
+    if (result.size() > limit) result.resize(limit);
+    return result;
+}
 
 }  // namespace
 
+void forEachFound(ContentStore& store, const Query& query,
+                  const std::function<void(std::int64_t, const IdSet&)>& visit) {
+    if (!query.like) return Evaluation(store, query).forEachDecided(visit);
+    std::map<std::int64_t, IdSet> found;
+    for (const NearSound& near : alike(store, query, kMostAlike))
+        found[near.id >> kChunkBits].insert(lowerBits(near.id));
+    for (const auto& [chunk, ids] : found) visit(chunk, ids);
+}
+
 std::vector<Found> search(ContentStore& store, const Query& query, std::size_t limit) {
+    if (query.like) return searchAlike(store, query, limit);
     std::vector<Found> result;
     if (limit == 0) return result;
     const auto isBefore = [&query](const Found& a, const Found& b) {
@@ -105,11 +83,8 @@ std::vector<Found> search(ContentStore& store, const Query& query, std::size_t l
 
 std::int64_t countMatches(ContentStore& store, const Query& query) {
     std::int64_t count = 0;
-    Evaluation evaluation(store, query);
-    evaluation.forEachChunk([&](std::int64_t chunk, const Bounds& bounds) {
-        count += evaluation.decided(chunk, bounds).count();
-        return true;
-    });
+    forEachFound(store, query,
+                 [&count](std::int64_t /*chunk*/, const IdSet& found) { count += found.count(); });
     return count;
 }
 
@@ -118,16 +93,13 @@ std::vector<Facet> facets(ContentStore& store, const Query& query) {
     std::vector<Facet> result;
     result.reserve(tags.size());
     for (const ContentStore::Tag& tag : tags) result.push_back({tag.label, tag.category, 0});
-    Evaluation evaluation(store, query);
-    evaluation.forEachChunk([&](std::int64_t chunk, const Bounds& bounds) {
-        const IdSet found = evaluation.decided(chunk, bounds);
-        if (found.empty()) return true;
+    forEachFound(store, query, [&](std::int64_t chunk, const IdSet& found) {
+        if (found.empty()) return;
         for (std::size_t i = 0; i < tags.size(); ++i) {
             IdSet tagged;
             store.addPosting(tags[i].term, chunk, tagged);
             result[i].count += tagged.countCommon(found);
         }
-        return true;
     });
     std::erase_if(result, [](const Facet& facet) { return facet.count == 0; });
     std::stable_sort(result.begin(), result.end(),

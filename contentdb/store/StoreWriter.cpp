@@ -56,6 +56,7 @@ bool isGone(const std::string& path) {
 
 StoreWriter::StoreWriter(Connection& connection)
     : store_(connection),
+      cells_(connection),
       put_(connection, "INSERT OR REPLACE INTO item VALUES (?, ?, ?, ?, ?, ?, ?, ?, ?, ?)"),
       putTerm_(connection, "INSERT INTO term (value) VALUES (?) RETURNING id"),
       putPosting_(connection, "INSERT OR REPLACE INTO posting VALUES (?, ?)"),
@@ -72,6 +73,7 @@ void StoreWriter::begin() {
 
 void StoreWriter::commit() {
     flushPostings();
+    cells_.flush();
     transaction_->commit();
 }
 
@@ -83,8 +85,10 @@ void StoreWriter::put(ItemId id, const IndexedItem& item, const std::vector<std:
     const auto replaced = store_.idOfPath(item.path);
     if (replaced && *replaced != id) remove(*replaced);
     std::vector<std::string> before;
+    std::string likenessBefore;
     if (const auto old = store_.item(id)) {
         before = termsOf(*old);
+        likenessBefore = old->likeness;
         if (old->path != item.path) leave(placeOf(old->path).folder);
     }
     std::vector<std::string> difference;
@@ -95,6 +99,7 @@ void StoreWriter::put(ItemId id, const IndexedItem& item, const std::vector<std:
     std::set_difference(terms.begin(), terms.end(), before.begin(), before.end(),
                         std::back_inserter(difference));
     for (const std::string& term : difference) change(id, term, true);
+    cells_.move(id, likenessBefore, item.likeness);
     noteNames(item);
     const Place place = placeOf(item.path);
     const std::string description = encodedDescription(item);
@@ -109,6 +114,7 @@ void StoreWriter::remove(ItemId id) {
     if (!old) return;
     leave(placeOf(old->path).folder);
     for (const std::string& term : termsOf(*old)) change(id, term, false);
+    cells_.move(id, old->likeness, {});
     for (const char* sql : {"DELETE FROM item WHERE id = ?", "DELETE FROM earlier_path WHERE item = ?"})
         Statement(store_.connection(), sql).bind(1, id).execute();
 }

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "contentdb/store/ContentStore.h"
+#include "contentdb/store/LikenessCells.h"
 
 #include <cstdint>
 #include <optional>
@@ -58,6 +59,7 @@ class StoreWriter {
     void flushPostings();
 
     ContentStore store_;
+    LikenessCells cells_;
     std::optional<Transaction> transaction_;
     std::vector<Change> changes_;
     std::unordered_map<std::string, TermId> termIds_;

@@ -177,6 +177,11 @@ TEST_F(Describing, GivesValuesThatAreKnown) {
         EXPECT_EQ(values.erase("LengthInSeconds"), name == "empty.wav" ? 0U : 1U) << name;
         values.erase("TavioLoopType");
         values.erase("KeyType");
+        for (const auto& [key, value] :
+             {std::pair(kSampleRateKey, 44100.0), {kBitDepthKey, 16}, {kChannelCountKey, 2}}) {
+            EXPECT_EQ(values[std::string(key)], value) << name;
+            values.erase(std::string(key));
+        }
         EXPECT_EQ(values, expected) << name;
     }
 }

@@ -812,7 +812,8 @@ TEST_F(Indexing, ReadsAgainWhatAnotherDescriberDescribed) {
     // A database of the first form, which did not keep who described.
     Connection(database(), Connection::Mode::readWrite)
         .run(
-            "DROP TABLE setting; ALTER TABLE folder DROP COLUMN part; ALTER TABLE folder DROP COLUMN parts;"
+            "DROP TABLE likeness; DROP TABLE setting; ALTER TABLE folder DROP COLUMN part; ALTER TABLE "
+            "folder DROP COLUMN parts;"
             "PRAGMA user_version = 1");
     const auto second = [](IndexOptions& options) { options.describer = 2; };
     bool hasFailed = false;

@@ -39,6 +39,12 @@ TEST(QueryParser, PointsAtWhatIsWrong) {
         {"kick \"deep", 5, 5, "not closed"},
         {"-bpm+", 0, 5, "cannot be negated"},
         {"kick colour-", 5, 7, "there is no field \"colour\""},
+        {"kick like:", 5, 5, "a value is missing"},
+        {"like>3", 0, 5, "takes the path of a sound"},
+        {"like::a.wav", 0, 6, "takes the path of a sound"},
+        {"-like:a.wav", 0, 11, "cannot be negated"},
+        {"like:a.wav,b.wav", 0, 10, "one sound only"},
+        {"like:a.wav like:b.wav", 11, 10, "one sound only"},
         {"\xff", 0, 1, "not UTF-8"},
     };
     for (const Case& one : cases) {

@@ -16,6 +16,7 @@ void addEvaluateCommand(Command& tool, ToolContext& context);
 void addInspectCommand(Command& tool, ToolContext& context);
 /// `db`: merges and checks databases.
 void addDatabaseCommand(Command& tool, ToolContext& context);
+void addDuplicatesCommand(Command& tool, ToolContext& context);
 void addIndexCommand(Command& tool, ToolContext& context);
 void addKeywordsCommand(Command& tool, ToolContext& context);
 void addLintCommand(Command& tool, ToolContext& context);

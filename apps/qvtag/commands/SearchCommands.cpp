@@ -31,6 +31,7 @@ struct Options {
     std::string database;
     std::size_t limit = 50;
     std::string path;
+    std::string by = "tags";
 };
 
 std::string_view nameOf(Provenance provenance) {
@@ -201,7 +202,9 @@ void findSimilar(const Options& options, ToolContext& context) {
     const auto database = openDatabase(options.database, context);
     if (!database) return;
     Error error;
-    const auto found = database->similar(URL::fileURLWithPath(options.path).path(), options.limit, &error);
+    const std::string path = URL::fileURLWithPath(options.path).path();
+    const auto found = options.by == "sound" ? database->soundingLike(path, options.limit, &error)
+                                             : database->similar(path, options.limit, &error);
     if (!found) return context.itemFailed(error);
     if (context.format != Format::table) {
         Json json = Json::array();
@@ -241,7 +244,8 @@ void addSearchCommands(Command& tool, ToolContext& context) {
     searching.addOption("query", options->words, "What to find; a query that begins with - goes behind --");
     addLimit(searching);
     searching.footer(
-        "Example:\n  qvtag search 'kick genre:House bpm:118..124 -type:loop bpm+' --db loops.db");
+        "Example:\n  qvtag search 'kick genre:House bpm:118..124 -type:loop bpm+' --db loops.db\n"
+        "  qvtag search 'tempo:120..126 like:untitled.wav' --db loops.db");
 
     Command counting =
         addCommand(tool, "facets", "Counts the tags of what a query finds", options, context, countTags);
@@ -250,11 +254,16 @@ void addSearchCommands(Command& tool, ToolContext& context) {
 
     Command nearing =
         addCommand(tool, "similar", "Finds the items nearest to one", options, context, findSimilar);
-    nearing.addOption("path", options->path, "The item, which must be in the database")
+    nearing.addOption("path", options->path, "An item of the database; by sound any file")
         .required()
         .valueName("PATH");
+    nearing.addOption("--by", options->by, "What counts: tags (with rhythm, tempo and key) or how they sound")
+        .oneOf({"tags", "sound"})
+        .showsDefault();
     addLimit(nearing);
-    nearing.footer("Example:\n  qvtag similar 'Loops/Dusty Kick.wav' --db loops.db --limit 10");
+    nearing.footer(
+        "Example:\n  qvtag similar 'Loops/Dusty Kick.wav' --db loops.db --limit 10\n"
+        "  qvtag similar --by sound ~/untitled.wav --db loops.db");
 }
 
 }  // namespace qvct::tool

@@ -174,10 +174,15 @@ std::string encodedDescription(const IndexedItem& item) {
         out.text(dependency.path);
     }
     out.text(item.failure);
-    if (!item.title.empty() || !item.explanation.empty()) out.text(item.title);
-    if (item.explanation.empty()) return out.take();
+    const bool isHeard = !item.likeness.empty() || !item.fingerprint.empty();
+    const bool isExplained = !item.explanation.empty() || isHeard;
+    if (!item.title.empty() || isExplained) out.text(item.title);
+    if (!isExplained) return out.take();
     out.number(kExplanationFollows);
     out.text(item.explanation);
+    if (!isHeard) return out.take();
+    out.text(item.likeness);
+    out.text(item.fingerprint);
     return out.take();
 }
 
@@ -202,6 +207,10 @@ bool decodeDescription(std::string_view bytes, IndexedItem& item) {
         const std::uint64_t first = in.number();
         item.explanation = first == kExplanationFollows ? std::string(in.text())
                                                         : explanationOfEarlierEdition(in, first, item);
+    }
+    if (!in.isAtEnd()) {
+        item.likeness = in.text();
+        item.fingerprint = in.text();
     }
     return in.isIntact() && in.isAtEnd();
 }

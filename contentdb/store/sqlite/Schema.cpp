@@ -53,7 +53,9 @@ constexpr std::array kMigrations = {
     // dropped.
     R"(ALTER TABLE folder ADD COLUMN part INTEGER NOT NULL DEFAULT 1;
        ALTER TABLE folder ADD COLUMN parts INTEGER NOT NULL DEFAULT 1;
-       UPDATE folder SET digest = 0;)"};
+       UPDATE folder SET digest = 0;)",
+    // For each cell of the space of sounds and chunk of items, those that lie in the cell, and where.
+    "CREATE TABLE likeness (key INTEGER PRIMARY KEY, entries BLOB NOT NULL);"};
 
 [[noreturn]] void refuse(const std::string& path, ErrorCode code, std::string reason) {
     throw DatabaseFailure(code, std::move(reason), path);

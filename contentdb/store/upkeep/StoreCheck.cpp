@@ -1,6 +1,8 @@
 #include "contentdb/store/upkeep/StoreCheck.h"
 
+#include "contentdb/store/Digest.h"
 #include "contentdb/store/FolderDigest.h"
+#include "contentdb/store/LikenessCells.h"
 #include "contentdb/store/Part.h"
 #include "contentdb/store/codec/StampColumns.h"
 #include "contentdb/terms/Terms.h"
@@ -19,14 +21,25 @@ namespace {
 class Tally {
   public:
     void add(std::int64_t key, std::uint16_t id) {
-        std::uint64_t state = static_cast<std::uint64_t>(key) * 0x9e3779b97f4a7c15U + id;
-        state = (state ^ state >> 31U) * 0xbf58476d1ce4e5b9U;
-        sum_ += state ^ state >> 29U;
-        ++count_;
+        add(static_cast<std::uint64_t>(key) * 0x9e3779b97f4a7c15U + id);
+    }
+    /// Of an item that lies in a cell.
+    void add(std::uint16_t cell, ItemId id, const SoundLikeness& place) {
+        Digest digest;
+        digest.add(cell);
+        digest.add(static_cast<std::uint64_t>(id));
+        digest.add(bytesOf(place));
+        add(digest.value());
     }
     bool operator==(const Tally&) const = default;
 
   private:
+    void add(std::uint64_t state) {
+        state = (state ^ state >> 31U) * 0xbf58476d1ce4e5b9U;
+        sum_ += state ^ state >> 29U;
+        ++count_;
+    }
+
     std::uint64_t sum_ = 0;
     std::uint64_t count_ = 0;
 };
@@ -54,6 +67,19 @@ std::optional<std::string> misjudgedFolder(Connection& connection) {
     return std::nullopt;
 }
 
+bool isSoundWhole(const IndexedItem& item) {
+    const bool isPlaceWhole = item.likeness.empty() || decodedLikeness(item.likeness);
+    return isPlaceWhole && decodedFingerprint(item.fingerprint);
+}
+
+Tally inCells(Connection& connection) {
+    Tally tally;
+    LikenessCells(connection).forEach([&tally](std::uint16_t cell, const CellEntries& entries) {
+        for (std::size_t i = 0; i < entries.size(); ++i) tally.add(cell, entries.id(i), entries.place(i));
+    });
+    return tally;
+}
+
 }  // namespace
 
 void checkStore(ContentStore& store) {
@@ -67,6 +93,7 @@ void checkStore(ContentStore& store) {
     if (verdict != "ok")
         damaged(fmt::format("its pages do not fit together ({})", verdict.substr(verdict.rfind('\n') + 1)));
     Tally said;
+    Tally heard;
     for (ItemId id = 1, last = store.lastId(); id <= last; ++id) {
         const auto its = store.item(id);
         if (!its) continue;
@@ -75,6 +102,9 @@ void checkStore(ContentStore& store) {
             if (!known) damaged(fmt::format("a term of {} is missing", printable(its->path)));
             said.add(postingKey(*known, id >> kChunkBits), static_cast<std::uint16_t>(id & (kChunkSize - 1)));
         }
+        if (!isSoundWhole(*its)) damaged(fmt::format("what was heard in {}", printable(its->path)));
+        if (const auto likeness = decodedLikeness(its->likeness))
+            heard.add(likeness->cell, id, likeness->place);
     }
     Tally indexed;
     Statement postings(connection, "SELECT key, ids FROM posting");
@@ -87,6 +117,7 @@ void checkStore(ContentStore& store) {
         });
     }
     if (!(said == indexed)) damaged("the index does not say what the items say");
+    if (!(heard == inCells(connection))) damaged("the cells of sounds do not hold what was heard");
     if (const auto folder = misjudgedFolder(connection))
         damaged(fmt::format("{} does not hold the items that it is known by", printable(*folder)));
 }
