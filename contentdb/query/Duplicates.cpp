@@ -78,7 +78,10 @@ class CopySearch {
     struct Landmark {
         std::uint32_t hash;
         Ordinal item;
-        auto operator<=>(const Landmark&) const = default;
+        bool operator==(const Landmark&) const = default;
+        bool operator<(const Landmark& other) const {
+            return std::tie(hash, item) < std::tie(other.hash, other.item);
+        }
     };
 
     static std::vector<std::uint32_t> found(ContentStore& store, const Query& query) {
@@ -135,7 +138,8 @@ class CopySearch {
 
     static std::size_t shareOf(std::uint32_t hash, std::size_t shares) {
         constexpr std::uint32_t kGolden = 0x9e3779b1;
-        return static_cast<std::size_t>(std::uint64_t{hash * kGolden} * shares >> 32U);
+        const std::uint32_t mixed = hash * kGolden;
+        return static_cast<std::size_t>(std::uint64_t{mixed} * shares >> 32U);
     }
 
     /// Where many share a landmark, those that lie near each other.

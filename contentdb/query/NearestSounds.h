@@ -10,6 +10,7 @@
 #include <functional>
 #include <optional>
 #include <string_view>
+#include <tuple>
 #include <vector>
 
 namespace qvct::contentdb {
@@ -19,7 +20,9 @@ struct NearSound {
     int squaredDistance = 0;
     ItemId id = 0;
 
-    auto operator<=>(const NearSound&) const = default;
+    bool operator<(const NearSound& other) const {
+        return std::tie(squaredDistance, id) < std::tie(other.squaredDistance, other.id);
+    }
 };
 
 /// How alike two sounds are, from the square of their distance: 1 for the same place, 1/2 at a distance at

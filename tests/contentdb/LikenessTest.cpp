@@ -220,6 +220,57 @@ TEST(Likeness, OfADamagedDatabaseIsToldAndNotBelieved) {
     }
 }
 
+TEST(Likeness, OfEquallyNearSoundsNamesTheOlderFirst) {
+    const TemporaryFolder folder;
+    std::vector<IndexedItem> items = generatedItems(7, 2 * SoundLikeness::kSize + 1);
+    for (std::size_t i = 0; i + 1 < items.size(); ++i) {
+        SoundLikeness place;
+        place.coordinates[i / 2] = i % 2 == 0 ? 90 : -90;
+        items[i].likeness = encodedLikeness(place);
+    }
+    items.back().likeness = encodedLikeness(SoundLikeness());
+    store(folder.path("db"), items);
+    const auto found = soundingLike(*ContentDatabase::open(folder.path("db")), items.back().path, 5);
+    EXPECT_THAT(found,
+                ElementsAre(items[0].path, items[1].path, items[2].path, items[3].path, items[4].path));
+}
+
+TEST(Likeness, TellsCopiesFromSoundsWithALandmarkInCommon) {
+    std::vector<IndexedItem> items = generatedItems(8, 40);
+    std::mt19937 random(1);
+    const auto fingerprint = [&random](std::vector<SoundFingerprint::Landmark> landmarks) {
+        for (std::uint16_t i = static_cast<std::uint16_t>(landmarks.size()); i < 24; ++i)
+            landmarks.push_back({static_cast<std::uint32_t>(random()), static_cast<std::uint16_t>(40 * i)});
+        return SoundFingerprint{landmarks};
+    };
+    const SoundFingerprint one = fingerprint({});
+    for (IndexedItem& item : items) {
+        item.fingerprint = encodedFingerprint(fingerprint({one.landmarks[0]}));
+        item.values.clear();  // so that none is longer
+    }
+    SoundFingerprint copy = one;
+    copy.landmarks.resize(15);
+    for (auto& landmark : copy.landmarks) landmark.frame = static_cast<std::uint16_t>(landmark.frame + 7);
+    items[5].fingerprint = encodedFingerprint(one);
+    items[30].fingerprint = encodedFingerprint(copy);
+    items[12].fingerprint = items[9].fingerprint = "";  // as of patches
+    items[12].payloadHash = items[9].payloadHash;
+    const TemporaryFolder folder;
+    store(folder.path("db"), items);
+    std::vector<std::string> groups;
+    const auto note = [&groups](const DuplicateGroup& group) {
+        std::string text;
+        for (const SoundCopy& each : group.copies)
+            text += fmt::format("{}{} ", each.id, each.isExact ? " exact" : "");
+        groups.push_back(text);
+        return true;
+    };
+    Error error;
+    EXPECT_TRUE(ContentDatabase::open(folder.path("db"))->forEachDuplicate(Query{}, note, &error))
+        << error.message();
+    EXPECT_THAT(groups, ElementsAre("6 exact 31 ", "10 exact 13 exact "));
+}
+
 TEST(Likeness, InQueriesIsOfWhatMeetsTheRest) {
     const TemporaryFolder folder;
     const std::vector<IndexedItem> items = heardItems(5, 2000);
