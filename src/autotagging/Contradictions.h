@@ -13,7 +13,8 @@ struct ItemReport;
 class TGRTTaxonomy;
 
 /// Two things that are said of an item and cannot both be so.
-struct QVCT_API Contradiction {
+struct Contradiction {
+    /// What one source says.
     struct Statement {
         std::string value;        ///< "124 bpm", "A minor", "Kick".
         std::string_view source;  ///< "record", "file", "name" or "sound".
