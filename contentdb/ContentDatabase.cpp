@@ -50,7 +50,7 @@ struct ContentDatabase::Implementation {
     /// What is stored of the item at the path, or else heard in the file; nothing and an error when that is
     /// nothing.
     std::optional<std::string> likenessOf(const std::string& path, Error* error) {
-        const auto stored = read(error, [&] {
+        auto stored = read(error, [&] {
             const auto id = store.idOfPath(path);
             const auto item = id ? store.item(*id) : std::nullopt;
             return item ? item->likeness : std::string();

@@ -163,8 +163,8 @@ std::vector<BeatGrid> BeatGrid::candidates(std::span<const Onset> onsets, std::i
     const double seconds = static_cast<double>(frames) / sampleRate;
     if (strokes.empty() || !(seconds > 0)) return grids;
     const OnsetSpectrum spectrum(strokes, seconds);
-    const auto add = [&](double bpm, double beats) -> BeatGrid& {
-        grids.push_back({bpm, beats, {}});
+    const auto add = [&](double tempo, double length) -> BeatGrid& {
+        grids.push_back({tempo, length, {}});
         measureRegularity(grids.back(), spectrum);
         measureTempo(grids.back());
         return grids.back();
