@@ -9,7 +9,12 @@ endif()
 # the same objects.
 set(shipped "$<CONFIG:Release,RelWithDebInfo,MinSizeRel>")
 target_compile_options(qvct_build_flags INTERFACE "$<${shipped}:-ffunction-sections;-fdata-sections>")
-target_link_options(qvct_build_flags INTERFACE "$<${shipped}:-Wl,--gc-sections>")
+target_link_options(qvct_build_flags INTERFACE "$<${shipped}:-Wl,--gc-sections,-z,pack-relative-relocs>")
+# For code that runs once an item, or once a command, and inlines much: speed is decided elsewhere.
+function(qvct_compile_for_size target)
+  set_source_files_properties(${ARGN} TARGET_DIRECTORY ${target}
+    PROPERTIES COMPILE_OPTIONS "$<$<CONFIG:Release,RelWithDebInfo>:-Os>")
+endfunction()
 if(QVCT_SANITIZERS)
   set(sanitize "-fsanitize=${QVCT_SANITIZERS}")
   target_compile_options(qvct_build_flags INTERFACE
