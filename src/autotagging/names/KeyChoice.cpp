@@ -60,11 +60,22 @@ class KeyChoice {
         if (key.key.isSpelledOut) return isCapital || isOfMusic || isSyllable || isSetApart;
         const bool isFolder = its_.isFolder && key.piece == 0 && isLast;
         if (key.key.mode != NamedKey::Mode::unsaid)
-            return isOfMusic || (isCapital && (isSetApart || key.isBehindPitched || isFolder));
+            return isOfMusic ||
+                   (isCapital && (isSetApart || key.isBehindPitched || isFolder || isBetweenMarks(key)));
         const bool hasSign = key.key.pieces > 1 && !its_.pieces[key.piece + 1].isWord();
         if (key.key.hasAccidental)
             return isOfMusic || (isCapital && (isSetApart || hasSign || key.isBehindPitched));
-        return (isCapital || isBesideTempo(key)) && key.piece > 0 && canLetterStand(key);
+        if (key.piece == 0) return isCapital && its_.hasPitched && isBesideTempo(key);
+        if (first.isInBrackets && isLast && its_.hasPitched && its_.tempo) return isCapital;
+        return (isCapital || isBesideTempo(key)) && canLetterStand(key);
+    }
+
+    /// "Vox_Dm_02"
+    bool isBetweenMarks(const ScannedKey& key) const {
+        const std::size_t behind = key.piece + key.key.pieces;
+        if (key.piece == 0 || behind >= its_.pieces.size()) return false;
+        const auto isMark = [this](std::uint32_t at) { return its_.name[at] == '_' || its_.name[at] == '-'; };
+        return isMark(its_.pieces[key.piece].offset - 1) && isMark(its_.pieces[behind - 1].end());
     }
 
     /// "G-House", and the article in "Like A Synth".

@@ -224,8 +224,10 @@ std::optional<double> NameScan::tempo(SoundKind kind) const {
     }
     if (said) return said;
     const auto isSure = [this](const ScannedKey& key) {
-        const std::size_t end = key.piece + key.key.pieces;
-        return key.key.mode != NamedKey::Mode::unsaid || pieces_[end - 1].kind == NamePiece::Kind::sharp;
+        const NamePiece& last = pieces_[key.piece + key.key.pieces - 1];
+        const bool hasSignWord = key.key.hasAccidental && key.key.pieces > 1 && last.isWord();
+        return key.key.mode != NamedKey::Mode::unsaid || key.key.isSpelledOut || key.isAnnounced ||
+               last.kind == NamePiece::Kind::sharp || hasSignWord;
     };
     const bool hasSureKey = std::any_of(keys_.begin(), keys_.end(), isSure);
     // "Jungle/160/think loop.wav"

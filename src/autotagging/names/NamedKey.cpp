@@ -58,18 +58,29 @@ class KeyParser {
         rest.remove_prefix(1);
         if (consume(rest, "sharp")) shift(1);
         if (!key_.hasAccidental && (consume(rest, "flat") || consume(rest, "b"))) shift(-1);
+        // "Csm", where a name must do without "#".
+        if (rest.size() > 1 && rest.front() == 's' && isMode(rest.substr(1))) {
+            consume(rest, "s");
+            shift(1);
+        }
         if (!rest.empty() && !takeMode(rest)) return std::nullopt;
         if (key_.mode == NamedKey::Mode::unsaid && !key_.isSpelledOut) takeFollowing();
         return key_;
     }
 
   private:
-    /// "Re menor", "sol# mayor": without its mode the word means too much else.
+    /// "Re menor", "sol# mayor", "Fa#": without its mode or a sign the word means too much else.
     std::optional<NamedKey> parseSolfege(int note) {
         key_.tonic = note;
         key_.pieces = 1;
         takeFollowing();
-        return key_.isSpelledOut ? std::optional(key_) : std::nullopt;
+        const bool isKey = key_.isSpelledOut || (key_.hasAccidental && !key_.hasOctave);
+        return isKey ? std::optional(key_) : std::nullopt;
+    }
+
+    bool isMode(std::string_view word) const {
+        const NameRole role = habits_.roleOf(word);
+        return word == "m" || role == NameRole::minor || role == NameRole::major;
     }
 
     void shift(int semitones) {
@@ -78,7 +89,7 @@ class KeyParser {
     }
 
     bool takeMode(std::string_view word) {
-        if (word == "m") {
+        if (word == "m" || word == "mi") {
             key_.mode = NamedKey::Mode::minor;
             return true;
         }
