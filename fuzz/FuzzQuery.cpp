@@ -17,6 +17,7 @@ IndexedItem item() {
     result.path = "/Music/Deep House/Dusty.wav";
     result.taggings = {{"Deep House", "Genres", {"House"}, 0.6F, Provenance::stored, {}}};
     result.values = {{"Tempo", 120.0}};
+    result.likeness = "heard";  // no query of a sound passes it over
     return result;
 }
 

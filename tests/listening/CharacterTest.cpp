@@ -167,6 +167,15 @@ TEST(CharacterTest, NothingToSay) {
     }
 }
 
+// After its attack nothing moves any more: there is no frequency whose logarithm could be taken.
+TEST(CharacterTest, OfASoundThatStandsStillIsFinite) {
+    const Samples still = {1, 1, 1, 1, 1, 1, -1};
+    CharacterMeter meter;
+    const auto character = meter.measure(still, still, still, 2000);
+    ASSERT_TRUE(character.has_value());
+    for (const auto& value : character->values) EXPECT_TRUE(std::isfinite(value.measure));
+}
+
 TEST(CharacterScaleTest, LevelsFollowTheMeasures) {
     for (std::size_t i = 0; i < kCharacterScales; ++i) {
         const CharacterScale scale = characterScale(i);

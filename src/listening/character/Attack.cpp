@@ -16,6 +16,7 @@ constexpr double kReleaseSeconds = 0.03;  // longer than a period of what can be
 constexpr double kBurstSeconds = 0.02;
 constexpr double kSteepest = 0.5;  // of a block, by which the envelope rises by its half
 constexpr float kSilence = 1e-6F;
+constexpr double kLowestHertz = 20;  // that can be heard; a short sound may have none at all
 
 // One block of samples, filtered.
 struct Block {
@@ -121,7 +122,7 @@ std::optional<Attack> steepestAttack(std::span<const float> samples, float mean,
     // The difference of a sine from one sample to the next is 2 sin(w / 2) times as large as the sine.
     const double angle = 2 * std::asin(std::min(1.0, std::sqrt(differences / energy) / 2));
     return Attack{std::max(kSteepest, onset.blocks) * blockSeconds * 1000,
-                  angle * sampleRate / (2 * std::numbers::pi)};
+                  std::max(kLowestHertz, angle * sampleRate / (2 * std::numbers::pi))};
 }
 
 }  // namespace qvct
