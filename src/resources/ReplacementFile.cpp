@@ -5,6 +5,7 @@
 #include "platform/files/FileStamp.h"
 #include "platform/files/ResourceBundle.h"
 #include "platform/text/Text.h"
+#include "resources/BuiltInFile.h"
 #include "resources/LegacyMappingTable.h"
 #include "resources/ResourceDictionary.h"
 
@@ -39,7 +40,16 @@ bool isUsable(const ResourceFile& resource, const std::string& path, Error* erro
     return text && (!resource.name.ends_with("TaxonomyMapping") || isMappingTable(*text, path, error));
 }
 
-/// Whether a file was found usable, and the state that it was in then.
+/// An installation has copies of the built-in files beside it, which need not be read as something else.
+bool isBuiltIn(const ResourceFile& resource, const std::string& path, FileStamp stamp) {
+    const auto builtIn = builtInFile(resource.name, resource.extension);
+    if (stamp.size != builtIn.size()) return false;
+    const auto bytes = readFile(path);
+    return bytes && std::equal(bytes->begin(), bytes->end(), builtIn.begin(), builtIn.end());
+}
+
+/// Whether a file is to be used, and the state that it was in then; without an error for one that says what
+/// is built in.
 struct Verdict {
     FileStamp stamp;
     bool isUsable = false;
@@ -48,6 +58,7 @@ struct Verdict {
 
 Verdict judge(const ResourceFile& resource, const std::string& path, FileStamp stamp) {
     Verdict verdict{stamp, false, {}};
+    if (isBuiltIn(resource, path, stamp)) return verdict;
     verdict.isUsable = isUsable(resource, path, &verdict.error);
     if (!verdict.isUsable) verdict.error.reason += " (using the built-in one)";
     return verdict;
@@ -87,7 +98,7 @@ std::optional<std::string> replacementFile(const ResourceFile& resource, Error* 
     auto verdict = verdicts.of(*path, stamp);
     if (!verdict) {
         verdict = judge(resource, *path, stamp);
-        if (verdicts.set(*path, *verdict) && !verdict->isUsable) log(verdict->error.message());
+        if (verdicts.set(*path, *verdict) && verdict->error.isSet()) log(verdict->error.message());
     }
     if (verdict->isUsable) return path;
     if (error != nullptr) *error = verdict->error;

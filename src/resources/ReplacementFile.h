@@ -19,8 +19,9 @@ struct ResourceFile {
 };
 
 /// The path of the file that replaces a resource: the one that `ResourceBundle` finds, provided that it is
-/// valid for that resource. Nothing when there is none or it is broken; use the built-in resource then. A
-/// broken file is logged once for each of its states, and reported to `error` each time.
+/// valid for that resource. Nothing when there is none, when it holds the same bytes as the built-in one, or
+/// when it is broken; use the built-in resource then. A broken file is logged once for each of its states,
+/// and reported to `error` each time.
 /// @cost  One look at the file; its bytes are read when it is new or has changed. Safe from every thread.
 QVCT_API std::optional<std::string> replacementFile(const ResourceFile& resource, Error* error = nullptr);
 

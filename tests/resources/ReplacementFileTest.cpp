@@ -1,8 +1,12 @@
+#include "autotagging/ResourceFiles.h"
 #include "autotagging/keywords/QVCTKeywordExtractor.h"
 #include "autotagging/services/QVCTXMLRulesTaggingService.h"
 #include "platform/data/PropertyListFile.h"
 #include "platform/files/ResourceBundle.h"
+#include "resources/BuiltInFile.h"
+#include "resources/EmbeddedFiles.h"
 #include "resources/PackDisplayNames.h"
+#include "resources/ReplacementFile.h"
 #include "support/CapturedLog.h"
 #include "support/TemporaryFolder.h"
 #include "taxonomy/TGRTTaxonomy.h"
@@ -37,6 +41,23 @@ class Resources {
 
 std::string listOf(Dictionary dictionary) {
     return serializePropertyList(std::move(dictionary), PropertyListFormat::xml);
+}
+
+/// As beside an installed library; one byte more makes it another file.
+TEST(ReplacementFile, IsNoneWhereItIsAsBuiltIn) {
+    const Resources resources;
+    const std::string bytes(reinterpret_cast<const char*>(DefaultRules_plist), DefaultRules_plist_len);
+    Error error;
+    resources.write("DefaultRules.plist", bytes);
+    EXPECT_FALSE(replacementFile({"DefaultRules", "plist"}, &error));
+    EXPECT_FALSE(error.isSet()) << error.message();
+    for (const ResourceFile& file : resourceFiles())
+        EXPECT_FALSE(builtInFile(file.name, file.extension).empty()) << file.name;
+    resources.write("DefaultRules.plist", bytes + "\n");
+    EXPECT_TRUE(replacementFile({"DefaultRules", "plist"}, &error)) << error.message();
+    resources.write("DefaultRules.plist", std::string(bytes.size(), ' '));
+    EXPECT_FALSE(replacementFile({"DefaultRules", "plist"}, &error));
+    EXPECT_TRUE(error.isSet());
 }
 
 TEST(ReplacementFile, IsUsedWhenItIsWholeElseToldOfOnceAndReplacedByTheBuiltInOne) {
