@@ -6,6 +6,8 @@
 #include "support/ItemGenerator.h"
 #include "support/TemporaryFolder.h"
 
+#include <algorithm>
+#include <functional>
 #include <string>
 #include <utility>
 #include <vector>
@@ -23,6 +25,16 @@ inline void store(const std::string& path, const std::vector<contentdb::IndexedI
             writer.put(static_cast<contentdb::ItemId>(i + 1), items[i], contentdb::termsOf(items[i]));
         writer.commit();
     }
+}
+
+/// Changes a database in one batch, which is given up again unless it `isWhole`.
+inline void change(const std::string& path, const std::function<void(contentdb::StoreWriter&)>& work,
+                   bool isWhole = true) {
+    const auto connection = contentdb::openDatabase(path, contentdb::Access::write);
+    contentdb::StoreWriter writer(*connection);
+    writer.begin();
+    work(writer);
+    if (isWhole) writer.commit();
 }
 
 inline std::vector<contentdb::IndexedItem> generatedItems(std::uint64_t seed, std::size_t count) {

@@ -96,14 +96,6 @@ void expectRight(const std::string& path, const std::vector<IndexedItem>& items)
     EXPECT_TRUE(database->check(&error)) << error.message();
 }
 
-void change(const std::string& path, const std::function<void(StoreWriter&)>& work, bool isWhole = true) {
-    const auto connection = openDatabase(path, Access::write);
-    StoreWriter writer(*connection);
-    writer.begin();
-    work(writer);
-    if (isWhole) writer.commit();
-}
-
 TEST(Likeness, FindsWhatComparingAllFindsAlsoAfterChanges) {
     const TemporaryFolder folder;
     const std::string path = folder.path("db");

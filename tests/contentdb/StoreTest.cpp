@@ -44,14 +44,6 @@ TEST(Store, KeepsEveryByteOfAnItem) {
     EXPECT_THAT(database->vocabulary()->numbers, testing::Contains("Gain"));
 }
 
-void change(const std::string& path, const std::function<void(StoreWriter&)>& work, bool isWhole = true) {
-    const auto connection = openDatabase(path, Access::write);
-    StoreWriter writer(*connection);
-    writer.begin();
-    work(writer);
-    if (isWhole) writer.commit();
-}
-
 TEST(Store, FindsAnItemByItsNewFactsOnlyAndInOnePlace) {
     const TemporaryFolder folder;
     const std::string path = folder.path("db");
