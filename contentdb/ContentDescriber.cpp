@@ -269,7 +269,7 @@ ContentDescriber::~ContentDescriber() = default;
 
 std::uint64_t ContentDescriber::digest(std::uint64_t services) {
     // Raised when a change makes items be described differently although the version stays the same.
-    constexpr std::uint64_t edition = 8;
+    constexpr std::uint64_t edition = 9;
     Digest digest;
     digest.add(services);
     digest.add(version());

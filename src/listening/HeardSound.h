@@ -60,7 +60,7 @@ struct HeardSound {
     std::optional<Note> note;
     std::optional<Key> key;
     std::vector<Tempo> tempos;              ///< Of a loop, the likeliest first.
-    std::optional<SoundLikeness> likeness;  ///< Where a single sound lies among all sounds.
+    std::optional<SoundLikeness> likeness;  ///< Where it lies among all sounds.
     SoundFingerprint fingerprint;           ///< What copies of it have in common.
 };
 

@@ -8,6 +8,7 @@
 #include "listening/instrument/SoundFeatures.h"
 #include "listening/likeness/Fingerprinter.h"
 #include "listening/likeness/LikenessModel.h"
+#include "listening/likeness/LoopLikeness.h"
 #include "listening/onsets/OnsetDetector.h"
 #include "listening/pitch/LoopKey.h"
 #include "listening/pitch/NotePitch.h"
@@ -54,7 +55,10 @@ struct Listener::Analysers {
     void begin(double sampleRate, int channels, std::int64_t frames) {
         rate = sampleRate;
         hasOneChannel = channels == 1;
-        excerpt.emplace(sampleRate, channels, kMostSeconds);
+        if (excerpt)
+            excerpt->restart(sampleRate, channels);
+        else
+            excerpt.emplace(sampleRate, channels, kMostSeconds);
         detector.reset();
         if (static_cast<double>(frames) >= kShortestLoop * sampleRate) detector.emplace(sampleRate, channels);
     }
@@ -63,10 +67,12 @@ struct Listener::Analysers {
         return excerpt->process(frames);
     }
 
+    std::vector<Onset> onsetsOfExcerpt() const;
     void addCharacter(HeardSound& sound);
     void addKind(HeardSound& sound) const;
     void prepareFor(double excerptRate);
     void addInstrument(HeardSound& sound);
+    void addLoopLikeness(HeardSound& sound);
     void addNote(HeardSound& sound);
     void addKey(HeardSound& sound);
     void addTempo(HeardSound& sound);
@@ -86,16 +92,21 @@ void Listener::Analysers::addCharacter(HeardSound& sound) {
     }
 }
 
+std::vector<Onset> Listener::Analysers::onsetsOfExcerpt() const {
+    std::vector<Onset> its = onsets;
+    for (Onset& onset : its) {
+        const double frames = static_cast<double>(onset.frame - excerpt->begin()) * excerpt->sampleRate();
+        onset.frame = std::max<std::int64_t>(0, static_cast<std::int64_t>(frames / rate));
+    }
+    return its;
+}
+
 void Listener::Analysers::addKind(HeardSound& sound) const {
     if (sound.seconds < kShortestLoop) {
         sound.loopConfidence = 0;
         return;
     }
-    std::vector<std::int64_t> positions;
-    for (const std::int64_t onset : sound.onsets) {
-        const double frames = static_cast<double>(onset - excerpt->begin()) * excerpt->sampleRate() / rate;
-        positions.push_back(std::max<std::int64_t>(0, static_cast<std::int64_t>(frames)));
-    }
+    const auto positions = framesOf(onsetsOfExcerpt());
     sound.loopConfidence = LoopMeasures::of(excerpt->mono(), excerpt->sampleRate(), positions).likelihood();
 }
 
@@ -107,7 +118,7 @@ void Listener::Analysers::prepareFor(double excerptRate) {
     if (excerptRate >= SoundFeatures::kLowestRate) features.emplace(excerptRate);
 }
 
-/// What plays, and what it is like; to listen for that costs too much in loops, where it says less.
+/// What plays in a single sound, and what that is like.
 void Listener::Analysers::addInstrument(HeardSound& sound) {
     if (!features || (!models.instrument && !models.likeness)) return;
     const auto values = features->of(excerpt->mono());
@@ -118,6 +129,12 @@ void Listener::Analysers::addInstrument(HeardSound& sound) {
     sound.instruments.push_back({std::string(judgement->label), judgement->confidence});
     if (judgement->familyLabel != judgement->label)
         sound.instruments.push_back({std::string(judgement->familyLabel), judgement->familyConfidence});
+}
+
+void Listener::Analysers::addLoopLikeness(HeardSound& sound) {
+    if (!features || !models.likeness) return;
+    sound.likeness = likenessOfLoop(excerpt->mono(), excerpt->sampleRate(), onsetsOfExcerpt(), *features,
+                                    *models.likeness);
 }
 
 void Listener::Analysers::addNote(HeardSound& sound) {
@@ -190,7 +207,9 @@ HeardSound Listener::judge() {
     its_->addKind(sound);
     its_->prepareFor(excerpt.sampleRate());
     sound.fingerprint = its_->fingerprinter->of(excerpt.mono());
-    if (!isLoop(sound)) {
+    if (isLoop(sound)) {
+        its_->addLoopLikeness(sound);
+    } else {
         its_->addInstrument(sound);
         its_->addNote(sound);
     }

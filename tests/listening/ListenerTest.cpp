@@ -92,7 +92,13 @@ TEST(Listener, TellsWhatASoundIsLike) {
     const HeardSound loop = listener().listen(tones(220, 8, 0.5), kRate, 1);
     const HeardSound other = listener().listen(tones(900, 0.3, 10), kRate, 1);
     ASSERT_TRUE(one.likeness && other.likeness);
-    EXPECT_FALSE(loop.likeness);
+    ASSERT_TRUE(loop.likeness);
+    EXPECT_LT(squaredDistance(*one.likeness, *loop.likeness),
+              squaredDistance(*loop.likeness, *other.likeness))
+        << "a loop is like its strokes";
+    EXPECT_LT(squaredDistance(*loop.likeness, *listener().listen(tones(220, 12, 0.5), kRate, 1).likeness),
+              squaredDistance(*one.likeness, *loop.likeness) / 4)
+        << "and like a longer one";
     EXPECT_LT(squaredDistance(*one.likeness,
                               *listener().listen(interleaved(tones(220, 0.9, 10), 2), kRate, 2).likeness),
               squaredDistance(*one.likeness, *other.likeness));

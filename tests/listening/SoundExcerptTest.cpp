@@ -1,5 +1,6 @@
 #include "listening/sound/SoundExcerpt.h"
 
+#include <algorithm>
 #include <cmath>
 #include <cstdint>
 #include <limits>
@@ -26,14 +27,18 @@ Samples sine(double rate, const std::vector<float>& gains, double seconds, doubl
     return samples;
 }
 
-SoundExcerpt excerptOf(const Samples& samples, double rate, int channels, double mostSeconds = 2,
-                       std::size_t blockFrames = 1000) {
-    SoundExcerpt excerpt(rate, channels, mostSeconds);
+void fill(SoundExcerpt& excerpt, const Samples& samples, int channels, std::size_t blockFrames = 1000) {
     const std::size_t block = blockFrames * static_cast<std::size_t>(channels);
     for (std::size_t at = 0; at < samples.size(); at += block) {
         if (!excerpt.process(std::span(samples).subspan(at, std::min(block, samples.size() - at)))) break;
     }
     excerpt.finish();
+}
+
+SoundExcerpt excerptOf(const Samples& samples, double rate, int channels, double mostSeconds = 2,
+                       std::size_t blockFrames = 1000) {
+    SoundExcerpt excerpt(rate, channels, mostSeconds);
+    fill(excerpt, samples, channels, blockFrames);
     return excerpt;
 }
 
@@ -105,6 +110,24 @@ TEST(SoundExcerpt, HoldsOnlyFiniteSamplesWithinBounds) {
     }
     const SoundExcerpt silence = excerptOf(Samples(1000), 44100, 2);
     EXPECT_TRUE(silence.mono().empty() && silence.left().empty() && silence.right().empty());
+}
+
+TEST(SoundExcerpt, RestartsAsIfNothingHadBeen) {
+    SoundExcerpt excerpt = excerptOf(sine(96000, {0.5F, 0.1F, 0.3F}, 3, 0.5), 96000, 3);
+    for (const std::vector<float>& gains : {std::vector{0.5F}, {0.5F, 0.1F}, {0.0F}, {0.5F}}) {
+        const int channels = static_cast<int>(gains.size());
+        const Samples samples = sine(44100, gains, 0.1, 0.02);
+        excerpt.restart(44100, channels);
+        fill(excerpt, samples, channels);
+        const SoundExcerpt fresh = excerptOf(samples, 44100, channels);
+        EXPECT_TRUE(std::ranges::equal(excerpt.left(), fresh.left()));
+        EXPECT_TRUE(std::ranges::equal(excerpt.right(), fresh.right()));
+        EXPECT_TRUE(std::ranges::equal(excerpt.mono(), fresh.mono()));
+        EXPECT_EQ(excerpt.begin(), fresh.begin());
+        EXPECT_EQ(excerpt.isStereo(), fresh.isStereo());
+        EXPECT_FALSE(excerpt.isCut());
+        EXPECT_EQ(excerpt.sampleRate(), 44100);
+    }
 }
 
 }  // namespace

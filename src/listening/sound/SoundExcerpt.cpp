@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <array>
 #include <cmath>
+#include <utility>
 
 namespace qvct {
 namespace {
@@ -42,8 +43,18 @@ SoundExcerpt::SoundExcerpt(double sampleRate, int channels, double mostSeconds)
     : channels_(static_cast<std::size_t>(channels)),
       factor_(reductionOf(sampleRate)),
       rate_(sampleRate / static_cast<double>(factor_)),
+      mostSeconds_(mostSeconds),
       most_(static_cast<std::size_t>(std::ceil(mostSeconds * rate_))),
       mostSkipped_(static_cast<std::int64_t>(kMostSilence * sampleRate)) {}
+
+void SoundExcerpt::restart(double sampleRate, int channels) {
+    SoundExcerpt next(sampleRate, channels, mostSeconds_);
+    for (const auto member : {&SoundExcerpt::left_, &SoundExcerpt::right_, &SoundExcerpt::mono_}) {
+        (this->*member).clear();
+        (next.*member).swap(this->*member);
+    }
+    *this = std::move(next);
+}
 
 SoundExcerpt SoundExcerpt::of(AudioDecoder& decoder, double mostSeconds) {
     SoundExcerpt excerpt(decoder.sampleRate(), decoder.channels(), mostSeconds);

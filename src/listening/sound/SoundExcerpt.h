@@ -25,6 +25,9 @@ class SoundExcerpt {
     /// Keeps at most `mostSeconds`. REQUIRES: sampleRate >= 1, channels >= 1, 0 < mostSeconds <= 600.
     SoundExcerpt(double sampleRate, int channels, double mostSeconds);
 
+    /// Begins another sound, in the memory of the one before.
+    void restart(double sampleRate, int channels);
+
     /// What the rest of a file begins with; no more of it is decoded than is kept.
     static SoundExcerpt of(AudioDecoder& decoder, double mostSeconds);
 
@@ -61,6 +64,7 @@ class SoundExcerpt {
     std::size_t channels_;
     std::size_t factor_;  // frames that become one
     double rate_;
+    double mostSeconds_;
     std::size_t most_;
     std::int64_t mostSkipped_;
     std::int64_t skipped_ = 0;
