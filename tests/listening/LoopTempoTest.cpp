@@ -1,3 +1,4 @@
+#include "listening/tempo/BeatGrid.h"
 #include "listening/tempo/LoopTempo.h"
 
 #include <algorithm>
@@ -66,6 +67,36 @@ TEST(LoopTempo, ATailIsNotTakenForBeats) {
             EXPECT_FALSE(tempo.isWhole()) << bpm << ' ' << tail;
         }
     }
+}
+
+TEST(LoopTempo, ATempoAtWhichBarsEndBeforeATailCountsForMore) {
+    const struct {
+        double tail, bpm;
+        bool fits;
+    } rows[] = {
+        {0.4, 120, true},   // 16 beats, the last stroke half a beat before their end
+        {0.4, 60, true},    // 8 beats
+        {0.4, 90, false},   // 8 beats before the last stroke, 16 after the sound
+        {0.4, 116, true},   // 16 beats in 8.28 of 8.4 s
+        {0.4, 114, false},  // hardly a tail
+        {0.4, 124, true},   // the last stroke is a little late
+        {0.4, 125, false},  // too late
+        {1.9, 120, true},   //
+        {2.1, 120, false},  // no tail is that long
+    };
+    for (const auto& [tail, bpm, fits] : rows) {
+        const Loop loop = rockBeat(120, 16, tail);
+        bool isFound = false;
+        for (const BeatGrid& grid : BeatGrid::candidates(loop.onsets, loop.frames, kRate)) {
+            if (grid.isWhole() || grid.bpm != bpm) continue;
+            isFound = true;
+            EXPECT_EQ(grid.features[BeatGrid::kTail], fits ? 1 : 0) << tail << ' ' << bpm;
+        }
+        EXPECT_TRUE(isFound) << bpm;
+    }
+    for (const BeatGrid& grid :
+         BeatGrid::candidates(rockBeat(120, 16).onsets, rockBeat(120, 16).frames, kRate))
+        EXPECT_FALSE(grid.isWhole() && grid.features[BeatGrid::kTail] > 0) << grid.bpm;
 }
 
 TEST(LoopTempo, TellsTheTempoOfBarsThatAreNotFourBeats) {

@@ -127,6 +127,16 @@ void measureLength(BeatGrid& grid, double seconds, double frame) {
     features[BeatGrid::kExact] = is(std::abs(grid.bpm - std::round(grid.bpm)) <= tolerance);
 }
 
+// Of a tempo at which it does not. Bars that end as the last sound begins are played a little early.
+void measureTail(BeatGrid& grid, double lastOnset, double seconds) {
+    constexpr double kShortest = 0.1, kLongest = 2, kEarly = 0.03;
+    const double earliest = std::max(lastOnset - kEarly, seconds - kLongest), latest = seconds - kShortest;
+    for (int beats = 4; beats <= 64; beats *= 2) {
+        const double end = beats * 60 / grid.bpm;
+        if (end > earliest && end <= latest) grid.features[BeatGrid::kTail] = 1;
+    }
+}
+
 // From one beat on; half beats, as bars of 5/8 last, only up to kMostHalfBeats.
 std::vector<double> wholeLengths(double seconds) {
     const double least = std::max(2.0, std::ceil(BeatGrid::kSlowest / 60.0 * seconds * 2));
@@ -171,14 +181,14 @@ std::vector<BeatGrid> BeatGrid::candidates(std::span<const Onset> onsets, std::i
     };
     for (const double beats : wholeLengths(seconds))
         measureLength(add(60 * beats / seconds, beats), seconds, 1 / sampleRate);
-    for (int bpm = kSlowest; bpm <= kFastest; ++bpm) add(bpm, bpm / 60.0 * seconds);
+    const auto addUnbound = [&](double tempo) {
+        measureTail(add(tempo, tempo / 60 * seconds), strokes.back().seconds, seconds);
+    };
+    for (int bpm = kSlowest; bpm <= kFastest; ++bpm) addUnbound(bpm);
     std::vector<double> peaks;
     addPeaks(spectrum, std::array{1.0, 2.0, 4.0}, peaks);
     addPeaks(spectrum, std::array{1.0, 3.0}, peaks);
-    for (const double peak : peaks) {
-        const double hertz = refined(strokes, peak);
-        add(60 * hertz, hertz * seconds);
-    }
+    for (const double peak : peaks) addUnbound(60 * refined(strokes, peak));
     return grids;
 }
 

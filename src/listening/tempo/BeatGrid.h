@@ -32,6 +32,7 @@ struct BeatGrid {
         kWholeBars,   ///< 1 where it is a multiple of 4.
         kPowerOfTwo,  ///< 1 where it is 4, 8, 16, 32 or 64.
         kExact,       ///< 1 where the tempo that follows from it is a whole number to within a frame.
+        kTail,  ///< 1 where 4, 8, 16, 32 or 64 beats end after the last onset and a tail before the sound.
         kWholeNumber,  ///< 1 where the tempo is a whole number.
         kFives,        ///< 1 where it is a multiple of 5: people like such tempos.
         kTens,         ///< 1 where it is a multiple of 10.

@@ -16,8 +16,8 @@ constexpr double kSame = 0.01;  // share of a tempo by which others differ at le
 
 // Fitted: docs/analysis.md says how. In the order of BeatGrid::Feature.
 constexpr std::array<double, BeatGrid::kFeatures> kWeights = {
-    1.88, 3.11,  -0.77, 8.27, 2.23, -0.49, -2.47, 5.05, 5.69, 2.20,  -0.26, -6.93,
-    2.00, -0.57, -0.23, 0.38, 2.04, 5.66,  -0.64, 1.16, 0.79, -1.40, -1.72};
+    1.37, 2.79,  -0.88, 8.00, 2.11, -1.05, -1.05, 3.17,  4.30, 2.19, -1.51, -7.90,
+    1.60, -0.15, -0.30, 0.69, 2.17, 5.54,  1.72,  -0.66, 1.18, 0.77, -1.15, -1.73};
 
 // Their probabilities, in the order of the tempos.
 std::vector<TempoCandidate> weighed(const std::vector<BeatGrid>& grids) {
