@@ -1,5 +1,6 @@
 #include "autotagging/names/KeyChoice.h"
 
+#include <algorithm>
 #include <cmath>
 
 namespace qvct {
@@ -43,7 +44,7 @@ class KeyChoice {
     /// alone in brackets or at the end; one layer of an instrument plays a note. "A Day", "Take C", "3 AM"
     /// and "Plan B" are none.
     bool canStand(const ScannedKey& key) const {
-        if (its_.hasNote || key.isVariant) return false;
+        if (its_.hasNote || key.isVariant || areInitials(key)) return false;
         if (key.isAnnounced) return true;
         const bool isOfMusic = its_.isLoop || its_.tempo.has_value();
         if (its_.isLayer && !isOfMusic) return false;
@@ -61,28 +62,59 @@ class KeyChoice {
         const bool isFolder = its_.isFolder && key.piece == 0 && isLast;
         if (key.key.mode != NamedKey::Mode::unsaid)
             return isOfMusic ||
-                   (isCapital && (isSetApart || key.isBehindPitched || isFolder || isBetweenMarks(key)));
+                   (isCapital && (isSetApart || key.isBehindPitched || isFolder || isBetweenMarks(key))) ||
+                   (its_.hasPitched && isChord(key));
         const bool hasSign = key.key.pieces > 1 && !its_.pieces[key.piece + 1].isWord();
+        const bool isSpelled = first.text.size() > 2;  // "csharp"
         if (key.key.hasAccidental)
-            return isOfMusic || (isCapital && (isSetApart || hasSign || key.isBehindPitched));
+            return isOfMusic || isSpelled || (isCapital && (isSetApart || hasSign || key.isBehindPitched));
         if (key.piece == 0) return isCapital && its_.hasPitched && isBesideTempo(key);
         if (first.isInBrackets && isLast && its_.hasPitched && its_.tempo) return isCapital;
-        return (isCapital || isBesideTempo(key)) && canLetterStand(key);
+        return (isCapital || isBesideTempo(key) || endsSmallName(key)) && canLetterStand(key);
     }
 
-    /// "Vox_Dm_02"
+    /// "DB_128_Pad": who writes a name in small letters writes "Db" for the key.
+    bool areInitials(const ScannedKey& key) const {
+        const std::string_view text = its_.pieces[key.piece].text;
+        return text.size() == 2 && text[1] == 'B' && key.key.pieces == 1 && hasLetterOf('a', 'z');
+    }
+
+    bool hasLetterOf(char first, char last) const {
+        return std::any_of(its_.name.begin(), its_.name.end(),
+                           [=](char letter) { return letter >= first && letter <= last; });
+    }
+
+    /// "bass_hit_c"; "a", "b" tell which of several, and "f" is loud.
+    bool endsSmallName(const ScannedKey& key) const {
+        const NamePiece& letter = its_.pieces[key.piece];
+        if (letter.end() != its_.name.size() || its_.name[letter.offset - 1] != '_') return false;
+        constexpr std::string_view likely = "cdeg";
+        return likely.find(letter.text.front()) != std::string_view::npos && !hasLetterOf('A', 'Z');
+    }
+
+    /// "guit_em9"
+    bool isChord(const ScannedKey& key) const {
+        const std::size_t behind = key.piece + key.key.pieces;
+        if (behind >= its_.pieces.size() || !its_.pieces[behind].isJoined) return false;
+        const std::string_view figure = its_.pieces[behind].text;
+        return figure == "6" || figure == "7" || figure == "9" || figure == "11" || figure == "13";
+    }
+
+    /// "Vox_Dm_02", but not "Who_Am_I".
     bool isBetweenMarks(const ScannedKey& key) const {
         const std::size_t behind = key.piece + key.key.pieces;
         if (key.piece == 0 || behind >= its_.pieces.size()) return false;
+        if (its_.pieces[key.piece].folded == "am" && its_.pieces[behind].isWord()) return false;
         const auto isMark = [this](std::uint32_t at) { return its_.name[at] == '_' || its_.name[at] == '-'; };
         return isMark(its_.pieces[key.piece].offset - 1) && isMark(its_.pieces[behind - 1].end());
     }
 
-    /// "G-House", and the article in "Like A Synth".
+    /// "G-House", and the article in "Like A Synth" and "ALongTime".
     bool beginsWord(const ScannedKey& key) const {
         const std::size_t behind = key.piece + key.key.pieces;
         if (behind >= its_.pieces.size() || !its_.pieces[behind].isWord()) return false;
         const NamePiece& letter = its_.pieces[key.piece];
+        if (its_.pieces[behind].isJoined) return true;
         if (letter.end() + 1 != its_.pieces[behind].offset) return false;
         const char mark = its_.name[letter.end()];
         const char markBefore = letter.offset > 0 ? its_.name[letter.offset - 1] : '\0';

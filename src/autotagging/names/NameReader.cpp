@@ -62,40 +62,57 @@ NameReading NameReader::read(std::span<const std::string_view> names, std::strin
     NameReading reading;
     combinable_.clear();
     isOfPreset_ = habits_->isOfPreset(extension);
-    bool hasKey = false;
-    for (std::size_t i = 0; i < names.size(); ++i) {
-        const std::string_view name = names[i];
-        const auto distance = static_cast<int>(i);
-        const auto owner = i == 0 ? NameScan::Owner::item : NameScan::Owner::folder;
-        const NameScan scan(*habits_, name, pieces_.read(name), owner, buffer_);
-        Claims claims(reading, name, distance);
-        for (const NameScan::Meant& meant : scan.meant()) {
-            const bool isLetter = meant.end - meant.offset == 1;
-            if (i > 0 && isLetter) continue;
-            const NamedMeaning& meaning = habits_->meaning(meant.word.meaning);
-            TagClaim& claim = claims.add(i > 0 ? meaning.inFolders : meaning.label, meant.offset, meant.end,
-                                         confidenceOf(meant, scan, owner));
-            claim.level = meaning.level;
-            if (!meaning.combinations.empty()) combinable_.push_back({reading.claims.size() - 1, &meaning});
-            claim.isHead = meant.end == scan.meant().back().end;
-        }
-        for (const auto& [offset, end] : scan.silences()) reading.silences.push_back({distance, offset, end});
-        // What the name itself says of these holds whatever its folders say.
-        if (!reading.tempo) reading.tempo = scan.tempo(reading.kind);
-        if (reading.kind == SoundKind::unsaid) reading.kind = scan.kind();
-        if (!reading.bars) reading.bars = scan.bars();
-        if (!reading.beats) reading.beats = scan.beats();
-        if (i == 0 && !reading.tempo) reading.possibleTempos = scan.possibleTempos();
-        const auto key = hasKey ? std::nullopt : scan.key();
-        if (!key) continue;
-        claims.add(*key, weights_.key);
-        hasKey = true;
+    if (names.empty()) return reading;
+    const NameScan item(*habits_, names[0], itemPieces_.read(names[0]), NameScan::Owner::item, buffer_);
+    addMeant(reading, item, 0);
+    addNumbers(reading, item);
+    std::optional<double> sharedTempo;
+    std::optional<NamedKey> keyOfFolder;
+    std::size_t folderOfKey = 0;
+    for (std::size_t i = 1; i < names.size(); ++i) {
+        const NameScan folder(*habits_, names[i], pieces_.read(names[i]), NameScan::Owner::folder, buffer_);
+        addMeant(reading, folder, static_cast<int>(i));
+        addNumbers(reading, folder);
+        if (!sharedTempo) sharedTempo = item.tempoWith(folder);
+        if (keyOfFolder) continue;
+        keyOfFolder = folder.key(folder.tempo());
+        folderOfKey = i;
     }
-    if (reading.tempo) reading.possibleTempos.clear();
+    // What the name itself says holds whatever its folders say; they may say that it is a loop.
+    const auto tempo = sharedTempo ? sharedTempo : item.tempo(reading.kind);
+    if (!reading.tempo) reading.tempo = tempo;
+    if (!reading.tempo) reading.possibleTempos = item.possibleTempos();
+    if (const auto key = item.key(tempo))
+        Claims(reading, names[0], 0).add(*key, weights_.key);
+    else if (keyOfFolder)
+        Claims(reading, names[folderOfKey], static_cast<int>(folderOfKey)).add(*keyOfFolder, weights_.key);
     const bool hasLength = reading.bars || reading.beats;
     if (reading.kind == SoundKind::unsaid && hasLength) reading.kind = SoundKind::loop;
     combine(reading);
     return reading;
+}
+
+void NameReader::addMeant(NameReading& reading, const NameScan& scan, int distance) {
+    Claims claims(reading, scan.name(), distance);
+    const auto owner = distance == 0 ? NameScan::Owner::item : NameScan::Owner::folder;
+    for (const NameScan::Meant& meant : scan.meant()) {
+        const bool isLetter = meant.end - meant.offset == 1;
+        if (distance > 0 && isLetter) continue;
+        const NamedMeaning& meaning = habits_->meaning(meant.word.meaning);
+        TagClaim& claim = claims.add(distance > 0 ? meaning.inFolders : meaning.label, meant.offset,
+                                     meant.end, confidenceOf(meant, scan, owner));
+        claim.level = meaning.level;
+        if (!meaning.combinations.empty()) combinable_.push_back({reading.claims.size() - 1, &meaning});
+        claim.isHead = meant.end == scan.meant().back().end;
+    }
+    for (const auto& [offset, end] : scan.silences()) reading.silences.push_back({distance, offset, end});
+}
+
+void NameReader::addNumbers(NameReading& reading, const NameScan& scan) {
+    if (!reading.tempo) reading.tempo = scan.tempo(reading.kind);
+    if (reading.kind == SoundKind::unsaid) reading.kind = scan.kind();
+    if (!reading.bars) reading.bars = scan.bars();
+    if (!reading.beats) reading.beats = scan.beats();
 }
 
 double NameReader::confidenceOf(const NameScan::Meant& meant, const NameScan& scan,

@@ -62,6 +62,8 @@ class NameReader {
         const NamedMeaning* meaning;
     };
 
+    void addMeant(NameReading& reading, const NameScan& scan, int distance);
+    static void addNumbers(NameReading& reading, const NameScan& scan);
     double confidenceOf(NameStrength strength) const;
     NameStrength strengthOf(const NameScan::Meant& meant, const NameScan& scan) const;
     double confidenceOf(const NameScan::Meant& meant, const NameScan& scan, NameScan::Owner owner) const;
@@ -75,7 +77,7 @@ class NameReader {
 
     std::shared_ptr<const NamingHabits> habits_;
     EvidenceWeights weights_;
-    NamePieces pieces_;
+    NamePieces itemPieces_, pieces_;
     std::vector<Combinable> combinable_;
     std::string buffer_;
     bool isOfPreset_ = false;

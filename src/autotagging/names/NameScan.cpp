@@ -21,17 +21,20 @@ bool canStandAlone(double tempo) {
     return tempo >= slowest && tempo <= fastest;
 }
 
-/// "Fm" is a key where "FM" and "fm" are a way to make sounds.
-bool isMinorKey(const NamePiece& piece) {
-    return piece.text.size() == 2 && piece.text[0] >= 'A' && piece.text[0] <= 'G' && piece.text[1] == 'm';
-}
-
 }  // namespace
 
 NameScan::NameScan(const NamingHabits& habits, std::string_view name, Pieces pieces, Owner owner,
                    std::string& buffer)
     : habits_(habits), name_(name), pieces_(pieces), owner_(owner), buffer_(buffer) {
     for (std::size_t at = owner == Owner::item ? readPrefix() : 0; at < pieces_.size();) at += readAt(at);
+}
+
+/// "Fm" is a key where "FM" and "fm" are a way to make sounds, unless a tempo stands beside it: "fm_120bpm".
+bool NameScan::isMinorKey(std::size_t at) const {
+    const std::string_view text = pieces_[at].text;
+    if (text.size() != 2 || text[1] != 'm') return false;
+    if (text[0] >= 'A' && text[0] <= 'G') return true;
+    return text == "fm" && (before_ == NameRole::tempo || isTempoWord(at + 1) || isTempoWord(at + 2));
 }
 
 /// The pieces that the code of a category takes, which stand for nothing else.
@@ -54,8 +57,9 @@ std::size_t NameScan::readAt(std::size_t at) {
     const Word word = habits_.wordAt(rest, buffer_);
     // "H-Moll", where a lone "H" is a hi-hat.
     const bool isLetterWord = word.pieces == 1 && rest.front().isLetter();
-    const auto key = word.pieces == 0 || isLetterWord || isMinorKey(rest.front()) ? namedKeyAt(rest, habits_)
-                                                                                  : std::nullopt;
+    const bool mayBeKey =
+        word.pieces == 0 || isLetterWord || (isMinorKey(at) && word.role != NameRole::silent);
+    const auto key = mayBeKey ? namedKeyAt(rest, habits_) : std::nullopt;
     if (key && (!isLetterWord || key->isSpelledOut)) return readKey(at, *key);
     if (word.pieces > 0) return readWord(at, word);
     const std::size_t read = rest.front().isNumber() ? readNumber(at) : readPacked(at);
@@ -66,7 +70,10 @@ std::size_t NameScan::readAt(std::size_t at) {
 std::size_t NameScan::readWord(std::size_t at, const Word& word) {
     const std::size_t behind = at + word.pieces;
     before_ = word.role;
-    noteKind(word.role);
+    // "OS_Loop" may be somebody's.
+    const bool mayBeInitials =
+        at == 0 && word.pieces == 1 && pieces_[0].text.size() <= 2 && pieces_.size() > 1;
+    if (!mayBeInitials) noteKind(word.role);
     // "drum loop" and "drumloop" are words, and say that it is a loop.
     for (const NamePiece& piece : pieces_.subspan(at, word.pieces)) noteKindInside(piece);
     const std::uint32_t offset = pieces_[at].offset, end = pieces_[behind - 1].end();
@@ -83,11 +90,15 @@ std::size_t NameScan::readWord(std::size_t at, const Word& word) {
     const bool isLayer = word.role == NameRole::layer && at > 0;
     isLayer_ = isLayer_ || isLayer;
     isOfPack_ = isOfPack_ || word.role == NameRole::pack;
-    // "Vol 2", "Take C", "Bar 3": what is counted is neither a tempo nor a note.
+    // "Vol 2", "Take C", "Bar 3": what is counted is neither a tempo nor a note; but "Your Type 165bpm".
     const bool isCounted = (word.role == NameRole::count || isLayer || (isUnit && !isOfNumber)) &&
-                           behind < pieces_.size() &&
+                           behind < pieces_.size() && !isTempoWord(behind + 1) &&
                            (pieces_[behind].isNumber() || pieces_[behind].isLetter());
     return word.pieces + (isCounted ? 1U : 0U);
+}
+
+bool NameScan::isTempoWord(std::size_t at) const {
+    return at < pieces_.size() && habits_.roleOf(pieces_[at].folded) == NameRole::tempo;
 }
 
 void NameScan::noteKindInside(const NamePiece& piece) {
@@ -191,13 +202,13 @@ std::size_t NameScan::readNumber(std::size_t at) {
     if (before_ != NameRole::pack) behindNumber_ = at + read;
     if (!number || *number < kSlowest || *number > kFastest) return read;
     const bool isSaid = before_ == NameRole::tempo;
-    // "TR808", "v124": part of a word, but not of one in "Am120bpm" and "120Am".
+    // "TR808", "v124": part of a word, but not of one in "Am120bpm", "120Am" and "Bassline120F#m".
     const Pieces rest = pieces_.subspan(at + read);
-    const bool isBeforeTempo = !rest.empty() && habits_.roleOf(rest.front().folded) == NameRole::tempo;
-    const bool isPartOfWord =
-        (pieces_[at].isJoined && !isBeforeTempo) ||
-        (!rest.empty() && rest.front().isJoined && !isBeforeTempo && !beginsWithMode(rest));
-    if (isSaid || !isPartOfWord) tempos_.push_back({*number, isSaid, at + read});
+    const bool isJoinedOn = !rest.empty() && rest.front().isJoined;
+    const bool isBeforeTempo = isTempoWord(at + read);
+    const bool isBeforeKey = isJoinedOn && beginsWithMode(rest);
+    const bool isPartOfWord = (pieces_[at].isJoined || isJoinedOn) && !isBeforeTempo && !isBeforeKey;
+    tempos_.push_back({*number, isSaid, isPartOfWord && !isSaid, at + read});
     return read;
 }
 
@@ -216,6 +227,7 @@ std::size_t NameScan::readPacked(std::size_t at) {
 }
 
 std::optional<double> NameScan::tempo(SoundKind kind) const {
+    if (tempos_.empty()) return std::nullopt;
     std::optional<double> said;
     for (const Tempo& tempo : tempos_) {
         if (!tempo.isSaid) continue;
@@ -223,43 +235,73 @@ std::optional<double> NameScan::tempo(SoundKind kind) const {
         said = tempo.number;
     }
     if (said) return said;
-    const auto isSure = [this](const ScannedKey& key) {
-        const NamePiece& last = pieces_[key.piece + key.key.pieces - 1];
-        const bool hasSignWord = key.key.hasAccidental && key.key.pieces > 1 && last.isWord();
-        return key.key.mode != NamedKey::Mode::unsaid || key.key.isSpelledOut || key.isAnnounced ||
-               last.kind == NamePiece::Kind::sharp || hasSignWord;
-    };
-    const bool hasSureKey = std::any_of(keys_.begin(), keys_.end(), isSure);
-    // "Jungle/160/think loop.wav"
-    const bool isAllOfLoop = kind == SoundKind::loop && pieces_.size() == 1;
-    if ((!isLoop() && !hasSureKey && !isAllOfLoop && !saysPassage()) || saysOneShot_) return std::nullopt;
+    const bool hasSureKey =
+        std::any_of(keys_.begin(), keys_.end(), [this](const ScannedKey& key) { return isSure(key); });
+    // "Drum Loops/MK_120_shade", and the folder in "Jungle/160/think loop"
+    const bool isOfLoop = kind == SoundKind::loop && (owner_ == Owner::item || pieces_.size() == 1);
+    if ((!isLoop() && !hasSureKey && !isOfLoop && !saysPassage()) || this->kind() == SoundKind::oneShot)
+        return std::nullopt;
     std::optional<double> alone;
     for (const Tempo& tempo : tempos_) {
-        if (!canStandAlone(tempo.number)) continue;
+        if (tempo.isPartOfWord || !canStandAlone(tempo.number)) continue;
         if (alone && *alone != tempo.number) return std::nullopt;
         alone = tempo.number;
     }
     return alone;
 }
 
+/// More than a letter, which may be any; or a letter where packs put the key.
+bool NameScan::isSure(const ScannedKey& key) const {
+    const NamePiece& last = pieces_[key.piece + key.key.pieces - 1];
+    const bool hasSignWord = key.key.hasAccidental && key.key.pieces > 1 && last.isWord();
+    return key.key.mode != NamedKey::Mode::unsaid || key.key.isSpelledOut || key.isAnnounced ||
+           last.kind == NamePiece::Kind::sharp || hasSignWord || isBesideNumber(key);
+}
+
+/// "90_Bb_Strange_Piano", "static-synth-C-138", "(96)_G"; "Bass_101_B" is the second of them.
+bool NameScan::isBesideNumber(const ScannedKey& key) const {
+    const char letter = pieces_[key.piece].text.front();
+    if (letter < 'A' || letter > 'G' || (letter < 'C' && !key.key.hasAccidental)) return false;
+    const std::size_t behind = key.piece + key.key.pieces;
+    const auto isMark = [this](std::uint32_t at) { return name_[at] == '_' || name_[at] == '-'; };
+    const std::uint32_t end = pieces_[behind - 1].end();
+    if (key.piece == 0 || !isMark(pieces_[key.piece].offset - 1)) return false;
+    if (end < name_.size() && !isMark(end)) return false;
+    const bool isOfPitched = saysPitched();
+    return std::any_of(tempos_.begin(), tempos_.end(), [&](const Tempo& tempo) {
+        return !tempo.isPartOfWord && (tempo.end == key.piece || tempo.end == behind + 1) &&
+               (isOfPitched || pieces_[tempo.end - 1].isInBrackets);
+    });
+}
+
 std::vector<double> NameScan::possibleTempos() const {
     std::vector<double> numbers;
-    if (saysOneShot_) return numbers;
+    if (kind() == SoundKind::oneShot) return numbers;
     for (const Tempo& tempo : tempos_)
-        if (canStandAlone(tempo.number)) numbers.push_back(tempo.number);
+        if (!tempo.isPartOfWord && canStandAlone(tempo.number)) numbers.push_back(tempo.number);
     return numbers;
 }
 
-std::optional<NamedKey> NameScan::key() const {
+std::optional<double> NameScan::tempoWith(const NameScan& folder) const {
+    if (folder.pieces_.size() != 1 || folder.tempos_.empty()) return std::nullopt;
+    const double number = folder.tempos_.front().number;
+    const bool isHere = std::any_of(tempos_.begin(), tempos_.end(),
+                                    [number](const Tempo& tempo) { return tempo.number == number; });
+    return isHere && canStandAlone(number) ? std::optional(number) : std::nullopt;
+}
+
+std::optional<NamedKey> NameScan::key(std::optional<double> tempo) const {
+    if (keys_.empty()) return std::nullopt;
     KeyContext context{habits_, name_, pieces_};
-    context.tempo = tempo();
+    context.tempo = tempo;
     context.isFolder = owner_ == Owner::folder;
     context.isLoop = isLoop();
     context.isLayer = isLayer_;
     context.hasNote = hasNote_;
     context.hasMeaning = !meant_.empty();
     context.hasPitched = saysPitched();
-    context.hasNumber = !tempos_.empty();
+    context.hasNumber =
+        std::any_of(tempos_.begin(), tempos_.end(), [](const Tempo& its) { return !its.isPartOfWord; });
     return chosenKey(keys_, context);
 }
 

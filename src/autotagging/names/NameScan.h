@@ -29,8 +29,9 @@ class NameScan {
     /// A number that may be a tempo.
     struct Tempo {
         double number;
-        bool isSaid;      ///< "bpm" stands beside it.
-        std::size_t end;  ///< The piece behind it.
+        bool isSaid;        ///< "bpm" stands beside it.
+        bool isPartOfWord;  ///< "TR808", "drm80"
+        std::size_t end;    ///< The piece behind it.
     };
     /// Whose name it is: only an item's begins with the code of a category.
     enum class Owner : std::uint8_t { item, folder };
@@ -45,8 +46,9 @@ class NameScan {
     std::span<const NamingHabits::Word> prefix() const { return prefix_; }
     /// Where phrases stand whose words do not mean what they say elsewhere: offset and end.
     const std::vector<std::pair<std::uint32_t, std::uint32_t>>& silences() const { return silences_; }
+    /// A "Hit Loop" is a loop.
     SoundKind kind() const {
-        return saysOneShot_ ? SoundKind::oneShot : saysLoop_ ? SoundKind::loop : SoundKind::unsaid;
+        return saysLoop_ ? SoundKind::loop : saysOneShot_ ? SoundKind::oneShot : SoundKind::unsaid;
     }
     /// It is called by its maker: a volume, a collection.
     bool isOfPack() const { return isOfPack_; }
@@ -56,11 +58,14 @@ class NameScan {
     std::optional<int> bars() const { return bars_; }
     std::optional<int> beats() const { return beats_; }
     /// Nothing when the name says none, or several.
-    /// `kind`: what names nearer to the item say.
+    /// `kind`: what the names around it say.
     std::optional<double> tempo(SoundKind kind = SoundKind::unsaid) const;
     /// The numbers that might be one if more spoke for it.
     std::vector<double> possibleTempos() const;
-    std::optional<NamedKey> key() const;
+    /// The number that a folder is called by, if it stands in the name as well: "80/drm80_hat".
+    std::optional<double> tempoWith(const NameScan& folder) const;
+    /// `tempo`: of what has the name.
+    std::optional<NamedKey> key(std::optional<double> tempo) const;
 
   private:
     std::size_t readPrefix();
@@ -78,6 +83,10 @@ class NameScan {
     std::size_t readNumber(std::size_t at);
     std::size_t readPacked(std::size_t at);
     bool isLoop() const { return saysLoop_ || bars_ || beats_; }
+    bool isTempoWord(std::size_t at) const;
+    bool isMinorKey(std::size_t at) const;
+    bool isSure(const ScannedKey& key) const;
+    bool isBesideNumber(const ScannedKey& key) const;
     bool saysPassage() const;
     bool saysPitched() const;
 

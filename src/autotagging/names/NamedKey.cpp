@@ -51,16 +51,17 @@ class KeyParser {
         std::string_view rest = pieces_[0].folded;
         if (const auto note = habits_.noteOf(rest)) return parseSolfege(*note);
         if (rest.front() < 'a' || rest.front() > 'g') return std::nullopt;
-        // "AM" is in the morning.
-        if (pieces_[0].text.size() == 2 && pieces_[0].text[1] == 'M') return std::nullopt;
+        // "AM" is in the morning, "DBM" somebody.
+        if (pieces_[0].text.size() <= 3 && pieces_[0].text.ends_with('M')) return std::nullopt;
         key_.tonic = kSemitones[static_cast<std::size_t>(rest.front() - 'a')];
         key_.pieces = 1;
         rest.remove_prefix(1);
         if (consume(rest, "sharp")) shift(1);
         if (!key_.hasAccidental && (consume(rest, "flat") || consume(rest, "b"))) shift(-1);
-        // "Csm", where a name must do without "#".
-        if (rest.size() > 1 && rest.front() == 's' && isMode(rest.substr(1))) {
-            consume(rest, "s");
+        // "Csm" and "Cshm", where a name must do without "#".
+        for (const std::string_view sign : {"sh", "s"}) {
+            if (!rest.starts_with(sign) || !isMode(rest.substr(sign.size()))) continue;
+            consume(rest, sign);
             shift(1);
         }
         if (!rest.empty() && !takeMode(rest)) return std::nullopt;
