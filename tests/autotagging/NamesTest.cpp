@@ -98,6 +98,8 @@ TEST(Names, AreReadAsPeopleWriteThem) {
         {"Rainfall On Roof", {"Nature"}},
         {"shotgunreload", {"Sound Effects"}},
         {"Chip Osc", {"Synth"}},
+        {"ab2closedhh", {"Hi-Hat"}},
+        {"Contrabass Fs1", {"Double Bass"}},
     };
     for (const auto& [name, labels] : rows) EXPECT_EQ(labelsOf(readingOf(name)), labels) << name;
 }
@@ -116,23 +118,41 @@ TEST(Names, BeginWithTheCodeOfAnyCategory) {
 }
 
 TEST(Names, DoNotSayWhatTheyOnlySeemToSay) {
-    for (const char* name : {"",          "808",
-                             "v127 rr2",  "Hard Drive",
-                             "Section B", "Plan B",
-                             "3 AM",      "Vol 2",
-                             "C",         "A Day",
-                             "Take C",    "TR808",
-                             "abcdefgh",  "Kit",
-                             "()[]--__",  "9A",
-                             "Sat",       "Bdelay",
-                             "Charm",     "Miami Vice",
-                             "Monkeys",   "Strong",
-                             "Symbol",    "Override",
-                             "Clip 3",    "Sounds",
-                             "Club",      "Rinse",
-                             "Recorded",  "TM Wandering Star",
-                             "Electron",  "Music",
-                             "Osc Osc",   "What Our Toaster Never Toasted"}) {
+    for (const char* name : {"",
+                             "808",
+                             "v127 rr2",
+                             "Hard Drive",
+                             "Section B",
+                             "Plan B",
+                             "3 AM",
+                             "Vol 2",
+                             "C",
+                             "A Day",
+                             "Take C",
+                             "TR808",
+                             "abcdefgh",
+                             "Kit",
+                             "()[]--__",
+                             "9A",
+                             "Sat",
+                             "Bdelay",
+                             "Charm",
+                             "Miami Vice",
+                             "Monkeys",
+                             "Strong",
+                             "Symbol",
+                             "Override",
+                             "Clip 3",
+                             "Sounds",
+                             "Club",
+                             "Rinse",
+                             "Recorded",
+                             "TM Wandering Star",
+                             "Electron",
+                             "Music",
+                             "Osc Osc",
+                             "Kick Starter",
+                             "What Our Toaster Never Toasted"}) {
         const NameReading reading = readingOf(name);
         EXPECT_THAT(labelsOf(reading), IsEmpty()) << name;
         EXPECT_FALSE(reading.tempo) << name;
@@ -234,6 +254,29 @@ TEST(Names, TellKeyTempoAndKindWhereTheyStand) {
         {"Bass Am120bpm", "A", "Minor", 120},
         {"Rhodes Cm7b5 90bpm", "C", "Minor", 90},
         {"Strings in the key of D", "D", ""},
+        {"VX_90_Bb_Strange_Piano", "ASharp", "", 90},
+        {"static-synth-C-138", "C", "", 138},
+        {"Synth_101_B", "", ""},
+        {"Kick_90_D", "", ""},
+        {"Tumbao_(96)_G", "G", "", 96},
+        {"Pad_120bpm_Cshm", "CSharp", "Minor", 120},
+        {"DBM_85_Synth_Loop_Gm", "G", "Minor", 85, SoundKind::loop},
+        {"DB_128_Pad_Loop", "", "", 128, SoundKind::loop},
+        {"DB_128_PAD_LOOP", "CSharp", "", 128, SoundKind::loop},
+        {"Who_Am_I", "", ""},
+        {"I Am 120bpm", "", "", 120},
+        {"Bass_fm_120bpm", "F", "Minor", 120},
+        {"Bass_fm_120 loop", "", "", 120, SoundKind::loop},
+        {"OS_140_chords_G#m", "GSharp", "Minor", 140},
+        {"Kick OS 140", "", "", 0, SoundKind::oneShot},
+        {"Orch Hit Loop 120 Am", "A", "Minor", 120, SoundKind::loop},
+        {"Your Type 165bpm", "", "", 165},
+        {"Your Type 165", "", ""},
+        {"forALongTime160bpm", "", "", 160},
+        {"01-byte-bass-csharp", "CSharp", ""},
+        {"Bassline124F#m", "FSharp", "Minor", 124},
+        {"DnB 174 Am", "A", "Minor", 174},
+        {"Cello_Fs3", "", ""},
     };
     for (const auto& row : rows) {
         const NameReading reading = readingOf(row.name);
@@ -258,6 +301,27 @@ TEST(Names, OfPresetsAreOftenFiguresOfSpeech) {
     EXPECT_THAT(labelsOf(reader.read(chainsaw, "wav")), ElementsAre("Sound Effects"));
     EXPECT_THAT(labelsOf(reader.read(chainsaw, ItemNames("/a/Chainsaw.fxp").extension())), IsEmpty());
     EXPECT_THAT(labelsOf(reader.read(osc, "fxp")), ElementsAre("Synth"));
+}
+
+TEST(Names, OfFoldersTellWhetherANumberIsATempo) {
+    const struct {
+        std::vector<std::string_view> names;
+        double tempo;
+        Labels labels;
+    } rows[] = {
+        {{"MK_145_shade", "Drum Loops"}, 145, {"Drums"}},
+        {{"MK_145_shade", "Shades"}, 0, {}},
+        {{"MK_145_one_shot", "Loops"}, 0, {}},
+        {{"101", "Loops 124bpm"}, 124, {}},
+        {{"xy80_stand_F", "80"}, 80, {"F"}},
+        {{"xy80_stand_F", "90"}, 0, {}},
+        {{"xy20_stand_F", "20"}, 0, {}},
+    };
+    for (const auto& row : rows) {
+        const NameReading reading = NameReader().read(row.names);
+        EXPECT_EQ(reading.tempo.value_or(0), row.tempo) << row.names[0] << " in " << row.names[1];
+        EXPECT_EQ(labelsOf(reading), row.labels) << row.names[0] << " in " << row.names[1];
+    }
 }
 
 TEST(Names, OfFoldersThatAreAKeyTellIt) {

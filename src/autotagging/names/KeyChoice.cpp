@@ -62,15 +62,14 @@ class KeyChoice {
         const bool isFolder = its_.isFolder && key.piece == 0 && isLast;
         if (key.key.mode != NamedKey::Mode::unsaid)
             return isOfMusic ||
-                   (isCapital && (isSetApart || key.isBehindPitched || isFolder || isBetweenMarks(key))) ||
-                   (its_.hasPitched && isChord(key));
+                   (isCapital && (isSetApart || key.isBehindPitched || isFolder || isBetweenMarks(key)));
         const bool hasSign = key.key.pieces > 1 && !its_.pieces[key.piece + 1].isWord();
         const bool isSpelled = first.text.size() > 2;  // "csharp"
         if (key.key.hasAccidental)
             return isOfMusic || isSpelled || (isCapital && (isSetApart || hasSign || key.isBehindPitched));
         if (key.piece == 0) return isCapital && its_.hasPitched && isBesideTempo(key);
         if (first.isInBrackets && isLast && its_.hasPitched && its_.tempo) return isCapital;
-        return (isCapital || isBesideTempo(key) || endsSmallName(key)) && canLetterStand(key);
+        return (isCapital || isBesideTempo(key)) && canLetterStand(key);
     }
 
     /// "DB_128_Pad": who writes a name in small letters writes "Db" for the key.
@@ -82,22 +81,6 @@ class KeyChoice {
     bool hasLetterOf(char first, char last) const {
         return std::any_of(its_.name.begin(), its_.name.end(),
                            [=](char letter) { return letter >= first && letter <= last; });
-    }
-
-    /// "bass_hit_c"; "a", "b" tell which of several, and "f" is loud.
-    bool endsSmallName(const ScannedKey& key) const {
-        const NamePiece& letter = its_.pieces[key.piece];
-        if (letter.end() != its_.name.size() || its_.name[letter.offset - 1] != '_') return false;
-        constexpr std::string_view likely = "cdeg";
-        return likely.find(letter.text.front()) != std::string_view::npos && !hasLetterOf('A', 'Z');
-    }
-
-    /// "guit_em9"
-    bool isChord(const ScannedKey& key) const {
-        const std::size_t behind = key.piece + key.key.pieces;
-        if (behind >= its_.pieces.size() || !its_.pieces[behind].isJoined) return false;
-        const std::string_view figure = its_.pieces[behind].text;
-        return figure == "6" || figure == "7" || figure == "9" || figure == "11" || figure == "13";
     }
 
     /// "Vox_Dm_02", but not "Who_Am_I".

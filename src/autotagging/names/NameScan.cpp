@@ -37,6 +37,15 @@ bool NameScan::isMinorKey(std::size_t at) const {
     return text == "fm" && (before_ == NameRole::tempo || isTempoWord(at + 1) || isTempoWord(at + 2));
 }
 
+/// "Fs1" is a note, where "fs" is a finger snap.
+bool NameScan::isSharpNote(std::size_t at) const {
+    const std::string_view text = pieces_[at].text;
+    if (text.size() != 2 || text[0] < 'A' || text[0] > 'G' || text[1] != 's') return false;
+    const std::size_t behind = at + 1;
+    return behind < pieces_.size() && pieces_[behind].isNumber() && pieces_[behind].isJoined &&
+           pieces_[behind].text.size() == 1;
+}
+
 /// The pieces that the code of a category takes, which stand for nothing else.
 std::size_t NameScan::readPrefix() {
     const auto prefix = namePrefixOf(name_);
@@ -57,8 +66,8 @@ std::size_t NameScan::readAt(std::size_t at) {
     const Word word = habits_.wordAt(rest, buffer_);
     // "H-Moll", where a lone "H" is a hi-hat.
     const bool isLetterWord = word.pieces == 1 && rest.front().isLetter();
-    const bool mayBeKey =
-        word.pieces == 0 || isLetterWord || (isMinorKey(at) && word.role != NameRole::silent);
+    const bool mayBeKey = word.pieces == 0 || isLetterWord || isSharpNote(at) ||
+                          (isMinorKey(at) && word.role != NameRole::silent);
     const auto key = mayBeKey ? namedKeyAt(rest, habits_) : std::nullopt;
     if (key && (!isLetterWord || key->isSpelledOut)) return readKey(at, *key);
     if (word.pieces > 0) return readWord(at, word);

@@ -85,6 +85,7 @@ class NameScan {
     bool isLoop() const { return saysLoop_ || bars_ || beats_; }
     bool isTempoWord(std::size_t at) const;
     bool isMinorKey(std::size_t at) const;
+    bool isSharpNote(std::size_t at) const;
     bool isSure(const ScannedKey& key) const;
     bool isBesideNumber(const ScannedKey& key) const;
     bool saysPassage() const;

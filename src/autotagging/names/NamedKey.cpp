@@ -64,6 +64,10 @@ class KeyParser {
             consume(rest, sign);
             shift(1);
         }
+        if (rest == "s" && isOctaveAt(key_.pieces)) {
+            consume(rest, "s");
+            shift(1);
+        }
         if (!rest.empty() && !takeMode(rest)) return std::nullopt;
         if (key_.mode == NamedKey::Mode::unsaid && !key_.isSpelledOut) takeFollowing();
         return key_;
@@ -107,7 +111,7 @@ class KeyParser {
     /// The pieces behind the letter: "#", "3", "flat", "minor", "harmonic minor".
     void takeFollowing() {
         takeSign();
-        if (has(key_.pieces) && next().isJoined && next().isNumber() && next().text.size() == 1) {
+        if (isOctaveAt(key_.pieces)) {
             key_.hasOctave = true;
             ++key_.pieces;
             return;
@@ -137,6 +141,10 @@ class KeyParser {
         ++key_.pieces;
     }
 
+    /// "C#3", "Fs1"
+    bool isOctaveAt(std::size_t at) const {
+        return has(at) && pieces_[at].isJoined && pieces_[at].isNumber() && pieces_[at].text.size() == 1;
+    }
     bool has(std::size_t at) const { return at < pieces_.size(); }
     const NamePiece& next() const { return pieces_[key_.pieces]; }
 
