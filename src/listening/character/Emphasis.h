@@ -3,17 +3,9 @@
 #include "platform/base/Lanes.h"
 
 #include <cmath>
-#include <cstring>
 #include <numbers>
 
 namespace qvct {
-
-/// Four samples in a row, from any place.
-inline Lanes lanesAt(const float* samples) {
-    Lanes lanes;
-    std::memcpy(&lanes.v, samples, sizeof lanes.v);
-    return lanes;
-}
 
 inline double sumOf(Lanes lanes) {
     return double{lanes.v[0]} + lanes.v[1] + lanes.v[2] + lanes.v[3];

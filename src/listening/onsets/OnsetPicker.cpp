@@ -27,17 +27,15 @@ OnsetPicker::OnsetPicker(double framesPerSecond)
       longMedian_(framesIn(kLongMedian, framesPerSecond)),
       distance_(static_cast<std::int64_t>(framesIn(kDistance, framesPerSecond))),
       values_(longMedian_ + medianAfter_ + 1),
-      last_(-distance_ - 1) {
-    sorted_.reserve(values_.size());
-}
+      last_(-distance_ - 1) {}
 
 std::optional<std::int64_t> OnsetPicker::next(float value) {
     values_[static_cast<std::size_t>(count_) % values_.size()] = value;
     const std::int64_t frame = count_++ - static_cast<std::int64_t>(medianAfter_);
     if (frame < 0 || frame - last_ <= distance_ || !isLargest(frame)) return {};
     const float peak = at(frame);
-    if (peak < kThreshold || peak < kThreshold + kMedianFactor * medianSince(frame, medianBefore_) ||
-        peak < kLongThreshold + kLongMedianFactor * medianSince(frame, longMedian_)) {
+    if (!isMedianAtMost((peak - kThreshold) / kMedianFactor, frame, medianBefore_) ||
+        !isMedianAtMost((peak - kLongThreshold) / kLongMedianFactor, frame, longMedian_)) {
         return {};
     }
     last_ = frame;
@@ -56,15 +54,18 @@ bool OnsetPicker::isLargest(std::int64_t frame) const {
     return true;
 }
 
-float OnsetPicker::medianSince(std::int64_t frame, std::size_t before) {
-    sorted_.clear();
-    for (std::int64_t i = std::max<std::int64_t>(0, frame - static_cast<std::int64_t>(before)); i < count_;
-         ++i) {
-        sorted_.push_back(at(i));
+// Counting takes less time than to find the median.
+bool OnsetPicker::isMedianAtMost(float bound, std::int64_t frame, std::size_t before) const {
+    const auto size = static_cast<std::int64_t>(values_.size());
+    const std::int64_t first = std::max<std::int64_t>(0, frame - static_cast<std::int64_t>(before));
+    std::int64_t small = 0;
+    for (std::int64_t i = first; i < count_;) {
+        const std::int64_t end = std::min(count_, i + size - i % size);  // of a run in the ring
+        const float* run = &values_[static_cast<std::size_t>(i % size)];
+        small += std::count_if(run, run + (end - i), [=](float value) { return value <= bound; });
+        i = end;
     }
-    const auto middle = sorted_.begin() + static_cast<std::ptrdiff_t>((sorted_.size() - 1) / 2);
-    std::nth_element(sorted_.begin(), middle, sorted_.end());
-    return *middle;
+    return small > (count_ - first - 1) / 2;
 }
 
 }  // namespace qvct

@@ -80,12 +80,7 @@ void SpectralFlux::makeBands(double sampleRate) {
 }
 
 void SpectralFlux::transform(const float* samples) {
-    const std::span<Lanes> input = transform_->four.input();
-    for (std::size_t i = 0; i < window_.size(); ++i) {
-        const float* sample = samples + i;
-        const Lanes::Vector four = {sample[0], sample[hop_], sample[2 * hop_], sample[3 * hop_]};
-        input[i] = Lanes(four) * window_[i];
-    }
+    transform_->four.load({samples, samples + hop_, samples + 2 * hop_, samples + 3 * hop_}, window_);
     const std::span<const std::complex<Lanes>> bins = transform_->four.transform();
     for (std::size_t i = 0; i < bins.size(); ++i) {
         transform_->magnitudes[i] =

@@ -31,13 +31,13 @@ void findPeaks(std::span<const float> powers, double hertzPerBin, double lowest,
         std::clamp(highest / hertzPerBin, 0.0, std::max(0.0, static_cast<double>(powers.size()) - 2)));
     float strongest = 0;
     for (std::size_t i = first; i < end; ++i) {
-        if (isPeak(&powers[i])) strongest = std::max(strongest, powers[i]);
+        if (!isPeak(&powers[i])) continue;
+        // Bins for now: most peaks of noise are dropped again.
+        peaks.push_back({static_cast<double>(i), powers[i]});
+        strongest = std::max(strongest, powers[i]);
     }
     const float floor = strongest * static_cast<float>(std::pow(10, -rangeDb / 10));
-    for (std::size_t i = first; i < end; ++i) {
-        // Bins for now: most peaks of noise are dropped again.
-        if (powers[i] > floor && isPeak(&powers[i])) peaks.push_back({static_cast<double>(i), powers[i]});
-    }
+    std::erase_if(peaks, [&](const SpectralPeak& peak) { return !(peak.power > double{floor}); });
     if (peaks.size() > most) {
         std::nth_element(peaks.begin(), peaks.begin() + static_cast<std::ptrdiff_t>(most), peaks.end(),
                          [](const SpectralPeak& a, const SpectralPeak& b) { return a.power > b.power; });

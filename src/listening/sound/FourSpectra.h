@@ -25,14 +25,14 @@ class FourSpectra {
     std::size_t bins() const { return window_.size() / 2; }
     /// A bin a lane for each frame, from 0 Hz on, valid until the next call; a sine of amplitude 1 has about
     /// power 1. REQUIRES: size() finite samples at each pointer.
-    std::span<const Lanes> powers(const std::array<const float*, 4>& frames) {
-        return powers(frames, size());
-    }
+    std::span<const Lanes> powers(const std::array<const float*, 4>& frames);
     /// The same of shorter frames, under a window of their length and with silence behind them.
     /// REQUIRES: length <= size(), so many finite samples at each pointer.
     std::span<const Lanes> powers(const std::array<const float*, 4>& frames, std::size_t length);
 
   private:
+    std::span<const Lanes> powersOfInput();
+
     FourTransforms transforms_;
     std::vector<float> window_;
     std::vector<Lanes> powers_;

@@ -49,6 +49,21 @@ std::span<Lanes> FourTransforms::input() {
     return buffers_->input;
 }
 
+void FourTransforms::load(const std::array<const float*, 4>& frames, std::span<const float> window) {
+    const std::span<Lanes> input = buffers_->input;
+    std::size_t i = 0;
+    for (; i + 4 <= input.size(); i += 4) {
+        std::array<Lanes, 4> rows;
+        for (std::size_t k = 0; k < 4; ++k) rows[k] = lanesAt(frames[k] + i) * lanesAt(&window[i]);
+        transpose(rows);
+        std::copy(rows.begin(), rows.end(), &input[i]);
+    }
+    for (; i < input.size(); ++i) {
+        const Lanes::Vector four = {frames[0][i], frames[1][i], frames[2][i], frames[3][i]};
+        input[i] = Lanes(four) * window[i];
+    }
+}
+
 std::span<const std::complex<Lanes>> FourTransforms::transform() {
     buffers_->plan.transform_real(buffers_->input.data(), buffers_->bins.data());
     return buffers_->bins;

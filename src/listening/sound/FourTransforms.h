@@ -2,6 +2,7 @@
 
 #include "platform/base/Lanes.h"
 
+#include <array>
 #include <complex>
 #include <cstddef>
 #include <memory>
@@ -28,6 +29,8 @@ class FourTransforms {
     std::size_t size() const;
     /// The frames, to be written before each transform. It keeps what was written.
     std::span<Lanes> input();
+    /// Writes four frames under a window. REQUIRES: size() samples at each pointer and in the window.
+    void load(const std::array<const float*, 4>& frames, std::span<const float> window);
     /// Half as many bins as a frame has samples, valid until the next call. The first one holds the amplitude
     /// at half the rate as its imaginary part.
     std::span<const std::complex<Lanes>> transform();

@@ -1,6 +1,8 @@
 #pragma once
 
+#include <array>
 #include <cmath>
+#include <cstring>
 #include <type_traits>
 
 namespace qvct {
@@ -58,6 +60,25 @@ inline Lanes squareRoot(Lanes a) {
     Lanes roots;
     for (int i = 0; i < 4; ++i) roots.v[i] = std::sqrt(a.v[i]);
     return roots;
+}
+
+/// Four floats in a row, from any place.
+inline Lanes lanesAt(const float* values) {
+    Lanes lanes;
+    std::memcpy(&lanes.v, values, sizeof lanes.v);
+    return lanes;
+}
+
+/// What was lane i of row k becomes lane k of row i.
+inline void transpose(std::array<Lanes, 4>& rows) {
+    const auto low01 = __builtin_shufflevector(rows[0].v, rows[1].v, 0, 4, 1, 5);
+    const auto high01 = __builtin_shufflevector(rows[0].v, rows[1].v, 2, 6, 3, 7);
+    const auto low23 = __builtin_shufflevector(rows[2].v, rows[3].v, 0, 4, 1, 5);
+    const auto high23 = __builtin_shufflevector(rows[2].v, rows[3].v, 2, 6, 3, 7);
+    rows[0] = Lanes(__builtin_shufflevector(low01, low23, 0, 1, 4, 5));
+    rows[1] = Lanes(__builtin_shufflevector(low01, low23, 2, 3, 6, 7));
+    rows[2] = Lanes(__builtin_shufflevector(high01, high23, 0, 1, 4, 5));
+    rows[3] = Lanes(__builtin_shufflevector(high01, high23, 2, 3, 6, 7));
 }
 
 /// Binary logarithm to about 0.006, for finite values of at least 1.
