@@ -277,6 +277,20 @@ TEST(Names, TellKeyTempoAndKindWhereTheyStand) {
         {"Bassline124F#m", "FSharp", "Minor", 124},
         {"DnB 174 Am", "A", "Minor", 174},
         {"Cello_Fs3", "", ""},
+        {"Foley Loop_140BPM (89)", "", "", 140, SoundKind::loop},
+        {"choir e 140bpm", "E", "", 140},
+        {"how to be a 140bpm choir", "", "", 140},
+        {"Bass_Loop_80_D_125bpm", "D", "", 125, SoundKind::loop},
+        {"Synth Loop 6d 126", "", "", 126, SoundKind::loop},
+        {"B9-Am", "A", "Minor"},
+        {"B9-A", "", ""},
+        {"Piano B9 Am", "", ""},
+        {"Stab_Cm9", "C", "Minor"},
+        {"Pad_Grains_Am_Data", "A", "Minor"},
+        {"Loop124", "", "", 124, SoundKind::loop},
+        {"Loop64", "", "", 0, SoundKind::loop},
+        {"SH101 Loop", "", "", 0, SoundKind::loop},
+        {"xy123_Loop 99", "", "", 99, SoundKind::loop},
     };
     for (const auto& row : rows) {
         const NameReading reading = readingOf(row.name);

@@ -44,7 +44,9 @@ class KeyChoice {
     /// alone in brackets or at the end; one layer of an instrument plays a note. "A Day", "Take C", "3 AM"
     /// and "Plan B" are none.
     bool canStand(const ScannedKey& key) const {
-        if (its_.hasNote || key.isVariant || areInitials(key)) return false;
+        const bool isLetter = key.key.mode == NamedKey::Mode::unsaid && !key.key.hasAccidental;
+        if (its_.hasNote && (isLetter || !its_.beginsWithNote)) return false;
+        if (key.isVariant || areInitials(key)) return false;
         if (key.isAnnounced) return true;
         const bool isOfMusic = its_.isLoop || its_.tempo.has_value();
         if (its_.isLayer && !isOfMusic) return false;
@@ -87,7 +89,8 @@ class KeyChoice {
     bool isBetweenMarks(const ScannedKey& key) const {
         const std::size_t behind = key.piece + key.key.pieces;
         if (key.piece == 0 || behind >= its_.pieces.size()) return false;
-        if (its_.pieces[key.piece].folded == "am" && its_.pieces[behind].isWord()) return false;
+        const bool isVerb = its_.pieces[key.piece].folded == "am" && !its_.hasPitched;
+        if (isVerb && its_.pieces[behind].isWord()) return false;
         const auto isMark = [this](std::uint32_t at) { return its_.name[at] == '_' || its_.name[at] == '-'; };
         return isMark(its_.pieces[key.piece].offset - 1) && isMark(its_.pieces[behind - 1].end());
     }
@@ -117,14 +120,19 @@ class KeyChoice {
             return number && its_.tempo && *number == std::floor(*its_.tempo);
         };
         if (isLoneLetter(before) || (next != nullptr && isLoneLetter(*next))) return true;
-        if (before.isNumber() && !isTempo(before)) return true;
+        // "80_D_125bpm"; the first ones rather tell which of several.
+        const NamePiece& letter = its_.pieces[key.piece];
+        const bool isBeforeTempo =
+            next != nullptr && isTempo(*next) && !letter.isJoined && letter.folded > "b";
+        if (before.isNumber() && !isTempo(before) && !isBeforeTempo) return true;
         return next != nullptr && next->isNumber() && next->isJoined && !isTempo(*next);
     }
 
-    /// "bass_loop_120_g", but not "how_to_be_a_120".
+    /// "bass_loop_120_g" and "choir e 140bpm", but not "how_to_be_a_120".
     bool isBesideTempo(const ScannedKey& key) const {
         const auto bpm = its_.tempo;
-        if (!its_.isLoop || !bpm || its_.pieces[key.piece].folded == "a") return false;
+        const bool isOfMusic = its_.isLoop || key.isBehindPitched;
+        if (!bpm || !isOfMusic || its_.pieces[key.piece].folded == "a") return false;
         const auto isTempo = [&](std::size_t at) {
             const auto number =
                 at < its_.pieces.size() ? numberAt(its_.pieces.subspan(at, 1), its_.name) : std::nullopt;

@@ -28,11 +28,12 @@ struct KeyContext {
     std::optional<double> tempo = std::nullopt;
     bool isFolder = false;
     bool isLoop = false;
-    bool isLayer = false;     ///< It says which layer of an instrument it is.
-    bool hasNote = false;     ///< "C3", of one note of an instrument.
-    bool hasMeaning = false;  ///< Some word stands for a tag.
-    bool hasPitched = false;  ///< One of these is of something with a pitch.
-    bool hasNumber = false;   ///< One that may be a tempo.
+    bool isLayer = false;         ///< It says which layer of an instrument it is.
+    bool hasNote = false;         ///< "C3", of one note of an instrument.
+    bool beginsWithNote = false;  ///< Which may number it: "B9-Am".
+    bool hasMeaning = false;      ///< Some word stands for a tag.
+    bool hasPitched = false;      ///< One of these is of something with a pitch.
+    bool hasNumber = false;       ///< One that may be a tempo.
 };
 
 /// The key that a name states; nothing when none can stand where it does, or several are stated.

@@ -89,8 +89,10 @@ std::size_t NameScan::readWord(std::size_t at, const Word& word) {
     addMeant(word, offset, end);
     if (word.pieces > 1) addWordsIn(word, pieces_.subspan(at, word.pieces));
     if (word.role == NameRole::silent) silences_.emplace_back(offset, end);
-    if (word.role == NameRole::tempo && !tempos_.empty() && tempos_.back().end == at)
+    if (word.role == NameRole::tempo && !tempos_.empty() && tempos_.back().end == at) {
         tempos_.back().isSaid = true;
+        behindTempo_ = behind;
+    }
     const bool isUnit =
         word.role == NameRole::unit || word.role == NameRole::bars || word.role == NameRole::beats;
     const bool isOfNumber = isUnit && at > 0 && behindNumber_ == at;
@@ -169,7 +171,9 @@ void NameScan::addWordsIn(const Word& phrase, std::span<const NamePiece> pieces)
 
 std::size_t NameScan::readKey(std::size_t at, const NamedKey& key) {
     // The fifth in "Cm7b5" is no note.
-    hasNote_ = hasNote_ || (key.hasOctave && !pieces_[at].isJoined);
+    const bool isNote = key.hasOctave && !pieces_[at].isJoined;
+    hasNote_ = hasNote_ || isNote;
+    beginsWithNote_ = beginsWithNote_ || (isNote && at == 0);
     // "Pad D", "Drone in D"
     const std::size_t front = at > 1 && pieces_[at - 1].folded == "in" ? at - 1 : at;
     const bool isBehindPitched =
@@ -210,7 +214,8 @@ std::size_t NameScan::readNumber(std::size_t at) {
     // What a pack's number counts is none of the sound: "Vol 2 Beats".
     if (before_ != NameRole::pack) behindNumber_ = at + read;
     if (!number || *number < kSlowest || *number > kFastest) return read;
-    const bool isSaid = before_ == NameRole::tempo;
+    // Of "140bpm (89)" only the first is.
+    const bool isSaid = before_ == NameRole::tempo && behindTempo_ != at;
     // "TR808", "v124": part of a word, but not of one in "Am120bpm", "120Am" and "Bassline120F#m".
     const Pieces rest = pieces_.subspan(at + read);
     const bool isJoinedOn = !rest.empty() && rest.front().isJoined;
@@ -250,13 +255,24 @@ std::optional<double> NameScan::tempo(SoundKind kind) const {
     const bool isOfLoop = kind == SoundKind::loop && (owner_ == Owner::item || pieces_.size() == 1);
     if ((!isLoop() && !hasSureKey && !isOfLoop && !saysPassage()) || this->kind() == SoundKind::oneShot)
         return std::nullopt;
-    std::optional<double> alone;
+    if (const auto number = onlyNumber([](const Tempo& tempo) { return !tempo.isPartOfWord; })) return number;
+    // "Loop124", but no "Loop64" and no "SH101 Loop".
+    constexpr double slowest = 111;
+    const bool isItem =
+        owner_ == Owner::item && (isLoop() || isOfLoop || hasSureKey) && possibleTempos().empty();
+    if (!isItem) return std::nullopt;
+    return onlyNumber([](const Tempo& tempo) { return tempo.number >= slowest; });
+}
+
+/// Of those that can be a tempo.
+std::optional<double> NameScan::onlyNumber(bool (*counts)(const Tempo&)) const {
+    std::optional<double> only;
     for (const Tempo& tempo : tempos_) {
-        if (tempo.isPartOfWord || !canStandAlone(tempo.number)) continue;
-        if (alone && *alone != tempo.number) return std::nullopt;
-        alone = tempo.number;
+        if (!counts(tempo) || !canStandAlone(tempo.number)) continue;
+        if (only && *only != tempo.number) return std::nullopt;
+        only = tempo.number;
     }
-    return alone;
+    return only;
 }
 
 /// More than a letter, which may be any; or a letter where packs put the key.
@@ -307,6 +323,7 @@ std::optional<NamedKey> NameScan::key(std::optional<double> tempo) const {
     context.isLoop = isLoop();
     context.isLayer = isLayer_;
     context.hasNote = hasNote_;
+    context.beginsWithNote = beginsWithNote_;
     context.hasMeaning = !meant_.empty();
     context.hasPitched = saysPitched();
     context.hasNumber =

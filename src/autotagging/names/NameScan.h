@@ -84,6 +84,7 @@ class NameScan {
     std::size_t readPacked(std::size_t at);
     bool isLoop() const { return saysLoop_ || bars_ || beats_; }
     bool isTempoWord(std::size_t at) const;
+    std::optional<double> onlyNumber(bool (*counts)(const Tempo&)) const;
     bool isMinorKey(std::size_t at) const;
     bool isSharpNote(std::size_t at) const;
     bool isSure(const ScannedKey& key) const;
@@ -105,8 +106,10 @@ class NameScan {
     std::optional<int> bars_, beats_;
     int unknownWords_ = 0;
     std::size_t behindNumber_ = 0;      // the piece behind the last one that was read
+    std::size_t behindTempo_ = 0;       // the same of the last number with "bpm" behind it
     NameRole before_ = NameRole::none;  // of the word before the piece at hand
     bool saysLoop_ = false, saysOneShot_ = false, isOfPack_ = false, hasNote_ = false, isLayer_ = false;
+    bool beginsWithNote_ = false;
 };
 
 }  // namespace qvct

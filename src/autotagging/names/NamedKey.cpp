@@ -70,6 +70,7 @@ class KeyParser {
         }
         if (!rest.empty() && !takeMode(rest)) return std::nullopt;
         if (key_.mode == NamedKey::Mode::unsaid && !key_.isSpelledOut) takeFollowing();
+        if (key_.mode != NamedKey::Mode::unsaid) takeFigure();
         return key_;
     }
 
@@ -131,6 +132,16 @@ class KeyParser {
         std::string buffer;
         const NamingHabits::Word word = habits_.wordAt(pieces_.subspan(key_.pieces), buffer);
         if (word.pieces > 0 && takeMode(word.role)) key_.pieces += word.pieces;
+    }
+
+    /// Of a chord: "Cm9".
+    void takeFigure() {
+        if (!has(key_.pieces) || !next().isJoined) return;
+        for (const std::string_view figure : {"6", "7", "9", "11", "13"})
+            if (next().text == figure) {
+                ++key_.pieces;
+                return;
+            }
     }
 
     void takeSign() {
