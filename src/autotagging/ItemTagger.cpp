@@ -3,7 +3,7 @@
 #include "autotagging/ContentItem.h"
 #include "autotagging/QVTaggingAggregator.h"
 #include "autotagging/names/NameReader.h"
-#include "autotagging/names/TempoByLength.h"
+#include "autotagging/names/TempoChoice.h"
 #include "autotagging/services/QVCTAutoTaggingService.h"
 #include "listening/HeardSound.h"
 #include "media/loopfile/LCFileData.h"

@@ -15,12 +15,6 @@ using Word = NamingHabits::Word;
 constexpr std::string_view kPart = "Part";  // the category
 constexpr double kSlowest = 40, kFastest = 250;
 
-/// What stands alone, without "bpm", is a tempo only in the range of dance and film music.
-bool canStandAlone(double tempo) {
-    constexpr double slowest = 60, fastest = 190;
-    return tempo >= slowest && tempo <= fastest;
-}
-
 }  // namespace
 
 NameScan::NameScan(const NamingHabits& habits, std::string_view name, Pieces pieces, Owner owner,
@@ -242,77 +236,27 @@ std::size_t NameScan::readPacked(std::size_t at) {
 
 std::optional<double> NameScan::tempo(SoundKind kind) const {
     if (tempos_.empty()) return std::nullopt;
-    std::optional<double> said;
-    for (const Tempo& tempo : tempos_) {
-        if (!tempo.isSaid) continue;
-        if (said && *said != tempo.number) return std::nullopt;
-        said = tempo.number;
-    }
-    if (said) return said;
-    const bool hasSureKey =
-        std::any_of(keys_.begin(), keys_.end(), [this](const ScannedKey& key) { return isSure(key); });
+    TempoContext context{name_, pieces_, keys_};
+    context.isItem = owner_ == Owner::item;
     // "Drum Loops/MK_120_shade", and the folder in "Jungle/160/think loop"
-    const bool isOfLoop = kind == SoundKind::loop && (owner_ == Owner::item || pieces_.size() == 1);
-    if ((!isLoop() && !hasSureKey && !isOfLoop && !saysPassage()) || this->kind() == SoundKind::oneShot)
-        return std::nullopt;
-    if (const auto number = onlyNumber([](const Tempo& tempo) { return !tempo.isPartOfWord; })) return number;
-    // "Loop124", but no "Loop64" and no "SH101 Loop".
-    constexpr double slowest = 111;
-    const bool isItem =
-        owner_ == Owner::item && (isLoop() || isOfLoop || hasSureKey) && possibleTempos().empty();
-    if (!isItem) return std::nullopt;
-    return onlyNumber([](const Tempo& tempo) { return tempo.number >= slowest; });
-}
-
-/// Of those that can be a tempo.
-std::optional<double> NameScan::onlyNumber(bool (*counts)(const Tempo&)) const {
-    std::optional<double> only;
-    for (const Tempo& tempo : tempos_) {
-        if (!counts(tempo) || !canStandAlone(tempo.number)) continue;
-        if (only && *only != tempo.number) return std::nullopt;
-        only = tempo.number;
-    }
-    return only;
-}
-
-/// More than a letter, which may be any; or a letter where packs put the key.
-bool NameScan::isSure(const ScannedKey& key) const {
-    const NamePiece& last = pieces_[key.piece + key.key.pieces - 1];
-    const bool hasSignWord = key.key.hasAccidental && key.key.pieces > 1 && last.isWord();
-    return key.key.mode != NamedKey::Mode::unsaid || key.key.isSpelledOut || key.isAnnounced ||
-           last.kind == NamePiece::Kind::sharp || hasSignWord || isBesideNumber(key);
-}
-
-/// "90_Bb_Strange_Piano", "static-synth-C-138", "(96)_G"; "Bass_101_B" is the second of them.
-bool NameScan::isBesideNumber(const ScannedKey& key) const {
-    const char letter = pieces_[key.piece].text.front();
-    if (letter < 'A' || letter > 'G' || (letter < 'C' && !key.key.hasAccidental)) return false;
-    const std::size_t behind = key.piece + key.key.pieces;
-    const auto isMark = [this](std::uint32_t at) { return name_[at] == '_' || name_[at] == '-'; };
-    const std::uint32_t end = pieces_[behind - 1].end();
-    if (key.piece == 0 || !isMark(pieces_[key.piece].offset - 1)) return false;
-    if (end < name_.size() && !isMark(end)) return false;
-    const bool isOfPitched = saysPitched();
-    return std::any_of(tempos_.begin(), tempos_.end(), [&](const Tempo& tempo) {
-        return !tempo.isPartOfWord && (tempo.end == key.piece || tempo.end == behind + 1) &&
-               (isOfPitched || pieces_[tempo.end - 1].isInBrackets);
-    });
+    const bool isOfLoop = kind == SoundKind::loop && (context.isItem || pieces_.size() == 1);
+    context.isLoop = isLoop() || isOfLoop;
+    context.isOneShot = this->kind() == SoundKind::oneShot;
+    context.isPassage = saysPassage();
+    context.hasPitched = saysPitched();
+    return chosenTempo(tempos_, context);
 }
 
 std::vector<double> NameScan::possibleTempos() const {
-    std::vector<double> numbers;
-    if (kind() == SoundKind::oneShot) return numbers;
-    for (const Tempo& tempo : tempos_)
-        if (!tempo.isPartOfWord && canStandAlone(tempo.number)) numbers.push_back(tempo.number);
-    return numbers;
+    return kind() == SoundKind::oneShot ? std::vector<double>{} : lonelyTempos(tempos_);
 }
 
 std::optional<double> NameScan::tempoWith(const NameScan& folder) const {
-    if (folder.pieces_.size() != 1 || folder.tempos_.empty()) return std::nullopt;
+    if (folder.pieces_.size() != 1 || lonelyTempos(folder.tempos_).empty()) return std::nullopt;
     const double number = folder.tempos_.front().number;
     const bool isHere = std::any_of(tempos_.begin(), tempos_.end(),
-                                    [number](const Tempo& tempo) { return tempo.number == number; });
-    return isHere && canStandAlone(number) ? std::optional(number) : std::nullopt;
+                                    [number](const ScannedTempo& tempo) { return tempo.number == number; });
+    return isHere ? std::optional(number) : std::nullopt;
 }
 
 std::optional<NamedKey> NameScan::key(std::optional<double> tempo) const {
@@ -326,12 +270,11 @@ std::optional<NamedKey> NameScan::key(std::optional<double> tempo) const {
     context.beginsWithNote = beginsWithNote_;
     context.hasMeaning = !meant_.empty();
     context.hasPitched = saysPitched();
-    context.hasNumber =
-        std::any_of(tempos_.begin(), tempos_.end(), [](const Tempo& its) { return !its.isPartOfWord; });
+    context.hasNumber = std::any_of(tempos_.begin(), tempos_.end(),
+                                    [](const ScannedTempo& its) { return !its.isPartOfWord; });
     return chosenKey(keys_, context);
 }
 
-/// Music that is played, which has a tempo as a loop has: "Melody 120".
 bool NameScan::saysPassage() const {
     return std::any_of(meant_.begin(), meant_.end(), [&](const Meant& meant) {
         const NamedMeaning& meaning = habits_.meaning(meant.word.meaning);

@@ -5,6 +5,7 @@
 #include "autotagging/names/NamePieces.h"
 #include "autotagging/names/NamedKey.h"
 #include "autotagging/names/NamingHabits.h"
+#include "autotagging/names/TempoChoice.h"
 
 #include <optional>
 #include <span>
@@ -25,13 +26,6 @@ class NameScan {
         std::uint32_t offset;  ///< In the name, in bytes.
         std::uint32_t end;
         bool isOfPrefix = false;
-    };
-    /// A number that may be a tempo.
-    struct Tempo {
-        double number;
-        bool isSaid;        ///< "bpm" stands beside it.
-        bool isPartOfWord;  ///< "TR808", "drm80"
-        std::size_t end;    ///< The piece behind it.
     };
     /// Whose name it is: only an item's begins with the code of a category.
     enum class Owner : std::uint8_t { item, folder };
@@ -84,11 +78,8 @@ class NameScan {
     std::size_t readPacked(std::size_t at);
     bool isLoop() const { return saysLoop_ || bars_ || beats_; }
     bool isTempoWord(std::size_t at) const;
-    std::optional<double> onlyNumber(bool (*counts)(const Tempo&)) const;
     bool isMinorKey(std::size_t at) const;
     bool isSharpNote(std::size_t at) const;
-    bool isSure(const ScannedKey& key) const;
-    bool isBesideNumber(const ScannedKey& key) const;
     bool saysPassage() const;
     bool saysPitched() const;
 
@@ -100,7 +91,7 @@ class NameScan {
     std::vector<Meant> meant_;
     std::vector<std::pair<std::uint32_t, std::uint32_t>> silences_;
     std::vector<ScannedKey> keys_;
-    std::vector<Tempo> tempos_;
+    std::vector<ScannedTempo> tempos_;
     std::span<const NamingHabits::Word> prefix_;
     std::pair<std::uint32_t, std::uint32_t> makers_ = {0, 0};  // who they are is no sound
     std::optional<int> bars_, beats_;
