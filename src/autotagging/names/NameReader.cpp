@@ -74,12 +74,13 @@ NameReading NameReader::read(std::span<const std::string_view> names, std::strin
         addMeant(reading, folder, static_cast<int>(i));
         addNumbers(reading, folder);
         if (!sharedTempo) sharedTempo = item.tempoWith(folder);
-        if (keyOfFolder) continue;
+        if (keyOfFolder || !folder.mayHaveKey()) continue;
         keyOfFolder = folder.key(folder.tempo());
         folderOfKey = i;
     }
     // What the name itself says holds whatever its folders say; they may say that it is a loop.
-    const auto tempo = sharedTempo ? sharedTempo : item.tempo(reading.kind);
+    auto tempo = sharedTempo;
+    if (!tempo && (!reading.tempo || item.mayHaveKey())) tempo = item.tempo(reading.kind);
     if (!reading.tempo) reading.tempo = tempo;
     if (!reading.tempo) reading.possibleTempos = item.possibleTempos();
     if (const auto key = item.key(tempo))

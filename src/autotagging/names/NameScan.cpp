@@ -242,8 +242,8 @@ std::optional<double> NameScan::tempo(SoundKind kind) const {
     const bool isOfLoop = kind == SoundKind::loop && (context.isItem || pieces_.size() == 1);
     context.isLoop = isLoop() || isOfLoop;
     context.isOneShot = this->kind() == SoundKind::oneShot;
-    context.isPassage = saysPassage();
-    context.hasPitched = saysPitched();
+    context.isPassage = !context.isLoop && saysPassage();
+    context.hasPitched = !keys_.empty() && saysPitched();
     return chosenTempo(tempos_, context);
 }
 
@@ -252,7 +252,8 @@ std::vector<double> NameScan::possibleTempos() const {
 }
 
 std::optional<double> NameScan::tempoWith(const NameScan& folder) const {
-    if (folder.pieces_.size() != 1 || lonelyTempos(folder.tempos_).empty()) return std::nullopt;
+    if (tempos_.empty() || folder.pieces_.size() != 1 || lonelyTempos(folder.tempos_).empty())
+        return std::nullopt;
     const double number = folder.tempos_.front().number;
     const bool isHere = std::any_of(tempos_.begin(), tempos_.end(),
                                     [number](const ScannedTempo& tempo) { return tempo.number == number; });

@@ -58,6 +58,7 @@ class NameScan {
     std::vector<double> possibleTempos() const;
     /// The number that a folder is called by, if it stands in the name as well: "80/drm80_hat".
     std::optional<double> tempoWith(const NameScan& folder) const;
+    bool mayHaveKey() const { return !keys_.empty(); }
     /// `tempo`: of what has the name.
     std::optional<NamedKey> key(std::optional<double> tempo) const;
 
