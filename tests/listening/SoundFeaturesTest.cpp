@@ -146,7 +146,8 @@ TEST(PartialTones, FindsTheFundamentalAndWhatIsHarmonic) {
 
 TEST(SoundFeatures, LoudnessAndSilenceBeforeDoNotMatter) {
     SoundFeatures features(kRate);
-    const Sound loud = drum();
+    Sound loud = drum();
+    loud.front() = 0;  // where it is off the middle, that is taken for an offset
     Sound quiet(1000, 0), opposite;
     for (const float sample : loud) quiet.push_back(0.05F * sample);
     for (const float sample : loud) opposite.push_back(-sample);
@@ -155,6 +156,19 @@ TEST(SoundFeatures, LoudnessAndSilenceBeforeDoNotMatter) {
     EXPECT_THAT(features.of(quiet), testing::Pointwise(testing::FloatNear(0.02F), expected));
     EXPECT_THAT(features.of(opposite), testing::Pointwise(testing::FloatNear(0.02F), expected));
     EXPECT_EQ(features.of(loud), expected);  // nothing is left of the sounds before
+}
+
+TEST(SoundFeatures, AnOffsetFromTheFirstSampleOnDoesNotMatter) {
+    SoundFeatures features(kRate);
+    Sound rest(200, 0);
+    for (const float sample : drum()) rest.push_back(sample);
+    rest.resize(rest.size() + 2'205);
+    const auto expected = features.of(rest);
+    for (const float offset : {0.02F, -0.05F}) {
+        Sound shifted;
+        for (const float sample : rest) shifted.push_back(sample + offset);
+        EXPECT_THAT(features.of(shifted), testing::Pointwise(testing::FloatNear(0.02F), expected)) << offset;
+    }
 }
 
 TEST(SoundFeatures, SayNothingOfSilence) {

@@ -56,7 +56,7 @@ def options() -> Options:
         ("likeness", "the model of likeness to write"),
         ("recordings", "folder of labelled recordings (labels.tsv)"),
         ("machines", "folder of drum machines' sounds"),
-        ("live-coding", "samples of Debian's sonic-pi-samples"),
+        ("live-coding", "samples of supersonic-scsynth-samples"),
         ("toolkit", "waves of Debian's stk"),
         ("fluid", "FluidR3_GM.sf2"),
         ("musescore", "MuseScore_General_Full.sf3"),

@@ -5,7 +5,7 @@ from collections.abc import Callable
 import numpy as np
 from scipy import signal
 
-from .dsp import RATE, Random, Sound, ambience, chance, decay, high_pass, log_uniform, low_pass, noise
+from .dsp import RATE, Random, Sound, ambience, chance, faded, high_pass, log_uniform, low_pass, noise
 
 
 def resampled(sound: Sound, factor: float) -> Sound:
@@ -37,7 +37,7 @@ def coarse(random: Random, sound: Sound) -> Sound:
 
 def dying_away(random: Random, sound: Sound) -> Sound:
     """Under an envelope that falls."""
-    return sound * decay(np.arange(len(sound)) / RATE, log_uniform(random, 0.3, 3))
+    return sound * faded(random, np.arange(len(sound)) / RATE, log_uniform(random, 0.3, 3))
 
 
 def overdriven(random: Random, sound: Sound) -> Sound:
@@ -77,6 +77,11 @@ def ended(random: Random, sound: Sound) -> Sound:
     return sound
 
 
+def shifted(random: Random, sound: Sound) -> Sound:
+    """Off the middle, as converters of early samplers are."""
+    return np.asarray(sound + random.choice([-1, 1]) * log_uniform(random, 0.002, 0.1) * np.max(np.abs(sound)))
+
+
 def floor(random: Random, sound: Sound) -> Sound:
     """Hiss, hum and rumble under the sound."""
     under = noise(random, len(sound)) * log_uniform(random, 1e-5, 5e-3)
@@ -98,6 +103,7 @@ def augmented(random: Random, sound: Sound, most_octaves: float, strength: float
         (0.25, cut),
         (0.85, ended),
         (0.4, floor),
+        (0.2, shifted),
     ]
     if chance(random, 0.85):
         out = resampled(out, 2 ** random.uniform(-most_octaves, most_octaves))

@@ -14,12 +14,14 @@ from .dsp import (
     band,
     chance,
     decay,
+    faded,
     high_pass,
     log_uniform,
     modes,
     noise,
     peaked,
     phase,
+    resonance,
     sine,
     spread,
     square,
@@ -72,12 +74,29 @@ def wash(random: Random, t: Sound, seconds: float) -> Sound:
     return out / (np.std(out) + 1e-9)
 
 
+def ringing(random: Random, t: Sound) -> Sound:
+    """Noise or metal through one or two tuned circuits, as in the first machines."""
+    out = noise(random, len(t)) if chance(random, 0.6) else metal(random, t)
+    f = log_uniform(random, 2800, 11000)
+    for _ in range(int(random.integers(1, 3))):
+        out = resonance(out, f * random.uniform(0.85, 1.2), log_uniform(random, 0.8, 8))
+    if chance(random, 0.6):
+        out = high_pass(out, f * random.uniform(0.3, 1.2), int(random.integers(1, 3)))
+    return out / (np.std(out) + 1e-9)
+
+
+def machine_attack(random: Random, t: Sound) -> Sound:
+    """At once, or as slowly as a capacitor is charged."""
+    return attack(t, log_uniform(random, 0.001, 0.03)) if chance(random, 0.4) else np.ones_like(t)
+
+
 def hat(random: Random, t: Sound, seconds: float) -> Sound:
     if chance(random, 0.4):  # recorded: the body of the cymbals is heard, and the stick
         out = high_pass(wash(random, t, seconds), log_uniform(random, 150, 6000), int(random.integers(1, 3)))
         body = band(noise(random, len(t)), log_uniform(random, 200, 800), log_uniform(random, 1000, 4000))
         return out + log_uniform(random, 0.02, 0.6) * peaked(body * decay(t, log_uniform(random, 0.02, 0.2)))
-    return bright(random, metal(random, t), 2000, 9500) * decay(t, seconds, random.uniform(0.6, 1.4))
+    source = ringing(random, t) if chance(random, 0.35) else bright(random, metal(random, t), 2000, 9500)
+    return source * faded(random, t, seconds) * machine_attack(random, t)
 
 
 def closed_hat(random: Random) -> Sound:
@@ -130,6 +149,8 @@ def cymbal(random: Random) -> Sound:
     if chance(random, 0.4):
         return wash(random, t, seconds) * attack(t, log_uniform(random, 0.0005, 0.02))
     source = metal(random, t)
+    if chance(random, 0.3):
+        return ringing(random, t) * faded(random, t, seconds) * machine_attack(random, t)
     out = bright(random, source, 500, 5000) * decay(t, seconds, random.uniform(0.5, 1.1))
     return out + random.uniform(0, 1) * bright(random, source, 5000, 9000) * decay(t, seconds * random.uniform(0.3, 1))
 

@@ -13,6 +13,7 @@ from .dsp import (
     band,
     chance,
     decay,
+    faded,
     high_pass,
     log_uniform,
     low_pass,
@@ -20,6 +21,7 @@ from .dsp import (
     noise,
     peaked,
     phase,
+    resonance,
     sine,
     spread,
     struck,
@@ -85,7 +87,7 @@ def kick(random: Random) -> Sound:
 
 
 def tom(random: Random) -> Sound:
-    seconds = log_uniform(random, 0.15, 1.3)
+    seconds = log_uniform(random, 0.1, 1.3)
     t = times(seconds)
     body = drum_body(random, t, log_uniform(random, 68, 330), random.choice([1.15, 1.6, 3]), seconds)
     body += random.choice([0, 0.1, 0.4]) * random.random() * click(random, t)
@@ -98,7 +100,7 @@ def tom(random: Random) -> Sound:
 def snare(random: Random) -> Sound:
     seconds = log_uniform(random, 0.09, 0.7)
     t = times(seconds)
-    pitch = log_uniform(random, 120, 360)
+    pitch = log_uniform(random, 95, 380)
     f = glide(random, t, pitch, random.choice([1.1, 2, 3]))
     ring = seconds * random.uniform(0.2, 0.9)
     body = sine(phase(f, len(t))) * decay(t, ring)
@@ -120,7 +122,7 @@ def snare(random: Random) -> Sound:
     else:  # a filter that closes, as of electronic drums; or dull from the start
         top = log_uniform(random, 2000, 12000)
         wires = swept_low_pass(wires, top * random.uniform(0.05, 1) + top * decay(t, seconds), random.uniform(0.6, 2))
-    wires = wires * decay(t, seconds * random.uniform(0.5, 1), random.uniform(0.6, 1.2))
+    wires = wires * faded(random, t, seconds * random.uniform(0.5, 1))
     if chance(random, 0.3):
         wires *= attack(t, random.uniform(0.001, 0.012))
     wires /= np.max(np.abs(wires)) + 1e-9
@@ -136,12 +138,14 @@ def electronic_claps(random: Random) -> Sound:
     middle, width = log_uniform(random, 650, 2800), random.uniform(0.25, 1.4)
     envelope = np.zeros_like(t)
     gap, start = random.uniform(0.006, 0.018), 0.0
-    for _ in range(int(random.choice([1, 2, 3, 3, 4, 4, 5]))):
+    for _ in range(int(random.choice([3, 3, 4, 4, 5]))):
         later = np.maximum(t - start, 0)
         stroke = (t >= start) * decay(later, gap * random.uniform(1, 6)) * random.uniform(0.5, 1)
         envelope = np.maximum(envelope, stroke)
         start += gap * random.uniform(0.75, 1.25)
-    tail = np.where(t >= start - gap, decay(np.maximum(t - start + gap, 0), seconds * random.uniform(0.4, 1)), 0)
+    tail = np.where(
+        t >= start - gap, faded(random, np.maximum(t - start + gap, 0), seconds * random.uniform(0.4, 1)), 0
+    )
     envelope = np.maximum(envelope, tail * random.uniform(0.1, 1))
     sound = noise(random, len(t))
     if chance(random, 0.3):
@@ -151,9 +155,9 @@ def electronic_claps(random: Random) -> Sound:
 
 def hand_claps(random: Random) -> Sound:
     """Some people in a room, not quite together; each pair of hands has a hollow of its own."""
-    t = times(log_uniform(random, 0.12, 0.5))
-    out, apart = np.zeros_like(t), log_uniform(random, 0.002, 0.015)
-    for _ in range(int(random.choice([1, 2, 3, 5, 8, 12]))):
+    t = times(log_uniform(random, 0.15, 0.5))
+    out, apart = np.zeros_like(t), log_uniform(random, 0.004, 0.02)
+    for _ in range(int(random.choice([3, 4, 5, 8, 12]))):
         later = t - abs(random.normal(0, apart))
         middle = log_uniform(random, 700, 3200)
         one = band(noise(random, len(t)), middle / 1.5, middle * 1.5) + 0.3 * band(noise(random, len(t)), 400, 10000)
@@ -189,9 +193,23 @@ def side_stick(random: Random) -> Sound:
         rattle = high_pass(noise(random, len(t)), log_uniform(random, 1500, 6000)) * decay(t, t[-1])
         out += log_uniform(random, 0.01, 0.3) * peaked(rattle)
     if chance(random, 0.5):
-        head = sine(phase(log_uniform(random, 140, 350), len(t))) * decay(t, log_uniform(random, 0.03, 0.2))
-        out += random.uniform(0, 0.6) * head
+        head = sine(phase(log_uniform(random, 140, 520), len(t))) * decay(t, log_uniform(random, 0.03, 0.2))
+        out += random.uniform(0, 1.0) * head
+    if chance(random, 0.5):  # the tip lands before the shaft
+        late = int(random.uniform(0.001, 0.009) * RATE)
+        out = np.concatenate([np.zeros(late), out[:-late]]) + random.uniform(0.05, 0.6) * click(random, t)
     return ambience(random, out) if chance(random, 0.8) else out
+
+
+def short_stick(random: Random) -> Sound:
+    """As early samplers kept it: a burst about one tone, at any speed of the tape or clock, and cut short."""
+    seconds = log_uniform(random, 0.03, 0.2)
+    t = times(seconds * random.uniform(0.7, 1.2))
+    low = log_uniform(random, 350, 2400)
+    out = peaked(resonance(noise(random, len(t)), low, log_uniform(random, 0.7, 6)) * decay(t, seconds))
+    rung = low * np.concatenate([[1.0], random.uniform(0.5, 4, int(random.integers(1, 6)))])
+    out += log_uniform(random, 0.1, 3) * struck(random, t, rung, seconds, log_uniform(random, 1500, 9000))
+    return drive(random, out * attack(t, log_uniform(random, 0.0003, 0.008)))
 
 
 def rim_shot(random: Random) -> Sound:
@@ -203,8 +221,8 @@ def rim_shot(random: Random) -> Sound:
 
 
 def rim(random: Random) -> Sound:
-    kind = random.random()
-    return electronic_rim(random) if kind < 0.45 else side_stick(random) if kind < 0.85 else rim_shot(random)
+    voices = [electronic_rim, side_stick, short_stick, rim_shot]
+    return voices[int(random.choice(4, p=[0.3, 0.4, 0.2, 0.1]))](random)
 
 
 VOICES: dict[str, Callable[[Random], Sound]] = {

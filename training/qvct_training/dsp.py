@@ -29,6 +29,15 @@ def decay(t: Sound, seconds: float, bend: float = 1.0) -> Sound:
     return np.exp(-6.9 * (t / seconds) ** bend)
 
 
+def faded(random: Random, t: Sound, seconds: float) -> Sound:
+    """As amplifiers of machines fade: by transistors that close below a threshold, or quickly or slowly first."""
+    if chance(random, 0.5):
+        return decay(t, seconds, random.uniform(0.6, 1.4))
+    least = log_uniform(random, 0.02, 0.5)
+    level = np.exp(np.log(least) * t / (seconds * random.uniform(0.7, 1)))
+    return np.asarray(np.maximum(0.0, level - least) / (1 - least))
+
+
 def attack(t: Sound, seconds: float) -> Sound:
     """Rises from 0 to 1."""
     return np.minimum(1.0, t / max(seconds, 1e-5))

@@ -14,12 +14,14 @@ from .dsp import (
     band,
     chance,
     decay,
+    faded,
     high_pass,
     log_uniform,
     modes,
     noise,
     peaked,
     phase,
+    resonance,
     sine,
     spread,
     square,
@@ -53,7 +55,7 @@ def slap(random: Random) -> Sound:
 def conga(random: Random, small: bool = False) -> Sound:
     if chance(random, 0.2):
         return slap(random)
-    seconds = log_uniform(random, 0.06, 0.4 if small else 0.8)
+    seconds = log_uniform(random, 0.05, 0.4 if small else 0.8)
     t = times(seconds)
     pitch = log_uniform(random, 250, 720) if small else log_uniform(random, 115, 480)
     f = pitch * (1 + random.choice([0, 0.05, 0.2]) * random.random() * np.exp(-t / log_uniform(random, 0.005, 0.05)))
@@ -61,6 +63,9 @@ def conga(random: Random, small: bool = False) -> Sound:
     if chance(random, 0.7):
         ratios = random.choice(np.stack([np.arange(3, 7) / 2, SKIN[1:5]])) * random.uniform(0.95, 1.08)
         body += modes(t, pitch * ratios, random.uniform(0.02, 0.7, 4), seconds * random.uniform(0.1, 0.8, 4), random)
+    if chance(random, 0.3):  # a circuit that rings, and the pulse that makes it ring
+        pulse = band(noise(random, len(t)), 600, 4000) * decay(t, log_uniform(random, 0.003, 0.02))
+        return np.asarray(body + random.choice([0.0, 0.3, 1.0]) * random.random() * peaked(pulse))
     body = peaked(body) + knock(random, t)
     return in_a_room(random, body * attack(t, log_uniform(random, 0.0003, 0.003)))
 
@@ -78,7 +83,7 @@ def cowbell(random: Random) -> Sound:
     if chance(random, 0.45):
         out = square(phase(low, len(t)), low / RATE) + second * square(phase(high, len(t)), high / RATE)
         out = band(out, low * random.uniform(0.6, 1.1), low * log_uniform(random, 1.5, 7))
-        out *= random.uniform(0, 1) * decay(t, random.uniform(0.015, 0.06)) + decay(t, seconds)
+        out *= random.uniform(0, 1) * decay(t, random.uniform(0.015, 0.06)) + faded(random, t, seconds)
     else:
         seconds = max(seconds, random.uniform(0.1, 0.3))
         t = times(seconds)
@@ -104,7 +109,7 @@ def clave(random: Random) -> Sound:
 def woodblock(random: Random) -> Sound:
     seconds = log_uniform(random, 0.025, 0.35)
     t = times(max(0.05, seconds))
-    f = log_uniform(random, 400, 1800)
+    f = log_uniform(random, 560, 1800)
     out = sine(phase(f * (1 + random.uniform(0, 0.2) * np.exp(-t / 0.003)), len(t))) * decay(t, seconds)
     others = f * random.uniform(1.3, 6, int(random.integers(1, 7)))
     hardness = log_uniform(random, 2000, 12000)
@@ -115,7 +120,7 @@ def woodblock(random: Random) -> Sound:
 def shaker(random: Random) -> Sound:
     seconds = log_uniform(random, 0.03, 0.35)
     t = times(seconds * 1.3)
-    rise = log_uniform(random, 0.003, 0.09)
+    rise = log_uniform(random, 0.008, 0.09)
     envelope = attack(t, rise) ** random.uniform(0.7, 2) * decay(np.maximum(t - rise, 0), seconds)
     if chance(random, 0.3):  # there and back
         later = t - rise - random.uniform(0.03, 0.12)
@@ -124,6 +129,8 @@ def shaker(random: Random) -> Sound:
     if chance(random, 0.5):  # single grains
         grains = (random.random(len(t)) < log_uniform(random, 0.005, 0.1)) * noise(random, len(t))
         sound = band(grains, 3000, 12000)
+    if chance(random, 0.2):
+        envelope = attack(t, rise) * faded(random, np.maximum(t - rise, 0), seconds)
     low = log_uniform(random, 2500, 9000)
     out = band(sound, low, min(20000, low * random.uniform(1.5, 5)), int(random.integers(1, 4)))
     return in_a_room(random, out * envelope)
@@ -144,6 +151,10 @@ def jingles(random: Random, t: Sound, seconds: float, low: float) -> Sound:
 def tambourine(random: Random) -> Sound:
     seconds = log_uniform(random, 0.09, 0.8)
     t = times(seconds)
+    if chance(random, 0.08):  # of the first machines: a tuned circuit
+        f, hiss = log_uniform(random, 4000, 6500), noise(random, len(t))
+        out = resonance(hiss, f, log_uniform(random, 5, 15)) + random.uniform(0, 0.2) * high_pass(hiss, f)
+        return peaked(out) * faded(random, t, seconds) * attack(t, log_uniform(random, 0.001, 0.03))
     out = high_pass(jingles(random, t, seconds, log_uniform(random, 2500, 5500)), log_uniform(random, 500, 4000), 1)
     hiss = high_pass(noise(random, len(t)), log_uniform(random, 3500, 8000))
     out += log_uniform(random, 0.03, 1) * hiss * decay(t, seconds * random.uniform(0.3, 1))

@@ -114,6 +114,10 @@ _LIVE_CODING = {
     "vinyl_": "effects",
     "mehackit_": "effects",
     "glitch_robot": "effects",
+    "hat_cats": "open hat",
+    "hat_gump": "open hat",
+    "hat_noiz": "open hat",
+    "tbd_pad": "pad",
     "bd_": "kick",
     "sn_": "snare",
     "tabla_": "percussion",
@@ -123,7 +127,7 @@ _LIVE_CODING = {
 
 
 def live_coding(folder: Path) -> Iterator[Recording]:
-    """The CC0 samples of Debian's package sonic-pi-samples."""
+    """The CC0 samples of the npm package supersonic-scsynth-samples."""
     for path in sorted(folder.glob("*.flac")):
         known = next((name for start, name in _LIVE_CODING.items() if path.stem.startswith(start)), None)
         name = class_by_name(path.stem) if known is None else known

@@ -35,7 +35,7 @@ def test_voices_sound_and_are_finite(name: str) -> None:
 def test_a_recipe_makes_the_same_sound_each_time_and_others_another() -> None:
     first, second = list(synthesis(2, 0))[:2]
     assert np.array_equal(made(first), made(first))
-    assert not np.array_equal(made(first)[:300], made(second)[:300])
+    assert not np.array_equal(np.trim_zeros(made(first))[:300], np.trim_zeros(made(second))[:300])
     assert np.max(np.abs(made(first))) == pytest.approx(0.9)
 
 

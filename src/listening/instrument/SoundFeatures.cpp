@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <array>
 #include <cmath>
+#include <numbers>
 #include <numeric>
 
 namespace qvct {
@@ -24,6 +25,9 @@ constexpr std::size_t kColumnCount = kColumns.size() - 1;
 constexpr float kFloor = 1e-7F;    // -70 dB
 constexpr float kAttack = 0.03F;   // of the peak: where a sound is taken to begin
 constexpr float kSilence = 1e-5F;  // -100 dB of full scale
+constexpr double kLowest = 20;     // Hz
+constexpr float kNothing = 1e-20F;
+constexpr float kMostOffset = 0.1F;  // of the peak
 constexpr std::array kDrops{0.1F, 0.01F, 0.001F};
 constexpr std::array kGlide{0.006, 0.018, 0.035, 0.06, 0.09, 0.14, 0.22};  // seconds
 constexpr std::size_t kSpectrumValues = 9, kCrossings = 4;
@@ -78,6 +82,23 @@ std::size_t SoundFeatures::count() {
            PartialTones::kValues;
 }
 
+// Without what is too low to be heard: converters of early samplers are off the middle, which would hide
+// where a sound begins and ends. What the first sample is off by is taken to have been so before, unless it
+// is much.
+std::span<const float> SoundFeatures::centred(std::span<const float> samples) {
+    float peak = 0;
+    for (const float sample : samples) peak = std::max(peak, std::abs(sample));
+    const auto share = static_cast<float>(1 - std::exp(-2 * std::numbers::pi * kLowest / rate_));
+    float offset = samples.empty() ? 0 : std::clamp(samples.front(), -kMostOffset * peak, kMostOffset * peak);
+    centred_.resize(samples.size());
+    for (std::size_t i = 0; i < samples.size(); ++i) {
+        offset += share * (samples[i] - offset);
+        if (std::abs(offset) < kNothing) offset = 0;  // numbers smaller than normal ones are slow
+        centred_[i] = samples[i] - offset;
+    }
+    return centred_;
+}
+
 std::span<const float> SoundFeatures::soundIn(std::span<const float> samples) const {
     float peak = 0;
     for (const float sample : samples) peak = std::max(peak, std::abs(sample));
@@ -89,7 +110,7 @@ std::span<const float> SoundFeatures::soundIn(std::span<const float> samples) co
 }
 
 std::vector<float> SoundFeatures::of(std::span<const float> samples) {
-    const auto sound = soundIn(samples);
+    const auto sound = soundIn(centred(samples));
     if (sound.empty()) return {};
     const auto measure = [this](BandPicture& picture, std::span<const float> part) {
         padded_.assign(picture.lead(), 0);

@@ -13,13 +13,14 @@ namespace qvct {
 
 /// What the first two seconds of a sound are like, as a list of numbers that an `InstrumentModel` judges:
 /// the energy of bands over time, how each band decays, the shape of the envelope, spectra of attack, body
-/// and tail, partial tones and their glide. Loudness does not matter, nor does silence before the attack.
+/// and tail, partial tones and their glide. Neither loudness nor silence before the attack nor an offset
+/// matters.
 ///
 /// @cost  About 0.2 ms for half a second at 44.1 kHz; less than 2 MB. One object is used from one thread.
 class SoundFeatures {
   public:
     /// Changes when the numbers mean something else, so that a model made for others is told.
-    static constexpr std::uint32_t kVersion = 1;
+    static constexpr std::uint32_t kVersion = 2;
     /// Lower rates leave too little to hear.
     static constexpr double kLowestRate = 2000;
     static constexpr double kMostSeconds = 2;
@@ -35,6 +36,7 @@ class SoundFeatures {
     std::vector<float> of(std::span<const float> samples);
 
   private:
+    std::span<const float> centred(std::span<const float> samples);
     std::span<const float> soundIn(std::span<const float> samples) const;
     void appendPicture(std::vector<float>& values) const;
     void appendBands(const BandPicture& picture, std::vector<float>& values) const;
@@ -46,7 +48,7 @@ class SoundFeatures {
     Decimator decimator_;
     BandPicture low_, high_;
     PartialTones partials_;
-    std::vector<float> padded_, lower_;
+    std::vector<float> centred_, padded_, lower_;
 };
 
 }  // namespace qvct
