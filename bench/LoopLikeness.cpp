@@ -32,6 +32,7 @@ std::vector<Sound> notesOf(const std::string& instrument) {
         files.push_back(entry.path());
     std::sort(files.begin(), files.end());
     std::vector<Sound> notes;
+    notes.reserve(files.size());
     for (const std::string& file : files) notes.push_back(loadSound(file, 0.1F));
     return notes;
 }

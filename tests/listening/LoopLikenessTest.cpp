@@ -85,6 +85,10 @@ TEST(LoopLikeness, TakesOnsetsAsTheyAre) {
         ASSERT_TRUE(place) << what;
         EXPECT_EQ(place == first, isFirst) << what;
     }
+    EXPECT_EQ(loop.placeWith({{-7, 1}, {kStep, 0}}), loop.placeWith({{0, 1}, {kStep, 0}}));
+    // Two strokes, the second one late, among some of a few samples.
+    EXPECT_EQ(loop.placeWith({{0, 1}, {kStep, 1}, {kStep + 5, 2}, {kStep + 7, 2}, {9 * kStep, 3}}),
+              loop.placeWith({{0, 1}, {kStep + 7, 2}}));
     EXPECT_FALSE(Loop("...").place());
     EXPECT_FALSE(Loop("...").placeWith({{0, 1}, {kStep, 1}}));
     EXPECT_FALSE(Loop("").place());

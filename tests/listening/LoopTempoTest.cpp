@@ -78,7 +78,7 @@ TEST(LoopTempo, ATempoAtWhichBarsEndBeforeATailCountsForMore) {
         {0.4, 60, true},    // 8 beats
         {0.4, 90, false},   // 8 beats before the last stroke, 16 after the sound
         {0.4, 116, true},   // 16 beats in 8.28 of 8.4 s
-        {0.4, 114, false},  // hardly a tail
+        {0.4, 115, false},  // hardly a tail
         {0.4, 124, true},   // the last stroke is a little late
         {0.4, 125, false},  // too late
         {1.9, 120, true},   //
