@@ -15,7 +15,7 @@ class SoundFeatures;
 /// short single sound. What a loop as a whole begins with tells less: its first stroke alone.
 ///
 /// @param onsets  In samples, ascending; without any the beginning of the loop is its only stroke.
-/// @cost  0.5 ms: six strokes of 0.15 s at most, whatever the length.
+/// @cost  0.7 ms: six strokes of 0.15 s at most, whatever the length.
 std::optional<SoundLikeness> likenessOfLoop(std::span<const float> samples, double sampleRate,
                                             std::span<const Onset> onsets, SoundFeatures& features,
                                             const LikenessModel& model);
